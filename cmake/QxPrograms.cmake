@@ -1,0 +1,73 @@
+# The tool, the examples, the benchmarks and the fuzz programs: all of them use the shared library as
+# a host does.
+
+if(NOT TARGET QXXMLMarshalling)
+    return()
+endif()
+
+# tools/qxxml: everything but main.cpp is an object library, so that tests reach it.
+file(GLOB_RECURSE sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/tools/qxxml/*.cpp")
+if(QX_BUILD_TOOLS AND sources)
+    find_package(CLI11 REQUIRED)
+    find_package(nlohmann_json REQUIRED)
+    set(main ${sources})
+    list(FILTER main INCLUDE REGEX "/main\\.cpp$")
+    list(FILTER sources EXCLUDE REGEX "/main\\.cpp$")
+    add_executable(qxxml ${main})
+    target_include_directories(qxxml PRIVATE "${PROJECT_SOURCE_DIR}/tools")
+    target_compile_definitions(qxxml PRIVATE QX_VERSION="${PROJECT_VERSION}")
+    target_link_libraries(qxxml PRIVATE
+        QXXMLMarshalling qx_warnings CLI11::CLI11 nlohmann_json::nlohmann_json)
+    if(sources)
+        add_library(qx_tool OBJECT ${sources})
+        target_include_directories(qx_tool PUBLIC "${PROJECT_SOURCE_DIR}/tools")
+        target_compile_definitions(qx_tool PRIVATE QX_VERSION="${PROJECT_VERSION}")
+        target_link_libraries(qx_tool
+            PUBLIC qx_headers CLI11::CLI11 nlohmann_json::nlohmann_json PRIVATE qx_warnings)
+        target_link_libraries(qxxml PRIVATE qx_tool)
+    endif()
+    set_target_properties(qxxml PROPERTIES
+        INSTALL_RPATH "$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+endif()
+
+# examples/<name>/*.cpp -> example_<name>
+file(GLOB_RECURSE sources RELATIVE "${PROJECT_SOURCE_DIR}/examples" CONFIGURE_DEPENDS
+    "${PROJECT_SOURCE_DIR}/examples/*.cpp")
+if(QX_BUILD_EXAMPLES AND sources)
+    add_custom_target(examples)
+    foreach(source IN LISTS sources)
+        string(REGEX REPLACE "/.*" "" folder "${source}")
+        string(REPLACE "-" "_" name "example_${folder}")
+        if(NOT TARGET ${name})
+            add_executable(${name})
+            target_include_directories(${name} PRIVATE "${PROJECT_SOURCE_DIR}/examples/${folder}")
+            target_compile_definitions(${name} PRIVATE
+                QX_EXAMPLE_DIR="${PROJECT_SOURCE_DIR}/examples/${folder}")
+            target_link_libraries(${name} PRIVATE QXXMLMarshalling qx_warnings)
+            add_dependencies(examples ${name})
+        endif()
+        target_sources(${name} PRIVATE "${PROJECT_SOURCE_DIR}/examples/${source}")
+    endforeach()
+endif()
+
+# bench/*.cpp -> bench; figures of an unoptimised build mean nothing.
+file(GLOB_RECURSE sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/bench/*.cpp")
+if(QX_BUILD_BENCH AND sources AND CMAKE_BUILD_TYPE MATCHES "^Rel")
+    find_package(benchmark REQUIRED)
+    add_executable(bench ${sources})
+    target_include_directories(bench PRIVATE "${PROJECT_SOURCE_DIR}/bench")
+    target_link_libraries(bench PRIVATE
+        QXXMLMarshalling qx_warnings benchmark::benchmark LibXml2::LibXml2)
+endif()
+
+# fuzz/*.cpp -> one program each
+file(GLOB sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/fuzz/*.cpp")
+if(QX_FUZZ AND sources)
+    foreach(source IN LISTS sources)
+        cmake_path(GET source STEM name)
+        add_executable(fuzz_${name} "${source}")
+        target_compile_options(fuzz_${name} PRIVATE -fsanitize=fuzzer)
+        target_link_options(fuzz_${name} PRIVATE -fsanitize=fuzzer)
+        target_link_libraries(fuzz_${name} PRIVATE QXXMLMarshalling qx_warnings)
+    endforeach()
+endif()
