@@ -33,8 +33,11 @@ endif()
 # examples/<name>/*.cpp -> example_<name>
 file(GLOB_RECURSE sources RELATIVE "${PROJECT_SOURCE_DIR}/examples" CONFIGURE_DEPENDS
     "${PROJECT_SOURCE_DIR}/examples/*.cpp")
-if(QX_BUILD_EXAMPLES AND sources)
+if(QX_BUILD_EXAMPLES)
     add_custom_target(examples)
+    if(TARGET qxxml)
+        add_dependencies(examples qxxml) # demos call it too
+    endif()
     foreach(source IN LISTS sources)
         string(REGEX REPLACE "/.*" "" folder "${source}")
         string(REPLACE "-" "_" name "example_${folder}")

@@ -70,6 +70,7 @@ foreach(name IN LISTS test_targets)
     gtest_discover_tests(${name}
         DISCOVERY_MODE PRE_TEST
         DISCOVERY_TIMEOUT 60
+        TEST_PREFIX "${label_${name}}/"
         PROPERTIES LABELS "${label_${name}}" TIMEOUT 300)
 endforeach()
 add_custom_target(tests DEPENDS ${test_targets})
