@@ -1,0 +1,102 @@
+#pragma once
+
+// Values by string key, shared by reference, in the order in which keys were first set: output is
+// the same on every run. Changing it while it is walked raises NSGenericException at the walk's
+// next step. Small dictionaries are scanned, larger ones carry an index.
+
+#include <QXXMLMarshalling/platform/Value.h>
+
+#include <vector>
+
+namespace qx {
+
+class Array;
+
+class QX_API Dictionary final : public Object {
+public:
+    struct Entry {
+        String key; // null: removed
+        Value value;
+    };
+
+    Dictionary() = default;
+    ~Dictionary() override;
+
+    class Iterator {
+    public:
+        Iterator(const Dictionary& dictionary, std::size_t index) noexcept
+            : _dictionary(&dictionary), _index(index), _changes(dictionary._changes) {
+            skipRemoved();
+        }
+        const Entry& operator*() const { return _dictionary->_entries[_index]; }
+        Iterator& operator++() {
+            _dictionary->checkUnchanged(_changes);
+            ++_index;
+            skipRemoved();
+            return *this;
+        }
+        bool operator!=(const Iterator& end) const {
+            _dictionary->checkUnchanged(_changes);
+            return _index < end._index;
+        }
+
+    private:
+        void skipRemoved() noexcept {
+            while (_index < _dictionary->_entries.size() &&
+                   _dictionary->_entries[_index].key.isNull())
+                ++_index;
+        }
+
+        const Dictionary* _dictionary;
+        std::size_t _index;
+        std::size_t _changes;
+    };
+    Iterator begin() const { return {*this, 0}; }
+    Iterator end() const { return {*this, _entries.size()}; }
+
+    std::size_t count() const noexcept { return _count; }
+    bool isEmpty() const noexcept { return _count == 0; }
+
+    // Null when absent.
+    Value get(const String& key) const;
+    bool contains(const String& key) const { return find(key) != nullptr; }
+    // The stored value without a copy; null pointer when absent. Good until the next change.
+    const Value* find(const String& key) const noexcept;
+    // A null key or a null value raises NSInvalidArgumentException.
+    void set(const String& key, Value value);
+    // Nothing happens when the key is absent.
+    void remove(const String& key);
+    void removeAll();
+    // A new array of the keys, in order.
+    Ref<Array> allKeys() const;
+    Ref<Array> allValues() const;
+    // A new dictionary with the same keys and the very same values.
+    Ref<Dictionary> mutableCopy() const;
+
+    String description() const override;
+    // "{", one "key = value;" a line, "}".
+    String descriptionWithLocale(const Object* locale, std::size_t indent) const override;
+    // Same keys with equal values, in any order.
+    bool isEqual(const Object& other) const override;
+    // The value under the key; a key that begins with "@" is one of the dictionary's own
+    // properties: "@count", "@allKeys", "@allValues".
+    Value valueForKey(Key key) const override;
+    // Stores the value; null removes the key.
+    SetOutcome trySetValueForKey(const Value& value, Key key) override;
+
+protected:
+    const Class& describedClass() const override;
+
+private:
+    std::size_t positionOf(const String& key) const noexcept;
+    void checkUnchanged(std::size_t changes) const;
+    void makeRoom();
+    void changed() noexcept { ++_changes; }
+
+    std::vector<Entry> _entries;
+    std::vector<std::uint32_t> _index; // open addressing, position + 1; empty while scanned
+    std::size_t _count = 0;
+    std::size_t _changes = 0;
+};
+
+} // namespace qx

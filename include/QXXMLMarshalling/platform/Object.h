@@ -1,0 +1,133 @@
+#pragma once
+
+// The root class of everything that key-value access, the marshaller and the collections handle.
+// An object is counted (Ref.h), knows its class as data (Class.h), reads and writes its properties
+// by key, and answers operations by name. One thread uses an object at a time; only the count may
+// be touched by several.
+//
+// Key-value access looks the key up among the properties described for the object's class; a key
+// that is none goes to the undefined-key pair, which raises unless the class overrides it:
+//   NSUndefinedKeyException     the class has no such key
+//   NSInvalidArgumentException  the property does not take the value (null for a scalar, say)
+
+#include <QXXMLMarshalling/platform/Export.h>
+#include <QXXMLMarshalling/platform/Key.h>
+#include <QXXMLMarshalling/platform/Ref.h>
+
+#include <array>
+#include <atomic>
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string_view>
+
+namespace qx {
+
+class Class;
+class Invocation;
+class MethodSignature;
+class Value;
+class WeakAnchor;
+struct ObservationInfo;
+
+// What became of a value that was offered for a key.
+enum class SetOutcome : std::uint8_t { set, refused, unknownKey };
+
+class QX_API Object {
+public:
+    Object() noexcept;
+    Object(const Object&) = delete;
+    Object& operator=(const Object&) = delete;
+    virtual ~Object();
+
+    void retain() const noexcept { _count.fetch_add(1, std::memory_order_relaxed); }
+    // Ends the object with its last count. However deep a graph hangs on it, its release needs no
+    // more stack than a bounded number of levels.
+    void release() const noexcept {
+        if (_count.fetch_sub(1, std::memory_order_acq_rel) == 1)
+            destroy();
+    }
+
+    // The object's class as described with Class::define; a class that nobody described gets a
+    // description of its own with the properties and operations of the nearest described base.
+    const Class& isa() const;
+
+    // The class name and the address, as "<Name: 0x…>".
+    virtual String description() const;
+    // The description inside a printed collection; `indent` counts levels. The default ignores
+    // both.
+    virtual String descriptionWithLocale(const Object* locale, std::size_t indent) const;
+    // Identity, unless a class compares contents (arrays, dictionaries, data).
+    virtual bool isEqual(const Object& other) const;
+    // The class name under which a mapping describes this object; by default that of isa().
+    virtual String classNameForMarshalling() const;
+
+    // Raises as described above.
+    virtual Value valueForKey(Key key) const;
+    void setValueForKey(const Value& value, Key key);
+    // Sets without raising where the class has no such key or does not take the value. What the
+    // class's own setter throws passes through. Observers are told when it is set.
+    virtual SetOutcome trySetValueForKey(const Value& value, Key key);
+    virtual Value valueForUndefinedKey(Key key) const;
+    virtual void setValueForUndefinedKey(const Value& value, Key key);
+    // Keys separated by dots, followed from object to object; null as soon as one is null.
+    Value valueForKeyPath(std::string_view path) const;
+    void setValueForKeyPath(const Value& value, std::string_view path);
+
+    // Announce a change that is not made through setValueForKey: each will needs its did.
+    virtual void willChangeValueForKey(Key key);
+    virtual void didChangeValueForKey(Key key);
+
+    // True when the class describes an operation of that name.
+    bool respondsTo(Selector selector) const;
+    // Calls the operation; what it returns, null for nothing. An operation that the class does not
+    // describe is forwarded (methodSignatureForSelector, forwardInvocation), and where nothing
+    // takes it raises NSInvalidArgumentException, as wrong arguments do.
+    Value performWithArguments(Selector selector, std::span<const Value> arguments);
+    template <class... Arguments>
+    Value perform(Selector selector, const Arguments&... arguments);
+
+    // The anchor that weak references share; made on first use.
+    Ref<WeakAnchor> weakAnchor() const;
+
+    // How many objects are alive in the process; counted in debug builds, else always 0.
+    static std::int64_t liveCount() noexcept;
+
+protected:
+    // The nearest described class: what an undescribed subclass takes its description from.
+    // Classes that others derive from override it.
+    virtual const Class& describedClass() const;
+
+private:
+    struct Extras;
+    friend class Class;
+
+    void destroy() const noexcept;
+    Extras& extras() const;
+
+    mutable std::atomic<std::uint32_t> _count{1};
+    mutable std::atomic<const Class*> _isa{nullptr};
+    mutable Extras* _extras = nullptr;
+};
+
+// What weak references hold on to: it outlives its object and then yields null.
+class QX_API WeakAnchor {
+public:
+    explicit WeakAnchor(Object* target) noexcept : _target(target) {}
+    Object* target() const noexcept { return _target.load(std::memory_order_acquire); }
+    void clear() noexcept { _target.store(nullptr, std::memory_order_release); }
+
+    void retain() const noexcept { _count.fetch_add(1, std::memory_order_relaxed); }
+    void release() const noexcept {
+        if (_count.fetch_sub(1, std::memory_order_acq_rel) == 1)
+            delete this;
+    }
+
+private:
+    mutable std::atomic<std::uint32_t> _count{1};
+    std::atomic<Object*> _target;
+};
+
+} // namespace qx
+
+#include <QXXMLMarshalling/platform/Value.h>

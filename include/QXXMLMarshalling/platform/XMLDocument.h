@@ -1,0 +1,102 @@
+#pragma once
+
+// A document: one root element, with comments and processing instructions around it.
+//
+//     qx::Ref<qx::Error> error;
+//     auto document = qx::XMLDocument::initWithContentsOfFile("order.xml", {}, &error);
+//     if (!document) std::cerr << error->localizedDescription().view();
+//
+// Parsing reads the given bytes and nothing else: no other file, no network, whatever the document
+// says. Internal entities and attribute defaults of the internal subset work; CDATA and entities
+// become text. Limits bound depth, text size and entity expansion; beyond one, and for anything
+// that is no well-formed XML, the result is null and the error says what, where: domain
+// qx::Error::parserDomain, the parser's code and text, line() and column().
+
+#include <QXXMLMarshalling/platform/Data.h>
+#include <QXXMLMarshalling/platform/Error.h>
+#include <QXXMLMarshalling/platform/XMLElement.h>
+
+#include <iosfwd>
+
+namespace qx {
+
+struct XMLParseOptions {
+    // Keep texts of white space only. Without it a text that is white space with a line break, in
+    // an element with no other text, is layout and dropped, unless xml:space="preserve" is in
+    // force.
+    bool keepWhiteSpace = false;
+    // How deep elements may nest.
+    std::size_t maximumDepth = 256;
+    // The largest text, attribute value or name in bytes.
+    std::size_t maximumTextSize = 10'000'000;
+};
+
+class QX_API XMLDocument final : public XMLNode {
+public:
+    // Reads a file: a path or a file: URL. An unreadable one is an error of qx::Error::cocoaDomain
+    // with code 260 (no such file) or 256.
+    static Ref<XMLDocument> initWithContentsOfURL(const String& URL,
+                                                  const XMLParseOptions& options = {},
+                                                  Ref<Error>* error = nullptr);
+    static Ref<XMLDocument> initWithContentsOfFile(const String& path,
+                                                   const XMLParseOptions& options = {},
+                                                   Ref<Error>* error = nullptr);
+    static Ref<XMLDocument> initWithData(std::string_view bytes,
+                                         const XMLParseOptions& options = {},
+                                         Ref<Error>* error = nullptr);
+    static Ref<XMLDocument> initWithData(const Data& data, const XMLParseOptions& options = {},
+                                         Ref<Error>* error = nullptr);
+    // Reads to the stream's end.
+    static Ref<XMLDocument> initWithStream(std::istream& stream,
+                                           const XMLParseOptions& options = {},
+                                           Ref<Error>* error = nullptr);
+    // A null element gives a document without a root; one that has a parent raises
+    // NSInvalidArgumentException.
+    static Ref<XMLDocument> initWithRootElement(Ref<XMLElement> root);
+    ~XMLDocument() override;
+
+    // Null in a document that holds no element.
+    XMLElement* rootElement() const noexcept;
+    XMLNode* firstChild() const noexcept override { return _firstChild; }
+    // Appends an element (only one), a comment or a processing instruction.
+    void addChild(Ref<XMLNode> child);
+
+    // The XML declaration's parts as read or set; null where not given.
+    const String& version() const noexcept { return _version; }
+    void setVersion(const String& version) { _version = version; }
+    const String& characterEncoding() const noexcept { return _encoding; }
+    void setCharacterEncoding(const String& encoding) { _encoding = encoding; }
+    const String& standalone() const noexcept { return _standalone; }
+    void setStandalone(const String& standalone) { _standalone = standalone; }
+
+    // The document as bytes, with an XML declaration when a version or an encoding is set, in that
+    // encoding (UTF-8 without one); characters that the encoding lacks go as character references.
+    // Raises NSInvalidArgumentException as XMLString does, and for an unknown encoding.
+    std::string XMLData(XMLOptions options = XMLNoOptions) const;
+    // Writes XMLData to a file atomically: to a temporary file beside it, which then takes its
+    // place. False with an error that says what and where; the old file is then untouched.
+    bool writeToFile(const String& path, XMLOptions options = XMLNoOptions,
+                     Ref<Error>* error = nullptr) const;
+    // False with an error when the stream fails.
+    bool writeToStream(std::ostream& stream, XMLOptions options = XMLNoOptions,
+                       Ref<Error>* error = nullptr) const;
+
+    String stringValue() const override;
+    void setStringValue(const String& value) override;
+    Ref<XMLNode> copy() const override;
+
+private:
+    friend class XMLNode;
+    friend class XMLParser;
+
+    XMLDocument() noexcept;
+    void unlink(XMLNode& node) noexcept;
+
+    XMLNode* _firstChild = nullptr;
+    XMLNode* _lastChild = nullptr;
+    String _version;
+    String _encoding;
+    String _standalone;
+};
+
+} // namespace qx

@@ -1,0 +1,75 @@
+#pragma once
+
+// An element with its attributes, namespace declarations and child nodes. Attributes never include
+// namespace declarations: those are namespaces(), and are written before the attributes.
+
+#include <QXXMLMarshalling/platform/XMLNode.h>
+
+#include <span>
+#include <vector>
+
+namespace qx {
+
+class QX_API XMLElement final : public XMLNode {
+public:
+    static Ref<XMLElement> initWithName(const String& name);
+    static Ref<XMLElement> initWithName(const String& name, const String& stringValue);
+    ~XMLElement() override;
+
+    XMLNode* firstChild() const noexcept override { return _firstChild; }
+    XMLNode* lastChild() const noexcept { return _lastChild; }
+    std::size_t childCount() const noexcept { return _childCount; }
+
+    // The direct child elements of that qualified name, in document order.
+    std::vector<XMLElement*> elementsForName(const String& name) const;
+    // Appends the node, which becomes this element's. A node that has a parent, a document, an
+    // attribute, a namespace or an ancestor of this element raises NSInvalidArgumentException.
+    void addChild(Ref<XMLNode> child);
+    void insertChild(Ref<XMLNode> child, XMLNode* before);
+
+    // In document order.
+    XMLNodeRange attributes() const noexcept { return XMLNodeRange(_firstAttribute); }
+    // Null when there is none.
+    XMLNode* attributeForName(const String& name) const noexcept;
+    // Adds nothing when an attribute of that name is there already. A node that has a parent or is
+    // no attribute raises NSInvalidArgumentException.
+    void addAttribute(Ref<XMLNode> attribute);
+    // Detaches the attribute; nothing when there is none.
+    void removeAttributeForName(const String& name);
+
+    // In document order.
+    XMLNodeRange namespaces() const noexcept { return XMLNodeRange(_firstNamespace); }
+    // Replaces all declarations; of equal prefixes the first wins. Nodes that have a parent or are
+    // no namespaces raise NSInvalidArgumentException before anything is changed.
+    void setNamespaces(std::span<const Ref<XMLNode>> namespaces);
+    void addNamespace(Ref<XMLNode> declaration);
+
+    String stringValue() const override;
+    void setStringValue(const String& value) override;
+    Ref<XMLNode> copy() const override;
+
+private:
+    friend class XMLNode;
+    friend class XMLParser;
+    friend Ref<XMLElement> make<XMLElement>(String&&);
+
+    explicit XMLElement(String name) noexcept;
+    void unlink(XMLNode& node) noexcept;
+
+    XMLNode* _firstChild = nullptr;
+    XMLNode* _lastChild = nullptr;
+    XMLNode* _firstAttribute = nullptr;
+    XMLNode* _lastAttribute = nullptr;
+    XMLNode* _firstNamespace = nullptr;
+    XMLNode* _lastNamespace = nullptr;
+    std::size_t _childCount = 0;
+};
+
+inline XMLElement* XMLNode::asElement() noexcept {
+    return isElement() ? static_cast<XMLElement*>(this) : nullptr;
+}
+inline const XMLElement* XMLNode::asElement() const noexcept {
+    return isElement() ? static_cast<const XMLElement*>(this) : nullptr;
+}
+
+} // namespace qx

@@ -1,0 +1,165 @@
+#pragma once
+
+// The node tree of an XML document. Each node is counted on its own: a parent owns its children,
+// and a child that someone keeps outlives its parent and its document. A node can be detached and
+// put into another tree; it stays the same node. Nodes are made with the init… operations of this
+// class, of XMLElement and of XMLDocument.
+//
+//     kind                   name()                   stringValue()
+//     document               null                     the text of the root element
+//     element                qualified name           all text inside, concatenated
+//     attribute              qualified name           the value
+//     namespaceDeclaration   prefix ("" the default)  the URI
+//     text, comment          null                     the text
+//     processingInstruction  target                   the data
+//
+// Names are kept as written, prefix included; a prefix needs no declaration.
+
+#include <QXXMLMarshalling/platform/Object.h>
+
+#include <iterator>
+
+namespace qx {
+
+class XMLDocument;
+class XMLElement;
+class XMLNode;
+
+enum class XMLNodeKind : std::uint8_t {
+    document,
+    element,
+    attribute,
+    namespaceDeclaration,
+    text,
+    comment,
+    processingInstruction
+};
+
+// Options of parsing and serialising, to be combined with |.
+enum XMLOptions : std::uint32_t {
+    XMLNoOptions = 0,
+    // Parsing: keep texts of white space only, which are layout otherwise.
+    XMLKeepWhiteSpace = 1U << 25,
+    // Serialising: one element a line, 4 blanks a level, where no text stands beside it.
+    XMLPrettyPrint = 1U << 17,
+    // Serialising: <a/> instead of <a></a>.
+    XMLCompactEmptyElements = 1U << 18
+};
+constexpr XMLOptions operator|(XMLOptions a, XMLOptions b) {
+    return static_cast<XMLOptions>(static_cast<std::uint32_t>(a) | static_cast<std::uint32_t>(b));
+}
+
+// Sibling nodes, lent by their parent: good until the parent's list changes.
+class XMLNodeRange {
+public:
+    class Iterator {
+    public:
+        using difference_type = std::ptrdiff_t;
+        using value_type = XMLNode;
+        using reference = XMLNode&;
+        using pointer = XMLNode*;
+        using iterator_category = std::forward_iterator_tag;
+        Iterator() noexcept = default;
+        explicit Iterator(XMLNode* node) noexcept : _node(node) {}
+        XMLNode& operator*() const noexcept { return *_node; }
+        XMLNode* operator->() const noexcept { return _node; }
+        inline Iterator& operator++() noexcept;
+        Iterator operator++(int) noexcept {
+            Iterator before = *this;
+            ++*this;
+            return before;
+        }
+        friend bool operator==(Iterator a, Iterator b) noexcept { return a._node == b._node; }
+
+    private:
+        XMLNode* _node = nullptr;
+    };
+
+    explicit XMLNodeRange(XMLNode* first) noexcept : _first(first) {}
+    Iterator begin() const noexcept { return Iterator(_first); }
+    Iterator end() const noexcept { return Iterator(); }
+    bool empty() const noexcept { return _first == nullptr; }
+
+private:
+    XMLNode* _first;
+};
+
+class QX_API XMLNode : public Object {
+public:
+    ~XMLNode() override;
+
+    static Ref<XMLNode> initTextWithStringValue(const String& text);
+    static Ref<XMLNode> initCommentWithStringValue(const String& text);
+    static Ref<XMLNode> initProcessingInstructionWithName(const String& target, const String& data);
+    static Ref<XMLNode> attributeWithName(const String& name, const String& value);
+    // A namespace declaration; the empty prefix declares the default namespace.
+    static Ref<XMLNode> namespaceWithName(const String& prefix, const String& URI);
+
+    XMLNodeKind kind() const noexcept { return _kind; }
+    bool isElement() const noexcept { return _kind == XMLNodeKind::element; }
+    // This node as an element; null for any other kind.
+    inline XMLElement* asElement() noexcept;
+    inline const XMLElement* asElement() const noexcept;
+
+    // See the table above.
+    const String& name() const noexcept { return _name; }
+    virtual String stringValue() const;
+    // Replaces the value; of an element its whole content, by one text (none for empty text).
+    virtual void setStringValue(const String& value);
+
+    // An element, or the document; null for a node that stands alone.
+    XMLNode* parent() const noexcept { return _parent; }
+    // The document at the top; null when there is none.
+    XMLDocument* rootDocument() const noexcept;
+    XMLNode* nextSibling() const noexcept { return _next; }
+    XMLNode* previousSibling() const noexcept { return _previous; }
+    // The child nodes in document order: of elements and documents; of other kinds none.
+    XMLNodeRange children() const noexcept { return XMLNodeRange(firstChild()); }
+    virtual XMLNode* firstChild() const noexcept { return nullptr; }
+
+    // Takes the node out of its parent, which gives up its count: keep a Ref before you call it.
+    // Nothing happens to a node that stands alone.
+    virtual void detach();
+    // A deep copy without a parent. Positions in the document are copied too.
+    virtual Ref<XMLNode> copy() const;
+    // True when both print as the same XML.
+    bool isSameXML(const XMLNode& other) const;
+
+    // Where the element's "<" stood in the parsed document, 1-based; 0 for nodes made by hand and
+    // for other kinds.
+    std::size_t line() const noexcept { return _line; }
+    std::size_t column() const noexcept { return _column; }
+
+    // The node as XML text (an attribute as name="value"), without layout. Raises
+    // NSInvalidArgumentException, naming the place, for what would not be XML: an illegal name, a
+    // control character, a comment with "--".
+    String XMLString(XMLOptions options = XMLNoOptions) const;
+    // The XML text, with what is no XML shown as it is; messages print nodes so.
+    String description() const override;
+
+protected:
+    friend class XMLElement;
+    friend class XMLDocument;
+    friend class XMLParser;
+
+    XMLNode(XMLNodeKind kind, String name, String value) noexcept;
+    const Class& describedClass() const override;
+
+    XMLNode* _parent = nullptr; // owns this node
+    XMLNode* _next = nullptr;
+    XMLNode* _previous = nullptr;
+    String _name;
+    String _value;
+    std::uint32_t _line = 0;
+    std::uint32_t _column = 0;
+    XMLNodeKind _kind;
+};
+
+inline XMLNodeRange::Iterator& XMLNodeRange::Iterator::operator++() noexcept {
+    _node = _node->nextSibling();
+    return *this;
+}
+
+} // namespace qx
+
+#include <QXXMLMarshalling/platform/XMLElement.h>

@@ -1,0 +1,164 @@
+#include <QXXMLMarshalling/platform/Dictionary.h>
+
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include "platform/object/LibraryClass.h"
+#include "platform/object/NameIndex.h"
+#include "platform/object/Printing.h"
+
+#include <algorithm>
+
+namespace qx {
+
+Dictionary::~Dictionary() = default;
+
+void Dictionary::checkUnchanged(std::size_t changes) const {
+    if (changes != _changes)
+        throw Exception(Exception::generic, "a dictionary was changed while it was walked");
+}
+
+std::size_t Dictionary::positionOf(const String& key) const noexcept {
+    if (key.isNull())
+        return nameindex::none;
+    return nameindex::find(_index, _entries.size(), key,
+                           [this](std::size_t i) -> const String& { return _entries[i].key; });
+}
+
+const Value* Dictionary::find(const String& key) const noexcept {
+    const std::size_t position = positionOf(key);
+    return position != nameindex::none ? &_entries[position].value : nullptr;
+}
+
+Value Dictionary::get(const String& key) const {
+    const Value* value = find(key);
+    return value != nullptr ? *value : Value();
+}
+
+void Dictionary::set(const String& key, Value value) {
+    if (key.isNull() || value.isNull())
+        throw Exception(
+            Exception::invalidArgument,
+            String::concat({"a dictionary takes no null for its key ", Value(key).description()}));
+    changed();
+    if (const std::size_t position = positionOf(key); position != nameindex::none) {
+        // The replaced value ends last: it may lead back to this dictionary.
+        const Value replaced = std::exchange(_entries[position].value, std::move(value));
+        return;
+    }
+    if (nameindex::isFull(_index, _entries.size()))
+        makeRoom();
+    _entries.push_back({key, std::move(value)});
+    if (!_index.empty())
+        nameindex::add(_index, key, _entries.size() - 1);
+    ++_count;
+}
+
+// Drops the places of removed keys and gives the index twice the room.
+void Dictionary::makeRoom() {
+    std::erase_if(_entries, [](const Entry& entry) { return entry.key.isNull(); });
+    _index = nameindex::tableFor(_entries.size() + 1);
+    if (_index.empty())
+        return;
+    for (std::size_t i = 0; i < _entries.size(); ++i)
+        nameindex::add(_index, _entries[i].key, i);
+}
+
+// A removed entry keeps its place, so that the index stays true.
+void Dictionary::remove(const String& key) {
+    const std::size_t position = positionOf(key);
+    if (position == nameindex::none)
+        return;
+    changed();
+    --_count;
+    const Entry removed = std::exchange(_entries[position], Entry());
+    if (_index.empty())
+        _entries.erase(_entries.begin() + static_cast<std::ptrdiff_t>(position));
+}
+
+void Dictionary::removeAll() {
+    changed();
+    _count = 0;
+    _index.clear();
+    const std::vector<Entry> removed = std::exchange(_entries, {});
+}
+
+Ref<Array> Dictionary::allKeys() const {
+    auto keys = make<Array>();
+    for (const Entry& entry : *this)
+        keys->add(entry.key);
+    return keys;
+}
+
+Ref<Array> Dictionary::allValues() const {
+    auto values = make<Array>();
+    for (const Entry& entry : *this)
+        values->add(entry.value);
+    return values;
+}
+
+Ref<Dictionary> Dictionary::mutableCopy() const {
+    auto copy = make<Dictionary>();
+    for (const Entry& entry : *this)
+        copy->set(entry.key, entry.value);
+    return copy;
+}
+
+String Dictionary::description() const { return descriptionWithLocale(nullptr, 0); }
+
+String Dictionary::descriptionWithLocale(const Object* locale, std::size_t indent) const {
+    const Printing printing(*this);
+    if (!printing.mayDescend())
+        return Printing::cutShort;
+    std::string text = indentation(indent) + "{\n";
+    for (const Entry& entry : _entries) {
+        if (entry.key.isNull())
+            continue;
+        text += indentation(indent + 1);
+        text += entry.key.view();
+        text += " = ";
+        const String value = entry.value.descriptionWithLocale(locale, indent + 1);
+        // A nested list begins on the key's own line.
+        const std::size_t blanks = value.view().find_first_not_of(' ');
+        const bool nested = entry.value.isObject() && blanks != std::string_view::npos;
+        text += nested ? value.view().substr(blanks) : value.view();
+        text += ";\n";
+    }
+    return text + indentation(indent) + "}";
+}
+
+bool Dictionary::isEqual(const Object& other) const {
+    const auto* dictionary = dynamic_cast<const Dictionary*>(&other);
+    if (dictionary == nullptr || dictionary->_count != _count)
+        return false;
+    return std::all_of(_entries.begin(), _entries.end(), [&](const Entry& entry) {
+        if (entry.key.isNull())
+            return true;
+        const Value* value = dictionary->find(entry.key);
+        return value != nullptr && value->isEqual(entry.value);
+    });
+}
+
+Value Dictionary::valueForKey(Key key) const {
+    if (!key.view().starts_with('@'))
+        return get(key.string());
+    return Object::valueForKey(key.view().substr(1));
+}
+
+SetOutcome Dictionary::trySetValueForKey(const Value& value, Key key) {
+    if (value.isNull())
+        remove(key.string());
+    else
+        set(key.string(), value);
+    return SetOutcome::set;
+}
+
+const Class& Dictionary::describedClass() const {
+    using describe::memberProperty;
+    return libraryClass<Dictionary>(
+        "qx::Dictionary", {memberProperty<Dictionary, &Dictionary::count>("count"),
+                           memberProperty<Dictionary, &Dictionary::allKeys>("allKeys"),
+                           memberProperty<Dictionary, &Dictionary::allValues>("allValues")});
+}
+
+} // namespace qx

@@ -1,0 +1,229 @@
+#include <QXXMLMarshalling/platform/Object.h>
+
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/Format.h>
+
+#include "platform/object/ObjectExtras.h"
+
+namespace qx {
+
+namespace {
+
+#ifndef NDEBUG
+std::atomic<std::int64_t> liveObjects{0};
+#endif
+
+// Objects that end while this many others are ending above them on the stack wait for their turn.
+constexpr unsigned deepestRelease = 64;
+
+// A count that no reference made and dropped by a destructor brings back to zero.
+constexpr std::uint32_t endingCount = 0x40000000U;
+
+struct Ending {
+    unsigned depth = 0;
+    Object* waiting = nullptr;
+};
+thread_local Ending ending;
+
+String addressOf(const Object& object) {
+    const Value address(reinterpret_cast<std::uintptr_t>(&object));
+    return format("0x%012lx", {&address, 1});
+}
+
+} // namespace
+
+Object::Object() noexcept {
+#ifndef NDEBUG
+    liveObjects.fetch_add(1, std::memory_order_relaxed);
+#endif
+}
+
+Object::~Object() {
+    delete _extras;
+#ifndef NDEBUG
+    liveObjects.fetch_sub(1, std::memory_order_relaxed);
+#endif
+}
+
+std::int64_t Object::liveCount() noexcept {
+#ifndef NDEBUG
+    return liveObjects.load(std::memory_order_relaxed);
+#else
+    return 0;
+#endif
+}
+
+// A long chain of objects would end by recursion, one frame a link. Past a fixed depth they queue
+// up instead, linked through the class pointer, which is only a cache.
+void Object::destroy() const noexcept {
+    auto* self = const_cast<Object*>(this);
+    _count.store(endingCount, std::memory_order_relaxed);
+    if (_extras != nullptr && _extras->anchor)
+        _extras->anchor->clear();
+    if (ending.depth >= deepestRelease) {
+        self->_isa.store(reinterpret_cast<const Class*>(ending.waiting));
+        ending.waiting = self;
+        return;
+    }
+    ++ending.depth;
+    delete self;
+    --ending.depth;
+    while (ending.depth == 0 && ending.waiting != nullptr) {
+        Object* next = ending.waiting;
+        ending.waiting = reinterpret_cast<Object*>(
+            const_cast<Class*>(next->_isa.load(std::memory_order_relaxed)));
+        next->_isa.store(nullptr);
+        ++ending.depth;
+        delete next;
+        --ending.depth;
+    }
+}
+
+Object::Extras& Object::extras() const {
+    if (_extras == nullptr)
+        _extras = new Extras;
+    return *_extras;
+}
+
+Ref<WeakAnchor> Object::weakAnchor() const {
+    Ref<WeakAnchor>& anchor = extras().anchor;
+    if (!anchor)
+        anchor = make<WeakAnchor>(const_cast<Object*>(this));
+    return anchor;
+}
+
+const Class& Object::isa() const {
+    const Class* known = _isa.load(std::memory_order_acquire);
+    if (known == nullptr) {
+        known = &Class::ofObject(*this);
+        _isa.store(known, std::memory_order_release);
+    }
+    return *known;
+}
+
+const Class& Object::describedClass() const {
+    static const Class& described = Class::publish(
+        {.name = "qx::Object", .type = &typeid(Object), .superclass = nullptr}, false);
+    return described;
+}
+
+String Object::description() const {
+    return String::concat({"<", isa().name(), ": ", addressOf(*this), ">"});
+}
+
+String Object::descriptionWithLocale(const Object*, std::size_t) const { return description(); }
+
+bool Object::isEqual(const Object& other) const { return this == &other; }
+
+String Object::classNameForMarshalling() const { return isa().name(); }
+
+Value Object::valueForKey(Key key) const {
+    const Property* property = isa().property(key);
+    return property != nullptr ? property->get(*property, *this) : valueForUndefinedKey(key);
+}
+
+void Object::setValueForKey(const Value& value, Key key) {
+    switch (trySetValueForKey(value, key)) {
+    case SetOutcome::set:
+        return;
+    case SetOutcome::refused:
+        throw Exception(Exception::invalidArgument,
+                        String::concat({"class ", isa().name(), " does not take the value ",
+                                        value.description(), " for its key ", key.view()}));
+    case SetOutcome::unknownKey:
+        Object::setValueForUndefinedKey(value, key);
+    }
+}
+
+namespace {
+
+// Sends the did that a will needs, whatever the setter throws.
+class ChangeNotice {
+public:
+    ChangeNotice(Object& object, Key key) : _object(object), _key(key) {
+        _object.willChangeValueForKey(_key);
+    }
+    ~ChangeNotice() noexcept(false) { _object.didChangeValueForKey(_key); }
+    ChangeNotice(const ChangeNotice&) = delete;
+    ChangeNotice& operator=(const ChangeNotice&) = delete;
+
+private:
+    Object& _object;
+    Key _key;
+};
+
+} // namespace
+
+SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
+    const Class& type = isa();
+    const Property* property = type.property(key);
+    if (property == nullptr) {
+        try {
+            setValueForUndefinedKey(value, key);
+        } catch (const UndefinedKeyException& exception) {
+            if (!exception.concerns(this, key))
+                throw;
+            return SetOutcome::unknownKey;
+        }
+        return SetOutcome::set;
+    }
+    if (property->set == nullptr)
+        return SetOutcome::refused;
+    if (!type.automaticallyNotifiesObserversForKey(key))
+        return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
+    const ChangeNotice notice(*this, key);
+    return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
+}
+
+Value Object::valueForUndefinedKey(Key key) const {
+    throw UndefinedKeyException(
+        this, key,
+        String::concat({"class ", isa().name(), " has no key ", key.view(), " to read"}));
+}
+
+void Object::setValueForUndefinedKey(const Value& value, Key key) {
+    throw UndefinedKeyException(this, key,
+                                String::concat({"class ", isa().name(), " has no key ", key.view(),
+                                                " to set to ", value.description()}));
+}
+
+Value Object::valueForKeyPath(std::string_view path) const {
+    const std::size_t dot = path.find('.');
+    Value value = valueForKey(path.substr(0, dot));
+    if (dot == std::string_view::npos || value.isNull())
+        return value;
+    const Object* next = value.object();
+    if (next != nullptr)
+        return next->valueForKeyPath(path.substr(dot + 1));
+    const Key rest = path.substr(dot + 1);
+    throw UndefinedKeyException(nullptr, rest,
+                                String::concat({"class ", value.classNameForMarshalling(),
+                                                " has no key ", rest.view(), " to read"}));
+}
+
+void Object::setValueForKeyPath(const Value& value, std::string_view path) {
+    const std::size_t dot = path.rfind('.');
+    if (dot == std::string_view::npos)
+        return setValueForKey(value, path);
+    const Value holder = valueForKeyPath(path.substr(0, dot));
+    if (Object* object = holder.object())
+        object->setValueForKey(value, path.substr(dot + 1));
+}
+
+void Object::willChangeValueForKey(Key) {}
+
+void Object::didChangeValueForKey(Key) {}
+
+bool Object::respondsTo(Selector selector) const { return isa().operation(selector) != nullptr; }
+
+Value Object::performWithArguments(Selector selector, std::span<const Value> arguments) {
+    const Class& type = isa();
+    if (const Operation* operation = type.operation(selector))
+        return operation->invoke(selector, type, this, arguments);
+    throw Exception(Exception::invalidArgument,
+                    String::concat({"class ", type.name(), " does not answer the operation ",
+                                    selector.name()}));
+}
+
+} // namespace qx
