@@ -13,8 +13,9 @@ set(QX_LAYERS
 
 # The folders that a folder may use, those that they use included.
 set(QX_BELOW_platform_object)
-set(QX_BELOW_platform_xml platform/object)
-set(QX_BELOW_platform_system platform/object)
+# Documents are read and written as files; property lists are read as documents.
+set(QX_BELOW_platform_xml platform/object platform/system)
+set(QX_BELOW_platform_system platform/object platform/xml)
 set(QX_BELOW_mapping platform/object platform/xml platform/system)
 set(QX_BELOW_repository platform/object platform/xml platform/system)
 set(QX_BELOW_record platform/object platform/xml platform/system)

@@ -1,0 +1,39 @@
+#pragma once
+
+// Files and directories by path. Failures are errors of qx::Error::cocoaDomain whose message says
+// what failed and for which path, and whose reason is the operating system's text:
+//   260 no such file, 257 reading not permitted, 256 any other failure to read
+//   514 the name is invalid, 513 writing not permitted, 640 disk full, 642 read-only disk,
+//   512 any other failure to write
+// Everything here may be called from any thread.
+
+#include <QXXMLMarshalling/platform/Data.h>
+#include <QXXMLMarshalling/platform/Error.h>
+
+namespace qx {
+
+// The file's bytes; null with an error. A large file is mapped where nobody without privileges can
+// cut it short meanwhile (reading behind its end would end the process); any other is copied.
+Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr);
+
+// Writes a temporary file beside the target, flushes it to disk and renames it over the target: at
+// every moment, a power failure included, the path names the old bytes or the new ones, whole. The
+// permissions of a file that is replaced are kept; a symbolic link is replaced, not followed. False
+// with an error; the old file is then untouched and the temporary one gone.
+bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>* error = nullptr);
+
+// Whether anything is there, symbolic links followed.
+bool fileExists(const String& path);
+bool isDirectory(const String& path);
+
+// Makes the directory and those above it that are missing; fine when it is there already.
+bool createDirectoryWithParents(const String& path, Ref<Error>* error = nullptr);
+
+// The directory with a further component, with exactly one slash between them.
+String appendingPathComponent(std::string_view directory, std::string_view component);
+
+// The path in a file: URL, its percent escapes decoded, or the text itself where it is no such URL.
+// Null for a URL of another scheme or host.
+String pathOfURL(const String& URL);
+
+} // namespace qx

@@ -1,0 +1,7 @@
+#include "platform/system/Localization.h"
+
+namespace qx {
+
+String localizedText(std::string_view englishText) { return englishText; }
+
+} // namespace qx
