@@ -1,0 +1,84 @@
+#include <QXXMLMarshalling/QXXMLBindToMapping.h>
+
+#include <QXXMLMarshalling/QXXMLClassMapping.h>
+
+#include "platform/object/LibraryClass.h"
+#include "platform/system/Errors.h"
+
+using qx::Error;
+using qx::Ref;
+using qx::String;
+using qx::XMLElement;
+
+QXXMLBindToMapping::~QXXMLBindToMapping() = default;
+
+Ref<QXXMLBindToMapping> QXXMLBindToMapping::initWithXML(XMLElement* element, Ref<Error>* error) {
+    return initialized<QXXMLBindToMapping>(element, error);
+}
+
+Ref<QXXMLBindToMapping> QXXMLBindToMapping::initWithMinimalXML(XMLElement* element,
+                                                               Ref<Error>* error) {
+    return initialized<QXXMLBindToMapping>(element, error, true);
+}
+
+bool QXXMLBindToMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    if (!QXXMLMapping::initXML(element, error) ||
+        !extractStringAttribute("name", element, false, _bindTo, error) ||
+        !extractStringAttribute("location", element, false, _location, error))
+        return false;
+    if (_minimal)
+        return true;
+    if (!extractStringAttribute("type", element, false, _type, error) ||
+        !extractStringAttribute("node", element, false, _node, error) ||
+        !extractStringAttribute("references", element, false, _references, error) ||
+        !extractStringAttribute("matches", element, false, _matches, error) ||
+        !extractStringAttribute("QName-prefix", element, false, _qNamePrefix, error) ||
+        !extractStringAttribute("auto-naming", element, false, _autoNaming, error))
+        return false;
+    const auto classes = element.elementsForName(qx::Key("class"));
+    if (classes.size() > 1)
+        return qx::fail(error, qx::errors::tooManyClassElements, &element);
+    if (!classes.empty())
+        _childClassMapping = QXXMLClassMapping::initWithXML(classes.front(), error);
+    return classes.empty() || _childClassMapping;
+}
+
+QXXMLNodeType QXXMLBindToMapping::nodeType() const {
+    if (_node.equalsIgnoringCase("element"))
+        return QXXMLNodeTypeElement;
+    if (_node.equalsIgnoringCase("attribute"))
+        return QXXMLNodeTypeAttribute;
+    return _node.equalsIgnoringCase("text") ? QXXMLNodeTypeText : QXXMLNodeTypeUnknown;
+}
+
+Ref<QXXMLClassMapping> QXXMLBindToMapping::childClassMapping() const { return _childClassMapping; }
+
+void QXXMLBindToMapping::setChildClassMapping(Ref<QXXMLClassMapping> mapping) {
+    _childClassMapping = std::move(mapping);
+}
+
+String QXXMLBindToMapping::descriptionWithLocale(const qx::Object* locale,
+                                                 std::size_t indent) const {
+    std::string text = QXXMLMapping::descriptionWithLocale(locale, indent).str();
+    append(text, "bindTo", _bindTo);
+    append(text, "type", _type);
+    append(text, "node", _node);
+    append(text, "location", _location);
+    append(text, "references", _references);
+    append(text, "matches", _matches);
+    append(text, "QName-prefix", _qNamePrefix);
+    if (_reference)
+        append(text, "reference", "true");
+    append(text, "auto-naming", _autoNaming);
+    if (_childClassMapping) {
+        text += " childClassMapping:\n";
+        text += _childClassMapping->descriptionWithLocale(locale, indent).view();
+    }
+    return text;
+}
+
+Ref<QXXMLMapping> QXXMLBindToMapping::newInstance() const { return qx::make<QXXMLBindToMapping>(); }
+
+const qx::Class& QXXMLBindToMapping::describedClass() const {
+    return qx::libraryClass<QXXMLBindToMapping, QXXMLMapping>("QXXMLBindToMapping");
+}

@@ -1,0 +1,62 @@
+#include <QXXMLMarshalling/QXXMLDocumentMapping.h>
+
+#include "platform/object/LibraryClass.h"
+#include "platform/system/Errors.h"
+
+using qx::Error;
+using qx::Key;
+using qx::Ref;
+using qx::String;
+using qx::XMLElement;
+
+QXXMLDocumentMapping::~QXXMLDocumentMapping() = default;
+
+Ref<QXXMLDocumentMapping> QXXMLDocumentMapping::initWithXML(XMLElement* root, Ref<Error>* error) {
+    return initialized<QXXMLDocumentMapping>(root, error);
+}
+
+bool QXXMLDocumentMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    if (!QXXMLMapping::initXML(element, error))
+        return false;
+    for (const XMLElement* include : element.elementsForName(Key("include")))
+        if (const qx::XMLNode* href = include->attributeForName(Key("href")))
+            _includes.push_back(href->stringValue());
+    return processClasses(element.elementsForName(Key("class")), error);
+}
+
+bool QXXMLDocumentMapping::processClasses(const std::vector<XMLElement*>& elements,
+                                          Ref<Error>* error) {
+    for (XMLElement* element : elements) {
+        auto mapping = QXXMLClassMapping::initWithXML(element, error);
+        if (!mapping)
+            return false;
+        _classMappings.push_back(std::move(mapping));
+    }
+    return true;
+}
+
+void QXXMLDocumentMapping::mergeDocumentMapping(const QXXMLDocumentMapping* other) {
+    if (other == nullptr)
+        return;
+    // Indexes, not iterators: a document may be merged with itself.
+    const std::size_t count = other->_classMappings.size();
+    _classMappings.reserve(_classMappings.size() + count);
+    for (std::size_t i = 0; i < count; ++i)
+        _classMappings.push_back(other->_classMappings[i]);
+}
+
+String QXXMLDocumentMapping::descriptionWithLocale(const qx::Object* locale,
+                                                   std::size_t indent) const {
+    std::string text = QXXMLMapping::descriptionWithLocale(locale, indent).str();
+    append(text, "includes", locale, indent, {_includes.begin(), _includes.end()});
+    append(text, "classes", locale, indent, {_classMappings.begin(), _classMappings.end()});
+    return text;
+}
+
+Ref<QXXMLMapping> QXXMLDocumentMapping::newInstance() const {
+    return qx::make<QXXMLDocumentMapping>();
+}
+
+const qx::Class& QXXMLDocumentMapping::describedClass() const {
+    return qx::libraryClass<QXXMLDocumentMapping, QXXMLMapping>("QXXMLDocumentMapping");
+}

@@ -1,0 +1,121 @@
+#include <QXXMLMarshalling/QXXMLFieldMapping.h>
+
+#include <QXXMLMarshalling/QXXMLClassMapping.h>
+
+#include "platform/object/LibraryClass.h"
+#include "platform/system/Errors.h"
+
+using qx::Error;
+using qx::Ref;
+using qx::String;
+using qx::XMLElement;
+
+QXXMLFieldMapping::~QXXMLFieldMapping() = default;
+
+Ref<QXXMLFieldMapping> QXXMLFieldMapping::initWithXML(XMLElement* element, Ref<Error>* error) {
+    return initialized<QXXMLFieldMapping>(element, error);
+}
+
+// The order of the steps decides which error a document with several faults gets.
+bool QXXMLFieldMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    return QXXMLMapping::initXML(element, error) &&
+           extractStringAttribute("name", element, true, _name, error) &&
+           extractStringAttribute("type", element, false, _type, error) &&
+           extractStringAttribute("handler", element, false, _handler, error) &&
+           extractStringAttribute("get-method", element, false, _getMethod, error) &&
+           extractStringAttribute("set-method", element, false, _setMethod, error) &&
+           extractStringAttribute("create-method", element, false, _createMethod, error) &&
+           extractStringAttribute("collection", element, false, _collection, error) &&
+           readFlag("required", Flag::required, false, error) &&
+           readFlag("container", Flag::container, true, error) &&
+           readFlag("lazy", Flag::lazy, false, error) &&
+           readFlag("direct", Flag::direct, false, error) &&
+           readFlag("transient", Flag::transient, false, error) && readBindings(error);
+}
+
+bool QXXMLFieldMapping::readFlag(const char* name, Flag flag, bool defaultValue,
+                                 Ref<Error>* error) {
+    bool value = false;
+    if (!extractBooleanAttribute(name, element(), false, value, defaultValue, error))
+        return false;
+    if (value)
+        _flags |= static_cast<std::uint32_t>(flag);
+    return true;
+}
+
+bool QXXMLFieldMapping::readBindings(Ref<Error>* error) {
+    const auto bindings = element().elementsForName(qx::Key("bind-xml"));
+    if (bindings.size() > 1)
+        return qx::fail(error, qx::errors::tooManyBindXMLElements, &element());
+    if (!bindings.empty()) {
+        _bindToMapping = QXXMLBindToMapping::initWithXML(bindings.front(), error);
+        if (!_bindToMapping)
+            return false;
+        _bindToMappings.push_back(_bindToMapping);
+    }
+    const auto alternatives = element().elementsForName(qx::Key("alt-xml"));
+    if (alternatives.empty())
+        return true;
+    if (bindings.empty())
+        return qx::fail(error, qx::errors::alternativesWithoutBindXML, &element());
+    return processAlternateBindTos(alternatives, error);
+}
+
+bool QXXMLFieldMapping::processAlternateBindTos(const std::vector<XMLElement*>& elements,
+                                                Ref<Error>* error) {
+    for (XMLElement* alternative : elements) {
+        auto binding = QXXMLBindToMapping::initWithMinimalXML(alternative, error);
+        if (!binding)
+            return false;
+        _bindToMappings.push_back(std::move(binding));
+    }
+    return true;
+}
+
+String QXXMLFieldMapping::bindTo() const {
+    return _bindToMapping ? _bindToMapping->bindTo() : String();
+}
+
+String QXXMLFieldMapping::node() const {
+    return _bindToMapping ? _bindToMapping->node() : String();
+}
+
+QXXMLNodeType QXXMLFieldMapping::nodeType() const {
+    return _bindToMapping ? _bindToMapping->nodeType() : QXXMLNodeTypeAttribute;
+}
+
+String QXXMLFieldMapping::location() const {
+    return _bindToMapping ? _bindToMapping->location() : String();
+}
+
+Ref<QXXMLClassMapping> QXXMLFieldMapping::classMapping() const { return _classMapping.lock(); }
+
+void QXXMLFieldMapping::setClassMapping(QXXMLClassMapping* mapping) { _classMapping = mapping; }
+
+String QXXMLFieldMapping::descriptionWithLocale(const qx::Object* locale,
+                                                std::size_t indent) const {
+    std::string text = QXXMLMapping::descriptionWithLocale(locale, indent).str();
+    append(text, "name", _name);
+    append(text, "type", _type);
+    append(text, "handler", _handler);
+    append(text, "get-method", _getMethod);
+    append(text, "set-method", _setMethod);
+    append(text, "create-method", _createMethod);
+    append(text, "collection", _collection);
+    constexpr std::pair<const char*, Flag> flags[] = {{"required", Flag::required},
+                                                      {"direct", Flag::direct},
+                                                      {"lazy", Flag::lazy},
+                                                      {"container", Flag::container},
+                                                      {"transient", Flag::transient}};
+    for (const auto& [name, flag] : flags)
+        if (hasFlag(flag))
+            append(text, name, "true");
+    append(text, "bindTo", locale, indent, {_bindToMappings.begin(), _bindToMappings.end()});
+    return text;
+}
+
+Ref<QXXMLMapping> QXXMLFieldMapping::newInstance() const { return qx::make<QXXMLFieldMapping>(); }
+
+const qx::Class& QXXMLFieldMapping::describedClass() const {
+    return qx::libraryClass<QXXMLFieldMapping, QXXMLMapping>("QXXMLFieldMapping");
+}

@@ -1,0 +1,108 @@
+#include <QXXMLMarshalling/QXXMLMapping.h>
+
+#include <QXXMLMarshalling/platform/Array.h>
+
+#include "platform/object/LibraryClass.h"
+#include "platform/system/Errors.h"
+
+using qx::Error;
+using qx::Key;
+using qx::Ref;
+using qx::String;
+using qx::XMLElement;
+
+QXXMLMapping::~QXXMLMapping() = default;
+
+Ref<QXXMLMapping> QXXMLMapping::initWithXML(XMLElement* element, Ref<Error>* error) {
+    return initialized<QXXMLMapping>(element, error);
+}
+
+bool QXXMLMapping::readElement(XMLElement* element, Ref<Error>* error) {
+    const auto kept = element != nullptr ? Ref<XMLElement>(element) : XMLElement::initWithName("");
+    return initXML(*kept, error);
+}
+
+bool QXXMLMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    static const Key descriptionKey("description");
+    _element = Ref<XMLElement>(&element);
+    const auto descriptions = element.elementsForName(descriptionKey);
+    if (descriptions.size() > 1)
+        return qx::fail(error, qx::errors::tooManyDescriptions, &element);
+    if (!descriptions.empty())
+        _mappingDescription = descriptions.front()->stringValue();
+    return true;
+}
+
+Ref<QXXMLMapping> QXXMLMapping::copyWithZone() const {
+    auto copy = newInstance();
+    Ref<Error> ignored;
+    return copy->readElement(_element.get(), &ignored) ? copy : nullptr;
+}
+
+Ref<QXXMLMapping> QXXMLMapping::newInstance() const { return qx::make<QXXMLMapping>(); }
+
+String QXXMLMapping::description() const { return descriptionWithLocale(nullptr, 0); }
+
+String QXXMLMapping::descriptionWithLocale(const qx::Object*, std::size_t) const {
+    std::string text = Object::description().str();
+    append(text, "description", _mappingDescription);
+    return text;
+}
+
+void QXXMLMapping::append(std::string& text, std::string_view key, const String& value) {
+    if (value.isEmpty())
+        return;
+    text += ' ';
+    text += key;
+    text += ": ";
+    text += value.view();
+}
+
+void QXXMLMapping::append(std::string& text, std::string_view key, const qx::Object* locale,
+                          std::size_t indent, std::vector<qx::Value> list) {
+    if (list.empty())
+        return;
+    text += ' ';
+    text += key;
+    text += ":\n";
+    text += qx::make<qx::Array>(std::move(list))->descriptionWithLocale(locale, indent).view();
+}
+
+// Values are interned: they are names for the most part, and documents are compared with them.
+bool QXXMLMapping::extractStringAttribute(Key name, const XMLElement& element, bool required,
+                                          String& result, Ref<Error>* error) {
+    result = String();
+    const qx::XMLNode* attribute = element.attributeForName(name);
+    if (attribute != nullptr) {
+        result = Key(attribute->stringValue());
+        return true;
+    }
+    return !required ||
+           qx::fail(error, qx::errors::requiredAttributeNotFound, name.string(), &element);
+}
+
+bool QXXMLMapping::extractBooleanAttribute(Key name, const XMLElement& element, bool required,
+                                           bool& result, Ref<Error>* error) {
+    return extractBooleanAttribute(name, element, required, result, false, error);
+}
+
+bool QXXMLMapping::extractBooleanAttribute(Key name, const XMLElement& element, bool required,
+                                           bool& result, bool defaultValue, Ref<Error>* error) {
+    result = defaultValue;
+    const qx::XMLNode* attribute = element.attributeForName(name);
+    if (attribute == nullptr)
+        return !required ||
+               qx::fail(error, qx::errors::requiredAttributeNotFound, name.string(), &element);
+    const String value = attribute->stringValue();
+    if (value.equalsIgnoringCase("true"))
+        result = true;
+    else if (value.equalsIgnoringCase("false"))
+        result = false;
+    else
+        return qx::fail(error, qx::errors::illegalBoolean, name.string(), value);
+    return true;
+}
+
+const qx::Class& QXXMLMapping::describedClass() const {
+    return qx::libraryClass<QXXMLMapping>("QXXMLMapping");
+}
