@@ -105,7 +105,5 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" OR NOT (QX_SANITIZE OR QX_FUZZ))
 endif()
 
 # <libdir>/../share/QXXMLMarshalling, as installed.
-if(EXISTS "${PROJECT_SOURCE_DIR}/share")
-    file(MAKE_DIRECTORY "${CMAKE_BINARY_DIR}/share")
-    file(CREATE_LINK "${PROJECT_SOURCE_DIR}/share" "${CMAKE_BINARY_DIR}/share/QXXMLMarshalling" SYMBOLIC)
-endif()
+file(MAKE_DIRECTORY "${CMAKE_BINARY_DIR}/share")
+file(CREATE_LINK "${PROJECT_SOURCE_DIR}/share" "${CMAKE_BINARY_DIR}/share/QXXMLMarshalling" SYMBOLIC)
