@@ -101,6 +101,7 @@ protected:
 private:
     struct Extras;
     friend class Class;
+    friend struct ObjectInternals;
 
     void destroy() const noexcept;
     Extras& extras() const;

@@ -40,7 +40,13 @@ Object::Object() noexcept {
 }
 
 Object::~Object() {
-    delete _extras;
+    // Told already unless this object was never counted, or gained listeners while it ended.
+    if (_extras != nullptr) {
+        if (_extras->anchor)
+            _extras->anchor->clear();
+        ObjectInternals::tellEndListeners(*this);
+        delete _extras;
+    }
 #ifndef NDEBUG
     liveObjects.fetch_sub(1, std::memory_order_relaxed);
 #endif
@@ -67,6 +73,7 @@ void Object::destroy() const noexcept {
         return;
     }
     ++ending.depth;
+    ObjectInternals::tellEndListeners(*self);
     delete self;
     --ending.depth;
     while (ending.depth == 0 && ending.waiting != nullptr) {
@@ -75,9 +82,14 @@ void Object::destroy() const noexcept {
             const_cast<Class*>(next->_isa.load(std::memory_order_relaxed)));
         next->_isa.store(nullptr);
         ++ending.depth;
+        ObjectInternals::tellEndListeners(*next);
         delete next;
         --ending.depth;
     }
+}
+
+bool ObjectInternals::isEnding(const Object& object) noexcept {
+    return object._count.load(std::memory_order_relaxed) >= endingCount / 2;
 }
 
 Object::Extras& Object::extras() const {

@@ -4,10 +4,36 @@
 
 #include <QXXMLMarshalling/platform/Object.h>
 
+#include <vector>
+
 namespace qx {
+
+// Told once when an object that it was added to ends, while the object is still whole.
+class EndListener {
+public:
+    virtual void objectEnds(Object& object) noexcept = 0;
+
+protected:
+    ~EndListener() = default;
+};
 
 struct Object::Extras {
     Ref<WeakAnchor> anchor;
+    std::vector<EndListener*> endListeners;
+};
+
+// The extras for the rest of this room.
+struct ObjectInternals {
+    static Object::Extras& extras(const Object& object) { return object.extras(); }
+    // Null when the object has none.
+    static Object::Extras* existingExtras(const Object& object) noexcept { return object._extras; }
+    // Whether the object's last reference is gone.
+    static bool isEnding(const Object& object) noexcept;
+
+    static void addEndListener(Object& object, EndListener& listener);
+    // Does nothing when the listener was told already.
+    static void removeEndListener(Object& object, EndListener& listener) noexcept;
+    static void tellEndListeners(Object& object) noexcept;
 };
 
 } // namespace qx

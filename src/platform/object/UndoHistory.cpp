@@ -1,0 +1,131 @@
+#include "platform/object/UndoHistory.h"
+
+namespace qx {
+
+void UndoAction::performOn(Object& object) {
+    if (call)
+        call(object);
+    else
+        object.performWithArguments(selector, arguments);
+}
+
+void UndoItemGroup::append(UndoItem& item) noexcept {
+    item.parent = this;
+    item.previous = last;
+    item.next = nullptr;
+    (last != nullptr ? last->next : first) = &item;
+    last = &item;
+    ++count;
+}
+
+void UndoItemGroup::unlink(UndoItem& item) noexcept {
+    (item.previous != nullptr ? item.previous->next : first) = item.next;
+    (item.next != nullptr ? item.next->previous : last) = item.previous;
+    item.parent = nullptr;
+    item.previous = item.next = nullptr;
+    --count;
+}
+
+void UndoItemGroup::takeAll(UndoItemGroup& other) noexcept {
+    while (UndoItem* item = other.first) {
+        other.unlink(*item);
+        append(*item);
+    }
+}
+
+UndoHistory::~UndoHistory() {
+    removeContents(_undoStack);
+    removeContents(_redoStack);
+}
+
+void UndoHistory::add(UndoAction* action, UndoItemGroup& group) {
+    UndoAction*& first = _firstOfTarget[action->target];
+    if (first == nullptr) {
+        try {
+            ObjectInternals::addEndListener(*action->target, *this);
+        } catch (...) {
+            _firstOfTarget.erase(action->target);
+            throw;
+        }
+    }
+    action->nextOfTarget = first;
+    if (first != nullptr)
+        first->previousOfTarget = action;
+    first = action;
+    group.append(*action);
+}
+
+void UndoHistory::unlinkFromTarget(UndoAction& action) noexcept {
+    if (action.nextOfTarget != nullptr)
+        action.nextOfTarget->previousOfTarget = action.previousOfTarget;
+    if (action.previousOfTarget != nullptr) {
+        action.previousOfTarget->nextOfTarget = action.nextOfTarget;
+    } else if (action.nextOfTarget != nullptr) {
+        _firstOfTarget[action.target] = action.nextOfTarget;
+    } else {
+        _firstOfTarget.erase(action.target);
+        ObjectInternals::removeEndListener(*action.target, *this);
+    }
+    action.previousOfTarget = action.nextOfTarget = nullptr;
+}
+
+void UndoHistory::forgetTarget(const Object* target) noexcept {
+    const auto found = _firstOfTarget.find(target);
+    if (found == _firstOfTarget.end())
+        return;
+    UndoItemGroup forgotten;
+    for (UndoAction* action = found->second; action != nullptr; action = action->nextOfTarget) {
+        // A group that this empties leaves no entry, nor do those around it.
+        UndoItem* item = action;
+        UndoItemGroup* parent = item->parent;
+        parent->unlink(*item);
+        while (parent->count == 0 && !parent->stays) {
+            item = parent;
+            parent = item->parent;
+            parent->unlink(*item);
+            forgotten.append(*item);
+        }
+        forgotten.append(*action);
+    }
+    removeContents(forgotten);
+}
+
+void UndoHistory::destroy(UndoItem* item) noexcept {
+    UndoItemGroup ending;
+    ending.append(*item);
+    removeContents(ending);
+}
+
+void UndoHistory::removeContents(UndoItemGroup& group) noexcept {
+    UndoItemGroup ending;
+    ending.takeAll(group);
+    while (UndoItem* item = ending.first) {
+        ending.unlink(*item);
+        if (item->isGroup) {
+            auto* nested = static_cast<UndoItemGroup*>(item);
+            ending.takeAll(*nested);
+            delete nested;
+        } else {
+            auto* action = static_cast<UndoAction*>(item);
+            unlinkFromTarget(*action);
+            delete action;
+        }
+    }
+}
+
+UndoAction* UndoHistory::takeLastAction(UndoItemGroup& group) noexcept {
+    while (UndoItem* item = group.last) {
+        group.unlink(*item);
+        if (!item->isGroup) {
+            auto* action = static_cast<UndoAction*>(item);
+            unlinkFromTarget(*action);
+            return action;
+        }
+        auto* nested = static_cast<UndoItemGroup*>(item);
+        group.takeAll(*nested);
+        delete nested;
+    }
+    return nullptr;
+}
+
+} // namespace qx
