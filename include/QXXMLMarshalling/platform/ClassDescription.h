@@ -161,7 +161,7 @@ Value call(Selector selector, const Class& receiver, std::span<const Value> argu
         raiseArgumentCount(selector, receiver, arguments.size());
     return [&]<std::size_t... I>(std::index_sequence<I...>)->Value {
         std::tuple<Stored<std::tuple_element_t<First + I, typename S::Arguments>>...> converted;
-        const auto convert = [&]<class V>(const Value& value, V& result) {
+        [[maybe_unused]] const auto convert = [&]<class V>(const Value& value, V& result) {
             if (!ValueTraits<V>::fromValue(value, result))
                 raiseArgument(selector, receiver, value);
         };

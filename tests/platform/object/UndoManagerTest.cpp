@@ -1,0 +1,314 @@
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/UndoManager.h>
+#include <QXXMLMarshalling/platform/WeakRef.h>
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using namespace qx;
+
+// Registers the inverse of each of its changes by hand.
+class Counter : public Object {
+public:
+    explicit Counter(UndoManager& undoManager) : manager(undoManager) {}
+
+    void setNumber(int value) {
+        manager.prepareWithInvocationTarget(this).perform("setNumber:", number);
+        number = value;
+    }
+    void reset() { setNumber(0); }
+    void fail() { throw std::runtime_error("fails"); }
+
+    UndoManager& manager;
+    int number = 0;
+};
+
+const bool described = [] {
+    Class::define<Counter>("UndoManagerTest.Counter")
+        .operation<&Counter::setNumber>("setNumber:")
+        .operation<&Counter::reset>("reset")
+        .operation<&Counter::fail>("fail");
+    return true;
+}();
+
+struct UndoManagerTest : testing::Test {
+    Ref<UndoManager> manager = make<UndoManager>();
+    Ref<Counter> counter = make<Counter>(*manager);
+
+    void setInGroup(int value, const String& name = nullptr) {
+        const UndoGroup group(manager, name);
+        counter->setNumber(value);
+    }
+    template <class F>
+    std::string raised(F call) {
+        try {
+            call();
+        } catch (const Exception& exception) {
+            return exception.name();
+        }
+        return "nothing";
+    }
+};
+
+TEST_F(UndoManagerTest, UndoAndRedoWalkThroughTheGroups) {
+    setInGroup(1);
+    setInGroup(2);
+    manager->undo();
+    EXPECT_EQ(counter->number, 1);
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+    EXPECT_FALSE(manager->canUndo());
+    manager->undo(); // nothing happens
+    manager->redo();
+    manager->redo();
+    EXPECT_EQ(counter->number, 2);
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, ARegistrationOutsideAnyGroupOpensOneUntilTheEventEnds) {
+    counter->setNumber(1);
+    counter->setNumber(2);
+    EXPECT_EQ(manager->groupingLevel(), 1U);
+    manager->endEventGroup();
+    EXPECT_EQ(manager->groupingLevel(), 0U);
+    manager->endEventGroup(); // there is none any more
+    counter->setNumber(3);
+    manager->undo();
+    EXPECT_EQ(counter->number, 2);
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+}
+
+TEST_F(UndoManagerTest, AGroupOpenedByHandOpensNoOtherAndMayNest) {
+    manager->beginUndoGrouping();
+    EXPECT_EQ(manager->groupingLevel(), 1U);
+    setInGroup(1);
+    setInGroup(2);
+    EXPECT_EQ(raised([&] { manager->undo(); }), "nothing"); // ends the group and undoes all of it
+    EXPECT_EQ(counter->number, 0);
+    EXPECT_EQ(manager->groupingLevel(), 0U);
+}
+
+TEST_F(UndoManagerTest, NestedGroupsCanBeUndoneWhileTheOuterStaysOpen) {
+    manager->beginUndoGrouping();
+    setInGroup(1);
+    setInGroup(2);
+    manager->undoNestedGroup();
+    EXPECT_EQ(counter->number, 1);
+    EXPECT_EQ(manager->groupingLevel(), 1U);
+    counter->setNumber(7);
+    EXPECT_EQ(raised([&] { manager->undoNestedGroup(); }), "NSInternalInconsistencyException");
+    manager->endUndoGrouping();
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+}
+
+TEST_F(UndoManagerTest, EmptyGroupsLeaveNoEntry) {
+    {
+        const UndoGroup outer(manager);
+        const UndoGroup inner(manager);
+    }
+    EXPECT_FALSE(manager->canUndo());
+    setInGroup(1);
+    manager->undo();
+    { const UndoGroup group(manager); }
+    EXPECT_TRUE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, FaultsOfTheCallerRaise) {
+    const auto inconsistent = "NSInternalInconsistencyException";
+    EXPECT_EQ(raised([&] { manager->endUndoGrouping(); }), inconsistent);
+    EXPECT_EQ(raised([&] { manager->enableUndoRegistration(); }), inconsistent);
+    manager->setGroupsByEvent(false);
+    EXPECT_EQ(raised([&] { counter->setNumber(1); }), inconsistent);
+    EXPECT_EQ(raised([&] { manager->registerUndoWithTarget(nullptr, "reset", nullptr); }),
+              "NSInvalidArgumentException");
+    EXPECT_EQ(
+        raised([&] { manager->prepareWithInvocationTarget(counter.get()).perform("unknown"); }),
+        "NSInvalidArgumentException");
+    const UndoGroup outer(manager);
+    const UndoGroup inner(manager);
+    EXPECT_EQ(raised([&] { manager->undo(); }), inconsistent);
+    EXPECT_EQ(raised([&] { manager->redo(); }), inconsistent);
+    EXPECT_EQ(manager->groupingLevel(), 2U);
+}
+
+TEST_F(UndoManagerTest, ScopesEndTheirGroupWhateverWasLeftOpenOrClosedInside) {
+    try {
+        const UndoGroup group(manager);
+        manager->beginUndoGrouping();
+        counter->setNumber(1);
+        throw 1;
+    } catch (int) {
+    }
+    EXPECT_EQ(manager->groupingLevel(), 0U);
+    {
+        const UndoGroup group(manager);
+        manager->endUndoGrouping();
+        manager->beginUndoGrouping();
+    }
+    EXPECT_EQ(manager->groupingLevel(), 1U);
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+}
+
+TEST_F(UndoManagerTest, DisablingIsCounted) {
+    manager->disableUndoRegistration();
+    manager->disableUndoRegistration();
+    manager->enableUndoRegistration();
+    setInGroup(1);
+    EXPECT_FALSE(manager->canUndo());
+    manager->enableUndoRegistration();
+    setInGroup(2);
+    manager->undo();
+    EXPECT_EQ(counter->number, 1);
+}
+
+TEST_F(UndoManagerTest, ANewRegistrationEndsWhatCouldBeRedone) {
+    setInGroup(1);
+    manager->undo();
+    EXPECT_TRUE(manager->canRedo());
+    setInGroup(5);
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, ATargetThatDiesIsForgottenInEveryGroup) {
+    setInGroup(1);
+    auto other = make<Counter>(*manager);
+    {
+        const UndoGroup group(manager);
+        other->setNumber(1);
+        const UndoGroup nested(manager);
+        other->setNumber(2);
+    }
+    other->setNumber(3); // in a group that is open
+    other = nullptr;
+    EXPECT_TRUE(manager->canUndo());
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+    counter = nullptr;
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, ActionsOfOneTargetCanBeRemovedWhileOthersStay) {
+    Counter other(*manager); // on the stack, counted by nobody
+    {
+        const UndoGroup group(manager);
+        other.setNumber(1);
+        counter->setNumber(1);
+    }
+    manager->removeAllActionsWithTarget(counter.get());
+    manager->removeAllActionsWithTarget(nullptr);
+    manager->undo();
+    EXPECT_EQ(other.number, 0);
+    EXPECT_EQ(counter->number, 1);
+    manager->removeAllActionsWithTarget(&other);
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, ArgumentsAreKeptUntilTheActionGoes) {
+    auto kept = make<Counter>(*manager);
+    const WeakRef<Counter> watched(kept);
+    manager->registerUndo(*counter, [kept](Counter& target) { target.number = kept->number; });
+    kept->number = 9;
+    kept = nullptr;
+    EXPECT_TRUE(watched);
+    manager->undo();
+    EXPECT_EQ(counter->number, 9);
+    EXPECT_FALSE(watched);
+}
+
+TEST_F(UndoManagerTest, AnActionThatThrowsDropsItsGroupAndLeavesTheRest) {
+    setInGroup(1);
+    {
+        const UndoGroup group(manager);
+        manager->registerUndoWithTarget(counter.get(), "fail", nullptr);
+        counter->setNumber(2);
+    }
+    EXPECT_THROW(manager->undo(), std::runtime_error);
+    EXPECT_FALSE(manager->isUndoing());
+    EXPECT_EQ(manager->groupingLevel(), 0U);
+    EXPECT_FALSE(manager->canRedo());
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+}
+
+TEST_F(UndoManagerTest, ActionsCannotUndoOrEndTheGroupTheyRunIn) {
+    for (void (UndoManager::*call)() :
+         {&UndoManager::undo, &UndoManager::redo, &UndoManager::endUndoGrouping,
+          &UndoManager::undoNestedGroup}) {
+        setInGroup(1);
+        manager->registerUndo(*counter, [call](Counter& target) { (target.manager.*call)(); });
+        EXPECT_EQ(raised([&] { manager->undo(); }), "NSInternalInconsistencyException");
+        EXPECT_EQ(manager->groupingLevel(), 0U);
+    }
+}
+
+TEST_F(UndoManagerTest, AnActionMayRemoveThoseThatWouldFollow) {
+    setInGroup(1);
+    {
+        const UndoGroup group(manager);
+        counter->setNumber(2);
+        manager->registerUndo(*counter, [](Counter& c) { c.manager.removeAllActions(); });
+    }
+    manager->undo();
+    EXPECT_EQ(counter->number, 2);
+    EXPECT_FALSE(manager->canUndo());
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, LevelsOfUndoDropTheOldest) {
+    manager->setLevelsOfUndo(3);
+    for (int value = 1; value <= 5; ++value)
+        setInGroup(value);
+    while (manager->canUndo())
+        manager->undo();
+    EXPECT_EQ(counter->number, 2);
+    manager->setLevelsOfUndo(1);
+    manager->redo();
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, NamesGoAlongFromUndoToRedo) {
+    setInGroup(1, "One");
+    counter->setNumber(2);
+    manager->setActionName("Two");
+    EXPECT_EQ(manager->undoActionName(), "Two");
+    manager->undo();
+    EXPECT_EQ(manager->undoActionName(), "One");
+    EXPECT_EQ(manager->redoActionName(), "Two");
+    manager->setActionName("First"); // no group is open: the last entry
+    manager->undo();
+    EXPECT_EQ(manager->undoActionName(), nullptr);
+    EXPECT_EQ(manager->redoActionName(), "First");
+}
+
+TEST_F(UndoManagerTest, AManagerMayEndWithTheActionsItHolds) {
+    struct Holder : Object {
+        explicit Holder(Ref<UndoManager> held) : manager(std::move(held)) {}
+        Ref<UndoManager> manager;
+    };
+    manager->registerUndoWithTarget(counter.get(), "setNumber:", make<Holder>(manager));
+    const WeakRef<UndoManager> watched(manager);
+    UndoManager* last = manager.get();
+    manager = nullptr;
+    EXPECT_TRUE(watched);
+    last->removeAllActions();
+    EXPECT_FALSE(watched);
+}
+
+TEST_F(UndoManagerTest, ManySetsKeepABoundedNumberOfObjects) {
+    manager->setLevelsOfUndo(100);
+    const auto before = Object::liveCount();
+    for (int i = 0; i < 100000; ++i) {
+        const UndoGroup group(manager);
+        manager->registerUndo(*counter, [kept = make<Object>()](Counter&) {});
+        if (i % 64 == 0)
+            manager->undo();
+    }
+    EXPECT_LE(Object::liveCount() - before, 101);
+}
+
+} // namespace
