@@ -87,6 +87,12 @@ public:
     template <class... Arguments>
     Value perform(Selector selector, const Arguments&... arguments);
 
+    // What the operation takes and returns, null where the object does not take it. A class that
+    // forwards operations answers for those too and gets each as an invocation; the default
+    // forwardInvocation raises NSInvalidArgumentException.
+    virtual Ref<MethodSignature> methodSignatureForSelector(Selector selector) const;
+    virtual void forwardInvocation(Invocation& invocation);
+
     // The anchor that weak references share; made on first use.
     Ref<WeakAnchor> weakAnchor() const;
 

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/Format.h>
+#include <QXXMLMarshalling/platform/Invocation.h>
 
 #include "platform/object/ObjectExtras.h"
 
@@ -229,13 +230,39 @@ void Object::didChangeValueForKey(Key) {}
 
 bool Object::respondsTo(Selector selector) const { return isa().operation(selector) != nullptr; }
 
+namespace {
+
+[[noreturn]] void raiseUnanswered(const Class& type, Selector selector) {
+    throw Exception(Exception::invalidArgument,
+                    String::concat({"class ", type.name(), " does not answer the operation ",
+                                    selector.name()}));
+}
+
+} // namespace
+
 Value Object::performWithArguments(Selector selector, std::span<const Value> arguments) {
     const Class& type = isa();
     if (const Operation* operation = type.operation(selector))
         return operation->invoke(selector, type, this, arguments);
-    throw Exception(Exception::invalidArgument,
-                    String::concat({"class ", type.name(), " does not answer the operation ",
-                                    selector.name()}));
+    Ref<MethodSignature> signature = methodSignatureForSelector(selector);
+    if (!signature)
+        raiseUnanswered(type, selector);
+    // Counted, since whoever takes the call may keep it for later.
+    const auto invocation = make<Invocation>(std::move(signature), this, selector, arguments);
+    forwardInvocation(*invocation);
+    const bool returnsValue = invocation->methodSignature().methodReturnLength() != 0;
+    return returnsValue ? invocation->returnValue() : Value();
+}
+
+Ref<MethodSignature> Object::methodSignatureForSelector(Selector selector) const {
+    const Operation* operation = isa().operation(selector);
+    if (operation == nullptr)
+        return nullptr;
+    return make<MethodSignature>(selector.argumentCount(), operation->returnsValue);
+}
+
+void Object::forwardInvocation(Invocation& invocation) {
+    raiseUnanswered(isa(), invocation.selector());
 }
 
 } // namespace qx

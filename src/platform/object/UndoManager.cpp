@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/MethodSignature.h>
 
 #include "platform/object/UndoHistory.h"
 
@@ -221,7 +222,7 @@ void UndoManager::registerOperation(Object* target, Selector selector,
         throw Exception(Exception::invalidArgument, "an undo action was registered without target");
     if (ObjectInternals::isEnding(*target))
         return;
-    if (!target->respondsTo(selector))
+    if (!target->respondsTo(selector) && !target->methodSignatureForSelector(selector))
         throw Exception(
             Exception::invalidArgument,
             String::concat({"an undo action was registered for the operation ", selector.name(),
