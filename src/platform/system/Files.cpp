@@ -285,6 +285,30 @@ String appendingPathComponent(std::string_view directory, std::string_view compo
     return String::concat({directory, directory == "/" ? "" : "/", component});
 }
 
+String relativePath(std::string_view name) {
+    if (name.starts_with('/') || name.find('\0') != std::string_view::npos)
+        return nullptr;
+    std::string path;
+    while (!name.empty()) {
+        const std::size_t slash = std::min(name.find('/'), name.size());
+        const std::string_view component = name.substr(0, slash);
+        name.remove_prefix(std::min(slash + 1, name.size()));
+        if (component.empty() || component == ".")
+            continue;
+        if (component != "..") {
+            if (!path.empty())
+                path += '/';
+            path += component;
+            continue;
+        }
+        if (path.empty())
+            return nullptr;
+        const std::size_t parent = path.rfind('/');
+        path.resize(parent == std::string::npos ? 0 : parent);
+    }
+    return path.empty() ? String() : String(path);
+}
+
 String pathOfURL(const String& URL) {
     constexpr std::string_view scheme = "file:";
     std::string_view rest = URL;

@@ -32,6 +32,11 @@ bool createDirectoryWithParents(const String& path, Ref<Error>* error = nullptr)
 // The directory with a further component, with exactly one slash between them.
 String appendingPathComponent(std::string_view directory, std::string_view component);
 
+// A name as a path below a directory, without "." and "..": "a.xml", "sub/a.xml". Null for a name
+// that is empty or absolute, holds a zero byte, or leads out of the directory or to the directory
+// itself.
+String relativePath(std::string_view name);
+
 // The path in a file: URL, its percent escapes decoded, or the text itself where it is no such URL.
 // Null for a URL of another scheme or host.
 String pathOfURL(const String& URL);

@@ -1,7 +1,100 @@
 #include "platform/system/Localization.h"
 
+#include <QXXMLMarshalling/platform/Bundle.h>
+
+#include "platform/system/Files.h"
+#include "platform/system/StringsFile.h"
+
+#include <cstdlib>
+#include <memory>
+#include <mutex>
+#include <vector>
+
 namespace qx {
 
-String localizedText(std::string_view englishText) { return englishText; }
+namespace {
+
+// What the user asks for, as the variable holds it: "de_DE.UTF-8", say.
+std::string_view localeName() {
+    for (const char* const variable : {"LC_ALL", "LC_MESSAGES", "LANG"}) {
+        const char* const value = std::getenv(variable);
+        if (value != nullptr && *value != '\0')
+            return value;
+    }
+    return {};
+}
+
+// "de_AT" of "de_AT.UTF-8@euro". Empty for the locales without a language, and for a name that
+// would be no folder's.
+std::string_view languageOf(std::string_view locale) {
+    locale = locale.substr(0, locale.find_first_of(".@"));
+    if (locale == "C" || locale == "POSIX" || locale.find('/') != std::string_view::npos)
+        return {};
+    return locale;
+}
+
+// The texts for a language and region, else for the language.
+Strings readStrings(std::string_view language) {
+    const Ref<Bundle> framework = Bundle::frameworkBundle();
+    if (!framework)
+        return {};
+    for (const auto name : {language, language.substr(0, language.find('_'))}) {
+        const String folder = String::concat({name, ".lproj"});
+        const String path =
+            framework->pathForResource(appendingPathComponent(folder, "Localizable.strings"));
+        if (path.isNull())
+            continue;
+        if (const Ref<Data> data = readFile(path))
+            return parseStrings(data->view());
+    }
+    return {};
+}
+
+// The texts of each language that was asked for; they stay for ever.
+class Languages {
+public:
+    static Languages& shared() {
+        static auto* const languages = new Languages;
+        return *languages;
+    }
+
+    const Strings& textsFor(std::string_view language) {
+        {
+            const std::lock_guard lock(_mutex);
+            if (const Strings* known = find(language))
+                return *known;
+        }
+        auto read = std::make_unique<Language>(std::string(language), readStrings(language));
+        const std::lock_guard lock(_mutex);
+        if (const Strings* known = find(language))
+            return *known;
+        _languages.push_back(std::move(read));
+        return _languages.back()->second;
+    }
+
+private:
+    using Language = std::pair<std::string, Strings>;
+
+    const Strings* find(std::string_view language) const {
+        for (const auto& known : _languages)
+            if (known->first == language)
+                return &known->second;
+        return nullptr;
+    }
+
+    std::mutex _mutex;
+    std::vector<std::unique_ptr<Language>> _languages;
+};
+
+} // namespace
+
+String localizedText(std::string_view englishText) {
+    const std::string_view language = languageOf(localeName());
+    if (language.empty() || englishText.empty())
+        return englishText;
+    const Strings& texts = Languages::shared().textsFor(language);
+    const auto found = texts.find(englishText);
+    return found != texts.end() ? found->second : String(englishText);
+}
 
 } // namespace qx

@@ -1,0 +1,61 @@
+#pragma once
+
+// A folder with the resources of a program or a library, described by an XML property list
+// Info.plist in it. Bundles are opened once and then shared; any thread may ask for them.
+//
+//     main bundle        what the host set, else <folder>/../share/<process name> beside the folder
+//                        of the running program where that exists, else the program's folder
+//     framework bundle   this library's: <folder>/../share/QXXMLMarshalling beside its own folder
+//     of a class         <folder>/../share/<name> for a class in lib<name>.so, else that folder;
+//     the
+//                        main bundle for a class of the program itself
+
+#include <QXXMLMarshalling/platform/Dictionary.h>
+
+#include <typeinfo>
+
+namespace qx {
+
+class QX_API Bundle final : public Object {
+public:
+    static Ref<Bundle> mainBundle();
+    // Null goes back to the program's own.
+    static void setMainBundle(const Ref<Bundle>& bundle);
+    static Ref<Bundle> frameworkBundle();
+    // The bundle of the program or shared object that holds the class: bundleForClass(typeid(*x)).
+    static Ref<Bundle> bundleForClass(const std::type_info& type);
+    // Null when there is no folder at the path.
+    static Ref<Bundle> bundleWithPath(const String& path);
+    // Among the bundles opened so far, the main and the framework bundle with them; else null.
+    static Ref<Bundle> bundleWithIdentifier(const String& identifier);
+    ~Bundle() override;
+
+    const String& bundlePath() const noexcept { return _path; }
+    // CFBundleIdentifier; null without one.
+    String bundleIdentifier() const;
+    // What Info.plist holds, empty without a readable one. Set what it should hold besides before
+    // other threads use the bundle.
+    const Ref<Dictionary>& infoDictionary() const noexcept { return _info; }
+    // An entry of the info dictionary, null without one. The versions of the main bundle are those of
+    // ProcessInfo::setProcessVersion where the host has set them.
+    Value objectForInfoDictionaryKey(const String& key) const;
+    // The path of a file or folder in the bundle, which may lie in a folder of it ("maps/a.xml");
+    // null when there is none or the name leads out of the bundle. A type is added behind a dot.
+    String pathForResource(std::string_view name, const String& type = nullptr) const;
+
+    // The class name, the address and the path.
+    String description() const override;
+
+protected:
+    const Class& describedClass() const override;
+
+private:
+    friend Ref<Bundle> make<Bundle>(String&, Ref<Dictionary>&&);
+
+    Bundle(String path, Ref<Dictionary> info) noexcept;
+
+    String _path;
+    Ref<Dictionary> _info;
+};
+
+} // namespace qx

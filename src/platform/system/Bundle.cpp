@@ -1,0 +1,206 @@
+#include <QXXMLMarshalling/platform/Bundle.h>
+
+#include <QXXMLMarshalling/platform/ProcessInfo.h>
+
+#include "platform/object/LibraryClass.h"
+#include "platform/system/Files.h"
+#include "platform/system/PropertyList.h"
+
+#include <cstdlib>
+#include <dlfcn.h>
+#include <mutex>
+#include <vector>
+
+namespace qx {
+
+namespace {
+
+struct OpenBundles {
+    // Lives for ever: code that runs while the program ends may still ask.
+    static OpenBundles& shared() {
+        static auto* const bundles = new OpenBundles;
+        return *bundles;
+    }
+
+    std::mutex mutex;
+    std::vector<Ref<Bundle>> bundles; // in the order in which they were opened
+    Ref<Bundle> main;                 // set by the host
+};
+
+String folderOf(std::string_view path) {
+    const std::size_t slash = path.rfind('/');
+    if (slash == std::string_view::npos)
+        return ".";
+    return path.substr(0, slash == 0 ? 1 : slash);
+}
+
+// Absolute, without "." and ".." and symbolic links; null when nothing is there.
+String realPath(const String& path) {
+    char* const resolved = ::realpath(path.c_str(), nullptr);
+    const String result = resolved;
+    std::free(resolved);
+    return result;
+}
+
+// The resources of a program or library that lies in `folder`: <folder>/../share/<name>. Null when
+// there is no such folder.
+String sharedFolder(const String& folder, std::string_view name) {
+    const String share = appendingPathComponent(folderOf(folder), "share");
+    const String path = appendingPathComponent(share, name);
+    return isDirectory(path) ? path : String();
+}
+
+String folderOfProgram() {
+    const String program = ProcessInfo::executablePath();
+    return program.isNull() ? String(".") : folderOf(program);
+}
+
+// The file that holds the address: null for the program itself, and where nobody knows.
+String sharedObjectHolding(const void* address) {
+    Dl_info found{};
+    if (::dladdr(address, &found) == 0 || found.dli_fname == nullptr)
+        return nullptr;
+    const String file = realPath(found.dli_fname);
+    return file == ProcessInfo::executablePath() ? String() : file;
+}
+
+// "name" of …/libname.so.1.2
+std::string_view libraryName(std::string_view file) {
+    file.remove_prefix(file.rfind('/') + 1);
+    if (file.starts_with("lib"))
+        file.remove_prefix(3);
+    return file.substr(0, file.find(".so"));
+}
+
+constexpr std::string_view frameworkName = "QXXMLMarshalling";
+
+String frameworkPath() {
+    static const char anchor = 0; // lies where this library lies
+    const String file = sharedObjectHolding(&anchor);
+    const String folder = file.isNull() ? folderOfProgram() : folderOf(file);
+    const String installed = sharedFolder(folder, frameworkName);
+    if (!installed.isNull())
+        return installed;
+#ifdef QX_FRAMEWORK_SHARE_DIR
+    if (isDirectory(QX_FRAMEWORK_SHARE_DIR))
+        return QX_FRAMEWORK_SHARE_DIR;
+#endif
+    return folder;
+}
+
+} // namespace
+
+Bundle::Bundle(String path, Ref<Dictionary> info) noexcept
+    : _path(std::move(path)), _info(std::move(info)) {}
+
+Bundle::~Bundle() = default;
+
+Ref<Bundle> Bundle::bundleWithPath(const String& path) {
+    if (!isDirectory(path))
+        return nullptr;
+    String real = realPath(path);
+    if (real.isNull())
+        return nullptr;
+    OpenBundles& open = OpenBundles::shared();
+    const auto find = [&]() -> Ref<Bundle> {
+        for (const auto& bundle : open.bundles)
+            if (bundle->bundlePath() == real)
+                return bundle;
+        return nullptr;
+    };
+    {
+        const std::lock_guard lock(open.mutex);
+        if (auto known = find())
+            return known;
+    }
+    // Read outside the lock: a broken list is logged, and the host's log function may ask for
+    // bundles.
+    Ref<Dictionary> info = readPropertyList(appendingPathComponent(real, "Info.plist"));
+    const std::lock_guard lock(open.mutex);
+    if (auto known = find())
+        return known;
+    open.bundles.push_back(make<Bundle>(real, std::move(info)));
+    return open.bundles.back();
+}
+
+Ref<Bundle> Bundle::mainBundle() {
+    Ref<Bundle> bundle;
+    OpenBundles& open = OpenBundles::shared();
+    {
+        const std::lock_guard lock(open.mutex);
+        bundle = open.main;
+    }
+    if (!bundle) {
+        const String folder = folderOfProgram();
+        const String shared = sharedFolder(folder, ProcessInfo::processName());
+        bundle = bundleWithPath(shared.isNull() ? folder : shared);
+    }
+    if (!bundle)
+        bundle = bundleWithPath("/"); // the program's folder was removed while it runs
+    return bundle;
+}
+
+void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
+    OpenBundles& open = OpenBundles::shared();
+    const std::lock_guard lock(open.mutex);
+    open.main = bundle;
+}
+
+Ref<Bundle> Bundle::frameworkBundle() {
+    // Looked for once: the library does not move.
+    static const String& path = *new String(frameworkPath());
+    return bundleWithPath(path);
+}
+
+Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
+    const String file = sharedObjectHolding(&type);
+    if (file.isNull())
+        return mainBundle();
+    const std::string_view name = libraryName(file);
+    if (name == frameworkName)
+        return frameworkBundle();
+    const String folder = folderOf(file);
+    const String shared = sharedFolder(folder, name);
+    Ref<Bundle> bundle = bundleWithPath(shared.isNull() ? folder : shared);
+    return bundle ? bundle : mainBundle();
+}
+
+Ref<Bundle> Bundle::bundleWithIdentifier(const String& identifier) {
+    if (identifier.isNull())
+        return nullptr;
+    for (const auto& bundle : {mainBundle(), frameworkBundle()})
+        if (bundle && bundle->bundleIdentifier() == identifier)
+            return bundle;
+    OpenBundles& open = OpenBundles::shared();
+    const std::lock_guard lock(open.mutex);
+    for (const auto& bundle : open.bundles)
+        if (bundle->bundleIdentifier() == identifier)
+            return bundle;
+    return nullptr;
+}
+
+Value Bundle::objectForInfoDictionaryKey(const String& key) const {
+    String set;
+    if (key == "CFBundleShortVersionString")
+        set = ProcessInfo::processVersion();
+    else if (key == "CFBundleVersion")
+        set = ProcessInfo::processBuild();
+    return !set.isNull() && mainBundle().get() == this ? Value(set) : _info->get(key);
+}
+
+String Bundle::bundleIdentifier() const { return _info->get("CFBundleIdentifier").string(); }
+
+String Bundle::pathForResource(std::string_view name, const String& type) const {
+    const String file = type.isEmpty() ? String(name) : String::concat({name, ".", type});
+    const String relative = relativePath(file);
+    if (relative.isNull())
+        return nullptr;
+    String path = appendingPathComponent(_path, relative);
+    return fileExists(path) ? path : String();
+}
+
+String Bundle::description() const { return String::concat({Object::description(), " ", _path}); }
+
+const Class& Bundle::describedClass() const { return libraryClass<Bundle>("qx::Bundle"); }
+
+} // namespace qx

@@ -1,0 +1,114 @@
+#include "platform/system/PropertyList.h"
+
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/Data.h>
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include "platform/system/Files.h"
+#include "platform/system/Log.h"
+
+namespace qx {
+
+namespace {
+
+Value valueOf(const XMLElement& element);
+
+std::vector<const XMLElement*> childElements(const XMLNode& node) {
+    std::vector<const XMLElement*> elements;
+    for (const XMLNode& child : node.children())
+        if (const XMLElement* element = child.asElement())
+            elements.push_back(element);
+    return elements;
+}
+
+// Keys and values alternate; what has no partner is left out.
+Ref<Dictionary> dictionaryOf(const XMLElement& element) {
+    auto dictionary = make<Dictionary>();
+    const auto children = childElements(element);
+    for (std::size_t i = 0; i + 1 < children.size(); ++i) {
+        if (children[i]->name() != "key" || children[i + 1]->name() == "key")
+            continue;
+        const String key = children[i]->stringValue();
+        if (Value value = valueOf(*children[++i]); !value.isNull())
+            dictionary->set(key.isNull() ? "" : key, std::move(value));
+    }
+    return dictionary;
+}
+
+Ref<Array> arrayOf(const XMLElement& element) {
+    auto array = make<Array>();
+    for (const XMLElement* child : childElements(element))
+        if (Value value = valueOf(*child); !value.isNull())
+            array->add(std::move(value));
+    return array;
+}
+
+Ref<Data> dataOf(std::string_view text) {
+    constexpr std::string_view alphabet =
+        "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+    std::string bytes;
+    std::uint32_t bits = 0;
+    int count = 0;
+    for (const char c : text) {
+        const std::size_t digit = alphabet.find(c);
+        if (digit == std::string_view::npos)
+            continue; // layout and padding
+        bits = bits << 6U | static_cast<std::uint32_t>(digit);
+        count += 6;
+        if (count >= 8) {
+            count -= 8;
+            bytes += static_cast<char>(bits >> static_cast<unsigned>(count) & 0xFFU);
+        }
+    }
+    return make<Data>(std::move(bytes));
+}
+
+Value valueOf(const XMLElement& element) {
+    const String& kind = element.name();
+    if (kind == "dict")
+        return dictionaryOf(element);
+    if (kind == "array")
+        return arrayOf(element);
+    if (kind == "true")
+        return true;
+    if (kind == "false")
+        return false;
+    String text = element.stringValue();
+    if (text.isNull())
+        text = "";
+    if (kind == "integer")
+        return Value(text).intValue();
+    if (kind == "real")
+        return Value(text).doubleValue();
+    if (kind == "data")
+        return dataOf(text);
+    return kind == "string" || kind == "date" ? Value(text) : Value();
+}
+
+} // namespace
+
+Ref<Dictionary> readPropertyList(const String& path) {
+    if (!fileExists(path))
+        return make<Dictionary>();
+    Ref<Error> error;
+    // White space may be all that a string holds.
+    const auto document =
+        XMLDocument::initWithContentsOfFile(path, {.keepWhiteSpace = true}, &error);
+    if (!document) {
+        logWarningOrLine("Unable to read the property list %@: %@", path,
+                         error ? error->localizedDescription() : String());
+        return make<Dictionary>();
+    }
+    const XMLElement* root = document->rootElement();
+    if (root != nullptr && root->name() == "plist") {
+        const auto values = childElements(*root);
+        root = values.empty() ? nullptr : values.front();
+    }
+    if (root == nullptr || root->name() != "dict") {
+        logWarningOrLine("Unable to read the property list %@: it holds no dictionary", path);
+        return make<Dictionary>();
+    }
+    return dictionaryOf(*root);
+}
+
+} // namespace qx
