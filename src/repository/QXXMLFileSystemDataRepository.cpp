@@ -1,0 +1,232 @@
+#include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
+
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/ProcessInfo.h>
+#include <QXXMLMarshalling/platform/UserDefaults.h>
+
+#include "platform/system/Directories.h"
+#include "platform/system/Errors.h"
+#include "platform/system/Files.h"
+#include "platform/system/Log.h"
+
+#include <atomic>
+#include <cerrno>
+
+using namespace qx;
+
+namespace {
+
+std::atomic<QXXMLFileSystemDataRepository::CreateFunction> createFunction{nullptr};
+
+// The program's directory below one of the user's.
+String directoryForProcess(const String& directory, const String& processName) {
+    return directory.view().ends_with(processName) ? directory
+                                                   : appendingPathComponent(directory, processName);
+}
+
+// What may stand in a directory's name: digits and dots from the start, "(" as one more dot.
+std::string cleanedVersion(const Value& version) {
+    const String text = version.isNumber() ? version.description() : version.string();
+    std::string cleaned;
+    for (const char c : text.view()) {
+        if ((c >= '0' && c <= '9') || c == '.')
+            cleaned += c;
+        else if (c == '(')
+            cleaned += '.';
+        else
+            break;
+    }
+    return cleaned;
+}
+
+} // namespace
+
+void QXXMLFileSystemDataRepository::setRepositoryCreateFunction(CreateFunction function) noexcept {
+    createFunction = function;
+}
+
+QXXMLFileSystemDataRepository::QXXMLFileSystemDataRepository()
+    : _searchPaths(make<Array>()), _searchBundles(make<Array>()) {}
+
+QXXMLFileSystemDataRepository::~QXXMLFileSystemDataRepository() = default;
+
+void QXXMLFileSystemDataRepository::initialize(QXXMLFileSystemDataRepository& repository) {
+    repository.initializeSearchPaths();
+    if (const CreateFunction function = createFunction)
+        function(repository);
+}
+
+void QXXMLFileSystemDataRepository::setSearchPaths(const Ref<Array>& paths) {
+    _searchPaths = paths ? paths : make<Array>();
+}
+
+void QXXMLFileSystemDataRepository::setSearchBundles(const Ref<Array>& bundles) {
+    _searchBundles = bundles ? bundles : make<Array>();
+}
+
+void QXXMLFileSystemDataRepository::initializeSearchPaths() {
+    _searchPaths = make<Array>();
+    const String processName = ProcessInfo::processName();
+    for (const String& directory : searchPathForApplicationSupport())
+        addPathToSearchPaths(directory, processName);
+    if (_searchPaths->isEmpty())
+        throw Exception(Exception::internalInconsistency,
+                        "No application support directories found");
+
+    // The library's own class stands for its bundle even where it is linked into the program.
+    const std::type_info& type = typeid(*this);
+    const bool isLibrarys = type == typeid(QXXMLFileSystemDataRepository);
+    _searchBundles = make<Array>();
+    for (const auto& bundle : {Bundle::mainBundle(), isLibrarys ? Bundle::frameworkBundle()
+                                                                : Bundle::bundleForClass(type)})
+        if (bundle)
+            _searchBundles->add(bundle);
+}
+
+void QXXMLFileSystemDataRepository::addPathToSearchPaths(const String& directory,
+                                                         const String& processName) {
+    const String version = applicationVersion();
+    const String base = directoryForProcess(directory, processName);
+    _searchPaths->add(appendingPathComponent(base, version));
+    _searchPaths->add(base);
+}
+
+Ref<Bundle> QXXMLFileSystemDataRepository::applicationBundle() {
+    const Value identifier =
+        UserDefaults::standardUserDefaults()->objectForKey(clientBundleIdentifierKey);
+    if (identifier.isNull())
+        return Bundle::mainBundle();
+    if (auto bundle = Bundle::bundleWithIdentifier(identifier.string()))
+        return bundle;
+    logWarningOrLine("Unable to locate bundle with identifier: %@", identifier);
+    return Bundle::mainBundle();
+}
+
+String QXXMLFileSystemDataRepository::applicationVersion() {
+    const Ref<Bundle> bundle = applicationBundle();
+    if (!bundle)
+        return "";
+    const std::string build = cleanedVersion(bundle->objectForInfoDictionaryKey("CFBundleVersion"));
+    const std::string version =
+        cleanedVersion(bundle->objectForInfoDictionaryKey("CFBundleShortVersionString"));
+    if (version.empty())
+        return build;
+    return build.empty() ? String(version) : String::concat({version, ".", build});
+}
+
+String QXXMLFileSystemDataRepository::pathForResourceNamed(const String& name) {
+    const String relative = relativePath(name);
+    if (relative.isNull())
+        return nullptr;
+    // Kept while it is walked: whoever is called meanwhile may set another list.
+    const Ref<Array> paths = _searchPaths;
+    for (const Value& directory : *paths) {
+        if (!directory.isString())
+            continue;
+        String candidate = appendingPathComponent(directory.string(), relative);
+        if (fileExists(candidate))
+            return candidate;
+    }
+    return pathForResourceInBundlesNamed(name);
+}
+
+String QXXMLFileSystemDataRepository::pathForResourceInBundlesNamed(const String& name) {
+    const Ref<Array> bundles = _searchBundles;
+    for (const Value& item : *bundles) {
+        const auto bundle = item.as<Bundle>();
+        String path = bundle ? bundle->pathForResource(name) : String();
+        if (!path.isNull())
+            return path;
+    }
+    return nullptr;
+}
+
+bool QXXMLFileSystemDataRepository::containsDocument(const String& name) {
+    return !pathForResourceNamed(name).isNull();
+}
+
+bool QXXMLFileSystemDataRepository::containsData(const String& name) {
+    return !pathForResourceNamed(name).isNull();
+}
+
+Ref<Data> QXXMLFileSystemDataRepository::dataForName(const String& name, Ref<Error>* error) {
+    const String path = pathForResourceNamed(name);
+    return path.isNull() ? Ref<Data>() : readFile(path, error);
+}
+
+Ref<XMLDocument> QXXMLFileSystemDataRepository::documentNamed(const String& name,
+                                                              std::uint64_t* size,
+                                                              Ref<Error>* error) {
+    const Ref<Data> data = dataForName(name, error);
+    if (size != nullptr)
+        *size = data ? data->size() : 0;
+    return data ? XMLDocument::initWithData(*data, {}, error) : nullptr;
+}
+
+String QXXMLFileSystemDataRepository::userOverrideArea() {
+    const auto directories = searchPathForApplicationSupport();
+    if (directories.empty())
+        return nullptr;
+    return directoryForProcess(directories.back(), ProcessInfo::processName());
+}
+
+Ref<Error> QXXMLFileSystemDataRepository::createUserOverrideArea(const String& directory) {
+    Ref<Error> error;
+    if (!fileExists(directory))
+        createDirectoryWithParents(directory, &error);
+    else if (!isDirectory(directory))
+        fail(&error, errors::areaIsNoDirectory, directory);
+    return error;
+}
+
+String QXXMLFileSystemDataRepository::writeFile(const Ref<Data>& data, const String& directory,
+                                                const String& name, Ref<Error>* error) {
+    const String relative = relativePath(name);
+    if (relative.isNull())
+        return fail(error, errors::invalidFileName);
+    if (directory.isEmpty())
+        return failWithSystemError(error, errors::writeFailed, relative, ENOENT);
+    const String target = appendingPathComponent(directory, relative);
+    if (!data)
+        return failWithSystemError(error, errors::writeFailed, target, EINVAL);
+    if (Ref<Error> problem = createUserOverrideArea(directory)) {
+        if (error != nullptr)
+            *error = std::move(problem);
+        return nullptr;
+    }
+    // "maps/a.xml" stands in a folder of its own.
+    if (const std::size_t slash = relative.view().rfind('/'); slash != std::string_view::npos) {
+        const std::string_view folder = relative.view().substr(0, slash);
+        if (!createDirectoryWithParents(appendingPathComponent(directory, folder), error))
+            return nullptr;
+    }
+    return writeFileAtomically(target, data->view(), error) ? target : String();
+}
+
+String QXXMLFileSystemDataRepository::writeFileToUserOverrideArea(const Ref<Data>& data,
+                                                                  const String& name,
+                                                                  Ref<Error>* error) {
+    return writeFile(data, userOverrideArea(), name, error);
+}
+
+String QXXMLFileSystemDataRepository::writeFileToVersionedUserOverrideArea(const Ref<Data>& data,
+                                                                           const String& name,
+                                                                           Ref<Error>* error) {
+    const String area = userOverrideArea();
+    const String versioned =
+        area.isNull() ? area : appendingPathComponent(area, applicationVersion());
+    return writeFile(data, versioned, name, error);
+}
+
+String QXXMLFileSystemDataRepository::writeDocumentToUserOverrideArea(
+    const Ref<XMLDocument>& document, const String& name, Ref<Error>* error) {
+    constexpr XMLOptions options = XMLPrettyPrint | XMLCompactEmptyElements;
+    const Ref<Data> data = document ? make<Data>(document->XMLData(options)) : Ref<Data>();
+    return writeFileToUserOverrideArea(data, name, error);
+}
+
+String QXXMLFileSystemDataRepository::description() const {
+    if (_searchPaths->isEmpty())
+        return Object::description();
+    return String::concat({Object::description(), " searchPaths: ", _searchPaths->description()});
+}
