@@ -63,6 +63,13 @@ void CountedSet::removeAll() noexcept {
     _count = 0;
 }
 
+Ref<CountedSet> CountedSet::mutableCopy() const {
+    auto copy = make<CountedSet>();
+    for (const Entry& entry : _entries)
+        copy->add(entry.name, entry.count);
+    return copy;
+}
+
 std::size_t CountedSet::countFor(const String& name) const noexcept {
     const std::size_t position = positionOf(name);
     return position != nameindex::none ? _entries[position].count : 0;

@@ -78,6 +78,8 @@ inline constexpr ErrorText notAnInteger{-221, "<%@>: Unable to convert value to 
                                         invalidXML};
 inline constexpr ErrorText unableToSetValue{
     -222, "Unable to set value: %@ for key: %@ in class: %@", invalidValue};
+inline constexpr ErrorText nestedTooDeep{-223, "Objects nest deeper than the limit of %@: %@",
+                                         invalidValue};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 
@@ -123,6 +125,7 @@ inline constexpr std::array table{&tooManyDescriptions,
                                   &tooManyElementsForField,
                                   &notAnInteger,
                                   &unableToSetValue,
+                                  &nestedTooDeep,
                                   &areaIsNoDirectory,
                                   &readFailed,
                                   &readNotPermitted,

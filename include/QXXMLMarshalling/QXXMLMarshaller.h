@@ -1,0 +1,204 @@
+#pragma once
+
+// Turns objects into XML and XML into objects under one mapping.
+//
+//     qx::Ref<qx::Error> error;
+//     auto marshaller = QXXMLMarshaller::initWithMappingFile("orders-mapping.xml", &error);
+//     auto order = marshaller->readFile("order.xml", &error);
+//     order->setValueForKey("shipped", "state");
+//     marshaller->writeFile(order, "order.xml", &error);
+//
+// An error slot must hold null when it is passed in; a failure fills it only when it was passed.
+// One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++ setters
+// of host classes throw passes through every operation here.
+
+#include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/CountedSet.h>
+#include <QXXMLMarshalling/platform/UndoManager.h>
+
+#include <iosfwd>
+
+class QX_API QXXMLMarshaller : public qx::Object {
+public:
+    // Never fails; a null mapping counts as one that holds no class.
+    static qx::Ref<QXXMLMarshaller>
+    initWithMapping(qx::Ref<QXXMLMarshallingMapping> mapping, qx::Ref<qx::Error>* error = nullptr);
+    // Null with the error of QXXMLMarshallingMapping::initWithDocument.
+    static qx::Ref<QXXMLMarshaller> initWithMappingXML(qx::XMLDocument* document,
+                                                       qx::Ref<qx::Error>* error = nullptr);
+    // Null with the error of reading the document (XMLDocument.h), or as above.
+    static qx::Ref<QXXMLMarshaller> initWithMappingURL(const qx::String& URL,
+                                                       qx::Ref<qx::Error>* error = nullptr);
+    static qx::Ref<QXXMLMarshaller> initWithMappingFile(const qx::String& path,
+                                                        qx::Ref<qx::Error>* error = nullptr);
+    ~QXXMLMarshaller() override;
+
+    // Null when made with a null mapping.
+    QXXMLMarshallingMapping* mapping() const noexcept { return _mapping.get(); }
+    // Groups what one unmarshall() registers; made on the first call, then always the same.
+    const qx::Ref<qx::UndoManager>& undoManager();
+
+    // Options, all true at first; each operation reads them when it runs.
+    //
+    // Lenient: unmarshalling passes over XML that the mapping does not describe.
+    bool isLenient() const noexcept { return _lenient; }
+    void setLenient(bool lenient) noexcept { _lenient = lenient; }
+    // Unmarshalling keeps on its object what no field consumed, under the keys "unboundChildren"
+    // and "unboundAttributes"; marshalling writes it back.
+    bool saveUnknownXML() const noexcept { return _saveUnknownXML; }
+    void setSaveUnknownXML(bool save) noexcept { _saveUnknownXML = save; }
+    // Marshalling declares the namespaces of class mappings, and those that were read, which an
+    // object keeps under the key "__namespaces".
+    bool isUsingNamespaceURIs() const noexcept { return _usingNamespaceURIs; }
+    void setUsingNamespaceURIs(bool use) noexcept { _usingNamespaceURIs = use; }
+    // How deep objects may nest, in both directions; 256 at first. Deeper ones end in
+    //   -223  "Objects nest deeper than the limit of %@: %@"   (the limit, the class)
+    std::size_t maximumDepth() const noexcept { return _maximumDepth; }
+    void setMaximumDepth(std::size_t depth) noexcept { _maximumDepth = depth; }
+
+    // A new document, version "1.0" and encoding "UTF-8", whose root represents the object; null
+    // with one of the errors of marshallObject and of the fields. Kept unknown XML is moved, not
+    // copied, into the document: out of an earlier one if the object was marshalled before.
+    qx::Ref<qx::XMLDocument> marshall(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
+    // The object built from the document's root element; null on failure, and without an error when
+    // a lenient marshaller finds no class for the root element. See unmarshallElement.
+    qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document,
+                                   qx::Ref<qx::Error>* error = nullptr);
+    template <class T>
+    qx::Ref<qx::Object> unmarshall(const qx::Ref<T>& document,
+                                   qx::Ref<qx::Error>* error = nullptr) {
+        return unmarshall(document.get(), error);
+    }
+
+    // Parse and unmarshall in one step; with the parser's error too.
+    qx::Ref<qx::Object> readString(std::string_view xml, qx::Ref<qx::Error>* error = nullptr);
+    qx::Ref<qx::Object> readFile(const qx::String& path, qx::Ref<qx::Error>* error = nullptr);
+    qx::Ref<qx::Object> readStream(std::istream& stream, qx::Ref<qx::Error>* error = nullptr);
+    // Marshall and serialise in one step, one element a line. The string is null on failure; a file
+    // is replaced atomically, and untouched on failure.
+    qx::String writeString(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
+    bool writeFile(const qx::Value& object, const qx::String& path,
+                   qx::Ref<qx::Error>* error = nullptr);
+    bool writeStream(const qx::Value& object, std::ostream& stream,
+                     qx::Ref<qx::Error>* error = nullptr);
+
+    // The steps of marshalling, for hosts that build trees of their own.
+    //
+    // A new element for the object. Null with
+    //   -211  "No class name for marshalling defined: %@"   (the object's class)
+    //   -211  "No mapping definition for class: %@"
+    qx::Ref<qx::XMLElement> marshallObject(const qx::Value& object,
+                                           qx::Ref<qx::Error>* error = nullptr);
+    qx::Ref<qx::XMLElement> elementWithMapping(const QXXMLClassMapping& mapping, qx::Object& object,
+                                               qx::Ref<qx::Error>* error = nullptr);
+    // Writes the fields of the class and of its ancestors, kept unknown XML and namespaces. False
+    // with an error of the fields, or
+    //   -211  "No extends definition for class during marshaling: %@"
+    bool bindFieldMappings(const QXXMLClassMapping& mapping, qx::XMLElement& element,
+                           qx::Object& object, qx::Ref<qx::Error>* error = nullptr);
+    //   -207  "No mapping for class: %@"
+    //   -211  "No class name for marshalling defined: %@"   (the class of `object`)
+    //   -212  "Required value missing for field: %@ in object: %@"
+    bool mapField(const QXXMLFieldMapping& field, qx::XMLElement& element, qx::Object& object,
+                  qx::Ref<qx::Error>* error = nullptr);
+    //   -207  "No mapping for declared class: %@"
+    bool mapArray(const qx::Array& array, qx::XMLElement& element, const QXXMLFieldMapping& field,
+                  qx::Ref<qx::Error>* error = nullptr);
+
+    // The steps of unmarshalling.
+    //
+    // The object for the node's element name. Null for a node that no class maps to, with an error
+    // only from a marshaller that is not lenient:
+    //   -211  "No definition to handle element: %@"
+    qx::Ref<qx::Object> unmarshallElement(qx::XMLNode* element,
+                                          qx::Ref<qx::Error>* error = nullptr);
+    // The object of that class, whatever the element is called. Null for a null element, and when
+    // the slot holds an error already.
+    qx::Ref<qx::Object> buildClassWithMapping(const QXXMLClassMapping& mapping,
+                                              qx::XMLElement* element, bool isFlattened,
+                                              qx::Ref<qx::Error>* error = nullptr);
+    // A new, empty object: of the host's class of that name, else a QXGenericRecord. Never null.
+    qx::Ref<qx::Object> allocateClassWithMapping(const QXXMLClassMapping& mapping,
+                                                 qx::Ref<qx::Error>* error = nullptr);
+    // Bind the fields of the class and of its ancestors, and validate. `boundFields` and
+    // `boundAttributes` count the names of children and attributes that fields consumed.
+    //   -211  "No extends definition for class: %@"
+    bool bindFieldsWithMapping(const QXXMLClassMapping& mapping, qx::Object& object,
+                               qx::XMLElement& element, bool isFlattened,
+                               qx::Ref<qx::Error>* error = nullptr);
+    bool bindFieldsWithMapping(const QXXMLClassMapping& mapping, qx::Object& object,
+                               qx::XMLElement& element, qx::CountedSet& boundFields,
+                               qx::CountedSet& boundAttributes, bool isFlattened,
+                               qx::Ref<qx::Error>* error = nullptr);
+    //   -209  "Unknown field node type: %@ - %@"
+    bool bindField(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
+                   qx::XMLElement& element, qx::CountedSet& boundFields,
+                   qx::CountedSet& boundAttributes, bool isFlattened,
+                   qx::Ref<qx::Error>* error = nullptr);
+    // True when a value was set; false without an error when there was nothing to bind.
+    //   -202  "Required attribute missing for field: %@ in element: %@"
+    //   -220  "Too many elements defined for field: %@ in element: %@"
+    bool bindFieldAsAttribute(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
+                              qx::XMLElement& element, qx::CountedSet& boundFields,
+                              qx::CountedSet& boundAttributes,
+                              qx::Ref<qx::Error>* error = nullptr);
+    //   -202  "Required text missing for field: %@ in element: %@"
+    //   -210  "Too many children with name: %@ in element: %@"
+    bool bindFieldAsText(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
+                         qx::XMLElement& element, qx::CountedSet& boundFields,
+                         qx::CountedSet& boundAttributes, qx::Ref<qx::Error>* error = nullptr);
+    //   -202  "Missing required element named: %@ in element: %@"
+    //   -210  "Too many child elements of name: %@ in element: %@"
+    bool bindFieldAsElement(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
+                            qx::XMLElement& element, qx::CountedSet& boundFields,
+                            qx::CountedSet& boundAttributes, bool isFlattened,
+                            qx::Ref<qx::Error>* error = nullptr);
+    //   -208  "Unable to process collection class: %@"
+    bool bindCollectionField(const QXXMLFieldMapping& field, qx::Object& object,
+                             qx::XMLElement& element, qx::CountedSet& boundFields,
+                             qx::CountedSet& boundAttributes, qx::Ref<qx::Error>* error = nullptr);
+    //   -207  "No mapping for class: %@"
+    bool bindArrayFieldByType(const QXXMLFieldMapping& field, qx::Object& object,
+                              qx::XMLElement& element, qx::CountedSet& boundFields,
+                              qx::CountedSet& boundAttributes,
+                              qx::Ref<qx::Error>* error = nullptr);
+    // Compares what the element holds with what was consumed; keeps or refuses the rest.
+    //   -214  "Unknown fields found in XML document: %@ element: %@"
+    //   -215  "Unknown attributes found in XML document: %@ element: %@"
+    bool validateBoundFields(const qx::CountedSet& boundFields,
+                             const qx::CountedSet& boundAttributes, qx::XMLElement& element,
+                             qx::Object& object, qx::Ref<qx::Error>* error = nullptr);
+
+protected:
+    QXXMLMarshaller() = default;
+    friend qx::Ref<QXXMLMarshaller> qx::make<QXXMLMarshaller>();
+
+    // Keeps the mapping; never fails. A subclass calls it first.
+    virtual bool init(qx::Ref<QXXMLMarshallingMapping> mapping, qx::Ref<qx::Error>* error);
+    const qx::Class& describedClass() const override;
+
+private:
+    friend class Marshalling;
+    friend class Unmarshalling;
+
+    const MappingPlan& plan() const;
+
+    qx::Ref<QXXMLMarshallingMapping> _mapping;
+    bool _saveUnknownXML = true;
+    bool _lenient = true;
+    bool _usingNamespaceURIs = true;
+    qx::Ref<qx::UndoManager> _undoManager;
+    std::size_t _maximumDepth = 256;
+};
+
+// Converts the value by the field's type and sets it under the key. False with
+//   -221  "<%@>: Unable to convert value to integer: %@"            (logged as a warning, too)
+//   -222  "Unable to set value: %@ for key: %@ in class: %@"
+QX_API bool TakeValueForKey(qx::Object& object, qx::Key key, const qx::Value& value,
+                            const QXXMLFieldMapping& field, qx::Ref<qx::Error>* error = nullptr);
+
+// The text under which a value is written: "true" or "false" for a field of type "boolean", else
+// the value's description.
+QX_API qx::String StringValueOfObjectWithMapping(const qx::Value& value,
+                                                 const QXXMLFieldMapping& field);

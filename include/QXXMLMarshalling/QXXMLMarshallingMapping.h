@@ -1,0 +1,67 @@
+#pragma once
+
+// A mapping document resolved: read, merged with the documents that it includes, and indexed by
+// class name and by element name. It never changes after construction and may be shared by
+// marshallers on many threads.
+//
+//     auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), &error);
+
+#include <QXXMLMarshalling/QXXMLDocumentMapping.h>
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include <memory>
+
+class ClassPlan;
+class MappingPlan;
+
+class QX_API QXXMLMarshallingMapping final : public qx::Object {
+public:
+    // Null with the error of the mapping document (see QXXMLDocumentMapping), of an included one, or
+    //   -205  "Class redefined: %@"
+    //   -205  "Element redefined: %@ class: %@"
+    //   -218  "Unable to load included file: %@"   (an include that leads back to itself, too)
+    // and null without reading anything further when the slot holds an error already. A null
+    // document, like one without a root, holds no class.
+    static qx::Ref<QXXMLMarshallingMapping> initWithDocument(qx::XMLDocument* document,
+                                                             qx::Ref<qx::Error>* error = nullptr);
+    ~QXXMLMarshallingMapping() override;
+
+    // The document given at construction.
+    qx::XMLDocument* document() const noexcept { return _document.get(); }
+    // The document mapping, with the class mappings of all included documents.
+    QXXMLDocumentMapping* mapping() const noexcept { return _mapping.get(); }
+
+    // Exact, case-sensitive look-ups; null where nothing is found. The element name is that of
+    // "map-to", or the class name in lower case where there is none. A node is looked up under its
+    // qualified name as written.
+    QXXMLClassMapping* mappingForClassName(const qx::String& className) const;
+    QXXMLClassMapping* mappingForElementName(const qx::String& elementName) const;
+    QXXMLClassMapping* mappingForNode(const qx::XMLNode* node) const;
+
+    // The steps of construction, in this order; a host has no need to call them.
+    bool loadIncludedDocuments(qx::Ref<qx::Error>* error = nullptr);
+    bool populateLookupCaches(qx::Ref<qx::Error>* error = nullptr);
+
+    // What marshallers work from.
+    const MappingPlan& plan() const noexcept { return *_plan; }
+
+protected:
+    const qx::Class& describedClass() const override;
+
+private:
+    friend qx::Ref<QXXMLMarshallingMapping> qx::make<QXXMLMarshallingMapping>();
+    struct Loading;
+
+    QXXMLMarshallingMapping();
+    bool init(qx::XMLDocument* document, const Loading* loading, qx::Ref<qx::Error>* error);
+    bool loadIncludedDocument(const qx::String& href, const Loading* loading,
+                              qx::Ref<qx::Error>* error);
+    bool loadIncludedDocuments(const Loading* loading, qx::Ref<qx::Error>* error);
+
+    struct Index;
+    qx::Ref<QXXMLDocumentMapping> _mapping;
+    qx::Ref<qx::XMLDocument> _document;
+    std::unique_ptr<Index> _mappingByClass;
+    std::unique_ptr<Index> _mappingByElementName;
+    std::unique_ptr<MappingPlan> _plan;
+};

@@ -1,0 +1,77 @@
+#include <QXXMLMarshalling/QXXMLMarshaller.h>
+
+#include "marshaller/Marshalling.h"
+#include "marshaller/Unmarshalling.h"
+#include "platform/object/LibraryClass.h"
+
+using qx::Error;
+using qx::Ref;
+using qx::String;
+using qx::XMLDocument;
+
+QXXMLMarshaller::~QXXMLMarshaller() = default;
+
+bool QXXMLMarshaller::init(Ref<QXXMLMarshallingMapping> mapping, Ref<Error>*) {
+    _mapping = std::move(mapping);
+    return true;
+}
+
+Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMapping(Ref<QXXMLMarshallingMapping> mapping,
+                                                      Ref<Error>* error) {
+    auto marshaller = qx::make<QXXMLMarshaller>();
+    return marshaller->init(std::move(mapping), error) ? marshaller : nullptr;
+}
+
+Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMappingXML(XMLDocument* document, Ref<Error>* error) {
+    auto mapping = QXXMLMarshallingMapping::initWithDocument(document, error);
+    if (!mapping || (error != nullptr && *error))
+        return nullptr;
+    return initWithMapping(std::move(mapping), error);
+}
+
+Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMappingURL(const String& URL, Ref<Error>* error) {
+    const auto document = XMLDocument::initWithContentsOfURL(URL, {}, error);
+    if (!document || (error != nullptr && *error))
+        return nullptr;
+    return initWithMappingXML(document.get(), error);
+}
+
+Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMappingFile(const String& path, Ref<Error>* error) {
+    const auto document = XMLDocument::initWithContentsOfFile(path, {}, error);
+    if (!document || (error != nullptr && *error))
+        return nullptr;
+    return initWithMappingXML(document.get(), error);
+}
+
+const Ref<qx::UndoManager>& QXXMLMarshaller::undoManager() {
+    if (!_undoManager)
+        _undoManager = qx::make<qx::UndoManager>();
+    return _undoManager;
+}
+
+const MappingPlan& QXXMLMarshaller::plan() const {
+    if (_mapping)
+        return _mapping->plan();
+    static const MappingPlan none(*QXXMLDocumentMapping::initWithXML(nullptr));
+    return none;
+}
+
+Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* error) {
+    auto root = marshallObject(object, error);
+    if (!root || (error != nullptr && *error))
+        return nullptr;
+    auto document = XMLDocument::initWithRootElement(std::move(root));
+    document->setVersion("1.0");
+    document->setCharacterEncoding("UTF-8");
+    return document;
+}
+
+// The group closes whatever happens: every call is one step to undo.
+Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
+    const qx::UndoGroup group(undoManager());
+    return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
+}
+
+const qx::Class& QXXMLMarshaller::describedClass() const {
+    return qx::libraryClass<QXXMLMarshaller>("QXXMLMarshaller");
+}

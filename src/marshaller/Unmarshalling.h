@@ -1,0 +1,100 @@
+#pragma once
+
+// One call of the unmarshaller: elements become objects, driven by the mapping's plan. The steps
+// stand in files of their own:
+//
+//     unmarshal.cpp         element -> object, the chain of ancestors, the dispatch by node kind
+//     bindValues.cpp        fields from attributes and text
+//     bindElements.cpp      fields from child elements, flattened objects
+//     bindCollections.cpp   fields from many child elements
+//     validate.cpp          what no field consumed
+//
+// Error slots are handed along as they come: a step reports only to a caller who passed one, and
+// collections behave differently without.
+
+#include <QXXMLMarshalling/QXXMLMarshaller.h>
+
+#include "marshaller/ElementSource.h"
+#include "marshaller/ObjectDoor.h"
+#include "resolved/MappingPlan.h"
+
+class Unmarshalling {
+public:
+    using ErrorSlot = qx::Ref<qx::Error>*;
+
+    // What the fields of one element consumed.
+    struct Bound {
+        qx::CountedSet& fields;
+        qx::CountedSet& attributes;
+    };
+    // The object that is being bound, and where from.
+    struct Target {
+        qx::Object& object;
+        ElementSource& source;
+        Bound bound;
+        bool isFlattened;
+    };
+
+    explicit Unmarshalling(QXXMLMarshaller& marshaller);
+
+    qx::Ref<qx::Object> unmarshallNode(qx::XMLNode* node, ElementSource::CopyScope* scope,
+                                       ErrorSlot error);
+    // `source` may be shared with the object that this one is flattened into.
+    qx::Ref<qx::Object> build(const ClassPlan& plan, ElementSource& source, bool isFlattened,
+                              ErrorSlot error);
+    qx::Ref<qx::Object> build(const ClassPlan& plan, qx::XMLElement& element,
+                              ElementSource::CopyScope* scope, ErrorSlot error);
+    qx::Ref<qx::Object> allocate(const ClassPlan& plan);
+    bool bindFields(const ClassPlan& plan, const Target& target, ErrorSlot error);
+    bool bindField(const FieldPlan& field, const Target& target, ErrorSlot error);
+
+    bool bindAsAttribute(const FieldPlan& field, const Target& target, ErrorSlot error);
+    bool bindAsText(const FieldPlan& field, const Target& target, ErrorSlot error);
+    static bool takeValue(qx::Object& object, const FieldPlan& field, qx::Key key,
+                          const qx::Value& value, ErrorSlot error);
+
+    bool bindAsElement(const FieldPlan& field, const Target& target, ErrorSlot error);
+    bool bindCollection(const FieldPlan& field, const Target& target, ErrorSlot error);
+    bool bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error);
+
+    // Uses up the counts of `bound`.
+    bool validate(const Target& target, ErrorSlot error);
+
+private:
+    // An object that is being bound, and those whose binding led to it.
+    struct Frame {
+        const ClassPlan* plan;
+        const qx::XMLElement* element;
+        const Frame* parent;
+        std::size_t depth;
+    };
+    struct Items;
+
+    bool isBeingBound(const ClassPlan& plan, const qx::XMLElement& element) const;
+    bool keepNamespaces(const Target& target, ErrorSlot error);
+    bool findElement(const FieldPlan& field, const Target& target, qx::XMLElement*& child,
+                     const BindingPlan*& binding, ErrorSlot error);
+    qx::Value elementValue(const FieldPlan& field, const Target& target, qx::XMLElement& child,
+                           const ClassPlan* classOfElement, ErrorSlot error);
+    qx::Value flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error);
+    Items findItems(const FieldPlan& field, const Target& target);
+    void adopt(qx::Object& item, qx::Object& parent);
+    bool validateChildren(const Target& target, ErrorSlot error);
+    bool validateAttributes(const Target& target, ErrorSlot error);
+
+    // Whether consumed names are counted at all.
+    bool validates() const noexcept { return !_lenient || _saveUnknownXML; }
+    void countField(const Target& target, const qx::String& name) const;
+
+    QXXMLMarshaller& _marshaller;
+    const MappingPlan& _plan;
+    const bool _lenient;
+    const bool _saveUnknownXML;
+    ObjectDoor _door;
+    std::vector<const qx::Class*> _classes;  // by plan index, looked up once
+    std::vector<bool> _classKnown;
+    const Frame* _frame = nullptr;
+    // Sets of consumed names that no object uses at the moment.
+    std::vector<qx::Ref<qx::CountedSet>> _spareSets;
+    class SpareSet;
+};

@@ -1,0 +1,90 @@
+#include "marshaller/Unmarshalling.h"
+
+#include "platform/object/Scan.h"
+#include "platform/system/Errors.h"
+#include "platform/system/Log.h"
+
+using qx::Ref;
+using qx::String;
+using qx::Value;
+
+// The wrapper of a location is not counted as consumed, and the attribute counts for the element
+// that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
+bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target,
+                                    ErrorSlot error) {
+    const qx::XMLNode* attribute = nullptr;
+    String name;
+    for (const BindingPlan& binding : field.bindings) {
+        name = binding.name;
+        const qx::XMLElement* holder = &target.source.element();
+        if (!binding.location.isEmpty()) {
+            const auto found = target.source.find(binding.location);
+            if (found.several)
+                return qx::fail(error, qx::errors::tooManyElementsForField, name,
+                                &target.source.element());
+            holder = found.first;
+        }
+        attribute = holder != nullptr ? holder->attributeForName(name) : nullptr;
+        if (attribute != nullptr)
+            break;
+    }
+    if (attribute != nullptr) {
+        if (validates())
+            target.bound.attributes.add(attribute->name());
+        return takeValue(target.object, field, field.key, attribute->stringValue(), error);
+    }
+    if (field.isRequired)
+        return qx::fail(error, qx::errors::requiredAttributeMissing, name,
+                        &target.source.element());
+    return false;
+}
+
+// A child of one of the bind names gives its text, the element itself where there is none.
+bool Unmarshalling::bindAsText(const FieldPlan& field, const Target& target, ErrorSlot error) {
+    const qx::XMLElement* holder = &target.source.element();
+    bool isChild = false;
+    for (const BindingPlan& binding : field.bindings) {
+        if (binding.bindTo.isEmpty())
+            continue;
+        const auto found = target.source.find(binding.bindTo);
+        if (found.several)
+            return qx::fail(error, qx::errors::tooManyChildren, binding.bindTo,
+                            &target.source.element());
+        if (found.first != nullptr) {
+            countField(target, binding.bindTo);
+            holder = found.first;
+            isChild = true;
+            break;
+        }
+    }
+    const String text = isChild ? holder->stringValue() : target.source.stringValue();
+    if (!text.isEmpty())
+        return takeValue(target.object, field, field.key, text, error);
+    if (field.isRequired)
+        return qx::fail(error, qx::errors::requiredTextMissing, field.key.string(),
+                        &target.source.element());
+    return false;
+}
+
+namespace {
+
+Value booleanOf(const String& text) {
+    return text.equalsIgnoringCase("true") || text.equalsIgnoringCase("yes") || text == "1";
+}
+
+} // namespace
+
+bool Unmarshalling::takeValue(qx::Object& object, const FieldPlan& field, qx::Key key,
+                              const Value& value, ErrorSlot error) {
+    if (!value.isString() || !field.hasSimpleType())
+        return ObjectDoor::set(object, key, value, error);
+    const String text = value.string();
+    if (field.valueType == ValueType::boolean)
+        return ObjectDoor::set(object, key, booleanOf(text), error);
+    if (text.isEmpty())
+        return ObjectDoor::set(object, key, nullptr, error);
+    if (const auto integer = qx::scanInteger(text))
+        return ObjectDoor::set(object, key, *integer, error);
+    qx::logWarningOrLine(qx::errors::notAnInteger.message, field.xmlName, text);
+    return qx::fail(error, qx::errors::notAnInteger, field.xmlName, text);
+}

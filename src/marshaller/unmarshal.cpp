@@ -1,0 +1,188 @@
+#include "marshaller/Unmarshalling.h"
+
+#include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/platform/Array.h>
+
+#include "platform/system/Errors.h"
+
+using qx::Error;
+using qx::Key;
+using qx::Ref;
+using qx::Value;
+
+Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller)
+    : _marshaller(marshaller), _plan(marshaller.plan()), _lenient(marshaller._lenient),
+      _saveUnknownXML(marshaller._saveUnknownXML), _classes(_plan.classCount() + 1),
+      _classKnown(_plan.classCount() + 1) {}
+
+// Lends a set for the time of one object's binding.
+class Unmarshalling::SpareSet {
+public:
+    explicit SpareSet(std::vector<Ref<qx::CountedSet>>& spare) : _spare(spare) {
+        if (_spare.empty()) {
+            _set = qx::make<qx::CountedSet>();
+        } else {
+            _set = std::move(_spare.back());
+            _spare.pop_back();
+        }
+    }
+    ~SpareSet() {
+        _set->removeAll();
+        _spare.push_back(std::move(_set));
+    }
+    SpareSet(const SpareSet&) = delete;
+    SpareSet& operator=(const SpareSet&) = delete;
+    qx::CountedSet& operator*() const noexcept { return *_set; }
+
+private:
+    std::vector<Ref<qx::CountedSet>>& _spare;
+    Ref<qx::CountedSet> _set;
+};
+
+Ref<qx::Object> Unmarshalling::unmarshallNode(qx::XMLNode* node, ElementSource::CopyScope* scope,
+                                              ErrorSlot error) {
+    qx::XMLElement* element = node != nullptr ? node->asElement() : nullptr;
+    const ClassPlan* plan = element != nullptr ? _plan.classForElement(element->name()) : nullptr;
+    if (plan != nullptr)
+        return build(*plan, *element, scope, error);
+    if (_lenient)
+        return nullptr;
+    return qx::fail(error, qx::errors::noDefinitionForElement, node);
+}
+
+Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, qx::XMLElement& element,
+                                     ElementSource::CopyScope* scope, ErrorSlot error) {
+    ElementSource source(element, scope, plan.bindingCount);
+    return build(plan, source, false, error);
+}
+
+// A class that is flattened into itself, over whatever other classes, would never end.
+bool Unmarshalling::isBeingBound(const ClassPlan& plan, const qx::XMLElement& element) const {
+    for (const Frame* frame = _frame; frame != nullptr && frame->element == &element;
+         frame = frame->parent)
+        if (frame->plan->className == plan.className)
+            return true;
+    return false;
+}
+
+Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& source,
+                                     bool isFlattened, ErrorSlot error) {
+    if (isBeingBound(plan, source.element()))
+        return qx::fail(error, qx::errors::noDefinitionForElement, &source.element());
+    const std::size_t depth = _frame != nullptr ? _frame->depth + 1 : 1;
+    if (depth > _marshaller._maximumDepth)
+        return qx::fail(error, qx::errors::nestedTooDeep, _marshaller._maximumDepth,
+                        plan.className.string());
+    const Ref<qx::Object> object = allocate(plan);
+    // Whoever set it: a caller's earlier error stops the binding, too.
+    if (error != nullptr && *error)
+        return nullptr;
+    const ObjectHooks& hooks = _door.hooksOf(*object);
+    const qx::Operation* notify = hooks.setNotifyBindingsObservers;
+    if (hooks.rootObject != nullptr && hooks.setUndoManager != nullptr)
+        ObjectDoor::send(*object, *hooks.setUndoManager, _marshaller.undoManager());
+
+    const Frame frame{&plan, &source.element(), _frame, depth};
+    struct Restore {
+        const Frame*& current;
+        const Frame* outer;
+        ~Restore() { current = outer; }
+    } const restore{_frame, _frame};
+    _frame = &frame;
+    const SpareSet fields(_spareSets);
+    const SpareSet attributes(_spareSets);
+    if (!bindFields(plan, {*object, source, {*fields, *attributes}, isFlattened}, error))
+        return nullptr;
+    if (notify != nullptr)
+        ObjectDoor::send(*object, *notify, true);
+    return object;
+}
+
+Ref<qx::Object> Unmarshalling::allocate(const ClassPlan& plan) {
+    if (!_classKnown[plan.index]) {
+        _classKnown[plan.index] = true;
+        _classes[plan.index] = qx::Class::named(plan.classNameToInstantiate.view());
+    }
+    const qx::Class* type = _classes[plan.index];
+    Ref<qx::Object> object = type != nullptr ? type->create() : nullptr;
+    if (!object)
+        object = qx::make<QXGenericRecord>();
+    const ObjectHooks& hooks = _door.hooksOf(*object);
+    if (hooks.setClassNameForMarshalling != nullptr)
+        ObjectDoor::send(*object, *hooks.setClassNameForMarshalling, plan.className.string());
+    if (hooks.setNotifyBindingsObservers != nullptr)
+        ObjectDoor::send(*object, *hooks.setNotifyBindingsObservers, false);
+    return object;
+}
+
+// From the first flattened field of a class on, that class and all its ancestors are bound from a
+// private copy of what is left of the element; an ancestor with such a field makes one of its own.
+bool Unmarshalling::bindFields(const ClassPlan& plan, const Target& target, ErrorSlot error) {
+    std::unique_ptr<ElementSource> copy;
+    ElementSource* source = &target.source;
+    source->expectLookups(target.isFlattened ? plan.bindingCount : 0);
+    ExtendsWalk walk(plan);
+    do {
+        bool copied = false;
+        for (const FieldPlan& field : walk.current().fields) {
+            if (!field.isContainer && !copied) {
+                copy = ElementSource::copyOf(*source);
+                source = copy.get();
+                copied = true;
+            }
+            if (!bindField(field, {target.object, *source, target.bound, target.isFlattened},
+                           error))
+                return false;
+        }
+    } while (walk.next());
+    if (!walk.broken().isNull())
+        return qx::fail(error, qx::errors::noExtends, walk.broken());
+    const Target rest{target.object, *source, target.bound, target.isFlattened};
+    return keepNamespaces(rest, error) && validate(rest, error);
+}
+
+bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
+    static const Key key("__namespaces");
+    const auto namespaces = target.source.element().namespaces();
+    if (namespaces.empty())
+        return true;
+    auto kept = qx::make<qx::Array>();
+    for (qx::XMLNode& declaration : namespaces)
+        kept->add(target.source.keep(declaration));
+    return ObjectDoor::set(target.object, key, kept, error);
+}
+
+// A step that found nothing and complains of nothing does not fail the object.
+bool Unmarshalling::bindField(const FieldPlan& field, const Target& target, ErrorSlot error) {
+    if (field.collection != CollectionKind::none)
+        return bindCollection(field, target, error);
+    Ref<Error> problem;
+    bool bound = false;
+    switch (field.nodeType) {
+    case QXXMLNodeTypeAttribute: bound = bindAsAttribute(field, target, &problem); break;
+    case QXXMLNodeTypeElement: bound = bindAsElement(field, target, &problem); break;
+    case QXXMLNodeTypeText: bound = bindAsText(field, target, &problem); break;
+    case QXXMLNodeTypeUnknown:
+        bound = bindAsAttribute(field, target, &problem) || bindAsElement(field, target, &problem);
+        break;
+    default:
+        return qx::fail(error, qx::errors::unknownFieldNodeType, field.mapping->node(),
+                        field.mapping);
+    }
+    if (bound || !problem)
+        return true;
+    if (error != nullptr)
+        *error = std::move(problem);
+    return false;
+}
+
+// The item knows the object that holds it before it is set on it.
+void Unmarshalling::adopt(qx::Object& item, qx::Object& parent) {
+    if (const qx::Operation* setParent = _door.hooksOf(item).setParent)
+        ObjectDoor::send(item, *setParent, &parent);
+}
+
+void Unmarshalling::countField(const Target& target, const qx::String& name) const {
+    if (validates())
+        target.bound.fields.add(name);
+}

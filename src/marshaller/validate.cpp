@@ -1,0 +1,95 @@
+#include "marshaller/Unmarshalling.h"
+
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/Dictionary.h>
+
+#include "platform/system/Errors.h"
+#include "platform/system/Log.h"
+
+using qx::CountedSet;
+using qx::Key;
+using qx::Ref;
+using qx::String;
+using qx::Value;
+using qx::XMLElement;
+using qx::XMLNode;
+
+namespace {
+
+// The names that occur more often than they were consumed, with how much more often. Uses up the
+// counts; null where no name is left.
+class Unknown {
+public:
+    explicit Unknown(CountedSet& bound) : _bound(bound) {}
+
+    void see(const XMLNode& node) {
+        const String& name = node.name();
+        if (name.isNull())
+            return;
+        if (_bound.contains(name)) {
+            _bound.remove(name);
+            return;
+        }
+        if (!_names)
+            _names = qx::make<CountedSet>();
+        _names->add(name);
+    }
+    const Ref<CountedSet>& names() const noexcept { return _names; }
+
+private:
+    CountedSet& _bound;
+    Ref<CountedSet> _names;
+};
+
+} // namespace
+
+bool Unmarshalling::validate(const Target& target, ErrorSlot error) {
+    return !validates() || (validateChildren(target, error) && validateAttributes(target, error));
+}
+
+// A name that is left is kept with all its elements, those that were consumed included.
+bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
+    static const Key key("unboundChildren");
+    Unknown unknown(target.bound.fields);
+    target.source.forEachChild([&](const XMLNode& child) { unknown.see(child); });
+    if (!unknown.names())
+        return true;
+    if (!_saveUnknownXML)
+        return qx::fail(error, qx::errors::unknownFields, unknown.names(),
+                        target.source.element().name());
+    // Although it is worded as a warning, it goes to the host's debug log; whether there is a host's
+    // log at all is asked of the warnings.
+    if (qx::hostHasLogWarning())
+        qx::logDebug("*** Warning: Unbound fields: %@", unknown.names());
+    else
+        qx::log("Unbound fields: %@", unknown.names());
+
+    auto kept = qx::make<qx::Dictionary>();
+    for (const String& name : unknown.names()->names())
+        kept->set(name, qx::make<qx::Array>());
+    target.source.forEachChild([&](XMLNode& child) {
+        if (!child.isElement())
+            return;
+        if (const Value* elements = kept->find(child.name()))
+            static_cast<qx::Array*>(elements->object())->add(target.source.keep(child));
+    });
+    return ObjectDoor::set(target.object, key, kept, error);
+}
+
+bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
+    static const Key key("unboundAttributes");
+    const XMLElement& element = target.source.element();
+    Unknown unknown(target.bound.attributes);
+    for (const XMLNode& attribute : element.attributes())
+        unknown.see(attribute);
+    if (!unknown.names())
+        return true;
+    if (!_saveUnknownXML)
+        return qx::fail(error, qx::errors::unknownAttributes, unknown.names(), element.name());
+    qx::logWarningOrLine("Unbound attributes: %@", unknown.names());
+
+    auto kept = qx::make<qx::Array>();
+    for (const String& name : unknown.names()->names())
+        kept->add(target.source.keep(*element.attributeForName(name)));
+    return ObjectDoor::set(target.object, key, kept, error);
+}
