@@ -18,17 +18,21 @@
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <span>
 #include <string_view>
 
 namespace qx {
 
 class Class;
+class Dictionary;
 class Invocation;
 class MethodSignature;
+class ObservationToken;
 class Value;
 class WeakAnchor;
-struct ObservationInfo;
+enum class ChangeKind : std::uint8_t;
+struct ValueChange;
 
 // What became of a value that was offered for a key.
 enum class SetOutcome : std::uint8_t { set, refused, unknownKey };
@@ -77,6 +81,22 @@ public:
     // Announce a change that is not made through setValueForKey: each will needs its did.
     virtual void willChangeValueForKey(Key key);
     virtual void didChangeValueForKey(Key key);
+    // The same for items of the collection under the key; the did is told the same as the will.
+    virtual void willChange(ChangeKind kind, std::span<const std::size_t> indexes, Key key);
+    virtual void didChange(ChangeKind kind, std::span<const std::size_t> indexes, Key key);
+
+    // Tells the observer of changes at the key path; see Observation.h for the options and for what
+    // the change holds. Each adding is ended by one removing, the latest first, or with one of the
+    // objects; removing what is not there raises NSRangeException.
+    void addObserver(Object* observer, Key keyPath, unsigned options = 3, Selector context = {});
+    void removeObserver(Object* observer, Key keyPath);
+    void removeObserver(Object* observer, Key keyPath, Selector context);
+    // Called for each change; the default raises NSInternalInconsistencyException.
+    virtual void observeValueForKeyPath(const String& keyPath, Object* object,
+                                        const Dictionary& change, Selector context);
+    // Calls the callable for each change until the token ends.
+    [[nodiscard]] ObservationToken
+    observe(Key keyPath, std::function<void(const ValueChange&)> call, unsigned options = 3);
 
     // True when the class describes an operation of that name.
     bool respondsTo(Selector selector) const;

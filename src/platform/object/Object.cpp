@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/Format.h>
 #include <QXXMLMarshalling/platform/Invocation.h>
+#include <QXXMLMarshalling/platform/Observation.h>
 
 #include "platform/object/ObjectExtras.h"
 
@@ -149,25 +150,6 @@ void Object::setValueForKey(const Value& value, Key key) {
     }
 }
 
-namespace {
-
-// Sends the did that a will needs, whatever the setter throws.
-class ChangeNotice {
-public:
-    ChangeNotice(Object& object, Key key) : _object(object), _key(key) {
-        _object.willChangeValueForKey(_key);
-    }
-    ~ChangeNotice() noexcept(false) { _object.didChangeValueForKey(_key); }
-    ChangeNotice(const ChangeNotice&) = delete;
-    ChangeNotice& operator=(const ChangeNotice&) = delete;
-
-private:
-    Object& _object;
-    Key _key;
-};
-
-} // namespace
-
 SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
     const Class& type = isa();
     const Property* property = type.property(key);
@@ -185,7 +167,7 @@ SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
         return SetOutcome::refused;
     if (!type.automaticallyNotifiesObserversForKey(key))
         return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
-    const ChangeNotice notice(*this, key);
+    const ChangeScope scope(*this, key);
     return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
 }
 
@@ -223,10 +205,6 @@ void Object::setValueForKeyPath(const Value& value, std::string_view path) {
     if (Object* object = holder.object())
         object->setValueForKey(value, path.substr(dot + 1));
 }
-
-void Object::willChangeValueForKey(Key) {}
-
-void Object::didChangeValueForKey(Key) {}
 
 bool Object::respondsTo(Selector selector) const { return isa().operation(selector) != nullptr; }
 

@@ -1,8 +1,13 @@
 #include "platform/object/ObjectExtras.h"
 
+#include "platform/object/ObservationInfo.h"
+
 #include <algorithm>
 
 namespace qx {
+
+Object::Extras::Extras() noexcept = default;
+Object::Extras::~Extras() = default;
 
 void ObjectInternals::addEndListener(Object& object, EndListener& listener) {
     extras(object).endListeners.push_back(&listener);

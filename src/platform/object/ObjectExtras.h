@@ -4,9 +4,12 @@
 
 #include <QXXMLMarshalling/platform/Object.h>
 
+#include <memory>
 #include <vector>
 
 namespace qx {
+
+struct ObservationInfo;
 
 // Told once when an object that it was added to ends, while the object is still whole.
 class EndListener {
@@ -20,6 +23,10 @@ protected:
 struct Object::Extras {
     Ref<WeakAnchor> anchor;
     std::vector<EndListener*> endListeners;
+    std::unique_ptr<ObservationInfo> observation;
+
+    Extras() noexcept;
+    ~Extras();
 };
 
 // The extras for the rest of this room.

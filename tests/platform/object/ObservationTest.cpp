@@ -1,0 +1,385 @@
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Dictionary.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/Null.h>
+#include <QXXMLMarshalling/platform/Observation.h>
+#include <QXXMLMarshalling/platform/WeakRef.h>
+
+#include <gtest/gtest.h>
+
+#include <optional>
+
+namespace {
+
+using namespace qx;
+using Texts = std::vector<std::string>;
+
+class Place : public Object {
+public:
+    String city;
+    String country;
+    Ref<Place> within;
+    Ref<Array> streets = make<Array>();
+    String silent;
+
+    String label() const { return String::concat({city, ", ", country}); }
+    static std::vector<String> affecting(const String& key) {
+        if (key == "label")
+            return {"city", "country"};
+        if (key == "ring")
+            return {"within.ring"};
+        return {};
+    }
+    static std::vector<String> affectingAddress() { return {"label", "within.city"}; }
+    String address() const {
+        return String::concat({label(), " in ", within ? within->city : String("the world")});
+    }
+    static bool notifies(const String& key) { return key != "silent"; }
+};
+
+const bool described = [] {
+    Class::define<Place>("ObservationTest.Place")
+        .property<&Place::city>("city")
+        .property<&Place::country>("country")
+        .property<&Place::within>("within")
+        .property<&Place::streets>("streets")
+        .property<&Place::silent>("silent")
+        .property<&Place::label>("label")
+        .property<&Place::address>("address")
+        .property<&Place::city>("ring")
+        .classOperation<&Place::affecting>("keyPathsForValuesAffectingValueForKey:")
+        .classOperation<&Place::affectingAddress>("keyPathsForValuesAffectingAddress")
+        .classOperation<&Place::notifies>("automaticallyNotifiesObserversForKey:");
+    return true;
+}();
+
+Ref<Place> place(const char* city, Ref<Place> within = nullptr) {
+    auto result = make<Place>();
+    result->city = city;
+    result->within = std::move(within);
+    return result;
+}
+
+// Notes "context: old > new", or the whole change with everything in it.
+class Notebook : public Object {
+public:
+    void observeValueForKeyPath(const String& keyPath, Object* object, const Dictionary& change,
+                                Selector context) override {
+        seen = change.mutableCopy();
+        notes.push_back(String::concat({context.isNull() ? keyPath.view() : context.name(), ": ",
+                                        change.get("old").description(), " > ",
+                                        change.get("new").description()})
+                            .str());
+        if (then)
+            then(*object);
+    }
+    Texts notes;
+    Ref<Dictionary> seen;
+    std::function<void(Object&)> then;
+};
+
+struct ObservationTest : testing::Test {
+    Ref<Notebook> notebook = make<Notebook>();
+
+    // What the call adds to the notebook.
+    template <class F>
+    Texts notes(F call) {
+        notebook->notes.clear();
+        call();
+        return notebook->notes;
+    }
+};
+
+TEST_F(ObservationTest, EachChangeIsToldOnceWithOldAndNew) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey(nullptr, "city"); }), Texts{"city: Roma > <null>"});
+    EXPECT_EQ(notebook->seen->get("new").object(), Null::marker());
+    EXPECT_EQ(notebook->seen->get("kind"), Value(1));
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Italy", "country"); }), Texts{});
+    rome->removeObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Rome", "city"); }), Texts{});
+    EXPECT_THROW(rome->removeObserver(notebook.get(), "city"), Exception);
+}
+
+TEST_F(ObservationTest, OptionsChooseWhatIsTold) {
+    const auto rome = place("Rome");
+    const auto told = [&](unsigned options) {
+        notebook->seen = nullptr;
+        Texts keys;
+        rome->addObserver(notebook.get(), "city", options);
+        rome->setValueForKey("Roma", "city");
+        for (const auto& entry : *notebook->seen)
+            keys.push_back(entry.key.str());
+        rome->removeObserver(notebook.get(), "city");
+        return keys;
+    };
+    EXPECT_EQ(told(0), Texts{"kind"});
+    EXPECT_EQ(told(Observing::newValue), (Texts{"kind", "new"}));
+    EXPECT_EQ(told(Observing::oldValue), (Texts{"kind", "old"}));
+    EXPECT_EQ(told(Observing::newValue | Observing::oldValue), (Texts{"kind", "old", "new"}));
+}
+
+TEST_F(ObservationTest, InitialAndPriorAreToldApart) {
+    const auto rome = place("Rome");
+    const unsigned all =
+        Observing::newValue | Observing::oldValue | Observing::initial | Observing::prior;
+    EXPECT_EQ(notes([&] { rome->addObserver(notebook.get(), "city", all); }),
+              Texts{"city: (null) > Rome"});
+    notebook->then = [&](Object&) {
+        notebook->notes.back() +=
+            notebook->seen->get("notificationIsPrior").boolValue() ? " prior" : "";
+    };
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }),
+              (Texts{"city: Rome > (null) prior", "city: Rome > Roma"}));
+}
+
+TEST_F(ObservationTest, APathThroughThreeObjectsHearsOfEachOfThem) {
+    const auto europe = place("Europe"), asia = place("Asia");
+    const auto italy = place("Italy", europe), japan = place("Japan", asia);
+    const auto rome = place("Rome", italy);
+    rome->addObserver(notebook.get(), "within.within.city");
+    EXPECT_EQ(notes([&] { europe->setValueForKey("EU", "city"); }),
+              Texts{"within.within.city: Europe > EU"});
+    EXPECT_EQ(notes([&] { italy->setValueForKey(asia, "within"); }),
+              Texts{"within.within.city: EU > Asia"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey(japan, "within"); }),
+              Texts{"within.within.city: Asia > Asia"});
+    EXPECT_EQ(notes([&] { italy->setValueForKey(europe, "within"); }), Texts{});
+    EXPECT_EQ(notes([&] { rome->setValueForKey(nullptr, "within"); }),
+              Texts{"within.within.city: Asia > <null>"});
+    EXPECT_EQ(notes([&] { asia->setValueForKey("A", "city"); }), Texts{});
+}
+
+TEST_F(ObservationTest, DependentValuesAreToldOfWhatTheyDependOn) {
+    const auto rome = place("Rome", place("Italy"));
+    rome->addObserver(notebook.get(), "address");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }),
+              Texts{"address: Rome,  in Italy > Roma,  in Italy"});
+    EXPECT_EQ(notes([&] { rome->within->setValueForKey("Italia", "city"); }),
+              Texts{"address: Roma,  in Italy > Roma,  in Italia"});
+    rome->setValueForKey(place("EU"), "within");
+    EXPECT_EQ(notes([&] {
+                  const ChangeScope scope(*rome, "address");
+                  rome->within->setValueForKey("Europe", "city");
+                  rome->setValueForKey("EU", "country");
+              }),
+              Texts{"address: Roma,  in EU > Roma, EU in Europe"});
+}
+
+TEST_F(ObservationTest, RingsOfDependenciesEnd) {
+    const auto one = place("One");
+    const auto two = place("Two", one);
+    one->within = two;
+    auto token = two->observe("ring", [](const ValueChange&) {});
+    auto chain = place("end");
+    for (int i = 0; i < 2000; ++i)
+        chain = place("link", chain);
+    notebook->notes.clear();
+    chain->addObserver(notebook.get(), "ring");
+    chain->within->setValueForKey("new", "ring");
+    EXPECT_EQ(notebook->notes, Texts{"ring: link > link"});
+    one->setValueForKey(nullptr, "within");
+}
+
+TEST_F(ObservationTest, NestedChangesOfOneKeyAreToldWhenTheOutermostEnds) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] {
+                  const ChangeScope scope(*rome, "city");
+                  rome->setValueForKey("Roma", "city");
+                  rome->setValueForKey("ROMA", "city");
+                  EXPECT_TRUE(notebook->notes.empty());
+              }),
+              Texts{"city: Rome > ROMA"});
+    rome->didChangeValueForKey("city"); // no change was announced
+    EXPECT_EQ(notebook->notes.size(), 1U);
+}
+
+TEST_F(ObservationTest, KeysWithoutAutomaticNotificationAreAnnouncedByHand) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "silent");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("one", "silent"); }), Texts{});
+    EXPECT_EQ(notes([&] {
+                  rome->willChangeValueForKey("silent");
+                  rome->setValueForKey("two", "silent");
+                  rome->didChangeValueForKey("silent");
+              }),
+              Texts{"silent: one > two"});
+}
+
+TEST_F(ObservationTest, ChangesOfItemsCarryIndexesAndTheItems) {
+    const auto rome = place("Rome");
+    rome->streets = make<Array>(std::initializer_list<Value>{"a", "b", "c"});
+    std::optional<ValueChange> change;
+    const auto token =
+        rome->observe("streets", [&](const ValueChange& told) { change.emplace(told); });
+    const auto items = [](const Value& value) {
+        std::string all;
+        if (const auto array = value.as<Array>())
+            for (const Value& item : *array)
+                all += item.string().view();
+        return all;
+    };
+    const struct {
+        ChangeKind kind;
+        std::vector<std::size_t> indexes;
+        std::function<void(Array&)> apply;
+        std::string before, after;
+    } cases[] = {
+        {ChangeKind::insertion, {1}, [](Array& array) { array.insert(1, "x"); }, "", "x"},
+        {ChangeKind::replacement,
+         {0, 3},
+         [](Array& array) {
+             array.replace(0, "y");
+             array.replace(3, "z");
+         },
+         "ac",
+         "yz"},
+        {ChangeKind::removal, {2}, [](Array& array) { array.remove(2); }, "b", ""},
+    };
+    for (const auto& row : cases) {
+        {
+            const ChangeScope scope(*rome, "streets", row.kind, row.indexes);
+            row.apply(*rome->streets);
+        }
+        EXPECT_EQ(change->kind, row.kind);
+        EXPECT_EQ(change->indexes, row.indexes);
+        EXPECT_EQ(items(change->oldValue), row.before);
+        EXPECT_EQ(items(change->newValue), row.after);
+    }
+    rome->addObserver(notebook.get(), "streets");
+    rome->willChange(ChangeKind::removal, std::vector<std::size_t>{0}, "streets");
+    rome->streets->remove(0);
+    rome->didChange(ChangeKind::removal, std::vector<std::size_t>{0}, "streets");
+    EXPECT_EQ(notebook->seen->get("kind"), Value(3));
+    EXPECT_EQ(notebook->seen->get("indexes").as<Array>()->at(0), Value(0));
+    EXPECT_FALSE(notebook->seen->contains("new"));
+}
+
+TEST_F(ObservationTest, ObserversAreToldInTheirOrderAndRemovedLatestFirst) {
+    const auto rome = place("Rome");
+    for (const char* context : {"a", "b", "c", "a"})
+        rome->addObserver(notebook.get(), "city", 0, context);
+    const auto told = [&] {
+        std::string order;
+        for (const auto& note : notes([&] { rome->setValueForKey("Roma", "city"); }))
+            order += note.front();
+        return order;
+    };
+    EXPECT_EQ(told(), "abca");
+    rome->removeObserver(notebook.get(), "city", "a");
+    EXPECT_EQ(told(), "abc");
+    rome->removeObserver(notebook.get(), "city");
+    EXPECT_EQ(told(), "ab");
+}
+
+TEST_F(ObservationTest, AnObserverMayRemoveItselfAndOthersWhileItIsTold) {
+    const auto rome = place("Rome");
+    auto second = make<Notebook>();
+    rome->addObserver(notebook.get(), "city");
+    rome->addObserver(second.get(), "city");
+    int calls = 0;
+    ObservationToken token = rome->observe("city", [&](const ValueChange&) { ++calls; });
+    notebook->then = [&](Object& object) {
+        object.removeObserver(notebook.get(), "city");
+        second = nullptr;
+        token.end();
+        token = object.observe("city", [&](const ValueChange&) { calls += 10; });
+    };
+    rome->setValueForKey("Roma", "city");
+    EXPECT_EQ(notebook->notes.size(), 1U);
+    EXPECT_EQ(calls, 0); // the one removed is told no more, the new one not yet
+    rome->setValueForKey("Rome", "city");
+    EXPECT_EQ(notebook->notes.size(), 1U);
+    EXPECT_EQ(calls, 10);
+}
+
+TEST_F(ObservationTest, EitherSideMayGoFirst) {
+    auto italy = place("Italy");
+    auto rome = place("Rome", italy);
+    {
+        const auto shortLived = make<Notebook>();
+        rome->addObserver(shortLived.get(), "within.city");
+        Place onStack;
+        onStack.addObserver(shortLived.get(), "city");
+        onStack.addObserver(notebook.get(), "city");
+    }
+    italy->setValueForKey("Italia", "city");
+    rome->addObserver(notebook.get(), "within.city");
+    ObservationToken token = rome->observe("within.city", [](const ValueChange&) {});
+    rome->within = nullptr; // by a change that nobody announced
+    const WeakRef<Place> watched(italy);
+    italy = nullptr;
+    EXPECT_FALSE(watched);
+    rome->setValueForKey(nullptr, "within");
+    rome = nullptr;
+    token.end();
+}
+
+TEST_F(ObservationTest, AnObserverMayEndTheObservedObject) {
+    auto rome = place("Rome");
+    Place* raw = rome.get();
+    notebook->then = [&](Object&) { rome = nullptr; };
+    raw->addObserver(notebook.get(), "city");
+    raw->addObserver(notebook.get(), "city");
+    raw->setValueForKey("Roma", "city");
+    EXPECT_EQ(notebook->notes.size(), 2U);
+}
+
+TEST_F(ObservationTest, WhatAnObserverThrowsComesOutWhenAllHaveBeenTold) {
+    const auto rome = place("Rome");
+    rome->addObserver(make<Object>().get(), "city"); // gone at once
+    const auto deaf = make<Object>();
+    rome->addObserver(deaf.get(), "city"); // does not take changes
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] { EXPECT_THROW(rome->setValueForKey("A", "city"), Exception); }),
+              Texts{"city: Rome > A"});
+    rome->removeObserver(deaf.get(), "city");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("B", "city"); }), Texts{"city: A > B"});
+}
+
+TEST_F(ObservationTest, AChangeThatFailsInItsScopeIsStillTold) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "city");
+    notebook->then = [](Object&) { throw std::runtime_error("observer"); };
+    EXPECT_THROW(
+        {
+            const ChangeScope scope(*rome, "city");
+            rome->city = "Roma";
+            throw std::logic_error("change");
+        },
+        std::logic_error);
+    EXPECT_EQ(notebook->notes, Texts{"city: Rome > Roma"});
+}
+
+TEST_F(ObservationTest, AThrowingPriorObserverCancelsTheAnnouncement) {
+    const auto rome = place("Rome");
+    bool refuses = true;
+    const auto token = rome->observe(
+        "city",
+        [&](const ValueChange& change) {
+            if (change.isPrior && refuses)
+                throw std::runtime_error("no");
+        },
+        Observing::prior);
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_THROW(rome->setValueForKey("Roma", "city"), std::runtime_error);
+    EXPECT_EQ(rome->city, "Rome");
+    refuses = false;
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
+}
+
+TEST_F(ObservationTest, ObservancesThroughASharedObjectEndWithTheirRoots) {
+    const auto shared = place("Italy");
+    std::vector<Ref<Place>> places;
+    for (int i = 0; i < 100000; ++i) {
+        places.push_back(place("town", shared));
+        places.back()->addObserver(notebook.get(), "within.city", 0);
+    }
+    places.clear();
+    EXPECT_EQ(notes([&] { shared->setValueForKey("Italia", "city"); }), Texts{});
+}
+
+} // namespace
