@@ -7,10 +7,12 @@
 //     if (!document) std::cerr << error->localizedDescription().view();
 //
 // Parsing reads the given bytes and nothing else: no other file, no network, whatever the document
-// says. Internal entities and attribute defaults of the internal subset work; CDATA and entities
-// become text. Limits bound depth, text size and entity expansion; beyond one, and for anything
-// that is no well-formed XML, the result is null and the error says what, where: domain
-// qx::Error::parserDomain, the parser's code and text, line() and column().
+// says. Internal entities and attribute defaults of the internal subset work, an entity that stands
+// elsewhere is an error; CDATA and entities become text. Limits bound depth, text size, what
+// entities bring in and what one element may declare. Beyond one, and for anything that is no
+// well-formed XML, the result is null and the error says what, where: domain
+// qx::Error::parserDomain, the parser's code and text, line() and column(). Any number of threads
+// may parse at the same time.
 
 #include <QXXMLMarshalling/platform/Data.h>
 #include <QXXMLMarshalling/platform/Error.h>
@@ -34,7 +36,7 @@ struct XMLParseOptions {
 class QX_API XMLDocument final : public XMLNode {
 public:
     // Reads a file: a path or a file: URL. An unreadable one is an error of qx::Error::cocoaDomain
-    // with code 260 (no such file) or 256.
+    // with code 260 (no such file), 257 (not permitted) or 256.
     static Ref<XMLDocument> initWithContentsOfURL(const String& URL,
                                                   const XMLParseOptions& options = {},
                                                   Ref<Error>* error = nullptr);
@@ -87,6 +89,7 @@ public:
 
 private:
     friend class XMLNode;
+    friend class XMLTreeBuilder;
     friend class XMLParser;
 
     XMLDocument() noexcept;

@@ -25,6 +25,7 @@ public:
     // Appends the node, which becomes this element's. A node that has a parent, a document, an
     // attribute, a namespace or an ancestor of this element raises NSInvalidArgumentException.
     void addChild(Ref<XMLNode> child);
+    // The same before a child of this element, at the end where `before` is null.
     void insertChild(Ref<XMLNode> child, XMLNode* before);
 
     // In document order.
@@ -42,6 +43,7 @@ public:
     // Replaces all declarations; of equal prefixes the first wins. Nodes that have a parent or are
     // no namespaces raise NSInvalidArgumentException before anything is changed.
     void setNamespaces(std::span<const Ref<XMLNode>> namespaces);
+    // Adds nothing when the prefix is declared here already.
     void addNamespace(Ref<XMLNode> declaration);
 
     String stringValue() const override;
@@ -50,19 +52,18 @@ public:
 
 private:
     friend class XMLNode;
-    friend class XMLParser;
-    friend Ref<XMLElement> make<XMLElement>(String&&);
+    friend class XMLTreeBuilder;
 
     explicit XMLElement(String name) noexcept;
     void unlink(XMLNode& node) noexcept;
 
+    std::uint32_t _childCount = 0; // fills the hole that the base class leaves
     XMLNode* _firstChild = nullptr;
     XMLNode* _lastChild = nullptr;
     XMLNode* _firstAttribute = nullptr;
     XMLNode* _lastAttribute = nullptr;
     XMLNode* _firstNamespace = nullptr;
     XMLNode* _lastNamespace = nullptr;
-    std::size_t _childCount = 0;
 };
 
 inline XMLElement* XMLNode::asElement() noexcept {

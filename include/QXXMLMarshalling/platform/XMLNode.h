@@ -35,14 +35,13 @@ enum class XMLNodeKind : std::uint8_t {
     processingInstruction
 };
 
-// Options of parsing and serialising, to be combined with |.
+// Options of serialising, to be combined with |.
 enum XMLOptions : std::uint32_t {
     XMLNoOptions = 0,
-    // Parsing: keep texts of white space only, which are layout otherwise.
-    XMLKeepWhiteSpace = 1U << 25,
-    // Serialising: one element a line, 4 blanks a level, where no text stands beside it.
+    // One node a line, 4 blanks a level, where no text stands beside elements and no
+    // xml:space="preserve" is in force.
     XMLPrettyPrint = 1U << 17,
-    // Serialising: <a/> instead of <a></a>.
+    // <a/> instead of <a></a>.
     XMLCompactEmptyElements = 1U << 18
 };
 constexpr XMLOptions operator|(XMLOptions a, XMLOptions b) {
@@ -125,8 +124,9 @@ public:
     // True when both print as the same XML.
     bool isSameXML(const XMLNode& other) const;
 
-    // Where the element's "<" stood in the parsed document, 1-based; 0 for nodes made by hand and
-    // for other kinds.
+    // Where the element's "<" stood in the parsed document, 1-based, a column being one character
+    // (code point) of the line; 0 for nodes made by hand and for other kinds. An element that an
+    // entity brought stands where the entity was referred to.
     std::size_t line() const noexcept { return _line; }
     std::size_t column() const noexcept { return _column; }
 
@@ -140,7 +140,9 @@ public:
 protected:
     friend class XMLElement;
     friend class XMLDocument;
-    friend class XMLParser;
+    friend class XMLTreeBuilder;
+    friend class XMLSerializer;
+    friend struct XMLSiblings;
 
     XMLNode(XMLNodeKind kind, String name, String value) noexcept;
     const Class& describedClass() const override;
@@ -150,9 +152,13 @@ protected:
     XMLNode* _previous = nullptr;
     String _name;
     String _value;
+    XMLNodeKind _kind;
+    // A text of white space that stood in a parsed document as such, and was asked to be kept. It
+    // is written as it is; the line breaks of any other such text are escaped, so that it is read
+    // back.
+    bool _isLayout = false;
     std::uint32_t _line = 0;
     std::uint32_t _column = 0;
-    XMLNodeKind _kind;
 };
 
 inline XMLNodeRange::Iterator& XMLNodeRange::Iterator::operator++() noexcept {

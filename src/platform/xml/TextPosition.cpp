@@ -1,0 +1,45 @@
+#include "platform/xml/TextPosition.h"
+
+#include <algorithm>
+#include <bit>
+#include <cstring>
+
+namespace qx {
+
+namespace {
+
+// Bytes that are no continuation of a UTF-8 sequence, eight at a time.
+std::size_t countCodePoints(const char* from, const char* to) noexcept {
+    std::size_t count = static_cast<std::size_t>(to - from);
+    constexpr std::uint64_t lowBits = 0x0101010101010101U;
+    for (; to - from >= 8; from += 8) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, from, 8);
+        count -= static_cast<std::size_t>(std::popcount((word >> 7) & ~(word >> 6) & lowBits));
+    }
+    for (; from != to; ++from)
+        count -= (static_cast<unsigned char>(*from) & 0xC0U) == 0x80U;
+    return count;
+}
+
+} // namespace
+
+void TextPosition::moveTo(std::size_t offset) noexcept {
+    offset = std::min(offset, _text.size());
+    if (offset < _offset)
+        *this = TextPosition(_text);
+    const char* from = _text.data() + _offset;
+    const char* const to = _text.data() + offset;
+    _offset = offset;
+    while (from != to) {
+        const void* lineEnd = std::memchr(from, '\n', static_cast<std::size_t>(to - from));
+        if (lineEnd == nullptr)
+            break;
+        from = static_cast<const char*>(lineEnd) + 1;
+        ++_line;
+        _column = 1;
+    }
+    _column += countCodePoints(from, to);
+}
+
+} // namespace qx

@@ -1,0 +1,27 @@
+#pragma once
+
+// Which characters XML 1.0 allows, and where.
+
+#include <cstddef>
+#include <string_view>
+
+namespace qx {
+
+// What decodeCharacter answers for bytes that are no UTF-8.
+constexpr char32_t malformedCharacter = 0xFFFFFFFF;
+
+// The code point at `position`, which moves behind it (by one byte for malformed ones). The
+// position must lie inside the text.
+char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
+
+// Space, tab, line feed and carriage return.
+constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
+bool isWhite(std::string_view text) noexcept;
+
+bool isXMLCharacter(char32_t c) noexcept;
+// UTF-8 whose every character XML allows in some place of a document.
+bool isXMLText(std::string_view text) noexcept;
+// A name of an element, an attribute or a target, colons included.
+bool isXMLName(std::string_view text) noexcept;
+
+} // namespace qx

@@ -1,0 +1,158 @@
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include "platform/system/Files.h"
+#include "platform/xml/Encoding.h"
+#include "platform/xml/Siblings.h"
+#include "platform/xml/XMLParser.h"
+#include "platform/xml/XMLSerializer.h"
+
+#include <istream>
+#include <ostream>
+
+namespace qx {
+
+namespace {
+
+constexpr int unreadable = 256;
+constexpr int unwritable = 512;
+
+void report(Ref<Error>* error, int code, const char* message) {
+    if (error != nullptr)
+        *error = make<Error>(Error::cocoaDomain, code, message, "The stream failed");
+}
+
+} // namespace
+
+XMLDocument::XMLDocument() noexcept : XMLNode(XMLNodeKind::document, String(), String()) {}
+
+XMLDocument::~XMLDocument() { XMLSiblings::releaseAll(_firstChild, _lastChild); }
+
+Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
+                                                    const XMLParseOptions& options,
+                                                    Ref<Error>* error) {
+    const String path = pathOfURL(URL);
+    if (!path.isNull())
+        return initWithContentsOfFile(path, options, error);
+    if (error != nullptr)
+        *error = make<Error>(Error::cocoaDomain, unreadable, String::concat({"Cannot read ", URL}),
+                             "No URL of a local file");
+    return nullptr;
+}
+
+Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
+                                                     const XMLParseOptions& options,
+                                                     Ref<Error>* error) {
+    const Ref<Data> data = readFile(path, error);
+    return data ? initWithData(*data, options, error) : nullptr;
+}
+
+Ref<XMLDocument> XMLDocument::initWithData(std::string_view bytes, const XMLParseOptions& options,
+                                           Ref<Error>* error) {
+    return XMLParser::parse(bytes, options, error);
+}
+
+Ref<XMLDocument> XMLDocument::initWithData(const Data& data, const XMLParseOptions& options,
+                                           Ref<Error>* error) {
+    return XMLParser::parse(data.view(), options, error);
+}
+
+Ref<XMLDocument> XMLDocument::initWithStream(std::istream& stream, const XMLParseOptions& options,
+                                             Ref<Error>* error) {
+    std::string bytes;
+    char block[16 * 1024];
+    while (stream.read(block, sizeof block) || stream.gcount() > 0)
+        bytes.append(block, static_cast<std::size_t>(stream.gcount()));
+    if (stream.eof() && !stream.bad())
+        return XMLParser::parse(bytes, options, error);
+    report(error, unreadable, "Cannot read the document from its stream");
+    return nullptr;
+}
+
+Ref<XMLDocument> XMLDocument::initWithRootElement(Ref<XMLElement> root) {
+    auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+    if (root)
+        document->addChild(std::move(root));
+    return document;
+}
+
+XMLElement* XMLDocument::rootElement() const noexcept {
+    for (XMLNode& node : children())
+        if (node.isElement())
+            return node.asElement();
+    return nullptr;
+}
+
+void XMLDocument::addChild(Ref<XMLNode> child) {
+    const auto refuse = [](const char* reason) {
+        throw Exception(Exception::invalidArgument, reason);
+    };
+    if (!child)
+        refuse("a null node cannot be added to a document");
+    if (child->parent() != nullptr)
+        refuse("a node that has a parent cannot be added to a document");
+    switch (child->kind()) {
+    case XMLNodeKind::element:
+        if (rootElement() != nullptr)
+            refuse("a document cannot have two root elements");
+        break;
+    case XMLNodeKind::comment:
+    case XMLNodeKind::processingInstruction:
+        break;
+    default:
+        refuse("a document holds an element, comments and processing instructions only");
+    }
+    XMLSiblings::append(*this, _firstChild, _lastChild, child.detach());
+}
+
+void XMLDocument::unlink(XMLNode& node) noexcept {
+    XMLSiblings::remove(_firstChild, _lastChild, node);
+}
+
+std::string XMLDocument::XMLData(XMLOptions options) const {
+    std::string text;
+    if (_encoding.isEmpty() || isUTF8Name(_encoding)) {
+        XMLSerializer(text, options, XMLChecks::on).write(*this);
+        return text;
+    }
+    TextEncoder encoder(_encoding);
+    XMLSerializer(text, options, XMLChecks::on, &encoder).write(*this);
+    return encoder.encoded(text);
+}
+
+bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error) const {
+    return writeFileAtomically(path, XMLData(options), error);
+}
+
+bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error) const {
+    const std::string bytes = XMLData(options);
+    stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    if (stream.flush())
+        return true;
+    report(error, unwritable, "Cannot write the document to its stream");
+    return false;
+}
+
+String XMLDocument::stringValue() const {
+    const XMLElement* root = rootElement();
+    return root != nullptr ? root->stringValue() : String("");
+}
+
+void XMLDocument::setStringValue(const String& value) {
+    if (XMLElement* root = rootElement())
+        root->setStringValue(value);
+}
+
+Ref<XMLNode> XMLDocument::copy() const {
+    auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+    document->_version = _version;
+    document->_encoding = _encoding;
+    document->_standalone = _standalone;
+    for (const XMLNode& node : children())
+        XMLSiblings::append(*document, document->_firstChild, document->_lastChild,
+                            node.copy().detach());
+    return document;
+}
+
+} // namespace qx

@@ -1,0 +1,220 @@
+#include <QXXMLMarshalling/platform/XMLElement.h>
+
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include "platform/xml/Siblings.h"
+
+#include <string>
+
+namespace qx {
+
+namespace {
+
+[[noreturn]] void refuse(std::string_view what, const XMLElement& element) {
+    throw Exception(Exception::invalidArgument,
+                    String::concat({what, ", element ", element.name()}));
+}
+
+// Raises unless the node can be put into one of the element's lists.
+void requireFree(const XMLNode* node, const XMLElement& element) {
+    if (node == nullptr)
+        refuse("a null node cannot be added", element);
+    if (node->parent() != nullptr)
+        refuse("a node that has a parent cannot be added", element);
+}
+
+void requireChild(const XMLNode* child, const XMLElement& element) {
+    requireFree(child, element);
+    switch (child->kind()) {
+    case XMLNodeKind::document:
+    case XMLNodeKind::attribute:
+    case XMLNodeKind::namespaceDeclaration:
+        refuse("a document, attribute or namespace cannot be a child", element);
+    default:
+        break;
+    }
+    if (child == &element)
+        refuse("an element cannot be its own child", element);
+    if (child->firstChild() == nullptr)
+        return;
+    for (const XMLNode* above = element.parent(); above != nullptr; above = above->parent())
+        if (above == child)
+            refuse("an element cannot be the child of its descendant", element);
+}
+
+// The node after `node` in document order, within the element.
+const XMLNode* following(const XMLNode* node, const XMLElement* element) {
+    if (node->firstChild() != nullptr)
+        return node->firstChild();
+    while (node != element && node->nextSibling() == nullptr)
+        node = node->parent();
+    return node == element ? nullptr : node->nextSibling();
+}
+
+bool isText(const XMLNode& node) { return node.kind() == XMLNodeKind::text; }
+
+} // namespace
+
+// Documents hold millions of elements: this is 16 bytes less than an unlucky order of members.
+static_assert(sizeof(void*) != 8 || sizeof(XMLElement) <= 136);
+
+XMLElement::XMLElement(String name) noexcept
+    : XMLNode(XMLNodeKind::element, std::move(name), String()) {}
+
+XMLElement::~XMLElement() {
+    XMLSiblings::releaseAll(_firstChild, _lastChild);
+    XMLSiblings::releaseAll(_firstAttribute, _lastAttribute);
+    XMLSiblings::releaseAll(_firstNamespace, _lastNamespace);
+}
+
+Ref<XMLElement> XMLElement::initWithName(const String& name) {
+    return Ref<XMLElement>::adopt(new XMLElement(name.isNull() ? String("") : name));
+}
+
+Ref<XMLElement> XMLElement::initWithName(const String& name, const String& stringValue) {
+    Ref<XMLElement> element = initWithName(name);
+    element->setStringValue(stringValue);
+    return element;
+}
+
+std::vector<XMLElement*> XMLElement::elementsForName(const String& name) const {
+    std::vector<XMLElement*> found;
+    for (XMLNode* child = _firstChild; child != nullptr; child = child->_next)
+        if (child->isElement() && child->_name == name)
+            found.push_back(child->asElement());
+    return found;
+}
+
+void XMLElement::addChild(Ref<XMLNode> child) { insertChild(std::move(child), nullptr); }
+
+void XMLElement::insertChild(Ref<XMLNode> child, XMLNode* before) {
+    requireChild(child.get(), *this);
+    if (before != nullptr && (before->_parent != this || before->_kind == XMLNodeKind::attribute ||
+                              before->_kind == XMLNodeKind::namespaceDeclaration))
+        refuse("a child cannot be inserted before a node that is no child", *this);
+    XMLSiblings::insert(*this, _firstChild, _lastChild, child.detach(), before);
+    ++_childCount;
+}
+
+XMLNode* XMLElement::attributeForName(const String& name) const noexcept {
+    for (XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
+        if (node->_name == name)
+            return node;
+    return nullptr;
+}
+
+void XMLElement::addAttribute(Ref<XMLNode> attribute) {
+    requireFree(attribute.get(), *this);
+    if (attribute->_kind != XMLNodeKind::attribute)
+        refuse("a node that is no attribute cannot be added as one", *this);
+    if (attributeForName(attribute->_name) == nullptr)
+        XMLSiblings::append(*this, _firstAttribute, _lastAttribute, attribute.detach());
+}
+
+void XMLElement::removeAttributeForName(const String& name) {
+    if (XMLNode* attribute = attributeForName(name))
+        attribute->detach();
+}
+
+void XMLElement::setNamespaces(std::span<const Ref<XMLNode>> namespaces) {
+    for (const Ref<XMLNode>& declaration : namespaces) {
+        requireFree(declaration.get(), *this);
+        if (declaration->_kind != XMLNodeKind::namespaceDeclaration)
+            refuse("a node that is no namespace cannot be set as one", *this);
+    }
+    XMLSiblings::releaseAll(_firstNamespace, _lastNamespace);
+    // A node that stands in the list twice has a parent by then, and its prefix is taken.
+    for (const Ref<XMLNode>& declaration : namespaces)
+        if (declaration->_parent == nullptr)
+            addNamespace(declaration);
+}
+
+void XMLElement::addNamespace(Ref<XMLNode> declaration) {
+    requireFree(declaration.get(), *this);
+    if (declaration->_kind != XMLNodeKind::namespaceDeclaration)
+        refuse("a node that is no namespace cannot be added as one", *this);
+    for (const XMLNode* node = _firstNamespace; node != nullptr; node = node->_next)
+        if (node->_name == declaration->_name)
+            return;
+    XMLSiblings::append(*this, _firstNamespace, _lastNamespace, declaration.detach());
+}
+
+void XMLElement::unlink(XMLNode& node) noexcept {
+    if (node._kind == XMLNodeKind::attribute) {
+        XMLSiblings::remove(_firstAttribute, _lastAttribute, node);
+    } else if (node._kind == XMLNodeKind::namespaceDeclaration) {
+        XMLSiblings::remove(_firstNamespace, _lastNamespace, node);
+    } else {
+        XMLSiblings::remove(_firstChild, _lastChild, node);
+        --_childCount;
+    }
+}
+
+// The text of an element with one text, as most have, is shared with the caller, not copied.
+String XMLElement::stringValue() const {
+    const XMLNode* only = nullptr;
+    std::string joined;
+    for (const XMLNode* node = _firstChild; node != nullptr; node = following(node, this)) {
+        if (!isText(*node))
+            continue;
+        if (only == nullptr && joined.empty()) {
+            only = node;
+            continue;
+        }
+        if (only != nullptr)
+            joined = only->_value.view();
+        only = nullptr;
+        joined += node->_value.view();
+    }
+    return only != nullptr ? only->_value : String(joined);
+}
+
+void XMLElement::setStringValue(const String& value) {
+    Ref<XMLNode> text = value.isEmpty() ? Ref<XMLNode>() : initTextWithStringValue(value);
+    XMLSiblings::releaseAll(_firstChild, _lastChild);
+    _childCount = 0;
+    if (text)
+        addChild(std::move(text));
+}
+
+// Walks both trees in step, so that depth costs no stack.
+Ref<XMLNode> XMLElement::copy() const {
+    const auto alone = [](const XMLElement& from) {
+        Ref<XMLElement> element = initWithName(from._name);
+        element->_line = from._line;
+        element->_column = from._column;
+        for (const XMLNode* node = from._firstAttribute; node != nullptr; node = node->_next)
+            XMLSiblings::append(*element, element->_firstAttribute, element->_lastAttribute,
+                                node->copy().detach());
+        for (const XMLNode* node = from._firstNamespace; node != nullptr; node = node->_next)
+            XMLSiblings::append(*element, element->_firstNamespace, element->_lastNamespace,
+                                node->copy().detach());
+        return element;
+    };
+    Ref<XMLElement> top = alone(*this);
+    XMLElement* target = top.get();
+    const XMLNode* node = this;
+    while (true) {
+        if (node->firstChild() != nullptr) {
+            node = node->firstChild();
+        } else {
+            while (node != this && node->_next == nullptr) {
+                node = node->_parent;
+                if (node != this)
+                    target = target->_parent->asElement();
+            }
+            if (node == this)
+                return top;
+            node = node->_next;
+        }
+        const XMLElement* element = node->asElement();
+        Ref<XMLNode> copied = element != nullptr ? Ref<XMLNode>(alone(*element)) : node->copy();
+        XMLNode* child = copied.get();
+        XMLSiblings::append(*target, target->_firstChild, target->_lastChild, copied.detach());
+        ++target->_childCount;
+        if (node->firstChild() != nullptr)
+            target = child->asElement();
+    }
+}
+
+} // namespace qx

@@ -1,0 +1,41 @@
+#include "platform/xml/XMLNames.h"
+
+namespace qx {
+
+namespace {
+
+std::string_view viewOf(XMLNames::Name name) {
+    return name != nullptr ? reinterpret_cast<const char*>(name) : "";
+}
+
+} // namespace
+
+const String& XMLNames::add(Name local, Name prefix) {
+    String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})
+                                    : String(viewOf(local));
+    const Key known = Key::existing(name);
+    if (!known.isNull())
+        name = known.string();
+    if (_count * 2 >= _entries.size()) {
+        std::vector<Entry> old(_entries.size() * 2);
+        old.swap(_entries);
+        for (Entry& entry : old)
+            if (entry.local != nullptr)
+                freeEntry(entry.local, entry.prefix).name = std::move(entry.name);
+    }
+    Entry& entry = freeEntry(local, prefix);
+    entry.name = std::move(name);
+    ++_count;
+    return entry.name;
+}
+
+XMLNames::Entry& XMLNames::freeEntry(Name local, Name prefix) noexcept {
+    std::size_t at = slot(local, prefix);
+    while (_entries[at].local != nullptr)
+        at = (at + 1) & (_entries.size() - 1);
+    _entries[at].local = local;
+    _entries[at].prefix = prefix;
+    return _entries[at];
+}
+
+} // namespace qx

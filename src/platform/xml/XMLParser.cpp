@@ -1,0 +1,28 @@
+#include "platform/xml/XMLParser.h"
+
+#include "platform/xml/SAXSession.h"
+#include "platform/xml/XMLInput.h"
+
+namespace qx {
+
+Ref<XMLDocument> XMLParser::parse(std::string_view bytes, const XMLParseOptions& options,
+                                  Ref<Error>* error) {
+    XMLInput input;
+    try {
+        input.read(bytes);
+        auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+        SAXSession(input.text(), *document, options).run();
+        document->setCharacterEncoding(input.declaredEncoding());
+        return document;
+    } catch (const ParseFailure& failure) {
+        if (error == nullptr)
+            return nullptr;
+        TextPosition place(input.text());
+        place.moveTo(failure.offset);
+        *error = make<Error>(Error::parserDomain, failure.code, failure.message, failure.reason,
+                             place.line(), place.column());
+        return nullptr;
+    }
+}
+
+} // namespace qx

@@ -1,0 +1,145 @@
+#include "platform/xml/XMLTreeBuilder.h"
+
+#include "platform/xml/ParseFailure.h"
+#include "platform/xml/Siblings.h"
+
+#include <algorithm>
+#include <libxml/xmlerror.h>
+
+namespace qx {
+
+namespace {
+
+// For a prefix the parser goes through the declarations in force, one by one.
+constexpr std::size_t maximumNamespaces = 1000;
+
+std::uint32_t saturated(std::size_t number) {
+    return static_cast<std::uint32_t>(std::min<std::size_t>(number, UINT32_MAX));
+}
+
+} // namespace
+
+void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::size_t column) {
+    finishText();
+    if (_open.size() >= _options.maximumDepth)
+        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
+                           "Elements nest deeper than the limit of " +
+                               std::to_string(_options.maximumDepth),
+                           ParseFailure::beyondLimit};
+    requireSize(name.size(), "A name");
+    const bool preserves = !_open.empty() && _open.back().preservesSpace;
+    const std::size_t namespaces = _open.empty() ? 0 : _open.back().namespaces;
+    auto* element = new XMLElement(name);
+    element->_line = saturated(line);
+    element->_column = saturated(column);
+    if (_open.empty())
+        XMLSiblings::append(_document, _document._firstChild, _document._lastChild, element);
+    else
+        appendChild(*_open.back().element, element);
+    _open.push_back({element, _layouts.size(), namespaces, false, preserves});
+}
+
+void XMLTreeBuilder::addNamespace(const String& prefix, const String& URI) {
+    if (++_open.back().namespaces > maximumNamespaces)
+        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
+                           "More namespace declarations are in force than the limit of " +
+                               std::to_string(maximumNamespaces),
+                           ParseFailure::beyondLimit};
+    XMLElement& element = *_open.back().element;
+    XMLSiblings::append(element, element._firstNamespace, element._lastNamespace,
+                        new XMLNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
+}
+
+void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
+    requireSize(name.size(), "A name");
+    requireSize(value.size(), "An attribute's value");
+    XMLElement& element = *_open.back().element;
+    XMLSiblings::append(element, element._firstAttribute, element._lastAttribute,
+                        new XMLNode(XMLNodeKind::attribute, name, String(value)));
+}
+
+void XMLTreeBuilder::endElement() {
+    finishText();
+    dropLayout(_open.back());
+    _open.pop_back();
+}
+
+void XMLTreeBuilder::addText(std::string_view piece, bool isLayout) {
+    requireSize(_text.size() + piece.size(), "A text");
+    _textIsLayout = isLayout && (_text.empty() || _textIsLayout);
+    _text += piece;
+}
+
+void XMLTreeBuilder::addComment(std::string_view text) {
+    finishText();
+    requireSize(text.size(), "A comment");
+    appendToCurrent(XMLNode::initCommentWithStringValue(text));
+}
+
+void XMLTreeBuilder::addProcessingInstruction(const String& target, std::string_view data) {
+    finishText();
+    requireSize(data.size(), "A processing instruction");
+    appendToCurrent(XMLNode::initProcessingInstructionWithName(target, data));
+}
+
+void XMLTreeBuilder::finishText() {
+    if (_text.empty() || _open.empty())
+        return;
+    OpenElement& open = _open.back();
+    const bool isLayout = _textIsLayout && _text.find('\n') != std::string::npos;
+    if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
+        _layouts.push_back({open.element->_lastChild, _layoutText.size(), _text.size()});
+        _layoutText += _text;
+    } else {
+        if (!isLayout)
+            restoreLayout(open);
+        auto* text = new XMLNode(XMLNodeKind::text, String(), String(_text));
+        text->_isLayout = isLayout;
+        appendChild(*open.element, text);
+    }
+    _text.clear();
+}
+
+// Other text has come: what was put aside before it stands beside text.
+void XMLTreeBuilder::restoreLayout(OpenElement& open) {
+    open.hasText = true;
+    for (std::size_t i = open.firstLayout; i < _layouts.size(); ++i) {
+        const Layout& layout = _layouts[i];
+        const std::string_view text(_layoutText.data() + layout.start, layout.size);
+        auto* node = new XMLNode(XMLNodeKind::text, String(), String(text));
+        node->_isLayout = true;
+        XMLElement& element = *open.element;
+        appendChild(element, node,
+                    layout.after != nullptr ? layout.after->_next : element._firstChild);
+    }
+    dropLayout(open);
+}
+
+void XMLTreeBuilder::dropLayout(const OpenElement& open) noexcept {
+    if (_layouts.size() == open.firstLayout)
+        return;
+    _layoutText.resize(_layouts[open.firstLayout].start);
+    _layouts.resize(open.firstLayout, {});
+}
+
+void XMLTreeBuilder::appendChild(XMLElement& parent, XMLNode* child, XMLNode* before) noexcept {
+    XMLSiblings::insert(parent, parent._firstChild, parent._lastChild, child, before);
+    ++parent._childCount;
+}
+
+void XMLTreeBuilder::appendToCurrent(Ref<XMLNode> node) {
+    if (_open.empty())
+        XMLSiblings::append(_document, _document._firstChild, _document._lastChild, node.detach());
+    else
+        appendChild(*_open.back().element, node.detach());
+}
+
+void XMLTreeBuilder::requireSize(std::size_t size, const char* what) const {
+    if (size > _options.maximumTextSize)
+        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
+                           std::string(what) + " is larger than the limit of " +
+                               std::to_string(_options.maximumTextSize) + " bytes",
+                           ParseFailure::beyondLimit};
+}
+
+} // namespace qx

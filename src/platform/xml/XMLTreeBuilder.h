@@ -1,0 +1,61 @@
+#pragma once
+
+// Puts a document together from what the parser reports, in document order. It joins the pieces
+// that the parser cuts a text into, drops layout, and counts depth and sizes: beyond a limit it
+// throws ParseFailure. The document under construction owns every node from the moment it is made.
+
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include <string>
+#include <vector>
+
+namespace qx {
+
+class XMLTreeBuilder {
+public:
+    XMLTreeBuilder(XMLDocument& document, const XMLParseOptions& options)
+        : _document(document), _options(options) {}
+
+    void startElement(const String& name, std::size_t line, std::size_t column);
+    // Of the element that was started last, before anything inside it.
+    void addNamespace(const String& prefix, const String& URI);
+    void addAttribute(const String& name, std::string_view value);
+    void setPreservesSpace(bool preserves) { _open.back().preservesSpace = preserves; }
+    void endElement();
+    // A piece of text; `isLayout` when it is white space that stands in the document as such.
+    void addText(std::string_view piece, bool isLayout);
+    void addComment(std::string_view text);
+    void addProcessingInstruction(const String& target, std::string_view data);
+
+private:
+    struct OpenElement {
+        XMLElement* element;
+        std::size_t firstLayout; // of its own, in _layouts
+        std::size_t namespaces;  // how many declarations are in force
+        bool hasText;
+        bool preservesSpace;
+    };
+    // A text of white space put aside until another text shows that it matters.
+    struct Layout {
+        XMLNode* after; // the node that it follows; null for the first
+        std::size_t start;
+        std::size_t size;
+    };
+
+    void finishText();
+    void appendChild(XMLElement& parent, XMLNode* child, XMLNode* before = nullptr) noexcept;
+    void appendToCurrent(Ref<XMLNode> node);
+    void restoreLayout(OpenElement& open);
+    void dropLayout(const OpenElement& open) noexcept;
+    void requireSize(std::size_t size, const char* what) const;
+
+    XMLDocument& _document;
+    const XMLParseOptions _options;
+    std::vector<OpenElement> _open;
+    std::string _text; // of the current text, so far
+    bool _textIsLayout = false;
+    std::vector<Layout> _layouts;
+    std::string _layoutText;
+};
+
+} // namespace qx
