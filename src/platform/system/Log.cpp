@@ -75,6 +75,7 @@ void sendWarning(const String& message) { logWarningOrLine("%@", message); }
 
 // Warnings about class descriptions come here as soon as the library is loaded.
 [[maybe_unused]] const bool sinkInstalled = (installWarningSink(&sendWarning), true);
+[[maybe_unused]] const bool finderInstalled = (installDebugSinkFinder(&hostLogDebug), true);
 
 } // namespace
 

@@ -1,0 +1,52 @@
+#pragma once
+
+// A base class for a host's own classes: given an undo manager, every change of a described
+// property through setValueForKey, and every change announced by a ChangeScope, can be undone.
+//
+//     class Person : public qx::UndoableObject {
+//     public:
+//         void rename(const qx::String& name) {
+//             const qx::ChangeScope scope(*this, "name");
+//             _name = name;
+//         }
+//         …
+//     };
+//     qx::Class::define<Person, qx::UndoableObject>("Person").property<&Person::_name>("name");
+//
+// Keys are kept out of undo as ChangeTracking.h says. An undo manager keeps old values alive, and
+// these may hold the object that holds the manager: call removeAllActions when an editor closes.
+
+#include <QXXMLMarshalling/platform/ChangeTracking.h>
+
+namespace qx {
+
+class QX_API UndoableObject : public Object {
+public:
+    UndoableObject();
+    // Removes the undo actions that target the object.
+    ~UndoableObject() override;
+    static const Class& classObject();
+
+    Ref<UndoManager> undoManager() const { return _tracking.undoManager(); }
+    void setUndoManager(Ref<UndoManager> undoManager) {
+        _tracking.setUndoManager(std::move(undoManager));
+    }
+    Ref<Dictionary> changeCache() const { return _tracking.changeCache(); }
+    bool isUndoRegistrationEnabledForKey(Key key) const {
+        return _tracking.isUndoRegistrationEnabledForKey(key);
+    }
+
+    void willChangeValueForKey(Key key) override;
+    void didChangeValueForKey(Key key) override;
+    void willChange(ChangeKind kind, std::span<const std::size_t> indexes, Key key) override;
+
+protected:
+    const Class& describedClass() const override;
+
+private:
+    void restoreValue(const Value& value, const String& key);
+
+    ChangeTracking _tracking;
+};
+
+} // namespace qx

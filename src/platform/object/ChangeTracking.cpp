@@ -1,0 +1,99 @@
+#include <QXXMLMarshalling/platform/ChangeTracking.h>
+
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/CountedSet.h>
+#include <QXXMLMarshalling/platform/Null.h>
+
+#include "platform/object/Warning.h"
+
+namespace qx {
+
+namespace {
+
+Value nullForMarker(Value value) { return value.isNullOrMarker() ? Value() : value; }
+
+bool holds(const Value& names, Key key) {
+    if (const auto set = names.as<CountedSet>())
+        return set->contains(key.string());
+    const auto array = names.as<Array>();
+    return array && array->contains(key.string());
+}
+
+} // namespace
+
+Ref<Dictionary> ChangeTracking::changeCache() const {
+    if (!_cache)
+        _cache = make<Dictionary>();
+    return _cache;
+}
+
+void ChangeTracking::willChangeValueForKey(Key key) {
+    Value current = _owner.valueForKey(key);
+    const bool isNull = current.isNullOrMarker();
+    // No entry reads as null, so most objects of a document that is only read need no cache. Keys
+    // with a "@" are the dictionary's own properties: they have a value in an empty cache too.
+    const bool isPlain = !key.view().starts_with('@');
+    if (isNull && isPlain && !_undoManager && (!_cache || !_cache->contains(key.string())))
+        return;
+    const Ref<Dictionary> cache = changeCache();
+    if (isNull)
+        current = Value(Null::marker());
+    const Value cached = cache->valueForKey(key);
+    if (cached.isNull() || !(cached.isSameAs(current) || cached.isEqual(current)))
+        cache->set(key.string(), std::move(current));
+}
+
+void ChangeTracking::didChangeValueForKey(Key key) {
+    if (!_undoManager || !_undoManager->isUndoRegistrationEnabled() ||
+        !isUndoRegistrationEnabledForKey(key))
+        return;
+    static const Selector restore("_setValue:forKey:");
+    const Ref<UndoManager> manager = _undoManager;
+    const Value before = nullForMarker(_cache ? _cache->get(key.string()) : Value());
+    const Value now = nullForMarker(_owner.valueForKey(key));
+    if (now.isSameAs(before) || (!now.isNull() && now.isEqual(before)))
+        return;
+    if (const DebugSink log = debugSink()) {
+        const std::array<Value, 3> arguments{key.string(), before, now};
+        log(manager->isUndoing()   ? "Undo for key: %@ existing: %@ value: %@"
+            : manager->isRedoing() ? "Redo for key: %@ existing: %@ value: %@"
+                                   : "Set for key: %@ existing: %@ value: %@",
+            arguments);
+    }
+    manager->prepareWithInvocationTarget(&_owner).perform(restore, before, key.string());
+    willChangeValueForKey(key); // the cache holds the new value now
+}
+
+bool ChangeTracking::isUndoRegistrationEnabledForKey(Key key) const {
+    static const Selector disabledKeyPaths("disabledKeyPathsForUndoRegistration");
+    if (key.view().empty())
+        return true;
+    const Class& type = _owner.isa();
+    if (type.classOperation(disabledKeyPaths) != nullptr &&
+        holds(type.perform(disabledKeyPaths), key))
+        return false;
+    const String name =
+        String::concat({"isUndoRegistrationEnabledFor", key.string().capitalized()});
+    // A name that was never used is no operation of anybody.
+    if (Key::existing(name).isNull())
+        return true;
+    const Selector hook(name.view());
+    if (_owner.respondsTo(hook))
+        return _owner.perform(hook).boolValue();
+    if (type.classOperation(hook) == nullptr)
+        return true;
+    type.perform(hook);
+    return false;
+}
+
+void ChangeTracking::restoreValue(const Value& value, Key key) {
+    if (const DebugSink log = debugSink()) {
+        const std::array<Value, 4> arguments{
+            _owner.isa().name(), reinterpret_cast<std::uintptr_t>(&_owner), key.string(), value};
+        log("<%@:0x%08lx: _setValue:forKey: %@, %@", arguments);
+    }
+    _owner.setValueForKey(value, key);
+}
+
+} // namespace qx
