@@ -72,6 +72,10 @@ public:
     Ref<Array> allValues() const;
     // A new dictionary with the same keys and the very same values.
     Ref<Dictionary> mutableCopy() const;
+    // How a dictionary is copied with the values inside it: null until the host installs a way.
+    using DeepCopyFunction = Ref<Dictionary> (*)(const Dictionary&);
+    static DeepCopyFunction deepCopyFunction() noexcept;
+    static void setDeepCopyFunction(DeepCopyFunction function) noexcept;
 
     String description() const override;
     // "{", one "key = value;" a line, "}".

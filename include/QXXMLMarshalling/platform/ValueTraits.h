@@ -14,6 +14,7 @@
 //   floating point      numbers; a text that is a number
 //   std::string         text; numbers as their text
 //   qx::String          the same, and null
+//   qx::Key             text
 //   enums               as their underlying integer
 //   std::optional<T>    null for none, else as T
 //   Ref<T>, T*          null and objects of class T; a T* is not kept alive
@@ -123,6 +124,17 @@ struct ValueTraits<String> {
             return true;
         }
         return readText(value, result);
+    }
+};
+
+template <>
+struct ValueTraits<Key> {
+    static Value toValue(Key value) { return value.string(); }
+    static bool fromValue(const Value& value, Key& result) {
+        if (!value.isString())
+            return false;
+        result = value.string();
+        return true;
     }
 };
 

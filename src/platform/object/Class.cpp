@@ -55,6 +55,7 @@ struct ClassRegistry {
         const auto found = byName.find(name);
         if (found == byName.end())
             return false;
+        retired.push_back(found->second);
         byType.erase(*found->second->_type);
         byName.erase(found);
         return true;
@@ -63,6 +64,7 @@ struct ClassRegistry {
     std::shared_mutex mutex;
     std::unordered_map<Key, const Class*> byName;
     std::unordered_map<std::type_index, const Class*> byType;
+    std::vector<const Class*> retired; // forgotten, but perhaps still pointed to
 };
 
 namespace {

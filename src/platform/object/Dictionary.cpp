@@ -11,6 +11,13 @@
 
 namespace qx {
 
+namespace {
+
+// Room for the first few keys at once: most records hold no more.
+constexpr std::size_t usualSize = 4;
+
+} // namespace
+
 Dictionary::~Dictionary() = default;
 
 void Dictionary::checkUnchanged(std::size_t changes) const {
@@ -48,6 +55,8 @@ void Dictionary::set(const String& key, Value value) {
     }
     if (nameindex::isFull(_index, _entries.size()))
         makeRoom();
+    if (_entries.capacity() == 0)
+        _entries.reserve(usualSize);
     _entries.push_back({key, std::move(value)});
     if (!_index.empty())
         nameindex::add(_index, key, _entries.size() - 1);
@@ -102,6 +111,20 @@ Ref<Dictionary> Dictionary::mutableCopy() const {
     for (const Entry& entry : *this)
         copy->set(entry.key, entry.value);
     return copy;
+}
+
+namespace {
+
+std::atomic<Dictionary::DeepCopyFunction> installedDeepCopy{nullptr};
+
+} // namespace
+
+Dictionary::DeepCopyFunction Dictionary::deepCopyFunction() noexcept {
+    return installedDeepCopy.load();
+}
+
+void Dictionary::setDeepCopyFunction(DeepCopyFunction function) noexcept {
+    installedDeepCopy.store(function);
 }
 
 String Dictionary::description() const { return descriptionWithLocale(nullptr, 0); }

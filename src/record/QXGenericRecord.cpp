@@ -1,0 +1,193 @@
+#include <QXXMLMarshalling/QXGenericRecord.h>
+
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/UserDefaults.h>
+
+using qx::Dictionary;
+using qx::Key;
+using qx::Object;
+using qx::Ref;
+using qx::String;
+using qx::Value;
+
+const char* const AllowMethodForwardingInGenericRecords = "AllowMethodForwardingInGenericRecords";
+
+QXGenericRecord::QXGenericRecord() : _tracking(*this) {}
+
+QXGenericRecord::~QXGenericRecord() {
+    if (const auto manager = undoManager())
+        manager->removeAllActionsWithTarget(this);
+}
+
+namespace {
+
+const qx::Class& describe() {
+    using Record = QXGenericRecord;
+    using namespace qx::describe;
+    qx::UserDefaults::standardUserDefaults()->registerDefault(
+        "NO", AllowMethodForwardingInGenericRecords);
+    return qx::Class::publish(
+        {.name = "QXGenericRecord",
+         .type = &typeid(Record),
+         .superclass = &typeid(Object),
+         .create = []() -> Ref<Object> { return qx::make<Record>(); },
+         .properties =
+             {accessorProperty<Record, &Record::notifyBindingsObservers,
+                               &Record::setNotifyBindingsObservers>("notifyBindingsObservers"),
+              accessorProperty<Record, &Record::undoManager, &Record::setUndoManager>(
+                  "undoManager"),
+              accessorProperty<Record, &Record::changeCache, &Record::setChangeCache>(
+                  "changeCache"),
+              accessorProperty<Record, &Record::className, &Record::setClassName>("className"),
+              accessorProperty<Record, &Record::contents, &Record::setContents>("contents")},
+         .operations =
+             {instanceOperation<Record, &Record::setClassNameForMarshalling>(
+                  "setClassNameForMarshalling:"),
+              instanceOperation<Record, &Record::setNotifyBindingsObservers>(
+                  "setNotifyBindingsObservers:"),
+              instanceOperation<Record, &Record::isRemovable>("isRemovable"),
+              instanceOperation<Record, &Record::setUndoManager>("setUndoManager:"),
+              instanceOperation<Record, &Record::classNameForMarshalling>(
+                  "classNameForMarshalling"),
+              instanceOperation<Record, &Record::notifyBindingsObservers>(
+                  "notifyBindingsObservers"),
+              instanceOperation<Record, &Record::undoManager>("undoManager"),
+              instanceOperation<Record, &Record::changeCache>("changeCache"),
+              instanceOperation<Record, &Record::setChangeCache>("setChangeCache:"),
+              instanceOperation<Record, &Record::className>("className"),
+              instanceOperation<Record, &Record::setClassName>("setClassName:"),
+              instanceOperation<Record, &Record::contents>("contents"),
+              instanceOperation<Record, &Record::setContents>("setContents:"),
+              instanceOperation<Record, &Record::description>("description"),
+              instanceOperation<Record, &Record::isUndoRegistrationEnabledForKey>(
+                  "isUndoRegistrationEnabledForKey:"),
+              instanceOperation<Record, &Record::_setValue>("_setValue:forKey:")},
+         .classOperations = {
+             classOperation<&Record::allKnownKeyPaths>("allKnownKeyPaths"),
+             classOperation<&Record::automaticallyNotifiesObserversForKey>(
+                 "automaticallyNotifiesObserversForKey:")}});
+}
+
+// Described when the library is loaded, so that a mapping finds the class by its name.
+[[maybe_unused]] const qx::Class& described = QXGenericRecord::classObject();
+
+} // namespace
+
+const qx::Class& QXGenericRecord::classObject() {
+    static const qx::Class& type = describe();
+    return type;
+}
+
+const qx::Class& QXGenericRecord::describedClass() const {
+    return classObject();
+}
+
+Ref<QXGenericRecord> QXGenericRecord::copyWithZone() const {
+    auto copy = isa().create().as<QXGenericRecord>();
+    if (!copy)
+        copy = qx::make<QXGenericRecord>();
+    copy->setClassName(_className);
+    if (_contents) {
+        auto deep = Dictionary::deepCopyFunction();
+        copy->setContents(deep != nullptr ? deep(*_contents) : _contents->mutableCopy());
+    }
+    copy->setNotifyBindingsObservers(_notifyBindingsObservers);
+    return copy;
+}
+
+std::vector<String> QXGenericRecord::keys() const {
+    std::vector<String> keys;
+    if (_contents) {
+        keys.reserve(_contents->count());
+        for (const auto& entry : *_contents)
+            keys.push_back(entry.key);
+    }
+    return keys;
+}
+
+Value QXGenericRecord::valueForUndefinedKey(Key key) const {
+    return _contents ? _contents->get(key.string()) : Value();
+}
+
+void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
+    if (!_contents)
+        _contents = qx::make<Dictionary>();
+    willChangeValueForKey(key);
+    if (value.isNull())
+        _contents->remove(key.string());
+    else
+        _contents->set(key.string(), value);
+    didChangeValueForKey(key);
+}
+
+void QXGenericRecord::_setValue(const Value& value, Key key) {
+    _tracking.restoreValue(value, key);
+}
+
+String QXGenericRecord::classNameForMarshalling() const {
+    return _className.isNull() ? Object::classNameForMarshalling() : _className;
+}
+
+Ref<qx::UndoManager> QXGenericRecord::undoManager() const {
+    return _tracking.undoManager();
+}
+
+void QXGenericRecord::setUndoManager(Ref<qx::UndoManager> manager) {
+    _tracking.setUndoManager(std::move(manager));
+}
+
+Ref<Dictionary> QXGenericRecord::changeCache() const {
+    return _tracking.changeCache();
+}
+
+void QXGenericRecord::setChangeCache(Ref<Dictionary> cache) {
+    _tracking.setChangeCache(std::move(cache));
+}
+
+void QXGenericRecord::willChangeValueForKey(Key key) {
+    _tracking.willChangeValueForKey(key);
+    Object::willChangeValueForKey(key);
+}
+
+void QXGenericRecord::didChangeValueForKey(Key key) {
+    _tracking.didChangeValueForKey(key);
+    Object::didChangeValueForKey(key);
+}
+
+void QXGenericRecord::willChange(qx::ChangeKind kind, std::span<const std::size_t> indexes,
+                                 Key key) {
+    _tracking.willChangeValueForKey(key);
+    Object::willChange(kind, indexes, key);
+}
+
+bool QXGenericRecord::isUndoRegistrationEnabledForKey(Key key) {
+    return _tracking.isUndoRegistrationEnabledForKey(key);
+}
+
+String QXGenericRecord::description() const {
+    return descriptionWithLocale(nullptr, 0);
+}
+
+String QXGenericRecord::descriptionWithLocale(const Object* locale, std::size_t indent) const {
+    std::string text = Object::description().str();
+    if (!_className.isEmpty() && _className != isa().name()) {
+        text += " className: ";
+        text += _className.view();
+    }
+    if (_contents && !_contents->isEmpty()) {
+        text += " contents:\n";
+        text += _contents->descriptionWithLocale(locale, indent).view();
+    }
+    return text;
+}
+
+Ref<qx::CountedSet> QXGenericRecord::allKnownKeyPaths() {
+    return qx::make<qx::CountedSet>();
+}
+
+bool QXGenericRecord::automaticallyNotifiesObserversForKey(const qx::Class& receiver,
+                                                           const String& key) {
+    const auto own = receiver.perform("allKnownKeyPaths").as<qx::CountedSet>();
+    return !own || !own->contains(key);
+}

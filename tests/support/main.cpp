@@ -1,0 +1,32 @@
+// Runs the tests, and after each one checks that it has left no live object behind.
+
+#include <QXXMLMarshalling/platform/Object.h>
+
+#include <gtest/gtest.h>
+
+// Objects that are made once and kept: a test program that uses such makes them here, so that they
+// count against no test.
+extern "C" __attribute__((weak)) void makeLastingObjects();
+
+namespace {
+
+class LeakCheck : public testing::EmptyTestEventListener {
+    void OnTestStart(const testing::TestInfo&) override { _before = qx::Object::liveCount(); }
+    void OnTestEnd(const testing::TestInfo& test) override {
+        const std::int64_t left = qx::Object::liveCount() - _before;
+        if (left > 0 && !test.result()->Failed())
+            ADD_FAILURE() << left << " objects are still alive after the test";
+    }
+
+    std::int64_t _before = 0;
+};
+
+} // namespace
+
+int main(int argc, char** argv) {
+    testing::InitGoogleTest(&argc, argv);
+    if (makeLastingObjects != nullptr)
+        makeLastingObjects();
+    testing::UnitTest::GetInstance()->listeners().Append(new LeakCheck);
+    return RUN_ALL_TESTS();
+}
