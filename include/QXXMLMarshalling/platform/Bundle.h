@@ -28,6 +28,9 @@ public:
     static Ref<Bundle> bundleWithPath(const String& path);
     // Among the bundles opened so far, the main and the framework bundle with them; else null.
     static Ref<Bundle> bundleWithIdentifier(const String& identifier);
+    // Takes the bundle from those opened: bundleWithPath reads it anew. For a plug-in that goes
+    // away.
+    static void forget(const Ref<Bundle>& bundle);
     ~Bundle() override;
 
     const String& bundlePath() const noexcept { return _path; }
@@ -36,8 +39,8 @@ public:
     // What Info.plist holds, empty without a readable one. Set what it should hold besides before
     // other threads use the bundle.
     const Ref<Dictionary>& infoDictionary() const noexcept { return _info; }
-    // An entry of the info dictionary, null without one. The versions of the main bundle are those of
-    // ProcessInfo::setProcessVersion where the host has set them.
+    // An entry of the info dictionary, null without one. The versions of the main bundle are those
+    // of ProcessInfo::setProcessVersion where the host has set them.
     Value objectForInfoDictionaryKey(const String& key) const;
     // The path of a file or folder in the bundle, which may lie in a folder of it ("maps/a.xml");
     // null when there is none or the name leads out of the bundle. A type is added behind a dot.

@@ -165,6 +165,12 @@ Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
     return bundle ? bundle : mainBundle();
 }
 
+void Bundle::forget(const Ref<Bundle>& bundle) {
+    OpenBundles& open = OpenBundles::shared();
+    const std::lock_guard lock(open.mutex);
+    std::erase(open.bundles, bundle);
+}
+
 Ref<Bundle> Bundle::bundleWithIdentifier(const String& identifier) {
     if (identifier.isNull())
         return nullptr;

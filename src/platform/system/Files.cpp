@@ -268,7 +268,7 @@ bool createDirectoryWithParents(const String& path, Ref<Error>* error) {
         if (::mkdir(directory.c_str(), 0777) == 0)
             continue;
         // A directory that is there may answer EROFS or EACCES rather than EEXIST.
-        const int errorNumber = errno;
+        const int errorNumber = errno == EEXIST ? ENOTDIR : errno;
         if (!isDirectory(directory))
             return failWriting(error, directory, errorNumber);
     }

@@ -1,0 +1,119 @@
+#include <QXXMLMarshalling/platform/UserDefaults.h>
+
+#include "platform/system/Directories.h"
+
+#include "support/FileSandbox.h"
+
+#include <gtest/gtest.h>
+
+using namespace qx;
+
+namespace {
+
+class UserDefaultsTest : public ::testing::Test {
+protected:
+    ~UserDefaultsTest() override {
+        defaults->setArguments({});
+        defaults->removeObjectForKey("Key");
+    }
+
+    FileSandbox sandbox;
+    Ref<UserDefaults> defaults = UserDefaults::standardUserDefaults();
+};
+
+std::string listWith(const std::string& value) {
+    return "<plist><dict><key>Key</key>" + value + "</dict></plist>";
+}
+
+} // namespace
+
+TEST_F(UserDefaultsTest, TheFirstOfFourSourcesGivesTheValue) {
+    const char* const arguments[]{"-Key", "argument"};
+    EXPECT_TRUE(defaults->objectForKey("Key").isNull());
+    defaults->registerDefault("registered", "Key");
+    EXPECT_EQ(defaults->stringForKey("Key"), "registered");
+    sandbox.write("config/Client.plist", listWith("<string>file</string>"));
+    defaults->synchronize();
+    EXPECT_EQ(defaults->stringForKey("Key"), "file");
+    defaults->setObject("set", "Key");
+    EXPECT_EQ(defaults->stringForKey("Key"), "set");
+    defaults->setArguments(arguments);
+    EXPECT_EQ(defaults->stringForKey("Key"), "argument");
+
+    defaults->setArguments({});
+    defaults->setObject(nullptr, "Key");
+    EXPECT_EQ(defaults->stringForKey("Key"), "file");
+    ProcessInfo::setProcessName("Other"); // whose file is not there
+    EXPECT_EQ(defaults->stringForKey("Key"), "registered");
+}
+
+TEST_F(UserDefaultsTest, ArgumentsArePairsOfAKeyAndAValue) {
+    const struct {
+        std::vector<const char*> arguments;
+        Value key;
+        Value other;
+    } rows[]{{{"-Key", "v", "-Other", "w"}, "v", "w"},
+             {{"file", "-Key", "-5", "-Other"}, "-5", nullptr},
+             {{"-Key", "-Other", "w"}, nullptr, "w"},
+             {{"--Key", "v", "-Other", "w"}, nullptr, "w"},
+             {{"-Other", "w", "--", "-Key", "v"}, nullptr, "w"},
+             {{"-", "Key", "-Key", ""}, "", nullptr},
+             {{"-Key", "v", "-Key", "last"}, "last", nullptr}};
+    for (const auto& row : rows) {
+        defaults->registerDefault("registered", "Key");
+        defaults->setArguments(row.arguments);
+        const Value expected = row.key.isNull() ? Value("registered") : row.key;
+        EXPECT_EQ(defaults->objectForKey("Key"), expected);
+        EXPECT_EQ(defaults->objectForKey("Other"), row.other);
+    }
+}
+
+TEST_F(UserDefaultsTest, BooleansAndNumbersAreReadFromListsAndTexts) {
+    const struct {
+        const char* value;
+        bool boolean;
+        std::int64_t integer;
+    } rows[]{{"<string>NO</string>", false, 0},
+             {"<string>YES</string>", true, 0},
+             {"<true/>", true, 1},
+             {"<false/>", false, 0},
+             {"<integer> -12 </integer>", true, -12},
+             {"<real>2.5</real>", true, 2},
+             {"<string>7</string>", true, 7}};
+    for (const auto& row : rows) {
+        sandbox.write("config/Client.plist", listWith(row.value));
+        defaults->synchronize();
+        EXPECT_EQ(defaults->boolForKey("Key"), row.boolean) << row.value;
+        EXPECT_EQ(defaults->integerForKey("Key"), row.integer) << row.value;
+    }
+}
+
+TEST_F(UserDefaultsTest, ABrokenFileIsWarnedAboutOnceAndHoldsNothing) {
+    for (const char* text :
+         {"<plist><dict>", "", "<plist><string>x</string></plist>", "<plist/>"}) {
+        const std::string path = sandbox.write("config/Client.plist", text);
+        defaults->synchronize();
+        ::testing::internal::CaptureStderr();
+        EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
+        EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
+        const std::string warning = ::testing::internal::GetCapturedStderr();
+        EXPECT_NE(warning.find(path), std::string::npos) << text;
+        EXPECT_EQ(std::count(warning.begin(), warning.end(), '\n'), 1) << warning;
+    }
+}
+
+TEST(DirectoriesTest, TheUsersDirectoryIsTheFirstAbsoluteOneOfThree) {
+    FileSandbox sandbox;
+    const auto support = [] { return searchPathForApplicationSupport().at(0); };
+    EXPECT_EQ(support(), std::string_view(sandbox.path("data")));
+    EXPECT_EQ(configurationDirectory(), std::string_view(sandbox.path("config")));
+    sandbox.setVariable("XDG_DATA_HOME", "relative");
+    sandbox.setVariable("XDG_CONFIG_HOME", "");
+    EXPECT_EQ(support(), std::string_view(sandbox.path("home/.local/share")));
+    EXPECT_EQ(configurationDirectory(), std::string_view(sandbox.path("home/.config")));
+    // A service may have neither; the account has a home.
+    sandbox.setVariable("XDG_DATA_HOME", std::nullopt);
+    sandbox.setVariable("HOME", std::nullopt);
+    EXPECT_TRUE(support().view().ends_with("/.local/share")) << support().view();
+    EXPECT_TRUE(support().view().starts_with('/'));
+}

@@ -1,0 +1,244 @@
+#include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
+
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include "support/FileSandbox.h"
+
+#include <gtest/gtest.h>
+
+using namespace qx;
+
+namespace {
+
+// A client of version 2.1.57 in a world of its own.
+class FileSystemRepositoryTest : public ::testing::Test {
+protected:
+    FileSystemRepositoryTest()
+        : main(sandbox.bundle("app",
+                              {{"CFBundleShortVersionString", "2.1"}, {"CFBundleVersion", "57"}})) {
+        Bundle::setMainBundle(main);
+    }
+    ~FileSystemRepositoryTest() override {
+        UserDefaults::standardUserDefaults()->removeObjectForKey(
+            QXXMLFileSystemDataRepository::clientBundleIdentifierKey);
+        QXXMLFileSystemDataRepository::setRepositoryCreateFunction(nullptr);
+    }
+
+    static Ref<Data> data(std::string_view text) { return make<Data>(text); }
+    std::string pathsOf(QXXMLFileSystemDataRepository& repository) const {
+        std::string text;
+        for (const Value& path : *repository.searchPaths())
+            text += path.string().view().substr(sandbox.root().size()).data() + std::string(" ");
+        return text;
+    }
+
+    FileSandbox sandbox;
+    Ref<Bundle> main;
+    Ref<Error> error;
+};
+
+// Looks in a folder of its own before any other.
+class SiteRepository : public QXXMLFileSystemDataRepository {
+public:
+    void addPathToSearchPaths(const String& directory, const String& processName) override {
+        QXXMLFileSystemDataRepository::addPathToSearchPaths(directory, processName);
+        searchPaths()->insert(0, "/srv/site");
+    }
+    String applicationVersion() override { return "9"; }
+};
+
+} // namespace
+
+extern "C" void makeLastingObjects();
+extern "C" void makeLastingObjects() { FileSandbox::makeLastingObjects(); }
+
+TEST_F(FileSystemRepositoryTest, ANameIsLookedForFromTheVersionedFolderToTheLibrarysBundle) {
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    EXPECT_EQ(pathsOf(*repository), "/data/Client/2.1.57 /data/Client ");
+    EXPECT_EQ(repository->searchBundles()->at(0), Value(main));
+    EXPECT_EQ(repository->searchBundles()->at(1), Value(Bundle::frameworkBundle()));
+
+    EXPECT_TRUE(repository->pathForResourceNamed("de.lproj/Localizable.strings")
+                    .view()
+                    .starts_with(Bundle::frameworkBundle()->bundlePath()));
+    EXPECT_FALSE(repository->containsDocument("a.xml"));
+    // Each place shadows those behind it.
+    for (const char* place : {"app/a.xml", "data/Client/a.xml", "data/Client/2.1.57/a.xml"}) {
+        const std::string path = sandbox.write(place, "<" + std::string(1, place[0]) + "/>");
+        EXPECT_EQ(repository->pathForResourceNamed("a.xml"), std::string_view(path));
+    }
+    EXPECT_TRUE(repository->containsDocument("a.xml"));
+    EXPECT_TRUE(repository->containsData("a.xml"));
+}
+
+TEST_F(FileSystemRepositoryTest, VersionsAreCleanedBeforeTheyNameAFolder) {
+    const struct {
+        const char* version;
+        const char* build;
+        const char* expected;
+    } rows[]{{"2.1", "57", "2.1.57"}, {"1.0(23)", "", "1.0.23"}, {"1.0 (23)", "", "1.0"},
+             {"v1.0", "", ""},        {"3.0b2", "", "3.0"},      {"", "57", "57"},
+             {"beta", "57a", "57"},   {"1", "x", "1"},           {"", "", ""}};
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    for (const auto& row : rows) {
+        main->infoDictionary()->set("CFBundleShortVersionString", row.version);
+        main->infoDictionary()->set("CFBundleVersion", row.build);
+        EXPECT_EQ(repository->applicationVersion(), row.expected) << row.version;
+    }
+    EXPECT_EQ(pathsOf(*QXXMLFileSystemDataRepository::init()), "/data/Client /data/Client ");
+    main->infoDictionary()->set("CFBundleVersion", 12);
+    EXPECT_EQ(repository->applicationVersion(), "12");
+    main->infoDictionary()->removeAll();
+    EXPECT_EQ(repository->applicationVersion(), "");
+    ProcessInfo::setProcessVersion("4.0");
+    EXPECT_EQ(repository->applicationVersion(), "4.0");
+}
+
+TEST_F(FileSystemRepositoryTest, AFolderThatEndsInTheProcessNameDoesNotGetItTwice) {
+    sandbox.setVariable("XDG_DATA_HOME", sandbox.path("area/MyClient"));
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    EXPECT_EQ(pathsOf(*repository), "/area/MyClient/2.1.57 /area/MyClient ");
+    EXPECT_EQ(repository->userOverrideArea(), std::string_view(sandbox.path("area/MyClient")));
+}
+
+TEST_F(FileSystemRepositoryTest, TheClientsBundleIsTheOneThatTheUserDefaultNames) {
+    const auto client = sandbox.bundle(
+        "client", {{"CFBundleIdentifier", "org.example.Client"}, {"CFBundleVersion", "8"}});
+    const auto defaults = UserDefaults::standardUserDefaults();
+    defaults->setObject("org.example.Client",
+                        QXXMLFileSystemDataRepository::clientBundleIdentifierKey);
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    EXPECT_EQ(repository->applicationBundle(), client);
+    EXPECT_EQ(pathsOf(*repository), "/data/Client/8 /data/Client ");
+
+    defaults->setObject("org.example.None",
+                        QXXMLFileSystemDataRepository::clientBundleIdentifierKey);
+    ::testing::internal::CaptureStderr();
+    EXPECT_EQ(repository->applicationBundle(), main);
+    const std::string warning = ::testing::internal::GetCapturedStderr();
+    EXPECT_TRUE(std::string_view(warning).ends_with(
+        "] Unable to locate bundle with identifier: org.example.None\n"))
+        << warning;
+}
+
+TEST_F(FileSystemRepositoryTest, TheCreationHookAndASubclassChangeTheSearch) {
+    QXXMLFileSystemDataRepository::setRepositoryCreateFunction(
+        [](QXXMLFileSystemDataRepository& repository) {
+            repository.searchPaths()->add(repository.userOverrideArea());
+            repository.setSearchBundles(nullptr);
+        });
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    EXPECT_EQ(pathsOf(*repository), "/data/Client/2.1.57 /data/Client /data/Client ");
+    sandbox.write("app/a.xml", "<a/>");
+    EXPECT_FALSE(repository->containsDocument("a.xml"));
+
+    const auto site = QXXMLFileSystemDataRepository::init<SiteRepository>();
+    EXPECT_EQ(site->searchPaths()->at(0), Value("/srv/site"));
+    EXPECT_EQ(site->searchPaths()->at(1), Value(sandbox.path("data/Client/9")));
+}
+
+TEST_F(FileSystemRepositoryTest, DocumentsAndDataAreReadFromTheFileFound) {
+    sandbox.write("data/Client/maps/a.xml", "<a/>");
+    sandbox.write("data/Client/broken.xml", "<a>");
+    std::filesystem::create_directories(sandbox.path("data/Client/folder.xml"));
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    std::uint64_t size = 7;
+    const auto document = repository->documentNamed("maps/a.xml", &size, &error);
+    ASSERT_TRUE(document);
+    EXPECT_EQ(document->rootElement()->name(), "a");
+    EXPECT_EQ(size, 4U);
+    EXPECT_EQ(repository->dataForName("maps/a.xml", &error)->view(), "<a/>");
+
+    EXPECT_FALSE(repository->documentNamed("none.xml", &size, &error));
+    EXPECT_EQ(size, 0U);
+    EXPECT_FALSE(error); // a missing document is no failure
+
+    EXPECT_FALSE(repository->documentNamed("broken.xml", &size, &error));
+    EXPECT_EQ(size, 3U);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->domain(), Error::parserDomain);
+
+    EXPECT_TRUE(repository->containsDocument("folder.xml"));
+    EXPECT_FALSE(repository->documentNamed("folder.xml", &size, &error));
+    EXPECT_EQ(error->description().str(), "NSCocoaErrorDomain 256: The file cannot be read: " +
+                                              sandbox.path("data/Client/folder.xml") +
+                                              " (Is a directory)");
+}
+
+TEST_F(FileSystemRepositoryTest, ANameThatLeavesItsDirectoryFindsNothingAndIsNotWritten) {
+    const std::string outside = sandbox.write("data/outside.xml", "<out/>");
+    std::filesystem::create_directories(sandbox.path("data/Client"));
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    for (const std::string& name : {std::string(), std::string("../outside.xml"), outside,
+                                    std::string("."), std::string("x/../../outside.xml")}) {
+        error.reset();
+        EXPECT_FALSE(repository->containsDocument(name)) << name;
+        EXPECT_FALSE(repository->dataForName(name, &error)) << name;
+        EXPECT_FALSE(error);
+        EXPECT_TRUE(repository->writeFileToUserOverrideArea(data("new"), name, &error).isNull());
+        ASSERT_TRUE(error) << name;
+        EXPECT_EQ(error->code(), 514);
+        EXPECT_EQ(error->localizedDescription(), "The file name is invalid.");
+    }
+    EXPECT_FALSE(repository->containsDocument(nullptr));
+    EXPECT_EQ(sandbox.read("data/outside.xml"), "<out/>");
+    EXPECT_EQ(sandbox.list("data/Client"), "");
+}
+
+TEST_F(FileSystemRepositoryTest, WhatIsWrittenShadowsWhatShips) {
+    sandbox.write("app/a.xml", "ships");
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    const auto found = [&] { return std::string(repository->dataForName("a.xml")->view()); };
+    EXPECT_EQ(repository->writeFileToUserOverrideArea(data("plain"), "a.xml", &error),
+              std::string_view(sandbox.path("data/Client/a.xml")));
+    EXPECT_EQ(found(), "plain");
+    EXPECT_EQ(repository->writeFileToVersionedUserOverrideArea(data("versioned"), "a.xml", &error),
+              std::string_view(sandbox.path("data/Client/2.1.57/a.xml")));
+    EXPECT_EQ(found(), "versioned");
+    EXPECT_EQ(repository->writeFileToUserOverrideArea(data("deep"), "maps/b.xml", &error),
+              std::string_view(sandbox.path("data/Client/maps/b.xml")));
+
+    const auto document = XMLDocument::initWithData("<a><b></b><c/></a>");
+    EXPECT_FALSE(repository->writeDocumentToUserOverrideArea(document, "c.xml", &error).isNull());
+    EXPECT_EQ(sandbox.read("data/Client/c.xml"), "<a>\n    <b/>\n    <c/>\n</a>\n");
+    EXPECT_FALSE(error);
+}
+
+TEST_F(FileSystemRepositoryTest, WhatCannotBeWrittenIsToldAndChangesNothing) {
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    EXPECT_TRUE(repository->writeFileToUserOverrideArea(nullptr, "a.xml", &error).isNull());
+    EXPECT_TRUE(repository->writeDocumentToUserOverrideArea(nullptr, "a.xml", &error).isNull());
+    EXPECT_EQ(error->code(), 512);
+    EXPECT_FALSE(std::filesystem::exists(sandbox.path("data")));
+
+    const std::string area = sandbox.write("data/Client", "a plain file");
+    using Writer =
+        String (QXXMLFileSystemDataRepository::*)(const Ref<Data>&, const String&, Ref<Error>*);
+    EXPECT_TRUE(repository->writeFileToUserOverrideArea(data("x"), "a.xml", &error).isNull());
+    EXPECT_EQ(error->description().str(),
+              "NSCocoaErrorDomain -2000: Application support area is not a directory: " + area +
+                  " (Unable to write XML to user area)");
+    const Writer versioned = &QXXMLFileSystemDataRepository::writeFileToVersionedUserOverrideArea;
+    EXPECT_TRUE(((*repository).*versioned)(data("x"), "a.xml", &error).isNull());
+    EXPECT_EQ(error->description().str(),
+              "NSCocoaErrorDomain 512: The file cannot be written: " + area + " (Not a directory)");
+    EXPECT_EQ(sandbox.read("data/Client"), "a plain file");
+}
+
+TEST_F(FileSystemRepositoryTest, ListsMayHoldAnythingAndItsDescriptionShowsThePaths) {
+    const auto repository = QXXMLFileSystemDataRepository::init();
+    const std::string here = sandbox.write("here/a.xml", "<a/>");
+    repository->setSearchPaths(make<Array>(
+        std::initializer_list<Value>{nullptr, 5, make<Dictionary>(), sandbox.path("here")}));
+    repository->setSearchBundles(make<Array>(std::initializer_list<Value>{"text", nullptr, main}));
+    EXPECT_EQ(repository->pathForResourceNamed("a.xml"), std::string_view(here));
+    EXPECT_FALSE(repository->containsDocument("b.xml"));
+
+    const String plain = repository->Object::description();
+    repository->setSearchPaths(make<Array>(std::initializer_list<Value>{"/one"}));
+    EXPECT_EQ(repository->description(),
+              String::concat({plain, " searchPaths: ", repository->searchPaths()->description()}));
+    EXPECT_TRUE(plain.view().starts_with("<QXXMLFileSystemDataRepository: "));
+    repository->setSearchPaths(nullptr);
+    EXPECT_EQ(repository->description(), plain);
+}

@@ -1,0 +1,55 @@
+#include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
+
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include <gtest/gtest.h>
+
+using namespace qx;
+
+TEST(VolatileRepositoryTest, DocumentsAndDataAreKeptApartAndReplaced) {
+    const auto repository = QXXMLVolatileDataRepository::init();
+    const auto first = XMLDocument::initWithData("<a/>");
+    const auto second = XMLDocument::initWithData("<b/>");
+    const auto data = make<Data>(std::string_view("bytes"));
+    EXPECT_TRUE(repository->setDocument(first, "name"));
+    EXPECT_FALSE(repository->containsData("name"));
+    EXPECT_TRUE(repository->setData(data, "name"));
+    EXPECT_TRUE(repository->setDocument(second, "name"));
+    EXPECT_TRUE(repository->containsDocument("name"));
+    EXPECT_TRUE(repository->containsData("name"));
+    EXPECT_EQ(repository->documentNamed("name"), second);
+    EXPECT_EQ(repository->dataForName("name"), data);
+}
+
+TEST(VolatileRepositoryTest, AnAbsentNameIsNoErrorAndHasTheSizeOfNothingRead) {
+    const auto repository = QXXMLVolatileDataRepository::init();
+    std::uint64_t size = 0;
+    Ref<Error> error;
+    for (const String& name : {String("none"), String(""), String()}) {
+        EXPECT_FALSE(repository->containsDocument(name));
+        EXPECT_FALSE(repository->containsData(name));
+        EXPECT_FALSE(repository->documentNamed(name, &size, &error));
+        EXPECT_FALSE(repository->dataForName(name, &error));
+        EXPECT_FALSE(error);
+        EXPECT_EQ(size, 9223372036854775807U);
+    }
+}
+
+TEST(VolatileRepositoryTest, NullIsNotStored) {
+    const auto repository = QXXMLVolatileDataRepository::init();
+    EXPECT_THROW(repository->setDocument(nullptr, "name"), Exception);
+    EXPECT_THROW(repository->setData(nullptr, "name"), Exception);
+    EXPECT_THROW(repository->setDocument(XMLDocument::initWithData("<a/>"), nullptr), Exception);
+    EXPECT_FALSE(repository->containsDocument("name"));
+}
+
+TEST(VolatileRepositoryTest, TheDescriptionShowsDocumentsOnly) {
+    const auto repository = QXXMLVolatileDataRepository::init();
+    const String plain = repository->Object::description();
+    repository->setData(make<Data>(), "data");
+    EXPECT_EQ(repository->description(), plain);
+    repository->setDocument(XMLDocument::initWithData("<a/>"), "doc");
+    const std::string text = repository->description().str();
+    EXPECT_EQ(text.find(plain.str() + " documents: {"), 0U) << text;
+    EXPECT_NE(text.find("doc = "), std::string::npos) << text;
+}
