@@ -15,6 +15,7 @@
 //
 // Keys are kept out of undo as ChangeTracking.h says. An undo manager keeps old values alive, and
 // these may hold the object that holds the manager: call removeAllActions when an editor closes.
+// So does the change cache, which holds the latest old value of a key that is not registered.
 
 #include <QXXMLMarshalling/platform/ChangeTracking.h>
 
