@@ -11,7 +11,7 @@ namespace qx {
 
 namespace {
 
-Value nullForMarker(Value value) { return value.isNullOrMarker() ? Value() : value; }
+Value nullForMarker(const Value& value) { return value.isNullOrMarker() ? Value() : value; }
 
 bool holds(const Value& names, Key key) {
     if (const auto set = names.as<CountedSet>())

@@ -139,8 +139,11 @@ Value itemsAt(const Value& collection, const std::vector<std::size_t>& indexes) 
 Value orMarker(const Value& value) { return value.isNull() ? Value(Null::marker()) : value; }
 
 Ref<Dictionary> dictionaryOf(const ValueChange& change, unsigned options) {
-    static const Key kind(ChangeKey::kind), newValue(ChangeKey::newValue),
-        oldValue(ChangeKey::oldValue), indexes(ChangeKey::indexes), isPrior(ChangeKey::isPrior);
+    static const Key kind(ChangeKey::kind);
+    static const Key newValue(ChangeKey::newValue);
+    static const Key oldValue(ChangeKey::oldValue);
+    static const Key indexes(ChangeKey::indexes);
+    static const Key isPrior(ChangeKey::isPrior);
     auto result = make<Dictionary>();
     result->set(kind, static_cast<int>(change.kind));
     if ((options & Observing::oldValue) != 0 && change.kind != ChangeKind::insertion)

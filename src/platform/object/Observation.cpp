@@ -6,6 +6,7 @@
 #include "platform/object/ObservationInfo.h"
 #include "platform/object/Warning.h"
 
+#include <algorithm>
 #include <exception>
 
 namespace qx {
@@ -54,9 +55,10 @@ template <class Suits>
 void removeLatest(Object& object, Key keyPath, Suits suits) {
     if (ObservationInfo* info = ObservationInfo::existing(object)) {
         auto& all = info->observances;
-        for (auto position = all.rbegin(); position != all.rend(); ++position)
-            if (suits(**position))
-                return (*position)->end();
+        const auto found = std::find_if(all.rbegin(), all.rend(),
+                                        [&](const auto& observance) { return suits(*observance); });
+        if (found != all.rend())
+            return (*found)->end();
     }
     throw Exception(Exception::range,
                     String::concat({"an observer to be removed does not observe ", keyPath.view(),

@@ -90,7 +90,7 @@ struct UndoManager::State {
     void add(std::unique_ptr<UndoAction> action) {
         UndoItemGroup& group = groupForRegistration();
         history.add(action.get(), group);
-        action.release();
+        static_cast<void>(action.release()); // the history owns it
         if (doing == Doing::nothing)
             history.removeContents(history.redoStack());
     }
