@@ -96,7 +96,6 @@ private:
     void unlink(XMLNode& node) noexcept;
 
     XMLNode* _firstChild = nullptr;
-    XMLNode* _lastChild = nullptr;
     String _version;
     String _encoding;
     String _standalone;

@@ -17,7 +17,7 @@ public:
     ~XMLElement() override;
 
     XMLNode* firstChild() const noexcept override { return _firstChild; }
-    XMLNode* lastChild() const noexcept { return _lastChild; }
+    XMLNode* lastChild() const noexcept { return lastOf(_firstChild); }
     std::size_t childCount() const noexcept { return _childCount; }
 
     // The direct child elements of that qualified name, in document order.
@@ -59,11 +59,8 @@ private:
 
     std::uint32_t _childCount = 0; // fills the hole that the base class leaves
     XMLNode* _firstChild = nullptr;
-    XMLNode* _lastChild = nullptr;
     XMLNode* _firstAttribute = nullptr;
-    XMLNode* _lastAttribute = nullptr;
     XMLNode* _firstNamespace = nullptr;
-    XMLNode* _lastNamespace = nullptr;
 };
 
 inline XMLElement* XMLNode::asElement() noexcept {

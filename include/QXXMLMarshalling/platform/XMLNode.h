@@ -86,6 +86,9 @@ private:
 class QX_API XMLNode : public Object {
 public:
     ~XMLNode() override;
+    // Nodes share blocks of memory.
+    static void* operator new(std::size_t size);
+    static void operator delete(void* node) noexcept;
 
     static Ref<XMLNode> initTextWithStringValue(const String& text);
     static Ref<XMLNode> initCommentWithStringValue(const String& text);
@@ -111,7 +114,9 @@ public:
     // The document at the top; null when there is none.
     XMLDocument* rootDocument() const noexcept;
     XMLNode* nextSibling() const noexcept { return _next; }
-    XMLNode* previousSibling() const noexcept { return _previous; }
+    XMLNode* previousSibling() const noexcept {
+        return _previous != nullptr && _previous->_next != nullptr ? _previous : nullptr;
+    }
     // The child nodes in document order: of elements and documents; of other kinds none.
     XMLNodeRange children() const noexcept { return XMLNodeRange(firstChild()); }
     virtual XMLNode* firstChild() const noexcept { return nullptr; }
@@ -146,10 +151,13 @@ protected:
 
     XMLNode(XMLNodeKind kind, String name, String value) noexcept;
     const Class& describedClass() const override;
+    static XMLNode* lastOf(XMLNode* first) noexcept {
+        return first != nullptr ? first->_previous : nullptr;
+    }
 
     XMLNode* _parent = nullptr; // owns this node
     XMLNode* _next = nullptr;
-    XMLNode* _previous = nullptr;
+    XMLNode* _previous = nullptr; // of the first of its siblings: the last one
     String _name;
     String _value;
     XMLNodeKind _kind;

@@ -3,6 +3,7 @@
 #include "platform/xml/XMLCharacters.h"
 
 #include <algorithm>
+#include <cstring>
 #include <libxml/SAX2.h>
 #include <libxml/parserInternals.h>
 #include <mutex>
@@ -219,8 +220,8 @@ void SAXSession::startDocument() {
 void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int namespaceCount,
                               const xmlChar** namespaces, int attributeCount, int defaultedCount,
                               const xmlChar** attributes) {
-    const std::size_t start = _text.rfind(isInsideReference() ? '&' : '<', offset() - 1);
-    _tagOffset = std::min(start, _text.size());
+    const void* start = ::memrchr(_text.data(), isInsideReference() ? '&' : '<', offset());
+    _tagOffset = start != nullptr ? static_cast<const char*>(start) - _text.data() : 0;
     _position.moveTo(_tagOffset);
     if (_attributeDefaults != 0)
         countDefaulted(namespaceCount, namespaces, defaultedCount,

@@ -1,7 +1,8 @@
 #pragma once
 
 // The doubly linked list that an element or a document keeps of its children, its attributes and
-// its namespaces: the parent holds the ends and one count for each node.
+// its namespaces. The parent holds the first node and one count for each. The first node's
+// "previous" is the last one, which saves each element three pointers.
 
 #include <QXXMLMarshalling/platform/XMLNode.h>
 
@@ -9,35 +10,47 @@ namespace qx {
 
 struct XMLSiblings {
     // Takes over the caller's count.
-    static void append(XMLNode& parent, XMLNode*& first, XMLNode*& last, XMLNode* node) noexcept {
+    static void append(XMLNode& parent, XMLNode*& first, XMLNode* node) noexcept {
         node->_parent = &parent;
-        node->_previous = last;
-        (last != nullptr ? last->_next : first) = node;
-        last = node;
+        if (first == nullptr) {
+            first = node->_previous = node;
+            return;
+        }
+        node->_previous = first->_previous;
+        first->_previous->_next = node;
+        first->_previous = node;
     }
 
-    static void insert(XMLNode& parent, XMLNode*& first, XMLNode*& last, XMLNode* node,
-                       XMLNode* before) noexcept {
+    static void insert(XMLNode& parent, XMLNode*& first, XMLNode* node, XMLNode* before) noexcept {
         if (before == nullptr)
-            return append(parent, first, last, node);
+            return append(parent, first, node);
         node->_parent = &parent;
         node->_next = before;
         node->_previous = before->_previous;
-        (before->_previous != nullptr ? before->_previous->_next : first) = node;
+        if (before == first)
+            first = node;
+        else
+            before->_previous->_next = node;
         before->_previous = node;
     }
 
     // Leaves the parent's count to the caller.
-    static void remove(XMLNode*& first, XMLNode*& last, XMLNode& node) noexcept {
-        (node._previous != nullptr ? node._previous->_next : first) = node._next;
-        (node._next != nullptr ? node._next->_previous : last) = node._previous;
+    static void remove(XMLNode*& first, XMLNode& node) noexcept {
+        if (node._next != nullptr)
+            node._next->_previous = node._previous;
+        else
+            first->_previous = node._previous;
+        if (&node == first)
+            first = node._next;
+        else
+            node._previous->_next = node._next;
         node._parent = node._next = node._previous = nullptr;
     }
 
     // Empties the list; nodes that someone else keeps stand alone from then on.
-    static void releaseAll(XMLNode*& first, XMLNode*& last) noexcept {
+    static void releaseAll(XMLNode*& first) noexcept {
         XMLNode* node = first;
-        first = last = nullptr;
+        first = nullptr;
         while (node != nullptr) {
             XMLNode* next = node->_next;
             node->_parent = node->_next = node->_previous = nullptr;

@@ -1,7 +1,6 @@
 #include "platform/xml/TextPosition.h"
 
 #include <algorithm>
-#include <bit>
 #include <cstring>
 
 namespace qx {
@@ -15,7 +14,8 @@ std::size_t countCodePoints(const char* from, const char* to) noexcept {
     for (; to - from >= 8; from += 8) {
         std::uint64_t word = 0;
         std::memcpy(&word, from, 8);
-        count -= static_cast<std::size_t>(std::popcount((word >> 7) & ~(word >> 6) & lowBits));
+        const std::uint64_t continuations = (word >> 7) & ~(word >> 6) & lowBits;
+        count -= static_cast<std::size_t>((continuations * lowBits) >> 56); // adds the bytes up
     }
     for (; from != to; ++from)
         count -= (static_cast<unsigned char>(*from) & 0xC0U) == 0x80U;

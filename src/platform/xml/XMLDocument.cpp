@@ -27,7 +27,7 @@ void report(Ref<Error>* error, int code, const char* message) {
 
 XMLDocument::XMLDocument() noexcept : XMLNode(XMLNodeKind::document, String(), String()) {}
 
-XMLDocument::~XMLDocument() { XMLSiblings::releaseAll(_firstChild, _lastChild); }
+XMLDocument::~XMLDocument() { XMLSiblings::releaseAll(_firstChild); }
 
 Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
                                                     const XMLParseOptions& options,
@@ -103,12 +103,10 @@ void XMLDocument::addChild(Ref<XMLNode> child) {
     default:
         refuse("a document holds an element, comments and processing instructions only");
     }
-    XMLSiblings::append(*this, _firstChild, _lastChild, child.detach());
+    XMLSiblings::append(*this, _firstChild, child.detach());
 }
 
-void XMLDocument::unlink(XMLNode& node) noexcept {
-    XMLSiblings::remove(_firstChild, _lastChild, node);
-}
+void XMLDocument::unlink(XMLNode& node) noexcept { XMLSiblings::remove(_firstChild, node); }
 
 std::string XMLDocument::XMLData(XMLOptions options) const {
     std::string text;
@@ -150,8 +148,7 @@ Ref<XMLNode> XMLDocument::copy() const {
     document->_encoding = _encoding;
     document->_standalone = _standalone;
     for (const XMLNode& node : children())
-        XMLSiblings::append(*document, document->_firstChild, document->_lastChild,
-                            node.copy().detach());
+        XMLSiblings::append(*document, document->_firstChild, node.copy().detach());
     return document;
 }
 

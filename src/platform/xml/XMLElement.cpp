@@ -55,16 +55,16 @@ bool isText(const XMLNode& node) { return node.kind() == XMLNodeKind::text; }
 
 } // namespace
 
-// Documents hold millions of elements: this is 16 bytes less than an unlucky order of members.
-static_assert(sizeof(void*) != 8 || sizeof(XMLElement) <= 136);
+// Documents hold millions of elements: the count of children fills a hole, lists keep one end.
+static_assert(sizeof(void*) != 8 || sizeof(XMLElement) <= 112);
 
 XMLElement::XMLElement(String name) noexcept
     : XMLNode(XMLNodeKind::element, std::move(name), String()) {}
 
 XMLElement::~XMLElement() {
-    XMLSiblings::releaseAll(_firstChild, _lastChild);
-    XMLSiblings::releaseAll(_firstAttribute, _lastAttribute);
-    XMLSiblings::releaseAll(_firstNamespace, _lastNamespace);
+    XMLSiblings::releaseAll(_firstChild);
+    XMLSiblings::releaseAll(_firstAttribute);
+    XMLSiblings::releaseAll(_firstNamespace);
 }
 
 Ref<XMLElement> XMLElement::initWithName(const String& name) {
@@ -92,7 +92,7 @@ void XMLElement::insertChild(Ref<XMLNode> child, XMLNode* before) {
     if (before != nullptr && (before->_parent != this || before->_kind == XMLNodeKind::attribute ||
                               before->_kind == XMLNodeKind::namespaceDeclaration))
         refuse("a child cannot be inserted before a node that is no child", *this);
-    XMLSiblings::insert(*this, _firstChild, _lastChild, child.detach(), before);
+    XMLSiblings::insert(*this, _firstChild, child.detach(), before);
     ++_childCount;
 }
 
@@ -108,7 +108,7 @@ void XMLElement::addAttribute(Ref<XMLNode> attribute) {
     if (attribute->_kind != XMLNodeKind::attribute)
         refuse("a node that is no attribute cannot be added as one", *this);
     if (attributeForName(attribute->_name) == nullptr)
-        XMLSiblings::append(*this, _firstAttribute, _lastAttribute, attribute.detach());
+        XMLSiblings::append(*this, _firstAttribute, attribute.detach());
 }
 
 void XMLElement::removeAttributeForName(const String& name) {
@@ -122,7 +122,7 @@ void XMLElement::setNamespaces(std::span<const Ref<XMLNode>> namespaces) {
         if (declaration->_kind != XMLNodeKind::namespaceDeclaration)
             refuse("a node that is no namespace cannot be set as one", *this);
     }
-    XMLSiblings::releaseAll(_firstNamespace, _lastNamespace);
+    XMLSiblings::releaseAll(_firstNamespace);
     // A node that stands in the list twice has a parent by then, and its prefix is taken.
     for (const Ref<XMLNode>& declaration : namespaces)
         if (declaration->_parent == nullptr)
@@ -136,16 +136,16 @@ void XMLElement::addNamespace(Ref<XMLNode> declaration) {
     for (const XMLNode* node = _firstNamespace; node != nullptr; node = node->_next)
         if (node->_name == declaration->_name)
             return;
-    XMLSiblings::append(*this, _firstNamespace, _lastNamespace, declaration.detach());
+    XMLSiblings::append(*this, _firstNamespace, declaration.detach());
 }
 
 void XMLElement::unlink(XMLNode& node) noexcept {
     if (node._kind == XMLNodeKind::attribute) {
-        XMLSiblings::remove(_firstAttribute, _lastAttribute, node);
+        XMLSiblings::remove(_firstAttribute, node);
     } else if (node._kind == XMLNodeKind::namespaceDeclaration) {
-        XMLSiblings::remove(_firstNamespace, _lastNamespace, node);
+        XMLSiblings::remove(_firstNamespace, node);
     } else {
-        XMLSiblings::remove(_firstChild, _lastChild, node);
+        XMLSiblings::remove(_firstChild, node);
         --_childCount;
     }
 }
@@ -171,7 +171,7 @@ String XMLElement::stringValue() const {
 
 void XMLElement::setStringValue(const String& value) {
     Ref<XMLNode> text = value.isEmpty() ? Ref<XMLNode>() : initTextWithStringValue(value);
-    XMLSiblings::releaseAll(_firstChild, _lastChild);
+    XMLSiblings::releaseAll(_firstChild);
     _childCount = 0;
     if (text)
         addChild(std::move(text));
@@ -184,11 +184,9 @@ Ref<XMLNode> XMLElement::copy() const {
         element->_line = from._line;
         element->_column = from._column;
         for (const XMLNode* node = from._firstAttribute; node != nullptr; node = node->_next)
-            XMLSiblings::append(*element, element->_firstAttribute, element->_lastAttribute,
-                                node->copy().detach());
+            XMLSiblings::append(*element, element->_firstAttribute, node->copy().detach());
         for (const XMLNode* node = from._firstNamespace; node != nullptr; node = node->_next)
-            XMLSiblings::append(*element, element->_firstNamespace, element->_lastNamespace,
-                                node->copy().detach());
+            XMLSiblings::append(*element, element->_firstNamespace, node->copy().detach());
         return element;
     };
     Ref<XMLElement> top = alone(*this);
@@ -210,7 +208,7 @@ Ref<XMLNode> XMLElement::copy() const {
         const XMLElement* element = node->asElement();
         Ref<XMLNode> copied = element != nullptr ? Ref<XMLNode>(alone(*element)) : node->copy();
         XMLNode* child = copied.get();
-        XMLSiblings::append(*target, target->_firstChild, target->_lastChild, copied.detach());
+        XMLSiblings::append(*target, target->_firstChild, copied.detach());
         ++target->_childCount;
         if (node->firstChild() != nullptr)
             target = child->asElement();

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include "platform/xml/NodeMemory.h"
 #include "platform/xml/XMLSerializer.h"
 
 namespace qx {
@@ -23,6 +24,10 @@ XMLNode::XMLNode(XMLNodeKind kind, String name, String value) noexcept
     : _name(std::move(name)), _value(std::move(value)), _kind(kind) {}
 
 XMLNode::~XMLNode() = default;
+
+void* XMLNode::operator new(std::size_t size) { return allocateNode(size); }
+
+void XMLNode::operator delete(void* node) noexcept { releaseNode(node); }
 
 Ref<XMLNode> XMLNode::initTextWithStringValue(const String& text) {
     return Ref<XMLNode>::adopt(new XMLNode(XMLNodeKind::text, String(), present(text)));

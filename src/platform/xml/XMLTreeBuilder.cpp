@@ -33,7 +33,7 @@ void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::siz
     element->_line = saturated(line);
     element->_column = saturated(column);
     if (_open.empty())
-        XMLSiblings::append(_document, _document._firstChild, _document._lastChild, element);
+        XMLSiblings::append(_document, _document._firstChild, element);
     else
         appendChild(*_open.back().element, element);
     _open.push_back({element, _layouts.size(), namespaces, false, preserves});
@@ -46,7 +46,7 @@ void XMLTreeBuilder::addNamespace(const String& prefix, const String& URI) {
                                std::to_string(maximumNamespaces),
                            ParseFailure::beyondLimit};
     XMLElement& element = *_open.back().element;
-    XMLSiblings::append(element, element._firstNamespace, element._lastNamespace,
+    XMLSiblings::append(element, element._firstNamespace,
                         new XMLNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
 }
 
@@ -54,8 +54,8 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
     requireSize(name.size(), "A name");
     requireSize(value.size(), "An attribute's value");
     XMLElement& element = *_open.back().element;
-    XMLSiblings::append(element, element._firstAttribute, element._lastAttribute,
-                        new XMLNode(XMLNodeKind::attribute, name, String(value)));
+    XMLSiblings::append(element, element._firstAttribute,
+                        new XMLNode(XMLNodeKind::attribute, name, _values.valued(value)));
 }
 
 void XMLTreeBuilder::endElement() {
@@ -88,12 +88,12 @@ void XMLTreeBuilder::finishText() {
     OpenElement& open = _open.back();
     const bool isLayout = _textIsLayout && _text.find('\n') != std::string::npos;
     if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
-        _layouts.push_back({open.element->_lastChild, _layoutText.size(), _text.size()});
+        _layouts.push_back({open.element->lastChild(), _layoutText.size(), _text.size()});
         _layoutText += _text;
     } else {
         if (!isLayout)
             restoreLayout(open);
-        auto* text = new XMLNode(XMLNodeKind::text, String(), String(_text));
+        auto* text = new XMLNode(XMLNodeKind::text, String(), _values.valued(_text));
         text->_isLayout = isLayout;
         appendChild(*open.element, text);
     }
@@ -119,17 +119,18 @@ void XMLTreeBuilder::dropLayout(const OpenElement& open) noexcept {
     if (_layouts.size() == open.firstLayout)
         return;
     _layoutText.resize(_layouts[open.firstLayout].start);
-    _layouts.resize(open.firstLayout, {});
+    _layouts.erase(_layouts.begin() + static_cast<std::ptrdiff_t>(open.firstLayout),
+                   _layouts.end());
 }
 
 void XMLTreeBuilder::appendChild(XMLElement& parent, XMLNode* child, XMLNode* before) noexcept {
-    XMLSiblings::insert(parent, parent._firstChild, parent._lastChild, child, before);
+    XMLSiblings::insert(parent, parent._firstChild, child, before);
     ++parent._childCount;
 }
 
 void XMLTreeBuilder::appendToCurrent(Ref<XMLNode> node) {
     if (_open.empty())
-        XMLSiblings::append(_document, _document._firstChild, _document._lastChild, node.detach());
+        XMLSiblings::append(_document, _document._firstChild, node.detach());
     else
         appendChild(*_open.back().element, node.detach());
 }

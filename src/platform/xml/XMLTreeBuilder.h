@@ -6,6 +6,8 @@
 
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include "platform/xml/SharedValues.h"
+
 #include <string>
 #include <vector>
 
@@ -56,6 +58,7 @@ private:
     bool _textIsLayout = false;
     std::vector<Layout> _layouts;
     std::string _layoutText;
+    SharedValues _values;
 };
 
 } // namespace qx
