@@ -35,16 +35,21 @@ struct ClassRegistry {
     const Class& publish(Class::Draft draft, bool listed) {
         const Key name = draft.name;
         const std::type_index type(*draft.type);
-        const std::unique_lock lock(mutex);
+        // Warnings are given with the lock released: a host's log may ask for classes.
+        std::unique_lock lock(mutex);
         if (const auto found = byType.find(type); found != byType.end()) {
+            const Class& first = *found->second;
+            lock.unlock();
             reportWarning(String::concat(
-                {"The class ", name.view(), " is described already, as ", found->second->name()}));
-            return *found->second;
+                {"The class ", name.view(), " is described already, as ", first.name()}));
+            return first;
         }
         // Descriptions are immortal: objects keep pointers to them.
         const auto* published = new Class(std::move(draft));
         byType.emplace(type, published);
-        if (listed && !byName.emplace(name, published).second)
+        const bool isTaken = listed && !byName.emplace(name, published).second;
+        lock.unlock();
+        if (isTaken)
             reportWarning(String::concat(
                 {"The class name ", name.view(), " is taken; it stays with the first class"}));
         return *published;

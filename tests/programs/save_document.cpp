@@ -1,0 +1,35 @@
+// Writes a document into the user's override area below the folder given, an own one without. The
+// call itself stands between two calls of getppid(), by which a trace finds it.
+
+#include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
+#include <QXXMLMarshalling/platform/ProcessInfo.h>
+
+#include <cstdlib>
+#include <iostream>
+
+#include <unistd.h>
+
+int main(int argc, char** argv) {
+    std::string folder = "/tmp/qx-save-XXXXXX";
+    if (argc < 2 && ::mkdtemp(folder.data()) == nullptr)
+        return 2;
+    ::setenv("XDG_DATA_HOME", argc < 2 ? folder.c_str() : argv[1], 1);
+    qx::ProcessInfo::setProcessName("Client");
+
+    auto root = qx::XMLElement::initWithName("order");
+    for (int i = 0; i < 1000; ++i)
+        root->addChild(qx::XMLElement::initWithName("item", std::to_string(i)));
+    const auto document = qx::XMLDocument::initWithRootElement(root);
+    const auto repository = QXXMLFileSystemDataRepository::init();
+
+    qx::Ref<qx::Error> error;
+    ::getppid();
+    const qx::String path = repository->writeDocumentToUserOverrideArea(document, "a.xml", &error);
+    ::getppid();
+    if (path.isNull()) {
+        std::cout << error->description().view() << '\n';
+        return 1;
+    }
+    if (argc < 2)
+        return std::system(("rm -r " + folder).c_str()) == 0 ? 0 : 2;
+}
