@@ -1,0 +1,105 @@
+#!/usr/bin/env bash
+# A program that saves a document is killed at each system call of the save, and each of them fails
+# once: what is found afterwards is the old document or the new one, whole.
+#
+# usage: atomic-write.sh BUILD_DIR SOURCE_DIR
+set -euo pipefail
+
+program=$1/bin/program_save_document
+# The leak check of the sanitizers cannot run under a tracer.
+export ASAN_OPTIONS=detect_leaks=0
+folder=$(mktemp -d)
+trap 'rm -rf -- "$folder"' EXIT
+if [[ ! -x $program ]]; then
+    echo "program_save_document is not built" >&2
+    exit 77
+fi
+if ! strace -o /dev/null true 2>/dev/null; then
+    echo "system calls cannot be traced here" >&2
+    exit 77
+fi
+
+area=$folder/data/Client
+old='<order>the old one</order>'
+prepare() {
+    rm -rf -- "$folder/data"
+    mkdir -p -- "$area"
+    printf '%s' "$old" >"$area/a.xml"
+}
+fail() {
+    echo "$*" >&2
+    exit 1
+}
+
+# One undisturbed run gives the new document and the calls of the save: "name ordinal", the ordinal
+# counting the calls of that name from the start of the program, as strace does.
+prepare
+strace -o "$folder/trace" -- "$program" "$folder/data"
+cp -- "$area/a.xml" "$folder/new.xml"
+mapfile -t calls < <(awk '
+    match($0, /^[a-z0-9_]+\(/) {
+        name = substr($0, 1, RLENGTH - 1)
+        ++count[name]
+        if (name == "getppid") ++marks
+        else if (marks == 1) print name, count[name]
+    }' "$folder/trace")
+((${#calls[@]} >= 8)) || fail "the save has only these calls: ${calls[*]}"
+
+# state: what stands in the area, in `state`: old, new or a description of what is wrong.
+look() {
+    if [[ ! -e $area/a.xml ]]; then
+        state='no document'
+    elif cmp -s -- "$area/a.xml" "$folder/new.xml"; then
+        state=new
+    elif [[ $(<"$area/a.xml") == "$old" ]]; then
+        state=old
+    else
+        state="a broken document of $(stat -c %s -- "$area/a.xml") bytes"
+    fi
+}
+
+killed=0
+declare -A seen=()
+for call in "${calls[@]}"; do
+    read -r name ordinal <<<"$call"
+    prepare
+    status=0
+    { strace -o /dev/null -e "trace=$name" -e "inject=$name:signal=KILL:when=$ordinal" \
+        -- "$program" "$folder/data" >/dev/null; } 2>/dev/null || status=$?
+    look
+    [[ $state == old || $state == new ]] || fail "killed at $name ($ordinal): $state"
+    seen[$state]=1
+    ((status != 137)) || killed=$((killed + 1))
+done
+((killed == ${#calls[@]})) || fail "killed only $killed of ${#calls[@]} times"
+[[ -n ${seen[old]:-} && -n ${seen[new]:-} ]] || fail "every time: ${!seen[*]}"
+
+# inject NAME ERROR: lets the first call of that name within the save fail. What the program says in
+# `said`.
+inject() {
+    local call name ordinal
+    for call in "${calls[@]}"; do
+        read -r name ordinal <<<"$call"
+        [[ $name != "$1"* ]] || break
+    done
+    [[ $name == "$1"* ]] || fail "the save has no call of $1"
+    prepare
+    said=$(strace -o /dev/null -e "trace=$name" -e "inject=$name:error=$2:when=$ordinal" \
+        -- "$program" "$folder/data") || true
+    look
+}
+while IFS='|' read -r name error expected; do
+    inject "$name" "$error"
+    [[ $state == old ]] || fail "$error of $name: $state"
+    [[ $said == "NSCocoaErrorDomain $expected" ]] || fail "$error of $name: $said"
+    [[ $(ls -A -- "$area") == a.xml ]] || fail "$error of $name leaves $(ls -A -- "$area" | tr '\n' ' ')"
+done <<END
+open|EROFS|642: The disk is read-only: $area/a.xml (Read-only file system)
+open|EACCES|513: Permission to write is missing: $area/a.xml (Permission denied)
+write|ENOSPC|640: The disk is too full to write: $area/a.xml (No space left on device)
+fsync|EIO|512: The file cannot be written: $area/a.xml (Input/output error)
+rename|EDQUOT|640: The disk is too full to write: $area/a.xml (Disk quota exceeded)
+END
+# An interrupted call is made again.
+inject write EINTR
+[[ $state == new ]] || fail "an interrupted write: $state"
