@@ -18,8 +18,7 @@ std::unique_ptr<ElementSource> ElementSource::copyOf(const ElementSource& other)
     copy->_scope = copy->_ownScope.get();
     copy->_children = std::make_unique<Children>();
     copy->_children->list.reserve(other._element.childCount());
-    other.forEachChild(
-        [&](XMLNode& child) { copy->_children->list.push_back({.node = &child}); });
+    other.forEachChild([&](XMLNode& child) { copy->_children->list.push_back({.node = &child}); });
     return copy;
 }
 

@@ -25,8 +25,8 @@ public:
         std::unordered_map<const qx::XMLNode*, qx::Ref<qx::XMLNode>> copies;
     };
 
-    // The element itself; `scope` is that of the source in which it was found, null in the document.
-    // `lookups` is how many names will be looked up.
+    // The element itself; `scope` is that of the source in which it was found, null in the
+    // document. `lookups` is how many names will be looked up.
     ElementSource(qx::XMLElement& element, CopyScope* scope, std::size_t lookups) noexcept
         : _element(element), _scope(scope), _lookups(lookups) {}
     // A private copy of what is left in the other.
@@ -100,6 +100,6 @@ private:
     qx::XMLElement& _element;
     CopyScope* _scope;
     std::size_t _lookups;
-    std::unique_ptr<Children> _children; // a private copy's, or the index of an element's
+    std::unique_ptr<Children> _children;  // a private copy's, or the index of an element's
     std::unique_ptr<CopyScope> _ownScope; // of a private copy
 };

@@ -15,9 +15,8 @@ ObjectHooks::ObjectHooks(const qx::Class& describedType)
 
 const ObjectHooks& ObjectDoor::hooksOf(const qx::Object& object) {
     const qx::Class& type = object.isa();
-    const auto known = std::find_if(_known.begin(), _known.end(), [&](const ObjectHooks& hooks) {
-        return hooks.type == &type;
-    });
+    const auto known = std::find_if(_known.begin(), _known.end(),
+                                    [&](const ObjectHooks& hooks) { return hooks.type == &type; });
     return known != _known.end() ? *known : _known.emplace_back(type);
 }
 
@@ -33,6 +32,5 @@ qx::Value ObjectDoor::send(qx::Object& object, const qx::Operation& operation,
 bool ObjectDoor::set(qx::Object& object, qx::Key key, const qx::Value& value,
                      qx::Ref<qx::Error>* error) {
     return set(object, key, value) == qx::SetOutcome::set ||
-           qx::fail(error, qx::errors::unableToSetValue, value, key.string(),
-                    object.isa().name());
+           qx::fail(error, qx::errors::unableToSetValue, value, key.string(), object.isa().name());
 }

@@ -1,8 +1,8 @@
 #pragma once
 
 // The one door through which the marshaller reaches objects: their class, their values by key, the
-// operations that it may ask of them. What an object's class answers is looked up once per class and
-// call of the marshaller.
+// operations that it may ask of them. What an object's class answers is looked up once per class
+// and call of the marshaller.
 
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/Error.h>

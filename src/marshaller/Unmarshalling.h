@@ -91,7 +91,7 @@ private:
     const bool _lenient;
     const bool _saveUnknownXML;
     ObjectDoor _door;
-    std::vector<const qx::Class*> _classes;  // by plan index, looked up once
+    std::vector<const qx::Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
     // Sets of consumed names that no object uses at the moment.

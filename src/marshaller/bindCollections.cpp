@@ -61,11 +61,10 @@ bool Unmarshalling::bindCollection(const FieldPlan& field, const Target& target,
     return ObjectDoor::set(target.object, field.key, array, error);
 }
 
-// Items are the elements of a bind name, whatever class their own name maps to, in the element or in
-// the one wrapper that a location names. A wrapper counts instead of its items, and once found it
-// is searched by the later bindings too.
-bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target,
-                                    ErrorSlot error) {
+// Items are the elements of a bind name, whatever class their own name maps to, in the element or
+// in the one wrapper that a location names. A wrapper counts instead of its items, and once found
+// it is searched by the later bindings too.
+bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (field.typeClass == nullptr)
         return qx::fail(error, qx::errors::noMappingForClass, field.mapping->type());
     std::unique_ptr<ElementSource> wrapper;

@@ -40,8 +40,7 @@ Value Unmarshalling::elementValue(const FieldPlan& field, const Target& target, 
     return child.stringValue();
 }
 
-Value Unmarshalling::flattenedValue(const FieldPlan& field, const Target& target,
-                                    ErrorSlot error) {
+Value Unmarshalling::flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (field.typeClass != nullptr)
         return build(*field.typeClass, target.source, true, error);
     const ClassPlan* plan = _plan.classForElement(target.source.element().name());
@@ -78,8 +77,7 @@ bool Unmarshalling::bindAsElement(const FieldPlan& field, const Target& target, 
     if (error == nullptr || (!problem && !field.isRequired))
         return true;
     if (!problem)
-        return qx::fail(error, qx::errors::requiredElementMissing, name,
-                        &target.source.element());
+        return qx::fail(error, qx::errors::requiredElementMissing, name, &target.source.element());
     *error = std::move(problem);
     return false;
 }

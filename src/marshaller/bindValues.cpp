@@ -10,8 +10,7 @@ using qx::Value;
 
 // The wrapper of a location is not counted as consumed, and the attribute counts for the element
 // that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
-bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target,
-                                    ErrorSlot error) {
+bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target, ErrorSlot error) {
     const qx::XMLNode* attribute = nullptr;
     String name;
     for (const BindingPlan& binding : field.bindings) {

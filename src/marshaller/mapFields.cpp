@@ -55,13 +55,16 @@ bool Marshalling::mapField(const FieldPlan& field, XMLElement& element, qx::Obje
     if (value.classNameForMarshalling().isNull())
         return qx::fail(error, qx::errors::noClassName, object.isa().name());
     switch (field.nodeType) {
-    case QXXMLNodeTypeAttribute: return mapAsAttribute(field, element, value);
-    case QXXMLNodeTypeElement: return mapAsElement(field, element, value, error);
+    case QXXMLNodeTypeAttribute:
+        return mapAsAttribute(field, element, value);
+    case QXXMLNodeTypeElement:
+        return mapAsElement(field, element, value, error);
     case QXXMLNodeTypeText:
         // Whatever stood in the element before goes: earlier children too.
         element.setStringValue(text(value, field.valueType));
         return true;
-    case QXXMLNodeTypeUnknown: return mapAutomatically(field, element, value, error);
+    case QXXMLNodeTypeUnknown:
+        return mapAutomatically(field, element, value, error);
     }
     return true;
 }
@@ -90,8 +93,8 @@ bool Marshalling::mapAsElement(const FieldPlan& field, XMLElement& element, cons
     if (plan != nullptr) {
         if (!field.isContainer && value.isObject())
             return bindFields(*plan, element, *value.object(), error);
-        auto child = this->element(*plan, declared ? field.xmlName : plan->elementName, value,
-                                   error);
+        auto child =
+            this->element(*plan, declared ? field.xmlName : plan->elementName, value, error);
         if (child)
             element.addChild(child);
         return child.get() != nullptr;

@@ -33,8 +33,8 @@ Ref<XMLElement> Marshalling::marshallObject(const Value& object, ErrorSlot error
     return element(*plan, plan->elementName, object, error);
 }
 
-Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name,
-                                     const Value& object, ErrorSlot error) {
+Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, const Value& object,
+                                     ErrorSlot error) {
     if (!object.isObject())
         return qx::fail(error, qx::errors::noMappingDefinition, object.classNameForMarshalling());
     auto element = XMLElement::initWithName(name.isEmpty() ? plan.className.string() : name);

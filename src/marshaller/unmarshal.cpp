@@ -65,8 +65,8 @@ bool Unmarshalling::isBeingBound(const ClassPlan& plan, const qx::XMLElement& el
     return false;
 }
 
-Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& source,
-                                     bool isFlattened, ErrorSlot error) {
+Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& source, bool isFlattened,
+                                     ErrorSlot error) {
     if (isBeingBound(plan, source.element()))
         return qx::fail(error, qx::errors::noDefinitionForElement, &source.element());
     const std::size_t depth = _frame != nullptr ? _frame->depth + 1 : 1;
@@ -159,9 +159,15 @@ bool Unmarshalling::bindField(const FieldPlan& field, const Target& target, Erro
     Ref<Error> problem;
     bool bound = false;
     switch (field.nodeType) {
-    case QXXMLNodeTypeAttribute: bound = bindAsAttribute(field, target, &problem); break;
-    case QXXMLNodeTypeElement: bound = bindAsElement(field, target, &problem); break;
-    case QXXMLNodeTypeText: bound = bindAsText(field, target, &problem); break;
+    case QXXMLNodeTypeAttribute:
+        bound = bindAsAttribute(field, target, &problem);
+        break;
+    case QXXMLNodeTypeElement:
+        bound = bindAsElement(field, target, &problem);
+        break;
+    case QXXMLNodeTypeText:
+        bound = bindAsText(field, target, &problem);
+        break;
     case QXXMLNodeTypeUnknown:
         bound = bindAsAttribute(field, target, &problem) || bindAsElement(field, target, &problem);
         break;

@@ -57,8 +57,8 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     if (!_saveUnknownXML)
         return qx::fail(error, qx::errors::unknownFields, unknown.names(),
                         target.source.element().name());
-    // Although it is worded as a warning, it goes to the host's debug log; whether there is a host's
-    // log at all is asked of the warnings.
+    // Although it is worded as a warning, it goes to the host's debug log; whether there is a
+    // host's log at all is asked of the warnings.
     if (qx::hostHasLogWarning())
         qx::logDebug("*** Warning: Unbound fields: %@", unknown.names());
     else

@@ -41,32 +41,30 @@ const qx::Class& describe() {
                   "changeCache"),
               accessorProperty<Record, &Record::className, &Record::setClassName>("className"),
               accessorProperty<Record, &Record::contents, &Record::setContents>("contents")},
-         .operations =
-             {instanceOperation<Record, &Record::setClassNameForMarshalling>(
-                  "setClassNameForMarshalling:"),
-              instanceOperation<Record, &Record::setNotifyBindingsObservers>(
-                  "setNotifyBindingsObservers:"),
-              instanceOperation<Record, &Record::isRemovable>("isRemovable"),
-              instanceOperation<Record, &Record::setUndoManager>("setUndoManager:"),
-              instanceOperation<Record, &Record::classNameForMarshalling>(
-                  "classNameForMarshalling"),
-              instanceOperation<Record, &Record::notifyBindingsObservers>(
-                  "notifyBindingsObservers"),
-              instanceOperation<Record, &Record::undoManager>("undoManager"),
-              instanceOperation<Record, &Record::changeCache>("changeCache"),
-              instanceOperation<Record, &Record::setChangeCache>("setChangeCache:"),
-              instanceOperation<Record, &Record::className>("className"),
-              instanceOperation<Record, &Record::setClassName>("setClassName:"),
-              instanceOperation<Record, &Record::contents>("contents"),
-              instanceOperation<Record, &Record::setContents>("setContents:"),
-              instanceOperation<Record, &Record::description>("description"),
-              instanceOperation<Record, &Record::isUndoRegistrationEnabledForKey>(
-                  "isUndoRegistrationEnabledForKey:"),
-              instanceOperation<Record, &Record::_setValue>("_setValue:forKey:")},
-         .classOperations = {
-             classOperation<&Record::allKnownKeyPaths>("allKnownKeyPaths"),
-             classOperation<&Record::automaticallyNotifiesObserversForKey>(
-                 "automaticallyNotifiesObserversForKey:")}});
+         .operations = {instanceOperation<Record, &Record::setClassNameForMarshalling>(
+                            "setClassNameForMarshalling:"),
+                        instanceOperation<Record, &Record::setNotifyBindingsObservers>(
+                            "setNotifyBindingsObservers:"),
+                        instanceOperation<Record, &Record::isRemovable>("isRemovable"),
+                        instanceOperation<Record, &Record::setUndoManager>("setUndoManager:"),
+                        instanceOperation<Record, &Record::classNameForMarshalling>(
+                            "classNameForMarshalling"),
+                        instanceOperation<Record, &Record::notifyBindingsObservers>(
+                            "notifyBindingsObservers"),
+                        instanceOperation<Record, &Record::undoManager>("undoManager"),
+                        instanceOperation<Record, &Record::changeCache>("changeCache"),
+                        instanceOperation<Record, &Record::setChangeCache>("setChangeCache:"),
+                        instanceOperation<Record, &Record::className>("className"),
+                        instanceOperation<Record, &Record::setClassName>("setClassName:"),
+                        instanceOperation<Record, &Record::contents>("contents"),
+                        instanceOperation<Record, &Record::setContents>("setContents:"),
+                        instanceOperation<Record, &Record::description>("description"),
+                        instanceOperation<Record, &Record::isUndoRegistrationEnabledForKey>(
+                            "isUndoRegistrationEnabledForKey:"),
+                        instanceOperation<Record, &Record::_setValue>("_setValue:forKey:")},
+         .classOperations = {classOperation<&Record::allKnownKeyPaths>("allKnownKeyPaths"),
+                             classOperation<&Record::automaticallyNotifiesObserversForKey>(
+                                 "automaticallyNotifiesObserversForKey:")}});
 }
 
 // Described when the library is loaded, so that a mapping finds the class by its name.
@@ -79,9 +77,7 @@ const qx::Class& QXGenericRecord::classObject() {
     return type;
 }
 
-const qx::Class& QXGenericRecord::describedClass() const {
-    return classObject();
-}
+const qx::Class& QXGenericRecord::describedClass() const { return classObject(); }
 
 Ref<QXGenericRecord> QXGenericRecord::copyWithZone() const {
     auto copy = isa().create().as<QXGenericRecord>();
@@ -121,25 +117,19 @@ void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
     didChangeValueForKey(key);
 }
 
-void QXGenericRecord::_setValue(const Value& value, Key key) {
-    _tracking.restoreValue(value, key);
-}
+void QXGenericRecord::_setValue(const Value& value, Key key) { _tracking.restoreValue(value, key); }
 
 String QXGenericRecord::classNameForMarshalling() const {
     return _className.isNull() ? Object::classNameForMarshalling() : _className;
 }
 
-Ref<qx::UndoManager> QXGenericRecord::undoManager() const {
-    return _tracking.undoManager();
-}
+Ref<qx::UndoManager> QXGenericRecord::undoManager() const { return _tracking.undoManager(); }
 
 void QXGenericRecord::setUndoManager(Ref<qx::UndoManager> manager) {
     _tracking.setUndoManager(std::move(manager));
 }
 
-Ref<Dictionary> QXGenericRecord::changeCache() const {
-    return _tracking.changeCache();
-}
+Ref<Dictionary> QXGenericRecord::changeCache() const { return _tracking.changeCache(); }
 
 void QXGenericRecord::setChangeCache(Ref<Dictionary> cache) {
     _tracking.setChangeCache(std::move(cache));
@@ -165,9 +155,7 @@ bool QXGenericRecord::isUndoRegistrationEnabledForKey(Key key) {
     return _tracking.isUndoRegistrationEnabledForKey(key);
 }
 
-String QXGenericRecord::description() const {
-    return descriptionWithLocale(nullptr, 0);
-}
+String QXGenericRecord::description() const { return descriptionWithLocale(nullptr, 0); }
 
 String QXGenericRecord::descriptionWithLocale(const Object* locale, std::size_t indent) const {
     std::string text = Object::description().str();
@@ -182,9 +170,7 @@ String QXGenericRecord::descriptionWithLocale(const Object* locale, std::size_t 
     return text;
 }
 
-Ref<qx::CountedSet> QXGenericRecord::allKnownKeyPaths() {
-    return qx::make<qx::CountedSet>();
-}
+Ref<qx::CountedSet> QXGenericRecord::allKnownKeyPaths() { return qx::make<qx::CountedSet>(); }
 
 bool QXGenericRecord::automaticallyNotifiesObserversForKey(const qx::Class& receiver,
                                                            const String& key) {

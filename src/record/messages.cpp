@@ -41,7 +41,8 @@ String keyWrittenBy(std::string_view message) {
         message.remove_prefix(prefix.size());
         // The first character whole, however many bytes it has.
         std::size_t length = 1;
-        while (length < message.size() && (static_cast<unsigned char>(message[length]) & 0xC0) == 0x80)
+        while (length < message.size() &&
+               (static_cast<unsigned char>(message[length]) & 0xC0) == 0x80)
             ++length;
         key = String::concat(
             {String(message.substr(0, length)).lowercased(), message.substr(length)});
@@ -58,8 +59,7 @@ void QXGenericRecord::observeObject(Object& object, const String& keyPath, Selec
 
 void QXGenericRecord::observeObjects(const Object& collection, const String& keyPath,
                                      Selector selector) {
-    forEachObject(collection,
-                  [&](Object& object) { observeObject(object, keyPath, selector); });
+    forEachObject(collection, [&](Object& object) { observeObject(object, keyPath, selector); });
 }
 
 void QXGenericRecord::removeObservation(Object& object, const String& keyPath) {
@@ -83,9 +83,12 @@ Ref<qx::MethodSignature> QXGenericRecord::methodSignatureForSelector(Selector se
             AllowMethodForwardingInGenericRecords))
         return nullptr;
     switch (selector.argumentCount()) {
-    case 0: return qx::make<qx::MethodSignature>(0U, true);
-    case 1: return qx::make<qx::MethodSignature>(1U, false);
-    default: return nullptr;
+    case 0:
+        return qx::make<qx::MethodSignature>(0U, true);
+    case 1:
+        return qx::make<qx::MethodSignature>(1U, false);
+    default:
+        return nullptr;
     }
 }
 

@@ -9,8 +9,8 @@ using qx::Ref;
 using qx::String;
 
 QXXMLMarshallingMapping::QXXMLMarshallingMapping()
-    : _mappingByClass(std::make_unique<Index>()),
-      _mappingByElementName(std::make_unique<Index>()) {}
+    : _mappingByClass(std::make_unique<Index>()), _mappingByElementName(std::make_unique<Index>()) {
+}
 
 QXXMLMarshallingMapping::~QXXMLMarshallingMapping() = default;
 
@@ -54,8 +54,7 @@ QXXMLClassMapping* QXXMLMarshallingMapping::mappingForClassName(const String& cl
     return _mappingByClass->find(className);
 }
 
-QXXMLClassMapping*
-QXXMLMarshallingMapping::mappingForElementName(const String& elementName) const {
+QXXMLClassMapping* QXXMLMarshallingMapping::mappingForElementName(const String& elementName) const {
     return _mappingByElementName->find(elementName);
 }
 

@@ -57,4 +57,3 @@ bool QXXMLMarshallingMapping::loadIncludedDocument(const String& href, const Loa
         *error = std::move(problem);
     return merged;
 }
-

@@ -98,16 +98,26 @@ TEST(Marshal, WritesElementsUnderTheFieldsNameOrTheClasses) {
         {"a simple value", plain.c_str(), {{"x", "v"}}, "<Order><e>v</e></Order>"},
         {"zero is written here", plain.c_str(), {{"x", 0}}, "<Order><e>0</e></Order>"},
         {"the null marker is not", plain.c_str(), {{"x", qx::Null::marker()}}, "<Order></Order>"},
-        {"an object under its class's name", plain.c_str(), {{"x", address}},
+        {"an object under its class's name",
+         plain.c_str(),
+         {{"x", address}},
          R"(<Order><adr xmlns="urn:a" street="s"></adr></Order>)"},
-        {"an object of a declared class under the field's", typed.c_str(), {{"x", address}},
+        {"an object of a declared class under the field's",
+         typed.c_str(),
+         {{"x", address}},
          R"(<Order><to xmlns="urn:a" street="s"></to></Order>)"},
-        {"a declared class that is not mapped", unmapped.c_str(), {{"x", "v"}},
+        {"a declared class that is not mapped",
+         unmapped.c_str(),
+         {{"x", "v"}},
          "-207: No mapping for class: Nowhere (Invalid XML)"},
-        {"text where an object is declared", typed.c_str(), {{"x", "v"}},
+        {"text where an object is declared",
+         typed.c_str(),
+         {{"x", "v"}},
          "-211: No mapping definition for class: <string> (Invalid XML)"},
         {"a flattened object", flat.c_str(), {{"x", address}}, R"(<Order street="s"></Order>)"},
-        {"no flattened object", flat.c_str(), {},
+        {"no flattened object",
+         flat.c_str(),
+         {},
          "-211: No class name for marshalling defined: QXGenericRecord (Invalid XML)"},
         {"a required number without a value", number.c_str(), {}, "<Order><x>0</x></Order>"},
     });
@@ -128,14 +138,20 @@ TEST(Marshal, WritesTextOverWhatStoodThereAndAutomaticFieldsAsAttributes) {
     const std::string flat = field("container='false'", "name='n'");
     const Value address(record("Address", {{"street", "s"}}));
     run({
-        {"children go, attributes stay", text.c_str(), {{"a", "1"}, {"e", "2"}, {"x", "3"}},
+        {"children go, attributes stay",
+         text.c_str(),
+         {{"a", "1"}, {"e", "2"}, {"x", "3"}},
          R"(<Order a="1">3</Order>)"},
         {"a simple value", automatic.c_str(), {{"x", "v"}}, R"(<Order n="v"></Order>)"},
         {"an optional zero", automatic.c_str(), {{"x", 0}}, "<Order></Order>"},
         {"a required empty text", required.c_str(), {{"x", ""}}, R"(<Order n=""></Order>)"},
-        {"an object", automatic.c_str(), {{"x", address}},
+        {"an object",
+         automatic.c_str(),
+         {{"x", address}},
          R"(<Order><adr xmlns="urn:a" street="s"></adr></Order>)"},
-        {"an object's children without its attributes", flat.c_str(), {{"x", address}},
+        {"an object's children without its attributes",
+         flat.c_str(),
+         {{"x", address}},
          "<Order></Order>"},
     });
 }
@@ -151,22 +167,38 @@ TEST(Marshal, WritesArraysWithOrWithoutAWrapper) {
     const Value two(lines({"1", "2"}));
     const Value bad(qx::make<qx::Array>(std::initializer_list<Value>{record("Who")}));
     run({
-        {"a declared class under the item name", typed.c_str(), {{"x", two}},
+        {"a declared class under the item name",
+         typed.c_str(),
+         {{"x", two}},
          "<Order><item>1</item><item>2</item></Order>"},
-        {"a location", located.c_str(), {{"x", two}},
+        {"a location",
+         located.c_str(),
+         {{"x", two}},
          "<Order><items><item>1</item><item>2</item></items></Order>"},
-        {"a mapped item name", named.c_str(), {{"x", two}},
+        {"a mapped item name",
+         named.c_str(),
+         {{"x", two}},
          "<Order><line>1</line><line>2</line></Order>"},
-        {"any other name is a wrapper", wrapped.c_str(), {{"x", two}},
+        {"any other name is a wrapper",
+         wrapped.c_str(),
+         {{"x", two}},
          "<Order><all><line>1</line><line>2</line></all></Order>"},
-        {"no name at all falls back on the class's", nameless.c_str(), {{"x", two}},
+        {"no name at all falls back on the class's",
+         nameless.c_str(),
+         {{"x", two}},
          "<Order><Line>1</Line><Line>2</Line></Order>"},
         {"an optional empty array", wrapped.c_str(), {{"x", lines({})}}, "<Order></Order>"},
-        {"a required empty array", required.c_str(), {{"x", lines({})}},
+        {"a required empty array",
+         required.c_str(),
+         {{"x", lines({})}},
          "<Order><all></all></Order>"},
-        {"a class that is not mapped", undeclared.c_str(), {{"x", two}},
+        {"a class that is not mapped",
+         undeclared.c_str(),
+         {{"x", two}},
          "-207: No mapping for declared class: Nowhere (Invalid XML)"},
-        {"an item without a mapping", wrapped.c_str(), {{"x", bad}},
+        {"an item without a mapping",
+         wrapped.c_str(),
+         {{"x", bad}},
          "-211: No mapping definition for class: Who (Invalid XML)"},
     });
 }
@@ -176,19 +208,20 @@ TEST(Marshal, WritesHostItemsOnlyWhenTheySayThatTheyCannotBeRemoved) {
         qx::String classNameForMarshalling() const override { return "Item"; }
         Value valueForUndefinedKey(qx::Key) const override { return {}; }
     };
-    const auto marshaller = scenario::marshaller(
-        "<class name='Order'>" + field("", "name='all'") + "</class><class name='Item'/>");
+    const auto marshaller = scenario::marshaller("<class name='Order'>" + field("", "name='all'") +
+                                                 "</class><class name='Item'/>");
     const auto items = qx::make<qx::Array>(std::initializer_list<Value>{qx::make<Silent>()});
     EXPECT_EQ(scenario::write(*marshaller, record("Order", {{"x", items}})),
               "<Order><all></all></Order>");
 }
 
 TEST(Marshal, OrdersAncestorsFieldsBySelfFirst) {
-    const std::string base = "<class name='A'><field name='a'><bind-xml node='element'/></field>"
-                             "</class><class name='B' extends='A' %><field name='b'>"
-                             "<bind-xml node='element'/></field></class>"
-                             "<class name='C' extends='B'><field name='c'><bind-xml node='element'/>"
-                             "</field></class>";
+    const std::string base =
+        "<class name='A'><field name='a'><bind-xml node='element'/></field>"
+        "</class><class name='B' extends='A' %><field name='b'>"
+        "<bind-xml node='element'/></field></class>"
+        "<class name='C' extends='B'><field name='c'><bind-xml node='element'/>"
+        "</field></class>";
     const auto object = record("C", {{"a", "1"}, {"b", "2"}, {"c", "3"}});
     for (const auto& [selfFirst, expected] :
          {std::pair{"", "<C><a>1</a><b>2</b><c>3</c></C>"},
@@ -217,8 +250,8 @@ TEST(Marshal, RefusesWhatNoMappingDescribes) {
 }
 
 TEST(Marshal, EndsAtTheDepthLimitForObjectsThatContainThemselves) {
-    const auto marshaller = scenario::marshaller(
-        "<class name='Node'>" + field("", "node='element'") + "</class>");
+    const auto marshaller =
+        scenario::marshaller("<class name='Node'>" + field("", "node='element'") + "</class>");
     const auto node = record("Node");
     node->setValueForKey(node, "x");
     EXPECT_EQ(scenario::write(*marshaller, node),
@@ -229,8 +262,9 @@ TEST(Marshal, EndsAtTheDepthLimitForObjectsThatContainThemselves) {
 }
 
 TEST(Marshal, DeclaresNamespacesUnlessToldNotTo) {
-    const char* mapping = "<class name='A'><map-to xml='a' ns-uri='urn:x'/></class>"
-                          "<class name='B'><map-to xml='p:b' ns-uri='urn:x' ns-prefix='p'/></class>";
+    const char* mapping =
+        "<class name='A'><map-to xml='a' ns-uri='urn:x'/></class>"
+        "<class name='B'><map-to xml='p:b' ns-uri='urn:x' ns-prefix='p'/></class>";
     const auto with = scenario::marshaller(mapping);
     EXPECT_EQ(scenario::write(*with, record("A")), R"(<a xmlns="urn:x"></a>)");
     EXPECT_EQ(scenario::write(*with, record("B")), R"(<p:b xmlns:p="urn:x"></p:b>)");

@@ -19,14 +19,14 @@ struct Case {
 
 constexpr Case values[] = {
     {"an attribute goes under the field's name",
-     "<class name='Order'><field name='title'><bind-xml name='t' node='attribute'/></field></class>",
+     "<class name='Order'><field name='title'><bind-xml name='t' "
+     "node='attribute'/></field></class>",
      "<order t='x'/>", usual, R"(Order{title: "x"})"},
     {"without a bind name the attribute has the field's name",
      "<class name='Order'><field name='title'><bind-xml node='ATTRIBUTE'/></field></class>",
      "<order title=''/>", usual, R"(Order{title: ""})"},
-    {"a field without a binding binds nothing",
-     "<class name='Order'><field name='title'/></class>", "<order title='x'/>", discard,
-     "Order{}"},
+    {"a field without a binding binds nothing", "<class name='Order'><field name='title'/></class>",
+     "<order title='x'/>", discard, "Order{}"},
     {"the first alternative whose attribute is there wins",
      "<class name='Order'><field name='title'><bind-xml name='a' node='attribute'/>"
      "<alt-xml name='b'/><alt-xml name='c'/></field></class>",
@@ -95,7 +95,8 @@ constexpr Case values[] = {
      "<order><b/><b/></order>", usual,
      "-210: Too many children with name: b in element: <order><b></b><b></b></order> "
      "(Invalid XML)"},
-    {"empty text is not set", "<class name='Order'><field name='text'><bind-xml node='text'/></field></class>",
+    {"empty text is not set",
+     "<class name='Order'><field name='text'><bind-xml node='text'/></field></class>",
      "<order><b/></order>", discard, "Order{}"},
     {"required text is missed by the field's name",
      "<class name='Order'><field name='text' required='true'><bind-xml node='text'/></field>"
@@ -106,7 +107,8 @@ constexpr Case values[] = {
 
 constexpr Case elements[] = {
     {"a child without a class gives its text",
-     "<class name='Order'><field name='count' type='int'><bind-xml name='n' node='element'/></field>"
+     "<class name='Order'><field name='count' type='int'><bind-xml name='n' "
+     "node='element'/></field>"
      "</class>",
      "<order><n>12</n></order>", strict | discard, "Order{count: 12}"},
     {"the alternative that is there is the one that counts",
@@ -172,12 +174,14 @@ constexpr Case flattened[] = {
     {"a flattened object keeps what is left of its parent as its own unknown XML",
      "<class name='Order'><field name='address' type='Address' container='false'>"
      "<bind-xml node='element'/></field><field name='title'><bind-xml node='element'/></field>"
-     "</class><class name='Address'><field name='street'><bind-xml node='element'/></field></class>",
+     "</class><class name='Address'><field name='street'><bind-xml "
+     "node='element'/></field></class>",
      "<order><street>1</street><title>t</title></order>", usual,
      R"(Order{address: Address{street: "1", unboundChildren: {title: [<title>t</title>]}}, title: "t"})"},
     {"a flattened class with a flattened field works on a copy of its own",
      "<class name='Order'><field name='address' type='Address' container='false'>"
-     "<bind-xml node='element'/></field><field name='city'><bind-xml node='element'/></field></class>"
+     "<bind-xml node='element'/></field><field name='city'><bind-xml "
+     "node='element'/></field></class>"
      "<class name='Address'><field name='street'><bind-xml node='element'/></field>"
      "<field name='owner' type='Owner' container='false'><bind-xml node='element'/></field></class>"
      "<class name='Owner'><field name='city'><bind-xml node='element'/></field></class>",
@@ -186,20 +190,17 @@ constexpr Case flattened[] = {
     {"a field that flattens its own class is refused",
      "<class name='Order'><field name='base' type='Order' container='false'>"
      "<bind-xml node='element'/></field></class>",
-     "<order/>", usual,
-     "-211: No definition to handle element: <order></order> (Invalid Mapping)"},
+     "<order/>", usual, "-211: No definition to handle element: <order></order> (Invalid Mapping)"},
     {"so is one that leads back over another class",
      "<class name='Order'><field name='address' type='Address' container='false'>"
      "<bind-xml node='element'/></field></class>"
      "<class name='Address'><field name='owner' type='Order' container='false'>"
      "<bind-xml node='element'/></field></class>",
-     "<order/>", usual,
-     "-211: No definition to handle element: <order></order> (Invalid Mapping)"},
+     "<order/>", usual, "-211: No definition to handle element: <order></order> (Invalid Mapping)"},
     {"and one whose type names no class, by way of the element's own",
      "<class name='Order'><field name='address' type='Nowhere' container='false'>"
      "<bind-xml node='element'/></field></class>",
-     "<order/>", usual,
-     "-211: No definition to handle element: <order></order> (Invalid Mapping)"},
+     "<order/>", usual, "-211: No definition to handle element: <order></order> (Invalid Mapping)"},
 };
 
 constexpr const char* lineClass =
@@ -243,7 +244,8 @@ constexpr Case collections[] = {
      "<order><line>1</line><line>2</line></order>", usual,
      R"(Order{lines: [Line{text: "1"}, Line{text: "2"}], unboundChildren: {line: [<line>1</line>, <line>2</line>]}})"},
     {"under any other name stands a wrapper, the last of several",
-     "<class name='Order'><field name='lines' collection='collection'><bind-xml name='all'/></field>"
+     "<class name='Order'><field name='lines' collection='collection'><bind-xml "
+     "name='all'/></field>"
      "</class>",
      "<order><all><line>0</line></all><all><line>1</line></all></order>", discard,
      R"(Order{lines: [Line{text: "1"}]})"},
@@ -285,15 +287,14 @@ constexpr Case wholes[] = {
     {"and an error to a strict one", "<class name='Order'/>", "<other/>", strict,
      "-211: No definition to handle element: <other></other> (Invalid Mapping)"},
     {"a prefix is part of the name", "<class name='Order'><map-to xml='x:order'/></class>",
-     "<x:order xmlns:x='urn:x'/>", usual,
-     R"(Order{__namespaces: [xmlns:x="urn:x"]})"},
+     "<x:order xmlns:x='urn:x'/>", usual, R"(Order{__namespaces: [xmlns:x="urn:x"]})"},
     {"unknown children and attributes are kept as they stand",
      "<class name='Order'><field name='title'><bind-xml node='attribute'/></field></class>",
      "<order title='t' a='1' b='2'><note>n</note><!--c--><note/>text<?pi x?></order>", strict,
      R"(Order{title: "t", unboundAttributes: [a="1", b="2"], )"
      R"(unboundChildren: {note: [<note>n</note>, <note></note>], pi: []}})"},
-    {"unknown children fail before unknown attributes",
-     "<class name='Order'/>", "<order a='1'><note/><note/></order>", strict | discard,
+    {"unknown children fail before unknown attributes", "<class name='Order'/>",
+     "<order a='1'><note/><note/></order>", strict | discard,
      "-214: Unknown fields found in XML document: (note [2]) element: order (Invalid XML)"},
     {"unknown attributes fail", "<class name='Order'/>", "<order a='1' b='1'/>", strict | discard,
      "-215: Unknown attributes found in XML document: (a [1], b [1]) element: order "
@@ -326,18 +327,8 @@ void runOnRecordsAndHosts(const Table& table) {
 
 } // namespace
 
-TEST(Unmarshal, BindsAttributesAndText) {
-    runOnRecordsAndHosts(values);
-}
-TEST(Unmarshal, BindsChildElements) {
-    runOnRecordsAndHosts(elements);
-}
-TEST(Unmarshal, FlattensObjects) {
-    runOnRecordsAndHosts(flattened);
-}
-TEST(Unmarshal, BindsCollections) {
-    runOnRecordsAndHosts(collections);
-}
-TEST(Unmarshal, BindsWholeObjects) {
-    runOnRecordsAndHosts(wholes);
-}
+TEST(Unmarshal, BindsAttributesAndText) { runOnRecordsAndHosts(values); }
+TEST(Unmarshal, BindsChildElements) { runOnRecordsAndHosts(elements); }
+TEST(Unmarshal, FlattensObjects) { runOnRecordsAndHosts(flattened); }
+TEST(Unmarshal, BindsCollections) { runOnRecordsAndHosts(collections); }
+TEST(Unmarshal, BindsWholeObjects) { runOnRecordsAndHosts(wholes); }

@@ -57,12 +57,17 @@ std::string showArray(const qx::Array& array) {
 
 std::string show(const qx::Value& value) {
     switch (value.kind()) {
-    case qx::Value::Kind::null: return "null";
-    case qx::Value::Kind::boolean: return value.boolValue() ? "true" : "false";
-    case qx::Value::Kind::string: return "\"" + value.string().str() + "\"";
+    case qx::Value::Kind::null:
+        return "null";
+    case qx::Value::Kind::boolean:
+        return value.boolValue() ? "true" : "false";
+    case qx::Value::Kind::string:
+        return "\"" + value.string().str() + "\"";
     case qx::Value::Kind::integer:
-    case qx::Value::Kind::real: return value.description().str();
-    case qx::Value::Kind::object: break;
+    case qx::Value::Kind::real:
+        return value.description().str();
+    case qx::Value::Kind::object:
+        break;
     }
     const qx::Object& object = *value.object();
     if (const auto* array = dynamic_cast<const qx::Array*>(&object))

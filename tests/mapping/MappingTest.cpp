@@ -1,0 +1,220 @@
+// Mapping documents are read into nodes, refused with exact errors, and printed.
+
+#include <QXXMLMarshalling/QXXMLDocumentMapping.h>
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include <gtest/gtest.h>
+
+#include <regex>
+
+namespace {
+
+using qx::Error;
+using qx::Ref;
+using qx::String;
+
+Ref<qx::XMLDocument> parsed(std::string_view xml) {
+    Ref<Error> error;
+    auto document = qx::XMLDocument::initWithData(xml, {}, &error);
+    EXPECT_TRUE(document) << error->description().view();
+    return document;
+}
+
+Ref<QXXMLDocumentMapping> mapping(std::string_view content, Ref<Error>* error = nullptr) {
+    const auto document = parsed("<mapping>" + std::string(content) + "</mapping>");
+    return QXXMLDocumentMapping::initWithXML(document->rootElement(), error);
+}
+
+// The only field of the only class.
+Ref<QXXMLFieldMapping> field(std::string_view xml) {
+    const auto document = mapping("<class name='C'>" + std::string(xml) + "</class>");
+    return document->classMappings().at(0)->fields().at(0);
+}
+
+std::string withoutAddresses(const String& text) {
+    return std::regex_replace(text.str(), std::regex(": 0x[0-9a-f]+"), "");
+}
+
+} // namespace
+
+TEST(Mapping, RefusesFaultyDocumentsWithTheFirstFault) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"<description/><description/>",
+         "-200: Too many descriptions in element: "
+         "<mapping><description></description><description></description></mapping>"},
+        {"<class/>", "-202: Required attribute: name not found in element: <class></class>"},
+        {"<class name='A'/><class name='B'/><class type='C'/><class/>",
+         "-202: Required attribute: name not found in element: <class type=\"C\"></class>"},
+        {"<class name='A' self-first='yes'><map-to/><map-to/></class>",
+         "-203: Boolean attribute: self-first has an illegal value: yes"},
+        {"<class name='A'><field/><map-to/><map-to/></class>",
+         "-201: Too many map-to elements in element: <class name=\"A\"><field></field>"
+         "<map-to></map-to><map-to></map-to></class>"},
+        {"<class name='A'><field lazy='no'/></class>",
+         "-202: Required attribute: name not found in element: <field lazy=\"no\"></field>"},
+        {"<class name='A'><field name='f' lazy=' true' direct='1'/></class>",
+         "-203: Boolean attribute: lazy has an illegal value:  true"},
+        {"<class name='A'><field name='f'><bind-xml/><bind-xml/><alt-xml/></field></class>",
+         "-204: Too many bind-xml elements in element: <field name=\"f\"><bind-xml></bind-xml>"
+         "<bind-xml></bind-xml><alt-xml></alt-xml></field>"},
+        {"<class name='A'><field name='f'><alt-xml/></field></class>",
+         "-219: alt-xml defined with no bind-xml elements in element: "
+         "<field name=\"f\"><alt-xml></alt-xml></field>"},
+        {"<class name='A'><field name='f'><bind-xml><class/><class/></bind-xml></field></class>",
+         "-213: Too many class elements in element: "
+         "<bind-xml><class></class><class></class></bind-xml>"},
+        {"<class name='A'><field name='f'><bind-xml><class/></bind-xml></field></class>",
+         "-202: Required attribute: name not found in element: <class></class>"},
+        {"<class name='A'><field name='f'><bind-xml/><alt-xml><description/><description/>"
+         "</alt-xml></field></class>",
+         "-200: Too many descriptions in element: "
+         "<alt-xml><description></description><description></description></alt-xml>"},
+    };
+    for (const auto& [content, expected] : cases) {
+        Ref<Error> error;
+        EXPECT_FALSE(mapping(content, &error)) << content;
+        ASSERT_TRUE(error) << content;
+        EXPECT_EQ(std::to_string(error->code()) + ": " + error->localizedDescription().str(),
+                  expected);
+        EXPECT_EQ(error->localizedFailureReason(), "Invalid XML");
+        EXPECT_FALSE(mapping(content)) << "without a slot: " << content;
+    }
+}
+
+TEST(Mapping, ReadsIncludesAndClassesInOrder) {
+    const auto document = mapping("<include href='b'/><class name='A'/><include/><other/>"
+                                  "<include href='b'/><class name='B'/><include href=''/>");
+    EXPECT_EQ(document->includes(), (std::vector<String>{"b", "b", ""}));
+    ASSERT_EQ(document->classMappings().size(), 2U);
+    EXPECT_EQ(document->classMappings()[1]->className(), "B");
+}
+
+TEST(Mapping, TellsAbsentAttributesFromEmptyOnes) {
+    const auto document =
+        mapping("<class name='A'/><class name='B' type=''><map-to xml=''/></class>");
+    const auto& bare = *document->classMappings()[0];
+    EXPECT_TRUE(bare.mapTo().isNull() && bare.extends().isNull() && bare.type().isNull());
+    EXPECT_EQ(bare.classNameToInstantiate(), "A");
+    const auto& empty = *document->classMappings()[1];
+    EXPECT_EQ(empty.mapTo(), "");
+    EXPECT_EQ(empty.classNameToInstantiate(), "") << "a type that is there counts, even if empty";
+}
+
+TEST(Mapping, DefaultsFieldFlagsToFalseButContainer) {
+    const auto plain = field("<field name='f'/>");
+    EXPECT_TRUE(plain->isContainer());
+    EXPECT_FALSE(plain->isRequired() || plain->isDirect() || plain->isLazy() ||
+                 plain->isTransient());
+    const auto turned =
+        field("<field name='f' container='FALSE' required='True' transient='tRuE'/>");
+    EXPECT_FALSE(turned->isContainer());
+    EXPECT_TRUE(turned->isRequired() && turned->isTransient());
+}
+
+TEST(Mapping, KnowsTheNodeKindByItsWord) {
+    const std::pair<const char*, QXXMLNodeType> cases[] = {
+        {"<bind-xml node='Element'/>", QXXMLNodeTypeElement},
+        {"<bind-xml node='ATTRIBUTE'/>", QXXMLNodeTypeAttribute},
+        {"<bind-xml node='text'/>", QXXMLNodeTypeText},
+        {"<bind-xml node='elements'/>", QXXMLNodeTypeUnknown},
+        {"<bind-xml/>", QXXMLNodeTypeUnknown},
+        {"", QXXMLNodeTypeAttribute},
+    };
+    for (const auto& [binding, expected] : cases)
+        EXPECT_EQ(field("<field name='f'>" + std::string(binding) + "</field>")->nodeType(),
+                  expected)
+            << binding;
+}
+
+TEST(Mapping, ReadsOnlyNameAndLocationOfAlternatives) {
+    const auto mapped = field("<field name='f'><bind-xml name='a'/><alt-xml name='b' location='l' "
+                              "node='text' type='t'><class/><class/></alt-xml><alt-xml/></field>");
+    ASSERT_EQ(mapped->bindToMappings().size(), 3U);
+    EXPECT_EQ(mapped->bindToMappings()[0].get(), mapped->bindToMapping());
+    const auto& alternative = *mapped->bindToMappings()[1];
+    EXPECT_EQ(alternative.bindTo(), "b");
+    EXPECT_EQ(alternative.location(), "l");
+    EXPECT_TRUE(alternative.node().isNull() && alternative.type().isNull());
+    EXPECT_TRUE(field("<field name='f'/>")->bindToMappings().empty());
+}
+
+TEST(Mapping, KeepsNoFieldsClassAlive) {
+    Ref<QXXMLFieldMapping> kept;
+    {
+        const auto document = mapping("<class name='C'><field name='f'/></class>");
+        kept = document->classMappings()[0]->fields()[0];
+        EXPECT_EQ(kept->classMapping(), document->classMappings()[0]);
+    }
+    EXPECT_FALSE(kept->classMapping());
+}
+
+TEST(Mapping, CopiesClassesWithTheirVeryFields) {
+    const auto document = mapping("<class name='C' self-first='true'><description>d</description>"
+                                  "<map-to xml='c'/><field name='f'/></class>");
+    const auto original = document->classMappings()[0];
+    original->setMapTo("other");
+    const auto copy = original->copyWithZone().as<QXXMLClassMapping>();
+    EXPECT_EQ(copy->mapTo(), "other");
+    EXPECT_TRUE(copy->isSelfFirst());
+    EXPECT_EQ(copy->mappingDescription(), "d");
+    EXPECT_EQ(copy->fields(), original->fields());
+    EXPECT_EQ(copy->fields()[0]->classMapping(), original);
+}
+
+TEST(Mapping, GivesNoCopyOnceTheElementIsFaulty) {
+    const auto source = parsed("<field name='f'/>");
+    const auto original = QXXMLFieldMapping::initWithXML(source->rootElement());
+    EXPECT_FALSE(original->copyWithZone().as<QXXMLFieldMapping>()->classMapping());
+    source->rootElement()->removeAttributeForName("name");
+    EXPECT_FALSE(original->copyWithZone());
+}
+
+TEST(Mapping, MergesClassesAndNothingElse) {
+    const auto first = mapping("<include href='i'/><class name='A'/>");
+    const auto second = mapping("<include href='j'/><class name='B'/><class name='C'/>");
+    first->mergeDocumentMapping(second.get());
+    first->mergeDocumentMapping(nullptr);
+    ASSERT_EQ(first->classMappings().size(), 3U);
+    EXPECT_EQ(first->classMappings()[2], second->classMappings()[1]);
+    EXPECT_EQ(first->includes().size(), 1U);
+    first->mergeDocumentMapping(first.get());
+    EXPECT_EQ(first->classMappings().size(), 6U);
+}
+
+TEST(Mapping, TakesNoElementForAnEmptyOne) {
+    const auto document = QXXMLDocumentMapping::initWithXML(nullptr);
+    EXPECT_TRUE(document->classMappings().empty() && document->includes().empty());
+    EXPECT_FALSE(QXXMLClassMapping::initWithXML(nullptr));
+}
+
+TEST(Mapping, PrintsWhatIsThere) {
+    const auto document = mapping(
+        "<description>all</description><include href='i'/>"
+        "<class name='C' extends='B' type='T' auto-complete='true'><description/>"
+        "<map-to xml='c' ns-uri='u' ns-prefix='p'/>"
+        "<field name='f' type='t' handler='h' get-method='g' set-method='s' create-method='m' "
+        "collection='set' required='true' direct='true' lazy='true' transient='true'>"
+        "<bind-xml name='n' type='t' node='text' location='l' references='r' matches='m' "
+        "QName-prefix='q' auto-naming='a'><class name='N'/></bind-xml><alt-xml name='x'/></field>"
+        "</class>");
+    EXPECT_EQ(withoutAddresses(document->description()),
+              "<QXXMLDocumentMapping> description: all includes:\n"
+              "(\n"
+              "    i\n"
+              ") classes:\n"
+              "(\n"
+              "    <QXXMLClassMapping> class: C map-to: c ns-prefix: p ns-uri: u extends: B type: T"
+              " fields:\n"
+              "    (\n"
+              "        <QXXMLFieldMapping> name: f type: t handler: h get-method: g set-method: s"
+              " create-method: m collection: set required: true direct: true lazy: true"
+              " container: true transient: true bindTo:\n"
+              "        (\n"
+              "            <QXXMLBindToMapping> bindTo: n type: t node: text location: l"
+              " references: r matches: m QName-prefix: q auto-naming: a childClassMapping:\n"
+              "<QXXMLClassMapping> class: N,\n"
+              "            <QXXMLBindToMapping> bindTo: x\n"
+              "        )\n"
+              "    )\n"
+              ")");
+}
