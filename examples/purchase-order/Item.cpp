@@ -1,0 +1,39 @@
+#include "Item.h"
+
+#include <charconv>
+
+std::string Money::text() const {
+    std::string text = std::to_string(cents < 0 ? -cents : cents);
+    if (text.size() < 3)
+        text.insert(0, 3 - text.size(), '0');
+    text.insert(text.size() - 2, ".");
+    return cents < 0 ? "-" + text : text;
+}
+
+bool Money::parse(std::string_view text, Money& result) {
+    const std::size_t point = text.find('.');
+    if (point == text.npos || text.size() - point != 3)
+        return false;
+    std::string digits(text);
+    digits.erase(point, 1);
+    std::int64_t cents = 0;
+    const char* end = digits.data() + digits.size();
+    const auto [stop, problem] = std::from_chars(digits.data(), end, cents);
+    if (problem != std::errc() || stop != end)
+        return false;
+    result.cents = cents;
+    return true;
+}
+
+void registerItem() {
+    qx::Class::define<Item>("Item")
+        .property<&Item::article>("article")
+        .property<&Item::name>("name")
+        .property<&Item::quantity>("quantity")
+        .property<&Item::gift>("gift")
+        .property<&Item::price>("price")
+        .property<&Item::unboundChildren>("unboundChildren")
+        .property<&Item::unboundAttributes>("unboundAttributes")
+        .property<&Item::namespaces>("__namespaces")
+        .operation<&Item::isRemovable>("isRemovable");
+}
