@@ -36,8 +36,8 @@ public:
     static const qx::Class& classObject();
 
     // A new record of the same class with the same class name and flag, and a copy of the contents:
-    // a deep one where the host has installed one (qx::Dictionary::setDeepCopyFunction), else one that
-    // shares the values. It has no undo manager.
+    // a deep one where the host has installed one (qx::Dictionary::setDeepCopyFunction), else one
+    // that shares the values. It has no undo manager.
     virtual qx::Ref<QXGenericRecord> copyWithZone() const;
 
     // The value under the key as a T; none when there is no value or T does not take it.
@@ -87,8 +87,8 @@ public:
     bool isUndoRegistrationEnabledForKey(qx::Key key);
 
     // Have the operation, which takes the change dictionary (Observation.h), called on this record
-    // at each change of the value at the key path. The collection is an array or a dictionary, whose
-    // values count.
+    // at each change of the value at the key path. The collection is an array or a dictionary,
+    // whose values count.
     void observeObject(qx::Object& object, const qx::String& keyPath, qx::Selector selector);
     void observeObjects(const qx::Object& collection, const qx::String& keyPath,
                         qx::Selector selector);

@@ -9,8 +9,8 @@
 //     marshaller->writeFile(order, "order.xml", &error);
 //
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
-// One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++ setters
-// of host classes throw passes through every operation here.
+// One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
+// setters of host classes throw passes through every operation here.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/platform/Array.h>
@@ -22,8 +22,8 @@
 class QX_API QXXMLMarshaller : public qx::Object {
 public:
     // Never fails; a null mapping counts as one that holds no class.
-    static qx::Ref<QXXMLMarshaller>
-    initWithMapping(qx::Ref<QXXMLMarshallingMapping> mapping, qx::Ref<qx::Error>* error = nullptr);
+    static qx::Ref<QXXMLMarshaller> initWithMapping(qx::Ref<QXXMLMarshallingMapping> mapping,
+                                                    qx::Ref<qx::Error>* error = nullptr);
     // Null with the error of QXXMLMarshallingMapping::initWithDocument.
     static qx::Ref<QXXMLMarshaller> initWithMappingXML(qx::XMLDocument* document,
                                                        qx::Ref<qx::Error>* error = nullptr);
@@ -63,8 +63,7 @@ public:
     qx::Ref<qx::XMLDocument> marshall(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
     // The object built from the document's root element; null on failure, and without an error when
     // a lenient marshaller finds no class for the root element. See unmarshallElement.
-    qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document,
-                                   qx::Ref<qx::Error>* error = nullptr);
+    qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, qx::Ref<qx::Error>* error = nullptr);
     template <class T>
     qx::Ref<qx::Object> unmarshall(const qx::Ref<T>& document,
                                    qx::Ref<qx::Error>* error = nullptr) {
@@ -141,8 +140,7 @@ public:
     //   -220  "Too many elements defined for field: %@ in element: %@"
     bool bindFieldAsAttribute(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
                               qx::XMLElement& element, qx::CountedSet& boundFields,
-                              qx::CountedSet& boundAttributes,
-                              qx::Ref<qx::Error>* error = nullptr);
+                              qx::CountedSet& boundAttributes, qx::Ref<qx::Error>* error = nullptr);
     //   -202  "Required text missing for field: %@ in element: %@"
     //   -210  "Too many children with name: %@ in element: %@"
     bool bindFieldAsText(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
@@ -161,8 +159,7 @@ public:
     //   -207  "No mapping for class: %@"
     bool bindArrayFieldByType(const QXXMLFieldMapping& field, qx::Object& object,
                               qx::XMLElement& element, qx::CountedSet& boundFields,
-                              qx::CountedSet& boundAttributes,
-                              qx::Ref<qx::Error>* error = nullptr);
+                              qx::CountedSet& boundAttributes, qx::Ref<qx::Error>* error = nullptr);
     // Compares what the element holds with what was consumed; keeps or refuses the rest.
     //   -214  "Unknown fields found in XML document: %@ element: %@"
     //   -215  "Unknown attributes found in XML document: %@ element: %@"

@@ -16,7 +16,8 @@ class MappingPlan;
 
 class QX_API QXXMLMarshallingMapping final : public qx::Object {
 public:
-    // Null with the error of the mapping document (see QXXMLDocumentMapping), of an included one, or
+    // Null with the error of the mapping document (see QXXMLDocumentMapping), of an included one,
+    // or
     //   -205  "Class redefined: %@"
     //   -205  "Element redefined: %@ class: %@"
     //   -218  "Unable to load included file: %@"   (an include that leads back to itself, too)
