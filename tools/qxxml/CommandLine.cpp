@@ -1,0 +1,145 @@
+#include "qxxml/CommandLine.h"
+
+#include "qxxml/Commands.h"
+
+#include <CLI/CLI.hpp>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <functional>
+#include <new>
+#include <sstream>
+
+namespace qxxml {
+
+namespace {
+
+using Command = std::string (*)(const Options&);
+
+constexpr int failed = 1;
+constexpr int wrongUsage = 2;
+
+// Standard error may be gone as well: there is nobody left to tell.
+int fail(const std::string& message) {
+    std::fputs(("qxxml: error " + message + "\n").c_str(), stderr);
+    return failed;
+}
+
+// Output that did not arrive whole is a failure; some of it only shows when it is flushed.
+int print(const std::string& text) {
+    errno = 0;
+    const bool written = std::fwrite(text.data(), 1, text.size(), stdout) == text.size();
+    if (written && std::fflush(stdout) == 0)
+        return 0;
+    return fail(std::string("512: standard output cannot be written: ") + std::strerror(errno));
+}
+
+// What is wrong with the value of --application; nothing when it is empty.
+std::string checkApplication(const std::string& application) {
+    const std::size_t slash = application.find('/');
+    const std::string name = application.substr(0, slash);
+    if (name.empty() || name == "." || name == "..")
+        return "an application's name is a file name, not \"" + name + "\"";
+    if (slash == std::string::npos)
+        return {};
+    const std::string version = application.substr(slash + 1);
+    if (version.empty() || version.find('/') != std::string::npos)
+        return "NAME or NAME/VERSION is expected, not \"" + application + "\"";
+    return {};
+}
+
+void addSearch(CLI::App& command, Options& options) {
+    command
+        .add_option("--search-path", options.searchPaths,
+                    "Look in this folder before the usual places; may be given more than once")
+        ->option_text("DIR")
+        ->allow_extra_args(false);
+    command
+        .add_option("--application", options.application,
+                    "Look in the places of this application, for this version of it")
+        ->option_text("NAME[/VERSION]")
+        ->check(CLI::Validator(checkApplication, ""));
+}
+
+void addMapping(CLI::App& command, Options& options) {
+    command.add_option("MAPPING", options.mapping, "The path of a mapping document")
+        ->option_text(" ")
+        ->required();
+}
+
+void addReading(CLI::App& command, Options& options) {
+    addMapping(command, options);
+    command.add_option("DOCUMENT", options.document, "The path of a document; - is standard input")
+        ->option_text(" ")
+        ->required();
+    command.add_flag("--strict", options.strict, "Fail at XML that the mapping does not describe");
+    command.add_flag("--discard-unknown", options.discardUnknown,
+                     "Do not keep XML that the mapping does not describe");
+    command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
+                     "Do not write namespace declarations");
+    command.add_flag("--keep-white-space", options.keepWhiteSpace,
+                     "Keep the white space between elements");
+}
+
+// Defines the commands; the one that was called is left in `chosen`.
+void define(CLI::App& tool, Options& options, Command& chosen) {
+    tool.require_subcommand(1);
+    tool.set_version_flag("--version", "qxxml " QX_VERSION, "Print the version and exit");
+    const auto add = [&](const char* name, const char* purpose, Command command) {
+        CLI::App* const added = tool.add_subcommand(name, purpose);
+        added->callback([&chosen, command] { chosen = command; });
+        return added;
+    };
+    CLI::App* command =
+        add("describe", "Resolve a mapping with its includes and print its description", describe);
+    addMapping(*command, options);
+    addSearch(*command, options);
+
+    command = add("read", "Read a document into an object and print it as JSON", read);
+    addReading(*command, options);
+    addSearch(*command, options);
+
+    command = add("roundtrip", "Read a document, write its object and print that", roundtrip);
+    addReading(*command, options);
+    command->add_flag("--pretty", options.pretty, "Print one element a line");
+    addSearch(*command, options);
+
+    command =
+        add("where", "Print the file that a name resolves to, and where it was looked for", where);
+    command->add_option("NAME", options.name, "The name of a document, as an include has it")
+        ->option_text(" ")
+        ->required();
+    addSearch(*command, options);
+}
+
+// Help and version are asked for; anything else is wrong usage.
+int endParsing(const CLI::App& tool, const CLI::ParseError& error) {
+    std::ostringstream text;
+    if (tool.exit(error, text, text) == 0)
+        return print(text.str());
+    std::fputs(("qxxml: " + text.str()).c_str(), stderr);
+    return wrongUsage;
+}
+
+} // namespace
+
+int runCommandLine(int argc, const char* const* argv) try {
+    Options options;
+    Command command = nullptr;
+    CLI::App tool("Tries mapping documents on XML documents.", "qxxml");
+    define(tool, options, command);
+    try {
+        tool.parse(argc, argv);
+    } catch (const CLI::ParseError& error) {
+        return endParsing(tool, error);
+    }
+    return print(command(options));
+} catch (const std::bad_alloc&) {
+    std::fputs("qxxml: error: out of memory\n", stderr);
+    return failed;
+} catch (const std::exception& problem) {
+    return fail(problem.what());
+}
+
+} // namespace qxxml

@@ -1,0 +1,19 @@
+#pragma once
+
+// The commands. Each gives the text for standard output, which is printed only once it is whole,
+// and throws Failure, or lets qx::Exception pass, when it cannot.
+
+#include "qxxml/Options.h"
+
+namespace qxxml {
+
+// The resolved mapping's description, without the addresses of objects: the same on every run.
+std::string describe(const Options& options);
+// The document's object as JSON, see Json.h; "null" for a document that no class handles.
+std::string read(const Options& options);
+// The document, read into an object and written from it.
+std::string roundtrip(const Options& options);
+// The path that a name resolves to, and the places that were looked at up to there.
+std::string where(const Options& options);
+
+} // namespace qxxml

@@ -1,0 +1,27 @@
+#pragma once
+
+// What the command line says, whichever command it is for.
+
+#include <string>
+#include <vector>
+
+namespace qxxml {
+
+struct Options {
+    std::string mapping;  // path of the mapping document
+    std::string document; // path of the document; "-" is standard input
+    std::string name;     // what `where` looks for
+
+    bool strict = false;
+    bool discardUnknown = false;
+    bool noNamespaceURIs = false;
+    bool keepWhiteSpace = false;
+    bool pretty = false;
+
+    // Folders that are searched before the usual places, in this order.
+    std::vector<std::string> searchPaths;
+    // NAME or NAME/VERSION; empty for the tool itself.
+    std::string application;
+};
+
+} // namespace qxxml

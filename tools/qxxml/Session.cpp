@@ -1,0 +1,73 @@
+#include "qxxml/Session.h"
+
+#include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
+#include <QXXMLMarshalling/platform/ProcessInfo.h>
+
+#include "qxxml/Failure.h"
+
+#include <iostream>
+
+namespace qxxml {
+
+namespace {
+
+void standFor(const std::string& application) {
+    if (application.empty())
+        return;
+    const std::size_t slash = application.find('/');
+    qx::ProcessInfo::setProcessName(application.substr(0, slash));
+    // What was said is the whole version: no build of a property list comes behind it.
+    if (slash != std::string::npos)
+        qx::ProcessInfo::setProcessVersion(application.substr(slash + 1), "");
+}
+
+std::string folderOf(const std::string& path) {
+    const std::size_t slash = path.rfind('/');
+    if (slash == std::string::npos)
+        return ".";
+    return path.substr(0, slash == 0 ? 1 : slash);
+}
+
+} // namespace
+
+Session::Session(const Options& options) : _options(options) {
+    standFor(options.application);
+    _documents = QXXMLFileSystemDataRepository::init<Documents>();
+    _documents->searchFirst(options.searchPaths);
+    if (!options.mapping.empty())
+        _documents->searchFirst({folderOf(options.mapping)});
+    QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_documents);
+}
+
+qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
+    qx::Ref<qx::Error> error;
+    const auto mapping = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
+    if (!mapping)
+        throw Failure(error, _options.mapping);
+    auto marshaller = QXXMLMarshaller::initWithMappingXML(mapping.get(), &error);
+    if (!marshaller)
+        throw Failure(error, _documents->failedPath());
+    marshaller->setLenient(!_options.strict);
+    marshaller->setSaveUnknownXML(!_options.discardUnknown);
+    marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);
+    return marshaller;
+}
+
+qx::Ref<qx::Object> Session::readObject(QXXMLMarshaller& marshaller) const {
+    const bool isStandardInput = _options.document == "-";
+    const std::string file = isStandardInput ? "<stdin>" : _options.document;
+    qx::XMLParseOptions parsing;
+    parsing.keepWhiteSpace = _options.keepWhiteSpace;
+    qx::Ref<qx::Error> error;
+    const auto document = isStandardInput
+                              ? qx::XMLDocument::initWithStream(std::cin, parsing, &error)
+                              : qx::XMLDocument::initWithContentsOfFile(file, parsing, &error);
+    if (!document)
+        throw Failure(error, file);
+    auto object = marshaller.unmarshall(document, &error);
+    if (error)
+        throw Failure(error, file);
+    return object;
+}
+
+} // namespace qxxml

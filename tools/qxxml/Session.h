@@ -1,0 +1,29 @@
+#pragma once
+
+// One run of the tool: the application that it stands for, the places where documents are looked
+// for, and the marshaller that the options ask for. It sets up the process, so there is one.
+
+#include "qxxml/Documents.h"
+#include "qxxml/Options.h"
+
+#include <QXXMLMarshalling/QXXMLMarshaller.h>
+
+namespace qxxml {
+
+class Session {
+public:
+    // The options must outlive the session.
+    explicit Session(const Options& options);
+
+    Documents& documents() const noexcept { return *_documents; }
+    // Made from the mapping document, whose own folder is searched first for includes.
+    qx::Ref<QXXMLMarshaller> makeMarshaller() const;
+    // The object that the marshaller reads from the document; null where no class handles it.
+    qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
+
+private:
+    const Options& _options;
+    qx::Ref<Documents> _documents;
+};
+
+} // namespace qxxml
