@@ -24,8 +24,9 @@ constexpr std::size_t expansionFactor = 10;
 // The parser compares each default of an element with its other attributes, at each such element.
 constexpr std::size_t maximumAttributeDefaults = 2000;
 
-// What a node costs beside its text, in the account of expansions.
+// What a node and a reference cost beside their text, in the account of expansions.
 constexpr std::size_t nodeCost = 16;
+constexpr std::size_t referenceCost = 32;
 
 std::size_t lengthOf(const xmlChar* text) {
     return text != nullptr ? std::string_view(reinterpret_cast<const char*>(text)).size() : 0;
@@ -242,8 +243,17 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
     _tagOffset = ParseFailure::here;
 }
 
+// White space counts as layout only where it stands in the document itself: not when it comes from
+// a reference. Most pieces are parts of the parser's buffer of the document; the parser hands
+// others out while it stands behind them, or behind the reference.
 void SAXSession::addText(std::string_view piece) {
-    _builder.addText(piece, isWhite(piece) && !isInsideReference());
+    const xmlParserInput& input = *_context->inputTab[0];
+    const auto address = [](const void* pointer) {
+        return reinterpret_cast<std::uintptr_t>(pointer);
+    };
+    const bool isOwn =
+        address(piece.data()) - address(input.base) < address(input.end) - address(input.base);
+    _builder.addText(piece, isWhite(piece) && (isOwn || !isInsideReference()));
 }
 
 xmlEntityPtr SAXSession::entity(const xmlChar* name) {
@@ -258,7 +268,7 @@ xmlEntityPtr SAXSession::entity(const xmlChar* name) {
                                " stands outside of the document and is not read",
                            ParseFailure::notWellFormed};
     }
-    countExpansion(static_cast<std::size_t>(found->length));
+    countExpansion(static_cast<std::size_t>(found->length) + referenceCost);
     return found;
 }
 
@@ -272,7 +282,7 @@ xmlEntityPtr SAXSession::parameterEntity(const xmlChar* name) {
         _context->hasPErefs = 1;
         return nullptr;
     }
-    countExpansion(static_cast<std::size_t>(found->length));
+    countExpansion(static_cast<std::size_t>(found->length) + referenceCost);
     return found;
 }
 

@@ -281,8 +281,10 @@ void XMLSerializer::startLine(const XMLNode& child) {
 }
 
 void XMLSerializer::breakLine(std::size_t depth) {
+    // Deeper than documents are by default, blanks would outgrow all else.
+    constexpr std::size_t deepestIndent = 256;
     _output += '\n';
-    _output.append(depth * 4, ' ');
+    _output.append(std::min(depth, deepestIndent) * 4, ' ');
 }
 
 XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {

@@ -1,0 +1,296 @@
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include <functional>
+#include <gtest/gtest.h>
+
+namespace {
+
+using qx::Ref;
+using qx::XMLDocument;
+using qx::XMLElement;
+using qx::XMLNode;
+using namespace std::string_literals;
+
+std::string repeated(std::string_view text, std::size_t count) {
+    std::string all;
+    all.reserve(text.size() * count);
+    while (count-- > 0)
+        all += text;
+    return all;
+}
+
+// The document as XML, or its error as "line:column code message".
+std::string outcome(std::string_view bytes, const qx::XMLParseOptions& options = {}) {
+    Ref<qx::Error> error;
+    const auto document = XMLDocument::initWithData(bytes, options, &error);
+    if (document)
+        return document->XMLString().str();
+    EXPECT_EQ(error->domain(), qx::Error::parserDomain);
+    return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
+           std::to_string(error->code()) + " " + error->localizedDescription().str();
+}
+
+struct Case {
+    std::string document;
+    std::string expected;
+};
+
+TEST(XMLParser, WhatTheDocumentSaysComesIntoTheTree) {
+    const Case cases[] = {
+        {"<a/>", "<a></a>"},
+        {"<?xml version='1.0' standalone='yes'?>\n<!--c-->\n<a/>\n<?p d?>\n",
+         "<?xml version=\"1.0\" standalone=\"yes\"?><!--c--><a></a><?p d?>"},
+        {"<p:a q:b='1' xmlns='u' xmlns:p='v'/>", "<p:a xmlns=\"u\" xmlns:p=\"v\" q:b=\"1\"></p:a>"},
+        {"<a:b:c/>", "<a:b:c></a:b:c>"},
+        {"<a>x&amp;<![CDATA[<y>]]>&#x7A;</a>", "<a>x&amp;&lt;y&gt;z</a>"},
+        {"<a b='1\n2\t3 &#10;&lt;&quot;'/>", "<a b=\"1 2 3 &#10;&lt;&quot;\"></a>"},
+        {"<a>1\r\n2\r3</a>", "<a>1\n2\n3</a>"},
+        {"\xEF\xBB\xBF<a>\xC3\xA9</a>", "<a>\xC3\xA9</a>"},
+        {"<a>" + repeated("\xC3\xA9", 1000) + "</a>", "<a>" + repeated("\xC3\xA9", 1000) + "</a>"},
+        {"<!DOCTYPE a [<!--d--><?d d?><!ENTITY e 'x<b>y</b>'>]><a>&e;z&e;</a>",
+         "<a>x<b>y</b>zx<b>y</b></a>"},
+        {"<!DOCTYPE a [<!ENTITY i '1'><!ENTITY o '[&i;]'>]><a b='&o;'>&o;</a>",
+         "<a b=\"[1]\">[1]</a>"},
+        {"<!DOCTYPE a [<!ENTITY % p \"<!ENTITY e 'x'>\"> %p;]><a>&e;</a>", "<a>x</a>"},
+        {"<!DOCTYPE a [<!ATTLIST a b CDATA 'd' c (x|y) 'y' xmlns CDATA 'u'>]><a c='x'/>",
+         "<a xmlns=\"u\" c=\"x\" b=\"d\"></a>"},
+        {"<!DOCTYPE a SYSTEM 'nowhere.dtd'><a/>", "<a></a>"},
+        {"<!DOCTYPE a [<!ENTITY % e SYSTEM 'nowhere.dtd'> %e;]><a/>", "<a></a>"},
+    };
+    for (const auto& [document, expected] : cases)
+        EXPECT_EQ(outcome(document), expected) << document;
+}
+
+TEST(XMLParser, WhatIsNoXMLIsAnErrorWithItsPlace) {
+    const Case cases[] = {
+        {"", "1:1 4 The document is empty"},
+        {"  \n", "2:1 4 Start tag expected, '<' not found"},
+        {"hello", "1:1 3 Start tag expected, '<' not found"},
+        {"<a>", "1:4 77 Premature end of data in tag a line 1"},
+        {"<a>\n <b></a>", "2:9 76 Opening and ending tag mismatch: b line 2 and a"},
+        {"<a b='1' b='2'/>", "1:15 42 Attribute b redefined"},
+        {"<a b=1/>", "1:6 39 AttValue: \" or ' expected"},
+        {"<a/><b/>", "1:5 5 Extra content at the end of the document"},
+        {"<a>&x;</a>", "1:7 26 Entity 'x' not defined"},
+        {"<a>\x01</a>", "1:4 9 PCDATA invalid Char value 1"},
+        {"<a>\0</a>"s, "1:4 9 The document holds a zero byte"},
+        {"<a/>\0"s, "1:5 9 The document holds a zero byte"},
+        {"\xEF\xBB\xBF<a>\xC3\xA9<b</a>", "1:7 68 error parsing attribute name"},
+        {"<a>\xC3(</a>",
+         "1:4 9 Input is not proper UTF-8, indicate encoding ! Bytes: 0xC3 0x28 0x3C 0x2F"},
+        {"<!DOCTYPE a SYSTEM 'x'><a>&x;</a>", "1:30 27 Entity 'x' not defined"},
+        {"<!DOCTYPE a SYSTEM 'x'><a b='&x;'/>", "1:33 27 Entity 'x' not defined"},
+        {"<!DOCTYPE a [<!ENTITY e SYSTEM '/etc/passwd'>]><a>&e;</a>",
+         "1:54 29 The entity e stands outside of the document and is not read"},
+        {"<!DOCTYPE a [<!ENTITY e PUBLIC 'p' 'file:///etc/passwd'>]><a b='&e;'/>",
+         "1:68 29 The entity e stands outside of the document and is not read"},
+        {"<!DOCTYPE a [<!ENTITY e '&e;'>]><a>&e;</a>",
+         "1:39 89 Detected an entity reference loop, or entities that bring in more than 10 times "
+         "what the document holds"},
+    };
+    for (const auto& [document, expected] : cases)
+        EXPECT_EQ(outcome(document), expected) << document;
+}
+
+TEST(XMLParser, LayoutIsDroppedAndOtherWhiteSpaceStays) {
+    const Case cases[] = {
+        {"<a>\n  <b/>\n\t</a>", "<a><b></b></a>"},
+        {"<a>\n</a>", "<a></a>"},
+        {"<a> </a>", "<a> </a>"},
+        {"<a> <b/> </a>", "<a> <b></b> </a>"},
+        {"<a>\n<b/>\n text</a>", "<a>\n<b></b>\n text</a>"},
+        {"<a>\n<b>\n<c/>\n</b>\n<d/>text\n<e/>\n</a>", // only around the text
+         "<a>\n<b><c></c></b>\n<d></d>text\n<e></e>\n</a>"},
+        {"<a>\n<b/> <c/>\n</a>", "<a>\n<b></b> <c></c>\n</a>"},
+        {"<a>\n<!--c-->\n<?p?>\n</a>", "<a><!--c--><?p?></a>"},
+        {"<a>&#10;</a>", "<a>&#10;</a>"},
+        {"<a><![CDATA[\n]]></a>", "<a>&#10;</a>"},
+        {"<a>\n&#32;</a>", "<a>&#10; </a>"},
+        {"<!DOCTYPE a [<!ENTITY e '\n'>]><a>&e;</a>", "<a>&#10;</a>"},
+        {"<!DOCTYPE a [<!ENTITY e '<b/>'>]><a>&e;\n</a>", "<a><b></b></a>"},
+        {"<a>\r<b/>\r\n</a>", "<a><b></b></a>"},
+        {"<a xml:space='preserve'>\n<b>\n</b></a>", "<a xml:space=\"preserve\">\n<b>\n</b></a>"},
+        {"<a xml:space='preserve'>\n<b xml:space='default'>\n<c/></b>\n</a>",
+         "<a xml:space=\"preserve\">\n<b xml:space=\"default\"><c></c></b>\n</a>"},
+    };
+    for (const auto& [document, expected] : cases)
+        EXPECT_EQ(outcome(document), expected) << document;
+    const char* const kept = "<a>\n  <b></b>\n\t</a>";
+    EXPECT_EQ(outcome(kept, {.keepWhiteSpace = true}), kept);
+}
+
+// "name line:column" of each element.
+std::string positions(std::string_view bytes) {
+    const auto document = XMLDocument::initWithData(bytes);
+    if (!document)
+        return outcome(bytes);
+    std::string all;
+    const std::function<void(const XMLElement&)> visit = [&](const XMLElement& element) {
+        all += element.name().str() + " " + std::to_string(element.line()) + ":" +
+               std::to_string(element.column()) + "\n";
+        for (const XMLNode& child : element.children())
+            if (child.isElement())
+                visit(*child.asElement());
+    };
+    visit(*document->rootElement());
+    return all;
+}
+
+TEST(XMLParser, EveryElementKnowsWhereItStands) {
+    EXPECT_EQ(positions("<a\n b='>'\n><b/>\n\xC3\xA9\xE2\x82\xAC<c\n/><d>;</d><e/></a>"),
+              "a 1:1\nb 3:2\nc 4:3\nd 5:3\ne 5:11\n");
+    EXPECT_EQ(positions("\xEF\xBB\xBF<!--<x>--><a><![CDATA[<y>\n]]><b/></a>"), "a 1:11\nb 2:4\n");
+    EXPECT_EQ(positions("<!DOCTYPE a [<!ENTITY e '<b/><c/>'>]>\n<a>x;<d/>&e;<f/></a>"),
+              "a 2:1\nd 2:6\nb 2:10\nc 2:10\nf 2:13\n");
+}
+
+// The parser moves its buffer while it reads; positions must not follow it.
+TEST(XMLParser, PositionsHoldToTheEndOfLongLinesAndDocuments) {
+    const std::string line = repeated("<b c='\xC3\xA9'>\xE2\x82\xAC text</b>", 40'000);
+    const auto onOneLine = XMLDocument::initWithData("<a>" + line + "<z/></a>");
+    EXPECT_EQ(onOneLine->rootElement()->lastChild()->line(), 1U);
+    EXPECT_EQ(onOneLine->rootElement()->lastChild()->column(), 4U + 40'000U * 19U);
+    const auto onMany =
+        XMLDocument::initWithData("<a>" + repeated("\n<b>x</b>", 40'000) + "\n <z/></a>");
+    EXPECT_EQ(onMany->rootElement()->lastChild()->line(), 40'002U);
+    EXPECT_EQ(onMany->rootElement()->lastChild()->column(), 2U);
+}
+
+TEST(XMLParser, BeyondALimitIsAnErrorThatNamesIt) {
+    const std::string deep = repeated("<a>", 256);
+    EXPECT_EQ(outcome(deep + "\n<b/>"), "2:1 1 Elements nest deeper than the limit of 256");
+    EXPECT_EQ(outcome("<a><b><c/></b></a>", {.maximumDepth = 2}),
+              "1:7 1 Elements nest deeper than the limit of 2");
+    EXPECT_EQ(outcome("<!DOCTYPE a [<!ENTITY e '<b><c/></b>'>]><a>&e;</a>", {.maximumDepth = 2}),
+              "1:44 1 Elements nest deeper than the limit of 2");
+    const std::string beyond = " is larger than the limit of 9 bytes";
+    const Case sizes[] = {{"<a>12345<![CDATA[67890]]></a>", "1:26 1 A text" + beyond},
+                          {"<a b='1234567890'/>", "1:1 1 An attribute's value" + beyond},
+                          {"<a>\n<bcdefghijk/></a>", "2:1 1 A name" + beyond},
+                          {"<a bcdefghijk=''/>", "1:1 1 A name" + beyond},
+                          {"<a><!--1234567890--></a>", "1:21 1 A comment" + beyond},
+                          {"<a><?b 1234567890?></a>", "1:20 1 A processing instruction" + beyond},
+                          {"<a b='123456789'>123456789</a>", "<a b=\"123456789\">123456789</a>"}};
+    for (const auto& [document, expected] : sizes)
+        EXPECT_EQ(outcome(document, {.maximumTextSize = 9}), expected) << document;
+    EXPECT_EQ(outcome("<a>" + repeated("x", 10'000'001) + "</a>"),
+              "1:4 1 A text is larger than the limit of 10000000 bytes");
+}
+
+TEST(XMLParser, RaisedLimitsGoBeyondTheParsersOwn) {
+    const std::string deep = repeated("<a>", 5000) + repeated("</a>", 5000);
+    EXPECT_EQ(outcome(deep, {.maximumDepth = 5000}).size(), deep.size());
+    EXPECT_EQ(outcome("<a>" + deep + "</a>", {.maximumDepth = 5000}),
+              "1:15001 1 Elements nest deeper than the limit of 5000");
+    const std::string wide =
+        "<a b=\"" + repeated("x", 10'500'000) + "\">" + repeated("y", 10'500'000) + "</a>";
+    EXPECT_EQ(outcome(wide, {.maximumTextSize = 11'000'000}).size(), wide.size());
+}
+
+// Each level doubles ten times; the innermost would be met ten thousand million times.
+std::string laughs(const std::string& innermost, const std::string& root) {
+    std::string text = "<!DOCTYPE a [<!ENTITY e0 \"" + innermost + "\">";
+    for (int i = 1; i <= 10; ++i)
+        text += "<!ENTITY e" + std::to_string(i) + " \"" +
+                repeated("&e" + std::to_string(i - 1) + ";", 10) + "\">";
+    return text + "]>" + root;
+}
+
+TEST(XMLParser, EntitiesCannotBlowUp) {
+    const qx::XMLParseOptions raised{.maximumDepth = 1000, .maximumTextSize = 1'000'000'000};
+    for (const char* root : {"<a>&e10;</a>", "<a b='&e10;'/>", "<a b='x'>&e10;</a>"})
+        for (const char* innermost : {"lol lol lol", "", "<b/>"}) {
+            const std::string document = laughs(innermost, root);
+            if (std::string_view(innermost) == "<b/>" &&
+                std::string_view(root).find("'&") != std::string_view::npos)
+                continue;
+            EXPECT_NE(outcome(document).find(" 89 "), std::string::npos) << document;
+            EXPECT_NE(outcome(document, raised).find("bring in more than the limit of 10"),
+                      std::string::npos)
+                << document;
+        }
+    const std::string flat = "<!DOCTYPE a [<!ENTITY e '" + repeated("x", 10'000) + "'>]><a>" +
+                             repeated("&e;", 10'000) + "</a>";
+    EXPECT_NE(outcome(flat).find(" 89 "), std::string::npos);
+    EXPECT_NE(outcome(flat, raised).find(" 89 "), std::string::npos);
+}
+
+TEST(XMLParser, DeclarationsCannotBlowUp) {
+    std::string defaults;
+    std::string attributes;
+    std::string namespaces;
+    for (int i = 0; i < 5000; ++i) {
+        const std::string number = std::to_string(i);
+        defaults += " a" + number + " CDATA 'v'";
+        attributes += " a" + number + "='='";
+        if (i < 2000)
+            namespaces += " xmlns:n" + number + "='u'";
+    }
+    EXPECT_NE(outcome("<!DOCTYPE a [<!ATTLIST a " + defaults + ">]><a/>")
+                  .find("More attributes have defaults than the limit of 2000"),
+              std::string::npos);
+    const std::string some = defaults.substr(0, defaults.find(" a1000 "));
+    EXPECT_NE(outcome("<!DOCTYPE r [<!ATTLIST a " + some + ">]><r>" + repeated("<a/>", 1000))
+                  .find("Entities and attribute defaults bring in more than the limit of 1"),
+              std::string::npos);
+    EXPECT_EQ(outcome("<r>\n" + repeated("x", 40'000) + "<a" + attributes + "/></r>"),
+              "2:40001 1 An element has more attributes than the limit of 4096");
+    EXPECT_EQ(outcome("<r>\n<a" + namespaces + "/></r>"),
+              "2:1 1 More namespace declarations are in force than the limit of 1000");
+}
+
+TEST(XMLParser, OnlyAttributesCountAsAttributes) {
+    const std::string many = repeated(" a='b'", 5000);
+    for (const std::string& inside :
+         {"<!--" + many + "-->", "<b c=\"" + many + "\"></b>", "<b></b>" + many})
+        EXPECT_EQ(outcome("<a>" + inside + "</a>").size(), inside.size() + 7)
+            << inside.substr(0, 20);
+}
+
+TEST(XMLParser, DocumentsComeInManyEncodings) {
+    const std::string utf16 = "<?xml version='1.0' encoding='UTF-16'?><a>\xC3\xA9</a>";
+    const auto wide = [](std::string_view text, bool big) {
+        std::string bytes;
+        for (std::size_t i = 0; i < text.size(); ++i) {
+            const char low = text[i] == '\xC3' ? text[++i] + 0x40 : text[i];
+            bytes += big ? std::string{'\0', low} : std::string{low, '\0'};
+        }
+        return bytes;
+    };
+    const std::string accent = "<a>\xC3\xA9</a>";
+    const auto withLabel = [&](const char* label) {
+        return "<?xml version=\"1.0\" encoding=\""s + label + "\"?>" + accent;
+    };
+    const Case cases[] = {
+        {"\xFE\xFF" + wide(utf16, true), withLabel("UTF-16")},
+        {"\xFF\xFE" + wide(utf16, false), withLabel("UTF-16")},
+        {wide(accent, true), accent},
+        {wide(accent, false), accent},
+        {"<?xml version='1.0' encoding='ISO-8859-1'?><a>\xE9</a>", withLabel("ISO-8859-1")},
+        {"<?xml version='1.0' encoding = 'windows-1252'?><a>\xE9</a>", withLabel("windows-1252")},
+        {"<?xml version='1.0' encoding='utf-8'?><a>\xC3\xA9</a>", withLabel("utf-8")},
+        {"<?xml version='1.0' encoding='nope'?><a/>", "1:1 32 The encoding nope is not known"},
+        {"<?xml version='1.0' encoding='UTF-8//IGNORE'?><a/>",
+         "1:1 32 The encoding UTF-8//IGNORE is not known"},
+        {"<?xml version='1.0' encoding='UTF-16'?><a></a>",
+         "1:1 81 The document is not in the encoding that it declares, UTF-16"},
+        {"<?xml version='1.0' encoding='US-ASCII'?>\n<a>\xE9</a>",
+         "2:4 81 A character is not in the encoding US-ASCII"},
+        {"\xFE\xFF" + wide("<a>\n</a>", true) + "x",
+         "2:5 81 A character is not in the encoding UTF-16BE"},
+        {"\xFF\xFE", "1:1 4 The document is empty"},
+    };
+    for (const auto& [document, expected] : cases)
+        EXPECT_EQ(outcome(document), expected) << document;
+}
+
+TEST(XMLParser, EveryBeginningOfADocumentIsRefusedWithAnError) {
+    const std::string whole = "<?xml version='1.0' encoding='UTF-8'?><!DOCTYPE a [<!ENTITY e 'x'>"
+                              "<!ATTLIST a b CDATA 'c'>]><!--d--><a f='&e;'>&e;<![CDATA[g]]>"
+                              "<h xmlns:i='j'/><?k l?>\xC3\xA9&#10;</a>";
+    ASSERT_EQ(outcome(whole).front(), '<');
+    for (std::size_t size = 0; size < whole.size(); ++size)
+        EXPECT_NE(outcome(whole.substr(0, size)).front(), '<') << whole.substr(0, size);
+}
+
+} // namespace

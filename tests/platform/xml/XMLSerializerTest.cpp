@@ -1,0 +1,216 @@
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using qx::Ref;
+using qx::XMLDocument;
+using qx::XMLElement;
+using qx::XMLNode;
+
+std::string utf8(char32_t c) {
+    const auto byte = [](char32_t bits) { return static_cast<char>(bits); };
+    if (c < 0x80)
+        return {byte(c)};
+    if (c < 0x800)
+        return {byte(0xC0 | c >> 6), byte(0x80 | (c & 0x3F))};
+    if (c < 0x10000)
+        return {byte(0xE0 | c >> 12), byte(0x80 | (c >> 6 & 0x3F)), byte(0x80 | (c & 0x3F))};
+    return {byte(0xF0 | c >> 18), byte(0x80 | (c >> 12 & 0x3F)), byte(0x80 | (c >> 6 & 0x3F)),
+            byte(0x80 | (c & 0x3F))};
+}
+
+// <a b="text">text</a>
+Ref<XMLDocument> holding(const std::string& text) {
+    const auto root = XMLElement::initWithName("a", text);
+    root->addAttribute(XMLNode::attributeWithName("b", text));
+    return XMLDocument::initWithRootElement(root);
+}
+
+void expectReadBack(const std::string& text, const std::string& bytes) {
+    const auto read = XMLDocument::initWithData(bytes);
+    ASSERT_TRUE(read) << bytes;
+    const XMLElement& root = *read->rootElement();
+    EXPECT_TRUE(root.stringValue().view() == text) << bytes.substr(0, 200);
+    EXPECT_TRUE(root.attributeForName("b")->stringValue().view() == text) << bytes.substr(0, 200);
+}
+
+TEST(XMLSerializer, EachCharacterThatXMLAllowsIsReadBackAndNoOtherIsWritten) {
+    std::string all;
+    for (char32_t c = 0; c <= 0x10FFFF; ++c) {
+        const bool isAllowed = c == 9 || c == 10 || c == 13 || (c >= 0x20 && c < 0xD800) ||
+                               (c >= 0xE000 && c <= 0xFFFD) || c >= 0x10000;
+        // Each of the first, and those at the ends of the allowed ranges, stand alone too.
+        const bool isNotable = c < 0x100 || (c >= 0xD7F0 && c <= 0xE010) ||
+                               (c >= 0xFFF0 && c <= 0x10010) || c >= 0x10FFF0;
+        if (isAllowed)
+            all += utf8(c);
+        if (!isNotable)
+            continue;
+        const auto document = holding(utf8(c));
+        if (isAllowed)
+            expectReadBack(utf8(c), document->XMLData());
+        else
+            EXPECT_THROW(document->XMLData(), qx::Exception) << static_cast<std::uint32_t>(c);
+    }
+    expectReadBack(all, holding(all)->XMLData());
+}
+
+TEST(XMLSerializer, TextsThatAParserWouldChangeAreReadBack) {
+    for (const char* text : {"]]>", "&amp;", "<![CDATA[x]]>", "\r\n", "\n", " \n ", "\t", " a ",
+                             "\n\na", "&#10;", "\"'"}) {
+        const auto document = holding(text);
+        expectReadBack(text, document->XMLData());
+        expectReadBack(text, document->XMLData(qx::XMLPrettyPrint));
+        document->rootElement()->addChild(XMLElement::initWithName("c"));
+        expectReadBack(text, document->XMLData());
+    }
+}
+
+struct Layout {
+    const char* document;
+    const char* pretty;
+};
+
+TEST(XMLSerializer, PrettyPrintingTouchesNoText) {
+    const Layout cases[] = {
+        {"<a/>", "<a></a>\n"},
+        {"<a>x</a>", "<a>x</a>\n"},
+        {"<a><b/><c>x</c></a>", "<a>\n    <b></b>\n    <c>x</c>\n</a>\n"},
+        {"<a><b><c><!--d--></c></b><?e f?></a>",
+         "<a>\n    <b>\n        <c>\n            <!--d-->\n        </c>\n    </b>\n    <?e "
+         "f?>\n</a>\n"},
+        {"<a><b>x<c><d/></c></b></a>", "<a>\n    <b>x<c><d></d></c></b>\n</a>\n"},
+        {"<a> <b/></a>", "<a> <b></b></a>\n"},
+        {"<a><b xml:space='preserve'><c/></b></a>",
+         "<a>\n    <b xml:space=\"preserve\"><c></c></b>\n</a>\n"},
+        {"<a xml:space='preserve'><b xml:space='default'><c/></b></a>",
+         "<a xml:space=\"preserve\"><b xml:space=\"default\">\n        <c></c>\n    </b></a>\n"},
+        {"<?xml version='1.0'?><!--x--><a/>", "<?xml version=\"1.0\"?>\n<!--x-->\n<a></a>\n"},
+    };
+    for (const auto& [text, pretty] : cases) {
+        const auto document = XMLDocument::initWithData(text);
+        EXPECT_EQ(document->XMLData(qx::XMLPrettyPrint), pretty) << text;
+        const auto again = XMLDocument::initWithData(document->XMLData(qx::XMLPrettyPrint));
+        EXPECT_TRUE(again->isSameXML(*document)) << text;
+    }
+}
+
+TEST(XMLSerializer, EmptyElementsMayBeCompact) {
+    const auto document = XMLDocument::initWithData("<a><b c='1'></b>x<d>y</d></a>");
+    EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements), "<a><b c=\"1\"/>x<d>y</d></a>");
+    document->rootElement()->setStringValue("");
+    EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements | qx::XMLPrettyPrint), "<a/>\n");
+}
+
+TEST(XMLSerializer, ANodeAloneIsWrittenByItsKind) {
+    EXPECT_EQ(XMLNode::attributeWithName("a", "<\"\n'")->XMLString(), "a=\"&lt;&quot;&#10;'\"");
+    EXPECT_EQ(XMLNode::namespaceWithName("", "u")->XMLString(), "xmlns=\"u\"");
+    EXPECT_EQ(XMLNode::namespaceWithName("p", "u")->XMLString(), "xmlns:p=\"u\"");
+    EXPECT_EQ(XMLNode::initTextWithStringValue("a>\"")->XMLString(), "a&gt;\"");
+    EXPECT_EQ(XMLNode::initCommentWithStringValue("a-b")->XMLString(), "<!--a-b-->");
+    EXPECT_EQ(XMLNode::initProcessingInstructionWithName("a", "")->XMLString(), "<?a?>");
+}
+
+// An element <order> with two items, for the second of which `change` does what is no XML.
+struct Refusal {
+    const char* reason;
+    void (*change)(XMLElement& item);
+};
+
+TEST(XMLSerializer, WhatWouldBeNoXMLIsRefusedByItsPlace) {
+    const Refusal cases[] = {
+        {"a name is no XML name at /order/item[2]/@a b",
+         [](XMLElement& item) { item.addAttribute(XMLNode::attributeWithName("a b", "")); }},
+        {"a name is no XML name at /order/item[2]/1",
+         [](XMLElement& item) { item.addChild(XMLElement::initWithName("1")); }},
+        {"a name is no XML name at /order/item[2]/",
+         [](XMLElement& item) { item.addChild(XMLElement::initWithName(nullptr)); }},
+        {"a text holds a control character at /order/item[2]/@c",
+         [](XMLElement& item) { item.addAttribute(XMLNode::attributeWithName("c", "\x1F")); }},
+        {"a text holds a control character at /order/item[2]/text()",
+         [](XMLElement& item) { item.setStringValue(std::string_view("\0", 1)); }},
+        {"a text holds what is no XML character at /order/item[2]/text()",
+         [](XMLElement& item) { item.setStringValue("\xC0\x80"); }},
+        {"a comment holds \"--\" or ends in \"-\" at /order/item[2]/comment()",
+         [](XMLElement& item) { item.addChild(XMLNode::initCommentWithStringValue("a--b")); }},
+        {"a comment holds \"--\" or ends in \"-\" at /order/item[2]/comment()",
+         [](XMLElement& item) { item.addChild(XMLNode::initCommentWithStringValue("a-")); }},
+        {"a processing instruction would not be read back as it is at /order/item[2]/?p",
+         [](XMLElement& item) {
+             item.addChild(XMLNode::initProcessingInstructionWithName("p", "?>"));
+         }},
+        {"a processing instruction would not be read back as it is at /order/item[2]/?XML",
+         [](XMLElement& item) {
+             item.addChild(XMLNode::initProcessingInstructionWithName("XML", ""));
+         }},
+        {"a prefix holds a colon at /order/item[2]/@xmlns:a:b",
+         [](XMLElement& item) { item.addNamespace(XMLNode::namespaceWithName("a:b", "u")); }},
+        {"a namespace is declared twice at /order/item[2]/@xmlns:p",
+         [](XMLElement& item) {
+             item.addNamespace(XMLNode::namespaceWithName("p", "u"));
+             item.addAttribute(XMLNode::attributeWithName("xmlns:p", "u"));
+         }},
+    };
+    for (const auto& [reason, change] : cases) {
+        const auto document = XMLDocument::initWithData("<order><item/><item/></order>");
+        change(*document->rootElement()->lastChild()->asElement());
+        try {
+            document->XMLString();
+            ADD_FAILURE() << "written: " << reason;
+        } catch (const qx::Exception& exception) {
+            EXPECT_STREQ(exception.name(), qx::Exception::invalidArgument);
+            EXPECT_EQ(exception.reason(), reason);
+        }
+        EXPECT_TRUE(document->description().view().starts_with("<order><item></item><item"));
+    }
+}
+
+TEST(XMLSerializer, ADocumentDeclaresWhatIsSet) {
+    const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
+    EXPECT_EQ(document->XMLData(), "<a></a>");
+    document->setCharacterEncoding("utf-8");
+    EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"utf-8\"?><a></a>");
+    document->setVersion("1.0");
+    document->setStandalone("no");
+    EXPECT_EQ(document->XMLData(),
+              "<?xml version=\"1.0\" encoding=\"utf-8\" standalone=\"no\"?><a></a>");
+    document->setVersion("2.0");
+    EXPECT_THROW(document->XMLData(), qx::Exception);
+    document->setVersion("1.0");
+    document->setStandalone("maybe");
+    EXPECT_THROW(document->XMLData(), qx::Exception);
+    EXPECT_THROW(XMLDocument::initWithRootElement(nullptr)->XMLData(), qx::Exception);
+}
+
+TEST(XMLSerializer, EncodingsHoldWhatTheyCanAndReferToTheRest) {
+    const std::string text = "a\xC3\xA9\xE2\x82\xAC\xF0\x9F\x98\x80\n";
+    const auto document = holding(text);
+    for (const char* encoding : {"UTF-8", "UTF-16", "UTF-16LE", "UTF-16BE", "ISO-8859-1",
+                                 "US-ASCII", "windows-1252", "Shift_JIS"}) {
+        document->setCharacterEncoding(encoding);
+        expectReadBack(text, document->XMLData());
+        expectReadBack(text, document->XMLData(qx::XMLPrettyPrint));
+    }
+    document->setCharacterEncoding("ISO-8859-1");
+    document->rootElement()->removeAttributeForName("b");
+    EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"ISO-8859-1\"?>"
+                                   "<a>a\xE9&#8364;&#128512;\n</a>");
+    for (const char* encoding : {"nope", "UTF-7", "UTF-16//TRANSLIT", "IBM037"}) {
+        document->setCharacterEncoding(encoding);
+        EXPECT_THROW(document->XMLData(), qx::Exception) << encoding;
+    }
+}
+
+TEST(XMLSerializer, NamesThatAnEncodingLacksAreRefused) {
+    const auto document =
+        XMLDocument::initWithData("<?xml version='1.0' encoding='UTF-8'?><a><\xC3\xA9/></a>");
+    document->setCharacterEncoding("ISO-8859-1");
+    EXPECT_NE(document->XMLData().find("<\xE9>"), std::string::npos);
+    document->setCharacterEncoding("US-ASCII");
+    EXPECT_THROW(document->XMLData(), qx::Exception);
+}
+
+} // namespace
