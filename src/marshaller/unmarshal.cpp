@@ -106,7 +106,7 @@ Ref<qx::Object> Unmarshalling::allocate(const ClassPlan& plan) {
     const qx::Class* type = _classes[plan.index];
     Ref<qx::Object> object = type != nullptr ? type->create() : nullptr;
     if (!object)
-        object = qx::make<QXGenericRecord>();
+        object = QXGenericRecord::classObject().create();
     const ObjectHooks& hooks = _door.hooksOf(*object);
     if (hooks.setClassNameForMarshalling != nullptr)
         ObjectDoor::send(*object, *hooks.setClassNameForMarshalling, plan.className.string());

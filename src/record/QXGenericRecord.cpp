@@ -109,6 +109,12 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
 void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
     if (!_contents)
         _contents = qx::make<Dictionary>();
+    // The many first values of a record that is read from a document: nobody is told, nothing is
+    // remembered.
+    const bool isQuiet = _tracking.isIdle() && !hasCompany() && &isa() == &described;
+    if (isQuiet && !value.isNull() && !key.view().starts_with('@') &&
+        _contents->add(key.string(), value))
+        return;
     willChangeValueForKey(key);
     if (value.isNull())
         _contents->remove(key.string());

@@ -42,6 +42,10 @@ public:
     Ref<Dictionary> changeCache() const;
     void setChangeCache(Ref<Dictionary> cache) noexcept { _cache = std::move(cache); }
 
+    // True while there is no undo manager and nothing is remembered: then a change from null leaves
+    // no trace here.
+    bool isIdle() const noexcept { return !_undoManager && !_cache; }
+
     // Remembers the value of the key, for changes of a collection's items too.
     void willChangeValueForKey(Key key);
     // Registers the change, if it is one. To be called before observers are told.

@@ -64,6 +64,8 @@ public:
     const Value* find(const String& key) const noexcept;
     // A null key or a null value raises NSInvalidArgumentException.
     void set(const String& key, Value value);
+    // Adds the value unless the key is there; false when it is. Neither may be null.
+    bool add(const String& key, const Value& value);
     // Nothing happens when the key is absent.
     void remove(const String& key);
     void removeAll();
@@ -94,6 +96,7 @@ protected:
 private:
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
+    void append(const String& key, Value value);
     void makeRoom();
     void changed() noexcept { ++_changes; }
 

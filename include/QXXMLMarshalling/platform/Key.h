@@ -30,6 +30,17 @@ public:
     operator String() const noexcept { return string(); }
     const void* identity() const noexcept { return _rep; }
 
+    // Whether any class has been described with a property of that name: most keys of records have
+    // not, and need no look-up.
+    bool namesProperty() const noexcept {
+        return _rep != nullptr &&
+               (_rep->count.load(std::memory_order_relaxed) & String::propertyBit) != 0;
+    }
+    void markAsProperty() const noexcept {
+        if (_rep != nullptr)
+            _rep->count.fetch_or(String::propertyBit, std::memory_order_relaxed);
+    }
+
     friend bool operator==(Key a, Key b) noexcept { return a._rep == b._rep; }
 
 private:

@@ -125,6 +125,9 @@ protected:
     // Classes that others derive from override it.
     virtual const Class& describedClass() const;
 
+    // False as long as nobody observes the object, waits for its end or refers to it weakly.
+    bool hasCompany() const noexcept { return _extras != nullptr; }
+
 private:
     struct Extras;
     friend class Class;

@@ -92,6 +92,7 @@ private:
     };
     static constexpr std::uint32_t immortalBit = 0x80000000U;
     static constexpr std::uint32_t internedBit = 0x40000000U;
+    static constexpr std::uint32_t propertyBit = 0x20000000U; // see Key::namesProperty
 
     explicit String(Rep* rep) noexcept : _rep(rep) {}
     static const char* text(const Rep* rep) noexcept {

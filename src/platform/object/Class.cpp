@@ -100,6 +100,8 @@ Class::Class(Draft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),
       _create(draft.create), _properties(std::move(draft.properties)),
       _operations(std::move(draft.operations)), _classOperations(std::move(draft.classOperations)) {
+    for (const Property& property : _properties)
+        property.key.markAsProperty();
 }
 
 const Class* Class::named(std::string_view name) {
@@ -158,6 +160,8 @@ bool Class::isSubclassOf(const Class& other) const {
 Ref<Object> Class::create() const { return _create != nullptr ? _create() : Ref<Object>(); }
 
 const Property* Class::property(Key key) const {
+    if (!key.namesProperty())
+        return nullptr;
     for (const Class* type = this; type != nullptr; type = type->superclass())
         if (const auto* found = findIn(type->_properties, &Property::key, key))
             return found;

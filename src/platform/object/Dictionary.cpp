@@ -53,6 +53,18 @@ void Dictionary::set(const String& key, Value value) {
         const Value replaced = std::exchange(_entries[position].value, std::move(value));
         return;
     }
+    append(key, std::move(value));
+}
+
+bool Dictionary::add(const String& key, const Value& value) {
+    if (positionOf(key) != nameindex::none)
+        return false;
+    changed();
+    append(key, value);
+    return true;
+}
+
+void Dictionary::append(const String& key, Value value) {
     if (nameindex::isFull(_index, _entries.size()))
         makeRoom();
     if (_entries.capacity() == 0)

@@ -26,7 +26,8 @@ struct Ending {
     unsigned depth = 0;
     Object* waiting = nullptr;
 };
-thread_local Ending ending;
+// In the library's initial block of thread memory: it is looked at for every object that ends.
+[[gnu::tls_model("initial-exec")]] thread_local Ending ending;
 
 String addressOf(const Object& object) {
     const Value address(reinterpret_cast<std::uintptr_t>(&object));
