@@ -54,10 +54,14 @@ private:
     friend class XMLNode;
     friend class XMLTreeBuilder;
 
-    explicit XMLElement(String name) noexcept;
+    explicit XMLElement(String name) noexcept
+        : XMLNode(XMLNodeKind::element, std::move(name), String()) {}
     void unlink(XMLNode& node) noexcept;
 
-    std::uint32_t _childCount = 0; // fills the hole that the base class leaves
+    // These fill the hole that the base class leaves.
+    std::uint32_t _childCount = 0;
+    std::uint32_t _line = 0;
+    std::uint32_t _column = 0;
     XMLNode* _firstChild = nullptr;
     XMLNode* _firstAttribute = nullptr;
     XMLNode* _firstNamespace = nullptr;
@@ -68,6 +72,14 @@ inline XMLElement* XMLNode::asElement() noexcept {
 }
 inline const XMLElement* XMLNode::asElement() const noexcept {
     return isElement() ? static_cast<const XMLElement*>(this) : nullptr;
+}
+inline std::size_t XMLNode::line() const noexcept {
+    const XMLElement* element = asElement();
+    return element != nullptr ? element->_line : 0;
+}
+inline std::size_t XMLNode::column() const noexcept {
+    const XMLElement* element = asElement();
+    return element != nullptr ? element->_column : 0;
 }
 
 } // namespace qx

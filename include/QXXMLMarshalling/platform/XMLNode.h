@@ -21,6 +21,7 @@
 
 namespace qx {
 
+class NodeBlocks;
 class XMLDocument;
 class XMLElement;
 class XMLNode;
@@ -88,7 +89,9 @@ public:
     ~XMLNode() override;
     // Nodes share blocks of memory.
     static void* operator new(std::size_t size);
+    static void* operator new(std::size_t size, NodeBlocks& blocks);
     static void operator delete(void* node) noexcept;
+    static void operator delete(void* node, NodeBlocks& blocks) noexcept;
 
     static Ref<XMLNode> initTextWithStringValue(const String& text);
     static Ref<XMLNode> initCommentWithStringValue(const String& text);
@@ -132,8 +135,8 @@ public:
     // Where the element's "<" stood in the parsed document, 1-based, a column being one character
     // (code point) of the line; 0 for nodes made by hand and for other kinds. An element that an
     // entity brought stands where the entity was referred to.
-    std::size_t line() const noexcept { return _line; }
-    std::size_t column() const noexcept { return _column; }
+    inline std::size_t line() const noexcept;
+    inline std::size_t column() const noexcept;
 
     // The node as XML text (an attribute as name="value"), without layout. Raises
     // NSInvalidArgumentException, naming the place, for what would not be XML: an illegal name, a
@@ -149,7 +152,8 @@ protected:
     friend class XMLSerializer;
     friend struct XMLSiblings;
 
-    XMLNode(XMLNodeKind kind, String name, String value) noexcept;
+    XMLNode(XMLNodeKind kind, String name, String value) noexcept
+        : _name(std::move(name)), _value(std::move(value)), _kind(kind) {}
     const Class& describedClass() const override;
     static XMLNode* lastOf(XMLNode* first) noexcept {
         return first != nullptr ? first->_previous : nullptr;
@@ -165,8 +169,6 @@ protected:
     // is written as it is; the line breaks of any other such text are escaped, so that it is read
     // back.
     bool _isLayout = false;
-    std::uint32_t _line = 0;
-    std::uint32_t _column = 0;
 };
 
 inline XMLNodeRange::Iterator& XMLNodeRange::Iterator::operator++() noexcept {

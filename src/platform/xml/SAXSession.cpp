@@ -122,7 +122,7 @@ struct SAXSession::Callbacks {
     }
     static void cdata(void* user, const xmlChar* text, int length) {
         guarded(user, [&](SAXSession& self) {
-            self._builder.addText(viewOf(text, text + length), false);
+            self._builder.addText({viewOf(text, text + length), false, false});
         });
     }
     static void comment(void* user, const xmlChar* text) {
@@ -209,7 +209,7 @@ void SAXSession::run() {
 void SAXSession::startDocument() {
     xmlSAX2StartDocument(_context.get());
     const int standalone = _context->standalone;
-    if (!_text.starts_with("<?xml") || !isWhite(_text[5]))
+    if (!_text.starts_with("<?xml") || _text.size() == 5 || !isWhite(_text[5]))
         return;
     _document.setVersion(viewOf(_context->version));
     if (standalone == 0 || standalone == 1)
@@ -251,9 +251,15 @@ void SAXSession::addText(std::string_view piece) {
     const auto address = [](const void* pointer) {
         return reinterpret_cast<std::uintptr_t>(pointer);
     };
-    const bool isOwn =
-        address(piece.data()) - address(input.base) < address(input.end) - address(input.base);
-    _builder.addText(piece, isWhite(piece) && (isOwn || !isInsideReference()));
+    const std::uintptr_t place = address(piece.data()) - address(input.base);
+    const bool isOwn = place < address(input.end) - address(input.base);
+    const bool isLayout = isWhite(piece) && (isOwn || !isInsideReference());
+    if (isOwn) {
+        const std::size_t start = static_cast<std::size_t>(input.consumed) + place;
+        _builder.addText({_text.substr(start, piece.size()), isLayout, true});
+    } else {
+        _builder.addText({piece, isLayout, false});
+    }
 }
 
 xmlEntityPtr SAXSession::entity(const xmlChar* name) {

@@ -56,10 +56,7 @@ bool isText(const XMLNode& node) { return node.kind() == XMLNodeKind::text; }
 } // namespace
 
 // Documents hold millions of elements: the count of children fills a hole, lists keep one end.
-static_assert(sizeof(void*) != 8 || sizeof(XMLElement) <= 112);
-
-XMLElement::XMLElement(String name) noexcept
-    : XMLNode(XMLNodeKind::element, std::move(name), String()) {}
+static_assert(sizeof(void*) != 8 || (sizeof(XMLElement) <= 112 && sizeof(XMLNode) <= 80));
 
 XMLElement::~XMLElement() {
     XMLSiblings::releaseAll(_firstChild);

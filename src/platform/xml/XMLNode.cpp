@@ -3,7 +3,7 @@
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
-#include "platform/xml/NodeMemory.h"
+#include "platform/xml/NodeBlocks.h"
 #include "platform/xml/XMLSerializer.h"
 
 namespace qx {
@@ -20,14 +20,15 @@ String written(const XMLNode& node, XMLOptions options, XMLChecks checks) {
 
 } // namespace
 
-XMLNode::XMLNode(XMLNodeKind kind, String name, String value) noexcept
-    : _name(std::move(name)), _value(std::move(value)), _kind(kind) {}
-
 XMLNode::~XMLNode() = default;
 
-void* XMLNode::operator new(std::size_t size) { return allocateNode(size); }
+void* XMLNode::operator new(std::size_t size) { return NodeBlocks::ofThread().allocate(size); }
 
-void XMLNode::operator delete(void* node) noexcept { releaseNode(node); }
+void* XMLNode::operator new(std::size_t size, NodeBlocks& blocks) { return blocks.allocate(size); }
+
+void XMLNode::operator delete(void* node) noexcept { NodeBlocks::release(node); }
+
+void XMLNode::operator delete(void* node, NodeBlocks&) noexcept { NodeBlocks::release(node); }
 
 Ref<XMLNode> XMLNode::initTextWithStringValue(const String& text) {
     return Ref<XMLNode>::adopt(new XMLNode(XMLNodeKind::text, String(), present(text)));

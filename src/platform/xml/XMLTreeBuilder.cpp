@@ -29,7 +29,7 @@ void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::siz
     requireSize(name.size(), "A name");
     const bool preserves = !_open.empty() && _open.back().preservesSpace;
     const std::size_t namespaces = _open.empty() ? 0 : _open.back().namespaces;
-    auto* element = new XMLElement(name);
+    auto* element = new (_blocks) XMLElement(name);
     element->_line = saturated(line);
     element->_column = saturated(column);
     if (_open.empty())
@@ -47,7 +47,7 @@ void XMLTreeBuilder::addNamespace(const String& prefix, const String& URI) {
                            ParseFailure::beyondLimit};
     XMLElement& element = *_open.back().element;
     XMLSiblings::append(element, element._firstNamespace,
-                        new XMLNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
+                        new (_blocks) XMLNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
 }
 
 void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
@@ -55,7 +55,7 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
     requireSize(value.size(), "An attribute's value");
     XMLElement& element = *_open.back().element;
     XMLSiblings::append(element, element._firstAttribute,
-                        new XMLNode(XMLNodeKind::attribute, name, _values.valued(value)));
+                        new (_blocks) XMLNode(XMLNodeKind::attribute, name, _values.valued(value)));
 }
 
 void XMLTreeBuilder::endElement() {
@@ -64,10 +64,17 @@ void XMLTreeBuilder::endElement() {
     _open.pop_back();
 }
 
-void XMLTreeBuilder::addText(std::string_view piece, bool isLayout) {
-    requireSize(_text.size() + piece.size(), "A text");
-    _textIsLayout = isLayout && (_text.empty() || _textIsLayout);
-    _text += piece;
+void XMLTreeBuilder::addText(const TextPiece& piece) {
+    requireSize(_lasting.size() + _joined.size() + piece.text.size(), "A text");
+    const bool isFirst = _lasting.empty() && _joined.empty();
+    _textIsLayout = piece.isLayout && (isFirst || _textIsLayout);
+    if (isFirst && piece.isLasting) {
+        _lasting = piece.text;
+        return;
+    }
+    _joined += _lasting;
+    _joined += piece.text;
+    _lasting = {};
 }
 
 void XMLTreeBuilder::addComment(std::string_view text) {
@@ -82,22 +89,20 @@ void XMLTreeBuilder::addProcessingInstruction(const String& target, std::string_
     appendToCurrent(XMLNode::initProcessingInstructionWithName(target, data));
 }
 
-void XMLTreeBuilder::finishText() {
-    if (_text.empty() || _open.empty())
-        return;
+void XMLTreeBuilder::placeText() {
     OpenElement& open = _open.back();
-    const bool isLayout = _textIsLayout && _text.find('\n') != std::string::npos;
+    const std::string_view text = _lasting.empty() ? std::string_view(_joined) : _lasting;
+    const bool isLayout = _textIsLayout && text.find('\n') != std::string_view::npos;
     if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
-        _layouts.push_back({open.element->lastChild(), _layoutText.size(), _text.size()});
-        _layoutText += _text;
+        _layouts.push_back(
+            {open.element->lastChild(), _lasting, _lasting.empty() ? String(text) : String()});
     } else {
-        if (!isLayout)
+        if (!isLayout && !open.hasText)
             restoreLayout(open);
-        auto* text = new XMLNode(XMLNodeKind::text, String(), _values.valued(_text));
-        text->_isLayout = isLayout;
-        appendChild(*open.element, text);
+        appendText(text, isLayout, nullptr);
     }
-    _text.clear();
+    _lasting = {};
+    _joined.clear();
 }
 
 // Other text has come: what was put aside before it stands beside text.
@@ -105,22 +110,21 @@ void XMLTreeBuilder::restoreLayout(OpenElement& open) {
     open.hasText = true;
     for (std::size_t i = open.firstLayout; i < _layouts.size(); ++i) {
         const Layout& layout = _layouts[i];
-        const std::string_view text(_layoutText.data() + layout.start, layout.size);
-        auto* node = new XMLNode(XMLNodeKind::text, String(), String(text));
-        node->_isLayout = true;
-        XMLElement& element = *open.element;
-        appendChild(element, node,
-                    layout.after != nullptr ? layout.after->_next : element._firstChild);
+        appendText(layout.lasting.empty() ? layout.owned.view() : layout.lasting, true,
+                   layout.after != nullptr ? layout.after->_next : open.element->_firstChild);
     }
     dropLayout(open);
 }
 
+void XMLTreeBuilder::appendText(std::string_view text, bool isLayout, XMLNode* before) {
+    auto* node = new (_blocks) XMLNode(XMLNodeKind::text, String(), _values.valued(text));
+    node->_isLayout = isLayout;
+    appendChild(*_open.back().element, node, before);
+}
+
 void XMLTreeBuilder::dropLayout(const OpenElement& open) noexcept {
-    if (_layouts.size() == open.firstLayout)
-        return;
-    _layoutText.resize(_layouts[open.firstLayout].start);
-    _layouts.erase(_layouts.begin() + static_cast<std::ptrdiff_t>(open.firstLayout),
-                   _layouts.end());
+    while (_layouts.size() > open.firstLayout)
+        _layouts.pop_back();
 }
 
 void XMLTreeBuilder::appendChild(XMLElement& parent, XMLNode* child, XMLNode* before) noexcept {
@@ -135,12 +139,11 @@ void XMLTreeBuilder::appendToCurrent(Ref<XMLNode> node) {
         appendChild(*_open.back().element, node.detach());
 }
 
-void XMLTreeBuilder::requireSize(std::size_t size, const char* what) const {
-    if (size > _options.maximumTextSize)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                           std::string(what) + " is larger than the limit of " +
-                               std::to_string(_options.maximumTextSize) + " bytes",
-                           ParseFailure::beyondLimit};
+void XMLTreeBuilder::refuseSize(const char* what) const {
+    throw ParseFailure{XML_ERR_INTERNAL_ERROR,
+                       std::string(what) + " is larger than the limit of " +
+                           std::to_string(_options.maximumTextSize) + " bytes",
+                       ParseFailure::beyondLimit};
 }
 
 } // namespace qx

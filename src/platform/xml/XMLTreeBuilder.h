@@ -6,6 +6,7 @@
 
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include "platform/xml/NodeBlocks.h"
 #include "platform/xml/SharedValues.h"
 
 #include <string>
@@ -15,8 +16,9 @@ namespace qx {
 
 class XMLTreeBuilder {
 public:
+    // Used on the thread that makes it.
     XMLTreeBuilder(XMLDocument& document, const XMLParseOptions& options)
-        : _document(document), _options(options) {}
+        : _document(document), _options(options), _blocks(NodeBlocks::ofThread()) {}
 
     void startElement(const String& name, std::size_t line, std::size_t column);
     // Of the element that was started last, before anything inside it.
@@ -24,8 +26,13 @@ public:
     void addAttribute(const String& name, std::string_view value);
     void setPreservesSpace(bool preserves) { _open.back().preservesSpace = preserves; }
     void endElement();
-    // A piece of text; `isLayout` when it is white space that stands in the document as such.
-    void addText(std::string_view piece, bool isLayout);
+
+    struct TextPiece {
+        std::string_view text;
+        bool isLayout;  // white space that stands in the document as such
+        bool isLasting; // stays where it is until the document is finished
+    };
+    void addText(const TextPiece& piece);
     void addComment(std::string_view text);
     void addProcessingInstruction(const String& target, std::string_view data);
 
@@ -39,25 +46,36 @@ private:
     };
     // A text of white space put aside until another text shows that it matters.
     struct Layout {
-        XMLNode* after; // the node that it follows; null for the first
-        std::size_t start;
-        std::size_t size;
+        XMLNode* after;           // the node that it follows; null for the first
+        std::string_view lasting; // its text, or empty for
+        String owned;             // a text that would not last
     };
 
-    void finishText();
+    void finishText() {
+        if (!_lasting.empty() || !_joined.empty())
+            placeText();
+    }
+    void placeText();
+    void appendText(std::string_view text, bool isLayout, XMLNode* before);
     void appendChild(XMLElement& parent, XMLNode* child, XMLNode* before = nullptr) noexcept;
     void appendToCurrent(Ref<XMLNode> node);
     void restoreLayout(OpenElement& open);
     void dropLayout(const OpenElement& open) noexcept;
-    void requireSize(std::size_t size, const char* what) const;
+    void requireSize(std::size_t size, const char* what) const {
+        if (size > _options.maximumTextSize)
+            refuseSize(what);
+    }
+    [[noreturn]] void refuseSize(const char* what) const;
 
     XMLDocument& _document;
     const XMLParseOptions _options;
+    NodeBlocks& _blocks;
     std::vector<OpenElement> _open;
-    std::string _text; // of the current text, so far
+    // The current text: one lasting piece, or several joined.
+    std::string_view _lasting;
+    std::string _joined;
     bool _textIsLayout = false;
     std::vector<Layout> _layouts;
-    std::string _layoutText;
     SharedValues _values;
 };
 

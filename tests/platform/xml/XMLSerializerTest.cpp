@@ -146,8 +146,8 @@ TEST(XMLSerializer, WhatWouldBeNoXMLIsRefusedByItsPlace) {
          [](XMLElement& item) {
              item.addChild(XMLNode::initProcessingInstructionWithName("XML", ""));
          }},
-        {"a prefix holds a colon at /order/item[2]/@xmlns:a:b",
-         [](XMLElement& item) { item.addNamespace(XMLNode::namespaceWithName("a:b", "u")); }},
+        {"a name is no XML name at /order/item[2]/@xmlns:1",
+         [](XMLElement& item) { item.addNamespace(XMLNode::namespaceWithName("1", "u")); }},
         {"a namespace is declared twice at /order/item[2]/@xmlns:p",
          [](XMLElement& item) {
              item.addNamespace(XMLNode::namespaceWithName("p", "u"));
