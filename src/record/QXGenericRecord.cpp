@@ -1,8 +1,9 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
-#include <QXXMLMarshalling/platform/Array.h>
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/UserDefaults.h>
+
+#include "platform/object/NameList.h"
 
 using qx::Dictionary;
 using qx::Key;
@@ -180,6 +181,5 @@ Ref<qx::CountedSet> QXGenericRecord::allKnownKeyPaths() { return qx::make<qx::Co
 
 bool QXGenericRecord::automaticallyNotifiesObserversForKey(const qx::Class& receiver,
                                                            const String& key) {
-    const auto own = receiver.perform("allKnownKeyPaths").as<qx::CountedSet>();
-    return !own || !own->contains(key);
+    return !qx::listsName(receiver.perform("allKnownKeyPaths"), key);
 }

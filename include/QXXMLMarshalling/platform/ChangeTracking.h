@@ -59,6 +59,8 @@ public:
     void restoreValue(const Value& value, Key key);
 
 private:
+    bool isCache(const Value& value) const noexcept;
+
     Object& _owner;
     Ref<UndoManager> _undoManager;
     mutable Ref<Dictionary> _cache;

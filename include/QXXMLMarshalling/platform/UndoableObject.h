@@ -15,7 +15,8 @@
 //
 // Keys are kept out of undo as ChangeTracking.h says. An undo manager keeps old values alive, and
 // these may hold the object that holds the manager: call removeAllActions when an editor closes.
-// So does the change cache, which holds the latest old value of a key that is not registered.
+// So does the change cache, which holds the latest old value of a key that is not registered:
+// setChangeCache(nullptr) drops it.
 
 #include <QXXMLMarshalling/platform/ChangeTracking.h>
 
@@ -33,6 +34,7 @@ public:
         _tracking.setUndoManager(std::move(undoManager));
     }
     Ref<Dictionary> changeCache() const { return _tracking.changeCache(); }
+    void setChangeCache(Ref<Dictionary> cache) { _tracking.setChangeCache(std::move(cache)); }
     bool isUndoRegistrationEnabledForKey(Key key) const {
         return _tracking.isUndoRegistrationEnabledForKey(key);
     }

@@ -1,10 +1,9 @@
 #include <QXXMLMarshalling/platform/ChangeTracking.h>
 
-#include <QXXMLMarshalling/platform/Array.h>
 #include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/CountedSet.h>
 #include <QXXMLMarshalling/platform/Null.h>
 
+#include "platform/object/NameList.h"
 #include "platform/object/Warning.h"
 
 namespace qx {
@@ -13,14 +12,12 @@ namespace {
 
 Value nullForMarker(const Value& value) { return value.isNullOrMarker() ? Value() : value; }
 
-bool holds(const Value& names, Key key) {
-    if (const auto set = names.as<CountedSet>())
-        return set->contains(key.string());
-    const auto array = names.as<Array>();
-    return array && array->contains(key.string());
-}
-
 } // namespace
+
+// An owner may offer its cache as a property. It is no value to remember: it would hold itself.
+bool ChangeTracking::isCache(const Value& value) const noexcept {
+    return _cache && value.object() == _cache.get();
+}
 
 Ref<Dictionary> ChangeTracking::changeCache() const {
     if (!_cache)
@@ -30,6 +27,8 @@ Ref<Dictionary> ChangeTracking::changeCache() const {
 
 void ChangeTracking::willChangeValueForKey(Key key) {
     Value current = _owner.valueForKey(key);
+    if (isCache(current))
+        return;
     const bool isNull = current.isNullOrMarker();
     // No entry reads as null, so most objects of a document that is only read need no cache. Keys
     // with a "@" are the dictionary's own properties: they have a value in an empty cache too.
@@ -52,6 +51,8 @@ void ChangeTracking::didChangeValueForKey(Key key) {
     const Ref<UndoManager> manager = _undoManager;
     const Value before = nullForMarker(_cache ? _cache->get(key.string()) : Value());
     const Value now = nullForMarker(_owner.valueForKey(key));
+    if (isCache(now))
+        return;
     if (now.isSameAs(before) || (!now.isNull() && now.isEqual(before)))
         return;
     if (const DebugSink log = debugSink()) {
@@ -71,7 +72,7 @@ bool ChangeTracking::isUndoRegistrationEnabledForKey(Key key) const {
         return true;
     const Class& type = _owner.isa();
     if (type.classOperation(disabledKeyPaths) != nullptr &&
-        holds(type.perform(disabledKeyPaths), key))
+        listsName(type.perform(disabledKeyPaths), key))
         return false;
     const String name =
         String::concat({"isUndoRegistrationEnabledFor", key.string().capitalized()});

@@ -1,4 +1,5 @@
 #include "platform/object/Warning.h"
+#include "support/RandomHistory.h"
 
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/CountedSet.h>
@@ -9,7 +10,6 @@
 
 #include <gtest/gtest.h>
 
-#include <optional>
 #include <random>
 
 namespace {
@@ -163,128 +163,17 @@ TEST_F(ChangeTrackingTest, EachRegistrationIsLoggedByWhatIsGoingOn) {
                                                 "Redo for key: age existing: 0 value: 7"}));
 }
 
-// Objects changed at random, beside a plain list of the states that they went through.
-class History {
-public:
-    explicit History(unsigned seed) : _random(seed) {
-        for (auto& person : _people) {
-            person = make<Person>();
-            person->setUndoManager(_manager);
-        }
-        _states.push_back(state());
-    }
-    ~History() {
-        for (const auto& person : _people) {
-            person->setValueForKey(nullptr, "partner"); // the caches hold no partner either
-            person->setUndoManager(nullptr);
-        }
-        _manager->removeAllActions();
-    }
-
-    // False as soon as objects and list disagree.
-    bool agreesFor(int steps) {
-        while (--steps >= 0) {
-            const unsigned choice = below(6);
-            if (choice > 1)
-                change();
-            else if (!(choice == 0 ? undo() : redo()))
-                return false;
-            if (!agrees())
-                return false;
-        }
-        while (_manager->canUndo())
-            if (!undo())
-                return false;
-        if (_position != 0)
-            return false;
-        while (_manager->canRedo())
-            if (!redo())
-                return false;
-        return _position + 1 == _states.size();
-    }
-
-private:
-    using State = std::vector<Value>;
-
-    unsigned below(unsigned limit) { return static_cast<unsigned>(_random() % limit); }
-
-    State state() const {
-        State values;
-        for (const auto& person : _people)
-            for (const char* key : {"name", "age", "partner"})
-                values.push_back(person->valueForKey(key));
-        return values;
-    }
-
-    bool agrees() const {
-        return state() == _states[_position] && _manager->canUndo() == (_position > 0) &&
-               _manager->canRedo() == (_position + 1 < _states.size());
-    }
-
-    bool undo() {
-        _manager->undo();
-        if (_position > 0)
-            --_position;
-        return agrees();
-    }
-
-    bool redo() {
-        _manager->redo();
-        if (_position + 1 < _states.size())
-            ++_position;
-        return agrees();
-    }
-
-    void setSomething() {
-        Person& person = *_people[below(4)];
-        const unsigned number = below(5);
-        switch (below(4)) {
-        case 0:
-            return person.setValueForKey(number, "age");
-        case 1:
-            return person.rename(std::to_string(number));
-        case 2:
-            return person.setValueForKey(nullptr, below(2) == 0 ? "name" : "partner");
-        default:
-            person.setValueForKey(number < 4 ? _people[number] : Ref<Person>(), "partner");
-        }
-    }
-
-    // One entry: a group opened by hand or by itself, perhaps with groups inside; none where
-    // nothing changed. Changes that take each other back are an entry all the same.
-    void change() {
-        bool changed = false;
-        {
-            std::optional<UndoGroup> outer;
-            if (below(2) == 0)
-                outer.emplace(_manager);
-            for (unsigned i = below(4); i != 0; --i) {
-                std::optional<UndoGroup> inner;
-                if (outer && below(3) == 0)
-                    inner.emplace(_manager);
-                const State before = state();
-                setSomething();
-                changed = changed || state() != before;
-            }
-        }
-        _manager->endEventGroup();
-        if (!changed)
-            return;
-        _states.resize(++_position);
-        _states.push_back(state());
-    }
-
-    std::mt19937 _random;
-    Ref<UndoManager> _manager = make<UndoManager>();
-    std::array<Ref<Person>, 4> _people;
-    std::vector<State> _states;
-    std::size_t _position = 0;
-};
-
 TEST_F(ChangeTrackingTest, RandomHistoriesAgreeWithAPlainListOfStates) {
     const unsigned first = std::random_device()();
-    for (unsigned seed = first; seed != first + 2000; ++seed)
-        ASSERT_TRUE(History(seed).agreesFor(30)) << "seed " << seed;
+    for (unsigned seed = first; seed != first + 2000; ++seed) {
+        std::vector<Ref<Object>> people(4);
+        for (auto& one : people)
+            one = make<Person>();
+        support::RandomHistory history(
+            seed, std::move(people),
+            [](Object& object, const String& name) { static_cast<Person&>(object).rename(name); });
+        ASSERT_TRUE(history.agreesFor(30)) << "seed " << seed;
+    }
 }
 
 TEST_F(ChangeTrackingTest, ManySetsKeepABoundedNumberOfObjects) {

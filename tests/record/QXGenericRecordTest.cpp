@@ -1,0 +1,218 @@
+#include <QXXMLMarshalling/QXGenericRecord.h>
+
+#include "support/Show.h"
+
+#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/Observation.h>
+#include <QXXMLMarshalling/platform/UserDefaults.h>
+
+#include <gtest/gtest.h>
+
+#include <regex>
+
+namespace {
+
+using namespace qx;
+using Record = QXGenericRecord;
+
+// A record that handles one key itself and announces its changes itself.
+class Book : public Record {
+public:
+    int pages = 0;
+    static Ref<CountedSet> known() {
+        return make<CountedSet>(std::initializer_list<std::string_view>{"pages"});
+    }
+};
+
+// The same, with the keys in an array.
+class Leaflet : public Book {
+public:
+    static std::vector<String> knownToo() { return {"pages"}; }
+};
+
+const bool described = [] {
+    Class::define<Book, Record>("QXGenericRecordTest.Book")
+        .property<&Book::pages>("pages")
+        .classOperation<&Book::known>("allKnownKeyPaths");
+    Class::define<Leaflet, Book>("QXGenericRecordTest.Leaflet")
+        .classOperation<&Leaflet::knownToo>("allKnownKeyPaths");
+    return true;
+}();
+
+TEST(QXGenericRecordTest, AFreshRecordHoldsNothing) {
+    const auto record = make<Record>();
+    EXPECT_FALSE(record->contents());
+    EXPECT_TRUE(record->className().isNull());
+    EXPECT_FALSE(record->undoManager());
+    EXPECT_TRUE(record->changeCache()->isEmpty());
+    EXPECT_TRUE(record->notifyBindingsObservers());
+    EXPECT_FALSE(record->perform("isRemovable").boolValue());
+    EXPECT_TRUE(record->keys().empty());
+}
+
+TEST(QXGenericRecordTest, AnyKeyIsContentAndNullRemovesIt) {
+    const auto record = make<Record>();
+    for (const char* key : {"title", "description", "", "@count", "a.b", "isRemovable"}) {
+        EXPECT_TRUE(record->valueForKey(key).isNull()) << key;
+        record->setValueForKey(7, key);
+        EXPECT_EQ(record->valueForKey(key), Value(7)) << key;
+        EXPECT_EQ(record->contents()->get(key), Value(7)) << key;
+    }
+    EXPECT_EQ(record->keys().size(), 6U);
+    record->setValueForKey(nullptr, "title");
+    EXPECT_EQ(record->keys().front(), "description");
+}
+
+TEST(QXGenericRecordTest, SettingNullOnAFreshRecordMakesEmptyContentsAndTellsOfIt) {
+    const auto record = make<Record>();
+    int told = 0;
+    const auto token = record->observe("title", [&](const ValueChange&) { ++told; });
+    record->setValueForKey(nullptr, "title");
+    EXPECT_TRUE(record->contents()->isEmpty());
+    EXPECT_EQ(told, 1);
+}
+
+TEST(QXGenericRecordTest, FiveKeysArePropertiesAndNoContent) {
+    const auto record = make<Record>();
+    const auto contents = make<Dictionary>();
+    const auto manager = make<UndoManager>();
+    record->setValueForKey(contents, "contents");
+    record->setValueForKey("Order", "className");
+    record->setValueForKey(false, "notifyBindingsObservers");
+    EXPECT_EQ(record->classNameForMarshalling(), "Order");
+    EXPECT_FALSE(record->notifyBindingsObservers());
+    record->setValueForKey(manager, "undoManager");
+    EXPECT_EQ(record->valueForKey("undoManager").object(), manager.get());
+    EXPECT_EQ(record->contents(), contents);
+    EXPECT_TRUE(contents->isEmpty());
+    record->setChangeCache(nullptr); // it holds the manager
+}
+
+// Announcing the change must not put the cache into itself.
+TEST(QXGenericRecordTest, TheChangeCacheIsNoValueToRemember) {
+    const auto record = make<Record>();
+    EXPECT_EQ(record->trySetValueForKey("text", "changeCache"), SetOutcome::refused);
+    EXPECT_FALSE(record->changeCache()->contains("changeCache"));
+    const auto manager = make<UndoManager>();
+    record->setUndoManager(manager);
+    const auto cache = make<Dictionary>();
+    record->setValueForKey(cache, "changeCache");
+    EXPECT_EQ(record->changeCache(), cache);
+    EXPECT_TRUE(cache->isEmpty());
+    EXPECT_FALSE(manager->canUndo());
+}
+
+TEST(QXGenericRecordTest, ValuesComeAsWhatTheyAreAskedFor) {
+    const auto record = make<Record>();
+    record->setValueForKey("12", "count");
+    EXPECT_EQ(record->get<int>("count"), 12);
+    EXPECT_EQ(record->get<std::string>("count"), "12");
+    EXPECT_EQ(record->get<bool>("count"), std::nullopt);
+    EXPECT_EQ(record->get<int>("none"), std::nullopt);
+}
+
+TEST(QXGenericRecordTest, ItIsMarshalledUnderTheNameThatItWasGiven) {
+    EXPECT_EQ(make<Record>()->classNameForMarshalling(), "QXGenericRecord");
+    EXPECT_EQ(make<Book>()->classNameForMarshalling(), "QXGenericRecordTest.Book");
+    const auto book = make<Book>();
+    book->perform("setClassNameForMarshalling:", "Novel");
+    EXPECT_EQ(book->className(), "Novel");
+    EXPECT_EQ(book->classNameForMarshalling(), "Novel");
+}
+
+TEST(QXGenericRecordTest, ACopyHasItsOwnDictionaryAndNoHistory) {
+    const auto author = make<Record>();
+    const auto book = make<Book>();
+    book->setClassName(std::string("a name of its own"));
+    book->setNotifyBindingsObservers(false);
+    book->setUndoManager(make<UndoManager>());
+    book->setValueForKey(author, "author");
+    const auto copy = book->copyWithZone();
+    EXPECT_EQ(&copy->isa(), &book->isa());
+    EXPECT_EQ(copy->className().view().data(), book->className().view().data());
+    EXPECT_FALSE(copy->notifyBindingsObservers());
+    EXPECT_FALSE(copy->undoManager());
+    EXPECT_TRUE(copy->changeCache()->isEmpty());
+    copy->setValueForKey("new", "title");
+    EXPECT_TRUE(book->valueForKey("title").isNull());
+    EXPECT_EQ(copy->valueForKey("author").object(), author.get());
+    EXPECT_FALSE(make<Record>()->copyWithZone()->contents());
+}
+
+TEST(QXGenericRecordTest, ACopyIsDeepWhereTheHostSaysHow) {
+    struct Restore {
+        ~Restore() { Dictionary::setDeepCopyFunction(nullptr); }
+    } restore;
+    Dictionary::setDeepCopyFunction([](const Dictionary& dictionary) {
+        const auto copy = make<Dictionary>();
+        for (const auto& entry : dictionary)
+            if (const auto record = entry.value.as<Record>())
+                copy->set(entry.key, record->copyWithZone());
+        return copy;
+    });
+    const auto book = make<Record>();
+    book->setValueForKey(make<Record>(), "author");
+    const auto copy = book->copyWithZone();
+    EXPECT_TRUE(copy->valueForKey("author").as<Record>());
+    EXPECT_NE(copy->valueForKey("author").object(), book->valueForKey("author").object());
+}
+
+// The description with "ADDRESS" in place of addresses.
+std::string described_(const Ref<Record>& record) {
+    return std::regex_replace(record->description().str(), std::regex("0x[0-9a-f]+"), "ADDRESS");
+}
+
+TEST(QXGenericRecordTest, TheDescriptionTellsClassNameAndContentsWhereThereAreAny) {
+    const auto book = make<Book>();
+    book->setContents(make<Dictionary>());
+    EXPECT_EQ(described_(book), "<QXGenericRecordTest.Book: ADDRESS>");
+    book->setClassName("QXGenericRecordTest.Book");
+    EXPECT_EQ(described_(book), "<QXGenericRecordTest.Book: ADDRESS>");
+    book->setClassName("");
+    EXPECT_EQ(described_(book), "<QXGenericRecordTest.Book: ADDRESS>");
+    book->setClassName("Novel");
+    book->setValueForKey("t", "title");
+    EXPECT_EQ(described_(book), "<QXGenericRecordTest.Book: ADDRESS> className: Novel contents:\n"
+                                "{\n    title = t;\n}");
+    EXPECT_EQ(book->perform("description"), Value(book->description()));
+}
+
+TEST(QXGenericRecordTest, ARingOfRecordsIsPrintedOnce) {
+    const auto one = make<Record>();
+    const auto two = make<Record>();
+    one->setValueForKey(two, "next");
+    two->setValueForKey(one, "next");
+    EXPECT_EQ(described_(one), "<QXGenericRecord: ADDRESS> contents:\n"
+                               "{\n"
+                               "    next = <QXGenericRecord: ADDRESS> contents:\n"
+                               "    {\n"
+                               "        next = <QXGenericRecord: ADDRESS> contents:\n"
+                               "...;\n"
+                               "    };\n"
+                               "}");
+    two->setContents(nullptr);
+}
+
+TEST(QXGenericRecordTest, ASubclassAnnouncesItsOwnKeysItself) {
+    EXPECT_TRUE(Record::allKnownKeyPaths()->isEmpty());
+    for (const Ref<Book>& book : {make<Book>(), Ref<Book>(make<Leaflet>())}) {
+        int told = 0;
+        const auto pages = book->observe("pages", [&](const ValueChange&) { ++told; });
+        const auto title = book->observe("title", [&](const ValueChange&) { told += 10; });
+        book->setValueForKey(7, "pages");
+        EXPECT_EQ(told, 0) << book->isa().name().view();
+        EXPECT_EQ(book->pages, 7);
+        book->setValueForKey("t", "title");
+        EXPECT_EQ(told, 10);
+    }
+}
+
+TEST(QXGenericRecordTest, AccessorMessagesAreOffAsRegistered) {
+    const auto defaults = UserDefaults::standardUserDefaults();
+    EXPECT_EQ(defaults->stringForKey(AllowMethodForwardingInGenericRecords), "NO");
+    EXPECT_FALSE(defaults->boolForKey("AllowMethodForwardingInGenericRecords"));
+}
+
+} // namespace

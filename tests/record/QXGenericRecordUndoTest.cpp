@@ -1,0 +1,220 @@
+#include <QXXMLMarshalling/QXGenericRecord.h>
+
+#include "support/RandomHistory.h"
+
+#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Null.h>
+#include <QXXMLMarshalling/platform/Observation.h>
+#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/platform/WeakRef.h>
+
+#include <gtest/gtest.h>
+
+#include <random>
+
+namespace {
+
+using namespace qx;
+using Record = QXGenericRecord;
+
+// Keeps some of its keys out of undo.
+class Book : public Record {
+public:
+    int pages = 0;
+    bool allows = false;
+    bool titleIsUndoable() { return allows; }
+    static std::vector<String> disabled() { return {"mark"}; }
+    static bool yes() { return true; }
+};
+
+class Reader : public UndoableObject {
+public:
+    String name;
+    int age = 0;
+    Value partner;
+};
+
+const bool described = [] {
+    Class::define<Book, Record>("QXGenericRecordUndoTest.Book")
+        .property<&Book::pages>("pages")
+        .operation<&Book::titleIsUndoable>("isUndoRegistrationEnabledForMaintitle")
+        .classOperation<&Book::yes>("isUndoRegistrationEnabledForShelf")
+        .classOperation<&Book::disabled>("disabledKeyPathsForUndoRegistration");
+    Class::define<Reader, UndoableObject>("QXGenericRecordUndoTest.Reader")
+        .property<&Reader::name>("name")
+        .property<&Reader::age>("age")
+        .property<&Reader::partner>("partner");
+    return true;
+}();
+
+struct QXGenericRecordUndoTest : testing::Test {
+    Ref<UndoManager> manager = make<UndoManager>();
+    Ref<Book> book = make<Book>();
+
+    QXGenericRecordUndoTest() { book->setUndoManager(manager); }
+
+    // Whether setting the key can be undone.
+    bool registers(Key key, const Value& value) {
+        book->setValueForKey(value, key);
+        manager->endEventGroup();
+        const bool can = manager->canUndo();
+        manager->removeAllActions();
+        return can;
+    }
+};
+
+TEST_F(QXGenericRecordUndoTest, UndoingRemovesAKeyThatWasNewAndRedoingBringsItBack) {
+    book->setValueForKey("Emma", "name");
+    EXPECT_EQ(book->changeCache()->get("name"), Value("Emma"));
+    manager->undo();
+    EXPECT_FALSE(book->contents()->contains("name"));
+    EXPECT_EQ(book->changeCache()->get("name").object(), Null::marker());
+    manager->redo();
+    EXPECT_EQ(book->valueForKey("name"), Value("Emma"));
+    EXPECT_EQ(book->changeCache()->get("name"), Value("Emma"));
+    EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(QXGenericRecordUndoTest, RemovalsAndPropertiesOfSubclassesAreUndoneToo) {
+    book->setValueForKey("Emma", "name");
+    book->setValueForKey(300, "pages");
+    manager->endEventGroup();
+    book->setValueForKey(nullptr, "name");
+    book->setValueForKey(301, "pages");
+    manager->undo();
+    EXPECT_EQ(book->valueForKey("name"), Value("Emma"));
+    EXPECT_EQ(book->pages, 300);
+    manager->undo();
+    EXPECT_EQ(book->pages, 0);
+}
+
+TEST_F(QXGenericRecordUndoTest, OnlyRealChangesAreRegistered) {
+    EXPECT_FALSE(registers("name", nullptr));
+    EXPECT_TRUE(registers("name", "Emma"));
+    EXPECT_FALSE(registers("name", std::string("Emma")));
+    EXPECT_TRUE(registers("name", nullptr));
+    EXPECT_TRUE(registers("size", 3));
+    EXPECT_FALSE(registers("size", 3.0));
+    EXPECT_FALSE(registers("self", Null::marker())); // stands for null
+}
+
+TEST_F(QXGenericRecordUndoTest, WithoutRegistrationValuesChangeAndObserversAreTold) {
+    int told = 0;
+    const auto token = book->observe("name", [&](const ValueChange&) { ++told; });
+    manager->disableUndoRegistration();
+    EXPECT_FALSE(registers("name", "Emma"));
+    manager->enableUndoRegistration();
+    book->setUndoManager(nullptr);
+    EXPECT_FALSE(registers("name", "Persuasion"));
+    EXPECT_EQ(told, 2);
+    // What changed meanwhile is where undoing ends.
+    book->setUndoManager(manager);
+    book->setValueForKey("Emma", "name");
+    manager->undo();
+    EXPECT_EQ(book->valueForKey("name"), Value("Persuasion"));
+}
+
+TEST_F(QXGenericRecordUndoTest, TheClassOrTheRecordMayKeepKeysOutOfUndo) {
+    const struct {
+        const char* key;
+        bool allows, registered;
+    } cases[] = {
+        {"name", false, true},
+        {"mark", true, false},       // listed by the class
+        {"shelf", true, false},      // a class operation, although it says yes
+        {"mainTitle", false, false}, // the record's own operation, by the capitalized key
+        {"mainTitle", true, true},
+        {"main title", false, true}, // its operation would be …ForMain Title
+        {"", false, true},
+    };
+    int value = 0;
+    for (const auto& row : cases) {
+        book->allows = row.allows;
+        EXPECT_EQ(book->isUndoRegistrationEnabledForKey(row.key), row.registered) << row.key;
+        EXPECT_EQ(registers(row.key, ++value), row.registered) << row.key;
+    }
+}
+
+TEST_F(QXGenericRecordUndoTest, ItemsOfACollectionAreRememberedButOnlyANewCollectionIsRegistered) {
+    const auto before = make<Array>(std::initializer_list<Value>{"one"});
+    book->setContents(make<Dictionary>());
+    book->contents()->set("chapters", before);
+    const std::size_t indexes[] = {1};
+    book->willChange(ChangeKind::insertion, indexes, "chapters");
+    before->add("two");
+    book->didChange(ChangeKind::insertion, indexes, "chapters");
+    EXPECT_EQ(book->changeCache()->get("chapters").object(), before.get());
+    EXPECT_FALSE(manager->canUndo());
+    const auto after = before->mutableCopy();
+    after->remove(0);
+    book->setValueForKey(after, "chapters");
+    manager->undo();
+    EXPECT_EQ(book->valueForKey("chapters").object(), before.get());
+}
+
+TEST_F(QXGenericRecordUndoTest, ObserversAreToldOfUndoAndRedoToo) {
+    std::string told;
+    const auto token = book->observe("name", [&](const ValueChange& change) {
+        told += String::concat(
+            {change.oldValue.description(), ">", change.newValue.description(), " "});
+    });
+    book->setValueForKey("Emma", "name");
+    manager->undo();
+    manager->redo();
+    EXPECT_EQ(told, "(null)>Emma Emma>(null) (null)>Emma ");
+}
+
+TEST_F(QXGenericRecordUndoTest, ARecordThatDiesLeavesNoActions) {
+    const auto other = make<Record>();
+    other->setUndoManager(manager);
+    other->setValueForKey("Ann", "name");
+    manager->endEventGroup();
+    book->setValueForKey("Emma", "name");
+    book = nullptr;
+    manager->undo();
+    EXPECT_TRUE(other->valueForKey("name").isNull());
+    EXPECT_FALSE(manager->canUndo());
+}
+
+TEST_F(QXGenericRecordUndoTest, FillingAFreshRecordMakesNothingButItsContents) {
+    const auto fresh = make<Record>();
+    const auto before = Object::liveCount();
+    for (const char* key : {"name", "size", "shelf"})
+        fresh->setValueForKey(book, key);
+    EXPECT_EQ(Object::liveCount(), before + 1);
+}
+
+TEST_F(QXGenericRecordUndoTest, TheCacheKeepsOldValuesUntilItIsDropped) {
+    auto first = make<Record>();
+    auto second = make<Record>();
+    const auto before = Object::liveCount();
+    first->setValueForKey(second, "next");
+    second->setValueForKey(first, "next");
+    first->setValueForKey(nullptr, "next"); // without an undo manager: the cache has it still
+    const WeakRef<Record> watched(first);
+    second = nullptr;
+    EXPECT_TRUE(first->changeCache()->get("next").as<Record>());
+    first->setChangeCache(nullptr);
+    first = nullptr;
+    EXPECT_FALSE(watched);
+    EXPECT_LT(Object::liveCount(), before);
+}
+
+TEST_F(QXGenericRecordUndoTest, RandomHistoriesOfRecordsAndHostObjectsAgreeWithAList) {
+    const unsigned seeds = std::random_device()();
+    for (unsigned seed = seeds; seed != seeds + 3000; ++seed) {
+        std::vector<Ref<Object>> objects{make<Record>(), make<Reader>(), make<Book>(),
+                                         make<Reader>(), make<Record>()};
+        support::RandomHistory history(seed, std::move(objects),
+                                       [](Object& object, const String& name) {
+                                           const ChangeScope scope(object, "name");
+                                           if (auto* reader = dynamic_cast<Reader*>(&object))
+                                               reader->name = name;
+                                           else
+                                               object.setValueForKey(name, "name");
+                                       });
+        ASSERT_TRUE(history.agreesFor(30)) << "seed " << seed;
+    }
+}
+
+} // namespace
