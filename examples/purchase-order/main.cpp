@@ -60,9 +60,10 @@ void printOrder(const qx::Object& order) {
     const std::string currency = textOf(order, "currency");
     std::cout << "  total " << total.text() << (currency.empty() ? "" : " ") << currency << '\n';
 
-    for (const auto& event : itemsOf<qx::Object>(order, "history"))
-        std::cout << "  " << event->classNameForMarshalling().view() << " on "
-                  << textOf(*event, "on") << " by " << textOf(*event, "by") << '\n';
+    if (const auto history = order.valueForKey("history").as<qx::Object>())
+        for (const auto& event : itemsOf<qx::Object>(*history, "events"))
+            std::cout << "  " << event->classNameForMarshalling().view() << " on "
+                      << textOf(*event, "on") << " by " << textOf(*event, "by") << '\n';
     for (const auto& remark : itemsOf<qx::Object>(order, "remarks"))
         std::cout << "  remark: " << textOf(*remark, "text") << '\n';
 }
