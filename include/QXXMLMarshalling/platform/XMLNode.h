@@ -21,7 +21,6 @@
 
 namespace qx {
 
-class NodeBlocks;
 class XMLDocument;
 class XMLElement;
 class XMLNode;
@@ -89,9 +88,7 @@ public:
     ~XMLNode() override;
     // Nodes share blocks of memory.
     static void* operator new(std::size_t size);
-    static void* operator new(std::size_t size, NodeBlocks& blocks);
     static void operator delete(void* node) noexcept;
-    static void operator delete(void* node, NodeBlocks& blocks) noexcept;
 
     static Ref<XMLNode> initTextWithStringValue(const String& text);
     static Ref<XMLNode> initCommentWithStringValue(const String& text);

@@ -122,7 +122,7 @@ struct SAXSession::Callbacks {
     }
     static void cdata(void* user, const xmlChar* text, int length) {
         guarded(user, [&](SAXSession& self) {
-            self._builder.addText({viewOf(text, text + length), false, false});
+            self._builder.addText(viewOf(text, text + length), false, false);
         });
     }
     static void comment(void* user, const xmlChar* text) {
@@ -256,9 +256,9 @@ void SAXSession::addText(std::string_view piece) {
     const bool isLayout = isWhite(piece) && (isOwn || !isInsideReference());
     if (isOwn) {
         const std::size_t start = static_cast<std::size_t>(input.consumed) + place;
-        _builder.addText({_text.substr(start, piece.size()), isLayout, true});
+        _builder.addText(_text.substr(start, piece.size()), isLayout, true);
     } else {
-        _builder.addText({piece, isLayout, false});
+        _builder.addText(piece, isLayout, false);
     }
 }
 

@@ -24,11 +24,7 @@ XMLNode::~XMLNode() = default;
 
 void* XMLNode::operator new(std::size_t size) { return NodeBlocks::ofThread().allocate(size); }
 
-void* XMLNode::operator new(std::size_t size, NodeBlocks& blocks) { return blocks.allocate(size); }
-
 void XMLNode::operator delete(void* node) noexcept { NodeBlocks::release(node); }
-
-void XMLNode::operator delete(void* node, NodeBlocks&) noexcept { NodeBlocks::release(node); }
 
 Ref<XMLNode> XMLNode::initTextWithStringValue(const String& text) {
     return Ref<XMLNode>::adopt(new XMLNode(XMLNodeKind::text, String(), present(text)));

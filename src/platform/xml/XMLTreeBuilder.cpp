@@ -19,6 +19,11 @@ std::uint32_t saturated(std::size_t number) {
 
 } // namespace
 
+inline XMLNode* XMLTreeBuilder::newNode(XMLNodeKind kind, String name, String value) {
+    return ::new (_blocks.allocate(sizeof(XMLNode)))
+        XMLNode(kind, std::move(name), std::move(value));
+}
+
 void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::size_t column) {
     finishText();
     if (_open.size() >= _options.maximumDepth)
@@ -29,7 +34,7 @@ void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::siz
     requireSize(name.size(), "A name");
     const bool preserves = !_open.empty() && _open.back().preservesSpace;
     const std::size_t namespaces = _open.empty() ? 0 : _open.back().namespaces;
-    auto* element = new (_blocks) XMLElement(name);
+    auto* element = ::new (_blocks.allocate(sizeof(XMLElement))) XMLElement(name);
     element->_line = saturated(line);
     element->_column = saturated(column);
     if (_open.empty())
@@ -47,7 +52,7 @@ void XMLTreeBuilder::addNamespace(const String& prefix, const String& URI) {
                            ParseFailure::beyondLimit};
     XMLElement& element = *_open.back().element;
     XMLSiblings::append(element, element._firstNamespace,
-                        new (_blocks) XMLNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
+                        newNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
 }
 
 void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
@@ -55,7 +60,7 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
     requireSize(value.size(), "An attribute's value");
     XMLElement& element = *_open.back().element;
     XMLSiblings::append(element, element._firstAttribute,
-                        new (_blocks) XMLNode(XMLNodeKind::attribute, name, _values.valued(value)));
+                        newNode(XMLNodeKind::attribute, name, _values.valued(value)));
 }
 
 void XMLTreeBuilder::endElement() {
@@ -64,16 +69,16 @@ void XMLTreeBuilder::endElement() {
     _open.pop_back();
 }
 
-void XMLTreeBuilder::addText(const TextPiece& piece) {
-    requireSize(_lasting.size() + _joined.size() + piece.text.size(), "A text");
+void XMLTreeBuilder::addText(std::string_view piece, bool isLayout, bool isLasting) {
+    requireSize(_lasting.size() + _joined.size() + piece.size(), "A text");
     const bool isFirst = _lasting.empty() && _joined.empty();
-    _textIsLayout = piece.isLayout && (isFirst || _textIsLayout);
-    if (isFirst && piece.isLasting) {
-        _lasting = piece.text;
+    _textIsLayout = isLayout && (isFirst || _textIsLayout);
+    if (isFirst && isLasting) {
+        _lasting = piece;
         return;
     }
     _joined += _lasting;
-    _joined += piece.text;
+    _joined += piece;
     _lasting = {};
 }
 
@@ -117,7 +122,7 @@ void XMLTreeBuilder::restoreLayout(OpenElement& open) {
 }
 
 void XMLTreeBuilder::appendText(std::string_view text, bool isLayout, XMLNode* before) {
-    auto* node = new (_blocks) XMLNode(XMLNodeKind::text, String(), _values.valued(text));
+    auto* node = newNode(XMLNodeKind::text, String(), _values.valued(text));
     node->_isLayout = isLayout;
     appendChild(*_open.back().element, node, before);
 }

@@ -27,12 +27,9 @@ public:
     void setPreservesSpace(bool preserves) { _open.back().preservesSpace = preserves; }
     void endElement();
 
-    struct TextPiece {
-        std::string_view text;
-        bool isLayout;  // white space that stands in the document as such
-        bool isLasting; // stays where it is until the document is finished
-    };
-    void addText(const TextPiece& piece);
+    // A piece of text. `isLayout`: white space that stands in the document as such; `isLasting`:
+    // the piece stays where it is until the document is finished.
+    void addText(std::string_view piece, bool isLayout, bool isLasting);
     void addComment(std::string_view text);
     void addProcessingInstruction(const String& target, std::string_view data);
 
@@ -51,6 +48,7 @@ private:
         String owned;             // a text that would not last
     };
 
+    XMLNode* newNode(XMLNodeKind kind, String name, String value);
     void finishText() {
         if (!_lasting.empty() || !_joined.empty())
             placeText();
