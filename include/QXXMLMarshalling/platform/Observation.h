@@ -3,10 +3,12 @@
 // Hearing of changes: an observer is told after (or before) the value at a key path of another
 // object changed, whichever object on the path changed it.
 //
-//     order.addObserver(view, "shipTo.city", Observing::newValue | Observing::oldValue,
-//     "cityChanged:"); auto token = order.observe("total", [](const ValueChange& change) {
-//     show(change.newValue); }); { const ChangeScope scope(order, "total"); order.addLine(line); }
-//     // a plain C++ change
+//     order.addObserver(view, "shipTo.city", 3, "cityChanged:");   // old and new value
+//     auto token = order.observe("total", [](const ValueChange& change) { show(change); });
+//     {
+//         const ChangeScope scope(order, "total");                 // a change in plain C++
+//         order.addLine(line);
+//     }
 //
 // Neither side keeps the other alive: with the observer or the observed object the observation
 // ends. Observers are told in the order in which they came; while told they may remove themselves
@@ -59,7 +61,7 @@ struct ValueChange {
 // Ends its observation with its scope. Empty by default and after a move.
 class QX_API ObservationToken {
 public:
-    ObservationToken() noexcept = default;
+    ObservationToken() noexcept;
     explicit ObservationToken(Ref<Observance> observance) noexcept;
     ObservationToken(ObservationToken&& other) noexcept;
     ObservationToken& operator=(ObservationToken&& other) noexcept;

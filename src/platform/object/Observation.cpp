@@ -86,6 +86,8 @@ void Object::observeValueForKeyPath(const String& keyPath, Object*, const Dictio
                                     " but does not take the change"}));
 }
 
+ObservationToken::ObservationToken() noexcept = default;
+
 ObservationToken::ObservationToken(Ref<Observance> observance) noexcept
     : _observance(std::move(observance)) {}
 
