@@ -24,6 +24,9 @@ constexpr std::size_t expansionFactor = 10;
 // The parser compares each default of an element with its other attributes, at each such element.
 constexpr std::size_t maximumAttributeDefaults = 2000;
 
+// Declarations bring names into the parser's table, which gets slow with very many.
+constexpr std::size_t maximumDeclarations = 20'000;
+
 // What a node and a reference cost beside their text, in the account of expansions.
 constexpr std::size_t nodeCost = 16;
 constexpr std::size_t referenceCost = 32;
@@ -84,17 +87,28 @@ struct SAXSession::Callbacks {
     static void entityDeclaration(void* user, const xmlChar* name, int type,
                                   const xmlChar* publicID, const xmlChar* systemID,
                                   xmlChar* content) {
+        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
         xmlSAX2EntityDecl(session(user)._context.get(), name, type, publicID, systemID, content);
     }
     static void unparsedEntityDeclaration(void* user, const xmlChar* name, const xmlChar* publicID,
                                           const xmlChar* systemID, const xmlChar* notation) {
+        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
         xmlSAX2UnparsedEntityDecl(session(user)._context.get(), name, publicID, systemID, notation);
     }
     static void attributeDeclaration(void* user, const xmlChar*, const xmlChar*, int, int,
                                      const xmlChar* defaultValue, xmlEnumerationPtr values) {
         xmlFreeEnumeration(values);
-        if (defaultValue != nullptr)
-            guarded(user, [](SAXSession& self) { self.countAttributeDefault(); });
+        guarded(user, [&](SAXSession& self) {
+            self.countDeclaration();
+            if (defaultValue != nullptr)
+                self.countAttributeDefault();
+        });
+    }
+    static void elementDeclaration(void* user, const xmlChar*, int, xmlElementContentPtr) {
+        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
+    }
+    static void notationDeclaration(void* user, const xmlChar*, const xmlChar*, const xmlChar*) {
+        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
     }
     static xmlEntityPtr entity(void* user, const xmlChar* name) {
         xmlEntityPtr found = nullptr;
@@ -134,7 +148,8 @@ struct SAXSession::Callbacks {
     static void processingInstruction(void* user, const xmlChar* target, const xmlChar* data) {
         guarded(user, [&](SAXSession& self) {
             if (self._context->inSubset == 0)
-                self._builder.addProcessingInstruction(viewOf(target), viewOf(data));
+                self._builder.addProcessingInstruction(self._names.named(target, nullptr),
+                                                       viewOf(data));
         });
     }
 
@@ -146,6 +161,8 @@ struct SAXSession::Callbacks {
         handler.entityDecl = entityDeclaration;
         handler.unparsedEntityDecl = unparsedEntityDeclaration;
         handler.attributeDecl = attributeDeclaration;
+        handler.elementDecl = elementDeclaration;
+        handler.notationDecl = notationDeclaration;
         handler.getEntity = entity;
         handler.getParameterEntity = parameterEntity;
         handler.startElementNs = startElement;
@@ -290,6 +307,14 @@ xmlEntityPtr SAXSession::parameterEntity(const xmlChar* name) {
     }
     countExpansion(static_cast<std::size_t>(found->length) + referenceCost);
     return found;
+}
+
+void SAXSession::countDeclaration() {
+    if (++_declarations > maximumDeclarations)
+        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
+                           "The document has more declarations than the limit of " +
+                               std::to_string(maximumDeclarations),
+                           ParseFailure::beyondLimit};
 }
 
 void SAXSession::countAttributeDefault() {

@@ -40,6 +40,7 @@ private:
     void addText(std::string_view piece);
     xmlEntityPtr entity(const xmlChar* name);
     xmlEntityPtr parameterEntity(const xmlChar* name);
+    void countDeclaration();
     void countAttributeDefault();
     void countDefaulted(int namespaceCount, const xmlChar** namespaces, int defaultedCount,
                         const xmlChar** defaulted);
@@ -67,6 +68,7 @@ private:
     const xmlChar* _xml;                         // likewise
     std::size_t _tagOffset = ParseFailure::here; // of the start tag that is being reported
     std::size_t _expanded = 0;
+    std::size_t _declarations = 0;
     std::size_t _attributeDefaults = 0;
     std::optional<ParseFailure> _failure;
     std::exception_ptr _exception;

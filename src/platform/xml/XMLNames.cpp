@@ -1,5 +1,9 @@
 #include "platform/xml/XMLNames.h"
 
+#include "platform/xml/ParseFailure.h"
+
+#include <libxml/xmlerror.h>
+
 namespace qx {
 
 namespace {
@@ -11,6 +15,11 @@ std::string_view viewOf(XMLNames::Name name) {
 } // namespace
 
 const String& XMLNames::add(Name local, Name prefix) {
+    if (_count >= maximumNames)
+        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
+                           "The document has more different names than the limit of " +
+                               std::to_string(maximumNames),
+                           ParseFailure::beyondLimit};
     String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})
                                     : String(viewOf(local));
     const Key known = Key::existing(name);

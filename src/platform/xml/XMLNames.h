@@ -17,7 +17,9 @@ public:
 
     XMLNames() : _entries(initialSize) {}
 
-    // The qualified name; the prefix is null where there is none. Good until the next call.
+    // The qualified name; the prefix is null where there is none. Good until the next call. Throws
+    // ParseFailure when the document has too many different names: the parser's own table of names
+    // gets slow with them.
     const String& named(Name local, Name prefix) {
         std::size_t at = slot(local, prefix);
         while (_entries[at].local != nullptr) {
@@ -35,6 +37,7 @@ private:
         String name;
     };
     static constexpr std::size_t initialSize = 256; // a power of two
+    static constexpr std::size_t maximumNames = 100'000;
 
     std::size_t slot(Name local, Name prefix) const noexcept {
         const auto mixed = (std::bit_cast<std::uintptr_t>(local) +

@@ -239,6 +239,20 @@ TEST(XMLParser, DeclarationsCannotBlowUp) {
               "2:1 1 More namespace declarations are in force than the limit of 1000");
 }
 
+TEST(XMLParser, NamesAndDeclarationsAreLimited) {
+    std::string names = "<a>";
+    std::string declarations = "<!DOCTYPE a [";
+    for (int i = 0; i < 100'000; ++i) {
+        names += "\n<b" + std::to_string(i) + "/>";
+        if (i <= 20'000)
+            declarations += "\n<!ENTITY b" + std::to_string(i) + " 'x'>";
+    }
+    EXPECT_EQ(outcome(names), "100001:1 1 The document has more different names than the limit of "
+                              "100000");
+    EXPECT_EQ(outcome(declarations + "]><a/>"),
+              "20002:20 1 The document has more declarations than the limit of 20000");
+}
+
 TEST(XMLParser, OnlyAttributesCountAsAttributes) {
     const std::string many = repeated(" a='b'", 5000);
     for (const std::string& inside :
