@@ -21,7 +21,10 @@ bool isEncodingName(std::string_view name) {
     });
 }
 
-iconv_t noConverter() { return reinterpret_cast<iconv_t>(-1); }
+// What iconv_open answers for a name that it does not know.
+iconv_t noConverter() {
+    return reinterpret_cast<iconv_t>(-1); // NOLINT(performance-no-int-to-ptr): so it is defined
+}
 
 iconv_t openConverter(const char* to, const char* from, std::string_view name) {
     return isEncodingName(name) ? ::iconv_open(to, from) : noConverter();
@@ -78,7 +81,7 @@ EncodingSignature encodingSignature(std::string_view bytes) noexcept {
 }
 
 DecodeResult decode(std::string_view bytes, const String& encoding, std::string& text) {
-    const iconv_t converter = openConverter("UTF-8", encoding.c_str(), encoding);
+    iconv_t converter = openConverter("UTF-8", encoding.c_str(), encoding);
     if (converter == noConverter())
         return DecodeResult::unknownEncoding;
     struct Closer {

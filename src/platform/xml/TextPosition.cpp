@@ -9,7 +9,7 @@ namespace {
 
 // Bytes that are no continuation of a UTF-8 sequence, eight at a time.
 std::size_t countCodePoints(const char* from, const char* to) noexcept {
-    std::size_t count = static_cast<std::size_t>(to - from);
+    auto count = static_cast<std::size_t>(to - from);
     constexpr std::uint64_t lowBits = 0x0101010101010101U;
     for (; to - from >= 8; from += 8) {
         std::uint64_t word = 0;

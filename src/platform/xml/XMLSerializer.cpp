@@ -165,7 +165,7 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
         break;
     case XMLNodeKind::comment:
         if (isChecked() && (holds(text, "--") || text.view().ends_with('-')))
-            refuse("a comment holds \"--\" or ends in \"-\"", node);
+            refuse(R"(a comment holds "--" or ends in "-")", node);
         _output += "<!--";
         writeLiteral(text, node);
         _output += "-->";
@@ -309,10 +309,11 @@ void XMLSerializer::refuse(std::string_view what, const XMLNode& node) {
 std::string placeOf(const XMLNode& node) {
     // How many levels are named; what stands above them is left out.
     constexpr std::size_t namedLevels = 32;
-    std::vector<std::string> steps;
+    std::string place;
+    std::size_t named = 0;
     const XMLNode* at = &node;
-    for (; at != nullptr && at->kind() != XMLNodeKind::document && steps.size() < namedLevels;
-         at = at->parent()) {
+    for (; at != nullptr && at->kind() != XMLNodeKind::document && named < namedLevels;
+         at = at->parent(), ++named) {
         std::size_t before = 0;
         bool isAlone = true;
         const auto isLike = [at](const XMLNode& other) {
@@ -346,11 +347,10 @@ std::string placeOf(const XMLNode& node) {
         step += at->name().view();
         if (before != 0 || !isAlone)
             step += "[" + std::to_string(before + 1) + "]";
-        steps.push_back(std::move(step));
+        place.insert(0, step);
     }
-    std::string place = at != nullptr && at->kind() != XMLNodeKind::document ? "..." : "";
-    for (auto step = steps.rbegin(); step != steps.rend(); ++step)
-        place += *step;
+    if (at != nullptr && at->kind() != XMLNodeKind::document)
+        place.insert(0, "...");
     return place.empty() ? "/" : place;
 }
 

@@ -70,6 +70,8 @@ void XMLTreeBuilder::endElement() {
 }
 
 void XMLTreeBuilder::addText(std::string_view piece, bool isLayout, bool isLasting) {
+    if (_open.empty())
+        return;
     requireSize(_lasting.size() + _joined.size() + piece.size(), "A text");
     const bool isFirst = _lasting.empty() && _joined.empty();
     _textIsLayout = isLayout && (isFirst || _textIsLayout);
