@@ -1,0 +1,248 @@
+// The marshaller itself: construction, options, what it asks of host objects, and its limits.
+
+#include "Host.h"
+#include "Scenario.h"
+
+#include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include <sstream>
+
+namespace {
+
+using qx::Error;
+using qx::Ref;
+using qx::Value;
+
+// Writes down what the marshaller asks of it.
+class Listener : public qx::Object {
+public:
+    static std::vector<std::string> heard;
+
+    Value child;
+    qx::String title;
+    int count = 0;
+    void setClassName(const qx::String& name) { heard.push_back("class " + name.str()); }
+    void setNotify(bool notify) { heard.push_back(notify ? "notify" : "quiet"); }
+    void setUndoManager(qx::UndoManager* manager) {
+        heard.push_back(manager != nullptr ? "undo manager" : "no undo manager");
+    }
+    qx::Object* rootObject() { return this; }
+    void setParent(qx::Object* parent) {
+        heard.push_back("parent " + parent->classNameForMarshalling().str());
+    }
+};
+std::vector<std::string> Listener::heard;
+
+class Listening {
+public:
+    Listening() {
+        Listener::heard.clear();
+        qx::Class::define<Listener>("Listener")
+            .property<&Listener::child>("child")
+            .property<&Listener::title>("title")
+            .property<&Listener::count>("count")
+            .operation<&Listener::setClassName>("setClassNameForMarshalling:")
+            .operation<&Listener::setNotify>("setNotifyBindingsObservers:")
+            .operation<&Listener::setUndoManager>("setUndoManager:")
+            .operation<&Listener::rootObject>("rootObject")
+            .operation<&Listener::setParent>("setParent:");
+    }
+    ~Listening() { qx::Class::forget("Listener"); }
+    Listening(const Listening&) = delete;
+    Listening& operator=(const Listening&) = delete;
+};
+
+std::string field(std::string_view name, std::string_view attributes, std::string_view binding) {
+    return "<field name='" + std::string(name) + "' " + std::string(attributes) + "><bind-xml " +
+           std::string(binding) + "/></field>";
+}
+
+// One class of elements called "item", with those fields.
+std::string listenerMapping(const std::string& fields) {
+    return "<class name='Item' type='Listener'>" + fields + "</class>";
+}
+
+} // namespace
+
+TEST(Marshaller, IsLenientAndKeepsUnknownXMLAndNamespacesFromTheStart) {
+    const auto marshaller = QXXMLMarshaller::initWithMapping(nullptr);
+    EXPECT_TRUE(marshaller->isLenient() && marshaller->saveUnknownXML() &&
+                marshaller->isUsingNamespaceURIs());
+    EXPECT_EQ(marshaller->undoManager(), marshaller->undoManager());
+}
+
+TEST(Marshaller, HoldsNoClassWithoutAMapping) {
+    const auto marshaller = QXXMLMarshaller::initWithMapping(nullptr);
+    EXPECT_EQ(scenario::read(*marshaller, "<a/>"), "null");
+    marshaller->setLenient(false);
+    EXPECT_EQ(scenario::read(*marshaller, "<a/>"),
+              "-211: No definition to handle element: <a></a> (Invalid Mapping)");
+    Ref<Error> error;
+    EXPECT_FALSE(marshaller->unmarshall(nullptr, &error));
+    EXPECT_EQ(scenario::show(error),
+              "-211: No definition to handle element: (null) (Invalid Mapping)");
+}
+
+TEST(Marshaller, PassesTheParsersErrorOn) {
+    Ref<Error> error;
+    EXPECT_FALSE(QXXMLMarshaller::initWithMappingFile("/nowhere/mapping.xml", &error));
+    EXPECT_EQ(error->code(), 260);
+    error = nullptr;
+    const auto marshaller = scenario::marshaller("<class name='A'/>");
+    EXPECT_FALSE(marshaller->readString("<a>\n <b></a>", &error));
+    EXPECT_EQ(error->domain(), Error::parserDomain);
+    EXPECT_EQ(error->line(), 2U);
+}
+
+TEST(Marshaller, AsksHostObjectsOnlyWhatTheyAnswer) {
+    const Listening listening;
+    const auto marshaller =
+        scenario::marshaller(listenerMapping(field("child", "type='Item'", "node='element'")));
+    const auto object = marshaller->readString("<item><child/></item>");
+    ASSERT_TRUE(object);
+    EXPECT_EQ(Listener::heard, (std::vector<std::string>{"class Item", "quiet", "undo manager",
+                                                         "class Item", "quiet", "undo manager",
+                                                         "notify", "parent Listener", "notify"}));
+}
+
+TEST(Marshaller, NeverTellsAnObjectThatFailedToNotifyAgain) {
+    const Listening listening;
+    const auto marshaller =
+        scenario::marshaller(listenerMapping(field("title", "required='true'", "node='element'")));
+    EXPECT_FALSE(marshaller->readString("<item/>"));
+    EXPECT_EQ(Listener::heard.back(), "undo manager");
+}
+
+TEST(Marshaller, ReportsValuesThatAPropertyDoesNotTake) {
+    const Listening listening;
+    const auto marshaller =
+        scenario::marshaller(listenerMapping(field("count", "", "node='attribute'") +
+                                             field("missing", "", "name='m' node='attribute'")));
+    const std::pair<const char*, const char*> cases[] = {
+        {"<item count='x'/>", "-222: Unable to set value: x for key: count in class: Listener "
+                              "(Invalid Value)"},
+        {"<item count='99999999999'/>", "-222: Unable to set value: 99999999999 for key: count in "
+                                        "class: Listener (Invalid Value)"},
+        {"<item m='1'/>",
+         "-222: Unable to set value: 1 for key: missing in class: Listener (Invalid Value)"},
+        {"<item other='1'/>", "-222: Unable to set value: (\n    other=\"1\"\n) for key: "
+                              "unboundAttributes in class: Listener (Invalid Value)"},
+    };
+    for (const auto& [document, expected] : cases)
+        EXPECT_EQ(scenario::read(*marshaller, document), expected);
+    EXPECT_EQ(marshaller->readString("<item count=' 12 '/>")->valueForKey("count"), Value(12));
+}
+
+TEST(Marshaller, LetsWhatAHostsSetterThrowsThroughAndClosesItsUndoGroup) {
+    struct Thrower : qx::Object {
+        void setTitle(const qx::String&) { throw std::runtime_error("no"); }
+        qx::String title() const { return {}; }
+    };
+    qx::Class::define<Thrower>("Thrower").property<&Thrower::title, &Thrower::setTitle>("title");
+    const auto marshaller = scenario::marshaller(
+        "<class name='Thrower'>" + field("title", "", "node='attribute'") + "</class>");
+    EXPECT_THROW(marshaller->readString("<thrower title='t'/>"), std::runtime_error);
+    EXPECT_EQ(marshaller->undoManager()->groupingLevel(), 0U);
+    qx::Class::forget("Thrower");
+}
+
+TEST(Marshaller, SkipsFailedItemsOfACollectionForACallerWithoutASlot) {
+    const auto marshaller = scenario::marshaller(
+        "<class name='Order'>" + field("lines", "collection='array' type='Line'", "name='line'") +
+            "</class><class name='Line'>" + field("text", "required='true'", "node='attribute'") +
+            "</class>",
+        scenario::discard);
+    const auto order = marshaller->readString("<order><line/><line text='a'/></order>");
+    EXPECT_EQ(support::show(order), R"(Order{lines: [Line{text: "a"}]})");
+}
+
+TEST(Marshaller, StopsForASlotThatHoldsAnErrorAlready) {
+    const auto marshaller = scenario::marshaller("<class name='A'/>");
+    Ref<Error> error = qx::make<Error>(Error::cocoaDomain, 7, "old", "old");
+    EXPECT_FALSE(marshaller->unmarshallElement(qx::XMLElement::initWithName("a").get(), &error));
+    EXPECT_EQ(error->code(), 7);
+}
+
+TEST(Marshaller, BindsSingleStepsForAHostThatCallsThem) {
+    const auto marshaller = scenario::marshaller(
+        "<class name='Order'>" + field("title", "", "name='t' node='element'") + "</class>");
+    const QXXMLClassMapping& mapping = *marshaller->mapping()->mappingForClassName("Order");
+    const auto element = qx::XMLDocument::initWithData("<x><t>1</t><t>2</t></x>");
+    const auto fields = qx::make<qx::CountedSet>();
+    const auto attributes = qx::make<qx::CountedSet>();
+    const auto record = marshaller->allocateClassWithMapping(mapping);
+    // Flattened: the first of several is taken out of the element.
+    EXPECT_TRUE(marshaller->bindFieldAsElement(
+        *mapping.fields()[0], *record, 0, *element->rootElement(), *fields, *attributes, true));
+    EXPECT_EQ(record->valueForKey("title"), Value("1"));
+    EXPECT_EQ(element->rootElement()->XMLString(), "<x><t>2</t></x>");
+    EXPECT_EQ(fields->description(), "(t [1])");
+    EXPECT_FALSE(marshaller->buildClassWithMapping(mapping, nullptr, false));
+
+    auto copy = mapping.copyWithZone().as<QXXMLClassMapping>();
+    copy->setMapTo("other");
+    EXPECT_EQ(marshaller->elementWithMapping(*copy, *record)->XMLString(),
+              "<other><t>1</t></other>");
+}
+
+TEST(Marshaller, EndsDeepNestingInAnErrorInBothDirections) {
+    const auto marshaller = scenario::marshaller("<class name='Node'>" +
+                                                 field("node", "", "node='element'") + "</class>");
+    const auto nested = [](std::size_t depth) {
+        std::string xml;
+        for (std::size_t i = 0; i < depth; ++i)
+            xml += "<node>";
+        for (std::size_t i = 0; i < depth; ++i)
+            xml += "</node>";
+        return xml;
+    };
+    EXPECT_TRUE(marshaller->readString(nested(256)));
+    Ref<Error> error;
+    EXPECT_FALSE(marshaller->readString(nested(257), &error));
+    EXPECT_EQ(error->domain(), Error::parserDomain);
+    marshaller->setMaximumDepth(1000);
+    const auto deep = marshaller->readString(nested(1000));
+    ASSERT_TRUE(deep);
+    EXPECT_FALSE(marshaller->writeString(deep).isNull());
+    marshaller->setMaximumDepth(999);
+    EXPECT_EQ(scenario::write(*marshaller, deep),
+              "-223: Objects nest deeper than the limit of 999: Node (Invalid Value)");
+    qx::XMLParseOptions options;
+    options.maximumDepth = 1000;
+    error = nullptr;
+    EXPECT_FALSE(
+        marshaller->unmarshall(qx::XMLDocument::initWithData(nested(1000), options), &error));
+    EXPECT_EQ(scenario::show(error),
+              "-223: Objects nest deeper than the limit of 999: Node (Invalid Value)");
+}
+
+TEST(Marshaller, FindsManyNamesAmongManyChildrenInAnIndex) {
+    std::string fields;
+    std::string document = "<order>";
+    std::string expected;
+    for (int i = 0; i < 100; ++i) {
+        const std::string name = "f" + std::to_string(100 + i);
+        fields += field(name, "", "node='element'");
+        document += "<x/><" + name + ">" + std::to_string(i) + "</" + name + ">";
+        expected += (i > 0 ? ", " : "") + name + ": \"" + std::to_string(i) + "\"";
+    }
+    const auto marshaller =
+        scenario::marshaller("<class name='Order'>" + fields + "</class>", scenario::discard);
+    EXPECT_EQ(scenario::read(*marshaller, document + "</order>"), "Order{" + expected + "}");
+}
+
+TEST(Marshaller, ReadsAndWritesStreams) {
+    const auto marshaller = scenario::marshaller("<class name='Order'><map-to xml='order'/>" +
+                                                 field("title", "", "node='element'") + "</class>");
+    std::istringstream in("<order><title>t</title></order>");
+    const auto order = marshaller->readStream(in);
+    std::ostringstream out;
+    EXPECT_TRUE(marshaller->writeStream(order, out));
+    EXPECT_EQ(out.str(), "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+                         "<order>\n    <title>t</title>\n</order>\n");
+    out.setstate(std::ios::badbit);
+    Ref<Error> error;
+    EXPECT_FALSE(marshaller->writeStream(order, out, &error));
+    EXPECT_TRUE(error);
+}
