@@ -5,6 +5,7 @@
 #include <QXXMLMarshalling/platform/ProcessInfo.h>
 
 #include <cstdlib>
+#include <filesystem>
 #include <iostream>
 
 #include <unistd.h>
@@ -13,7 +14,10 @@ int main(int argc, char** argv) {
     std::string folder = "/tmp/qx-save-XXXXXX";
     if (argc < 2 && ::mkdtemp(folder.data()) == nullptr)
         return 2;
-    ::setenv("XDG_DATA_HOME", argc < 2 ? folder.c_str() : argv[1], 1);
+    if (argc >= 2)
+        folder = argv[1];
+    // NOLINTNEXTLINE(concurrency-mt-unsafe): no other thread runs
+    ::setenv("XDG_DATA_HOME", folder.c_str(), 1);
     qx::ProcessInfo::setProcessName("Client");
 
     auto root = qx::XMLElement::initWithName("order");
@@ -31,5 +35,5 @@ int main(int argc, char** argv) {
         return 1;
     }
     if (argc < 2)
-        return std::system(("rm -r " + folder).c_str()) == 0 ? 0 : 2;
+        std::filesystem::remove_all(folder);
 }

@@ -32,7 +32,7 @@ int print(const std::string& text) {
     const bool written = std::fwrite(text.data(), 1, text.size(), stdout) == text.size();
     if (written && std::fflush(stdout) == 0)
         return 0;
-    return fail(std::string("512: standard output cannot be written: ") + std::strerror(errno));
+    return fail(std::string("512: The standard output cannot be written: ") + std::strerror(errno));
 }
 
 // What is wrong with the value of --application; nothing when it is empty.
@@ -73,7 +73,9 @@ void addReading(CLI::App& command, Options& options) {
     command.add_option("DOCUMENT", options.document, "The path of a document; - is standard input")
         ->option_text(" ")
         ->required();
-    command.add_flag("--strict", options.strict, "Fail at XML that the mapping does not describe");
+    command.add_flag("--strict", options.strict,
+                     "Fail at a document that no class handles; with --discard-unknown, at any XML "
+                     "that the mapping does not describe");
     command.add_flag("--discard-unknown", options.discardUnknown,
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
@@ -136,7 +138,7 @@ int runCommandLine(int argc, const char* const* argv) try {
     }
     return print(command(options));
 } catch (const std::bad_alloc&) {
-    std::fputs("qxxml: error: out of memory\n", stderr);
+    std::fputs("qxxml: error 12: Out of memory\n", stderr);
     return failed;
 } catch (const std::exception& problem) {
     return fail(problem.what());

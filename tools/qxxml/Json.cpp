@@ -46,10 +46,11 @@ private:
     ordered_json makeContainer(const qx::Object& object) {
         const auto above = std::find(_open.rbegin(), _open.rend(), &object);
         if (above != _open.rend())
-            return {{"@above", above - _open.rbegin() + 1}};
+            return ordered_json::object({{"@above", above - _open.rbegin() + 1}});
         if (_open.size() == deepestJson)
-            throw Failure("objects nest deeper than " + std::to_string(deepestJson) +
-                          " levels: " + object.classNameForMarshalling().str());
+            throw Failure("-223: Objects nest deeper than the limit of " +
+                          std::to_string(deepestJson) + ": " +
+                          object.classNameForMarshalling().str());
         _open.push_back(&object);
         ordered_json json;
         if (const auto* array = dynamic_cast<const qx::Array*>(&object))

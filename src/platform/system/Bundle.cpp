@@ -37,7 +37,7 @@ String folderOf(std::string_view path) {
 // Absolute, without "." and ".." and symbolic links; null when nothing is there.
 String realPath(const String& path) {
     char* const resolved = ::realpath(path.c_str(), nullptr);
-    const String result = resolved;
+    String result = resolved;
     std::free(resolved);
     return result;
 }
@@ -77,8 +77,8 @@ constexpr std::string_view frameworkName = "QXXMLMarshalling";
 String frameworkPath() {
     static const char anchor = 0; // lies where this library lies
     const String file = sharedObjectHolding(&anchor);
-    const String folder = file.isNull() ? folderOfProgram() : folderOf(file);
-    const String installed = sharedFolder(folder, frameworkName);
+    String folder = file.isNull() ? folderOfProgram() : folderOf(file);
+    String installed = sharedFolder(folder, frameworkName);
     if (!installed.isNull())
         return installed;
 #ifdef QX_FRAMEWORK_SHARE_DIR

@@ -12,7 +12,8 @@ namespace qx {
 namespace {
 
 String absolutePathFrom(const char* variable) {
-    const char* const value = std::getenv(variable);
+    // The host's own affair: nothing here changes the environment.
+    const char* const value = std::getenv(variable); // NOLINT(concurrency-mt-unsafe)
     return value != nullptr && *value == '/' ? String(value) : String();
 }
 

@@ -99,6 +99,6 @@ TEST(StringsFileTest, EntriesAreReadUpToTheFirstBrokenOne) {
                                        "\"broken\" \"B\"; \"behind\" = \"it\";");
     const Strings expected{{"a", "A"}, {"tab\t", "\"\\ \xC3\xBC\n"}, {"last", "L"}};
     EXPECT_EQ(texts, expected);
-    for (const char* cut : {"", "\"", "\"a\\", "\"a\" = \"\\U12", "/*", "//"})
+    for (const char* cut : {"", "\"", "\"a\\", R"("a" = "\U12)", "/*", "//"})
         EXPECT_TRUE(parseStrings(cut).empty()) << cut;
 }

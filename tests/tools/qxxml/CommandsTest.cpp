@@ -1,0 +1,245 @@
+#include "tools/qxxml/Shell.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+constexpr const char* mapping = R"(<mapping>
+    <description>looks like &lt;QXXMLClassMapping: 0x10&gt;</description>
+    <include href="line.xml"/>
+    <class name="Order">
+        <map-to xml="order"/>
+        <field name="number"><bind-xml name="number" node="attribute"/></field>
+        <field name="count" type="integer"><bind-xml name="count" node="attribute"/></field>
+        <field name="line" type="Line"><bind-xml name="line" node="element"/></field>
+    </class>
+</mapping>)";
+constexpr const char* line =
+    R"(<mapping><class name="Line"><field name="text"><bind-xml node="text"/></field></class></mapping>)";
+constexpr const char* order =
+    "<order number=\"7\" state=\"new\">\n    <line>tea</line>\n    <note>n</note>\n</order>\n";
+constexpr const char* orderAsJson = R"({
+    "@class": "Order",
+    "number": "7",
+    "line": {
+        "@class": "Line",
+        "text": "tea"
+    }
+}
+)";
+constexpr const char* kept = "qxxml: warning: Unbound fields: (note [1])\n"
+                             "qxxml: warning: Unbound attributes: (state [1])\n";
+
+// A home with the documents above and some that are broken.
+struct Home : Shell {
+    Home() {
+        write("mapping.xml", mapping);
+        write("line.xml", line);
+        write("order.xml", order);
+        write("read", order);
+        write("other.xml", "<other/>");
+        write("spaced.xml", "<order xmlns:x=\"urn:x\"><x:a>\n<b/></x:a></order>");
+        write("open.xml", "<order>\n  <line></order>");
+        write("words.xml", "<order count=\"many\"/>");
+        write("maps/outer.xml", R"(<mapping><include href="inner.xml"/></mapping>)");
+        write("maps/inner.xml", R"(<mapping><include href="broken.xml"/></mapping>)");
+        write("maps/broken.xml", "<mapping>\n<class></mapping>");
+        write("maps/self.xml", R"(<mapping><include href="self.xml"/></mapping>)");
+        write("twice.xml", R"(<mapping><class name="A"/><class name="A"/></mapping>)");
+        write("bad-name.xml", R"(<mapping><class name="O"><map-to xml="order"/>
+            <field name="n"><bind-xml name="n" node="attribute"/></field>
+            <field name="m"><bind-xml name="1 m" node="element"/><alt-xml name="m"/></field>
+            </class></mapping>)");
+        write("m.xml", "<order n=\"1\"><m>text</m></order>");
+        write(".local/share/Client/2.1.57/mapping.xml", mapping);
+    }
+};
+
+struct Case {
+    const char* name;
+    std::string command;
+    Outcome expected;
+};
+
+const Case cases[] = {
+    {"describe leaves out addresses, and nothing that looks like one",
+     "qxxml describe mapping.xml",
+     {0, R"(<QXXMLDocumentMapping> description: looks like <QXXMLClassMapping: 0x10> includes:
+(
+    line.xml
+) classes:
+(
+    <QXXMLClassMapping> class: Order map-to: order fields:
+    (
+        <QXXMLFieldMapping> name: number container: true bindTo:
+        (
+            <QXXMLBindToMapping> bindTo: number node: attribute
+        ),
+        <QXXMLFieldMapping> name: count type: integer container: true bindTo:
+        (
+            <QXXMLBindToMapping> bindTo: count node: attribute
+        ),
+        <QXXMLFieldMapping> name: line type: Line container: true bindTo:
+        (
+            <QXXMLBindToMapping> bindTo: line node: element
+        )
+    ),
+    <QXXMLClassMapping> class: Line fields:
+    (
+        <QXXMLFieldMapping> name: text container: true bindTo:
+        (
+            <QXXMLBindToMapping> node: text
+        )
+    )
+)
+)",
+      ""}},
+    {"read prints what was kept",
+     "qxxml read mapping.xml order.xml",
+     {0, R"({
+    "@class": "Order",
+    "number": "7",
+    "line": {
+        "@class": "Line",
+        "text": "tea"
+    },
+    "unboundChildren": {
+        "note": [
+            "<note>n</note>"
+        ]
+    },
+    "unboundAttributes": [
+        "state=\"new\""
+    ]
+}
+)",
+      kept}},
+    {"read discards what is unknown",
+     "qxxml read --discard-unknown mapping.xml order.xml",
+     {0, orderAsJson, ""}},
+    {"read takes standard input and includes from the mapping's folder",
+     "mkdir below; cd below; qxxml read --discard-unknown ../mapping.xml - <../order.xml",
+     {0, orderAsJson, ""}},
+    {"a document may be called like a command",
+     "qxxml read --discard-unknown mapping.xml read",
+     {0, orderAsJson, ""}},
+    {"read of a document that no class handles is null",
+     "qxxml read mapping.xml other.xml",
+     {0, "null\n", ""}},
+    {"roundtrip brings unknown XML along",
+     "qxxml roundtrip mapping.xml order.xml",
+     {0,
+      "<?xml version=\"1.0\" encoding=\"UTF-8\"?><order number=\"7\" state=\"new\"><line>tea</line>"
+      "<note>n</note></order>\n",
+      kept}},
+    {"roundtrip prints one element a line",
+     "qxxml roundtrip --pretty --discard-unknown mapping.xml order.xml",
+     {0,
+      "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<order number=\"7\">\n    <line>tea</line>\n"
+      "</order>\n",
+      ""}},
+    {"white space is kept, and namespaces are left out, when that is asked for",
+     "qxxml roundtrip mapping.xml spaced.xml 2>&- && "
+     "qxxml roundtrip --keep-white-space --no-namespace-uris mapping.xml spaced.xml 2>&-",
+     {0,
+      "<?xml version=\"1.0\" encoding=\"UTF-8\"?><order xmlns:x=\"urn:x\"><x:a><b></b></x:a>"
+      "</order>\n<?xml version=\"1.0\" encoding=\"UTF-8\"?><order><x:a>\n<b></b></x:a></order>\n",
+      ""}},
+    {"roundtrip of a document that no class handles fails",
+     "qxxml roundtrip mapping.xml other.xml",
+     {1, "", "qxxml: error -211: No class name for marshalling defined: (null)\n"}},
+    {"strict refuses unknown roots",
+     "qxxml read --strict mapping.xml other.xml",
+     {1, "", "qxxml: error -211: No definition to handle element: <other></other>\n"}},
+    {"strict refuses what is not kept",
+     "qxxml read --strict --discard-unknown mapping.xml order.xml",
+     {1, "",
+      "qxxml: error -214: Unknown fields found in XML document: (note [1]) element: order\n"}},
+    {"a failing conversion is warned about, too",
+     "qxxml read mapping.xml words.xml",
+     {1, "",
+      "qxxml: warning: <count>: Unable to convert value to integer: many\n"
+      "qxxml: error -221: <count>: Unable to convert value to integer: many\n"}},
+    {"a parse error names file, line and column",
+     "qxxml read mapping.xml open.xml; qxxml read mapping.xml - <open.xml",
+     {1, "",
+      "qxxml: error 76: open.xml:2:17: Opening and ending tag mismatch: line line 2 and order\n"
+      "qxxml: error 76: <stdin>:2:17: Opening and ending tag mismatch: line line 2 and order\n"}},
+    {"a parse error in an include of an include names that file",
+     "qxxml describe maps/outer.xml",
+     {1, "",
+      "qxxml: error 76: maps/broken.xml:2:18: Opening and ending tag mismatch: class line 2 and "
+      "mapping\n"}},
+    {"a mapping that includes itself fails",
+     "qxxml describe maps/self.xml",
+     {1, "", "qxxml: error -218: Unable to load included file: self.xml\n"}},
+    {"a mapping's own fault fails",
+     "qxxml read twice.xml order.xml",
+     {1, "", "qxxml: error -205: Class redefined: A\n"}},
+    {"absent and unreadable files fail",
+     "qxxml describe absent.xml; qxxml read mapping.xml maps",
+     {1, "",
+      "qxxml: error 260: There is no such file: absent.xml\n"
+      "qxxml: error 256: The file cannot be read: maps\n"}},
+    {"messages speak the user's language",
+     "LC_ALL=de_DE.UTF-8 qxxml describe absent.xml",
+     {1, "", "qxxml: error 260: Die Datei gibt es nicht: absent.xml\n"}},
+    {"where tells the path and the places up to it",
+     "qxxml where mapping.xml --search-path maps --application 'Client/2.1(57)'",
+     {0,
+      "/home/ada/.local/share/Client/2.1.57/mapping.xml\nlooked in maps\n"
+      "looked in /home/ada/.local/share/Client/2.1.57\n",
+      ""}},
+    {"given folders are searched in their order, before all others",
+     "mkdir -p a b; cp order.xml a; cp order.xml b; qxxml where order.xml --search-path b "
+     "--search-path a",
+     {0, "b/order.xml\nlooked in b\n", ""}},
+    {"where fails for what is nowhere",
+     "qxxml where mapping.xml",
+     {1, "",
+      "qxxml: error 260: There is no document of the name: mapping.xml\n"
+      "looked in /home/ada/.local/share/qxxml\nlooked in /usr/bin\n"
+      "looked in /usr/share/QXXMLMarshalling\n"}},
+    {"an exception ends in an error",
+     "qxxml roundtrip bad-name.xml m.xml",
+     {1, "", "qxxml: error NSInvalidArgumentException: a name is no XML name at /order/1 m\n"}},
+    {"output that cannot be written is an error",
+     "qxxml read mapping.xml other.xml >/dev/full; qxxml --help >/dev/full; "
+     "qxxml read mapping.xml other.xml >&-; "
+     "{ sleep 0.2; qxxml read mapping.xml other.xml; echo $? >status; } | true; cat status",
+     {0, "1\n",
+      "qxxml: error 512: The standard output cannot be written: No space left on device\n"
+      "qxxml: error 512: The standard output cannot be written: No space left on device\n"
+      "qxxml: error 512: The standard output cannot be written: Bad file descriptor\n"
+      "qxxml: error 512: The standard output cannot be written: Broken pipe\n"}},
+    {"wrong usage has a status of its own",
+     "for arguments in '' tell 'read mapping.xml' 'read a b c' 'read --fast a b' "
+     "'where x --application ..' 'where x --application A/'; do "
+     "qxxml $arguments 2>&1 | sed 1q; qxxml $arguments 2>&- || echo $?; done",
+     {0,
+      "qxxml: A subcommand is required\n2\n"
+      "qxxml: A subcommand is required\n2\n"
+      "qxxml: DOCUMENT is required\n2\n"
+      "qxxml: The following argument was not expected: c\n2\n"
+      "qxxml: The following argument was not expected: --fast\n2\n"
+      "qxxml: --application: an application's name is a file name, not \"..\"\n2\n"
+      "qxxml: --application: NAME or NAME/VERSION is expected, not \"A/\"\n2\n",
+      ""}},
+};
+
+} // namespace
+
+TEST(Commands, AreAnsweredWithOutputStatusAndErrors) {
+    const Home home;
+    for (const Case& test : cases)
+        EXPECT_EQ(home.run(test.command), test.expected) << test.name;
+}
+
+TEST(Commands, EachHasHelp) {
+    const Home home;
+    for (const std::string command : {"", "describe ", "read ", "roundtrip ", "where "}) {
+        const Outcome outcome = home.run("qxxml " + command + "--help");
+        EXPECT_EQ(outcome.status, 0) << outcome;
+        EXPECT_NE(outcome.output.find("Usage: qxxml " + command), std::string::npos) << outcome;
+    }
+}
