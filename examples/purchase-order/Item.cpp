@@ -3,11 +3,11 @@
 #include <charconv>
 
 std::string Money::text() const {
-    std::string text = std::to_string(cents < 0 ? -cents : cents);
-    if (text.size() < 3)
-        text.insert(0, 3 - text.size(), '0');
-    text.insert(text.size() - 2, ".");
-    return cents < 0 ? "-" + text : text;
+    std::string digits = std::to_string(cents < 0 ? -cents : cents);
+    if (digits.size() < 3)
+        digits.insert(0, 3 - digits.size(), '0');
+    const std::size_t whole = digits.size() - 2;
+    return (cents < 0 ? "-" : "") + digits.substr(0, whole) + '.' + digits.substr(whole);
 }
 
 bool Money::parse(std::string_view text, Money& result) {
