@@ -1,5 +1,6 @@
 # tests/<folder>/*.cpp    -> one GoogleTest program per folder, test_<folder>
 # tests/support/*.cpp     -> helpers, linked into those; main.cpp there replaces gtest_main
+# docs/samples/*.cpp      -> the samples of the pages in docs/, in test_docs too
 # tests/programs/*.cpp    -> one small program each over the shared library, program_<name>
 # tests/checks/*.sh       -> scripts, called with the build folder and the source folder
 # examples/<name>/demo    -> run on this build, called with the build folder
@@ -65,6 +66,8 @@ foreach(source IN LISTS sources)
     endif()
     target_sources(${name} PRIVATE "${PROJECT_SOURCE_DIR}/tests/${source}")
 endforeach()
+file(GLOB samples CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/docs/samples/*.cpp")
+target_sources(test_docs PRIVATE ${samples})
 foreach(name IN LISTS test_targets)
     # Looked up when ctest starts: a program that was not built does not stop the others.
     gtest_discover_tests(${name}

@@ -1,17 +1,15 @@
-// The samples of docs/records.md, between "// sample: NAME" and "// end of sample"; SamplesTest.cpp
-// compares them with the page.
+// The samples of docs/records.md, between "// sample: NAME" and "// end of sample", and what the
+// page says of them. tests/docs/SamplesTest.cpp compares them with the page.
+
+#include "marshaller/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Error.h>
 #include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/Observation.h>
 #include <QXXMLMarshalling/platform/UndoableObject.h>
 #include <QXXMLMarshalling/platform/UserDefaults.h>
 #include <QXXMLMarshalling/platform/WeakRef.h>
-
-#include <gtest/gtest.h>
 
 #include <iostream>
 #include <sstream>
@@ -38,32 +36,23 @@ TEST(RecordsPage, Keys) {
     EXPECT_EQ(order->keys(), std::vector<qx::String>{"number"});
 }
 
-TEST(RecordsPage, ReservedKeys) {
-    constexpr const char* mapping = R"(<mapping><class name="Order"><map-to xml="order"/>
-        <field name="contents"><bind-xml name="contents" node="element"/></field>
-        <field name="className"><bind-xml name="class" node="attribute"/></field>
-        </class></mapping>)";
-    qx::Ref<qx::Error> error;
-    const auto marshaller =
-        QXXMLMarshaller::initWithMappingXML(qx::XMLDocument::initWithData(mapping).get());
+TEST(RecordsPage, ClassNamesAndReservedKeys) {
+    const auto marshaller = scenario::marshaller(
+        "<class name='Order'><map-to xml='order'/>"
+        "<field name='number'><bind-xml name='number' node='attribute'/></field>"
+        "<field name='className'><bind-xml name='class' node='attribute'/></field>"
+        "<field name='contents'><bind-xml name='contents' node='element'/></field></class>");
     EXPECT_EQ(marshaller->readString("<order class='Bill'/>")->classNameForMarshalling(), "Bill");
-    EXPECT_FALSE(marshaller->readString("<order><contents>c</contents></order>", &error));
-    EXPECT_EQ(error->code(), -222);
-}
-
-TEST(RecordsPage, ClassNames) {
-    constexpr const char* mapping = R"(<mapping><class name="Order"><map-to xml="order"/>
-        <field name="number"><bind-xml name="number" node="attribute"/></field>
-        </class></mapping>)";
-    const auto marshaller =
-        QXXMLMarshaller::initWithMappingXML(qx::XMLDocument::initWithData(mapping).get());
+    EXPECT_EQ(
+        scenario::read(*marshaller, "<order><contents>c</contents></order>"),
+        "-222: Unable to set value: c for key: contents in class: QXGenericRecord (Invalid Value)");
     // sample: class-names
     auto order = qx::make<QXGenericRecord>();
     order->setClassNameForMarshalling("Order"); // <class name="Order"> of the mapping
     order->setValueForKey("A-18", "number");
     qx::String text = marshaller->writeString(order); // … <order number="A-18">…
     // end of sample
-    EXPECT_NE(text.view().find("<order number=\"A-18\">"), std::string_view::npos);
+    EXPECT_NE(text.view().find("<order number=\"A-18\" class=\"Order\">"), std::string_view::npos);
 }
 
 // sample: give-manager
