@@ -10,6 +10,7 @@
 // Options are "strict", "discard" and "no-namespaces"; blocks with other words are left alone.
 
 #include "platform/system/Errors.h"
+#include "support/Page.h"
 #include "support/Show.h"
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
@@ -17,49 +18,13 @@
 #include <gtest/gtest.h>
 
 #include <fstream>
+#include <iterator>
 #include <set>
 #include <sstream>
 
 namespace {
 
-struct Block {
-    std::string kind; // "xml mapping"
-    std::set<std::string> options;
-    std::string text;
-    std::size_t line = 0;
-};
-
-std::vector<std::string> linesOf(const std::string& page) {
-    std::ifstream file(QX_SOURCE_DIR "/docs/" + page);
-    EXPECT_TRUE(file) << page;
-    std::vector<std::string> lines;
-    for (std::string line; std::getline(file, line);)
-        lines.push_back(line);
-    return lines;
-}
-
-std::vector<Block> blocksOf(const std::string& page) {
-    std::vector<Block> blocks;
-    bool inside = false;
-    std::size_t number = 0;
-    for (const std::string& line : linesOf(page)) {
-        ++number;
-        if (line.rfind("```", 0) != 0) {
-            if (inside)
-                blocks.back().text += line + "\n";
-        } else if (!(inside = !inside)) {
-            continue;
-        } else {
-            std::istringstream words(line.substr(3));
-            std::string language, kind;
-            words >> language >> kind;
-            Block& block = blocks.emplace_back(Block{language + " " + kind, {}, "", number});
-            for (std::string option; words >> option;)
-                block.options.insert(option);
-        }
-    }
-    return blocks;
-}
+using Options = std::set<std::string>;
 
 // Listings are laid out for the reader: white space outside quotes does not count.
 std::string withoutLayout(const std::string& text) {
@@ -82,7 +47,7 @@ public:
     }
     void setDocument(const std::string& text) { _document = text; }
 
-    void run(const std::set<std::string>& options) {
+    void run(const Options& options) {
         _error.reset();
         _object.reset();
         _written = qx::String();
@@ -121,25 +86,23 @@ private:
 std::size_t runPage(const std::string& page) {
     std::size_t compared = 0;
     Sample sample;
-    for (const Block& block : blocksOf(page)) {
+    for (const auto& block : support::blocksOf(QX_SOURCE_DIR "/docs/" + page)) {
         SCOPED_TRACE(page + ":" + std::to_string(block.line));
-        if (block.kind == "xml mapping") {
+        std::istringstream words(block.heading);
+        std::string language, kind;
+        words >> language >> kind;
+        if (kind == "mapping")
             sample.setMapping(block.text);
-        } else if (block.kind == "xml document") {
+        if (kind == "document")
             sample.setDocument(block.text);
-        } else if (block.kind == "text object") {
-            sample.run(block.options);
+        if (kind != "object" && kind != "written" && kind != "error")
+            continue;
+        sample.run({std::istream_iterator<std::string>(words), {}});
+        if (kind == "object")
             EXPECT_EQ(withoutLayout(sample.shown()), withoutLayout(block.text)) << sample.error();
-            ++compared;
-        } else if (block.kind == "xml written") {
-            sample.run(block.options);
-            EXPECT_EQ(sample.written(), block.text) << sample.error();
-            ++compared;
-        } else if (block.kind == "text error") {
-            sample.run(block.options);
-            EXPECT_EQ(sample.error(), block.text);
-            ++compared;
-        }
+        else
+            EXPECT_EQ(kind == "error" ? sample.error() : sample.written(), block.text);
+        ++compared;
     }
     return compared;
 }
@@ -153,11 +116,12 @@ TEST(Pages, ShowWhatIsWritten) { EXPECT_GT(runPage("round-trip.md"), 10U); }
 // Rows such as "| -204 | `Too many … %@` | …": the table is the whole of what documents can raise.
 TEST(Pages, ListEveryError) {
     std::set<std::string> listed, known;
-    for (const std::string& line : linesOf("mapping-format.md"))
+    std::ifstream page(QX_SOURCE_DIR "/docs/mapping-format.md");
+    for (std::string line; std::getline(page, line);)
         if (line.rfind("| -", 0) == 0) {
-            const auto code = line.substr(2, line.find(' ', 2) - 2);
             const auto start = line.find('`') + 1;
-            listed.insert(code + " " + line.substr(start, line.find('`', start) - start));
+            listed.insert(line.substr(2, line.find(' ', 2) - 1) +
+                          line.substr(start, line.find('`', start) - start));
         }
     for (const qx::ErrorText* text : qx::errors::table)
         if (text->code < 0 && text->code > -1000)

@@ -1,3 +1,4 @@
+#include "support/Page.h"
 #include "tools/qxxml/Shell.h"
 
 #include <gtest/gtest.h>
@@ -55,6 +56,7 @@ struct Home : Shell {
     }
 };
 
+// What docs/qxxml.md shows is not repeated here.
 struct Case {
     const char* name;
     std::string command;
@@ -63,81 +65,24 @@ struct Case {
 
 const Case cases[] = {
     {"describe leaves out addresses, and nothing that looks like one",
-     "qxxml describe mapping.xml",
-     {0, R"(<QXXMLDocumentMapping> description: looks like <QXXMLClassMapping: 0x10> includes:
-(
-    line.xml
-) classes:
-(
-    <QXXMLClassMapping> class: Order map-to: order fields:
-    (
-        <QXXMLFieldMapping> name: number container: true bindTo:
-        (
-            <QXXMLBindToMapping> bindTo: number node: attribute
-        ),
-        <QXXMLFieldMapping> name: count type: integer container: true bindTo:
-        (
-            <QXXMLBindToMapping> bindTo: count node: attribute
-        ),
-        <QXXMLFieldMapping> name: line type: Line container: true bindTo:
-        (
-            <QXXMLBindToMapping> bindTo: line node: element
-        )
-    ),
-    <QXXMLClassMapping> class: Line fields:
-    (
-        <QXXMLFieldMapping> name: text container: true bindTo:
-        (
-            <QXXMLBindToMapping> node: text
-        )
-    )
-)
-)",
+     "qxxml describe mapping.xml | sed 1q",
+     {0, "<QXXMLDocumentMapping> description: looks like <QXXMLClassMapping: 0x10> includes:\n",
       ""}},
-    {"read prints what was kept",
-     "qxxml read mapping.xml order.xml",
-     {0, R"({
-    "@class": "Order",
-    "number": "7",
-    "line": {
-        "@class": "Line",
-        "text": "tea"
-    },
-    "unboundChildren": {
-        "note": [
-            "<note>n</note>"
-        ]
-    },
-    "unboundAttributes": [
-        "state=\"new\""
-    ]
-}
-)",
-      kept}},
-    {"read discards what is unknown",
-     "qxxml read --discard-unknown mapping.xml order.xml",
-     {0, orderAsJson, ""}},
+    {"read of a document that no class handles is null",
+     "qxxml read mapping.xml other.xml",
+     {0, "null\n", ""}},
     {"read takes standard input and includes from the mapping's folder",
      "mkdir below; cd below; qxxml read --discard-unknown ../mapping.xml - <../order.xml",
      {0, orderAsJson, ""}},
     {"a document may be called like a command",
      "qxxml read --discard-unknown mapping.xml read",
      {0, orderAsJson, ""}},
-    {"read of a document that no class handles is null",
-     "qxxml read mapping.xml other.xml",
-     {0, "null\n", ""}},
     {"roundtrip brings unknown XML along",
      "qxxml roundtrip mapping.xml order.xml",
      {0,
       "<?xml version=\"1.0\" encoding=\"UTF-8\"?><order number=\"7\" state=\"new\"><line>tea</line>"
       "<note>n</note></order>\n",
       kept}},
-    {"roundtrip prints one element a line",
-     "qxxml roundtrip --pretty --discard-unknown mapping.xml order.xml",
-     {0,
-      "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<order number=\"7\">\n    <line>tea</line>\n"
-      "</order>\n",
-      ""}},
     {"white space is kept, and namespaces are left out, when that is asked for",
      "qxxml roundtrip mapping.xml spaced.xml 2>&- && "
      "qxxml roundtrip --keep-white-space --no-namespace-uris mapping.xml spaced.xml 2>&-",
@@ -145,16 +90,9 @@ const Case cases[] = {
       "<?xml version=\"1.0\" encoding=\"UTF-8\"?><order xmlns:x=\"urn:x\"><x:a><b></b></x:a>"
       "</order>\n<?xml version=\"1.0\" encoding=\"UTF-8\"?><order><x:a>\n<b></b></x:a></order>\n",
       ""}},
-    {"roundtrip of a document that no class handles fails",
-     "qxxml roundtrip mapping.xml other.xml",
-     {1, "", "qxxml: error -211: No class name for marshalling defined: (null)\n"}},
     {"strict refuses unknown roots",
      "qxxml read --strict mapping.xml other.xml",
      {1, "", "qxxml: error -211: No definition to handle element: <other></other>\n"}},
-    {"strict refuses what is not kept",
-     "qxxml read --strict --discard-unknown mapping.xml order.xml",
-     {1, "",
-      "qxxml: error -214: Unknown fields found in XML document: (note [1]) element: order\n"}},
     {"a failing conversion is warned about, too",
      "qxxml read mapping.xml words.xml",
      {1, "",
@@ -234,6 +172,23 @@ TEST(Commands, AreAnsweredWithOutputStatusAndErrors) {
     const Home home;
     for (const Case& test : cases)
         EXPECT_EQ(home.run(test.command), test.expected) << test.name;
+}
+
+// The page's documents ("xml NAME") are laid out, its commands ("console") run.
+TEST(Commands, DoWhatTheirPageShows) {
+    Shell home;
+    std::size_t commands = 0;
+    for (const auto& [heading, text, line] : support::blocksOf(QX_SOURCE_DIR "/docs/qxxml.md")) {
+        if (heading.starts_with("xml "))
+            home.write(heading.substr(4), text);
+        if (heading != "console")
+            continue;
+        const std::size_t end = text.find('\n');
+        ASSERT_TRUE(text.starts_with("$ ")) << line;
+        EXPECT_EQ(home.run(text.substr(2, end - 2) + " 2>&1").output, text.substr(end + 1)) << line;
+        ++commands;
+    }
+    EXPECT_GE(commands, 8U);
 }
 
 TEST(Commands, EachHasHelp) {
