@@ -3,12 +3,11 @@
 // A folder with the resources of a program or a library, described by an XML property list
 // Info.plist in it. Bundles are opened once and then shared; any thread may ask for them.
 //
-//     main bundle        what the host set, else <folder>/../share/<process name> beside the folder
-//                        of the running program where that exists, else the program's folder
-//     framework bundle   this library's: <folder>/../share/QXXMLMarshalling beside its own folder
-//     of a class         <folder>/../share/<name> for a class in lib<name>.so, else that folder;
-//     the
-//                        main bundle for a class of the program itself
+//     main bundle        what the host set; else ../share/<process name> beside the folder of the
+//                        running program, where that exists; else the program's folder
+//     framework bundle   this library's: ../share/QXXMLMarshalling beside its own folder
+//     of a class         ../share/<name> beside the folder of its lib<name>.so, else that folder;
+//                        for a class of the program itself, the main bundle
 
 #include <QXXMLMarshalling/platform/Dictionary.h>
 
@@ -46,6 +45,11 @@ public:
     // null when there is none or the name leads out of the bundle. A type is added behind a dot.
     String pathForResource(std::string_view name, const String& type = nullptr) const;
 
+    // The translation of an English text, from <language>.lproj/Localizable.strings; the English
+    // text itself where there is none. The language is that of the first of LC_ALL, LC_MESSAGES and
+    // LANG that is set; its texts are read once.
+    String localizedString(std::string_view englishText) const;
+
     // The class name, the address and the path.
     String description() const override;
 
@@ -53,7 +57,7 @@ protected:
     const Class& describedClass() const override;
 
 private:
-    friend Ref<Bundle> make<Bundle>(String&, Ref<Dictionary>&&);
+    friend Ref<Bundle> make<Bundle>(String&, const Ref<Dictionary>&);
 
     Bundle(String path, Ref<Dictionary> info) noexcept;
 

@@ -113,14 +113,17 @@ Ref<Bundle> Bundle::bundleWithPath(const String& path) {
         if (auto known = find())
             return known;
     }
-    // Read outside the lock: a broken list is logged, and the host's log function may ask for
-    // bundles.
-    Ref<Dictionary> info = readPropertyList(appendingPathComponent(real, "Info.plist"));
-    const std::lock_guard lock(open.mutex);
-    if (auto known = find())
-        return known;
-    open.bundles.push_back(make<Bundle>(real, std::move(info)));
-    return open.bundles.back();
+    // Read outside the lock: an error looks for its text in a bundle.
+    const PropertyList info = readPropertyList(appendingPathComponent(real, "Info.plist"));
+    auto made = make<Bundle>(real, info.values);
+    {
+        const std::lock_guard lock(open.mutex);
+        if (auto known = find())
+            return known;
+        open.bundles.push_back(made);
+    }
+    info.warn();
+    return made;
 }
 
 Ref<Bundle> Bundle::mainBundle() {

@@ -35,14 +35,11 @@ std::string_view languageOf(std::string_view locale) {
 }
 
 // The texts for a language and region, else for the language.
-Strings readStrings(std::string_view language) {
-    const Ref<Bundle> framework = Bundle::frameworkBundle();
-    if (!framework)
-        return {};
+Strings readStrings(const Bundle& bundle, std::string_view language) {
     for (const auto name : {language, language.substr(0, language.find('_'))}) {
         const String folder = String::concat({name, ".lproj"});
         const String path =
-            framework->pathForResource(appendingPathComponent(folder, "Localizable.strings"));
+            bundle.pathForResource(appendingPathComponent(folder, "Localizable.strings"));
         if (path.isNull())
             continue;
         if (const Ref<Data> data = readFile(path))
@@ -51,7 +48,7 @@ Strings readStrings(std::string_view language) {
     return {};
 }
 
-// The texts of each language that was asked for; they stay for ever.
+// The texts of each bundle and language that were asked for; they stay for ever.
 class Languages {
 public:
     static Languages& shared() {
@@ -59,27 +56,32 @@ public:
         return *languages;
     }
 
-    const Strings& textsFor(std::string_view language) {
+    const Strings& textsFor(const Bundle& bundle, std::string_view language) {
         {
             const std::lock_guard lock(_mutex);
-            if (const Strings* known = find(language))
+            if (const Strings* known = find(bundle, language))
                 return *known;
         }
-        auto read = std::make_unique<Language>(std::string(language), readStrings(language));
+        auto read = std::make_unique<Language>(
+            Language{bundle.bundlePath(), std::string(language), readStrings(bundle, language)});
         const std::lock_guard lock(_mutex);
-        if (const Strings* known = find(language))
+        if (const Strings* known = find(bundle, language))
             return *known;
         _languages.push_back(std::move(read));
-        return _languages.back()->second;
+        return _languages.back()->texts;
     }
 
 private:
-    using Language = std::pair<std::string, Strings>;
+    struct Language {
+        String bundlePath;
+        std::string name;
+        Strings texts;
+    };
 
-    const Strings* find(std::string_view language) const {
+    const Strings* find(const Bundle& bundle, std::string_view language) const {
         for (const auto& known : _languages)
-            if (known->first == language)
-                return &known->second;
+            if (known->name == language && known->bundlePath == bundle.bundlePath())
+                return &known->texts;
         return nullptr;
     }
 
@@ -87,15 +89,35 @@ private:
     std::vector<std::unique_ptr<Language>> _languages;
 };
 
+// Marks, per thread, that the framework bundle is being opened for a text: an error that comes
+// about meanwhile would look for its own text there, without end.
+struct Opening {
+    Opening() noexcept { isActive = true; }
+    Opening(const Opening&) = delete;
+    Opening& operator=(const Opening&) = delete;
+    ~Opening() { isActive = false; }
+
+    static thread_local bool isActive;
+};
+thread_local bool Opening::isActive = false;
+
 } // namespace
 
-String localizedText(std::string_view englishText) {
+String Bundle::localizedString(std::string_view englishText) const {
     const std::string_view language = languageOf(localeName());
     if (language.empty() || englishText.empty())
         return englishText;
-    const Strings& texts = Languages::shared().textsFor(language);
+    const Strings& texts = Languages::shared().textsFor(*this, language);
     const auto found = texts.find(englishText);
     return found != texts.end() ? found->second : String(englishText);
+}
+
+String localizedText(std::string_view englishText) {
+    if (languageOf(localeName()).empty() || Opening::isActive)
+        return englishText;
+    const Opening opening;
+    const Ref<Bundle> framework = Bundle::frameworkBundle();
+    return framework ? framework->localizedString(englishText) : String(englishText);
 }
 
 } // namespace qx

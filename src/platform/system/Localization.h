@@ -6,9 +6,8 @@
 
 namespace qx {
 
-// The translation of an English text, from <language>.lproj/Localizable.strings of the framework
-// bundle; the English text itself where there is none. The language is that of the first of
-// LC_ALL, LC_MESSAGES and LANG that is set. Any thread may ask.
+// Bundle::localizedString of the framework bundle. An error that comes about while that bundle is
+// opened for a text gets the English one.
 String localizedText(std::string_view englishText);
 
 } // namespace qx

@@ -87,28 +87,32 @@ Value valueOf(const XMLElement& element) {
 
 } // namespace
 
-Ref<Dictionary> readPropertyList(const String& path) {
+void PropertyList::warn() const {
+    if (!problem.isNull())
+        logWarningOrLine("%@", problem);
+}
+
+PropertyList readPropertyList(const String& path) {
+    const auto none = [&path](const String& reason) {
+        return PropertyList{make<Dictionary>(), String::concat({"Unable to read the property list ",
+                                                                path, ": ", reason})};
+    };
     if (!fileExists(path))
-        return make<Dictionary>();
+        return {make<Dictionary>(), {}};
     Ref<Error> error;
     // White space may be all that a string holds.
     const auto document =
         XMLDocument::initWithContentsOfFile(path, {.keepWhiteSpace = true}, &error);
-    if (!document) {
-        logWarningOrLine("Unable to read the property list %@: %@", path,
-                         error ? error->localizedDescription() : String());
-        return make<Dictionary>();
-    }
+    if (!document)
+        return none(error->localizedDescription());
     const XMLElement* root = document->rootElement();
     if (root != nullptr && root->name() == "plist") {
         const auto values = childElements(*root);
         root = values.empty() ? nullptr : values.front();
     }
-    if (root == nullptr || root->name() != "dict") {
-        logWarningOrLine("Unable to read the property list %@: it holds no dictionary", path);
-        return make<Dictionary>();
-    }
-    return dictionaryOf(*root);
+    if (root == nullptr || root->name() != "dict")
+        return none("it holds no dictionary");
+    return {dictionaryOf(*root), {}};
 }
 
 } // namespace qx

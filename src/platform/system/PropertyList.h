@@ -16,8 +16,15 @@
 
 namespace qx {
 
-// The dictionary that the file holds; an empty one for a missing file. A file that cannot be read
-// or is no such list is warned about, with its path, and counts as empty.
-Ref<Dictionary> readPropertyList(const String& path);
+struct PropertyList {
+    Ref<Dictionary> values; // empty for a missing file, and for one that is no such list
+    String problem;         // null unless the file is there and cannot be used
+
+    // Keep the values first: the host's log function may ask for what they say, and the file must
+    // not be read, and warned about, again for that.
+    void warn() const;
+};
+
+PropertyList readPropertyList(const String& path);
 
 } // namespace qx

@@ -20,7 +20,6 @@ Ref<UserDefaults> UserDefaults::standardUserDefaults() {
     return Ref<UserDefaults>(shared);
 }
 
-// Read outside the lock: a broken file is logged, and the host's log function may ask for defaults.
 Ref<Dictionary> UserDefaults::userFile() {
     const String process = ProcessInfo::processName();
     {
@@ -29,13 +28,17 @@ Ref<Dictionary> UserDefaults::userFile() {
             return _file;
     }
     const String directory = configurationDirectory();
-    auto file = directory.isNull() ? make<Dictionary>()
-                                   : readPropertyList(appendingPathComponent(
-                                         directory, String::concat({process, ".plist"})));
-    const std::lock_guard lock(_mutex);
-    _file = std::move(file);
-    _fileProcess = process;
-    return _file;
+    const PropertyList file = directory.isNull()
+                                  ? PropertyList{make<Dictionary>(), {}}
+                                  : readPropertyList(appendingPathComponent(
+                                        directory, String::concat({process, ".plist"})));
+    {
+        const std::lock_guard lock(_mutex);
+        _file = file.values;
+        _fileProcess = process;
+    }
+    file.warn();
+    return file.values;
 }
 
 Value UserDefaults::objectForKey(const String& key) {
