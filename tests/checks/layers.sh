@@ -28,9 +28,12 @@ declare -A header_only=(
     [platform/Ref]='platform/object'
     [platform/WeakRef]='platform/object'
 )
-# Single headers of another room: documents are files, and property lists are documents.
+# Single headers of another room: documents are files, what is wrong with them is told in the user's
+# language, and property lists are documents.
 declare -A lent=(
     ['platform/xml includes "platform/system/Files.h"']=1
+    ['platform/xml includes "platform/system/Errors.h"']=1
+    ['platform/xml includes "platform/system/Localization.h"']=1
     ['platform/system includes <QXXMLMarshalling/platform/XMLDocument.h>']=1
 )
 

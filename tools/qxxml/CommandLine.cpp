@@ -1,6 +1,7 @@
 #include "qxxml/CommandLine.h"
 
 #include "qxxml/Commands.h"
+#include "qxxml/Failure.h"
 
 #include <CLI/CLI.hpp>
 
@@ -32,7 +33,8 @@ int print(const std::string& text) {
     const bool written = std::fwrite(text.data(), 1, text.size(), stdout) == text.size();
     if (written && std::fflush(stdout) == 0)
         return 0;
-    return fail(std::string("512: The standard output cannot be written: ") + std::strerror(errno));
+    return fail("512: " +
+                message("The standard output cannot be written: %@", std::strerror(errno)));
 }
 
 // What is wrong with the value of --application; nothing when it is empty.
@@ -46,6 +48,9 @@ std::string checkApplication(const std::string& application) {
     const std::string version = application.substr(slash + 1);
     if (version.empty() || version.find('/') != std::string::npos)
         return "NAME or NAME/VERSION is expected, not \"" + application + "\"";
+    // Of any other beginning nothing would be left, see QXXMLFileSystemDataRepository.
+    if (version.find_first_of("0123456789") >= version.find_first_not_of("0123456789.("))
+        return "a version begins with a number, unlike \"" + version + "\"";
     return {};
 }
 

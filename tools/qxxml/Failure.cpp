@@ -1,5 +1,8 @@
 #include "qxxml/Failure.h"
 
+#include <QXXMLMarshalling/platform/Bundle.h>
+#include <QXXMLMarshalling/platform/Format.h>
+
 namespace qxxml {
 
 namespace {
@@ -13,6 +16,13 @@ std::string messageOf(const qx::Error& error, const std::string& file) {
 }
 
 } // namespace
+
+std::string message(std::string_view englishText, const qx::Value& argument) {
+    const auto framework = qx::Bundle::frameworkBundle();
+    const qx::String text =
+        framework ? framework->localizedString(englishText) : qx::String(englishText);
+    return qx::format(text, {&argument, 1}).str();
+}
 
 Failure::Failure(const qx::Ref<qx::Error>& error, const std::string& file)
     : _message(error ? messageOf(*error, file) : file + ": nothing was read") {}

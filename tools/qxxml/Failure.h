@@ -10,6 +10,9 @@
 
 namespace qxxml {
 
+// A message of the tool's own, in the user's language: its texts stand among the library's.
+std::string message(std::string_view englishText, const qx::Value& argument);
+
 class Failure : public std::exception {
 public:
     explicit Failure(std::string message) : _message(std::move(message)) {}

@@ -48,7 +48,8 @@ std::string where(const Options& options) {
         looked += "looked in " + place + "\n";
     if (search.path.isNull()) {
         looked.pop_back();
-        throw Failure("260: There is no document of the name: " + options.name + "\n" + looked);
+        throw Failure("260: " + message("There is no document of the name: %@", options.name) +
+                      "\n" + looked);
     }
     return search.path.str() + "\n" + looked;
 }

@@ -1,8 +1,9 @@
 #pragma once
 
-// Every error text that the library reports by itself, and the one way to report it. A text stands
-// here once; share/<language>.lproj/Localizable.strings holds its translations, found by the
-// English text. Operations hand the helper's answer straight on, whatever they return:
+// Every error text that the library reports by itself, and the one way to report it; what a parser
+// says of a place in a document is in platform/xml/ParseFailure.h. A text stands here once;
+// share/<language>.lproj/Localizable.strings holds its translations, found by the English text.
+// Operations hand the helper's answer straight on, whatever they return:
 //
 //     return fail(error, errors::classRedefined, className);       // false, a null Ref or String
 //
@@ -80,11 +81,20 @@ inline constexpr ErrorText unableToSetValue{
     -222, "Unable to set value: %@ for key: %@ in class: %@", invalidValue};
 inline constexpr ErrorText nestedTooDeep{-223, "Objects nest deeper than the limit of %@: %@",
                                          invalidValue};
+inline constexpr ErrorText boundTooOften{
+    -224, "Element is bound more often than the limit of %@: %@", "Invalid Mapping"};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 
 // Files. Where the reason is empty, the operating system's own text is given.
 inline constexpr ErrorText readFailed{256, "The file cannot be read: %@", ""};
+inline constexpr ErrorText noLocalURL{256, "Cannot read %@", "No URL of a local file"};
+inline constexpr ErrorText streamNotRead{256, "Cannot read the document from its stream",
+                                         "The stream failed"};
+inline constexpr ErrorText streamNotWritten{512, "Cannot write the document to its stream",
+                                            "The stream failed"};
+inline constexpr ErrorText noRegularFile{256, readFailed.message,
+                                         "It is a pipe, a socket or a device."};
 inline constexpr ErrorText readNotPermitted{257, "Permission to read is missing: %@", ""};
 inline constexpr ErrorText fileNotFound{260, "There is no such file: %@", ""};
 inline constexpr ErrorText writeFailed{512, "The file cannot be written: %@", ""};
@@ -93,6 +103,7 @@ inline constexpr ErrorText invalidFileName{
     514, "The file name is invalid.",
     "A name has to be a relative path that stays inside its directory."};
 inline constexpr ErrorText diskFull{640, "The disk is too full to write: %@", ""};
+inline constexpr ErrorText textCannotBeWritten{517, "The text cannot be written: %@", ""};
 inline constexpr ErrorText readOnlyDisk{642, "The disk is read-only: %@", ""};
 
 inline constexpr std::array table{&tooManyDescriptions,
@@ -126,13 +137,19 @@ inline constexpr std::array table{&tooManyDescriptions,
                                   &notAnInteger,
                                   &unableToSetValue,
                                   &nestedTooDeep,
+                                  &boundTooOften,
                                   &areaIsNoDirectory,
                                   &readFailed,
+                                  &noRegularFile,
+                                  &noLocalURL,
+                                  &streamNotRead,
+                                  &streamNotWritten,
                                   &readNotPermitted,
                                   &fileNotFound,
                                   &writeFailed,
                                   &writeNotPermitted,
                                   &invalidFileName,
+                                  &textCannotBeWritten,
                                   &diskFull,
                                   &readOnlyDisk};
 

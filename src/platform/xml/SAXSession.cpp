@@ -43,16 +43,15 @@ std::string_view viewOf(const xmlChar* from, const xmlChar* to) {
     return {reinterpret_cast<const char*>(from), static_cast<std::size_t>(to - from)};
 }
 
-// The parser's message on one line.
-std::string messageOf(const xmlError& error) {
-    std::string message = error.message != nullptr ? error.message : "unknown error";
+// What the parser says, on one line.
+ParseFailure failureOf(const xmlError& error, std::size_t offset) {
+    std::string message = error.message != nullptr ? error.message : "";
     while (!message.empty() && isWhite(message.back()))
         message.pop_back();
     std::replace(message.begin(), message.end(), '\n', ' ');
-    // The parser says so of loops and of its limit alike.
     if (error.code == XML_ERR_ENTITY_LOOP)
-        message += ", or entities that bring in more than 10 times what the document holds";
-    return message;
+        return ParseFailure(parseErrors::loopOrExpansion, {message}, offset);
+    return {error.code, message, offset};
 }
 
 } // namespace
@@ -219,8 +218,7 @@ void SAXSession::run() {
     if (_failure)
         throw *_failure;
     if (_context->wellFormed == 0)
-        throw ParseFailure{_context->lastError.code, messageOf(_context->lastError),
-                           ParseFailure::notWellFormed, offset()};
+        throw failureOf(_context->lastError, offset());
 }
 
 void SAXSession::startDocument() {
@@ -286,10 +284,7 @@ xmlEntityPtr SAXSession::entity(const xmlChar* name) {
     if (found->etype == XML_EXTERNAL_GENERAL_PARSED_ENTITY) {
         if (_context->inSubset != 0)
             return nullptr;
-        throw ParseFailure{XML_ERR_ENTITY_IS_EXTERNAL,
-                           "The entity " + std::string(viewOf(name)) +
-                               " stands outside of the document and is not read",
-                           ParseFailure::notWellFormed};
+        throw ParseFailure(parseErrors::externalEntity, {viewOf(name)});
     }
     countExpansion(static_cast<std::size_t>(found->length) + referenceCost);
     return found;
@@ -311,18 +306,12 @@ xmlEntityPtr SAXSession::parameterEntity(const xmlChar* name) {
 
 void SAXSession::countDeclaration() {
     if (++_declarations > maximumDeclarations)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                           "The document has more declarations than the limit of " +
-                               std::to_string(maximumDeclarations),
-                           ParseFailure::beyondLimit};
+        throw ParseFailure(parseErrors::tooManyDeclarations, {maximumDeclarations});
 }
 
 void SAXSession::countAttributeDefault() {
     if (++_attributeDefaults > maximumAttributeDefaults)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                           "More attributes have defaults than the limit of " +
-                               std::to_string(maximumAttributeDefaults),
-                           ParseFailure::beyondLimit};
+        throw ParseFailure(parseErrors::tooManyDefaults, {maximumAttributeDefaults});
 }
 
 void SAXSession::countDefaulted(int namespaceCount, const xmlChar** namespaces, int defaultedCount,
@@ -340,10 +329,7 @@ void SAXSession::countExpansion(std::size_t bytes) {
     const std::size_t limit = freeExpansion + expansionFactor * _text.size();
     _expanded += bytes;
     if (_expanded > limit)
-        throw ParseFailure{XML_ERR_ENTITY_LOOP,
-                           "Entities and attribute defaults bring in more than the limit of " +
-                               std::to_string(limit) + " bytes",
-                           ParseFailure::beyondLimit};
+        throw ParseFailure(parseErrors::expansionTooLarge, {limit});
 }
 
 // The parser goes on after an error to find more; only the first one counts. Undeclared prefixes
@@ -354,8 +340,7 @@ void SAXSession::report(const xmlError& error) {
         throw std::bad_alloc();
     if (error.level == XML_ERR_FATAL ||
         (error.level == XML_ERR_ERROR && error.code == XML_WAR_UNDECLARED_ENTITY))
-        _failure =
-            ParseFailure{error.code, messageOf(error), ParseFailure::notWellFormed, offset()};
+        _failure = failureOf(error, offset());
 }
 
 std::size_t SAXSession::offset() const noexcept {

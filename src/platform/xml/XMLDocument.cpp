@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/platform/Exception.h>
 
+#include "platform/system/Errors.h"
 #include "platform/system/Files.h"
 #include "platform/xml/Encoding.h"
 #include "platform/xml/Siblings.h"
@@ -13,18 +14,6 @@
 
 namespace qx {
 
-namespace {
-
-constexpr int unreadable = 256;
-constexpr int unwritable = 512;
-
-void report(Ref<Error>* error, int code, const char* message) {
-    if (error != nullptr)
-        *error = make<Error>(Error::cocoaDomain, code, message, "The stream failed");
-}
-
-} // namespace
-
 XMLDocument::XMLDocument() noexcept : XMLNode(XMLNodeKind::document, String(), String()) {}
 
 XMLDocument::~XMLDocument() { XMLSiblings::releaseAll(_firstChild); }
@@ -35,10 +24,7 @@ Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
     const String path = pathOfURL(URL);
     if (!path.isNull())
         return initWithContentsOfFile(path, options, error);
-    if (error != nullptr)
-        *error = make<Error>(Error::cocoaDomain, unreadable, String::concat({"Cannot read ", URL}),
-                             "No URL of a local file");
-    return nullptr;
+    return fail(error, errors::noLocalURL, URL);
 }
 
 Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
@@ -66,8 +52,7 @@ Ref<XMLDocument> XMLDocument::initWithStream(std::istream& stream, const XMLPars
         bytes.append(block, static_cast<std::size_t>(stream.gcount()));
     if (stream.eof() && !stream.bad())
         return XMLParser::parse(bytes, options, error);
-    report(error, unreadable, "Cannot read the document from its stream");
-    return nullptr;
+    return fail(error, errors::streamNotRead);
 }
 
 Ref<XMLDocument> XMLDocument::initWithRootElement(Ref<XMLElement> root) {
@@ -128,8 +113,7 @@ bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Er
     stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
     if (stream.flush())
         return true;
-    report(error, unwritable, "Cannot write the document to its stream");
-    return false;
+    return fail(error, errors::streamNotWritten);
 }
 
 String XMLDocument::stringValue() const {

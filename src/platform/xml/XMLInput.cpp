@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <climits>
-#include <libxml/xmlerror.h>
 
 namespace qx {
 
@@ -95,40 +94,29 @@ void XMLInput::decodeBytes(std::string_view bytes) {
     convert(bytes, _declaredEncoding);
     // An encoding that stores ASCII in another way cannot be what the declaration was read in.
     if (!_text.starts_with(declarationStart))
-        throw ParseFailure{XML_ERR_INVALID_ENCODING,
-                           "The document is not in the encoding that it declares, " +
-                               _declaredEncoding.str(),
-                           ParseFailure::notReadable, 0};
+        throw ParseFailure(parseErrors::otherEncoding, {_declaredEncoding}, 0);
 }
 
 void XMLInput::convert(std::string_view bytes, const String& encoding) {
     const DecodeResult result = decode(bytes, encoding, _converted);
     _text = _converted;
     if (result == DecodeResult::unknownEncoding)
-        throw ParseFailure{XML_ERR_UNSUPPORTED_ENCODING,
-                           "The encoding " + encoding.str() + " is not known",
-                           ParseFailure::notReadable, 0};
+        throw ParseFailure(parseErrors::unknownEncoding, {encoding}, 0);
     if (result == DecodeResult::malformed)
-        throw ParseFailure{XML_ERR_INVALID_ENCODING,
-                           "A character is not in the encoding " + encoding.str(),
-                           ParseFailure::notReadable, _text.size()};
+        throw ParseFailure(parseErrors::malformedCharacter, {encoding}, _text.size());
 }
 
 void XMLInput::checkStart() const {
     if (_text.empty())
-        throw ParseFailure{XML_ERR_DOCUMENT_EMPTY, "The document is empty",
-                           ParseFailure::notWellFormed, 0};
+        throw ParseFailure(parseErrors::empty, {}, 0);
     if (_text.size() > INT_MAX - 1)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR, "The document is larger than 2 GB",
-                           ParseFailure::beyondLimit, 0};
+        throw ParseFailure(parseErrors::documentTooLarge, {}, 0);
     if (_text.front() != '<' && !isWhite(_text.front()))
-        throw ParseFailure{XML_ERR_DOCUMENT_START, "Start tag expected, '<' not found",
-                           ParseFailure::notWellFormed, 0};
+        throw ParseFailure(parseErrors::noStartTag, {}, 0);
     // The parser takes a zero byte for the end of the document.
     const std::size_t zero = _text.find('\0');
     if (zero != std::string_view::npos)
-        throw ParseFailure{XML_ERR_INVALID_CHAR, "The document holds a zero byte",
-                           ParseFailure::notWellFormed, zero};
+        throw ParseFailure(parseErrors::zeroByte, {}, zero);
 }
 
 // Only tags can have no "<" inside for long and matter here; so it is enough to look for the last
@@ -146,10 +134,7 @@ void XMLInput::checkStartTags() const {
         }
         const std::size_t next = std::min(_text.find('<', tag + longStartTag), _text.size());
         if (countAttributes(_text.substr(tag, next - tag)) > maximumAttributes)
-            throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                               "An element has more attributes than the limit of " +
-                                   std::to_string(maximumAttributes),
-                               ParseFailure::beyondLimit, tag};
+            throw ParseFailure(parseErrors::tooManyAttributes, {maximumAttributes}, tag);
         tag = next;
         known = next + 1;
     }

@@ -2,8 +2,6 @@
 
 #include "platform/xml/ParseFailure.h"
 
-#include <libxml/xmlerror.h>
-
 namespace qx {
 
 namespace {
@@ -16,10 +14,7 @@ std::string_view viewOf(XMLNames::Name name) {
 
 const String& XMLNames::add(Name local, Name prefix) {
     if (_count >= maximumNames)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                           "The document has more different names than the limit of " +
-                               std::to_string(maximumNames),
-                           ParseFailure::beyondLimit};
+        throw ParseFailure(parseErrors::tooManyNames, {maximumNames});
     String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})
                                     : String(viewOf(local));
     const Key known = Key::existing(name);

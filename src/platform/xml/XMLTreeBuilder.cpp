@@ -27,11 +27,8 @@ inline XMLNode* XMLTreeBuilder::newNode(XMLNodeKind kind, String name, String va
 void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::size_t column) {
     finishText();
     if (_open.size() >= _options.maximumDepth)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                           "Elements nest deeper than the limit of " +
-                               std::to_string(_options.maximumDepth),
-                           ParseFailure::beyondLimit};
-    requireSize(name.size(), "A name");
+        throw ParseFailure(parseErrors::tooDeep, {_options.maximumDepth});
+    requireSize(name.size(), parseErrors::nameTooLarge);
     const bool preserves = !_open.empty() && _open.back().preservesSpace;
     const std::size_t namespaces = _open.empty() ? 0 : _open.back().namespaces;
     auto* element = ::new (_blocks.allocate(sizeof(XMLElement))) XMLElement(name);
@@ -46,18 +43,15 @@ void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::siz
 
 void XMLTreeBuilder::addNamespace(const String& prefix, const String& URI) {
     if (++_open.back().namespaces > maximumNamespaces)
-        throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                           "More namespace declarations are in force than the limit of " +
-                               std::to_string(maximumNamespaces),
-                           ParseFailure::beyondLimit};
+        throw ParseFailure(parseErrors::tooManyNamespaces, {maximumNamespaces});
     XMLElement& element = *_open.back().element;
     XMLSiblings::append(element, element._firstNamespace,
                         newNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
 }
 
 void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
-    requireSize(name.size(), "A name");
-    requireSize(value.size(), "An attribute's value");
+    requireSize(name.size(), parseErrors::nameTooLarge);
+    requireSize(value.size(), parseErrors::valueTooLarge);
     XMLElement& element = *_open.back().element;
     XMLSiblings::append(element, element._firstAttribute,
                         newNode(XMLNodeKind::attribute, name, _values.valued(value)));
@@ -72,7 +66,7 @@ void XMLTreeBuilder::endElement() {
 void XMLTreeBuilder::addText(std::string_view piece, bool isLayout, bool isLasting) {
     if (_open.empty())
         return;
-    requireSize(_lasting.size() + _joined.size() + piece.size(), "A text");
+    requireSize(_lasting.size() + _joined.size() + piece.size(), parseErrors::textTooLarge);
     const bool isFirst = _lasting.empty() && _joined.empty();
     _textIsLayout = isLayout && (isFirst || _textIsLayout);
     if (isFirst && isLasting) {
@@ -86,13 +80,13 @@ void XMLTreeBuilder::addText(std::string_view piece, bool isLayout, bool isLasti
 
 void XMLTreeBuilder::addComment(std::string_view text) {
     finishText();
-    requireSize(text.size(), "A comment");
+    requireSize(text.size(), parseErrors::commentTooLarge);
     appendToCurrent(XMLNode::initCommentWithStringValue(text));
 }
 
 void XMLTreeBuilder::addProcessingInstruction(const String& target, std::string_view data) {
     finishText();
-    requireSize(data.size(), "A processing instruction");
+    requireSize(data.size(), parseErrors::instructionTooLarge);
     appendToCurrent(XMLNode::initProcessingInstructionWithName(target, data));
 }
 
@@ -146,11 +140,8 @@ void XMLTreeBuilder::appendToCurrent(Ref<XMLNode> node) {
         appendChild(*_open.back().element, node.detach());
 }
 
-void XMLTreeBuilder::refuseSize(const char* what) const {
-    throw ParseFailure{XML_ERR_INTERNAL_ERROR,
-                       std::string(what) + " is larger than the limit of " +
-                           std::to_string(_options.maximumTextSize) + " bytes",
-                       ParseFailure::beyondLimit};
+void XMLTreeBuilder::refuseSize(const ErrorText& text) const {
+    throw ParseFailure(text, {_options.maximumTextSize});
 }
 
 } // namespace qx

@@ -59,11 +59,11 @@ private:
     void appendToCurrent(Ref<XMLNode> node);
     void restoreLayout(OpenElement& open);
     void dropLayout(const OpenElement& open) noexcept;
-    void requireSize(std::size_t size, const char* what) const {
+    void requireSize(std::size_t size, const ErrorText& text) const {
         if (size > _options.maximumTextSize)
-            refuseSize(what);
+            refuseSize(text);
     }
-    [[noreturn]] void refuseSize(const char* what) const;
+    [[noreturn]] void refuseSize(const ErrorText& text) const;
 
     XMLDocument& _document;
     const XMLParseOptions _options;

@@ -1,7 +1,10 @@
 #include "platform/system/Errors.h"
 
+#include <QXXMLMarshalling/platform/XMLDocument.h>
+
 #include "platform/system/Files.h"
 #include "platform/system/StringsFile.h"
+#include "platform/xml/ParseFailure.h"
 
 #include "support/FileSandbox.h"
 
@@ -13,27 +16,18 @@ using namespace qx;
 
 namespace {
 
-std::size_t directivesIn(std::string_view text) {
-    std::size_t count = 0;
-    for (std::size_t at = 0; (at = text.find('%', at)) != std::string_view::npos; ++at)
-        ++count;
-    return count;
+// What the message and its reason are in a world of that locale.
+std::string messageUnder(const char* variable, const char* locale) {
+    FileSandbox world;
+    world.setVariable(variable, locale);
+    Ref<Error> error;
+    fail(&error, errors::classRedefined, "Order");
+    return error->localizedDescription().str() + " / " + error->localizedFailureReason().str();
 }
-
-class ErrorsTest : public ::testing::Test {
-protected:
-    std::string messageUnder(const char* variable, const char* locale) {
-        FileSandbox world;
-        world.setVariable(variable, locale);
-        Ref<Error> error;
-        fail(&error, errors::classRedefined, "Order");
-        return error->localizedDescription().str() + " / " + error->localizedFailureReason().str();
-    }
-};
 
 } // namespace
 
-TEST_F(ErrorsTest, ArgumentsAreNotLookedAtWithoutASlot) {
+TEST(ErrorsTest, ArgumentsAreNotLookedAtWithoutASlot) {
     bool asked = false;
     const auto costly = [&] {
         asked = true;
@@ -49,7 +43,7 @@ TEST_F(ErrorsTest, ArgumentsAreNotLookedAtWithoutASlot) {
               "NSCocoaErrorDomain -205: Class redefined: Order (Invalid XML)");
 }
 
-TEST_F(ErrorsTest, EveryTextIsTranslatedWithTheSameDirectives) {
+TEST(ErrorsTest, EveryTextIsTranslatedWithTheSameDirectives) {
     for (const std::string language : {"en", "de"}) {
         const auto file =
             readFile(QX_SOURCE_DIR "/share/" + language + ".lproj/Localizable.strings");
@@ -58,10 +52,14 @@ TEST_F(ErrorsTest, EveryTextIsTranslatedWithTheSameDirectives) {
         const auto check = [&](const char* text) {
             const auto found = texts.find(std::string_view(text));
             ASSERT_NE(found, texts.end()) << language << ": " << text;
-            EXPECT_EQ(directivesIn(found->second), directivesIn(text)) << language << ": " << text;
+            EXPECT_EQ(std::ranges::count(found->second.view(), '%'),
+                      std::ranges::count(std::string_view(text), '%'))
+                << language << ": " << text;
             EXPECT_EQ(found->second == text, language == "en") << language << ": " << text;
         };
-        for (const ErrorText* text : errors::table) {
+        std::vector<const ErrorText*> rows(errors::table.begin(), errors::table.end());
+        rows.insert(rows.end(), parseErrors::table.begin(), parseErrors::table.end());
+        for (const ErrorText* text : rows) {
             check(text->message);
             if (*text->reason != '\0')
                 check(text->reason);
@@ -71,7 +69,7 @@ TEST_F(ErrorsTest, EveryTextIsTranslatedWithTheSameDirectives) {
     }
 }
 
-TEST_F(ErrorsTest, TheReadersLanguageIsThatOfTheFirstVariableSet) {
+TEST(ErrorsTest, TheReadersLanguageIsThatOfTheFirstVariableSet) {
     const std::string german = "Klasse mehrfach definiert: Order / Ung\xC3\xBCltiges XML";
     const std::string english = "Class redefined: Order / Invalid XML";
     for (const char* locale : {"de", "de_DE.UTF-8", "de_AT@euro"}) {
@@ -88,6 +86,10 @@ TEST_F(ErrorsTest, TheReadersLanguageIsThatOfTheFirstVariableSet) {
     Ref<Error> error;
     fail(&error, errors::classRedefined, "Order");
     EXPECT_EQ(error->localizedFailureReason(), "Ung\xC3\xBCltiges XML"); // an empty one is unset
+    XMLDocument::initWithData("", {}, &error);
+    EXPECT_EQ(error->description(), "NSXMLParserErrorDomain 4: Das Dokument ist leer (Das Dokument "
+                                    "ist kein wohlgeformtes XML)");
+    fail(&error, errors::classRedefined, "Order");
     world.setVariable("LC_ALL", "en_US");
     EXPECT_EQ(error->localizedFailureReason(), "Invalid XML"); // texts are looked up when asked for
 }

@@ -120,8 +120,11 @@ const Case cases[] = {
       "qxxml: error 260: There is no such file: absent.xml\n"
       "qxxml: error 256: The file cannot be read: maps\n"}},
     {"messages speak the user's language",
-     "LC_ALL=de_DE.UTF-8 qxxml describe absent.xml",
-     {1, "", "qxxml: error 260: Die Datei gibt es nicht: absent.xml\n"}},
+     "export LC_ALL=de_DE.UTF-8; qxxml describe absent.xml; "
+     "qxxml where absent.xml 2>&1 | sed 1q >&2",
+     {0, "",
+      "qxxml: error 260: Die Datei gibt es nicht: absent.xml\n"
+      "qxxml: error 260: Es gibt kein Dokument mit dem Namen: absent.xml\n"}},
     {"where tells the path and the places up to it",
      "qxxml where mapping.xml --search-path maps --application 'Client/2.1(57)'",
      {0,
@@ -153,7 +156,8 @@ const Case cases[] = {
       "qxxml: error 512: The standard output cannot be written: Broken pipe\n"}},
     {"wrong usage has a status of its own",
      "for arguments in '' tell 'read mapping.xml' 'read a b c' 'read --fast a b' "
-     "'where x --application ..' 'where x --application A/'; do "
+     "'where x --application ..' 'where x --application A/' "
+     "'where x --application A/v2' 'where x --application A/..'; do "
      "qxxml $arguments 2>&1 | sed 1q; qxxml $arguments 2>&- || echo $?; done",
      {0,
       "qxxml: A subcommand is required\n2\n"
@@ -162,7 +166,9 @@ const Case cases[] = {
       "qxxml: The following argument was not expected: c\n2\n"
       "qxxml: The following argument was not expected: --fast\n2\n"
       "qxxml: --application: an application's name is a file name, not \"..\"\n2\n"
-      "qxxml: --application: NAME or NAME/VERSION is expected, not \"A/\"\n2\n",
+      "qxxml: --application: NAME or NAME/VERSION is expected, not \"A/\"\n2\n"
+      "qxxml: --application: a version begins with a number, unlike \"v2\"\n2\n"
+      "qxxml: --application: a version begins with a number, unlike \"..\"\n2\n",
       ""}},
 };
 
