@@ -20,8 +20,8 @@ std::atomic<QXXMLFileSystemDataRepository::CreateFunction> createFunction{nullpt
 
 // The program's directory below one of the user's.
 String directoryForProcess(const String& directory, const String& processName) {
-    return directory.view().ends_with(processName) ? directory
-                                                   : appendingPathComponent(directory, processName);
+    String base = appendingPathComponent(directory, ""); // without slashes at its end
+    return base.view().ends_with(processName) ? base : appendingPathComponent(base, processName);
 }
 
 // What may stand in a directory's name: digits and dots from the start, "(" as one more dot.
@@ -151,7 +151,7 @@ bool QXXMLFileSystemDataRepository::containsData(const String& name) {
 
 Ref<Data> QXXMLFileSystemDataRepository::dataForName(const String& name, Ref<Error>* error) {
     const String path = pathForResourceNamed(name);
-    return path.isNull() ? Ref<Data>() : readFile(path, error);
+    return path.isNull() ? Ref<Data>() : readFile(path, error, ReadableFiles::regular);
 }
 
 Ref<XMLDocument> QXXMLFileSystemDataRepository::documentNamed(const String& name,
@@ -189,6 +189,8 @@ String QXXMLFileSystemDataRepository::writeFile(const Ref<Data>& data, const Str
     const String target = appendingPathComponent(directory, relative);
     if (!data)
         return failWithSystemError(error, errors::writeFailed, target, EINVAL);
+    if (!checkLengthOfPath(target, error))
+        return nullptr;
     if (Ref<Error> problem = createUserOverrideArea(directory)) {
         if (error != nullptr)
             *error = std::move(problem);
@@ -221,7 +223,13 @@ String QXXMLFileSystemDataRepository::writeFileToVersionedUserOverrideArea(const
 String QXXMLFileSystemDataRepository::writeDocumentToUserOverrideArea(
     const Ref<XMLDocument>& document, const String& name, Ref<Error>* error) {
     constexpr XMLOptions options = XMLPrettyPrint | XMLCompactEmptyElements;
-    const Ref<Data> data = document ? make<Data>(document->XMLData(options)) : Ref<Data>();
+    Ref<Data> data;
+    try {
+        if (document)
+            data = make<Data>(document->XMLData(options));
+    } catch (const Exception& exception) {
+        return fail(error, errors::textCannotBeWritten, exception.reason());
+    }
     return writeFileToUserOverrideArea(data, name, error);
 }
 

@@ -3,6 +3,7 @@
 #include "platform/system/Errors.h"
 
 #include <cerrno>
+#include <climits>
 #include <fcntl.h>
 #include <linux/magic.h>
 #include <sys/mman.h>
@@ -54,9 +55,6 @@ const ErrorText& writingError(int errorNumber) {
     case EACCES:
     case EPERM:
         return errors::writeNotPermitted;
-    case ENAMETOOLONG:
-    case EILSEQ:
-        return errors::invalidFileName;
     case ENOSPC:
     case EDQUOT:
         return errors::diskFull;
@@ -72,10 +70,7 @@ Failure failReading(Ref<Error>* error, const String& path, int errorNumber) {
 }
 
 Failure failWriting(Ref<Error>* error, const String& path, int errorNumber) {
-    const ErrorText& text = writingError(errorNumber);
-    if (&text == &errors::invalidFileName)
-        return fail(error, text);
-    return failWithSystemError(error, text, path, errorNumber);
+    return failWithSystemError(error, writingError(errorNumber), path, errorNumber);
 }
 
 // A mapped file that shrinks ends the process at the next access behind its end. Files that only
@@ -204,15 +199,20 @@ private:
 
 } // namespace
 
-Ref<Data> readFile(const String& path, Ref<Error>* error) {
+Ref<Data> readFile(const String& path, Ref<Error>* error, ReadableFiles readable) {
     if (holdsZeroByte(path))
         return failReading(error, path, ENOENT);
-    const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    const bool regularOnly = readable == ReadableFiles::regular;
+    // A pipe that nobody writes to would be waited for.
+    const int waiting = regularOnly ? O_NONBLOCK | O_NOCTTY : 0;
+    const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | waiting));
     struct stat status {};
     if (!file.isOpen() || ::fstat(file.number(), &status) != 0)
         return failReading(error, path, errno);
     if (S_ISDIR(status.st_mode))
         return failReading(error, path, EISDIR);
+    if (regularOnly && !S_ISREG(status.st_mode))
+        return fail(error, errors::noRegularFile, path);
 
     const auto size = S_ISREG(status.st_mode) ? static_cast<std::size_t>(status.st_size) : 0;
     if (size >= smallestMapping && isSafeToMap(file.number(), status)) {
@@ -246,6 +246,17 @@ bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>*
     if (parent.isOpen())
         ::fsync(parent.number());
     return true;
+}
+
+bool checkLengthOfPath(const String& path, Ref<Error>* error) {
+    std::size_t longest = 0;
+    for (std::size_t start = 0; start < path.size();) {
+        const std::size_t end = std::min(path.view().find('/', start), path.size());
+        longest = std::max(longest, end - start);
+        start = end + 1;
+    }
+    return (longest <= NAME_MAX && path.size() < PATH_MAX) ||
+           failWriting(error, path, ENAMETOOLONG);
 }
 
 bool fileExists(const String& path) {

@@ -3,8 +3,8 @@
 // Files and directories by path. Failures are errors of qx::Error::cocoaDomain whose message says
 // what failed and for which path, and whose reason is the operating system's text:
 //   260 no such file, 257 reading not permitted, 256 any other failure to read
-//   514 the name is invalid, 513 writing not permitted, 640 disk full, 642 read-only disk,
-//   512 any other failure to write
+//   513 writing not permitted, 640 disk full, 642 read-only disk, 512 any other failure to write
+//   514 the name is none (empty, or with a zero byte); the one message without a path
 // Everything here may be called from any thread.
 
 #include <QXXMLMarshalling/platform/Data.h>
@@ -14,13 +14,20 @@ namespace qx {
 
 // The file's bytes; null with an error. A large file is mapped where nobody without privileges can
 // cut it short meanwhile (reading behind its end would end the process); any other is copied.
-Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr);
+// Pipes and devices are read to their end, if they have one; with `regular` they are refused (256).
+enum class ReadableFiles : std::uint8_t { all, regular };
+Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr,
+                   ReadableFiles readable = ReadableFiles::all);
 
 // Writes a temporary file beside the target, flushes it to disk and renames it over the target: at
 // every moment, a power failure included, the path names the old bytes or the new ones, whole. The
 // permissions of a file that is replaced are kept; a symbolic link is replaced, not followed. False
 // with an error; the old file is then untouched and the temporary one gone.
 bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>* error = nullptr);
+
+// False with an error for a path that is too long to be written, or has a component that is: to be
+// known before directories are made for it.
+bool checkLengthOfPath(const String& path, Ref<Error>* error = nullptr);
 
 // Whether anything is there, symbolic links followed.
 bool fileExists(const String& path);
