@@ -30,6 +30,7 @@ extern QX_API const char* const AllowMethodForwardingInGenericRecords;
 class QX_API QXGenericRecord : public qx::Object {
 public:
     QXGenericRecord();
+    static qx::Ref<QXGenericRecord> init();
     // Removes the undo actions that target the record.
     ~QXGenericRecord() override;
     // The class as data, named "QXGenericRecord". Describing it registers the user default above.
@@ -55,6 +56,8 @@ public:
     qx::Value valueForUndefinedKey(qx::Key key) const override;
     // Stores the value, or removes the key for null; tells observers and registers undo.
     void setValueForUndefinedKey(const qx::Value& value, qx::Key key) override;
+    // Remembers the value of the key in the change cache, as each announced change does.
+    void _cacheValueForKey(qx::Key key);
     // Sets the value again: what undoing and redoing call.
     void _setValue(const qx::Value& value, qx::Key key);
 
@@ -114,6 +117,8 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
+    const qx::Ref<qx::Dictionary>& filledContents();
+
     bool _notifyBindingsObservers = true;
     qx::ChangeTracking _tracking;
     qx::String _className;

@@ -62,6 +62,8 @@ const qx::Class& describe() {
                         instanceOperation<Record, &Record::description>("description"),
                         instanceOperation<Record, &Record::isUndoRegistrationEnabledForKey>(
                             "isUndoRegistrationEnabledForKey:"),
+                        instanceOperation<Record, &Record::copyWithZone>("copyWithZone:"),
+                        instanceOperation<Record, &Record::_cacheValueForKey>("_cacheValueForKey:"),
                         instanceOperation<Record, &Record::_setValue>("_setValue:forKey:")},
          .classOperations = {classOperation<&Record::allKnownKeyPaths>("allKnownKeyPaths"),
                              classOperation<&Record::automaticallyNotifiesObserversForKey>(
@@ -107,9 +109,14 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
     return _contents ? _contents->get(key.string()) : Value();
 }
 
-void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
+const Ref<Dictionary>& QXGenericRecord::filledContents() {
     if (!_contents)
         _contents = qx::make<Dictionary>();
+    return _contents;
+}
+
+void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
+    filledContents();
     // The many first values of a record that is read from a document: nobody is told, nothing is
     // remembered.
     const bool isQuiet = _tracking.isIdle() && !hasCompany() && &isa() == &described;
@@ -117,12 +124,17 @@ void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
         _contents->add(key.string(), value))
         return;
     willChangeValueForKey(key);
-    if (value.isNull())
-        _contents->remove(key.string());
+    // Whoever was told may have given the record other contents.
+    if (const Ref<Dictionary> contents = filledContents(); value.isNull())
+        contents->remove(key.string());
     else
-        _contents->set(key.string(), value);
+        contents->set(key.string(), value);
     didChangeValueForKey(key);
 }
+
+Ref<QXGenericRecord> QXGenericRecord::init() { return qx::make<QXGenericRecord>(); }
+
+void QXGenericRecord::_cacheValueForKey(Key key) { _tracking.willChangeValueForKey(key); }
 
 void QXGenericRecord::_setValue(const Value& value, Key key) { _tracking.restoreValue(value, key); }
 
@@ -148,7 +160,13 @@ void QXGenericRecord::willChangeValueForKey(Key key) {
 }
 
 void QXGenericRecord::didChangeValueForKey(Key key) {
-    _tracking.didChangeValueForKey(key);
+    try {
+        _tracking.didChangeValueForKey(key);
+    } catch (...) {
+        // Observers hear of the end of every change that they heard the beginning of.
+        Object::didChangeValueForKey(key);
+        throw;
+    }
     Object::didChangeValueForKey(key);
 }
 
@@ -181,5 +199,9 @@ Ref<qx::CountedSet> QXGenericRecord::allKnownKeyPaths() { return qx::make<qx::Co
 
 bool QXGenericRecord::automaticallyNotifiesObserversForKey(const qx::Class& receiver,
                                                            const String& key) {
-    return !qx::listsName(receiver.perform("allKnownKeyPaths"), key);
+    static const qx::Selector allKnownKeyPaths("allKnownKeyPaths");
+    static const qx::Operation& ownPaths = *described.classOperation(allKnownKeyPaths);
+    // Asked at every change; a class that names no keys of its own answers without a set.
+    const qx::Operation* paths = receiver.classOperation(allKnownKeyPaths);
+    return paths == &ownPaths || !qx::listsName(receiver.perform(allKnownKeyPaths), key);
 }

@@ -194,6 +194,13 @@ TEST_F(QXGenericRecordForwardingTest, OtherMessagesAreNeverForwarded) {
     }
 }
 
+TEST_F(QXGenericRecordForwardingTest, WhatEveryObjectAnswersIsNoKey) {
+    EXPECT_EQ(record->perform("valueForKey:", "name"), Value("Rome"));
+    EXPECT_EQ(record->perform("isEqual:", record), Value(true));
+    record->perform("willChangeValueForKey:", "name");
+    EXPECT_EQ(record->keys(), std::vector<String>{"name"});
+}
+
 TEST_F(QXGenericRecordForwardingTest, WhatIsWrittenByMessageIsUndoneAndMayBeAnUndoAction) {
     const auto manager = make<UndoManager>();
     record->setUndoManager(manager);

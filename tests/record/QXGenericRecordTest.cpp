@@ -74,6 +74,28 @@ TEST(QXGenericRecordTest, SettingNullOnAFreshRecordMakesEmptyContentsAndTellsOfI
     EXPECT_EQ(told, 1);
 }
 
+TEST(QXGenericRecordTest, WhoeverIsToldOfAChangeMayTakeTheContentsAway) {
+    const auto record = make<Record>();
+    record->setValueForKey("old", "title");
+    const auto token = record->observe(
+        "title", [&](const ValueChange&) { record->setContents(nullptr); },
+        Observing::prior | Observing::newValue);
+    record->setValueForKey("new", "title");
+    EXPECT_FALSE(record->contents());
+    record->setValueForKey("new", "other");
+    EXPECT_EQ(record->keys(), std::vector<String>{"other"});
+}
+
+TEST(QXGenericRecordTest, KeysOfAnyFormAreContentButNullIsNone) {
+    const auto record = make<Record>();
+    for (const char* key : {"@foo", "@count", "", "a.b"}) {
+        record->setValueForKey("v", key);
+        EXPECT_EQ(record->valueForKey(key), Value("v")) << key;
+    }
+    EXPECT_THROW(record->setValueForKey("v", Key()), Exception);
+    EXPECT_EQ(record->keys().size(), 4U);
+}
+
 TEST(QXGenericRecordTest, FiveKeysArePropertiesAndNoContent) {
     const auto record = make<Record>();
     const auto contents = make<Dictionary>();

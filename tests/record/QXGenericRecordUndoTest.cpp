@@ -10,7 +10,9 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <random>
+#include <stdexcept>
 
 namespace {
 
@@ -22,7 +24,11 @@ class Book : public Record {
 public:
     int pages = 0;
     bool allows = false;
-    bool titleIsUndoable() { return allows; }
+    std::function<void()> whenAsked = [] {};
+    bool titleIsUndoable() {
+        whenAsked();
+        return allows;
+    }
     static std::vector<String> disabled() { return {"mark"}; }
     static bool yes() { return true; }
 };
@@ -133,6 +139,19 @@ TEST_F(QXGenericRecordUndoTest, TheClassOrTheRecordMayKeepKeysOutOfUndo) {
         EXPECT_EQ(book->isUndoRegistrationEnabledForKey(row.key), row.registered) << row.key;
         EXPECT_EQ(registers(row.key, ++value), row.registered) << row.key;
     }
+}
+
+TEST_F(QXGenericRecordUndoTest, AVetoMayThrowOrTakeTheManagerAway) {
+    int told = 0;
+    const auto token = book->observe("mainTitle", [&](const ValueChange&) { ++told; });
+    book->whenAsked = [] { throw std::runtime_error("no"); };
+    EXPECT_THROW(book->setValueForKey("a", "mainTitle"), std::runtime_error);
+    book->whenAsked = [this] { book->setUndoManager(nullptr); };
+    book->allows = true;
+    book->setValueForKey("b", "mainTitle");
+    book->setValueForKey("c", "mainTitle");
+    EXPECT_EQ(told, 3);
+    EXPECT_TRUE(manager->canUndo());
 }
 
 TEST_F(QXGenericRecordUndoTest, ItemsOfACollectionAreRememberedButOnlyANewCollectionIsRegistered) {

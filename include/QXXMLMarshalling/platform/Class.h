@@ -8,8 +8,8 @@
 //         .property<&Invoice::number>("number")                     // a data member
 //         .property<&Invoice::total, &Invoice::setTotal>("total")   // a pair of accessors
 //         .property<&Invoice::age>("age")                           // a getter: read-only
-//         .property<double>("net", &Invoice::net, &Invoice::net)    // overloads: the type says
-//         which .operation<&Invoice::setParent>("setParent:");
+//         .property<double>("net", &Invoice::net, &Invoice::net)    // overloads of one type
+//         .operation<&Invoice::setParent>("setParent:");
 //     qx::Class::define<CreditNote, Invoice>("CreditNote");         // with its base class
 //
 // The registry of classes is the list of what a document can bring to life: a mapping creates only

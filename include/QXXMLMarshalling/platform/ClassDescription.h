@@ -35,6 +35,8 @@ struct Operation {
     bool returnsValue = false;
     // Raises NSInvalidArgumentException for arguments that the function does not take.
     Value (*invoke)(Selector, const Class&, Object*, std::span<const Value>) = nullptr;
+    // Whether the function takes these arguments: their number, and each as the type it wants.
+    bool (*takes)(std::span<const Value>) = nullptr;
 };
 
 namespace describe {
@@ -176,6 +178,22 @@ Value call(Selector selector, const Class& receiver, std::span<const Value> argu
     (std::make_index_sequence<count>{});
 }
 
+// Whether the arguments convert to the types from First on.
+template <std::size_t First, auto Function>
+bool takes(std::span<const Value> arguments) {
+    using Types = typename Signature<decltype(Function)>::Arguments;
+    constexpr std::size_t count = std::tuple_size_v<Types> - First;
+    if (arguments.size() != count)
+        return false;
+    return [&]<std::size_t... I>(std::index_sequence<I...>) {
+        [[maybe_unused]] const auto converts = []<class V>(const Value& value, V result) {
+            return ValueTraits<V>::fromValue(value, result);
+        };
+        return (converts(arguments[I], Stored<std::tuple_element_t<First + I, Types>>{}) && ...);
+    }
+    (std::make_index_sequence<count>{});
+}
+
 template <class F>
 constexpr bool returnsValue = !std::is_void_v<typename Signature<F>::Result>;
 
@@ -184,9 +202,10 @@ Operation instanceOperation(std::string_view name) {
     Operation operation;
     operation.selector = name;
     operation.returnsValue = returnsValue<decltype(Function)>;
+    constexpr std::size_t first = std::is_member_function_pointer_v<decltype(Function)> ? 0 : 1;
+    operation.takes = &takes<first, Function>;
     operation.invoke = [](Selector selector, const Class& receiver, Object* object,
                           std::span<const Value> arguments) {
-        constexpr std::size_t first = std::is_member_function_pointer_v<decltype(Function)> ? 0 : 1;
         return call<first, Function>(selector, receiver, arguments, static_cast<T&>(*object));
     };
     return operation;
@@ -206,12 +225,14 @@ Operation classOperation(std::string_view name) {
     Operation operation;
     operation.selector = name;
     operation.returnsValue = returnsValue<decltype(Function)>;
+    constexpr std::size_t first = takesClass<Function>() ? 1 : 0;
+    operation.takes = &takes<first, Function>;
     operation.invoke = [](Selector selector, const Class& receiver, Object*,
                           std::span<const Value> arguments) {
-        if constexpr (takesClass<Function>())
-            return call<1, Function>(selector, receiver, arguments, receiver);
+        if constexpr (first == 1)
+            return call<first, Function>(selector, receiver, arguments, receiver);
         else
-            return call<0, Function>(selector, receiver, arguments);
+            return call<first, Function>(selector, receiver, arguments);
     };
     return operation;
 }

@@ -85,10 +85,11 @@ public:
     virtual void willChange(ChangeKind kind, std::span<const std::size_t> indexes, Key key);
     virtual void didChange(ChangeKind kind, std::span<const std::size_t> indexes, Key key);
 
-    // Tells the observer of changes at the key path, with old and new value unless other options are
-    // given; see Observation.h for these and for what the change holds. Each adding is ended by one
-    // removing, the latest first, or with one of the objects; removing what is not there raises
-    // NSRangeException.
+    // Tells the observer of changes at the key path, with old and new value unless other options
+    // are given; see Observation.h for these and for what the change holds. Each adding is ended by
+    // one removing, the latest first, or with one of the objects; removing what is not there raises
+    // NSRangeException, but in the destructor of either, when the observation has ended already.
+    // Without an observer, NSInvalidArgumentException.
     void addObserver(Object* observer, Key keyPath, unsigned options = 3, Selector context = {});
     void removeObserver(Object* observer, Key keyPath);
     void removeObserver(Object* observer, Key keyPath, Selector context);

@@ -1,7 +1,8 @@
 #pragma once
 
 // A base class for a host's own classes: given an undo manager, every change of a described
-// property through setValueForKey, and every change announced by a ChangeScope, can be undone.
+// property through setValueForKey, and every change of a value announced by a ChangeScope, can be
+// undone. A change announced by the indexes of items is not registered.
 //
 //     class Person : public qx::UndoableObject {
 //     public:

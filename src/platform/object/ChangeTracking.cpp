@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/platform/ChangeTracking.h>
 
 #include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/Null.h>
 
 #include "platform/object/NameList.h"
@@ -11,6 +12,26 @@ namespace qx {
 namespace {
 
 Value nullForMarker(const Value& value) { return value.isNullOrMarker() ? Value() : value; }
+
+// The remembered value, or the dictionary's own for a key such as "@count".
+Value entry(const Dictionary& cache, Key key) {
+    try {
+        return cache.valueForKey(key);
+    } catch (const UndefinedKeyException&) {
+        return {};
+    }
+}
+
+// A key that is announced by hand need not be readable.
+Value readable(const Object& owner, Key key) {
+    try {
+        return owner.valueForKey(key);
+    } catch (const UndefinedKeyException& exception) {
+        if (!exception.concerns(&owner, key))
+            throw;
+        return {};
+    }
+}
 
 } // namespace
 
@@ -26,7 +47,7 @@ Ref<Dictionary> ChangeTracking::changeCache() const {
 }
 
 void ChangeTracking::willChangeValueForKey(Key key) {
-    Value current = _owner.valueForKey(key);
+    Value current = readable(_owner, key);
     if (isCache(current))
         return;
     const bool isNull = current.isNullOrMarker();
@@ -38,19 +59,19 @@ void ChangeTracking::willChangeValueForKey(Key key) {
     const Ref<Dictionary> cache = changeCache();
     if (isNull)
         current = Value(Null::marker());
-    const Value cached = cache->valueForKey(key);
+    const Value cached = entry(*cache, key);
     if (cached.isNull() || !(cached.isSameAs(current) || cached.isEqual(current)))
         cache->set(key.string(), std::move(current));
 }
 
 void ChangeTracking::didChangeValueForKey(Key key) {
-    if (!_undoManager || !_undoManager->isUndoRegistrationEnabled() ||
-        !isUndoRegistrationEnabledForKey(key))
+    // The vetoes are the host's code: they may take the manager away.
+    const Ref<UndoManager> manager = _undoManager;
+    if (!manager || !manager->isUndoRegistrationEnabled() || !isUndoRegistrationEnabledForKey(key))
         return;
     static const Selector restore("_setValue:forKey:");
-    const Ref<UndoManager> manager = _undoManager;
     const Value before = nullForMarker(_cache ? _cache->get(key.string()) : Value());
-    const Value now = nullForMarker(_owner.valueForKey(key));
+    const Value now = nullForMarker(readable(_owner, key));
     if (isCache(now))
         return;
     if (now.isSameAs(before) || (!now.isNull() && now.isEqual(before)))

@@ -42,11 +42,19 @@ Value Dictionary::get(const String& key) const {
     return value != nullptr ? *value : Value();
 }
 
-void Dictionary::set(const String& key, Value value) {
+namespace {
+
+void refuseNull(const String& key, const Value& value) {
     if (key.isNull() || value.isNull())
         throw Exception(
             Exception::invalidArgument,
             String::concat({"a dictionary takes no null for its key ", Value(key).description()}));
+}
+
+} // namespace
+
+void Dictionary::set(const String& key, Value value) {
+    refuseNull(key, value);
     changed();
     if (const std::size_t position = positionOf(key); position != nameindex::none) {
         // The replaced value ends last: it may lead back to this dictionary.
@@ -57,6 +65,7 @@ void Dictionary::set(const String& key, Value value) {
 }
 
 bool Dictionary::add(const String& key, const Value& value) {
+    refuseNull(key, value);
     if (positionOf(key) != nameindex::none)
         return false;
     changed();

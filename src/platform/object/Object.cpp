@@ -117,9 +117,41 @@ const Class& Object::isa() const {
     return *known;
 }
 
+namespace {
+
+bool isEqualTo(const Object& object, const Value& other) {
+    return other.object() != nullptr && object.isEqual(*other.object());
+}
+
+void setValueForKeyOf(Object& object, const Value& value, const String& key) {
+    object.setValueForKey(value, key);
+}
+
+Value valueForKeyPathOf(const Object& object, const String& path) {
+    return object.valueForKeyPath(path);
+}
+
+} // namespace
+
+// What every object answers, so that one which forwards operations does not take these for others.
 const Class& Object::describedClass() const {
+    using describe::instanceOperation;
     static const Class& described = Class::publish(
-        {.name = "qx::Object", .type = &typeid(Object), .superclass = nullptr}, false);
+        {.name = "qx::Object",
+         .type = &typeid(Object),
+         .superclass = nullptr,
+         .operations =
+             {instanceOperation<Object, &Object::description>("description"),
+              instanceOperation<Object, &isEqualTo>("isEqual:"),
+              instanceOperation<Object, &Object::classNameForMarshalling>(
+                  "classNameForMarshalling"),
+              instanceOperation<Object, &Object::valueForKey>("valueForKey:"),
+              instanceOperation<Object, &setValueForKeyOf>("setValue:forKey:"),
+              instanceOperation<Object, &Object::valueForUndefinedKey>("valueForUndefinedKey:"),
+              instanceOperation<Object, &valueForKeyPathOf>("valueForKeyPath:"),
+              instanceOperation<Object, &Object::willChangeValueForKey>("willChangeValueForKey:"),
+              instanceOperation<Object, &Object::didChangeValueForKey>("didChangeValueForKey:")}},
+        false);
     return described;
 }
 
@@ -152,6 +184,8 @@ void Object::setValueForKey(const Value& value, Key key) {
 }
 
 SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
+    // Whoever is told before the change may let the last reference go.
+    const Ref<Object> kept(hasCompany() ? this : nullptr);
     const Class& type = isa();
     const Property* property = type.property(key);
     if (property == nullptr) {
@@ -185,17 +219,20 @@ void Object::setValueForUndefinedKey(const Value& value, Key key) {
 }
 
 Value Object::valueForKeyPath(std::string_view path) const {
-    const std::size_t dot = path.find('.');
+    std::size_t dot = path.find('.');
     Value value = valueForKey(path.substr(0, dot));
-    if (dot == std::string_view::npos || value.isNull())
-        return value;
-    const Object* next = value.object();
-    if (next != nullptr)
-        return next->valueForKeyPath(path.substr(dot + 1));
-    const Key rest = path.substr(dot + 1);
-    throw UndefinedKeyException(nullptr, rest,
-                                String::concat({"class ", value.classNameForMarshalling(),
-                                                " has no key ", rest.view(), " to read"}));
+    while (dot != std::string_view::npos && !value.isNull()) {
+        path.remove_prefix(dot + 1);
+        if (value.object() == nullptr) {
+            const Key rest = path;
+            throw UndefinedKeyException(nullptr, rest,
+                                        String::concat({"class ", value.classNameForMarshalling(),
+                                                        " has no key ", rest.view(), " to read"}));
+        }
+        dot = path.find('.');
+        value = value.object()->valueForKey(path.substr(0, dot));
+    }
+    return value;
 }
 
 void Object::setValueForKeyPath(const Value& value, std::string_view path) {

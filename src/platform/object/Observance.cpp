@@ -112,7 +112,7 @@ std::shared_ptr<ObservationLink> makeLink(Observance& observance, ObservationLin
     link->path = path;
     link->index = index;
     link->onMainPath = onMainPath;
-    auto& links = ObservationInfo::of(object).links;
+    auto& links = ObservationInfo::of(object).links[key];
     link->position = links.insert(links.end(), link);
     link->object = &object;
     try {
@@ -185,7 +185,11 @@ void ObservationLink::end() noexcept {
     if (object == nullptr)
         return;
     const auto kept = shared_from_this();
-    ObservationInfo::existing(*object)->links.erase(position);
+    auto& links = ObservationInfo::existing(*object)->links;
+    const auto list = links.find(key);
+    list->second.erase(position);
+    if (list->second.empty())
+        links.erase(list);
     object = nullptr;
     parent = nullptr;
     if (next)
@@ -194,8 +198,15 @@ void ObservationLink::end() noexcept {
         dependency->end();
 }
 
+namespace {
+
+std::atomic<std::uint64_t> observancesMade{0};
+
+} // namespace
+
 Observance::Observance(Object& root, Key keyPath, unsigned options)
-    : _root(&root), _keyPath(keyPath), _options(options) {}
+    : _number(observancesMade.fetch_add(1, std::memory_order_relaxed)), _root(&root),
+      _keyPath(keyPath), _options(options) {}
 
 void Observance::begin(Object* observer, Selector context,
                        std::function<void(const ValueChange&)> call) {

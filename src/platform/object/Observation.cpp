@@ -50,9 +50,10 @@ ObservationToken Object::observe(Key keyPath, std::function<void(const ValueChan
 
 namespace {
 
-// The latest observance that suits ends.
+// The latest observance that suits ends. A destructor may remove its object once more: all that the
+// object had to do with has ended by then.
 template <class Suits>
-void removeLatest(Object& object, Key keyPath, Suits suits) {
+void removeLatest(Object& object, const Object* observer, Key keyPath, Suits suits) {
     if (ObservationInfo* info = ObservationInfo::existing(object)) {
         auto& all = info->observances;
         const auto found = std::find_if(all.rbegin(), all.rend(),
@@ -60,6 +61,9 @@ void removeLatest(Object& object, Key keyPath, Suits suits) {
         if (found != all.rend())
             return (*found)->end();
     }
+    if (ObjectInternals::isEnding(object) ||
+        (observer != nullptr && ObjectInternals::isEnding(*observer)))
+        return;
     throw Exception(Exception::range,
                     String::concat({"an observer to be removed does not observe ", keyPath.view(),
                                     " of an object of class ", object.isa().name()}));
@@ -68,13 +72,13 @@ void removeLatest(Object& object, Key keyPath, Suits suits) {
 } // namespace
 
 void Object::removeObserver(Object* observer, Key keyPath) {
-    removeLatest(*this, keyPath, [&](const Observance& observance) {
+    removeLatest(*this, observer, keyPath, [&](const Observance& observance) {
         return observer != nullptr && observance.isFor(observer, keyPath);
     });
 }
 
 void Object::removeObserver(Object* observer, Key keyPath, Selector context) {
-    removeLatest(*this, keyPath, [&](const Observance& observance) {
+    removeLatest(*this, observer, keyPath, [&](const Observance& observance) {
         return observer != nullptr && observance.isFor(observer, keyPath) &&
                observance.context() == context;
     });

@@ -32,7 +32,7 @@ void ObservationInfo::endAll() noexcept {
         ending->end();
     }
     while (!links.empty()) {
-        const auto ending = links.back();
+        const auto ending = links.begin()->second.back();
         ending->end();
     }
 }
@@ -53,10 +53,14 @@ std::vector<Ref<Observance>> ObservationInfo::takePending(Key key) noexcept {
 }
 
 std::vector<std::shared_ptr<ObservationLink>> ObservationInfo::linksFor(Key key) const {
-    std::vector<std::shared_ptr<ObservationLink>> found;
-    for (const auto& link : links)
-        if (link->key == key)
-            found.push_back(link);
+    const auto list = links.find(key);
+    if (list == links.end())
+        return {};
+    std::vector<std::shared_ptr<ObservationLink>> found(list->second.begin(), list->second.end());
+    // A path that led elsewhere for a while has got a new link at the end.
+    std::stable_sort(found.begin(), found.end(), [](const auto& one, const auto& other) {
+        return one->observance->isEarlierThan(*other->observance);
+    });
     return found;
 }
 

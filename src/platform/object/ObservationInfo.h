@@ -22,6 +22,7 @@
 #include <memory>
 #include <optional>
 #include <span>
+#include <unordered_map>
 
 namespace qx {
 
@@ -65,6 +66,7 @@ public:
         return _observer == observer && _keyPath == keyPath;
     }
     Selector context() const noexcept { return _context; }
+    bool isEarlierThan(const Observance& other) const noexcept { return _number < other._number; }
 
     // A change is announced at the link. `kind` and `indexes` count for the end of the path only.
     void changeBegins(const ObservationLink& link, ChangeKind kind,
@@ -82,6 +84,7 @@ private:
     Value currentValue() const;
 
     unsigned _count = 1;
+    std::uint64_t _number; // counts all observances of the process
     Object* _root;
     Object* _observer = nullptr;
     Key _keyPath;
@@ -112,7 +115,7 @@ struct ObservationInfo final : private EndListener {
     void didChange(Key key);
 
     std::list<Ref<Observance>> observances;
-    ObservationLink::List links;
+    std::unordered_map<Key, ObservationLink::List> links; // by their key; no list is empty
     std::list<Observance*> observing;
 
 private:
@@ -126,6 +129,7 @@ private:
     void endAll() noexcept;
     Pending* pending(Key key) noexcept;
     std::vector<Ref<Observance>> takePending(Key key) noexcept;
+    // Those of the earliest observance first.
     std::vector<std::shared_ptr<ObservationLink>> linksFor(Key key) const;
 
     Object& _owner;

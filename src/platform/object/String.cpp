@@ -5,6 +5,8 @@
 #include <cstring>
 #include <new>
 
+#include <sys/auxv.h>
+
 namespace qx {
 
 String::Rep* String::allocate(std::size_t size, std::uint32_t count) {
@@ -49,13 +51,31 @@ String String::concat(std::initializer_list<std::string_view> parts) {
 }
 
 // FNV-1a; 0 is kept free for "not worked out yet".
+namespace {
+
+// Differs from process to process, so that no document can be written whose names all meet in one
+// place of a table. The kernel hands each process these bytes: they are there before any static
+// object is made.
+std::uint64_t hashSeed() noexcept {
+    std::uint64_t seed = 0;
+    if (const auto* random = reinterpret_cast<const char*>(getauxval(AT_RANDOM)))
+        std::memcpy(&seed, random, sizeof(seed));
+    return seed;
+}
+
+} // namespace
+
 std::uint32_t String::hashOf(std::string_view text) noexcept {
-    std::uint32_t hash = 2166136261U;
+    static const std::uint64_t seed = hashSeed();
+    std::uint64_t hash = seed ^ 0xcbf29ce484222325U;
     for (const char c : text) {
         hash ^= static_cast<unsigned char>(c);
-        hash *= 16777619U;
+        hash *= 0x100000001b3U;
     }
-    return hash != 0 ? hash : 1;
+    hash ^= hash >> 32;
+    hash *= 0x9e3779b97f4a7c15U;
+    const auto folded = static_cast<std::uint32_t>(hash >> 32);
+    return folded != 0 ? folded : 1;
 }
 
 std::uint32_t String::hash() const noexcept {

@@ -44,7 +44,13 @@ void UndoableObject::willChangeValueForKey(Key key) {
 }
 
 void UndoableObject::didChangeValueForKey(Key key) {
-    _tracking.didChangeValueForKey(key);
+    try {
+        _tracking.didChangeValueForKey(key);
+    } catch (...) {
+        // Observers hear of the end of every change that they heard the beginning of.
+        Object::didChangeValueForKey(key);
+        throw;
+    }
     Object::didChangeValueForKey(key);
 }
 

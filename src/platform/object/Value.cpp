@@ -199,15 +199,17 @@ bool Value::isSameAs(const Value& other) const noexcept {
 
 // The brackets keep these names from meeting a class name: no class of a mapping can be meant.
 String Value::classNameForMarshalling() const {
+    static const Key number("<number>");
+    static const Key text("<string>");
     switch (_kind) {
     case Kind::null:
         return {};
     case Kind::boolean:
     case Kind::integer:
     case Kind::real:
-        return Key("<number>");
+        return number;
     case Kind::string:
-        return Key("<string>");
+        return text;
     case Kind::object:
         return _payload.object->classNameForMarshalling();
     }

@@ -276,6 +276,43 @@ TEST_F(ObservationTest, EitherSideMayGoFirst) {
     token.end();
 }
 
+TEST_F(ObservationTest, ADestructorMayRemoveItsObjectOnceMore) {
+    struct Watcher : Object {
+        explicit Watcher(Ref<Place> place) : watched(std::move(place)) {
+            watched->addObserver(this, "city");
+        }
+        ~Watcher() override { watched->removeObserver(this, "city"); }
+        Ref<Place> watched;
+    };
+    const auto rome = place("Rome");
+    make<Watcher>(rome);
+    rome->setValueForKey("Roma", "city");
+    EXPECT_EQ(rome->city, "Roma");
+}
+
+TEST_F(ObservationTest, APriorObserverMayLetTheObjectGo) {
+    auto rome = place("Rome");
+    Place& object = *rome;
+    const auto token = object.observe(
+        "city", [&](const ValueChange&) { rome = nullptr; }, Observing::prior);
+    object.setValueForKey("Roma", "city");
+    EXPECT_FALSE(rome);
+}
+
+TEST_F(ObservationTest, ADetourOfThePathChangesNothingInTheOrder) {
+    const auto italy = place("Italy");
+    const auto spain = place("Spain");
+    const auto rome = place("Rome", italy);
+    std::string order;
+    const auto first = rome->observe("within.city", [&](const ValueChange&) { order += '1'; });
+    const auto second = italy->observe("city", [&](const ValueChange&) { order += '2'; });
+    rome->setValueForKey(spain, "within");
+    rome->setValueForKey(italy, "within");
+    order.clear();
+    italy->setValueForKey("Italia", "city");
+    EXPECT_EQ(order, "12");
+}
+
 TEST_F(ObservationTest, AnObserverMayEndTheObservedObject) {
     auto rome = place("Rome");
     Place* raw = rome.get();
