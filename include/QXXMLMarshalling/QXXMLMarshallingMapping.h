@@ -13,6 +13,7 @@
 
 class ClassPlan;
 class MappingPlan;
+class QXXMLDataRepositoryManager;
 
 class QX_API QXXMLMarshallingMapping final : public qx::Object {
 public:
@@ -20,9 +21,12 @@ public:
     // or
     //   -205  "Class redefined: %@"
     //   -205  "Element redefined: %@ class: %@"
-    //   -218  "Unable to load included file: %@"   (an include that leads back to itself, too)
-    // and null without reading anything further when the slot holds an error already. A null
-    // document, like one without a root, holds no class.
+    //   -218  "Unable to load included file: %@"   (an include that leads back to itself too,
+    //         includes more than 256 deep, and more than 10,000 of them)
+    // What a repository raises when it is asked for a document passes through where this document
+    // includes it, and becomes -218 where an included one does. Null, too, without reading anything
+    // further when the slot holds an error already. A null document, like one without a root, holds
+    // no class.
     static qx::Ref<QXXMLMarshallingMapping> initWithDocument(qx::XMLDocument* document,
                                                              qx::Ref<qx::Error>* error = nullptr);
     ~QXXMLMarshallingMapping() override;
@@ -39,7 +43,8 @@ public:
     QXXMLClassMapping* mappingForElementName(const qx::String& elementName) const;
     QXXMLClassMapping* mappingForNode(const qx::XMLNode* node) const;
 
-    // The steps of construction, in this order; a host has no need to call them.
+    // The steps of construction, in this order. A host has no need to call them: on a mapping that
+    // stands they change nothing and return true.
     bool loadIncludedDocuments(qx::Ref<qx::Error>* error = nullptr);
     bool populateLookupCaches(qx::Ref<qx::Error>* error = nullptr);
 
@@ -55,7 +60,7 @@ private:
 
     QXXMLMarshallingMapping();
     bool init(qx::XMLDocument* document, const Loading* loading, qx::Ref<qx::Error>* error);
-    bool loadIncludedDocument(const qx::String& href, const Loading* loading,
+    bool loadIncludedDocument(const QXXMLDataRepositoryManager& manager, const Loading& here,
                               qx::Ref<qx::Error>* error);
     bool loadIncludedDocuments(const Loading* loading, qx::Ref<qx::Error>* error);
 

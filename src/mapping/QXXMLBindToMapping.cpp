@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 
 #include "platform/object/LibraryClass.h"
+#include "platform/object/Printing.h"
 #include "platform/system/Errors.h"
 
 using qx::Error;
@@ -59,6 +60,10 @@ void QXXMLBindToMapping::setChildClassMapping(Ref<QXXMLClassMapping> mapping) {
 
 String QXXMLBindToMapping::descriptionWithLocale(const qx::Object* locale,
                                                  std::size_t indent) const {
+    // A host may set a class that holds this very binding.
+    const qx::Printing printing(*this);
+    if (!printing.mayDescend())
+        return qx::Printing::cutShort;
     std::string text = QXXMLMapping::descriptionWithLocale(locale, indent).str();
     append(text, "bindTo", _bindTo);
     append(text, "type", _type);

@@ -17,8 +17,27 @@ Ref<QXXMLMapping> QXXMLMapping::initWithXML(XMLElement* element, Ref<Error>* err
     return initialized<QXXMLMapping>(element, error);
 }
 
+namespace {
+
+// Mapping nodes nest through the classes of bindings. A parsed document is limited already; one
+// built by hand is not.
+constexpr std::size_t deepestNode = 1'024;
+thread_local std::size_t depth = 0;
+
+struct Deeper {
+    Deeper() noexcept { ++depth; }
+    ~Deeper() { --depth; }
+    Deeper(const Deeper&) = delete;
+    Deeper& operator=(const Deeper&) = delete;
+};
+
+} // namespace
+
 bool QXXMLMapping::readElement(XMLElement* element, Ref<Error>* error) {
     const auto kept = element != nullptr ? Ref<XMLElement>(element) : XMLElement::initWithName("");
+    if (depth == deepestNode)
+        return qx::fail(error, qx::errors::nestedTooDeep, deepestNode, kept->name());
+    const Deeper deeper;
     return initXML(*kept, error);
 }
 

@@ -21,4 +21,5 @@ struct QXXMLMarshallingMapping::Loading {
     const qx::String& href;
     const Loading* parent;
     std::size_t depth;
+    std::size_t& count; // of the documents loaded so far for one mapping
 };

@@ -37,6 +37,8 @@ bool QXXMLMarshallingMapping::init(qx::XMLDocument* document, const Loading* loa
 }
 
 bool QXXMLMarshallingMapping::populateLookupCaches(Ref<Error>* error) {
+    if (_plan != nullptr)
+        return true;
     for (const auto& mapping : _mapping->classMappings()) {
         const String& className = mapping->className();
         const String elementName = MappingPlan::elementNameOf(*mapping);

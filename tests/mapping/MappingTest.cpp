@@ -187,6 +187,21 @@ TEST(Mapping, TakesNoElementForAnEmptyOne) {
     EXPECT_FALSE(QXXMLClassMapping::initWithXML(nullptr));
 }
 
+TEST(Mapping, RefusesNodesNestedByHandDeeperThanTheStack) {
+    auto inner = qx::XMLElement::initWithName("class");
+    for (int i = 0; i < 20'000; ++i) {
+        for (const char* name : {"bind-xml", "field", "class"}) {
+            auto outer = qx::XMLElement::initWithName(name);
+            outer->addAttribute(qx::XMLNode::attributeWithName("name", "n"));
+            outer->addChild(inner);
+            inner = outer;
+        }
+    }
+    Ref<Error> error;
+    EXPECT_FALSE(QXXMLClassMapping::initWithXML(inner.get(), &error));
+    EXPECT_EQ(error->localizedDescription(), "Objects nest deeper than the limit of 1024: field");
+}
+
 TEST(Mapping, PrintsWhatIsThere) {
     const auto document = mapping(
         "<description>all</description><include href='i'/>"

@@ -36,6 +36,10 @@ public:
             throw qx::Exception(qx::Exception::generic, "no such luck");
         if (content == "no memory")
             throw std::bad_alloc();
+        if (content == "flush") {
+            QXXMLDataRepositoryManager::flushDefaultManager();
+            return parsed("");
+        }
         return content.starts_with("<!") ? qx::XMLDocument::initWithData(content, {}, error)
                                          : parsed(content);
     }
@@ -140,6 +144,25 @@ TEST_F(MarshallingMapping, EndsCyclesOfIncludes) {
         repository->documents["n" + std::to_string(i)] =
             "<include href='n" + std::to_string(i + 1) + "'/>";
     EXPECT_EQ(resolve("<include href='n0'/>").substr(0, 5), "-218:");
+    // Without a ring, and still more documents than can be loaded.
+    for (int i = 0; i < 50; ++i) {
+        const std::string next = "<include href='d" + std::to_string(i + 1) + "'/>";
+        repository->documents["d" + std::to_string(i)] = next + next;
+    }
+    EXPECT_EQ(resolve("<include href='d0'/>").substr(0, 5), "-218:");
+}
+
+TEST_F(MarshallingMapping, AsksOneManagerForAllIncludesOfADocument) {
+    repository->documents = {{"a", "flush"}, {"b", "<class name='B'/>"}};
+    EXPECT_EQ(resolve("<include href='a'/><include href='b'/>"), "B");
+}
+
+TEST_F(MarshallingMapping, DoesNotChangeOnceItStands) {
+    repository->documents = {{"b", "<class name='B'/>"}};
+    const auto mapping =
+        QXXMLMarshallingMapping::initWithDocument(parsed("<include href='b'/>").get());
+    EXPECT_TRUE(mapping->loadIncludedDocuments() && mapping->populateLookupCaches());
+    EXPECT_EQ(mapping->mapping()->classMappings().size(), 1U);
 }
 
 TEST_F(MarshallingMapping, PassesErrorsOnAndTurnsExceptionsIntoOne) {
