@@ -45,24 +45,32 @@ public:
     bool isLenient() const noexcept { return _lenient; }
     void setLenient(bool lenient) noexcept { _lenient = lenient; }
     // Unmarshalling keeps on its object what no field consumed, under the keys "unboundChildren"
-    // and "unboundAttributes"; marshalling writes it back.
+    // and "unboundAttributes"; marshalling writes it back. An object of a host's class has to have
+    // these two keys, and "__namespaces" (below), or unmarshalling ends in -222 and marshalling in
+    // the exception of its key-value access.
     bool saveUnknownXML() const noexcept { return _saveUnknownXML; }
     void setSaveUnknownXML(bool save) noexcept { _saveUnknownXML = save; }
     // Marshalling declares the namespaces of class mappings, and those that were read, which an
     // object keeps under the key "__namespaces".
     bool isUsingNamespaceURIs() const noexcept { return _usingNamespaceURIs; }
     void setUsingNamespaceURIs(bool use) noexcept { _usingNamespaceURIs = use; }
-    // How deep objects may nest, in both directions; 256 at first. Deeper ones end in
+    // How deep objects may nest, in both directions; 256 at first, 2,048 at most (more counts as
+    // that many). A level takes about a kilobyte of the thread's stack. Deeper objects end in
     //   -223  "Objects nest deeper than the limit of %@: %@"   (the limit, the class)
     std::size_t maximumDepth() const noexcept { return _maximumDepth; }
-    void setMaximumDepth(std::size_t depth) noexcept { _maximumDepth = depth; }
+    void setMaximumDepth(std::size_t depth) noexcept {
+        _maximumDepth = depth < highestMaximumDepth ? depth : highestMaximumDepth;
+    }
+    static constexpr std::size_t highestMaximumDepth = 2'048;
 
     // A new document, version "1.0" and encoding "UTF-8", whose root represents the object; null
     // with one of the errors of marshallObject and of the fields. Kept unknown XML is moved, not
     // copied, into the document: out of an earlier one if the object was marshalled before.
     qx::Ref<qx::XMLDocument> marshall(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
     // The object built from the document's root element; null on failure, and without an error when
-    // a lenient marshaller finds no class for the root element. See unmarshallElement.
+    // a lenient marshaller finds no class for the root element. See unmarshallElement. One element
+    // is bound to at most 1,000 objects (by flattened fields), more end in
+    //   -224  "Element is bound more often than the limit of %@: %@"   (the limit, the element)
     qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, qx::Ref<qx::Error>* error = nullptr);
     template <class T>
     qx::Ref<qx::Object> unmarshall(const qx::Ref<T>& document,
@@ -75,7 +83,9 @@ public:
     qx::Ref<qx::Object> readFile(const qx::String& path, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readStream(std::istream& stream, qx::Ref<qx::Error>* error = nullptr);
     // Marshall and serialise in one step, one element a line. The string is null on failure; a file
-    // is replaced atomically, and untouched on failure.
+    // is replaced atomically, and untouched on failure. Besides the errors of marshall() and of
+    // writing:
+    //   517  "The text cannot be written: %@"   (a character or a name that XML has no place for)
     qx::String writeString(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
     bool writeFile(const qx::Value& object, const qx::String& path,
                    qx::Ref<qx::Error>* error = nullptr);
@@ -121,7 +131,8 @@ public:
     qx::Ref<qx::Object> allocateClassWithMapping(const QXXMLClassMapping& mapping,
                                                  qx::Ref<qx::Error>* error = nullptr);
     // Bind the fields of the class and of its ancestors, and validate. `boundFields` and
-    // `boundAttributes` count the names of children and attributes that fields consumed.
+    // `boundAttributes` count, whatever the options, the names of children and attributes that
+    // fields consumed.
     //   -211  "No extends definition for class: %@"
     bool bindFieldsWithMapping(const QXXMLClassMapping& mapping, qx::Object& object,
                                qx::XMLElement& element, bool isFlattened,

@@ -42,7 +42,7 @@ private:
                       ErrorSlot error);
     bool mapAutomatically(const FieldPlan& field, qx::XMLElement& element, const qx::Value& value,
                           ErrorSlot error);
-    qx::XMLElement& arrayTarget(const FieldPlan& field, qx::XMLElement& element) const;
+    static qx::XMLElement& arrayTarget(const FieldPlan& field, qx::XMLElement& element);
     bool isToBeWritten(const qx::Value& item);
 
     const QXXMLMarshaller& _marshaller;

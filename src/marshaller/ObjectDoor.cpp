@@ -2,8 +2,6 @@
 
 #include "platform/system/Errors.h"
 
-#include <algorithm>
-
 ObjectHooks::ObjectHooks(const qx::Class& describedType)
     : type(&describedType),
       setClassNameForMarshalling(describedType.operation("setClassNameForMarshalling:")),
@@ -15,9 +13,9 @@ ObjectHooks::ObjectHooks(const qx::Class& describedType)
 
 const ObjectHooks& ObjectDoor::hooksOf(const qx::Object& object) {
     const qx::Class& type = object.isa();
-    const auto known = std::find_if(_known.begin(), _known.end(),
-                                    [&](const ObjectHooks& hooks) { return hooks.type == &type; });
-    return known != _known.end() ? *known : _known.emplace_back(type);
+    if (_latest == nullptr || _latest->type != &type)
+        _latest = &_known.try_emplace(&type, type).first->second;
+    return *_latest;
 }
 
 qx::Value ObjectDoor::send(qx::Object& object, const qx::Operation& operation) {

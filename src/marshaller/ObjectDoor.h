@@ -7,7 +7,7 @@
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/Error.h>
 
-#include <vector>
+#include <unordered_map>
 
 // The optional operations of one class, null where its objects do not answer.
 struct ObjectHooks {
@@ -24,7 +24,7 @@ struct ObjectHooks {
 
 class ObjectDoor {
 public:
-    // The hooks of the object's class.
+    // The hooks of the object's class; they stand as long as the door.
     const ObjectHooks& hooksOf(const qx::Object& object);
 
     // Calls one of the object's hooks.
@@ -42,5 +42,6 @@ public:
                     qx::Ref<qx::Error>* error);
 
 private:
-    std::vector<ObjectHooks> _known;
+    std::unordered_map<const qx::Class*, ObjectHooks> _known;
+    const ObjectHooks* _latest = nullptr;
 };

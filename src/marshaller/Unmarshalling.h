@@ -35,7 +35,10 @@ public:
         bool isFlattened;
     };
 
-    explicit Unmarshalling(QXXMLMarshaller& marshaller);
+    // Of a whole document's unmarshalling the counts of consumed names are its own affair; in
+    // single steps they are the caller's: always counted, and left as they are by the validation.
+    enum class Use : std::uint8_t { document, steps };
+    explicit Unmarshalling(QXXMLMarshaller& marshaller, Use use = Use::document);
 
     qx::Ref<qx::Object> unmarshallNode(qx::XMLNode* node, ElementSource::CopyScope* scope,
                                        ErrorSlot error);
@@ -57,7 +60,6 @@ public:
     bool bindCollection(const FieldPlan& field, const Target& target, ErrorSlot error);
     bool bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error);
 
-    // Uses up the counts of `bound`.
     bool validate(const Target& target, ErrorSlot error);
 
 private:
@@ -71,6 +73,7 @@ private:
     struct Items;
 
     bool isBeingBound(const ClassPlan& plan, const qx::XMLElement& element) const;
+    bool countBuild(const ElementSource& source, bool isFlattened, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
     bool findElement(const FieldPlan& field, const Target& target, qx::XMLElement*& child,
                      const BindingPlan*& binding, ErrorSlot error);
@@ -78,11 +81,12 @@ private:
                            const ClassPlan* classOfElement, ErrorSlot error);
     qx::Value flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error);
     Items findItems(const FieldPlan& field, const Target& target);
-    void adopt(qx::Object& item, qx::Object& parent);
+    bool adopt(qx::Object& item, qx::Object& parent, ErrorSlot error);
     bool validateChildren(const Target& target, ErrorSlot error);
     bool validateAttributes(const Target& target, ErrorSlot error);
 
     // Whether consumed names are counted at all.
+    bool counts() const noexcept { return _use == Use::steps || validates(); }
     bool validates() const noexcept { return !_lenient || _saveUnknownXML; }
     void countField(const Target& target, const qx::String& name) const;
 
@@ -90,10 +94,13 @@ private:
     const MappingPlan& _plan;
     const bool _lenient;
     const bool _saveUnknownXML;
+    const Use _use;
     ObjectDoor _door;
     std::vector<const qx::Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
+    // How often elements were bound, of those that may be bound several times.
+    std::unordered_map<const qx::XMLElement*, std::size_t> _builds;
     // Sets of consumed names that no object uses at the moment.
     std::vector<qx::Ref<qx::CountedSet>> _spareSets;
     class SpareSet;

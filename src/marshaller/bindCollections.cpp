@@ -55,7 +55,8 @@ bool Unmarshalling::bindCollection(const FieldPlan& field, const Target& target,
             continue;
         if (!items.areNamed)
             countField(target, node->name());
-        adopt(*item, target.object);
+        if (!adopt(*item, target.object, error))
+            return false;
         array->add(item);
     }
     return ObjectDoor::set(target.object, field.key, array, error);
@@ -98,7 +99,8 @@ bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target
         if (!item)
             continue;
         array->add(item);
-        adopt(*item, target.object);
+        if (!adopt(*item, target.object, error))
+            return false;
         if (!wrapper)
             countField(target, element->name());
     }

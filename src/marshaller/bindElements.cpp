@@ -70,8 +70,8 @@ bool Unmarshalling::bindAsElement(const FieldPlan& field, const Target& target, 
         value = flattenedValue(field, target, &problem);
     }
     if (!value.isNull()) {
-        if (qx::Object* object = value.object())
-            adopt(*object, target.object);
+        if (qx::Object* object = value.object(); object && !adopt(*object, target.object, error))
+            return false;
         return takeValue(target.object, field, field.key, value, error);
     }
     if (error == nullptr || (!problem && !field.isRequired))

@@ -28,7 +28,7 @@ bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target
             break;
     }
     if (attribute != nullptr) {
-        if (validates())
+        if (counts())
             target.bound.attributes.add(attribute->name());
         return takeValue(target.object, field, field.key, attribute->stringValue(), error);
     }

@@ -1,6 +1,9 @@
 // Reading objects from files, texts and streams, and writing them.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+
+#include "platform/system/Errors.h"
 
 #include <algorithm>
 
@@ -15,8 +18,19 @@ constexpr qx::XMLOptions layout = qx::XMLPrettyPrint;
 
 qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
     qx::XMLParseOptions options;
-    options.maximumDepth = std::max(options.maximumDepth, marshaller.maximumDepth());
+    // An object may stand in a wrapper, and hold a last element with text.
+    options.maximumDepth = std::max(options.maximumDepth, 2 * marshaller.maximumDepth() + 1);
     return options;
+}
+
+// A name or a text that no XML document can hold raises while the tree is written.
+template <class Result, class Write>
+Result written(Write write, Ref<Error>* error) {
+    try {
+        return write();
+    } catch (const qx::Exception& exception) {
+        return qx::fail(error, qx::errors::textCannotBeWritten, exception.reason());
+    }
 }
 
 } // namespace
@@ -38,16 +52,20 @@ Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* er
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
     const auto document = marshall(object, error);
-    return document ? String(document->XMLData(layout)) : String();
+    if (!document)
+        return nullptr;
+    return written<String>([&] { return String(document->XMLData(layout)); }, error);
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
     const auto document = marshall(object, error);
-    return document && document->writeToFile(path, layout, error);
+    return document &&
+           written<bool>([&] { return document->writeToFile(path, layout, error); }, error);
 }
 
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
                                   Ref<Error>* error) {
     const auto document = marshall(object, error);
-    return document && document->writeToStream(stream, layout, error);
+    return document &&
+           written<bool>([&] { return document->writeToStream(stream, layout, error); }, error);
 }

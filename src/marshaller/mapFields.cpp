@@ -107,13 +107,14 @@ bool Marshalling::mapAsElement(const FieldPlan& field, XMLElement& element, cons
 
 bool Marshalling::mapAutomatically(const FieldPlan& field, XMLElement& element, const Value& value,
                                    ErrorSlot error) {
-    if (classOf(value) == nullptr) {
+    const ClassPlan* plan = classOf(value);
+    if (plan == nullptr) {
         const String written = text(value, field.valueType);
         if (field.isRequired || !isZeroOrEmpty(value, written))
             element.addAttribute(XMLNode::attributeWithName(field.xmlName, written));
         return true;
     }
-    const auto child = marshallObject(value, error);
+    const auto child = this->element(*plan, plan->elementName, value, error);
     if (!child)
         return false;
     if (field.isContainer) {
@@ -130,11 +131,11 @@ bool Marshalling::mapAutomatically(const FieldPlan& field, XMLElement& element, 
 
 // Items stand in the wrapper of the location; else, when nothing says what their elements are, in a
 // wrapper of the item name; else in the element itself.
-XMLElement& Marshalling::arrayTarget(const FieldPlan& field, XMLElement& element) const {
+XMLElement& Marshalling::arrayTarget(const FieldPlan& field, XMLElement& element) {
     if (!field.location.isEmpty())
         return appendNew(element, field.location);
     if (field.typeClass == nullptr && !field.bindTo.isEmpty() &&
-        _plan.classForElement(field.bindTo) == nullptr)
+        field.bindings.front().classOfBindTo == nullptr)
         return appendNew(element, field.bindTo);
     return element;
 }
@@ -154,7 +155,9 @@ bool Marshalling::mapArray(const FieldPlan& field, XMLElement& element, const qx
     if (field.hasType() && field.typeClass == nullptr)
         return qx::fail(error, qx::errors::noMappingForDeclaredClass, field.mapping->type());
     XMLElement& target = arrayTarget(field, element);
-    for (const Value& item : array) {
+    // An item's own accessors may change the array it stands in.
+    for (std::size_t i = 0; i < array.count(); ++i) {
+        const Value item = array.at(i);
         Ref<qx::Error> problem;
         auto child = field.typeClass != nullptr
                          ? this->element(*field.typeClass, field.bindTo, item, &problem)

@@ -89,13 +89,13 @@ Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapp
         return nullptr;
     const PlanOfClass plan(this->plan(), mapping);
     ElementSource source(*element, nullptr, (*plan).bindingCount);
-    return Unmarshalling(*this).build(*plan, source, isFlattened, error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps).build(*plan, source, isFlattened, error);
 }
 
 Ref<Object> QXXMLMarshaller::allocateClassWithMapping(const QXXMLClassMapping& mapping,
                                                       Ref<Error>*) {
     const PlanOfClass plan(this->plan(), mapping);
-    return Unmarshalling(*this).allocate(*plan);
+    return Unmarshalling(*this, Unmarshalling::Use::steps).allocate(*plan);
 }
 
 bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Object& object,
@@ -113,8 +113,8 @@ bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Ob
                                             Ref<Error>* error) {
     const PlanOfClass plan(this->plan(), mapping);
     ElementSource source(element, nullptr, (*plan).bindingCount);
-    return Unmarshalling(*this).bindFields(
-        *plan, {object, source, {boundFields, boundAttributes}, isFlattened}, error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindFields(*plan, {object, source, {boundFields, boundAttributes}, isFlattened}, error);
 }
 
 bool QXXMLMarshaller::bindField(const QXXMLFieldMapping& field, Object& object, std::size_t,
@@ -122,8 +122,8 @@ bool QXXMLMarshaller::bindField(const QXXMLFieldMapping& field, Object& object, 
                                 CountedSet& boundAttributes, bool isFlattened, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
     Source source(element, *plan);
-    return Unmarshalling(*this).bindField(
-        *plan, source.target(object, boundFields, boundAttributes, isFlattened), error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindField(*plan, source.target(object, boundFields, boundAttributes, isFlattened), error);
 }
 
 bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Object& object,
@@ -132,8 +132,8 @@ bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Objec
                                            Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
     Source source(element, *plan);
-    return Unmarshalling(*this).bindAsAttribute(
-        *plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindAsAttribute(*plan, source.target(object, boundFields, boundAttributes, false), error);
 }
 
 bool QXXMLMarshaller::bindFieldAsText(const QXXMLFieldMapping& field, Object& object, std::size_t,
@@ -141,8 +141,8 @@ bool QXXMLMarshaller::bindFieldAsText(const QXXMLFieldMapping& field, Object& ob
                                       CountedSet& boundAttributes, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
     Source source(element, *plan);
-    return Unmarshalling(*this).bindAsText(
-        *plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindAsText(*plan, source.target(object, boundFields, boundAttributes, false), error);
 }
 
 bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object& object,
@@ -151,8 +151,9 @@ bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object&
                                          Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
     Source source(element, *plan);
-    return Unmarshalling(*this).bindAsElement(
-        *plan, source.target(object, boundFields, boundAttributes, isFlattened), error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindAsElement(*plan, source.target(object, boundFields, boundAttributes, isFlattened),
+                       error);
 }
 
 bool QXXMLMarshaller::bindCollectionField(const QXXMLFieldMapping& field, Object& object,
@@ -160,8 +161,8 @@ bool QXXMLMarshaller::bindCollectionField(const QXXMLFieldMapping& field, Object
                                           CountedSet& boundAttributes, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
     Source source(element, *plan);
-    return Unmarshalling(*this).bindCollection(
-        *plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindCollection(*plan, source.target(object, boundFields, boundAttributes, false), error);
 }
 
 bool QXXMLMarshaller::bindArrayFieldByType(const QXXMLFieldMapping& field, Object& object,
@@ -169,18 +170,18 @@ bool QXXMLMarshaller::bindArrayFieldByType(const QXXMLFieldMapping& field, Objec
                                            CountedSet& boundAttributes, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
     Source source(element, *plan);
-    return Unmarshalling(*this).bindArrayByType(
-        *plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .bindArrayByType(*plan, source.target(object, boundFields, boundAttributes, false), error);
 }
 
 bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
                                           const CountedSet& boundAttributes, XMLElement& element,
                                           Object& object, Ref<Error>* error) {
-    // Copies: the validation uses the counts up.
     const auto fields = boundFields.mutableCopy();
     const auto attributes = boundAttributes.mutableCopy();
     ElementSource source(element, nullptr, 0);
-    return Unmarshalling(*this).validate({object, source, {*fields, *attributes}, false}, error);
+    return Unmarshalling(*this, Unmarshalling::Use::steps)
+        .validate({object, source, {*fields, *attributes}, false}, error);
 }
 
 bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,

@@ -4,15 +4,24 @@
 #include <QXXMLMarshalling/platform/Array.h>
 
 #include "platform/system/Errors.h"
+#include "platform/system/Log.h"
 
 using qx::Error;
 using qx::Key;
 using qx::Ref;
 using qx::Value;
 
-Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller)
+namespace {
+
+// A few classes with two flattened fields each would bind an element more often than any machine
+// can.
+constexpr std::size_t mostBuildsOfElement = 1'000;
+
+} // namespace
+
+Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, Use use)
     : _marshaller(marshaller), _plan(marshaller.plan()), _lenient(marshaller._lenient),
-      _saveUnknownXML(marshaller._saveUnknownXML), _classes(_plan.classCount() + 1),
+      _saveUnknownXML(marshaller._saveUnknownXML), _use(use), _classes(_plan.classCount() + 1),
       _classKnown(_plan.classCount() + 1) {}
 
 // Lends a set for the time of one object's binding.
@@ -28,7 +37,11 @@ public:
     }
     ~SpareSet() {
         _set->removeAll();
-        _spare.push_back(std::move(_set));
+        try {
+            _spare.push_back(std::move(_set));
+        } catch (const std::bad_alloc&) {
+            // The next object makes a set of its own.
+        }
     }
     SpareSet(const SpareSet&) = delete;
     SpareSet& operator=(const SpareSet&) = delete;
@@ -65,6 +78,12 @@ bool Unmarshalling::isBeingBound(const ClassPlan& plan, const qx::XMLElement& el
     return false;
 }
 
+bool Unmarshalling::countBuild(const ElementSource& source, bool isFlattened, ErrorSlot error) {
+    const bool mayRecur = isFlattened || source.scope() != nullptr;
+    return !mayRecur || ++_builds[&source.element()] <= mostBuildsOfElement ||
+           qx::fail(error, qx::errors::boundTooOften, mostBuildsOfElement, source.element().name());
+}
+
 Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& source, bool isFlattened,
                                      ErrorSlot error) {
     if (isBeingBound(plan, source.element()))
@@ -73,6 +92,8 @@ Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& sourc
     if (depth > _marshaller._maximumDepth)
         return qx::fail(error, qx::errors::nestedTooDeep, _marshaller._maximumDepth,
                         plan.className.string());
+    if (!countBuild(source, isFlattened, error))
+        return nullptr;
     const Ref<qx::Object> object = allocate(plan);
     // Whoever set it: a caller's earlier error stops the binding, too.
     if (error != nullptr && *error)
@@ -105,6 +126,11 @@ Ref<qx::Object> Unmarshalling::allocate(const ClassPlan& plan) {
     }
     const qx::Class* type = _classes[plan.index];
     Ref<qx::Object> object = type != nullptr ? type->create() : nullptr;
+    if (type != nullptr && !object) {
+        qx::logWarningOrLine("Class %@ cannot be made without arguments, records stand in for it",
+                             type->name());
+        _classes[plan.index] = nullptr;
+    }
     if (!object)
         object = QXGenericRecord::classObject().create();
     const ObjectHooks& hooks = _door.hooksOf(*object);
@@ -122,7 +148,7 @@ bool Unmarshalling::bindFields(const ClassPlan& plan, const Target& target, Erro
     ElementSource* source = &target.source;
     source->expectLookups(target.isFlattened ? plan.bindingCount : 0);
     ExtendsWalk walk(plan);
-    do {
+    while (true) {
         bool copied = false;
         for (const FieldPlan& field : walk.current().fields) {
             if (!field.isContainer && !copied) {
@@ -134,7 +160,10 @@ bool Unmarshalling::bindFields(const ClassPlan& plan, const Target& target, Erro
                            error))
                 return false;
         }
-    } while (walk.next());
+        if (!walk.next())
+            break;
+        source->expectLookups(walk.current().bindingCount);
+    }
     if (!walk.broken().isNull())
         return qx::fail(error, qx::errors::noExtends, walk.broken());
     const Target rest{target.object, *source, target.bound, target.isFlattened};
@@ -183,12 +212,18 @@ bool Unmarshalling::bindField(const FieldPlan& field, const Target& target, Erro
 }
 
 // The item knows the object that holds it before it is set on it.
-void Unmarshalling::adopt(qx::Object& item, qx::Object& parent) {
-    if (const qx::Operation* setParent = _door.hooksOf(item).setParent)
-        ObjectDoor::send(item, *setParent, &parent);
+bool Unmarshalling::adopt(qx::Object& item, qx::Object& parent, ErrorSlot error) {
+    const qx::Operation* setParent = _door.hooksOf(item).setParent;
+    if (setParent == nullptr)
+        return true;
+    const Value argument(&parent);
+    if (!setParent->takes({&argument, 1}))
+        return qx::fail(error, qx::errors::unableToSetValue, argument, "parent", item.isa().name());
+    ObjectDoor::send(item, *setParent, argument);
+    return true;
 }
 
 void Unmarshalling::countField(const Target& target, const qx::String& name) const {
-    if (validates())
+    if (counts())
         target.bound.fields.add(name);
 }

@@ -44,7 +44,14 @@ private:
 } // namespace
 
 bool Unmarshalling::validate(const Target& target, ErrorSlot error) {
-    return !validates() || (validateChildren(target, error) && validateAttributes(target, error));
+    if (!validates())
+        return true;
+    if (_use == Use::document)
+        return validateChildren(target, error) && validateAttributes(target, error);
+    const auto fields = target.bound.fields.mutableCopy();
+    const auto attributes = target.bound.attributes.mutableCopy();
+    const Target copied{target.object, target.source, {*fields, *attributes}, target.isFlattened};
+    return validateChildren(copied, error) && validateAttributes(copied, error);
 }
 
 // A name that is left is kept with all its elements, those that were consumed included.

@@ -134,6 +134,92 @@ TEST(Marshaller, ReportsValuesThatAPropertyDoesNotTake) {
     EXPECT_EQ(marshaller->readString("<item count=' 12 '/>")->valueForKey("count"), Value(12));
 }
 
+TEST(Marshaller, ReportsAnOwnerThatSetParentDoesNotTake) {
+    struct Page : qx::Object {
+        void setParent(QXGenericRecord*) {
+            if (heard++ > 0)
+                throw std::runtime_error("no");
+        }
+        int heard = 0;
+        Value page;
+    };
+    qx::Class::define<Page>("Page").property<&Page::page>("page").operation<&Page::setParent>(
+        "setParent:");
+    const auto marshaller = scenario::marshaller(
+        "<class name='Book'>" + field("page", "", "node='element'") +
+        field("last", "", "node='element' name='page'") + "</class>" + "<class name='Page'>" +
+        field("page", "", "node='element'") + "</class>");
+    EXPECT_TRUE(marshaller->readString("<book><page/></book>"));
+    EXPECT_TRUE(scenario::read(*marshaller, "<book><page><page/></page></book>")
+                    .ends_with("for key: parent in class: Page (Invalid Value)"));
+    qx::Class::forget("Page");
+}
+
+TEST(Marshaller, WritesItemsThatChangeTheirListMeanwhile) {
+    struct Leaver : QXGenericRecord {
+        Ref<qx::Array> list;
+        Value name() const {
+            list->removeAll();
+            return "gone";
+        }
+    };
+    qx::Class::define<Leaver, QXGenericRecord>("Leaver").property<&Leaver::name>("name");
+    const auto marshaller = scenario::marshaller(
+        "<class name='Order'>" + field("lines", "collection='array'", "") + "</class>" +
+        "<class name='Leaver'>" + field("name", "", "node='attribute'") + "</class>");
+    const auto list = qx::make<qx::Array>();
+    for (int i = 0; i < 3; ++i) {
+        auto leaver = qx::make<Leaver>();
+        leaver->list = list;
+        list->add(leaver);
+    }
+    const auto order = qx::make<QXGenericRecord>();
+    order->setClassNameForMarshalling("Order");
+    order->setValueForKey(list, "lines");
+    EXPECT_EQ(scenario::write(*marshaller, order),
+              "<Order><Leaver name=\"gone\"></Leaver></Order>");
+    qx::Class::forget("Leaver");
+}
+
+TEST(Marshaller, MakesRecordsInPlaceOfAClassThatNeedsArguments) {
+    struct Point : qx::Object {
+        explicit Point(int) {}
+    };
+    qx::Class::define<Point>("Point");
+    const auto marshaller = scenario::marshaller("<class name='Point'/>");
+    testing::internal::CaptureStderr();
+    const auto point = marshaller->readString("<point/>");
+    EXPECT_TRUE(point.as<QXGenericRecord>());
+    EXPECT_NE(testing::internal::GetCapturedStderr().find("Class Point cannot be made"),
+              std::string::npos);
+    qx::Class::forget("Point");
+}
+
+TEST(Marshaller, EndsFlatteningThatMultipliesInAnError) {
+    std::string mapping;
+    for (int i = 0; i < 30; ++i) {
+        const std::string next = "type='C" + std::to_string(i + 1) + "' container='false'";
+        mapping += "<class name='C" + std::to_string(i) + "'>" +
+                   field("a", next, "node='element'") + field("b", next, "node='element'") +
+                   "</class>";
+    }
+    const auto marshaller = scenario::marshaller(mapping + "<class name='C30'/>");
+    EXPECT_EQ(scenario::read(*marshaller, "<c0/>"),
+              "-224: Element is bound more often than the limit of 1000: c0 (Invalid Mapping)");
+}
+
+TEST(Marshaller, ReportsTextThatNoDocumentCanHold) {
+    const auto marshaller = scenario::marshaller("<class name='Order'>" +
+                                                 field("title", "", "node='text'") + "</class>");
+    const auto order = marshaller->readString("<order>t</order>");
+    order->setValueForKey("\x01", "title");
+    Ref<Error> error;
+    EXPECT_TRUE(marshaller->writeString(order, &error).isNull());
+    EXPECT_EQ(error->code(), 517);
+    std::ostringstream out;
+    EXPECT_FALSE(marshaller->writeStream(order, out) || !out.str().empty());
+}
+
 TEST(Marshaller, LetsWhatAHostsSetterThrowsThroughAndClosesItsUndoGroup) {
     struct Thrower : qx::Object {
         void setTitle(const qx::String&) { throw std::runtime_error("no"); }
@@ -179,11 +265,19 @@ TEST(Marshaller, BindsSingleStepsForAHostThatCallsThem) {
     EXPECT_EQ(element->rootElement()->XMLString(), "<x><t>2</t></x>");
     EXPECT_EQ(fields->description(), "(t [1])");
     EXPECT_FALSE(marshaller->buildClassWithMapping(mapping, nullptr, false));
+    // Whatever the options, the counts are the caller's and stay.
+    marshaller->setSaveUnknownXML(false);
+    EXPECT_TRUE(marshaller->bindFieldsWithMapping(mapping, *record, *element->rootElement(),
+                                                  *fields, *attributes, false));
+    marshaller->setLenient(false);
+    EXPECT_TRUE(
+        marshaller->validateBoundFields(*fields, *attributes, *element->rootElement(), *record));
+    EXPECT_EQ(fields->description(), "(t [2])");
 
     auto copy = mapping.copyWithZone().as<QXXMLClassMapping>();
     copy->setMapTo("other");
     EXPECT_EQ(marshaller->elementWithMapping(*copy, *record)->XMLString(),
-              "<other><t>1</t></other>");
+              "<other><t>2</t></other>");
 }
 
 TEST(Marshaller, EndsDeepNestingInAnErrorInBothDirections) {
@@ -199,8 +293,13 @@ TEST(Marshaller, EndsDeepNestingInAnErrorInBothDirections) {
     };
     EXPECT_TRUE(marshaller->readString(nested(256)));
     Ref<Error> error;
-    EXPECT_FALSE(marshaller->readString(nested(257), &error));
+    EXPECT_FALSE(marshaller->readString(nested(600), &error));
     EXPECT_EQ(error->domain(), Error::parserDomain);
+    // As deep as it goes: whatever a host asks for, the stack suffices.
+    marshaller->setMaximumDepth(1'000'000);
+    const auto deepest = marshaller->readString(nested(QXXMLMarshaller::highestMaximumDepth));
+    EXPECT_FALSE(marshaller->writeString(deepest).isNull());
+    EXPECT_FALSE(marshaller->readString(nested(QXXMLMarshaller::highestMaximumDepth + 1)));
     marshaller->setMaximumDepth(1000);
     const auto deep = marshaller->readString(nested(1000));
     ASSERT_TRUE(deep);
