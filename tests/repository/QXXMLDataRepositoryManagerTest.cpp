@@ -34,36 +34,13 @@ protected:
     Ref<QXXMLDataRepositoryManager> manager = QXXMLDataRepositoryManager::init();
 };
 
-// Both kinds at once, and does something when it is asked.
-class BothKinds : public QXXMLMutableDataRepository, public QXXMLPersistentRepository {
+// Does something when it is asked.
+class Meddler : public QXXMLVolatileDataRepository {
 public:
-    std::function<void()> whenAsked = [] {};
-
+    std::function<void()> whenAsked;
     bool containsDocument(const String&) override {
         whenAsked();
         return false;
-    }
-    bool containsData(const String&) override { return true; }
-    Ref<XMLDocument> documentNamed(const String&, std::uint64_t*, Ref<Error>*) override {
-        return nullptr;
-    }
-    Ref<Data> dataForName(const String&, Ref<Error>* error) override {
-        if (error != nullptr)
-            *error = make<Error>("Host", -1, "refused", "always");
-        return nullptr;
-    }
-    bool setDocument(const Ref<XMLDocument>&, const String&, Ref<Error>*) override { return false; }
-    String pathForResourceNamed(const String&) override { return nullptr; }
-    String writeDocumentToUserOverrideArea(const Ref<XMLDocument>&, const String&,
-                                           Ref<Error>*) override {
-        return nullptr;
-    }
-    String writeFileToUserOverrideArea(const Ref<Data>&, const String&, Ref<Error>*) override {
-        return nullptr;
-    }
-    String writeFileToVersionedUserOverrideArea(const Ref<Data>&, const String&,
-                                                Ref<Error>*) override {
-        return nullptr;
     }
 };
 
@@ -105,15 +82,17 @@ TEST_F(RepositoryManagerTest, TheFirstThatClaimsANameServesIt) {
 
 TEST_F(RepositoryManagerTest, NoOtherRepositoryIsAskedWhenTheFirstFails) {
     sandbox.write("data/Client/a.xml", "<broken");
-    manager->setVolatileRepository(holding("a.xml"));
+    const std::string folder = sandbox.path("data/Client/b");
+    std::filesystem::create_directory(folder);
+    const auto memory = holding("a.xml");
+    memory->setData(make<Data>(), "b");
+    manager->setVolatileRepository(memory);
     Ref<Error> error;
     EXPECT_FALSE(manager->documentNamed("a.xml", nullptr, &error));
-    ASSERT_TRUE(error);
     EXPECT_EQ(error->domain(), Error::parserDomain);
     error.reset();
-    manager->setPersistentRepository(make<BothKinds>());
-    EXPECT_FALSE(manager->dataForName("a.xml", &error));
-    EXPECT_EQ(error->description(), "Host -1: refused (always)");
+    EXPECT_FALSE(manager->dataForName("b", &error));
+    EXPECT_EQ(error->localizedDescription().str(), "The file cannot be read: " + folder);
 }
 
 TEST_F(RepositoryManagerTest, ARepositoryUnderAKnownNameKeepsItsPlace) {
@@ -130,42 +109,33 @@ TEST_F(RepositoryManagerTest, ARepositoryUnderAKnownNameKeepsItsPlace) {
 }
 
 TEST_F(RepositoryManagerTest, ChangingTheOrderDuringALookUpRaises) {
-    const auto meddler = make<BothKinds>();
+    const auto meddler = make<Meddler>();
     manager->addRepository(meddler, "meddler");
     manager->addRepository(holding("a.xml"), "last");
-    const std::function<void()> changes[]{
-        [this] { manager->repositoryNames()->remove(0); },
-        [this] { manager->addRepository(holding("b.xml"), "new"); },
-        [this] { manager->repositoryNames()->removeAll(); },
-        [this] { manager->setRepositoryNames(make<Array>()); }};
-    for (const auto& change : changes) {
+    for (const auto& change : std::vector<std::function<void()>>{
+             [this] { manager->repositoryNames()->remove(0); },
+             [this] { manager->addRepository(holding("b.xml"), "new"); },
+             [this] { manager->repositoryNames()->removeAll(); },
+             [this] { manager->setRepositoryNames(make<Array>()); }}) {
         manager->setRepositoryNames(make<Array>(std::initializer_list<Value>{"meddler", "last"}));
         meddler->whenAsked = change;
         EXPECT_THROW(manager->documentNamed("a.xml"), Exception);
     }
-    meddler->whenAsked = [] {};
 }
 
-TEST_F(RepositoryManagerTest, TheSharedManagerIsMadeOnceUntilItIsFlushed) {
-    QXXMLDataRepositoryManager::flushDefaultManager();
-    const auto shared = QXXMLDataRepositoryManager::defaultManager();
+TEST_F(RepositoryManagerTest, TheSharedManagerIsMadeOnceUntilItIsFlushedAndNotWhileItIsMade) {
+    using Manager = QXXMLDataRepositoryManager;
+    Manager::flushDefaultManager();
+    const auto shared = Manager::defaultManager();
     shared->setVolatileRepository(holding("a.xml"));
-    EXPECT_EQ(QXXMLDataRepositoryManager::defaultManager(), shared);
-    QXXMLDataRepositoryManager::flushDefaultManager();
-    const auto fresh = QXXMLDataRepositoryManager::defaultManager();
-    EXPECT_NE(fresh, shared);
-    EXPECT_EQ(namesOf(*fresh), "QXXMLDataRepositoryPersistentName ");
-    QXXMLDataRepositoryManager::flushDefaultManager();
-}
-
-TEST_F(RepositoryManagerTest, AHookThatAsksForTheManagerInTheMakingRaises) {
-    QXXMLDataRepositoryManager::flushDefaultManager();
+    EXPECT_EQ(Manager::defaultManager(), shared);
+    Manager::flushDefaultManager();
     QXXMLFileSystemDataRepository::setRepositoryCreateFunction(
-        [](QXXMLFileSystemDataRepository&) { QXXMLDataRepositoryManager::defaultManager(); });
-    EXPECT_THROW(QXXMLDataRepositoryManager::defaultManager(), Exception);
+        [](QXXMLFileSystemDataRepository&) { Manager::defaultManager(); });
+    EXPECT_THROW(Manager::defaultManager(), Exception);
     QXXMLFileSystemDataRepository::setRepositoryCreateFunction(nullptr);
-    EXPECT_TRUE(QXXMLDataRepositoryManager::defaultManager());
-    QXXMLDataRepositoryManager::flushDefaultManager();
+    EXPECT_EQ(namesOf(*Manager::defaultManager()), "QXXMLDataRepositoryPersistentName ");
+    Manager::flushDefaultManager();
 }
 
 TEST_F(RepositoryManagerTest, TheDescriptionShowsTheRepositories) {
