@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # A program that saves a document is killed at each system call of the save, and each of them fails
-# once: what is found afterwards is the old document or the new one, whole.
+# once: what is found afterwards is the old document or the new one, whole. Where even the directories
+# are missing, a save that was killed while it made them is made up for by the next.
 #
 # usage: atomic-write.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
@@ -21,8 +22,10 @@ fi
 
 area=$folder/data/Client
 old='<order>the old one</order>'
+# prepare [STATE]: lays out the old document, or with STATE "nothing" not even a directory.
 prepare() {
     rm -rf -- "$folder/data"
+    [[ ${1:-} != nothing ]] || return 0
     mkdir -p -- "$area"
     printf '%s' "$old" >"$area/a.xml"
 }
@@ -31,24 +34,26 @@ fail() {
     exit 1
 }
 
-# One undisturbed run gives the new document and the calls of the save: "name ordinal", the ordinal
-# counting the calls of that name from the start of the program, as strace does.
-prepare
-strace -o "$folder/trace" -- "$program" "$folder/data"
-cp -- "$area/a.xml" "$folder/new.xml"
-mapfile -t calls < <(awk '
-    match($0, /^[a-z0-9_]+\(/) {
-        name = substr($0, 1, RLENGTH - 1)
-        ++count[name]
-        if (name == "getppid") ++marks
-        else if (marks == 1) print name, count[name]
-    }' "$folder/trace")
-((${#calls[@]} >= 8)) || fail "the save has only these calls: ${calls[*]}"
+# One undisturbed run from a state gives the new document and, in `calls`, those of the save: "name
+# ordinal", the ordinal counting the calls of that name from the start of the program, as strace does.
+trace() {
+    prepare "$1"
+    strace -o "$folder/trace" -- "$program" "$folder/data"
+    cp -- "$area/a.xml" "$folder/new.xml"
+    mapfile -t calls < <(awk '
+        match($0, /^[a-z0-9_]+\(/) {
+            name = substr($0, 1, RLENGTH - 1)
+            ++count[name]
+            if (name == "getppid") ++marks
+            else if (marks == 1) print name, count[name]
+        }' "$folder/trace")
+    ((${#calls[@]} >= 8)) || fail "the save has only these calls: ${calls[*]}"
+}
 
-# state: what stands in the area, in `state`: old, new or a description of what is wrong.
+# What stands in the area, in `state`: nothing, old, new or a description of what is wrong.
 look() {
     if [[ ! -e $area/a.xml ]]; then
-        state='no document'
+        state=nothing
     elif cmp -s -- "$area/a.xml" "$folder/new.xml"; then
         state=new
     elif [[ $(<"$area/a.xml") == "$old" ]]; then
@@ -58,21 +63,26 @@ look() {
     fi
 }
 
-killed=0
-declare -A seen=()
-for call in "${calls[@]}"; do
-    read -r name ordinal <<<"$call"
-    prepare
-    status=0
-    { strace -o /dev/null -e "trace=$name" -e "inject=$name:signal=KILL:when=$ordinal" \
-        -- "$program" "$folder/data" >/dev/null; } 2>/dev/null || status=$?
-    look
-    [[ $state == old || $state == new ]] || fail "killed at $name ($ordinal): $state"
-    seen[$state]=1
-    ((status != 137)) || killed=$((killed + 1))
+for start in nothing old; do
+    trace "$start"
+    [[ $start == old || ${calls[*]} == *mkdir* ]] || fail "no directory was made: ${calls[*]}"
+    killed=0
+    declare -A seen=()
+    for call in "${calls[@]}"; do
+        read -r name ordinal <<<"$call"
+        prepare "$start"
+        status=0
+        { strace -o /dev/null -e "trace=$name" -e "inject=$name:signal=KILL:when=$ordinal" \
+            -- "$program" "$folder/data" >/dev/null; } 2>/dev/null || status=$?
+        look
+        [[ $state == "$start" || $state == new ]] || fail "killed at $name ($ordinal): $state"
+        seen[$state]=1
+        ((status != 137)) || killed=$((killed + 1))
+        [[ $name != mkdir* ]] || "$program" "$folder/data" || fail "nothing is written after $call"
+    done
+    ((killed == ${#calls[@]})) || fail "killed only $killed of ${#calls[@]} times"
+    [[ -n ${seen[$start]:-} && -n ${seen[new]:-} ]] || fail "every time: ${!seen[*]}"
 done
-((killed == ${#calls[@]})) || fail "killed only $killed of ${#calls[@]} times"
-[[ -n ${seen[old]:-} && -n ${seen[new]:-} ]] || fail "every time: ${!seen[*]}"
 
 # inject NAME ERROR: lets the first call of that name within the save fail. What the program says in
 # `said`.
