@@ -10,8 +10,7 @@
 //
 // and the first hit wins. The lists can be changed, by a creation hook for every repository made
 // later. A name stays below its directory: one that is empty, absolute or leads out finds nothing,
-// and fails when it is written, before anything is touched:
-//   514  "The file name is invalid."
+// and fails when it is written (514, "The file name is invalid."), before anything is touched.
 
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
 #include <QXXMLMarshalling/platform/Array.h>
@@ -21,12 +20,14 @@
 
 class QX_API QXXMLFileSystemDataRepository : public QXXMLPersistentRepository {
 public:
-    // The user default that names the bundle of the client application, whose version and resources
-    // count; without it the main bundle is taken.
+    // The user default that names the bundle of the client application, whose version counts;
+    // without it that of the main bundle does. Resources are looked for in `searchBundles`.
     static constexpr const char* clientBundleIdentifierKey = "CorvexClientBundleIdentifier";
 
     using CreateFunction = void (*)(QXXMLFileSystemDataRepository& repository);
-    // Called with every repository made from now on, once its lists stand; null for none.
+    // Called with every repository made from now on, once its lists stand; null for none. It may be
+    // called while the shared manager is made: asking for
+    // QXXMLDataRepositoryManager::defaultManager then raises NSInternalInconsistencyException.
     static void setRepositoryCreateFunction(CreateFunction function) noexcept;
 
     // Raises NSInternalInconsistencyException "No application support directories found" where the
@@ -60,7 +61,7 @@ public:
     // "1.0(23)" is "1.0.23", "3.0b2" is "3.0", "v1.0" is empty.
     virtual qx::String applicationVersion();
 
-    // A directory of the name counts as a hit too; reading it is an error.
+    // Whatever has the name counts as a hit; reading a directory, a pipe or a device is an error.
     qx::String pathForResourceNamed(const qx::String& name) override;
     virtual qx::String pathForResourceInBundlesNamed(const qx::String& name);
 
@@ -79,11 +80,20 @@ public:
     // or the file system's error.
     virtual qx::Ref<qx::Error> createUserOverrideArea(const qx::String& directory);
     // Writes into the directory, which is made first, in one step: the file is whole or not there.
-    // The path written; null with an error, an older file then being untouched.
+    // The path written; null with an error, an older file then being untouched:
+    //   514   "The file name is invalid."            see above
+    //   512   "The file cannot be written: %@"       also for null data, and for a null or empty
+    //                                                directory; the reason says why
+    //   513, 640, 642                                no permission, disk full, disk read-only
+    //   -2000 or what else createUserOverrideArea answers
+    // For 514, null data, and names that are too long not even a directory is made.
     virtual qx::String writeFile(const qx::Ref<qx::Data>& data, const qx::String& directory,
                                  const qx::String& name, qx::Ref<qx::Error>* error = nullptr);
 
-    // Pretty-printed, empty elements in their short form, into the plain area.
+    // Pretty-printed, empty elements in their short form, into the plain area. The errors are those
+    // of writeFile: 512 for a null document, too. One that no XML can say (a name, a text) is
+    //   517  "The text cannot be written: %@"
+    // and touches nothing.
     qx::String writeDocumentToUserOverrideArea(const qx::Ref<qx::XMLDocument>& document,
                                                const qx::String& name,
                                                qx::Ref<qx::Error>* error = nullptr) override;

@@ -30,7 +30,8 @@ class UndoManager;
 // Takes one call down as an undo action; see UndoManager::prepareWithInvocationTarget.
 class QX_API UndoRecorder {
 public:
-    // Raises NSInvalidArgumentException when the target does not take the operation.
+    // Raises NSInvalidArgumentException for a null target, and for one that does not answer the
+    // operation.
     template <class... Arguments>
     void perform(Selector selector, const Arguments&... arguments) const {
         performWithArguments(selector, {Value(arguments)...});
@@ -62,8 +63,11 @@ public:
     // Ends the group that opened by itself; does nothing when there is none.
     void endEventGroup();
 
-    // The target's operation with one argument, or with none where its name holds no colon.
+    // The target's operation with one argument, or with none where its name holds no colon. Raises
+    // NSInvalidArgumentException for a null target, and for one that does not answer the operation;
+    // nothing is looked at while registration is disabled.
     void registerUndoWithTarget(Object* target, Selector selector, const Value& object);
+    // The call comes with UndoRecorder::perform, which raises the same.
     UndoRecorder prepareWithInvocationTarget(Object* target);
     // Undone by call(target). What the callable holds is kept alive.
     template <std::derived_from<Object> T, std::invocable<T&> F>
