@@ -215,10 +215,10 @@ void SAXSession::run() {
     xmlParseDocument(_context.get());
     if (_exception)
         std::rethrow_exception(_exception);
+    if (!_failure && _context->wellFormed == 0)
+        _failure = failureOf(_context->lastError, offset());
     if (_failure)
         throw *_failure;
-    if (_context->wellFormed == 0)
-        throw failureOf(_context->lastError, offset());
 }
 
 void SAXSession::startDocument() {
