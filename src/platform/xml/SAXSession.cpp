@@ -218,7 +218,7 @@ void SAXSession::run() {
     if (!_failure && _context->wellFormed == 0)
         _failure = failureOf(_context->lastError, offset());
     if (_failure)
-        throw *_failure;
+        throw ParseFailure(*_failure);
 }
 
 void SAXSession::startDocument() {
