@@ -66,15 +66,6 @@ TEST_F(ChangeTrackingTest, TheCacheHoldsTheValuesBeforeTheLatestChange) {
     EXPECT_EQ(person->changeCache()->get("age"), Value(0));
 }
 
-TEST_F(ChangeTrackingTest, FillingAnEmptyObjectWithoutUndoManagerAllocatesNothing) {
-    const auto fresh = make<Person>();
-    const auto before = Object::liveCount();
-    fresh->setValueForKey("Ann", "name");
-    fresh->setValueForKey(person, "partner");
-    EXPECT_EQ(Object::liveCount(), before);
-    EXPECT_TRUE(fresh->changeCache()->isEmpty());
-}
-
 TEST_F(ChangeTrackingTest, ObserversAreToldOfUndoAndRedoToo) {
     std::string told;
     const auto token = person->observe("name", [&](const ValueChange& change) {
