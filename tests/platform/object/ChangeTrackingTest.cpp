@@ -8,6 +8,8 @@
 
 #include <gtest/gtest.h>
 
+#include <stdexcept>
+
 namespace {
 
 using namespace qx;
@@ -17,6 +19,13 @@ public:
     String name;
     int age = 0;
     Ref<Person> partner;
+    bool vetoThrows = false;
+
+    bool isAgeUndoable() const {
+        if (vetoThrows)
+            throw std::runtime_error("no");
+        return true;
+    }
 
     void rename(const String& newName) {
         const ChangeScope scope(*this, "name");
@@ -29,7 +38,8 @@ const bool described = [] {
     Class::define<Person, UndoableObject>("ChangeTrackingTest.Person")
         .property<&Person::name>("name")
         .property<&Person::age>("age")
-        .property<&Person::partner>("partner");
+        .property<&Person::partner>("partner")
+        .operation<&Person::isAgeUndoable>("isUndoRegistrationEnabledForAge");
     return true;
 }();
 
@@ -76,6 +86,18 @@ TEST_F(ChangeTrackingTest, ObserversAreToldOfUndoAndRedoToo) {
     manager->undo();
     manager->redo();
     EXPECT_EQ(told, "(null)>Ann Ann>(null) (null)>Ann ");
+}
+
+TEST_F(ChangeTrackingTest, AVetoMayThrowAndAnAnnouncedKeyNeedNotBeReadable) {
+    int told = 0;
+    const auto token = person->observe("age", [&](const ValueChange&) { ++told; });
+    person->vetoThrows = true;
+    EXPECT_THROW(person->setValueForKey(7, "age"), std::runtime_error);
+    EXPECT_EQ(person->age, 7);
+    EXPECT_EQ(told, 1);
+    person->willChangeValueForKey("mood");
+    person->didChangeValueForKey("mood");
+    EXPECT_FALSE(manager->canUndo());
 }
 
 TEST_F(ChangeTrackingTest, ManySetsKeepABoundedNumberOfObjects) {

@@ -4,6 +4,7 @@
 
 #include <QXXMLMarshalling/platform/Array.h>
 #include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Dictionary.h>
 #include <QXXMLMarshalling/platform/Format.h>
 #include <QXXMLMarshalling/platform/Null.h>
 
@@ -14,6 +15,7 @@
 namespace {
 
 using namespace qx;
+using support::oneLine;
 using support::raised;
 
 class Holder : public Object {
@@ -67,11 +69,11 @@ TEST(ValueTest, APropertyTakesWhatLosesNothing) {
         const auto holder = make<Holder>();
         for (const auto& [value, expected] : taken) {
             EXPECT_EQ(holder->trySetValueForKey(value, key), SetOutcome::set) << key << expected;
-            EXPECT_EQ(support::oneLine(holder->valueForKey(key)), expected) << key;
+            EXPECT_EQ(oneLine(holder->valueForKey(key)), expected) << key;
         }
         for (const Value& value : refused)
             EXPECT_EQ(holder->trySetValueForKey(value, key), SetOutcome::refused)
-                << key << " " << support::oneLine(value);
+                << key << " " << oneLine(value);
     }
 }
 
@@ -113,7 +115,7 @@ TEST(ValueTest, PathsLeadThroughObjectsAndLists) {
     EXPECT_EQ(holder->valueForKeyPath("next.small"), Value(7));
     holder->setValueForKeyPath(7, "next.next.small"); // leads nowhere
     const auto list = array({holder, holder->next, "text"});
-    EXPECT_EQ(support::oneLine(list->valueForKey("small")), "( 0, 7, <null> )");
+    EXPECT_EQ(oneLine(list->valueForKey("small")), "( 0, 7, <null> )");
     EXPECT_EQ(list->valueForKey("@count"), Value(3));
     EXPECT_EQ(list->trySetValueForKey(1, "small"), SetOutcome::unknownKey);
     EXPECT_EQ(raised([&] { holder->valueForKeyPath("next.nothing"); }),
@@ -131,6 +133,22 @@ TEST(ValueTest, CollectionsRaiseForWhatTheyCannotDo) {
     EXPECT_EQ(raised([&] { list->replace(1, 0); }),
               "NSRangeException: index 1 in an array of 1 items");
     EXPECT_EQ(raised([&] { list->remove(1); }), "NSRangeException: index 1 in an array of 1 items");
+}
+
+TEST(ValueTest, DictionariesAreEqualWhateverTheirOrder) {
+    const auto one = make<Dictionary>(), other = make<Dictionary>();
+    one->set("a", 1);
+    one->set("b", array({"x"}));
+    other->set("b", array({"x"}));
+    EXPECT_NE(Value(one), Value(other));
+    other->setValueForKey(1.0, "a");
+    EXPECT_EQ(Value(one), Value(other));
+    EXPECT_EQ(oneLine(one->allKeys()) + oneLine(other->allValues()), "( a, b )( ( x ), 1 )");
+    EXPECT_EQ(raised([&] {
+                  for (const auto& entry : *one)
+                      one->setValueForKey(nullptr, entry.key);
+              }),
+              "NSGenericException: a dictionary was changed while it was walked");
 }
 
 TEST(ValueTest, FormatsTakeTheirArgumentsInOrderOrByPosition) {
