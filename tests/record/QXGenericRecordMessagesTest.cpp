@@ -39,7 +39,7 @@ const bool described = [] {
 }();
 
 Ref<Record> place(const char* name) {
-    auto record = make<Record>();
+    auto record = Record::init();
     record->setValueForKey(name, "name");
     return record;
 }
@@ -176,6 +176,8 @@ TEST_F(QXGenericRecordForwardingTest, WhatEveryObjectAnswersIsNoKey) {
     EXPECT_EQ(record->perform("valueForKey:", "name"), Value("Rome"));
     EXPECT_EQ(record->perform("isEqual:", record), Value(true));
     record->perform("willChangeValueForKey:", "name");
+    record->perform("_cacheValueForKey:", "name");
+    EXPECT_EQ(record->changeCache()->get("name"), Value("Rome"));
     EXPECT_EQ(record->keys(), std::vector<String>{"name"});
 }
 
