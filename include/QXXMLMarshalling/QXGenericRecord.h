@@ -117,7 +117,15 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
-    const qx::Ref<qx::Dictionary>& filledContents();
+    friend class ObjectDoor;
+
+    const qx::Ref<qx::Dictionary>& filledContents() {
+        if (!_contents)
+            _contents = qx::make<qx::Dictionary>();
+        return _contents;
+    }
+    // False when the value has to be set the usual way; it is left alone then.
+    bool addQuietly(qx::Key key, qx::Value&& value);
 
     bool _notifyBindingsObservers = true;
     qx::ChangeTracking _tracking;

@@ -27,8 +27,14 @@ qx::Value ObjectDoor::send(qx::Object& object, const qx::Operation& operation,
     return operation.invoke(operation.selector, object.isa(), &object, {&argument, 1});
 }
 
-bool ObjectDoor::set(qx::Object& object, qx::Key key, const qx::Value& value,
-                     qx::Ref<qx::Error>* error) {
-    return set(object, key, value) == qx::SetOutcome::set ||
+const qx::Class* const ObjectDoor::records = &QXGenericRecord::classObject();
+
+bool ObjectDoor::set(qx::Object& object, qx::Key key, qx::Value value, qx::Ref<qx::Error>* error) {
+    QXGenericRecord* record = plainRecord(object);
+    const bool isContent =
+        record != nullptr && (!key.namesProperty() || record->isa().property(key) == nullptr);
+    if (isContent && record->addQuietly(key, std::move(value)))
+        return true;
+    return object.trySetValueForKey(value, key) == qx::SetOutcome::set ||
            qx::fail(error, qx::errors::unableToSetValue, value, key.string(), object.isa().name());
 }

@@ -15,6 +15,7 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
 #include "marshaller/ElementSource.h"
+#include "marshaller/NameCounts.h"
 #include "marshaller/ObjectDoor.h"
 #include "resolved/MappingPlan.h"
 
@@ -24,8 +25,8 @@ public:
 
     // What the fields of one element consumed.
     struct Bound {
-        qx::CountedSet& fields;
-        qx::CountedSet& attributes;
+        NameCounts& fields;
+        NameCounts& attributes;
     };
     // The object that is being bound, and where from.
     struct Target {
@@ -53,8 +54,8 @@ public:
 
     bool bindAsAttribute(const FieldPlan& field, const Target& target, ErrorSlot error);
     bool bindAsText(const FieldPlan& field, const Target& target, ErrorSlot error);
-    static bool takeValue(qx::Object& object, const FieldPlan& field, qx::Key key,
-                          const qx::Value& value, ErrorSlot error);
+    static bool takeValue(qx::Object& object, const FieldPlan& field, qx::Key key, qx::Value value,
+                          ErrorSlot error);
 
     bool bindAsElement(const FieldPlan& field, const Target& target, ErrorSlot error);
     bool bindCollection(const FieldPlan& field, const Target& target, ErrorSlot error);
@@ -101,7 +102,8 @@ private:
     const Frame* _frame = nullptr;
     // How often elements were bound, of those that may be bound several times.
     std::unordered_map<const qx::XMLElement*, std::size_t> _builds;
-    // Sets of consumed names that no object uses at the moment.
-    std::vector<qx::Ref<qx::CountedSet>> _spareSets;
-    class SpareSet;
+    // Counts of consumed names; the first few are lent to the objects that are being bound.
+    std::vector<std::unique_ptr<NameCounts>> _counts;
+    std::size_t _countsLent = 0;
+    class SpareCounts;
 };

@@ -52,18 +52,17 @@ Value Unmarshalling::flattenedValue(const FieldPlan& field, const Target& target
 bool Unmarshalling::bindAsElement(const FieldPlan& field, const Target& target, ErrorSlot error) {
     Value value;
     Ref<Error> problem;
-    String name;
+    const BindingPlan* binding = nullptr;
     if (field.isContainer) {
         XMLElement* child = nullptr;
-        const BindingPlan* binding = nullptr;
         if (!findElement(field, target, child, binding, error))
             return false;
-        if (binding != nullptr)
-            name = binding->name;
         if (child != nullptr) {
-            const Ref<XMLElement> kept(child);
-            if (target.isFlattened)
+            Ref<XMLElement> taken;
+            if (target.isFlattened) {
+                taken = Ref<XMLElement>(child);
                 target.source.take(*child);
+            }
             value = elementValue(field, target, *child, binding->classOfName, &problem);
         }
     } else {
@@ -72,12 +71,13 @@ bool Unmarshalling::bindAsElement(const FieldPlan& field, const Target& target, 
     if (!value.isNull()) {
         if (qx::Object* object = value.object(); object && !adopt(*object, target.object, error))
             return false;
-        return takeValue(target.object, field, field.key, value, error);
+        return takeValue(target.object, field, field.key, std::move(value), error);
     }
     if (error == nullptr || (!problem && !field.isRequired))
         return true;
     if (!problem)
-        return qx::fail(error, qx::errors::requiredElementMissing, name, &target.source.element());
+        return qx::fail(error, qx::errors::requiredElementMissing,
+                        binding != nullptr ? binding->name : String(), &target.source.element());
     *error = std::move(problem);
     return false;
 }

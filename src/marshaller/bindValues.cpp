@@ -12,18 +12,18 @@ using qx::Value;
 // that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
 bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target, ErrorSlot error) {
     const qx::XMLNode* attribute = nullptr;
-    String name;
+    const BindingPlan* tried = nullptr;
     for (const BindingPlan& binding : field.bindings) {
-        name = binding.name;
+        tried = &binding;
         const qx::XMLElement* holder = &target.source.element();
         if (!binding.location.isEmpty()) {
             const auto found = target.source.find(binding.location);
             if (found.several)
-                return qx::fail(error, qx::errors::tooManyElementsForField, name,
+                return qx::fail(error, qx::errors::tooManyElementsForField, binding.name,
                                 &target.source.element());
             holder = found.first;
         }
-        attribute = holder != nullptr ? holder->attributeForName(name) : nullptr;
+        attribute = holder != nullptr ? holder->attributeForName(binding.name) : nullptr;
         if (attribute != nullptr)
             break;
     }
@@ -33,8 +33,8 @@ bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target
         return takeValue(target.object, field, field.key, attribute->stringValue(), error);
     }
     if (field.isRequired)
-        return qx::fail(error, qx::errors::requiredAttributeMissing, name,
-                        &target.source.element());
+        return qx::fail(error, qx::errors::requiredAttributeMissing,
+                        tried != nullptr ? tried->name : String(), &target.source.element());
     return false;
 }
 
@@ -73,10 +73,10 @@ Value booleanOf(const String& text) {
 
 } // namespace
 
-bool Unmarshalling::takeValue(qx::Object& object, const FieldPlan& field, qx::Key key,
-                              const Value& value, ErrorSlot error) {
+bool Unmarshalling::takeValue(qx::Object& object, const FieldPlan& field, qx::Key key, Value value,
+                              ErrorSlot error) {
     if (!value.isString() || !field.hasSimpleType())
-        return ObjectDoor::set(object, key, value, error);
+        return ObjectDoor::set(object, key, std::move(value), error);
     const String text = value.string();
     if (field.valueType == ValueType::boolean)
         return ObjectDoor::set(object, key, booleanOf(text), error);

@@ -37,15 +37,31 @@ private:
     const FieldPlan& _plan;
 };
 
-// The element that a step of its own binds from.
-struct Source {
-    Source(XMLElement& element, const FieldPlan& field)
-        : source(element, nullptr, field.bindings.size()) {}
-    Unmarshalling::Target target(Object& object, CountedSet& fields, CountedSet& attributes,
-                                 bool isFlattened) {
-        return {object, source, {fields, attributes}, isFlattened};
+// What a step of its own binds from, and what it counts as consumed on top of the caller's sets.
+class Step {
+public:
+    Step(QXXMLMarshaller& marshaller, XMLElement& element, std::size_t lookups, CountedSet& fields,
+         CountedSet& attributes)
+        : _unmarshalling(marshaller, Unmarshalling::Use::steps), _source(element, nullptr, lookups),
+          _fieldSet(fields), _attributeSet(attributes), _fields(fields), _attributes(attributes) {}
+
+    // Calls bind(Unmarshalling&, const Unmarshalling::Target&).
+    template <class Bind>
+    bool run(Object& object, bool isFlattened, Bind bind) {
+        const Unmarshalling::Target target{object, _source, {_fields, _attributes}, isFlattened};
+        const bool bound = bind(_unmarshalling, target);
+        _fields.addTo(_fieldSet);
+        _attributes.addTo(_attributeSet);
+        return bound;
     }
-    ElementSource source;
+
+private:
+    Unmarshalling _unmarshalling;
+    ElementSource _source;
+    CountedSet& _fieldSet;
+    CountedSet& _attributeSet;
+    NameCounts _fields;
+    NameCounts _attributes;
 };
 
 } // namespace
@@ -112,18 +128,20 @@ bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Ob
                                             CountedSet& boundAttributes, bool isFlattened,
                                             Ref<Error>* error) {
     const PlanOfClass plan(this->plan(), mapping);
-    ElementSource source(element, nullptr, (*plan).bindingCount);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindFields(*plan, {object, source, {boundFields, boundAttributes}, isFlattened}, error);
+    return Step(*this, element, (*plan).bindingCount, boundFields, boundAttributes)
+        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+            return step.bindFields(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::bindField(const QXXMLFieldMapping& field, Object& object, std::size_t,
                                 XMLElement& element, CountedSet& boundFields,
                                 CountedSet& boundAttributes, bool isFlattened, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
-    Source source(element, *plan);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindField(*plan, source.target(object, boundFields, boundAttributes, isFlattened), error);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+            return step.bindField(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Object& object,
@@ -131,18 +149,20 @@ bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Objec
                                            CountedSet& boundFields, CountedSet& boundAttributes,
                                            Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
-    Source source(element, *plan);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindAsAttribute(*plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return step.bindAsAttribute(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::bindFieldAsText(const QXXMLFieldMapping& field, Object& object, std::size_t,
                                       XMLElement& element, CountedSet& boundFields,
                                       CountedSet& boundAttributes, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
-    Source source(element, *plan);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindAsText(*plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return step.bindAsText(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object& object,
@@ -150,38 +170,40 @@ bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object&
                                          CountedSet& boundAttributes, bool isFlattened,
                                          Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
-    Source source(element, *plan);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindAsElement(*plan, source.target(object, boundFields, boundAttributes, isFlattened),
-                       error);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+            return step.bindAsElement(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::bindCollectionField(const QXXMLFieldMapping& field, Object& object,
                                           XMLElement& element, CountedSet& boundFields,
                                           CountedSet& boundAttributes, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
-    Source source(element, *plan);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindCollection(*plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return step.bindCollection(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::bindArrayFieldByType(const QXXMLFieldMapping& field, Object& object,
                                            XMLElement& element, CountedSet& boundFields,
                                            CountedSet& boundAttributes, Ref<Error>* error) {
     const PlanOfField plan(this->plan(), field);
-    Source source(element, *plan);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .bindArrayByType(*plan, source.target(object, boundFields, boundAttributes, false), error);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return step.bindArrayByType(*plan, target, error);
+        });
 }
 
 bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
                                           const CountedSet& boundAttributes, XMLElement& element,
                                           Object& object, Ref<Error>* error) {
-    const auto fields = boundFields.mutableCopy();
-    const auto attributes = boundAttributes.mutableCopy();
+    NameCounts fields(boundFields);
+    NameCounts attributes(boundAttributes);
     ElementSource source(element, nullptr, 0);
     return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .validate({object, source, {*fields, *attributes}, false}, error);
+        .validate({object, source, {fields, attributes}, false}, error);
 }
 
 bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,

@@ -1,6 +1,5 @@
 #include "marshaller/Unmarshalling.h"
 
-#include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/platform/Array.h>
 
 #include "platform/system/Errors.h"
@@ -24,32 +23,26 @@ Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, Use use)
       _saveUnknownXML(marshaller._saveUnknownXML), _use(use), _classes(_plan.classCount() + 1),
       _classKnown(_plan.classCount() + 1) {}
 
-// Lends a set for the time of one object's binding.
-class Unmarshalling::SpareSet {
+// Lends counts for the time of one object's binding.
+class Unmarshalling::SpareCounts {
 public:
-    explicit SpareSet(std::vector<Ref<qx::CountedSet>>& spare) : _spare(spare) {
-        if (_spare.empty()) {
-            _set = qx::make<qx::CountedSet>();
-        } else {
-            _set = std::move(_spare.back());
-            _spare.pop_back();
-        }
+    explicit SpareCounts(Unmarshalling& unmarshalling) : _lent(unmarshalling._countsLent) {
+        auto& all = unmarshalling._counts;
+        if (_lent == all.size())
+            all.push_back(std::make_unique<NameCounts>());
+        _counts = all[_lent++].get();
     }
-    ~SpareSet() {
-        _set->removeAll();
-        try {
-            _spare.push_back(std::move(_set));
-        } catch (const std::bad_alloc&) {
-            // The next object makes a set of its own.
-        }
+    ~SpareCounts() {
+        _counts->clear();
+        --_lent;
     }
-    SpareSet(const SpareSet&) = delete;
-    SpareSet& operator=(const SpareSet&) = delete;
-    qx::CountedSet& operator*() const noexcept { return *_set; }
+    SpareCounts(const SpareCounts&) = delete;
+    SpareCounts& operator=(const SpareCounts&) = delete;
+    NameCounts& operator*() const noexcept { return *_counts; }
 
 private:
-    std::vector<Ref<qx::CountedSet>>& _spare;
-    Ref<qx::CountedSet> _set;
+    std::size_t& _lent;
+    NameCounts* _counts;
 };
 
 Ref<qx::Object> Unmarshalling::unmarshallNode(qx::XMLNode* node, ElementSource::CopyScope* scope,
@@ -98,10 +91,10 @@ Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& sourc
     // Whoever set it: a caller's earlier error stops the binding, too.
     if (error != nullptr && *error)
         return nullptr;
-    const ObjectHooks& hooks = _door.hooksOf(*object);
-    const qx::Operation* notify = hooks.setNotifyBindingsObservers;
-    if (hooks.rootObject != nullptr && hooks.setUndoManager != nullptr)
-        ObjectDoor::send(*object, *hooks.setUndoManager, _marshaller.undoManager());
+    QXGenericRecord* const record = ObjectDoor::plainRecord(*object);
+    const ObjectHooks* const hooks = record == nullptr ? &_door.hooksOf(*object) : nullptr;
+    if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
+        ObjectDoor::send(*object, *hooks->setUndoManager, _marshaller.undoManager());
 
     const Frame frame{&plan, &source.element(), _frame, depth};
     struct Restore {
@@ -110,12 +103,14 @@ Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& sourc
         ~Restore() { current = outer; }
     } const restore{_frame, _frame};
     _frame = &frame;
-    const SpareSet fields(_spareSets);
-    const SpareSet attributes(_spareSets);
+    const SpareCounts fields(*this);
+    const SpareCounts attributes(*this);
     if (!bindFields(plan, {*object, source, {*fields, *attributes}, isFlattened}, error))
         return nullptr;
-    if (notify != nullptr)
-        ObjectDoor::send(*object, *notify, true);
+    if (record != nullptr)
+        record->setNotifyBindingsObservers(true);
+    else if (hooks->setNotifyBindingsObservers != nullptr)
+        ObjectDoor::send(*object, *hooks->setNotifyBindingsObservers, true);
     return object;
 }
 
@@ -133,6 +128,11 @@ Ref<qx::Object> Unmarshalling::allocate(const ClassPlan& plan) {
     }
     if (!object)
         object = QXGenericRecord::classObject().create();
+    if (QXGenericRecord* record = ObjectDoor::plainRecord(*object)) {
+        record->setClassNameForMarshalling(plan.className.string());
+        record->setNotifyBindingsObservers(false);
+        return object;
+    }
     const ObjectHooks& hooks = _door.hooksOf(*object);
     if (hooks.setClassNameForMarshalling != nullptr)
         ObjectDoor::send(*object, *hooks.setClassNameForMarshalling, plan.className.string());
@@ -213,6 +213,8 @@ bool Unmarshalling::bindField(const FieldPlan& field, const Target& target, Erro
 
 // The item knows the object that holds it before it is set on it.
 bool Unmarshalling::adopt(qx::Object& item, qx::Object& parent, ErrorSlot error) {
+    if (ObjectDoor::plainRecord(item) != nullptr)
+        return true;
     const qx::Operation* setParent = _door.hooksOf(item).setParent;
     if (setParent == nullptr)
         return true;

@@ -20,16 +20,12 @@ namespace {
 // counts; null where no name is left.
 class Unknown {
 public:
-    explicit Unknown(CountedSet& bound) : _bound(bound) {}
+    explicit Unknown(NameCounts& bound) : _bound(bound) {}
 
     void see(const XMLNode& node) {
         const String& name = node.name();
-        if (name.isNull())
+        if (name.isNull() || _bound.take(name))
             return;
-        if (_bound.contains(name)) {
-            _bound.remove(name);
-            return;
-        }
         if (!_names)
             _names = qx::make<CountedSet>();
         _names->add(name);
@@ -37,7 +33,7 @@ public:
     const Ref<CountedSet>& names() const noexcept { return _names; }
 
 private:
-    CountedSet& _bound;
+    NameCounts& _bound;
     Ref<CountedSet> _names;
 };
 
@@ -48,9 +44,9 @@ bool Unmarshalling::validate(const Target& target, ErrorSlot error) {
         return true;
     if (_use == Use::document)
         return validateChildren(target, error) && validateAttributes(target, error);
-    const auto fields = target.bound.fields.mutableCopy();
-    const auto attributes = target.bound.attributes.mutableCopy();
-    const Target copied{target.object, target.source, {*fields, *attributes}, target.isFlattened};
+    NameCounts fields = target.bound.fields;
+    NameCounts attributes = target.bound.attributes;
+    const Target copied{target.object, target.source, {fields, attributes}, target.isFlattened};
     return validateChildren(copied, error) && validateAttributes(copied, error);
 }
 

@@ -109,19 +109,17 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
     return _contents ? _contents->get(key.string()) : Value();
 }
 
-const Ref<Dictionary>& QXGenericRecord::filledContents() {
-    if (!_contents)
-        _contents = qx::make<Dictionary>();
-    return _contents;
+// The many first values of a record that is read from a document: nobody is told, nothing is
+// remembered.
+bool QXGenericRecord::addQuietly(Key key, Value&& value) {
+    const bool isQuiet = _tracking.isIdle() && !hasCompany() && &isa() == &described;
+    return isQuiet && !value.isNull() && !key.view().starts_with('@') &&
+           filledContents()->add(key.string(), std::move(value));
 }
 
 void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
     filledContents();
-    // The many first values of a record that is read from a document: nobody is told, nothing is
-    // remembered.
-    const bool isQuiet = _tracking.isIdle() && !hasCompany() && &isa() == &described;
-    if (isQuiet && !value.isNull() && !key.view().starts_with('@') &&
-        _contents->add(key.string(), value))
+    if (addQuietly(key, Value(value)))
         return;
     willChangeValueForKey(key);
     // Whoever was told may have given the record other contents.

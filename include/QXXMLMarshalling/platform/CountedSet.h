@@ -18,6 +18,8 @@ public:
     void add(const String& name, std::size_t times = 1);
     // Lowers the name's count by one and forgets the name at zero; an absent name is ignored.
     void remove(const String& name);
+    // Lowers the name's count by one; false for an absent name.
+    bool take(const String& name);
     // Lowers the count by as much, not below zero.
     void remove(const String& name, std::size_t times);
     void removeAll() noexcept;
@@ -49,6 +51,7 @@ private:
     std::vector<Entry> _entries;
     std::vector<std::uint32_t> _index;
     std::size_t _count = 0;
+    bool _allInterned = true; // the names, removed ones too
 };
 
 } // namespace qx

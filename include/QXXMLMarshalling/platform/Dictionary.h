@@ -17,6 +17,9 @@ public:
     struct Entry {
         String key; // null: removed
         Value value;
+        Entry() noexcept = default;
+        Entry(String aKey, Value aValue) noexcept
+            : key(std::move(aKey)), value(std::move(aValue)) {}
     };
 
     Dictionary() = default;
@@ -64,8 +67,9 @@ public:
     const Value* find(const String& key) const noexcept;
     // A null key or a null value raises NSInvalidArgumentException.
     void set(const String& key, Value value);
-    // Adds the value unless the key is there; false when it is. Neither may be null.
-    bool add(const String& key, const Value& value);
+    // Adds the value unless the key is there; false when it is, and then the value is left alone.
+    // Neither may be null.
+    bool add(const String& key, Value&& value);
     // Nothing happens when the key is absent.
     void remove(const String& key);
     void removeAll();
@@ -96,7 +100,8 @@ protected:
 private:
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
-    void append(const String& key, Value value);
+    void append(const String& key, Value&& value);
+    void prepareForOne();
     void makeRoom();
     void changed() noexcept { ++_changes; }
 
@@ -104,6 +109,7 @@ private:
     std::vector<std::uint32_t> _index; // open addressing, position + 1; empty while scanned
     std::size_t _count = 0;
     std::size_t _changes = 0;
+    bool _allInterned = true; // the keys, removed ones too
 };
 
 } // namespace qx

@@ -54,7 +54,10 @@ public:
 
     // The object's class as described with Class::define; a class that nobody described gets a
     // description of its own with the properties and operations of the nearest described base.
-    const Class& isa() const;
+    const Class& isa() const {
+        const Class* known = _isa.load(std::memory_order_acquire);
+        return known != nullptr ? *known : findClass();
+    }
 
     // The class name and the address, as "<Name: 0x…>".
     virtual String description() const;
@@ -134,6 +137,7 @@ private:
     friend class Class;
     friend struct ObjectInternals;
 
+    const Class& findClass() const;
     void destroy() const noexcept;
     Extras& extras() const;
 

@@ -157,7 +157,16 @@ bool Class::isSubclassOf(const Class& other) const {
     return false;
 }
 
-Ref<Object> Class::create() const { return _create != nullptr ? _create() : Ref<Object>(); }
+// The new object need not look its class up by its type.
+Ref<Object> Class::create() const {
+    Ref<Object> object = _create != nullptr ? _create() : Ref<Object>();
+    if (object) {
+        const Object& created = *object;
+        if (typeid(created) == *_type)
+            created._isa.store(this, std::memory_order_release);
+    }
+    return object;
+}
 
 const Property* Class::property(Key key) const {
     if (!key.namesProperty())

@@ -15,7 +15,7 @@ CountedSet::CountedSet(std::initializer_list<std::string_view> names) {
 CountedSet::~CountedSet() = default;
 
 std::size_t CountedSet::positionOf(const String& name) const noexcept {
-    return nameindex::find(_index, _entries.size(), name,
+    return nameindex::find(_index, _entries.size(), name, _allInterned,
                            [this](std::size_t i) -> const String& { return _entries[i].name; });
 }
 
@@ -28,6 +28,7 @@ void CountedSet::add(const String& name, std::size_t times) {
             makeRoom();
         position = _entries.size();
         _entries.push_back({name, 0});
+        _allInterned = _allInterned && name.isInterned();
         if (!_index.empty())
             nameindex::add(_index, name, position);
     }
@@ -57,9 +58,19 @@ void CountedSet::remove(const String& name, std::size_t times) {
         --_count;
 }
 
+bool CountedSet::take(const String& name) {
+    const std::size_t position = positionOf(name);
+    if (position == nameindex::none || _entries[position].count == 0)
+        return false;
+    if (--_entries[position].count == 0)
+        --_count;
+    return true;
+}
+
 void CountedSet::removeAll() noexcept {
     _entries.clear();
     _index.clear();
+    _allInterned = true;
     _count = 0;
 }
 

@@ -25,10 +25,10 @@ void Dictionary::checkUnchanged(std::size_t changes) const {
         throw Exception(Exception::generic, "a dictionary was changed while it was walked");
 }
 
-std::size_t Dictionary::positionOf(const String& key) const noexcept {
+inline std::size_t Dictionary::positionOf(const String& key) const noexcept {
     if (key.isNull())
         return nameindex::none;
-    return nameindex::find(_index, _entries.size(), key,
+    return nameindex::find(_index, _entries.size(), key, _allInterned,
                            [this](std::size_t i) -> const String& { return _entries[i].key; });
 }
 
@@ -44,11 +44,15 @@ Value Dictionary::get(const String& key) const {
 
 namespace {
 
-void refuseNull(const String& key, const Value& value) {
+[[noreturn, gnu::cold]] void raiseNull(const String& key) {
+    throw Exception(
+        Exception::invalidArgument,
+        String::concat({"a dictionary takes no null for its key ", Value(key).description()}));
+}
+
+inline void refuseNull(const String& key, const Value& value) {
     if (key.isNull() || value.isNull())
-        throw Exception(
-            Exception::invalidArgument,
-            String::concat({"a dictionary takes no null for its key ", Value(key).description()}));
+        raiseNull(key);
 }
 
 } // namespace
@@ -64,24 +68,30 @@ void Dictionary::set(const String& key, Value value) {
     append(key, std::move(value));
 }
 
-bool Dictionary::add(const String& key, const Value& value) {
+bool Dictionary::add(const String& key, Value&& value) {
     refuseNull(key, value);
     if (positionOf(key) != nameindex::none)
         return false;
     changed();
-    append(key, value);
+    append(key, std::move(value));
     return true;
 }
 
-void Dictionary::append(const String& key, Value value) {
+inline void Dictionary::append(const String& key, Value&& value) {
+    if (_entries.size() == _entries.capacity() || _entries.size() >= nameindex::scanLimit)
+        prepareForOne();
+    _entries.emplace_back(key, std::move(value));
+    _allInterned = _allInterned && key.isInterned();
+    if (!_index.empty())
+        nameindex::add(_index, key, _entries.size() - 1);
+    ++_count;
+}
+
+void Dictionary::prepareForOne() {
     if (nameindex::isFull(_index, _entries.size()))
         makeRoom();
     if (_entries.capacity() == 0)
         _entries.reserve(usualSize);
-    _entries.push_back({key, std::move(value)});
-    if (!_index.empty())
-        nameindex::add(_index, key, _entries.size() - 1);
-    ++_count;
 }
 
 // Drops the places of removed keys and gives the index twice the room.
@@ -110,6 +120,7 @@ void Dictionary::removeAll() {
     changed();
     _count = 0;
     _index.clear();
+    _allInterned = true;
     const std::vector<Entry> removed = std::exchange(_entries, {});
 }
 

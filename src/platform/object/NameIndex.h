@@ -12,11 +12,18 @@ namespace qx::nameindex {
 constexpr std::size_t scanLimit = 8;
 constexpr std::size_t none = static_cast<std::size_t>(-1);
 
-// Position of the live entry with that name; `nameOf(position)` gives each one's name.
+// Position of the live entry with that name; `nameOf(position)` gives each one's name. Where all
+// names are interned, `allInterned`, an interned one is told from them without a look at its text.
 template <class NameOf>
 std::size_t find(const std::vector<std::uint32_t>& index, std::size_t entries, const String& name,
-                 NameOf nameOf) noexcept {
+                 bool allInterned, NameOf nameOf) noexcept {
     if (index.empty()) {
+        // Most names are the very ones that were put in.
+        for (std::size_t i = 0; i < entries; ++i)
+            if (nameOf(i).isSameAs(name))
+                return i;
+        if (allInterned && name.isInterned())
+            return none;
         for (std::size_t i = 0; i < entries; ++i)
             if (nameOf(i) == name)
                 return i;

@@ -108,13 +108,10 @@ Ref<WeakAnchor> Object::weakAnchor() const {
     return anchor;
 }
 
-const Class& Object::isa() const {
-    const Class* known = _isa.load(std::memory_order_acquire);
-    if (known == nullptr) {
-        known = &Class::ofObject(*this);
-        _isa.store(known, std::memory_order_release);
-    }
-    return *known;
+const Class& Object::findClass() const {
+    const Class& found = Class::ofObject(*this);
+    _isa.store(&found, std::memory_order_release);
+    return found;
 }
 
 namespace {

@@ -64,10 +64,6 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept 
     return c;
 }
 
-bool isWhite(std::string_view text) noexcept {
-    return std::all_of(text.begin(), text.end(), [](char c) { return isWhite(c); });
-}
-
 bool isXMLCharacter(char32_t c) noexcept {
     if (c < 0x20)
         return c == '\t' || c == '\n' || c == '\r';

@@ -16,7 +16,12 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
 
 // Space, tab, line feed and carriage return.
 constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
-bool isWhite(std::string_view text) noexcept;
+inline bool isWhite(std::string_view text) noexcept {
+    for (const char c : text)
+        if (!isWhite(c))
+            return false;
+    return true;
+}
 
 bool isXMLCharacter(char32_t c) noexcept;
 // UTF-8 whose every character XML allows in some place of a document.

@@ -93,10 +93,12 @@ void XMLTreeBuilder::addProcessingInstruction(const String& target, std::string_
 void XMLTreeBuilder::placeText() {
     OpenElement& open = _open.back();
     const std::string_view text = _lasting.empty() ? std::string_view(_joined) : _lasting;
-    const bool isLayout = _textIsLayout && text.find('\n') != std::string_view::npos;
+    const bool isLayout =
+        _textIsLayout && (text.front() == '\n' || text.find('\n') != std::string_view::npos);
     if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
-        _layouts.push_back(
-            {open.element->lastChild(), _lasting, _lasting.empty() ? String(text) : String()});
+        const std::string_view kept =
+            _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting;
+        _layouts.push_back({open.element->lastChild(), kept});
     } else {
         if (!isLayout && !open.hasText)
             restoreLayout(open);
@@ -111,7 +113,7 @@ void XMLTreeBuilder::restoreLayout(OpenElement& open) {
     open.hasText = true;
     for (std::size_t i = open.firstLayout; i < _layouts.size(); ++i) {
         const Layout& layout = _layouts[i];
-        appendText(layout.lasting.empty() ? layout.owned.view() : layout.lasting, true,
+        appendText(layout.text, true,
                    layout.after != nullptr ? layout.after->_next : open.element->_firstChild);
     }
     dropLayout(open);
@@ -124,8 +126,8 @@ void XMLTreeBuilder::appendText(std::string_view text, bool isLayout, XMLNode* b
 }
 
 void XMLTreeBuilder::dropLayout(const OpenElement& open) noexcept {
-    while (_layouts.size() > open.firstLayout)
-        _layouts.pop_back();
+    _layouts.erase(_layouts.begin() + static_cast<std::ptrdiff_t>(open.firstLayout),
+                   _layouts.end());
 }
 
 void XMLTreeBuilder::appendChild(XMLElement& parent, XMLNode* child, XMLNode* before) noexcept {

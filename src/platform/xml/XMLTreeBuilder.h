@@ -9,6 +9,7 @@
 #include "platform/xml/NodeBlocks.h"
 #include "platform/xml/SharedValues.h"
 
+#include <deque>
 #include <string>
 #include <vector>
 
@@ -43,9 +44,8 @@ private:
     };
     // A text of white space put aside until another text shows that it matters.
     struct Layout {
-        XMLNode* after;           // the node that it follows; null for the first
-        std::string_view lasting; // its text, or empty for
-        String owned;             // a text that would not last
+        XMLNode* after; // the node that it follows; null for the first
+        std::string_view text;
     };
 
     XMLNode* newNode(XMLNodeKind kind, String name, String value);
@@ -74,6 +74,7 @@ private:
     std::string _joined;
     bool _textIsLayout = false;
     std::vector<Layout> _layouts;
+    std::deque<std::string> _joinedLayouts; // texts of these that came in several pieces
     SharedValues _values;
 };
 

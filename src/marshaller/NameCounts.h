@@ -1,0 +1,57 @@
+#pragma once
+
+// How often the fields of one element consumed each name. Documents mostly hold their children in
+// the order of the fields: then taking the names in document order only compares each with the next
+// one that was added. The first name out of order has the rest counted.
+
+#include <QXXMLMarshalling/platform/CountedSet.h>
+
+class NameCounts {
+public:
+    NameCounts() = default;
+    explicit NameCounts(const qx::CountedSet& set) : _rest(set.mutableCopy()) {}
+    NameCounts(const NameCounts& other)
+        : _added(other._added), _next(other._next),
+          _rest(other._rest ? other._rest->mutableCopy() : nullptr) {}
+    NameCounts(NameCounts&& other) noexcept = default;
+    NameCounts& operator=(NameCounts other) noexcept {
+        _added.swap(other._added);
+        std::swap(_next, other._next);
+        std::swap(_rest, other._rest);
+        return *this;
+    }
+
+    // Not once the first was taken.
+    void add(const qx::String& name) { _added.push_back(name); }
+    // Lowers the name's count by one; false where it is none.
+    bool take(const qx::String& name) {
+        if (_next < _added.size() && _added[_next].isSameAs(name)) {
+            ++_next;
+            return true;
+        }
+        return countRest().take(name);
+    }
+    void clear() noexcept {
+        _added.clear();
+        _next = 0;
+        _rest.reset();
+    }
+    // Adds the counts to the set.
+    void addTo(qx::CountedSet& set) const {
+        for (const qx::String& name : _added)
+            set.add(name);
+    }
+
+private:
+    qx::CountedSet& countRest() {
+        if (!_rest)
+            _rest = qx::make<qx::CountedSet>();
+        for (; _next < _added.size(); ++_next)
+            _rest->add(_added[_next]);
+        return *_rest;
+    }
+
+    std::vector<qx::String> _added;
+    std::size_t _next = 0; // of those that were neither taken nor counted
+    qx::Ref<qx::CountedSet> _rest;
+};
