@@ -1,5 +1,5 @@
-// Runs the benchmarks, then tells reading and writing in units of the parser's own pass and how the
-// time for a megabyte changes with the size.
+// Runs the benchmarks, then tells parsing, reading and writing in units of the parser's own pass
+// and how the time for a megabyte, or an included document, changes with their number.
 
 #include <benchmark/benchmark.h>
 
@@ -11,43 +11,46 @@ namespace {
 
 class Reporter : public benchmark::ConsoleReporter {
 public:
-    Reporter() : ConsoleReporter(OO_None) {}
+    Reporter() : ConsoleReporter(OO_Tabular) {}
 
     void ReportRuns(const std::vector<Run>& runs) override {
         ConsoleReporter::ReportRuns(runs);
-        for (const Run& run : runs)
-            if (!run.error_occurred && run.run_type == Run::RT_Iteration)
-                _milliseconds[run.benchmark_name()] = run.GetAdjustedCPUTime();
+        for (const Run& run : runs) {
+            if (run.error_occurred || run.run_type != Run::RT_Iteration)
+                continue;
+            // "read/60/manual_time" is kept as "read/60".
+            const std::string name = run.benchmark_name();
+            const std::string shortName = name.substr(0, name.find('/', name.find('/') + 1));
+            _times[shortName] = run.GetAdjustedRealTime();
+            const auto units = run.counters.find("units");
+            if (units != run.counters.end())
+                _units[shortName] = units->second;
+        }
     }
 
     void tellRatios() const {
-        for (const char* work : {"parse", "read", "write"}) {
-            for (const char* size : {"1", "10", "60"})
-                tell(work, size, std::string("unit/") + size, "units");
-            tellGrowth(work);
-        }
+        for (const auto& [name, units] : _units)
+            std::printf("%-9s %5.2f units\n", name.c_str(), units);
+        for (const char* work : {"parse", "read", "write"})
+            tellGrowth(work, "megabyte", 1, 60);
+        tellGrowth("include", "document", 100, 1000);
     }
 
 private:
     double time(const std::string& name) const {
-        const auto found = _milliseconds.find(name);
-        return found != _milliseconds.end() ? found->second : 0;
+        const auto found = _times.find(name);
+        return found != _times.end() ? found->second : 0;
     }
-    void tell(const std::string& work, const std::string& size, const std::string& unit,
-              const char* what) const {
-        const double taken = time(work + "/" + size);
-        if (taken > 0 && time(unit) > 0)
-            std::printf("%-6s %3s MB: %.2f %s\n", work.c_str(), size.c_str(), taken / time(unit),
-                        what);
-    }
-    void tellGrowth(const std::string& work) const {
-        const double small = time(work + "/1");
-        if (small > 0)
-            std::printf("%-6s a megabyte at 60 MB takes %.2f times one at 1 MB\n", work.c_str(),
-                        time(work + "/60") / 60 / small);
+    void tellGrowth(const std::string& work, const char* what, int few, int many) const {
+        const double small = time(work + "/" + std::to_string(few)) / few;
+        const double large = time(work + "/" + std::to_string(many)) / many;
+        if (small > 0 && large > 0)
+            std::printf("%s: a %s among %d takes %.2f times one among %d\n", work.c_str(), what,
+                        many, large / small, few);
     }
 
-    std::map<std::string, double> _milliseconds;
+    std::map<std::string, double> _times;
+    std::map<std::string, double> _units;
 };
 
 } // namespace

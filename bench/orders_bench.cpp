@@ -1,5 +1,6 @@
-// Reading and writing documents of nested orders, beside a pass of the parser with empty callbacks
-// over the same bytes: the unit in which the others are told, since it moves with the machine.
+// Reading and writing documents of nested orders. Beside each pass runs one of the parser with
+// empty callbacks over the same bytes: the unit in which the others are told, since it moves with
+// the machine.
 
 #include "Orders.h"
 #include "Units.h"
@@ -27,38 +28,42 @@ qx::Ref<QXXMLMarshaller> marshaller() {
     return QXXMLMarshaller::initWithMappingXML(mapping.get());
 }
 
-void unit(benchmark::State& state) {
-    const std::string& xml = document(state.range(0));
-    for (auto _ : state)
-        if (!bench::emptyPass(xml))
-            state.SkipWithError("the parser failed");
+// Runs work() beside the unit; it returns whether it did what it should.
+template <class Work>
+void besideUnit(benchmark::State& state, const std::string& xml, Work work) {
+    bench::Units units;
+    for (auto _ : state) {
+        if (!units.measure(xml, work))
+            state.SkipWithError("nothing was parsed, read or written");
+        state.SetIterationTime(units.latestSeconds());
+    }
+    state.counters["units"] = units.median();
 }
 
 void parse(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
-    for (auto _ : state)
-        benchmark::DoNotOptimize(qx::XMLDocument::initWithData(xml));
+    besideUnit(state, xml, [&] { return qx::XMLDocument::initWithData(xml).get() != nullptr; });
 }
 
 void read(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     const auto reader = marshaller();
-    for (auto _ : state)
-        if (!reader->readString(xml))
-            state.SkipWithError("nothing was read");
+    besideUnit(state, xml, [&] { return reader->readString(xml).get() != nullptr; });
 }
 
 void write(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
     const auto writer = marshaller();
-    const auto object = writer->readString(document(state.range(0)));
-    for (auto _ : state)
-        if (writer->writeString(object).isNull())
-            state.SkipWithError("nothing was written");
+    const auto object = writer->readString(xml);
+    besideUnit(state, xml, [&] { return !writer->writeString(object).isNull(); });
 }
 
-BENCHMARK(unit)->Arg(1)->Arg(10)->Arg(60)->Unit(benchmark::kMillisecond);
-BENCHMARK(parse)->Arg(1)->Arg(10)->Arg(60)->Unit(benchmark::kMillisecond);
-BENCHMARK(read)->Arg(1)->Arg(10)->Arg(60)->Unit(benchmark::kMillisecond);
-BENCHMARK(write)->Arg(1)->Arg(10)->Arg(60)->Unit(benchmark::kMillisecond);
+void sizes(benchmark::internal::Benchmark* benchmark) {
+    benchmark->Arg(1)->Arg(10)->Arg(60)->Unit(benchmark::kMillisecond)->UseManualTime();
+}
+
+BENCHMARK(parse)->Apply(sizes);
+BENCHMARK(read)->Apply(sizes);
+BENCHMARK(write)->Apply(sizes);
 
 } // namespace

@@ -33,6 +33,7 @@
 #include <QXXMLMarshalling/platform/MethodSignature.h>
 #include <QXXMLMarshalling/platform/Null.h>
 #include <QXXMLMarshalling/platform/Object.h>
+#include <QXXMLMarshalling/platform/ObjectMemory.h>
 #include <QXXMLMarshalling/platform/Observation.h>
 #include <QXXMLMarshalling/platform/ProcessInfo.h>
 #include <QXXMLMarshalling/platform/Ref.h>

@@ -69,6 +69,7 @@ Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* 
 // The group closes whatever happens: every call is one step to undo.
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
     const qx::UndoGroup group(undoManager());
+    const qx::ObjectMemory::Bulk bulk;
     return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
 }
 

@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include <regex>
+#include <thread>
 
 namespace {
 
@@ -197,6 +198,26 @@ TEST(QXGenericRecordTest, ASubclassAnnouncesItsOwnKeysItself) {
         book->setValueForKey("t", "title");
         EXPECT_EQ(told, 10);
     }
+}
+
+TEST(QXGenericRecordTest, RecordsOutliveTheThreadThatMadeThemTogetherAndEndElsewhere) {
+    struct alignas(64) Wide : Record {
+        char bytes[64] = {};
+    };
+    std::vector<Ref<Record>> kept;
+    std::thread([&] {
+        const ObjectMemory::Bulk bulk;
+        for (int i = 0; i < 2000; ++i) {
+            auto record = i % 10 == 0 ? Ref<Record>(make<Wide>()) : make<Record>();
+            record->setValueForKey(i, "number");
+            const auto address = reinterpret_cast<std::uintptr_t>(record.get());
+            EXPECT_EQ(address % (i % 10 == 0 ? 64 : 16), 0U);
+            if (i % 3 == 0)
+                kept.push_back(std::move(record));
+        }
+    }).join();
+    kept.front()->setValueForKey(make<Array>(std::vector<Value>(1000, "x")), "list");
+    EXPECT_EQ(kept.back()->get<int>("number"), 1998);
 }
 
 } // namespace

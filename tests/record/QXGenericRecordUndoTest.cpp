@@ -158,6 +158,9 @@ TEST_F(QXGenericRecordUndoTest, ItemsOfACollectionAreRememberedButOnlyANewCollec
 }
 
 TEST_F(QXGenericRecordUndoTest, FillingAFreshRecordMakesNothingButItsContents) {
+#ifdef NDEBUG
+    GTEST_SKIP() << "objects are counted in debug builds only";
+#endif
     const auto fresh = make<Record>();
     const auto before = Object::liveCount();
     for (const char* key : {"name", "size", "shelf"})

@@ -3,6 +3,7 @@
 // An ordered, mutable list of values, shared by reference. Changing it while it is walked raises
 // NSGenericException at the walk's next step; an index out of bounds raises NSRangeException.
 
+#include <QXXMLMarshalling/platform/ObjectMemory.h>
 #include <QXXMLMarshalling/platform/Value.h>
 
 #include <initializer_list>
@@ -14,8 +15,10 @@ class QX_API Array final : public Object {
 public:
     Array() = default;
     Array(std::initializer_list<Value> items);
-    explicit Array(std::vector<Value> items) noexcept;
+    explicit Array(std::vector<Value> items);
     ~Array() override;
+    static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
+    static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
 
     // Walks the items and notices changes.
     class Iterator {
@@ -74,7 +77,7 @@ private:
     void checkUnchanged(std::size_t changes) const;
     void changed() noexcept { ++_changes; }
 
-    std::vector<Value> _items;
+    std::vector<Value, ObjectAllocator<Value>> _items;
     std::size_t _changes = 0;
 };
 

@@ -4,6 +4,7 @@
 // the same on every run. Changing it while it is walked raises NSGenericException at the walk's
 // next step. Small dictionaries are scanned, larger ones carry an index.
 
+#include <QXXMLMarshalling/platform/ObjectMemory.h>
 #include <QXXMLMarshalling/platform/Value.h>
 
 #include <vector>
@@ -24,6 +25,8 @@ public:
 
     Dictionary() = default;
     ~Dictionary() override;
+    static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
+    static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
 
     class Iterator {
     public:
@@ -105,7 +108,7 @@ private:
     void makeRoom();
     void changed() noexcept { ++_changes; }
 
-    std::vector<Entry> _entries;
+    std::vector<Entry, ObjectAllocator<Entry>> _entries;
     std::vector<std::uint32_t> _index; // open addressing, position + 1; empty while scanned
     std::size_t _count = 0;
     std::size_t _changes = 0;

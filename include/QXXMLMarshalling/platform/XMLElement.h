@@ -16,8 +16,12 @@ public:
     static Ref<XMLElement> initWithName(const String& name, const String& stringValue);
     ~XMLElement() override;
 
-    XMLNode* firstChild() const noexcept override { return _firstChild; }
-    XMLNode* lastChild() const noexcept { return lastOf(_firstChild); }
+    XMLNode* firstChild() const noexcept override {
+        if (holdsText())
+            spellTextOut();
+        return _firstChild;
+    }
+    XMLNode* lastChild() const noexcept { return lastOf(firstChild()); }
     std::size_t childCount() const noexcept { return _childCount; }
 
     // The direct child elements of that qualified name, in document order.
@@ -53,6 +57,16 @@ public:
 private:
     friend class XMLNode;
     friend class XMLTreeBuilder;
+    friend class XMLSerializer;
+
+    // Most elements with text have one text and nothing else. The element then holds it as its
+    // value, and makes the node when somebody asks for its children.
+    bool holdsText() const noexcept { return !_value.isNull(); }
+    void holdText(String text) noexcept {
+        _value = std::move(text);
+        _childCount = 1;
+    }
+    void spellTextOut() const noexcept;
 
     explicit XMLElement(String name) noexcept
         : XMLNode(XMLNodeKind::element, std::move(name), String()) {}

@@ -7,12 +7,14 @@
 #include "platform/object/Printing.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace qx {
 
 Array::Array(std::initializer_list<Value> items) : _items(items) {}
 
-Array::Array(std::vector<Value> items) noexcept : _items(std::move(items)) {}
+Array::Array(std::vector<Value> items)
+    : _items(std::make_move_iterator(items.begin()), std::make_move_iterator(items.end())) {}
 
 Array::~Array() = default;
 
@@ -72,11 +74,15 @@ void Array::remove(std::size_t index) {
 }
 
 void Array::removeAll() {
-    const std::vector<Value> removed = std::exchange(_items, {});
+    const auto removed = std::exchange(_items, {});
     changed();
 }
 
-Ref<Array> Array::mutableCopy() const { return make<Array>(_items); }
+Ref<Array> Array::mutableCopy() const {
+    auto copy = make<Array>();
+    copy->_items = _items;
+    return copy;
+}
 
 String Array::description() const { return descriptionWithLocale(nullptr, 0); }
 

@@ -121,7 +121,7 @@ void Dictionary::removeAll() {
     _count = 0;
     _index.clear();
     _allInterned = true;
-    const std::vector<Entry> removed = std::exchange(_entries, {});
+    const auto removed = std::exchange(_entries, {});
 }
 
 Ref<Array> Dictionary::allKeys() const {

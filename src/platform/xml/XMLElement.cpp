@@ -35,7 +35,8 @@ void requireChild(const XMLNode* child, const XMLElement& element) {
     }
     if (child == &element)
         refuse("an element cannot be its own child", element);
-    if (child->firstChild() == nullptr)
+    const XMLElement* parent = child->asElement();
+    if (parent == nullptr || parent->childCount() == 0)
         return;
     for (const XMLNode* above = element.parent(); above != nullptr; above = above->parent())
         if (above == child)
@@ -82,6 +83,13 @@ std::vector<XMLElement*> XMLElement::elementsForName(const String& name) const {
     return found;
 }
 
+// Where there is no memory for a node, there is none to go on.
+void XMLElement::spellTextOut() const noexcept {
+    auto& self = const_cast<XMLElement&>(*this);
+    auto* text = new XMLNode(XMLNodeKind::text, String(), std::exchange(self._value, String()));
+    XMLSiblings::append(self, self._firstChild, text);
+}
+
 void XMLElement::addChild(Ref<XMLNode> child) { insertChild(std::move(child), nullptr); }
 
 void XMLElement::insertChild(Ref<XMLNode> child, XMLNode* before) {
@@ -89,6 +97,7 @@ void XMLElement::insertChild(Ref<XMLNode> child, XMLNode* before) {
     if (before != nullptr && (before->_parent != this || before->_kind == XMLNodeKind::attribute ||
                               before->_kind == XMLNodeKind::namespaceDeclaration))
         refuse("a child cannot be inserted before a node that is no child", *this);
+    firstChild(); // a text that is held stands in the list from now on
     XMLSiblings::insert(*this, _firstChild, child.detach(), before);
     ++_childCount;
 }
@@ -150,6 +159,8 @@ void XMLElement::unlink(XMLNode& node) noexcept {
 
 // The text of an element with one text, as most have, is shared with the caller, not copied.
 String XMLElement::stringValue() const {
+    if (holdsText())
+        return _value;
     const XMLNode* only = nullptr;
     std::string joined;
     for (const XMLNode* node = _firstChild; node != nullptr; node = following(node, this)) {
@@ -168,11 +179,11 @@ String XMLElement::stringValue() const {
 }
 
 void XMLElement::setStringValue(const String& value) {
-    Ref<XMLNode> text = value.isEmpty() ? Ref<XMLNode>() : initTextWithStringValue(value);
     XMLSiblings::releaseAll(_firstChild);
+    _value = String();
     _childCount = 0;
-    if (text)
-        addChild(std::move(text));
+    if (!value.isEmpty())
+        holdText(value);
 }
 
 // Walks both trees in step, so that depth costs no stack.
@@ -181,6 +192,8 @@ Ref<XMLNode> XMLElement::copy() const {
         Ref<XMLElement> element = initWithName(from._name);
         element->_line = from._line;
         element->_column = from._column;
+        if (from.holdsText())
+            element->holdText(from._value);
         for (const XMLNode* node = from._firstAttribute; node != nullptr; node = node->_next)
             XMLSiblings::append(*element, element->_firstAttribute, node->copy().detach());
         for (const XMLNode* node = from._firstNamespace; node != nullptr; node = node->_next)
@@ -188,11 +201,15 @@ Ref<XMLNode> XMLElement::copy() const {
         return element;
     };
     Ref<XMLElement> top = alone(*this);
+    const auto childOf = [](const XMLNode* node) -> const XMLNode* {
+        const XMLElement* element = node->asElement();
+        return element != nullptr ? element->_firstChild : nullptr;
+    };
     XMLElement* target = top.get();
     const XMLNode* node = this;
     while (true) {
-        if (node->firstChild() != nullptr) {
-            node = node->firstChild();
+        if (childOf(node) != nullptr) {
+            node = childOf(node);
         } else {
             while (node != this && node->_next == nullptr) {
                 node = node->_parent;
@@ -210,7 +227,7 @@ Ref<XMLNode> XMLElement::copy() const {
         // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): likewise
         XMLSiblings::append(*target, target->_firstChild, copied.detach());
         ++target->_childCount;
-        if (node->firstChild() != nullptr)
+        if (childOf(node) != nullptr)
             target = static_cast<XMLElement*>(child);
     }
 }

@@ -3,7 +3,7 @@
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
-#include "platform/xml/NodeBlocks.h"
+#include "platform/object/MemoryBlocks.h"
 #include "platform/xml/XMLSerializer.h"
 
 namespace qx {
@@ -22,9 +22,9 @@ String written(const XMLNode& node, XMLOptions options, XMLChecks checks) {
 
 XMLNode::~XMLNode() = default;
 
-void* XMLNode::operator new(std::size_t size) { return NodeBlocks::ofThread().allocate(size); }
+void* XMLNode::operator new(std::size_t size) { return MemoryBlocks::ofNodes().allocate(size); }
 
-void XMLNode::operator delete(void* node) noexcept { NodeBlocks::release(node); }
+void XMLNode::operator delete(void* node) noexcept { MemoryBlocks::release(node); }
 
 Ref<XMLNode> XMLNode::initTextWithStringValue(const String& text) {
     return Ref<XMLNode>::adopt(new XMLNode(XMLNodeKind::text, String(), present(text)));

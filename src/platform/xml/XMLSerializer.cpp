@@ -99,7 +99,12 @@ void XMLSerializer::writeTree(const XMLNode& top) {
     const XMLNode* node = &top;
     while (true) {
         const XMLElement* element = node->asElement();
-        if (element != nullptr) {
+        if (element != nullptr && element->holdsText()) {
+            startTag(*element);
+            const String text = element->_value;
+            writeEscaped(text, Where::text, isWhite(text), *element);
+            endTag(*element);
+        } else if (element != nullptr) {
             startElement(*element);
             if (const XMLNode* child = element->firstChild()) {
                 node = child;
@@ -121,7 +126,7 @@ void XMLSerializer::writeTree(const XMLNode& top) {
     }
 }
 
-void XMLSerializer::startElement(const XMLElement& element) {
+void XMLSerializer::startTag(const XMLElement& element) {
     _output += '<';
     writeName(element.name(), element);
     for (const XMLNode& declaration : element.namespaces()) {
@@ -132,8 +137,12 @@ void XMLSerializer::startElement(const XMLElement& element) {
         _output += ' ';
         writeAttribute(attribute);
     }
-    if (element.firstChild() != nullptr || !has(XMLCompactEmptyElements))
+    if (element.childCount() != 0 || !has(XMLCompactEmptyElements))
         _output += '>';
+}
+
+void XMLSerializer::startElement(const XMLElement& element) {
+    startTag(element);
     if (has(XMLPrettyPrint))
         _levels.push_back(levelOf(element));
 }
@@ -149,6 +158,10 @@ void XMLSerializer::endElement(const XMLElement& element) {
         _output += "/>";
         return;
     }
+    endTag(element);
+}
+
+void XMLSerializer::endTag(const XMLElement& element) {
     _output += "</";
     _output += element.name().view();
     _output += '>';
@@ -237,7 +250,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
         const char32_t c = decodeCharacter(text, at);
         if (c >= 0x80) {
             if (isChecked() && !isXMLCharacter(c))
-                refuse("a text holds what is no XML character", node);
+                refuseText("a text holds what is no XML character", node);
             if (_encoder != nullptr && !_encoder->canEncode(c, text.substr(start, at - start)))
                 replace(start, at, "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";");
         } else if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
@@ -245,7 +258,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
                    (c == '\t' && where == Where::attribute) || (c == '\n' && escapesBreaks)) {
             replace(start, at, reference(byte));
         } else if (isChecked() && !isXMLCharacter(c)) {
-            refuse("a text holds a control character", node);
+            refuseText("a text holds a control character", node);
         }
     }
     _output.append(text, written);
@@ -300,6 +313,11 @@ XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
     }
     level.isMixed = level.isMixed || !hasMarkup;
     return level;
+}
+
+// In an element, the text that it holds.
+void XMLSerializer::refuseText(std::string_view what, const XMLNode& node) {
+    refuse(what, node.isElement() ? *node.firstChild() : node);
 }
 
 void XMLSerializer::refuse(std::string_view what, const XMLNode& node) {

@@ -39,6 +39,8 @@ private:
     void writeLeaf(const XMLNode& node);
     void startElement(const XMLElement& element);
     void endElement(const XMLElement& element);
+    void startTag(const XMLElement& element);
+    void endTag(const XMLElement& element);
     void writeAttribute(const XMLNode& attribute);
     void writeNamespace(const XMLNode& declaration);
     void writeText(const XMLNode& text);
@@ -52,6 +54,7 @@ private:
 
     bool has(XMLOptions option) const noexcept { return (_options & option) != 0; }
     bool isChecked() const noexcept { return _checks == XMLChecks::on; }
+    [[noreturn]] static void refuseText(std::string_view what, const XMLNode& node);
     [[noreturn]] static void refuse(std::string_view what, const XMLNode& node);
 
     std::string& _output;

@@ -58,7 +58,8 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
 }
 
 void XMLTreeBuilder::endElement() {
-    finishText();
+    if (!_lasting.empty() || !_joined.empty())
+        placeText(true);
     dropLayout(_open.back());
     _open.pop_back();
 }
@@ -90,7 +91,7 @@ void XMLTreeBuilder::addProcessingInstruction(const String& target, std::string_
     appendToCurrent(XMLNode::initProcessingInstructionWithName(target, data));
 }
 
-void XMLTreeBuilder::placeText() {
+void XMLTreeBuilder::placeText(bool endsElement) {
     OpenElement& open = _open.back();
     const std::string_view text = _lasting.empty() ? std::string_view(_joined) : _lasting;
     const bool isLayout =
@@ -99,6 +100,9 @@ void XMLTreeBuilder::placeText() {
         const std::string_view kept =
             _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting;
         _layouts.push_back({open.element->lastChild(), kept});
+    } else if (endsElement && !isLayout && open.element->_childCount == 0 &&
+               _layouts.size() == open.firstLayout) {
+        open.element->holdText(_values.valued(text));
     } else {
         if (!isLayout && !open.hasText)
             restoreLayout(open);

@@ -6,7 +6,7 @@
 
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
-#include "platform/xml/NodeBlocks.h"
+#include "platform/object/MemoryBlocks.h"
 #include "platform/xml/SharedValues.h"
 
 #include <deque>
@@ -19,7 +19,7 @@ class XMLTreeBuilder {
 public:
     // Used on the thread that makes it.
     XMLTreeBuilder(XMLDocument& document, const XMLParseOptions& options)
-        : _document(document), _options(options), _blocks(NodeBlocks::ofThread()) {}
+        : _document(document), _options(options), _blocks(MemoryBlocks::ofNodes()) {}
 
     void startElement(const String& name, std::size_t line, std::size_t column);
     // Of the element that was started last, before anything inside it.
@@ -53,7 +53,8 @@ private:
         if (!_lasting.empty() || !_joined.empty())
             placeText();
     }
-    void placeText();
+    // Of an element that has nothing else the text is held by the element itself.
+    void placeText(bool endsElement = false);
     void appendText(std::string_view text, bool isLayout, XMLNode* before);
     void appendChild(XMLElement& parent, XMLNode* child, XMLNode* before = nullptr) noexcept;
     void appendToCurrent(Ref<XMLNode> node);
@@ -67,7 +68,7 @@ private:
 
     XMLDocument& _document;
     const XMLParseOptions _options;
-    NodeBlocks& _blocks;
+    MemoryBlocks& _blocks;
     std::vector<OpenElement> _open;
     // The current text: one lasting piece, or several joined.
     std::string_view _lasting;
