@@ -280,6 +280,48 @@ TEST(Marshaller, BindsSingleStepsForAHostThatCallsThem) {
               "<other><t>2</t></other>");
 }
 
+TEST(Marshaller, ReadsAndWritesOneFieldAtATime) {
+    const auto marshaller = scenario::marshaller(
+        "<class name='Order'>" + field("title", "", "name='t' node='attribute'") +
+        field("note", "", "node='text'") + field("line", "type='Line'", "node='element'") +
+        field("lines", "type='Line' collection='array'", "name='l'") +
+        field("items", "collection='array'", "") + "</class><class name='Line'/>");
+    const auto& fields = marshaller->mapping()->mappingForClassName("Order")->fields();
+    const auto document = qx::XMLDocument::initWithData("<o t='1'>x<line/><l/><l/></o>");
+    qx::XMLElement& element = *document->rootElement();
+    const auto record = qx::make<QXGenericRecord>();
+    const auto names = qx::make<qx::CountedSet>();
+    const auto attributes = qx::make<qx::CountedSet>();
+    Ref<Error> error;
+    EXPECT_TRUE(marshaller->bindFieldAsAttribute(*fields[0], *record, 0, element, *names,
+                                                 *attributes, &error));
+    EXPECT_TRUE(
+        marshaller->bindFieldAsText(*fields[1], *record, 0, element, *names, *attributes, &error));
+    EXPECT_TRUE(
+        marshaller->bindField(*fields[2], *record, 0, element, *names, *attributes, false, &error));
+    EXPECT_TRUE(marshaller->bindArrayFieldByType(*fields[3], *record, element, *names, *attributes,
+                                                 &error));
+    EXPECT_TRUE(
+        marshaller->bindCollectionField(*fields[4], *record, element, *names, *attributes, &error));
+    EXPECT_FALSE(error);
+    EXPECT_EQ(support::show(record),
+              "QXGenericRecord{items: [Line{}], line: Line{}, lines: [Line{}, Line{}], "
+              "note: \"x\", title: \"1\"}");
+    EXPECT_EQ(names->description(), "(line [2], l [2])");
+    EXPECT_EQ(attributes->description(), "(t [1])");
+
+    const auto written = qx::XMLElement::initWithName("w");
+    EXPECT_TRUE(marshaller->mapField(*fields[0], *written, *record, &error));
+    EXPECT_TRUE(marshaller->mapArray(*record->valueForKey("lines").as<qx::Array>(), *written,
+                                     *fields[3], &error));
+    EXPECT_EQ(written->XMLString(), "<w t=\"1\"><l></l><l></l></w>");
+    EXPECT_TRUE(marshaller->bindFieldMappings(*marshaller->mapping()->mappingForClassName("Line"),
+                                              *written, *record, &error));
+    EXPECT_TRUE(TakeValueForKey(*record, "number", "7", *fields[0], &error));
+    EXPECT_EQ(StringValueOfObjectWithMapping(record->valueForKey("number"), *fields[0]), "7");
+    EXPECT_FALSE(error);
+}
+
 TEST(Marshaller, EndsDeepNestingInAnErrorInBothDirections) {
     const auto marshaller = scenario::marshaller("<class name='Node'>" +
                                                  field("node", "", "node='element'") + "</class>");

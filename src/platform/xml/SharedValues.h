@@ -31,7 +31,7 @@ private:
     // where those stand.
     using Digits = std::array<std::uint64_t, 3>;
     struct Entry {
-        Digits digits;
+        Digits digits{};
         std::size_t size = 0;
         String value;
     };

@@ -1,0 +1,31 @@
+#!/usr/bin/env bash
+# The README's program compiles as it stands there and does what the README says, under the README's
+# mapping.
+#
+# usage: readme.sh BUILD_DIR SOURCE_DIR
+set -euo pipefail
+
+work=$(mktemp -d)
+trap 'rm -rf -- "$work"' EXIT
+# block LANGUAGE: the README's first block in that language.
+block() { awk -v fence="\`\`\`$1" '$0 == fence { on = 1; next } on && /^```/ { exit } on' "$2/README.md"; }
+block xml "$2" >"$work/order-mapping.xml"
+block cpp "$2" >"$work/program.cpp"
+printf '<order number="7"><customer>Bea</customer><note/></order>' >"$work/order.xml"
+
+compiler=$(sed -n 's/^CMAKE_CXX_COMPILER:[A-Z]*=//p' "$1/CMakeCache.txt")
+sanitize=()
+if grep -q '^QX_SANITIZE:BOOL=ON' "$1/CMakeCache.txt"; then
+    sanitize=(-fsanitize=address,undefined)
+fi
+"$compiler" -std=c++20 -Wall -Wextra -Werror "${sanitize[@]}" -I "$2/include" "$work/program.cpp" \
+    -L "$1/lib" -lQXXMLMarshalling -Wl,-rpath,"$1/lib" -o "$work/program"
+cd -- "$work"
+./program
+diff - order.xml <<'EOF'
+<?xml version="1.0" encoding="UTF-8"?>
+<order number="7">
+    <customer>Ada</customer>
+    <note></note>
+</order>
+EOF
