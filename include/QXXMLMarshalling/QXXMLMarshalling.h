@@ -20,6 +20,7 @@
 #include <QXXMLMarshalling/platform/ChangeTracking.h>
 #include <QXXMLMarshalling/platform/Class.h>
 #include <QXXMLMarshalling/platform/ClassDescription.h>
+#include <QXXMLMarshalling/platform/Count.h>
 #include <QXXMLMarshalling/platform/CountedSet.h>
 #include <QXXMLMarshalling/platform/Data.h>
 #include <QXXMLMarshalling/platform/Dictionary.h>

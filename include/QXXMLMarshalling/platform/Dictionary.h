@@ -72,7 +72,20 @@ public:
     void set(const String& key, Value value);
     // Adds the value unless the key is there; false when it is, and then the value is left alone.
     // Neither may be null.
-    bool add(const String& key, Value&& value);
+    bool add(const String& key, Value&& value) {
+        // The first few keys of most dictionaries are names, which tell themselves apart.
+        const bool isFew = _allInterned && key.isInterned() && _index.empty() &&
+                           _entries.size() < _entries.capacity();
+        if (!isFew || value.isNull())
+            return addAny(key, std::move(value));
+        for (const Entry& entry : _entries)
+            if (entry.key.isSameAs(key))
+                return false;
+        changed();
+        _entries.emplace_back(key, std::move(value));
+        ++_count;
+        return true;
+    }
     // Nothing happens when the key is absent.
     void remove(const String& key);
     void removeAll();
@@ -103,6 +116,7 @@ protected:
 private:
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
+    bool addAny(const String& key, Value&& value);
     void append(const String& key, Value&& value);
     void prepareForOne();
     void makeRoom();

@@ -10,6 +10,7 @@
 //   NSUndefinedKeyException     the class has no such key
 //   NSInvalidArgumentException  the property does not take the value (null for a scalar, say)
 
+#include <QXXMLMarshalling/platform/Count.h>
 #include <QXXMLMarshalling/platform/Export.h>
 #include <QXXMLMarshalling/platform/Key.h>
 #include <QXXMLMarshalling/platform/Ref.h>
@@ -44,11 +45,11 @@ public:
     Object& operator=(const Object&) = delete;
     virtual ~Object();
 
-    void retain() const noexcept { _count.fetch_add(1, std::memory_order_relaxed); }
+    void retain() const noexcept { count::increase(_count); }
     // Ends the object with its last count. However deep a graph hangs on it, its release needs no
     // more stack than a bounded number of levels.
     void release() const noexcept {
-        if (_count.fetch_sub(1, std::memory_order_acq_rel) == 1)
+        if (count::decrease(_count) == 1)
             destroy();
     }
 

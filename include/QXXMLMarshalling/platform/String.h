@@ -4,6 +4,7 @@
 // at all) is distinct from an empty one; both convert to an empty std::string_view.
 // Interned strings (see Key.h) are immortal: copying them touches no count.
 
+#include <QXXMLMarshalling/platform/Count.h>
 #include <QXXMLMarshalling/platform/Export.h>
 
 #include <atomic>
@@ -103,12 +104,12 @@ private:
 
     void retain() const noexcept {
         if (_rep != nullptr && (_rep->count.load(std::memory_order_relaxed) & immortalBit) == 0)
-            _rep->count.fetch_add(1, std::memory_order_relaxed);
+            count::increase(_rep->count);
     }
     void release() const noexcept {
         if (_rep == nullptr || (_rep->count.load(std::memory_order_relaxed) & immortalBit) != 0)
             return;
-        if (_rep->count.fetch_sub(1, std::memory_order_acq_rel) == 1)
+        if (count::decrease(_rep->count) == 1)
             destroy(_rep);
     }
 

@@ -68,7 +68,7 @@ void Dictionary::set(const String& key, Value value) {
     append(key, std::move(value));
 }
 
-bool Dictionary::add(const String& key, Value&& value) {
+bool Dictionary::addAny(const String& key, Value&& value) {
     refuseNull(key, value);
     if (positionOf(key) != nameindex::none)
         return false;

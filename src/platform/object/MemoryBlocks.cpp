@@ -1,5 +1,7 @@
 #include "platform/object/MemoryBlocks.h"
 
+#include <QXXMLMarshalling/platform/Count.h>
+
 namespace qx {
 
 namespace {
@@ -7,13 +9,18 @@ namespace {
 constexpr std::size_t blockSize = 64 * 1024 - 64;
 
 // Without destructors, so that they can be used until the very end of the thread.
-constinit thread_local MemoryBlocks nodesOfThread;
-constinit thread_local MemoryBlocks objectsOfThread;
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks nodesOfThread;
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks objectsOfThread;
 
 } // namespace
 
 MemoryBlocks& MemoryBlocks::ofNodes() noexcept { return nodesOfThread; }
 MemoryBlocks& MemoryBlocks::ofObjects() noexcept { return objectsOfThread; }
+
+inline void MemoryBlocks::giveUp(Block* block, std::uint32_t things) noexcept {
+    if (count::decrease(block->live, things) == things)
+        ::operator delete(block);
+}
 
 void MemoryBlocks::begin() {
     struct Retirement {
@@ -63,11 +70,6 @@ void MemoryBlocks::release(void* memory) noexcept {
     else
         ::operator delete(static_cast<char*>(memory) - anyScalar);
 #endif
-}
-
-void MemoryBlocks::giveUp(Block* block, std::uint32_t count) noexcept {
-    if (block->live.fetch_sub(count, std::memory_order_acq_rel) == count)
-        ::operator delete(block);
 }
 
 } // namespace qx

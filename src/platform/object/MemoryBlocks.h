@@ -66,7 +66,7 @@ private:
 
     void begin();
     void retire() noexcept;
-    static void giveUp(Block* block, std::uint32_t count) noexcept;
+    static void giveUp(Block* block, std::uint32_t things) noexcept;
 
     Block* _block = nullptr;
     char* _next = nullptr;

@@ -76,7 +76,8 @@ void Object::destroy() const noexcept {
         return;
     }
     ++ending.depth;
-    ObjectInternals::tellEndListeners(*self);
+    if (_extras != nullptr)
+        ObjectInternals::tellEndListeners(*self);
     delete self;
     --ending.depth;
     while (ending.depth == 0 && ending.waiting != nullptr) {

@@ -9,7 +9,8 @@ namespace {
 // Larger ones would leave much of a block unused.
 constexpr std::size_t largestShare = 1024;
 
-constinit thread_local unsigned bulks = 0;
+// In the library's initial block of thread memory: it is looked at for every such object.
+[[gnu::tls_model("initial-exec")]] constinit thread_local unsigned bulks = 0;
 
 } // namespace
 

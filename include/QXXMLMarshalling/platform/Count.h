@@ -1,0 +1,39 @@
+#pragma once
+
+// Counts of references. Any thread may change one; in a process that has but one thread that costs
+// no atomic operation.
+
+#include <atomic>
+#include <cstdint>
+
+#if __has_include(<sys/single_threaded.h>)
+#include <sys/single_threaded.h>
+#endif
+
+namespace qx::count {
+
+inline bool isAlone() noexcept {
+#if __has_include(<sys/single_threaded.h>)
+    return __libc_single_threaded != 0;
+#else
+    return false;
+#endif
+}
+
+inline void increase(std::atomic<std::uint32_t>& count) noexcept {
+    if (isAlone())
+        count.store(count.load(std::memory_order_relaxed) + 1, std::memory_order_relaxed);
+    else
+        count.fetch_add(1, std::memory_order_relaxed);
+}
+
+// The count as it was.
+inline std::uint32_t decrease(std::atomic<std::uint32_t>& count, std::uint32_t by = 1) noexcept {
+    if (!isAlone())
+        return count.fetch_sub(by, std::memory_order_acq_rel);
+    const std::uint32_t before = count.load(std::memory_order_relaxed);
+    count.store(before - by, std::memory_order_relaxed);
+    return before;
+}
+
+} // namespace qx::count
