@@ -59,7 +59,12 @@ void write(benchmark::State& state) {
 }
 
 void sizes(benchmark::internal::Benchmark* benchmark) {
-    benchmark->Arg(1)->Arg(10)->Arg(60)->Unit(benchmark::kMillisecond)->UseManualTime();
+    benchmark->Arg(1)
+        ->Arg(10)
+        ->Arg(60)
+        ->Unit(benchmark::kMillisecond)
+        ->UseManualTime()
+        ->MinTime(2.0);
 }
 
 BENCHMARK(parse)->Apply(sizes);
