@@ -35,6 +35,7 @@ bool ObjectDoor::set(qx::Object& object, qx::Key key, qx::Value value, qx::Ref<q
         record != nullptr && (!key.namesProperty() || record->isa().property(key) == nullptr);
     if (isContent && record->addQuietly(key, std::move(value)))
         return true;
+    // NOLINTNEXTLINE(bugprone-use-after-move): it was left alone
     return object.trySetValueForKey(value, key) == qx::SetOutcome::set ||
            qx::fail(error, qx::errors::unableToSetValue, value, key.string(), object.isa().name());
 }

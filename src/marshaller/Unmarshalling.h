@@ -61,7 +61,7 @@ public:
     bool bindCollection(const FieldPlan& field, const Target& target, ErrorSlot error);
     bool bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error);
 
-    bool validate(const Target& target, ErrorSlot error);
+    bool validate(const Target& target, ErrorSlot error) const;
 
 private:
     // An object that is being bound, and those whose binding led to it.
@@ -83,8 +83,8 @@ private:
     qx::Value flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error);
     Items findItems(const FieldPlan& field, const Target& target);
     bool adopt(qx::Object& item, qx::Object& parent, ErrorSlot error);
-    bool validateChildren(const Target& target, ErrorSlot error);
-    bool validateAttributes(const Target& target, ErrorSlot error);
+    bool validateChildren(const Target& target, ErrorSlot error) const;
+    bool validateAttributes(const Target& target, ErrorSlot error) const;
 
     // Whether consumed names are counted at all.
     bool counts() const noexcept { return _use == Use::steps || validates(); }

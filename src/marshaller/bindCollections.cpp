@@ -4,7 +4,6 @@
 
 #include "platform/system/Errors.h"
 
-using qx::Ref;
 using qx::XMLElement;
 using qx::XMLNode;
 

@@ -4,7 +4,6 @@
 #include "platform/system/Errors.h"
 #include "platform/system/Log.h"
 
-using qx::Ref;
 using qx::String;
 using qx::Value;
 

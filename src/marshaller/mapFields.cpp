@@ -157,6 +157,7 @@ bool Marshalling::mapArray(const FieldPlan& field, XMLElement& element, const qx
     XMLElement& target = arrayTarget(field, element);
     // An item's own accessors may change the array it stands in.
     for (std::size_t i = 0; i < array.count(); ++i) {
+        // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
         const Value item = array.at(i);
         Ref<qx::Error> problem;
         auto child = field.typeClass != nullptr

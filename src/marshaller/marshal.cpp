@@ -6,6 +6,8 @@
 
 #include "platform/system/Errors.h"
 
+#include <algorithm>
+
 using qx::Key;
 using qx::Ref;
 using qx::String;
@@ -70,8 +72,9 @@ bool Marshalling::bindFields(const ClassPlan& plan, XMLElement& element, qx::Obj
     } while (walk.next());
     if (!walk.broken().isNull())
         return qx::fail(error, qx::errors::noExtendsWhenMarshalling, walk.broken());
-    for (auto level = levels.rbegin(); level != levels.rend(); ++level) {
-        if (!(*level)->mapping->isSelfFirst() && !bindOwnFields(**level, element, object, error))
+    std::reverse(levels.begin(), levels.end());
+    for (const ClassPlan* level : levels) {
+        if (!level->mapping->isSelfFirst() && !bindOwnFields(*level, element, object, error))
             return false;
         if (_saveUnknownXML)
             restoreUnknownXML(element, object);

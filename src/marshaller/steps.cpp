@@ -49,10 +49,14 @@ public:
     template <class Bind>
     bool run(Object& object, bool isFlattened, Bind bind) {
         const Unmarshalling::Target target{object, _source, {_fields, _attributes}, isFlattened};
-        const bool bound = bind(_unmarshalling, target);
-        _fields.addTo(_fieldSet);
-        _attributes.addTo(_attributeSet);
-        return bound;
+        struct Counted {
+            Step& step;
+            ~Counted() {
+                step._fields.addTo(step._fieldSet);
+                step._attributes.addTo(step._attributeSet);
+            }
+        } const counted{*this}; // also when a host's setter throws
+        return bind(_unmarshalling, target);
     }
 
 private:

@@ -87,7 +87,7 @@ Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& sourc
                         plan.className.string());
     if (!countBuild(source, isFlattened, error))
         return nullptr;
-    const Ref<qx::Object> object = allocate(plan);
+    Ref<qx::Object> object = allocate(plan);
     // Whoever set it: a caller's earlier error stops the binding, too.
     if (error != nullptr && *error)
         return nullptr;

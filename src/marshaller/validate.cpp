@@ -39,7 +39,7 @@ private:
 
 } // namespace
 
-bool Unmarshalling::validate(const Target& target, ErrorSlot error) {
+bool Unmarshalling::validate(const Target& target, ErrorSlot error) const {
     if (!validates())
         return true;
     if (_use == Use::document)
@@ -51,7 +51,7 @@ bool Unmarshalling::validate(const Target& target, ErrorSlot error) {
 }
 
 // A name that is left is kept with all its elements, those that were consumed included.
-bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
+bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) const {
     static const Key key("unboundChildren");
     Unknown unknown(target.bound.fields);
     target.source.forEachChild([&](const XMLNode& child) { unknown.see(child); });
@@ -79,7 +79,7 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     return ObjectDoor::set(target.object, key, kept, error);
 }
 
-bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
+bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) const {
     static const Key key("unboundAttributes");
     const XMLElement& element = target.source.element();
     Unknown unknown(target.bound.attributes);

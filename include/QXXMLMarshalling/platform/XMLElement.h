@@ -16,12 +16,12 @@ public:
     static Ref<XMLElement> initWithName(const String& name, const String& stringValue);
     ~XMLElement() override;
 
-    XMLNode* firstChild() const noexcept override {
+    XMLNode* firstChild() const override {
         if (holdsText())
             spellTextOut();
         return _firstChild;
     }
-    XMLNode* lastChild() const noexcept { return lastOf(firstChild()); }
+    XMLNode* lastChild() const { return lastOf(firstChild()); }
     std::size_t childCount() const noexcept { return _childCount; }
 
     // The direct child elements of that qualified name, in document order.
@@ -66,7 +66,10 @@ private:
         _value = std::move(text);
         _childCount = 1;
     }
-    void spellTextOut() const noexcept;
+    void spellTextOut() const;
+    // The first child that there is a node of.
+    static const XMLNode* firstNodeOf(const XMLNode& node) noexcept;
+    const XMLNode* following(const XMLNode* node) const noexcept;
 
     explicit XMLElement(String name) noexcept
         : XMLNode(XMLNodeKind::element, std::move(name), String()) {}

@@ -118,8 +118,10 @@ public:
         return _previous != nullptr && _previous->_next != nullptr ? _previous : nullptr;
     }
     // The child nodes in document order: of elements and documents; of other kinds none.
-    XMLNodeRange children() const noexcept { return XMLNodeRange(firstChild()); }
-    virtual XMLNode* firstChild() const noexcept { return nullptr; }
+    // An element's only text may become a node when it is asked for: that is a use of the tree like
+    // any other, for one thread at a time.
+    XMLNodeRange children() const { return XMLNodeRange(firstChild()); }
+    virtual XMLNode* firstChild() const { return nullptr; }
 
     // Takes the node out of its parent, which gives up its count: keep a Ref before you call it.
     // Nothing happens to a node that stands alone.

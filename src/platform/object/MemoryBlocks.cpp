@@ -6,11 +6,14 @@ namespace qx {
 
 namespace {
 
-constexpr std::size_t blockSize = 64 * 1024 - 64;
+// A host may keep a few of many objects, but seldom a few of a document's nodes.
+constexpr std::size_t nodeBlockSize = 64 * 1024 - 64;
+constexpr std::size_t objectBlockSize = 8 * 1024 - 64;
 
 // Without destructors, so that they can be used until the very end of the thread.
-[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks nodesOfThread;
-[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks objectsOfThread;
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks nodesOfThread(nodeBlockSize);
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
+    objectsOfThread(objectBlockSize);
 
 } // namespace
 
@@ -22,27 +25,32 @@ inline void MemoryBlocks::giveUp(Block* block, std::uint32_t things) noexcept {
         ::operator delete(block);
 }
 
-void MemoryBlocks::begin() {
+void MemoryBlocks::begin(std::size_t whole) {
+    // What is made while the thread's other objects end, after its blocks, gets a block of its own.
+    static thread_local bool hasRetired = false;
     struct Retirement {
         ~Retirement() {
             nodesOfThread.retire();
             objectsOfThread.retire();
+            hasRetired = true;
         }
     };
     static thread_local const Retirement atThreadsEnd;
     (void)atThreadsEnd;
     retire();
-    auto* const memory = static_cast<char*>(::operator new(blockSize));
-    _block = new (memory) Block{reserve};
     // So that what follows the address in front is aligned.
-    constexpr std::size_t start = 2 * anyScalar - sizeof(Block*);
+    constexpr std::size_t start = 2 * anyScalar - header;
     static_assert(start >= sizeof(Block));
+    const std::size_t size = hasRetired ? start + whole : _blockSize;
+    auto* const memory = static_cast<char*>(::operator new(size));
+    _block = new (memory) Block{hasRetired ? 1 : reserve};
+    _isReserved = !hasRetired;
     _next = memory + start;
-    _left = blockSize - start;
+    _left = size - start;
 }
 
 void MemoryBlocks::retire() noexcept {
-    if (_block != nullptr)
+    if (_block != nullptr && _isReserved)
         giveUp(_block, reserve - _cut);
     _block = nullptr;
     _left = 0;
@@ -54,7 +62,7 @@ void* MemoryBlocks::allocateAlone(std::size_t size) {
     return ::operator new(size);
 #else
     char* const memory = static_cast<char*>(::operator new(size + anyScalar)) + anyScalar;
-    new (memory - sizeof(Block*)) Block*(nullptr);
+    new (memory - header) Block*(nullptr);
     return memory;
 #endif
 }

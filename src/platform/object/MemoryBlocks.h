@@ -2,8 +2,9 @@
 
 // Memory for things that are made in one go and mostly die together: the nodes of a document, the
 // objects that are read from it. They are cut from blocks, one after the other, and a block is
-// given back when the last thing in it is gone. So what is kept for long keeps its block, a few
-// hundred others. Each thread cuts from blocks of its own; any thread may release anything.
+// given back when the last thing in it is gone. So what is kept for long keeps its block: some
+// hundred nodes, some dozen objects. Each thread cuts from blocks of its own; any thread may
+// release anything.
 
 #include <atomic>
 #include <cstddef>
@@ -25,7 +26,7 @@ class MemoryBlocks {
 public:
     static constexpr std::size_t anyScalar = __STDCPP_DEFAULT_NEW_ALIGNMENT__;
 
-    constexpr MemoryBlocks() noexcept = default;
+    constexpr explicit MemoryBlocks(std::size_t blockSize) noexcept : _blockSize(blockSize) {}
     MemoryBlocks(const MemoryBlocks&) = delete;
     MemoryBlocks& operator=(const MemoryBlocks&) = delete;
 
@@ -41,15 +42,15 @@ public:
 #ifdef QX_MEMORY_APART
         return ::operator new(size);
 #else
-        const std::size_t whole = (sizeof(Block*) + size + Unit - 1) / Unit * Unit;
+        const std::size_t whole = (header + size + Unit - 1) / Unit * Unit;
         if (_left < whole)
-            begin();
+            begin(whole);
         char* const place = _next;
         _next += whole;
         _left -= whole;
         ++_cut;
         new (place) Block*(_block);
-        return place + sizeof(Block*);
+        return place + header;
 #endif
     }
     // The same for something that is made on its own, aligned for any scalar.
@@ -63,12 +64,15 @@ private:
         std::atomic<std::uint32_t> live;
     };
     static constexpr std::uint32_t reserve = 1U << 30;
+    static constexpr std::size_t header = sizeof(void*);
 
-    void begin();
+    void begin(std::size_t whole);
     void retire() noexcept;
     static void giveUp(Block* block, std::uint32_t things) noexcept;
 
+    const std::size_t _blockSize;
     Block* _block = nullptr;
+    bool _isReserved = false; // whether more than what is alive is counted for the block
     char* _next = nullptr;
     std::size_t _left = 0;
     std::uint32_t _cut = 0; // how many things the block was cut into

@@ -58,6 +58,7 @@ namespace {
 // object is made.
 std::uint64_t hashSeed() noexcept {
     std::uint64_t seed = 0;
+    // NOLINTNEXTLINE(performance-no-int-to-ptr): this is how the kernel gives the address
     if (const auto* random = reinterpret_cast<const char*>(getauxval(AT_RANDOM)))
         std::memcpy(&seed, random, sizeof(seed));
     return seed;

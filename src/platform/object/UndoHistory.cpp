@@ -96,8 +96,11 @@ void UndoHistory::destroy(UndoItem* item) noexcept {
     removeContents(ending);
 }
 
+// What an action holds may hold the last reference to the manager: once the first of them goes,
+// nothing of the history is touched.
 void UndoHistory::removeContents(UndoItemGroup& group) noexcept {
     UndoItemGroup ending;
+    UndoItemGroup actions;
     ending.takeAll(group);
     while (UndoItem* item = ending.first) {
         ending.unlink(*item);
@@ -106,10 +109,13 @@ void UndoHistory::removeContents(UndoItemGroup& group) noexcept {
             ending.takeAll(*nested);
             delete nested;
         } else {
-            auto* action = static_cast<UndoAction*>(item);
-            unlinkFromTarget(*action);
-            delete action;
+            unlinkFromTarget(static_cast<UndoAction&>(*item));
+            actions.append(*item);
         }
+    }
+    while (UndoItem* item = actions.first) {
+        actions.unlink(*item);
+        delete static_cast<UndoAction*>(item);
     }
 }
 

@@ -2,6 +2,7 @@
 
 // Which characters XML 1.0 allows, and where.
 
+#include <algorithm>
 #include <cstddef>
 #include <string_view>
 
@@ -17,10 +18,7 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
 // Space, tab, line feed and carriage return.
 constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
 inline bool isWhite(std::string_view text) noexcept {
-    for (const char c : text)
-        if (!isWhite(c))
-            return false;
-    return true;
+    return std::all_of(text.begin(), text.end(), [](char c) { return isWhite(c); });
 }
 
 bool isXMLCharacter(char32_t c) noexcept;

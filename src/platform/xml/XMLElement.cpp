@@ -43,17 +43,6 @@ void requireChild(const XMLNode* child, const XMLElement& element) {
             refuse("an element cannot be the child of its descendant", element);
 }
 
-// The node after `node` in document order, within the element.
-const XMLNode* following(const XMLNode* node, const XMLElement* element) {
-    if (node->firstChild() != nullptr)
-        return node->firstChild();
-    while (node != element && node->nextSibling() == nullptr)
-        node = node->parent();
-    return node == element ? nullptr : node->nextSibling();
-}
-
-bool isText(const XMLNode& node) { return node.kind() == XMLNodeKind::text; }
-
 } // namespace
 
 // Documents hold millions of elements: the count of children fills a hole, lists keep one end.
@@ -83,10 +72,10 @@ std::vector<XMLElement*> XMLElement::elementsForName(const String& name) const {
     return found;
 }
 
-// Where there is no memory for a node, there is none to go on.
-void XMLElement::spellTextOut() const noexcept {
+void XMLElement::spellTextOut() const {
     auto& self = const_cast<XMLElement&>(*this);
-    auto* text = new XMLNode(XMLNodeKind::text, String(), std::exchange(self._value, String()));
+    auto* text = new XMLNode(XMLNodeKind::text, String(), _value);
+    self._value = String();
     XMLSiblings::append(self, self._firstChild, text);
 }
 
@@ -157,14 +146,30 @@ void XMLElement::unlink(XMLNode& node) noexcept {
     }
 }
 
-// The text of an element with one text, as most have, is shared with the caller, not copied.
+const XMLNode* XMLElement::firstNodeOf(const XMLNode& node) noexcept {
+    const XMLElement* element = node.asElement();
+    return element != nullptr ? element->_firstChild : nullptr;
+}
+
+// The node after `node` in document order, within this element.
+const XMLNode* XMLElement::following(const XMLNode* node) const noexcept {
+    if (const XMLNode* child = firstNodeOf(*node))
+        return child;
+    while (node != this && node->_next == nullptr)
+        node = node->_parent;
+    return node == this ? nullptr : node->_next;
+}
+
+// The text of an element with one text, as most have, is shared with the caller, not copied. Of the
+// nodes within, texts and elements that hold one have a value; of no others the value counts.
 String XMLElement::stringValue() const {
     if (holdsText())
         return _value;
     const XMLNode* only = nullptr;
     std::string joined;
-    for (const XMLNode* node = _firstChild; node != nullptr; node = following(node, this)) {
-        if (!isText(*node))
+    for (const XMLNode* node = _firstChild; node != nullptr; node = following(node)) {
+        const bool isText = node->_kind == XMLNodeKind::text || node->isElement();
+        if (!isText || node->_value.isNull())
             continue;
         if (only == nullptr && joined.empty()) {
             only = node;
@@ -179,11 +184,12 @@ String XMLElement::stringValue() const {
 }
 
 void XMLElement::setStringValue(const String& value) {
+    String text = value; // which may be a name of what goes now
     XMLSiblings::releaseAll(_firstChild);
     _value = String();
     _childCount = 0;
-    if (!value.isEmpty())
-        holdText(value);
+    if (!text.isEmpty())
+        holdText(std::move(text));
 }
 
 // Walks both trees in step, so that depth costs no stack.
@@ -201,15 +207,11 @@ Ref<XMLNode> XMLElement::copy() const {
         return element;
     };
     Ref<XMLElement> top = alone(*this);
-    const auto childOf = [](const XMLNode* node) -> const XMLNode* {
-        const XMLElement* element = node->asElement();
-        return element != nullptr ? element->_firstChild : nullptr;
-    };
     XMLElement* target = top.get();
     const XMLNode* node = this;
     while (true) {
-        if (childOf(node) != nullptr) {
-            node = childOf(node);
+        if (firstNodeOf(*node) != nullptr) {
+            node = firstNodeOf(*node);
         } else {
             while (node != this && node->_next == nullptr) {
                 node = node->_parent;
@@ -227,7 +229,7 @@ Ref<XMLNode> XMLElement::copy() const {
         // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): likewise
         XMLSiblings::append(*target, target->_firstChild, copied.detach());
         ++target->_childCount;
-        if (childOf(node) != nullptr)
+        if (firstNodeOf(*node) != nullptr)
             target = static_cast<XMLElement*>(child);
     }
 }

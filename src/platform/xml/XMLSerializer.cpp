@@ -317,7 +317,8 @@ XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
 
 // In an element, the text that it holds.
 void XMLSerializer::refuseText(std::string_view what, const XMLNode& node) {
-    refuse(what, node.isElement() ? *node.firstChild() : node);
+    const XMLNode* text = node.firstChild();
+    refuse(what, text != nullptr ? *text : node);
 }
 
 void XMLSerializer::refuse(std::string_view what, const XMLNode& node) {

@@ -235,6 +235,22 @@ TEST_F(UndoManagerTest, NamesGoAlongFromUndoToRedo) {
     EXPECT_EQ(manager->redoActionName(), "First");
 }
 
+TEST_F(UndoManagerTest, AManagerMayEndWithATargetWhoseActionsHoldIt) {
+    struct Model : Object {
+        void set(const Value&) {}
+    };
+    Class::define<Model>("UndoManagerTest.Model").operation<&Model::set>("set:");
+    auto model = make<Model>();
+    for (int i = 0; i < 3; ++i)
+        manager->registerUndoWithTarget(model.get(), "set:", i == 1 ? Value(manager) : Value(i));
+    const WeakRef<UndoManager> watched(manager);
+    manager = nullptr;
+    EXPECT_TRUE(watched.lock());
+    model = nullptr;
+    EXPECT_FALSE(watched.lock());
+    Class::forget("UndoManagerTest.Model");
+}
+
 TEST_F(UndoManagerTest, AManagerMayEndWithTheActionsItHolds) {
     struct Holder : Object {
         explicit Holder(Ref<UndoManager> held) : manager(std::move(held)) {}

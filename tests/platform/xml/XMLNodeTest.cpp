@@ -163,6 +163,27 @@ TEST(XMLElement, SettingItsStringValueReplacesTheContent) {
     EXPECT_EQ(document->rootElement()->childCount(), 0U);
 }
 
+TEST(XMLElement, ItsNewTextMayBeANameOfWhatGoes) {
+    const auto document = parsed("<a><some-long-name/></a>");
+    XMLElement* element = document->rootElement();
+    element->setStringValue(element->firstChild()->name());
+    EXPECT_EQ(element->XMLString(), "<a>some-long-name</a>");
+}
+
+TEST(XMLElement, AnOnlyTextIsAChildLikeAnyOther) {
+    const auto document = parsed("<a><b>one</b><c>two</c></a>");
+    const XMLElement* element = document->rootElement();
+    auto* b = element->firstChild()->asElement();
+    EXPECT_EQ(element->stringValue(), "onetwo");
+    EXPECT_EQ(b->childCount(), 1U);
+    b->insertChild(XMLElement::initWithName("i"), b->lastChild());
+    EXPECT_EQ(element->XMLString(), "<a><b><i></i>one</b><c>two</c></a>");
+    const Ref<XMLNode> text(b->lastChild());
+    text->detach();
+    EXPECT_EQ(text->stringValue(), "one");
+    EXPECT_EQ(element->copy()->XMLString(), "<a><b><i></i></b><c>two</c></a>");
+}
+
 TEST(XMLNode, NodesMayDieOnAnotherThread) {
     std::vector<Ref<XMLNode>> nodes;
     std::thread maker([&] {
