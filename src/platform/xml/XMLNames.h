@@ -40,8 +40,8 @@ private:
     static constexpr std::size_t maximumNames = 100'000;
 
     std::size_t slot(Name local, Name prefix) const noexcept {
-        const auto mixed = (std::bit_cast<std::uintptr_t>(local) +
-                            std::rotl(std::bit_cast<std::uintptr_t>(prefix), 21)) *
+        const auto mixed = (reinterpret_cast<std::uintptr_t>(local) +
+                            std::rotl(reinterpret_cast<std::uintptr_t>(prefix), 21)) *
                            0x9E3779B97F4A7C15U;
         return (mixed >> 32) & (_entries.size() - 1);
     }
