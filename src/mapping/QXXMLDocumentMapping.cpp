@@ -19,8 +19,8 @@ bool QXXMLDocumentMapping::initXML(XMLElement& element, Ref<Error>* error) {
     if (!QXXMLMapping::initXML(element, error))
         return false;
     for (const XMLElement* include : element.elementsForName(Key("include")))
-        if (const qx::XMLNode* href = include->attributeForName(Key("href")))
-            _includes.push_back(href->stringValue());
+        if (String href = include->attributeValue(Key("href")); !href.isNull())
+            _includes.push_back(std::move(href));
     return processClasses(element.elementsForName(Key("class")), error);
 }
 

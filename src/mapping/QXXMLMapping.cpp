@@ -90,13 +90,8 @@ void QXXMLMapping::append(std::string& text, std::string_view key, const qx::Obj
 // Values are interned: they are names for the most part, and documents are compared with them.
 bool QXXMLMapping::extractStringAttribute(Key name, const XMLElement& element, bool required,
                                           String& result, Ref<Error>* error) {
-    result = String();
-    const qx::XMLNode* attribute = element.attributeForName(name);
-    if (attribute != nullptr) {
-        result = Key(attribute->stringValue());
-        return true;
-    }
-    return !required ||
+    result = Key(element.attributeValue(name));
+    return !result.isNull() || !required ||
            qx::fail(error, qx::errors::requiredAttributeNotFound, name.string(), &element);
 }
 
@@ -108,11 +103,10 @@ bool QXXMLMapping::extractBooleanAttribute(Key name, const XMLElement& element, 
 bool QXXMLMapping::extractBooleanAttribute(Key name, const XMLElement& element, bool required,
                                            bool& result, bool defaultValue, Ref<Error>* error) {
     result = defaultValue;
-    const qx::XMLNode* attribute = element.attributeForName(name);
-    if (attribute == nullptr)
+    const String value = element.attributeValue(name);
+    if (value.isNull())
         return !required ||
                qx::fail(error, qx::errors::requiredAttributeNotFound, name.string(), &element);
-    const String value = attribute->stringValue();
     if (value.equalsIgnoringCase("true"))
         result = true;
     else if (value.equalsIgnoringCase("false"))

@@ -10,7 +10,7 @@ using qx::Value;
 // The wrapper of a location is not counted as consumed, and the attribute counts for the element
 // that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
 bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target, ErrorSlot error) {
-    const qx::XMLNode* attribute = nullptr;
+    String value;
     const BindingPlan* tried = nullptr;
     for (const BindingPlan& binding : field.bindings) {
         tried = &binding;
@@ -22,14 +22,15 @@ bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target
                                 &target.source.element());
             holder = found.first;
         }
-        attribute = holder != nullptr ? holder->attributeForName(binding.name) : nullptr;
-        if (attribute != nullptr)
+        if (holder != nullptr)
+            value = holder->attributeValue(binding.name);
+        if (!value.isNull())
             break;
     }
-    if (attribute != nullptr) {
+    if (!value.isNull()) {
         if (counts())
-            target.bound.attributes.add(attribute->name());
-        return takeValue(target.object, field, field.key, attribute->stringValue(), error);
+            target.bound.attributes.add(tried->name);
+        return takeValue(target.object, field, field.key, std::move(value), error);
     }
     if (field.isRequired)
         return qx::fail(error, qx::errors::requiredAttributeMissing,

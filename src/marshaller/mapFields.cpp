@@ -79,7 +79,7 @@ bool Marshalling::mapAsAttribute(const FieldPlan& field, XMLElement& element, co
         if (target == nullptr)
             target = &appendNew(element, field.location);
     }
-    target->addAttribute(XMLNode::attributeWithName(field.xmlName, written));
+    target->addAttribute(field.xmlName, written);
     return true;
 }
 
@@ -111,7 +111,7 @@ bool Marshalling::mapAutomatically(const FieldPlan& field, XMLElement& element, 
     if (plan == nullptr) {
         const String written = text(value, field.valueType);
         if (field.isRequired || !isZeroOrEmpty(value, written))
-            element.addAttribute(XMLNode::attributeWithName(field.xmlName, written));
+            element.addAttribute(field.xmlName, written);
         return true;
     }
     const auto child = this->element(*plan, plan->elementName, value, error);

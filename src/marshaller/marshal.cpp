@@ -39,7 +39,8 @@ Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, 
                                      ErrorSlot error) {
     if (!object.isObject())
         return qx::fail(error, qx::errors::noMappingDefinition, object.classNameForMarshalling());
-    auto element = XMLElement::initWithName(name.isEmpty() ? plan.className.string() : name);
+    auto element = XMLElement::initForAttributes(name.isEmpty() ? plan.className.string() : name,
+                                                 plan.attributeCount);
     const QXXMLClassMapping& mapping = *plan.mapping;
     if (_usingNamespaceURIs && !mapping.nsURI().isEmpty()) {
         const String prefix = mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix();

@@ -22,8 +22,7 @@ class Unknown {
 public:
     explicit Unknown(NameCounts& bound) : _bound(bound) {}
 
-    void see(const XMLNode& node) {
-        const String& name = node.name();
+    void see(const String& name) {
         if (name.isNull() || _bound.take(name))
             return;
         if (!_names)
@@ -54,7 +53,7 @@ bool Unmarshalling::validate(const Target& target, ErrorSlot error) const {
 bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) const {
     static const Key key("unboundChildren");
     Unknown unknown(target.bound.fields);
-    target.source.forEachChild([&](const XMLNode& child) { unknown.see(child); });
+    target.source.forEachChild([&](const XMLNode& child) { unknown.see(child.name()); });
     if (!unknown.names())
         return true;
     if (!_saveUnknownXML)
@@ -83,8 +82,7 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) co
     static const Key key("unboundAttributes");
     const XMLElement& element = target.source.element();
     Unknown unknown(target.bound.attributes);
-    for (const XMLNode& attribute : element.attributes())
-        unknown.see(attribute);
+    element.forEachAttribute([&](const String& name, const String&) { unknown.see(name); });
     if (!unknown.names())
         return true;
     if (!_saveUnknownXML)

@@ -61,6 +61,8 @@ void MappingPlan::fill(ClassPlan& plan) const {
     for (const auto& field : mapping.fields()) {
         plan.fields.push_back(planFor(*field));
         plan.bindingCount += std::max<std::size_t>(field->bindToMappings().size(), 1);
+        if (field->nodeType() == QXXMLNodeTypeAttribute || field->nodeType() == QXXMLNodeTypeUnknown)
+            ++plan.attributeCount;
     }
     if (!mapping.extends().isEmpty())
         plan.parent = classNamed(mapping.extends());

@@ -68,6 +68,8 @@ public:
     std::vector<FieldPlan> fields;
     // About how many names are looked up to bind the class with its ancestors.
     std::size_t bindingCount = 0;
+    // How many of the class's own fields an element of it may hold as attributes.
+    std::size_t attributeCount = 0;
     // The class that this one extends; null where it extends none or one that is not mapped.
     const ClassPlan* parent = nullptr;
     bool isOnCycle = false; // of `extends`

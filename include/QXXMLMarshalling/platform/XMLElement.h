@@ -5,6 +5,7 @@
 
 #include <QXXMLMarshalling/platform/XMLNode.h>
 
+#include <memory>
 #include <span>
 #include <vector>
 
@@ -14,6 +15,8 @@ class QX_API XMLElement final : public XMLNode {
 public:
     static Ref<XMLElement> initWithName(const String& name);
     static Ref<XMLElement> initWithName(const String& name, const String& stringValue);
+    // With memory for that many attributes, which is the fastest way to have them.
+    static Ref<XMLElement> initForAttributes(const String& name, std::size_t count);
     ~XMLElement() override;
 
     XMLNode* firstChild() const override {
@@ -32,13 +35,29 @@ public:
     // The same before a child of this element, at the end where `before` is null.
     void insertChild(Ref<XMLNode> child, XMLNode* before);
 
-    // In document order.
-    XMLNodeRange attributes() const noexcept { return XMLNodeRange(_firstAttribute); }
+    // In document order. An element's attributes, too, may become nodes when they are asked for:
+    // see XMLNode::children().
+    XMLNodeRange attributes() const {
+        if (_heldCount != 0)
+            spellAttributesOut();
+        return XMLNodeRange(_firstAttribute);
+    }
     // Null when there is none.
-    XMLNode* attributeForName(const String& name) const noexcept;
+    XMLNode* attributeForName(const String& name) const;
+    // The value of the attribute; null when there is none. It needs no node.
+    String attributeValue(const String& name) const noexcept;
+    // Calls visit(name, value) for each attribute in document order; that needs no nodes.
+    template <class Visit>
+    void forEachAttribute(Visit visit) const {
+        for (const HeldAttribute& attribute : held())
+            visit(attribute.name, attribute.value);
+        for (const XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
+            visit(node->_name, node->_value);
+    }
     // Adds nothing when an attribute of that name is there already. A node that has a parent or is
     // no attribute raises NSInvalidArgumentException.
     void addAttribute(Ref<XMLNode> attribute);
+    void addAttribute(const String& name, const String& value);
     // Detaches the attribute; nothing when there is none.
     void removeAttributeForName(const String& name);
 
@@ -59,6 +78,37 @@ private:
     friend class XMLTreeBuilder;
     friend class XMLSerializer;
 
+    // Attributes are held behind the element, in memory that it is made with. They become nodes,
+    // all at once, when somebody asks for a node.
+    struct HeldAttribute {
+        String name;
+        String value;
+    };
+    static constexpr std::size_t mostHeld = 32;
+    static std::size_t roomFor(std::size_t attributes) noexcept {
+        return attributes <= mostHeld ? attributes : 0;
+    }
+    static std::size_t sizeWith(std::size_t room) noexcept {
+        return sizeof(XMLElement) + room * sizeof(HeldAttribute);
+    }
+    static XMLElement* newElement(const String& name, std::size_t attributes);
+    std::span<HeldAttribute> held() const noexcept {
+        auto* first = reinterpret_cast<HeldAttribute*>(const_cast<XMLElement*>(this) + 1);
+        return {first, _heldCount};
+    }
+    bool canHoldAttribute() const noexcept {
+        return _heldCount < _heldRoom && _firstAttribute == nullptr;
+    }
+    void holdAttribute(String name, String value) noexcept {
+        new (held().data() + _heldCount) HeldAttribute{std::move(name), std::move(value)};
+        ++_heldCount;
+    }
+    void dropHeldAttributes() noexcept {
+        std::destroy(held().begin(), held().end());
+        _heldCount = 0;
+    }
+    void spellAttributesOut() const;
+
     // Most elements with text have one text and nothing else. The element then holds it as its
     // value, and makes the node when somebody asks for its children.
     bool holdsText() const noexcept { return !_value.isNull(); }
@@ -71,11 +121,14 @@ private:
     static const XMLNode* firstNodeOf(const XMLNode& node) noexcept;
     const XMLNode* following(const XMLNode* node) const noexcept;
 
-    explicit XMLElement(String name) noexcept
-        : XMLNode(XMLNodeKind::element, std::move(name), String()) {}
+    XMLElement(const String& name, std::size_t heldRoom) noexcept
+        : XMLNode(XMLNodeKind::element, name, String()),
+          _heldRoom(static_cast<std::uint8_t>(heldRoom)) {}
     void unlink(XMLNode& node) noexcept;
 
     // These fill the hole that the base class leaves.
+    std::uint8_t _heldCount = 0;
+    std::uint8_t _heldRoom;
     std::uint32_t _childCount = 0;
     std::uint32_t _line = 0;
     std::uint32_t _column = 0;

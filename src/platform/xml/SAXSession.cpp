@@ -242,7 +242,8 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
     if (_attributeDefaults != 0)
         countDefaulted(namespaceCount, namespaces, defaultedCount,
                        attributes + 5 * (attributeCount - defaultedCount));
-    _builder.startElement(_names.named(local, prefix), _position.line(), _position.column());
+    _builder.startElement(_names.named(local, prefix), static_cast<std::size_t>(attributeCount),
+                          _position.line(), _position.column());
     for (int i = 0; i < namespaceCount; ++i) {
         const xmlChar* declared = namespaces[2 * i];
         const String name = declared != nullptr ? _names.named(declared, nullptr) : String("");

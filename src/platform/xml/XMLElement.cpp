@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/platform/Exception.h>
 
+#include "platform/object/MemoryBlocks.h"
 #include "platform/xml/Siblings.h"
 
 #include <string>
@@ -49,13 +50,21 @@ void requireChild(const XMLNode* child, const XMLElement& element) {
 static_assert(sizeof(void*) != 8 || (sizeof(XMLElement) <= 112 && sizeof(XMLNode) <= 80));
 
 XMLElement::~XMLElement() {
+    dropHeldAttributes();
     XMLSiblings::releaseAll(_firstChild);
     XMLSiblings::releaseAll(_firstAttribute);
     XMLSiblings::releaseAll(_firstNamespace);
 }
 
-Ref<XMLElement> XMLElement::initWithName(const String& name) {
-    return Ref<XMLElement>::adopt(new XMLElement(name.isNull() ? String("") : name));
+XMLElement* XMLElement::newElement(const String& name, std::size_t attributes) {
+    const std::size_t room = roomFor(attributes);
+    return ::new (MemoryBlocks::ofNodes().allocate(sizeWith(room))) XMLElement(name, room);
+}
+
+Ref<XMLElement> XMLElement::initWithName(const String& name) { return initForAttributes(name, 0); }
+
+Ref<XMLElement> XMLElement::initForAttributes(const String& name, std::size_t count) {
+    return Ref<XMLElement>::adopt(newElement(name.isNull() ? String("") : name, count));
 }
 
 Ref<XMLElement> XMLElement::initWithName(const String& name, const String& stringValue) {
@@ -91,10 +100,34 @@ void XMLElement::insertChild(Ref<XMLNode> child, XMLNode* before) {
     ++_childCount;
 }
 
-XMLNode* XMLElement::attributeForName(const String& name) const noexcept {
+void XMLElement::spellAttributesOut() const {
+    auto& self = const_cast<XMLElement&>(*this);
+    std::vector<Ref<XMLNode>> nodes;
+    nodes.reserve(_heldCount);
+    for (const HeldAttribute& attribute : held())
+        nodes.push_back(XMLNode::attributeWithName(attribute.name, attribute.value));
+    self.dropHeldAttributes();
+    for (Ref<XMLNode>& node : nodes)
+        XMLSiblings::append(self, self._firstAttribute, node.detach());
+}
+
+XMLNode* XMLElement::attributeForName(const String& name) const {
+    const String wanted = name; // which may be the name of one that is held
+    if (_heldCount != 0 && !attributeValue(wanted).isNull())
+        spellAttributesOut();
     for (XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
-        if (node->_name == name)
+        if (node->_name == wanted)
             return node;
+    return nullptr;
+}
+
+String XMLElement::attributeValue(const String& name) const noexcept {
+    for (const HeldAttribute& attribute : held())
+        if (attribute.name == name)
+            return attribute.value;
+    for (const XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
+        if (node->_name == name)
+            return node->_value;
     return nullptr;
 }
 
@@ -102,8 +135,17 @@ void XMLElement::addAttribute(Ref<XMLNode> attribute) {
     requireFree(attribute.get(), *this);
     if (attribute->_kind != XMLNodeKind::attribute)
         refuse("a node that is no attribute cannot be added as one", *this);
-    if (attributeForName(attribute->_name) == nullptr)
-        XMLSiblings::append(*this, _firstAttribute, attribute.detach());
+    if (!attributeValue(attribute->_name).isNull())
+        return;
+    attributes(); // those that are held stand in the list from now on
+    XMLSiblings::append(*this, _firstAttribute, attribute.detach());
+}
+
+void XMLElement::addAttribute(const String& name, const String& value) {
+    if (!canHoldAttribute())
+        addAttribute(attributeWithName(name, value));
+    else if (attributeValue(name).isNull())
+        holdAttribute(name.isNull() ? String("") : name, value.isNull() ? String("") : value);
 }
 
 // NOLINTNEXTLINE(readability-make-member-function-const): it changes what the element holds
@@ -195,11 +237,13 @@ void XMLElement::setStringValue(const String& value) {
 // Walks both trees in step, so that depth costs no stack.
 Ref<XMLNode> XMLElement::copy() const {
     const auto alone = [](const XMLElement& from) {
-        Ref<XMLElement> element = initWithName(from._name);
+        auto element = Ref<XMLElement>::adopt(newElement(from._name, from._heldCount));
         element->_line = from._line;
         element->_column = from._column;
         if (from.holdsText())
             element->holdText(from._value);
+        for (const HeldAttribute& attribute : from.held())
+            element->holdAttribute(attribute.name, attribute.value);
         for (const XMLNode* node = from._firstAttribute; node != nullptr; node = node->_next)
             XMLSiblings::append(*element, element->_firstAttribute, node->copy().detach());
         for (const XMLNode* node = from._firstNamespace; node != nullptr; node = node->_next)

@@ -76,9 +76,9 @@ void XMLSerializer::writeDeclaration(const XMLDocument& document) {
     if (version.isEmpty() && encoding.isEmpty() && standalone.isEmpty())
         return;
     if (isChecked() && !version.isEmpty() && !isVersion(version))
-        refuse("the version is no XML version", document);
+        refuse("the version is no XML version", {document});
     if (isChecked() && !standalone.isEmpty() && standalone != "yes" && standalone != "no")
-        refuse("standalone is neither yes nor no", document);
+        refuse("standalone is neither yes nor no", {document});
     _output += "<?xml version=\"";
     _output += version.isEmpty() ? std::string_view("1.0") : version.view();
     for (const auto& [name, value] :
@@ -102,7 +102,7 @@ void XMLSerializer::writeTree(const XMLNode& top) {
         if (element != nullptr && element->holdsText()) {
             startTag(*element);
             const String text = element->_value;
-            writeEscaped(text, Where::text, isWhite(text), *element);
+            writeEscaped(text, Where::text, isWhite(text), {*element, Place::Part::text});
             endTag(*element);
         } else if (element != nullptr) {
             startElement(*element);
@@ -128,15 +128,15 @@ void XMLSerializer::writeTree(const XMLNode& top) {
 
 void XMLSerializer::startTag(const XMLElement& element) {
     _output += '<';
-    writeName(element.name(), element);
+    writeName(element.name(), {element});
     for (const XMLNode& declaration : element.namespaces()) {
         _output += ' ';
         writeNamespace(declaration);
     }
-    for (const XMLNode& attribute : element.attributes()) {
+    element.forEachAttribute([&](const String& name, const String& value) {
         _output += ' ';
-        writeAttribute(attribute);
-    }
+        writeAttribute(name, value, &element, {element, Place::Part::attribute, &name});
+    });
     if (element.childCount() != 0 || !has(XMLCompactEmptyElements))
         _output += '>';
 }
@@ -171,27 +171,28 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
     const String text = node.stringValue();
     switch (node.kind()) {
     case XMLNodeKind::attribute:
-        writeAttribute(node);
+        writeAttribute(node.name(), text,
+                       node.parent() != nullptr ? node.parent()->asElement() : nullptr, {node});
         break;
     case XMLNodeKind::namespaceDeclaration:
         writeNamespace(node);
         break;
     case XMLNodeKind::comment:
         if (isChecked() && (holds(text, "--") || text.view().ends_with('-')))
-            refuse(R"(a comment holds "--" or ends in "-")", node);
+            refuse(R"(a comment holds "--" or ends in "-")", {node});
         _output += "<!--";
-        writeLiteral(text, node);
+        writeLiteral(text, {node});
         _output += "-->";
         break;
     case XMLNodeKind::processingInstruction:
         if (isChecked() && (holds(text, "?>") || node.name().equalsIgnoringCase("xml") ||
                             (!text.isEmpty() && isWhite(text.view().front()))))
-            refuse("a processing instruction would not be read back as it is", node);
+            refuse("a processing instruction would not be read back as it is", {node});
         _output += "<?";
-        writeName(node.name(), node);
+        writeName(node.name(), {node});
         if (!text.isEmpty())
             _output += ' ';
-        writeLiteral(text, node);
+        writeLiteral(text, {node});
         _output += "?>";
         break;
     default:
@@ -199,19 +200,19 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
     }
 }
 
-void XMLSerializer::writeAttribute(const XMLNode& attribute) {
-    const std::string_view name = attribute.name();
+void XMLSerializer::writeAttribute(const String& name, std::string_view value,
+                                   const XMLElement* parent, const Place& place) {
     // An attribute that would declare a prefix a second time.
-    if (isChecked() && name.starts_with("xmlns") && attribute.parent() != nullptr) {
-        const std::string_view prefix = name.substr(std::min<std::size_t>(name.size(), 6));
-        if (name.size() == 5 || name[5] == ':')
-            for (const XMLNode& declared : attribute.parent()->asElement()->namespaces())
+    if (isChecked() && parent != nullptr && name.view().starts_with("xmlns")) {
+        const std::string_view prefix = name.view().substr(std::min<std::size_t>(name.size(), 6));
+        if (name.size() == 5 || name.view()[5] == ':')
+            for (const XMLNode& declared : parent->namespaces())
                 if (declared.name() == prefix)
-                    refuse("a namespace is declared twice", attribute);
+                    refuse("a namespace is declared twice", place);
     }
-    writeName(name, attribute);
+    writeName(name, place);
     _output += "=\"";
-    writeEscaped(attribute.stringValue(), Where::attribute, true, attribute);
+    writeEscaped(value, Where::attribute, true, place);
     _output += '"';
 }
 
@@ -219,21 +220,21 @@ void XMLSerializer::writeNamespace(const XMLNode& declaration) {
     _output += "xmlns";
     if (!declaration.name().isEmpty()) {
         _output += ':';
-        writeName(declaration.name(), declaration);
+        writeName(declaration.name(), {declaration});
     }
     _output += "=\"";
-    writeEscaped(declaration.stringValue(), Where::attribute, true, declaration);
+    writeEscaped(declaration.stringValue(), Where::attribute, true, {declaration});
     _output += '"';
 }
 
 // White space with a line break would be dropped as layout when the document is read again.
 void XMLSerializer::writeText(const XMLNode& text) {
     const String value = text.stringValue();
-    writeEscaped(value, Where::text, !text._isLayout && isWhite(value), text);
+    writeEscaped(value, Where::text, !text._isLayout && isWhite(value), {text});
 }
 
 void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escapesBreaks,
-                                 const XMLNode& node) {
+                                 const Place& place) {
     std::size_t written = 0;
     const auto replace = [&](std::size_t from, std::size_t to, std::string_view by) {
         _output.append(text, written, from - written);
@@ -250,7 +251,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
         const char32_t c = decodeCharacter(text, at);
         if (c >= 0x80) {
             if (isChecked() && !isXMLCharacter(c))
-                refuseText("a text holds what is no XML character", node);
+                refuse("a text holds what is no XML character", place);
             if (_encoder != nullptr && !_encoder->canEncode(c, text.substr(start, at - start)))
                 replace(start, at, "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";");
         } else if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
@@ -258,30 +259,30 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
                    (c == '\t' && where == Where::attribute) || (c == '\n' && escapesBreaks)) {
             replace(start, at, reference(byte));
         } else if (isChecked() && !isXMLCharacter(c)) {
-            refuseText("a text holds a control character", node);
+            refuse("a text holds a control character", place);
         }
     }
     _output.append(text, written);
 }
 
-void XMLSerializer::writeLiteral(std::string_view text, const XMLNode& node) {
+void XMLSerializer::writeLiteral(std::string_view text, const Place& place) {
     if (isChecked() && !isXMLText(text))
-        refuse("a text holds what is no XML character", node);
+        refuse("a text holds what is no XML character", place);
     if (_encoder != nullptr)
         for (std::size_t at = 0; at < text.size();) {
             const std::size_t start = at;
             const char32_t c = decodeCharacter(text, at);
             if (c >= 0x80 && !_encoder->canEncode(c, text.substr(start, at - start)))
-                refuse("the encoding lacks a character that cannot be referred to", node);
+                refuse("the encoding lacks a character that cannot be referred to", place);
         }
     _output += text;
 }
 
-void XMLSerializer::writeName(std::string_view name, const XMLNode& node) {
+void XMLSerializer::writeName(std::string_view name, const Place& place) {
     if (isChecked() && !isXMLName(name))
-        refuse("a name is no XML name", node);
+        refuse("a name is no XML name", place);
     if (_encoder != nullptr)
-        return writeLiteral(name, node);
+        return writeLiteral(name, place);
     _output += name;
 }
 
@@ -300,9 +301,10 @@ void XMLSerializer::breakLine(std::size_t depth) {
 
 XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
     Level level = _levels.empty() ? Level{false, false} : _levels.back();
-    for (const XMLNode& attribute : element.attributes())
-        if (attribute.name() == "xml:space")
-            level.preserves = attribute.stringValue() == "preserve";
+    element.forEachAttribute([&](const String& name, const String& value) {
+        if (name == "xml:space")
+            level.preserves = value == "preserve";
+    });
     bool hasMarkup = false;
     for (const XMLNode& child : element.children()) {
         if (level.isMixed)
@@ -315,14 +317,16 @@ XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
     return level;
 }
 
-// In an element, the text that it holds.
-void XMLSerializer::refuseText(std::string_view what, const XMLNode& node) {
-    const XMLNode* text = node.firstChild();
-    refuse(what, text != nullptr ? *text : node);
+const XMLNode& XMLSerializer::Place::spelledOut() const {
+    if (part == Part::itself)
+        return node;
+    return part == Part::text ? *node.firstChild()
+                              : *node.asElement()->attributeForName(*attributeName);
 }
 
-void XMLSerializer::refuse(std::string_view what, const XMLNode& node) {
-    throw Exception(Exception::invalidArgument, String::concat({what, " at ", placeOf(node)}));
+void XMLSerializer::refuse(std::string_view what, const Place& place) {
+    throw Exception(Exception::invalidArgument,
+                    String::concat({what, " at ", placeOf(place.spelledOut())}));
 }
 
 std::string placeOf(const XMLNode& node) {

@@ -31,6 +31,14 @@ private:
         bool isMixed;   // there is text here or around
         bool isInline() const noexcept { return preserves || isMixed; }
     };
+    // What is being written, for messages: a node, or what an element holds instead of one.
+    struct Place {
+        enum class Part : std::uint8_t { itself, text, attribute };
+        const XMLNode& node;
+        Part part = Part::itself;
+        const String* attributeName = nullptr;
+        const XMLNode& spelledOut() const;
+    };
     enum class Where { text, attribute };
 
     void writeDocument(const XMLDocument& document);
@@ -41,21 +49,21 @@ private:
     void endElement(const XMLElement& element);
     void startTag(const XMLElement& element);
     void endTag(const XMLElement& element);
-    void writeAttribute(const XMLNode& attribute);
+    void writeAttribute(const String& name, std::string_view value, const XMLElement* parent,
+                        const Place& place);
     void writeNamespace(const XMLNode& declaration);
     void writeText(const XMLNode& text);
-    void writeEscaped(std::string_view text, Where where, bool escapesBreaks, const XMLNode& node);
+    void writeEscaped(std::string_view text, Where where, bool escapesBreaks, const Place& place);
     // Text that nothing can be escaped in.
-    void writeLiteral(std::string_view text, const XMLNode& node);
-    void writeName(std::string_view name, const XMLNode& node);
+    void writeLiteral(std::string_view text, const Place& place);
+    void writeName(std::string_view name, const Place& place);
     void startLine(const XMLNode& child);
     void breakLine(std::size_t depth);
     Level levelOf(const XMLElement& element) const;
 
     bool has(XMLOptions option) const noexcept { return (_options & option) != 0; }
     bool isChecked() const noexcept { return _checks == XMLChecks::on; }
-    [[noreturn]] static void refuseText(std::string_view what, const XMLNode& node);
-    [[noreturn]] static void refuse(std::string_view what, const XMLNode& node);
+    [[noreturn]] static void refuse(std::string_view what, const Place& place);
 
     std::string& _output;
     XMLOptions _options;

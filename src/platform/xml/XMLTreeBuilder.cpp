@@ -24,14 +24,16 @@ inline XMLNode* XMLTreeBuilder::newNode(XMLNodeKind kind, String name, String va
         XMLNode(kind, std::move(name), std::move(value));
 }
 
-void XMLTreeBuilder::startElement(const String& name, std::size_t line, std::size_t column) {
+void XMLTreeBuilder::startElement(const String& name, std::size_t attributes, std::size_t line,
+                                  std::size_t column) {
     finishText();
     if (_open.size() >= _options.maximumDepth)
         throw ParseFailure(parseErrors::tooDeep, {_options.maximumDepth});
     requireSize(name.size(), parseErrors::nameTooLarge);
     const bool preserves = !_open.empty() && _open.back().preservesSpace;
     const std::size_t namespaces = _open.empty() ? 0 : _open.back().namespaces;
-    auto* element = ::new (_blocks.allocate(sizeof(XMLElement))) XMLElement(name);
+    const std::size_t room = XMLElement::roomFor(attributes);
+    auto* element = ::new (_blocks.allocate(XMLElement::sizeWith(room))) XMLElement(name, room);
     element->_line = saturated(line);
     element->_column = saturated(column);
     if (_open.empty())
@@ -53,8 +55,11 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
     requireSize(name.size(), parseErrors::nameTooLarge);
     requireSize(value.size(), parseErrors::valueTooLarge);
     XMLElement& element = *_open.back().element;
-    XMLSiblings::append(element, element._firstAttribute,
-                        newNode(XMLNodeKind::attribute, name, _values.valued(value)));
+    if (element.canHoldAttribute())
+        element.holdAttribute(name, _values.valued(value));
+    else
+        XMLSiblings::append(element, element._firstAttribute,
+                            newNode(XMLNodeKind::attribute, name, _values.valued(value)));
 }
 
 void XMLTreeBuilder::endElement() {

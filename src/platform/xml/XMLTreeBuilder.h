@@ -21,7 +21,8 @@ public:
     XMLTreeBuilder(XMLDocument& document, const XMLParseOptions& options)
         : _document(document), _options(options), _blocks(MemoryBlocks::ofNodes()) {}
 
-    void startElement(const String& name, std::size_t line, std::size_t column);
+    void startElement(const String& name, std::size_t attributes, std::size_t line,
+                      std::size_t column);
     // Of the element that was started last, before anything inside it.
     void addNamespace(const String& prefix, const String& URI);
     void addAttribute(const String& name, std::string_view value);
