@@ -79,7 +79,7 @@ public:
     }
 
     // Parse and unmarshall in one step; with the parser's error too.
-    qx::Ref<qx::Object> readString(std::string_view xml, qx::Ref<qx::Error>* error = nullptr);
+    qx::Ref<qx::Object> readString(qx::XMLBytes xml, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readFile(const qx::String& path, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readStream(std::istream& stream, qx::Ref<qx::Error>* error = nullptr);
     // Marshall and serialise in one step, one element a line. The string is null on failure; a file

@@ -35,7 +35,7 @@ Result written(Write write, Ref<Error>* error) {
 
 } // namespace
 
-Ref<qx::Object> QXXMLMarshaller::readString(std::string_view xml, Ref<Error>* error) {
+Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
     const auto document = XMLDocument::initWithData(xml, parseOptions(*this), error);
     return document ? unmarshall(document, error) : nullptr;
 }

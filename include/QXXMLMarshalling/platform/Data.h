@@ -21,6 +21,8 @@ public:
     const char* bytes() const noexcept { return _bytes; }
     std::size_t size() const noexcept { return _size; }
     std::string_view view() const noexcept { return {_bytes, _size}; }
+    // Whether a zero byte follows them, which is so for bytes of the object's own.
+    bool isTerminated() const noexcept { return _giveBack == nullptr; }
 
     // "<Data: N bytes>".
     String description() const override;

@@ -33,6 +33,27 @@ struct XMLParseOptions {
     std::size_t maximumTextSize = 10'000'000;
 };
 
+// The bytes of a document, lent for the time of a call. Those that a zero byte follows, as in a
+// std::string, are parsed where they stand; of others the parser makes a copy.
+class XMLBytes {
+public:
+    XMLBytes(std::string_view bytes) noexcept : _view(bytes) {}
+    XMLBytes(const std::string& text) noexcept : _view(text), _isTerminated(true) {}
+    XMLBytes(const String& text) noexcept : _view(text), _isTerminated(true) {}
+    XMLBytes(const Data& data) noexcept
+        : _view(data.view()), _isTerminated(data.isTerminated()) {}
+    // A null pointer gives no bytes.
+    XMLBytes(const char* text) noexcept
+        : _view(text != nullptr ? text : ""), _isTerminated(true) {}
+
+    std::string_view view() const noexcept { return _view; }
+    bool isTerminated() const noexcept { return _isTerminated; }
+
+private:
+    std::string_view _view;
+    bool _isTerminated = false;
+};
+
 class QX_API XMLDocument final : public XMLNode {
 public:
     // Reads a file: a path or a file: URL. An unreadable one is an error of qx::Error::cocoaDomain
@@ -43,10 +64,7 @@ public:
     static Ref<XMLDocument> initWithContentsOfFile(const String& path,
                                                    const XMLParseOptions& options = {},
                                                    Ref<Error>* error = nullptr);
-    static Ref<XMLDocument> initWithData(std::string_view bytes,
-                                         const XMLParseOptions& options = {},
-                                         Ref<Error>* error = nullptr);
-    static Ref<XMLDocument> initWithData(const Data& data, const XMLParseOptions& options = {},
+    static Ref<XMLDocument> initWithData(XMLBytes bytes, const XMLParseOptions& options = {},
                                          Ref<Error>* error = nullptr);
     // Reads to the stream's end.
     static Ref<XMLDocument> initWithStream(std::istream& stream,

@@ -190,9 +190,10 @@ SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLPa
     : _text(text), _document(document), _builder(document, options), _position(text) {
     static std::once_flag initialized;
     std::call_once(initialized, xmlInitParser);
-    _context.reset(xmlCreateMemoryParserCtxt(text.data(), static_cast<int>(text.size())));
+    _context.reset(xmlNewParserCtxt());
     if (_context == nullptr)
         throw std::bad_alloc();
+    pushInput();
     int flags = XML_PARSE_NOENT | XML_PARSE_NONET | XML_PARSE_IGNORE_ENC;
     if (options.maximumDepth > parsersDepth || options.maximumTextSize > parsersTextSize)
         flags |= XML_PARSE_HUGE;
@@ -210,6 +211,21 @@ SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLPa
 }
 
 SAXSession::~SAXSession() = default;
+
+// The parser's own memory inputs copy the text first. One without a buffer is read where it stands,
+// up to the zero byte.
+void SAXSession::pushInput() {
+    xmlParserInput* const input = xmlNewInputStream(_context.get());
+    if (input == nullptr)
+        throw std::bad_alloc();
+    input->base = input->cur = reinterpret_cast<const xmlChar*>(_text.data());
+    input->end = input->base + _text.size();
+    input->length = static_cast<int>(_text.size());
+    if (inputPush(_context.get(), input) >= 0)
+        return;
+    xmlFreeInputStream(input);
+    throw std::bad_alloc();
+}
 
 void SAXSession::run() {
     xmlParseDocument(_context.get());
@@ -263,19 +279,12 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
 // a reference. Most pieces are parts of the parser's buffer of the document; the parser hands
 // others out while it stands behind them, or behind the reference.
 void SAXSession::addText(std::string_view piece) {
-    const xmlParserInput& input = *_context->inputTab[0];
-    const auto address = [](const void* pointer) {
+    const auto address = [](const char* pointer) {
         return reinterpret_cast<std::uintptr_t>(pointer);
     };
-    const std::uintptr_t place = address(piece.data()) - address(input.base);
-    const bool isOwn = place < address(input.end) - address(input.base);
+    const bool isOwn = address(piece.data()) - address(_text.data()) < _text.size();
     const bool isLayout = isWhite(piece) && (isOwn || !isInsideReference());
-    if (isOwn) {
-        const std::size_t start = static_cast<std::size_t>(input.consumed) + place;
-        _builder.addText(_text.substr(start, piece.size()), isLayout, true);
-    } else {
-        _builder.addText(piece, isLayout, false);
-    }
+    _builder.addText(piece, isLayout, isOwn);
 }
 
 xmlEntityPtr SAXSession::entity(const xmlChar* name) {
@@ -347,10 +356,9 @@ void SAXSession::report(const xmlError& error) {
 std::size_t SAXSession::offset() const noexcept {
     if (_context->inputNr == 0)
         return 0;
-    const xmlParserInput& input = *_context->inputTab[0];
-    return std::min(static_cast<std::size_t>(input.consumed) +
-                        static_cast<std::size_t>(input.cur - input.base),
-                    _text.size());
+    const auto* cur = reinterpret_cast<const char*>(_context->inputTab[0]->cur);
+    // A parser that has stopped stands nowhere.
+    return std::min(static_cast<std::size_t>(cur - _text.data()), _text.size());
 }
 
 bool SAXSession::isInsideReference() const noexcept {

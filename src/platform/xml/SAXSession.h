@@ -18,7 +18,7 @@ namespace qx {
 
 class SAXSession {
 public:
-    // The text must outlive the session.
+    // The text must outlive the session; a zero byte follows it.
     SAXSession(std::string_view text, XMLDocument& document, const XMLParseOptions& options);
     ~SAXSession();
     SAXSession(const SAXSession&) = delete;
@@ -32,6 +32,7 @@ private:
     // Called by the C parser, each with a session as its first argument.
     struct Callbacks;
 
+    void pushInput();
     void startDocument();
     void startElement(XMLNames::Name local, XMLNames::Name prefix, int namespaceCount,
                       const xmlChar** namespaces, int attributeCount, int defaultedCount,

@@ -34,14 +34,9 @@ Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
     return data ? initWithData(*data, options, error) : nullptr;
 }
 
-Ref<XMLDocument> XMLDocument::initWithData(std::string_view bytes, const XMLParseOptions& options,
+Ref<XMLDocument> XMLDocument::initWithData(XMLBytes bytes, const XMLParseOptions& options,
                                            Ref<Error>* error) {
     return XMLParser::parse(bytes, options, error);
-}
-
-Ref<XMLDocument> XMLDocument::initWithData(const Data& data, const XMLParseOptions& options,
-                                           Ref<Error>* error) {
-    return XMLParser::parse(data.view(), options, error);
 }
 
 Ref<XMLDocument> XMLDocument::initWithStream(std::istream& stream, const XMLParseOptions& options,

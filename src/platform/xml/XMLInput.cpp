@@ -69,18 +69,25 @@ std::size_t countAttributes(std::string_view tag) {
 
 } // namespace
 
-void XMLInput::read(std::string_view bytes) {
+void XMLInput::read(XMLBytes bytes) {
     decodeBytes(bytes);
     checkStart();
     checkStartTags();
 }
 
-void XMLInput::decodeBytes(std::string_view bytes) {
+void XMLInput::lend(std::string_view bytes, bool isTerminated) {
+    _text = bytes;
+    if (!isTerminated)
+        _text = _converted = bytes;
+}
+
+void XMLInput::decodeBytes(XMLBytes given) {
+    std::string_view bytes = given.view();
     const EncodingSignature signature = encodingSignature(bytes);
     if (signature.encoding != nullptr) {
         bytes.remove_prefix(signature.markSize);
         if (isUTF8Name(signature.encoding))
-            _text = bytes;
+            lend(bytes, given.isTerminated());
         else
             convert(bytes, signature.encoding);
         _declaredEncoding = encodingInDeclaration(_text);
@@ -88,7 +95,7 @@ void XMLInput::decodeBytes(std::string_view bytes) {
     }
     _declaredEncoding = encodingInDeclaration(bytes);
     if (_declaredEncoding.isEmpty() || isUTF8Name(_declaredEncoding)) {
-        _text = bytes;
+        lend(bytes, given.isTerminated());
         return;
     }
     convert(bytes, _declaredEncoding);

@@ -1,9 +1,10 @@
 #pragma once
 
 // A document's bytes made ready for the parser: as UTF-8 without a byte-order mark, with nothing in
-// them that the parser would take unlimited time for. UTF-8 stays where it is and is not copied.
+// them that the parser would take unlimited time for. UTF-8 that a zero byte follows stays where it
+// is and is not copied.
 
-#include <QXXMLMarshalling/platform/String.h>
+#include <QXXMLMarshalling/platform/XMLDocument.h>
 
 #include <string>
 #include <string_view>
@@ -17,14 +18,16 @@ public:
     XMLInput& operator=(const XMLInput&) = delete;
 
     // Lends the bytes. Throws ParseFailure; text() is then what could be read up to its place.
-    void read(std::string_view bytes);
+    void read(XMLBytes bytes);
 
+    // A zero byte follows it.
     std::string_view text() const noexcept { return _text; }
     // As the XML declaration names it; null where it names none.
     const String& declaredEncoding() const noexcept { return _declaredEncoding; }
 
 private:
-    void decodeBytes(std::string_view bytes);
+    void decodeBytes(XMLBytes bytes);
+    void lend(std::string_view bytes, bool isTerminated);
     void convert(std::string_view bytes, const String& encoding);
     void checkStart() const;
     void checkStartTags() const;

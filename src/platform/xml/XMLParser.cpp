@@ -5,7 +5,7 @@
 
 namespace qx {
 
-Ref<XMLDocument> XMLParser::parse(std::string_view bytes, const XMLParseOptions& options,
+Ref<XMLDocument> XMLParser::parse(XMLBytes bytes, const XMLParseOptions& options,
                                   Ref<Error>* error) {
     XMLInput input;
     try {

@@ -12,7 +12,7 @@ namespace qx {
 class XMLParser {
 public:
     // Null with an error for what is no well-formed XML, cannot be decoded, or exceeds a limit.
-    static Ref<XMLDocument> parse(std::string_view bytes, const XMLParseOptions& options,
+    static Ref<XMLDocument> parse(XMLBytes bytes, const XMLParseOptions& options,
                                   Ref<Error>* error);
 };
 
