@@ -5,6 +5,7 @@
 // next step. Small dictionaries are scanned, larger ones carry an index.
 
 #include <QXXMLMarshalling/platform/ObjectMemory.h>
+#include <QXXMLMarshalling/platform/ShortVector.h>
 #include <QXXMLMarshalling/platform/Value.h>
 
 #include <vector>
@@ -74,8 +75,7 @@ public:
     // Neither may be null.
     bool add(const String& key, Value&& value) {
         // The first few keys of most dictionaries are names, which tell themselves apart.
-        const bool isFew = _allInterned && key.isInterned() && _index.empty() &&
-                           _entries.size() < _entries.capacity();
+        const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
         if (!isFew || value.isNull())
             return addAny(key, std::move(value));
         for (const Entry& entry : _entries)
@@ -114,15 +114,19 @@ protected:
     const Class& describedClass() const override;
 
 private:
+    // Most records hold no more keys.
+    static constexpr std::uint32_t usualSize = 4;
+    // Up to that many are scanned.
+    static constexpr std::size_t fewKeys = 8;
+
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
     bool addAny(const String& key, Value&& value);
     void append(const String& key, Value&& value);
-    void prepareForOne();
     void makeRoom();
     void changed() noexcept { ++_changes; }
 
-    std::vector<Entry, ObjectAllocator<Entry>> _entries;
+    ShortVector<Entry, usualSize> _entries;
     std::vector<std::uint32_t> _index; // open addressing, position + 1; empty while scanned
     std::size_t _count = 0;
     std::size_t _changes = 0;

@@ -8,15 +8,9 @@
 #include "platform/object/Printing.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace qx {
-
-namespace {
-
-// Room for the first few keys at once: most records hold no more.
-constexpr std::size_t usualSize = 4;
-
-} // namespace
 
 Dictionary::~Dictionary() = default;
 
@@ -78,8 +72,8 @@ bool Dictionary::addAny(const String& key, Value&& value) {
 }
 
 inline void Dictionary::append(const String& key, Value&& value) {
-    if (_entries.size() == _entries.capacity() || _entries.size() >= nameindex::scanLimit)
-        prepareForOne();
+    if (nameindex::isFull(_index, _entries.size()))
+        makeRoom();
     _entries.emplace_back(key, std::move(value));
     _allInterned = _allInterned && key.isInterned();
     if (!_index.empty())
@@ -87,16 +81,9 @@ inline void Dictionary::append(const String& key, Value&& value) {
     ++_count;
 }
 
-void Dictionary::prepareForOne() {
-    if (nameindex::isFull(_index, _entries.size()))
-        makeRoom();
-    if (_entries.capacity() == 0)
-        _entries.reserve(usualSize);
-}
-
 // Drops the places of removed keys and gives the index twice the room.
 void Dictionary::makeRoom() {
-    std::erase_if(_entries, [](const Entry& entry) { return entry.key.isNull(); });
+    _entries.eraseIf([](const Entry& entry) { return entry.key.isNull(); });
     _index = nameindex::tableFor(_entries.size() + 1);
     if (_index.empty())
         return;
@@ -113,7 +100,7 @@ void Dictionary::remove(const String& key) {
     --_count;
     const Entry removed = std::exchange(_entries[position], Entry());
     if (_index.empty())
-        _entries.erase(_entries.begin() + static_cast<std::ptrdiff_t>(position));
+        _entries.erase(position);
 }
 
 void Dictionary::removeAll() {
@@ -121,7 +108,10 @@ void Dictionary::removeAll() {
     _count = 0;
     _index.clear();
     _allInterned = true;
-    const auto removed = std::exchange(_entries, {});
+    // What ends with its last count may lead back to this dictionary.
+    const std::vector<Entry> removed(std::make_move_iterator(_entries.begin()),
+                                     std::make_move_iterator(_entries.end()));
+    _entries.clear();
 }
 
 Ref<Array> Dictionary::allKeys() const {

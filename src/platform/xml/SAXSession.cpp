@@ -31,6 +31,8 @@ constexpr std::size_t maximumDeclarations = 20'000;
 constexpr std::size_t nodeCost = 16;
 constexpr std::size_t referenceCost = 32;
 
+std::uintptr_t addressOf(const void* place) { return reinterpret_cast<std::uintptr_t>(place); }
+
 std::size_t lengthOf(const xmlChar* text) {
     return text != nullptr ? std::string_view(reinterpret_cast<const char*>(text)).size() : 0;
 }
@@ -276,13 +278,10 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
 }
 
 // White space counts as layout only where it stands in the document itself: not when it comes from
-// a reference. Most pieces are parts of the parser's buffer of the document; the parser hands
-// others out while it stands behind them, or behind the reference.
+// a reference. Most pieces are parts of the document's text; the parser hands others out while it
+// stands behind them, or behind the reference.
 void SAXSession::addText(std::string_view piece) {
-    const auto address = [](const char* pointer) {
-        return reinterpret_cast<std::uintptr_t>(pointer);
-    };
-    const bool isOwn = address(piece.data()) - address(_text.data()) < _text.size();
+    const bool isOwn = addressOf(piece.data()) - addressOf(_text.data()) < _text.size();
     const bool isLayout = isWhite(piece) && (isOwn || !isInsideReference());
     _builder.addText(piece, isLayout, isOwn);
 }
@@ -356,9 +355,8 @@ void SAXSession::report(const xmlError& error) {
 std::size_t SAXSession::offset() const noexcept {
     if (_context->inputNr == 0)
         return 0;
-    const auto* cur = reinterpret_cast<const char*>(_context->inputTab[0]->cur);
     // A parser that has stopped stands nowhere.
-    return std::min(static_cast<std::size_t>(cur - _text.data()), _text.size());
+    return std::min(addressOf(_context->inputTab[0]->cur) - addressOf(_text.data()), _text.size());
 }
 
 bool SAXSession::isInsideReference() const noexcept {

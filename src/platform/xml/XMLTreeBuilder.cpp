@@ -102,9 +102,10 @@ void XMLTreeBuilder::placeText(bool endsElement) {
     const bool isLayout =
         _textIsLayout && (text.front() == '\n' || text.find('\n') != std::string_view::npos);
     if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
-        const std::string_view kept =
-            _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting;
-        _layouts.push_back({open.element->lastChild(), kept});
+        // No text follows that would have it kept once the element ends.
+        if (!endsElement)
+            _layouts.push_back({XMLNode::lastOf(open.element->_firstChild),
+                                _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting});
     } else if (endsElement && !isLayout && open.element->_childCount == 0 &&
                _layouts.size() == open.firstLayout) {
         open.element->holdText(_values.valued(text));
