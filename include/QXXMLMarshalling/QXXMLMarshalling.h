@@ -38,6 +38,7 @@
 #include <QXXMLMarshalling/platform/Observation.h>
 #include <QXXMLMarshalling/platform/ProcessInfo.h>
 #include <QXXMLMarshalling/platform/Ref.h>
+#include <QXXMLMarshalling/platform/ShortVector.h>
 #include <QXXMLMarshalling/platform/String.h>
 #include <QXXMLMarshalling/platform/UndoManager.h>
 #include <QXXMLMarshalling/platform/UndoableObject.h>
