@@ -282,8 +282,7 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
 // stands behind them, or behind the reference.
 void SAXSession::addText(std::string_view piece) {
     const bool isOwn = addressOf(piece.data()) - addressOf(_text.data()) < _text.size();
-    const bool isLayout = isWhite(piece) && (isOwn || !isInsideReference());
-    _builder.addText(piece, isLayout, isOwn);
+    _builder.addText(piece, isOwn || !isInsideReference(), isOwn);
 }
 
 xmlEntityPtr SAXSession::entity(const xmlChar* name) {

@@ -17,13 +17,13 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
 
 // Space, tab, line feed and carriage return.
 constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
-// Layout is blanks for the most part: those are looked at eight at a time.
+// Layout is blanks for the most part: those are looked at four at a time.
 inline bool isWhite(std::string_view text) noexcept {
     const char* at = text.data();
     const char* const end = at + text.size();
     while (at != end) {
-        if (end - at >= 8 && std::memcmp(at, "        ", 8) == 0)
-            at += 8;
+        if (end - at >= 4 && std::memcmp(at, "    ", 4) == 0)
+            at += 4;
         else if (isWhite(*at))
             ++at;
         else

@@ -2,6 +2,7 @@
 
 #include "platform/xml/ParseFailure.h"
 #include "platform/xml/Siblings.h"
+#include "platform/xml/XMLCharacters.h"
 
 #include <algorithm>
 #include <libxml/xmlerror.h>
@@ -63,22 +64,18 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
 }
 
 void XMLTreeBuilder::endElement() {
-    if (!_lasting.empty() || !_joined.empty())
+    if (hasPendingText())
         placeText(true);
-    dropLayout(_open.back());
+    if (_layouts.size() != _open.back().firstLayout)
+        dropLayout(_open.back());
     _open.pop_back();
 }
 
-void XMLTreeBuilder::addText(std::string_view piece, bool isLayout, bool isLasting) {
+void XMLTreeBuilder::joinText(std::string_view piece, bool mayBeLayout) {
     if (_open.empty())
         return;
     requireSize(_lasting.size() + _joined.size() + piece.size(), parseErrors::textTooLarge);
-    const bool isFirst = _lasting.empty() && _joined.empty();
-    _textIsLayout = isLayout && (isFirst || _textIsLayout);
-    if (isFirst && isLasting) {
-        _lasting = piece;
-        return;
-    }
+    _mayBeLayout = mayBeLayout && (!hasPendingText() || _mayBeLayout);
     _joined += _lasting;
     _joined += piece;
     _lasting = {};
@@ -96,11 +93,16 @@ void XMLTreeBuilder::addProcessingInstruction(const String& target, std::string_
     appendToCurrent(XMLNode::initProcessingInstructionWithName(target, data));
 }
 
+// White space of the document's own with a line break.
+inline bool XMLTreeBuilder::isLayout(std::string_view text) const noexcept {
+    return _mayBeLayout && isWhite(text.front()) && isWhite(text) &&
+           (text.front() == '\n' || text.find('\n') != std::string_view::npos);
+}
+
 void XMLTreeBuilder::placeText(bool endsElement) {
     OpenElement& open = _open.back();
     const std::string_view text = _lasting.empty() ? std::string_view(_joined) : _lasting;
-    const bool isLayout =
-        _textIsLayout && (text.front() == '\n' || text.find('\n') != std::string_view::npos);
+    const bool isLayout = this->isLayout(text);
     if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
         // No text follows that would have it kept once the element ends.
         if (!endsElement)

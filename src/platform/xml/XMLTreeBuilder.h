@@ -29,9 +29,15 @@ public:
     void setPreservesSpace(bool preserves) { _open.back().preservesSpace = preserves; }
     void endElement();
 
-    // A piece of text. `isLayout`: white space that stands in the document as such; `isLasting`:
-    // the piece stays where it is until the document is finished.
-    void addText(std::string_view piece, bool isLayout, bool isLasting);
+    // A piece of text. `mayBeLayout`: white space would be the document's own, not a reference's;
+    // `isLasting`: the piece stays where it is until the document is finished.
+    void addText(std::string_view piece, bool mayBeLayout, bool isLasting) {
+        const bool isWhole = isLasting && !hasPendingText() && !_open.empty();
+        if (!isWhole || piece.size() > _options.maximumTextSize)
+            return joinText(piece, mayBeLayout);
+        _lasting = piece;
+        _mayBeLayout = mayBeLayout;
+    }
     void addComment(std::string_view text);
     void addProcessingInstruction(const String& target, std::string_view data);
 
@@ -50,10 +56,13 @@ private:
     };
 
     XMLNode* newNode(XMLNodeKind kind, String name, String value);
+    bool hasPendingText() const noexcept { return !_lasting.empty() || !_joined.empty(); }
+    void joinText(std::string_view piece, bool mayBeLayout);
     void finishText() {
-        if (!_lasting.empty() || !_joined.empty())
+        if (hasPendingText())
             placeText();
     }
+    bool isLayout(std::string_view text) const noexcept;
     // Of an element that has nothing else the text is held by the element itself.
     void placeText(bool endsElement = false);
     void appendText(std::string_view text, bool isLayout, XMLNode* before);
@@ -74,7 +83,7 @@ private:
     // The current text: one lasting piece, or several joined.
     std::string_view _lasting;
     std::string _joined;
-    bool _textIsLayout = false;
+    bool _mayBeLayout = false;
     std::vector<Layout> _layouts;
     std::deque<std::string> _joinedLayouts; // texts of these that came in several pieces
     SharedValues _values;
