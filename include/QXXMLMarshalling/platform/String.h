@@ -85,6 +85,7 @@ private:
     friend class Selector;
     friend class Value;
     friend struct NameTable;
+    friend class SharedValues;
 
     struct Rep {
         std::atomic<std::uint32_t> count;
@@ -94,12 +95,15 @@ private:
     static constexpr std::uint32_t immortalBit = 0x80000000U;
     static constexpr std::uint32_t internedBit = 0x40000000U;
     static constexpr std::uint32_t propertyBit = 0x20000000U; // see Key::namesProperty
+    static constexpr std::uint32_t blockBit = 0x10000000U;    // in memory shared with others
 
     explicit String(Rep* rep) noexcept : _rep(rep) {}
     static const char* text(const Rep* rep) noexcept {
         return reinterpret_cast<const char*>(rep + 1);
     }
     static Rep* allocate(std::size_t size, std::uint32_t count);
+    // For the many short texts of a document.
+    static String inBlock(std::string_view text);
     static void destroy(Rep* rep) noexcept;
 
     void retain() const noexcept {
@@ -109,7 +113,7 @@ private:
     void release() const noexcept {
         if (_rep == nullptr || (_rep->count.load(std::memory_order_relaxed) & immortalBit) != 0)
             return;
-        if (count::decrease(_rep->count) == 1)
+        if ((count::decrease(_rep->count) & ~blockBit) == 1)
             destroy(_rep);
     }
 

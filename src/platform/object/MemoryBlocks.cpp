@@ -6,18 +6,21 @@ namespace qx {
 
 namespace {
 
-// A host may keep a few of many objects, but seldom a few of a document's nodes.
+// A host may keep a few of many texts or objects, but seldom a few of a document's nodes.
 constexpr std::size_t nodeBlockSize = 64 * 1024 - 64;
 constexpr std::size_t objectBlockSize = 8 * 1024 - 64;
+constexpr std::size_t textBlockSize = 4 * 1024 - 64;
 
 // Without destructors, so that they can be used until the very end of the thread.
 [[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks nodesOfThread(nodeBlockSize);
 [[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
     objectsOfThread(objectBlockSize);
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks textsOfThread(textBlockSize);
 
 } // namespace
 
 MemoryBlocks& MemoryBlocks::ofNodes() noexcept { return nodesOfThread; }
+MemoryBlocks& MemoryBlocks::ofTexts() noexcept { return textsOfThread; }
 MemoryBlocks& MemoryBlocks::ofObjects() noexcept { return objectsOfThread; }
 
 inline void MemoryBlocks::giveUp(Block* block, std::uint32_t things) noexcept {
@@ -31,6 +34,7 @@ void MemoryBlocks::begin(std::size_t whole) {
     struct Retirement {
         ~Retirement() {
             nodesOfThread.retire();
+            textsOfThread.retire();
             objectsOfThread.retire();
             hasRetired = true;
         }

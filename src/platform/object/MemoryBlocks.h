@@ -1,9 +1,9 @@
 #pragma once
 
-// Memory for things that are made in one go and mostly die together: the nodes of a document, the
-// objects that are read from it. They are cut from blocks, one after the other, and a block is
-// given back when the last thing in it is gone. So what is kept for long keeps its block: some
-// hundred nodes, some dozen objects. Each thread cuts from blocks of its own; any thread may
+// Memory for things that are made in one go and mostly die together: the nodes of a document, its
+// texts, the objects that are read from it. They are cut from blocks, one after the other, and a
+// block is given back when the last thing in it is gone. So what is kept for long keeps its block:
+// some hundred nodes, some dozen objects or texts. Each thread cuts from blocks of its own; any thread may
 // release anything.
 
 #include <atomic>
@@ -33,6 +33,7 @@ public:
     // The calling thread's, good until the thread ends. What lives differently long does not share
     // blocks.
     static MemoryBlocks& ofNodes() noexcept;
+    static MemoryBlocks& ofTexts() noexcept;
     static MemoryBlocks& ofObjects() noexcept;
 
     // Aligned like pointers, or for any scalar with a Unit of that size. Only small sizes are worth

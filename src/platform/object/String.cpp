@@ -1,5 +1,6 @@
 #include <QXXMLMarshalling/platform/String.h>
 
+#include "platform/object/MemoryBlocks.h"
 #include "platform/object/Unicode.h"
 
 #include <cstring>
@@ -10,15 +11,31 @@
 namespace qx {
 
 String::Rep* String::allocate(std::size_t size, std::uint32_t count) {
-    void* memory = ::operator new(sizeof(Rep) + size + 1);
+    const bool isShared = (count & blockBit) != 0;
+    const std::size_t whole = sizeof(Rep) + size + 1;
+    void* const memory =
+        isShared ? MemoryBlocks::ofTexts().allocate(whole) : ::operator new(whole);
     auto* rep = new (memory) Rep{{count}, {0}, size};
     reinterpret_cast<char*>(rep + 1)[size] = '\0';
     return rep;
 }
 
 void String::destroy(Rep* rep) noexcept {
+    const bool isShared = (rep->count.load(std::memory_order_relaxed) & blockBit) != 0;
     rep->~Rep();
-    ::operator delete(rep);
+    if (isShared)
+        MemoryBlocks::release(rep);
+    else
+        ::operator delete(rep);
+}
+
+String String::inBlock(std::string_view text) {
+    constexpr std::size_t longest = 256;
+    if (text.empty() || text.size() > longest)
+        return text;
+    Rep* const rep = allocate(text.size(), blockBit | 1U);
+    std::memcpy(reinterpret_cast<char*>(rep + 1), text.data(), text.size());
+    return String(rep);
 }
 
 String::String(std::string_view text) {

@@ -15,11 +15,11 @@ class SharedValues {
 public:
     String valued(std::string_view text) {
         if (text.empty() || text.size() > longest)
-            return text;
+            return String::inBlock(text);
         const Digits digits = digitsOf(text);
         Entry& entry = _entries[slot(digits)];
         if (entry.digits != digits || entry.size != text.size())
-            entry = {digits, text.size(), String(text)};
+            entry = {digits, text.size(), String::inBlock(text)};
         return entry.value;
     }
 
