@@ -54,7 +54,7 @@ String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) 
     const auto document = marshall(object, error);
     if (!document)
         return nullptr;
-    return written<String>([&] { return String(document->XMLData(layout)); }, error);
+    return written<String>([&] { return document->XMLString(layout); }, error);
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {

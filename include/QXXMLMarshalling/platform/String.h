@@ -86,6 +86,7 @@ private:
     friend class Value;
     friend struct NameTable;
     friend class SharedValues;
+    friend class TextBuffer;
 
     struct Rep {
         std::atomic<std::uint32_t> count;
@@ -105,6 +106,8 @@ private:
     // For the many short texts of a document.
     static String inBlock(std::string_view text);
     static void destroy(Rep* rep) noexcept;
+    // A text that nobody shares, with room for that many bytes; null makes a new one.
+    static Rep* resized(Rep* rep, std::size_t size);
 
     void retain() const noexcept {
         if (_rep != nullptr && (_rep->count.load(std::memory_order_relaxed) & immortalBit) == 0)

@@ -111,6 +111,8 @@ private:
     friend class XMLParser;
 
     XMLDocument() noexcept;
+    template <class Use>
+    auto withBytes(XMLOptions options, Use use) const;
     void unlink(XMLNode& node) noexcept;
 
     XMLNode* _firstChild = nullptr;

@@ -3,6 +3,7 @@
 #include "platform/object/MemoryBlocks.h"
 #include "platform/object/Unicode.h"
 
+#include <cstdlib>
 #include <cstring>
 #include <new>
 
@@ -10,12 +11,26 @@
 
 namespace qx {
 
+// Memory that the C library can resize in place.
+String::Rep* String::resized(Rep* rep, std::size_t size) {
+    if (size > SIZE_MAX - sizeof(Rep) - 1)
+        throw std::bad_alloc();
+    void* const memory = std::realloc(static_cast<void*>(rep), sizeof(Rep) + size + 1);
+    if (memory == nullptr)
+        throw std::bad_alloc();
+    auto* const resized = new (memory) Rep{{1}, {0}, size};
+    reinterpret_cast<char*>(resized + 1)[size] = '\0';
+    return resized;
+}
+
 String::Rep* String::allocate(std::size_t size, std::uint32_t count) {
-    const bool isShared = (count & blockBit) != 0;
-    const std::size_t whole = sizeof(Rep) + size + 1;
-    void* const memory =
-        isShared ? MemoryBlocks::ofTexts().allocate(whole) : ::operator new(whole);
-    auto* rep = new (memory) Rep{{count}, {0}, size};
+    if ((count & blockBit) == 0) {
+        Rep* const rep = resized(nullptr, size);
+        rep->count.store(count, std::memory_order_relaxed);
+        return rep;
+    }
+    auto* const rep = new (MemoryBlocks::ofTexts().allocate(sizeof(Rep) + size + 1))
+        Rep{{count}, {0}, size};
     reinterpret_cast<char*>(rep + 1)[size] = '\0';
     return rep;
 }
@@ -26,7 +41,7 @@ void String::destroy(Rep* rep) noexcept {
     if (isShared)
         MemoryBlocks::release(rep);
     else
-        ::operator delete(rep);
+        std::free(rep);
 }
 
 String String::inBlock(std::string_view text) {

@@ -88,24 +88,33 @@ void XMLDocument::addChild(Ref<XMLNode> child) {
 
 void XMLDocument::unlink(XMLNode& node) noexcept { XMLSiblings::remove(_firstChild, node); }
 
-std::string XMLDocument::XMLData(XMLOptions options) const {
-    std::string text;
+// Calls use(bytes) with the document's bytes in its encoding.
+template <class Use>
+auto XMLDocument::withBytes(XMLOptions options, Use use) const {
+    TextBuffer text;
     if (_encoding.isEmpty() || isUTF8Name(_encoding)) {
         XMLSerializer(text, options, XMLChecks::on).write(*this);
-        return text;
+        return use(text.view());
     }
     TextEncoder encoder(_encoding);
     XMLSerializer(text, options, XMLChecks::on, &encoder).write(*this);
-    return encoder.encoded(text);
+    return use(encoder.encoded(text.view()));
+}
+
+std::string XMLDocument::XMLData(XMLOptions options) const {
+    return withBytes(options, [](auto&& bytes) { return std::string(std::move(bytes)); });
 }
 
 bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error) const {
-    return writeFileAtomically(path, XMLData(options), error);
+    return withBytes(options, [&](std::string_view bytes) {
+        return writeFileAtomically(path, bytes, error);
+    });
 }
 
 bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error) const {
-    const std::string bytes = XMLData(options);
-    stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    withBytes(options, [&](std::string_view bytes) {
+        stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    });
     if (stream.flush())
         return true;
     return fail(error, errors::streamNotWritten);

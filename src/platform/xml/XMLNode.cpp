@@ -13,9 +13,9 @@ namespace {
 String present(const String& text) { return text.isNull() ? String("") : text; }
 
 String written(const XMLNode& node, XMLOptions options, XMLChecks checks) {
-    std::string text;
+    TextBuffer text;
     XMLSerializer(text, options, checks).write(node);
-    return text;
+    return text.take();
 }
 
 } // namespace

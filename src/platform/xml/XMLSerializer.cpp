@@ -237,7 +237,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
                                  const Place& place) {
     std::size_t written = 0;
     const auto replace = [&](std::size_t from, std::size_t to, std::string_view by) {
-        _output.append(text, written, from - written);
+        _output += text.substr(written, from - written);
         _output += by;
         written = to;
     };
@@ -262,7 +262,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
             refuse("a text holds a control character", place);
         }
     }
-    _output.append(text, written);
+    _output += text.substr(written);
 }
 
 void XMLSerializer::writeLiteral(std::string_view text, const Place& place) {

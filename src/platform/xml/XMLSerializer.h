@@ -1,10 +1,12 @@
 #pragma once
 
-// Writes nodes as XML text, appending to a string. Works without recursion: a tree may be of any
+// Writes nodes as XML text, appending to a buffer. Works without recursion: a tree may be of any
 // depth. With checks on it raises NSInvalidArgumentException, naming the place, rather than write
 // what would not be XML, or what the encoding to come cannot hold; without, it writes all as it is.
 
 #include <QXXMLMarshalling/platform/XMLDocument.h>
+
+#include "platform/object/TextBuffer.h"
 
 #include <string>
 #include <vector>
@@ -18,7 +20,7 @@ enum class XMLChecks : bool { off, on };
 class XMLSerializer {
 public:
     // Characters that the encoder lacks, where one is given, become character references.
-    XMLSerializer(std::string& output, XMLOptions options, XMLChecks checks,
+    XMLSerializer(TextBuffer& output, XMLOptions options, XMLChecks checks,
                   TextEncoder* encoder = nullptr)
         : _output(output), _options(options), _checks(checks), _encoder(encoder) {}
 
@@ -65,7 +67,7 @@ private:
     bool isChecked() const noexcept { return _checks == XMLChecks::on; }
     [[noreturn]] static void refuse(std::string_view what, const Place& place);
 
-    std::string& _output;
+    TextBuffer& _output;
     XMLOptions _options;
     XMLChecks _checks;
     TextEncoder* _encoder;
