@@ -126,11 +126,15 @@ private:
     void makeRoom();
     void changed() noexcept { ++_changes; }
 
-    ShortVector<Entry, usualSize> _entries;
-    std::vector<std::uint32_t> _index; // open addressing, position + 1; empty while scanned
-    std::size_t _count = 0;
-    std::size_t _changes = 0;
+    using Index = std::vector<std::uint32_t>; // see NameIndex.h
+    static const Index noIndex;
+    const Index& index() const noexcept { return _index ? *_index : noIndex; }
+
     bool _allInterned = true; // the keys, removed ones too
+    ShortVector<Entry, usualSize> _entries;
+    std::unique_ptr<Index> _index; // null while the entries are scanned
+    std::uint32_t _count = 0;
+    std::uint32_t _changes = 0;
 };
 
 } // namespace qx

@@ -142,9 +142,9 @@ private:
     void destroy() const noexcept;
     Extras& extras() const;
 
-    mutable std::atomic<std::uint32_t> _count{1};
     mutable std::atomic<const Class*> _isa{nullptr};
     mutable Extras* _extras = nullptr;
+    mutable std::atomic<std::uint32_t> _count{1}; // last: small members of other classes fit behind
 };
 
 // What weak references hold on to: it outlives its object and then yields null.

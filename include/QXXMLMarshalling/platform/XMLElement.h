@@ -126,7 +126,6 @@ private:
           _heldRoom(static_cast<std::uint8_t>(heldRoom)) {}
     void unlink(XMLNode& node) noexcept;
 
-    // These fill the hole that the base class leaves.
     std::uint8_t _heldCount = 0;
     std::uint8_t _heldRoom;
     std::uint32_t _childCount = 0;

@@ -152,22 +152,22 @@ protected:
     friend struct XMLSiblings;
 
     XMLNode(XMLNodeKind kind, String name, String value) noexcept
-        : _name(std::move(name)), _value(std::move(value)), _kind(kind) {}
+        : _kind(kind), _name(std::move(name)), _value(std::move(value)) {}
     const Class& describedClass() const override;
     static XMLNode* lastOf(XMLNode* first) noexcept {
         return first != nullptr ? first->_previous : nullptr;
     }
 
-    XMLNode* _parent = nullptr; // owns this node
-    XMLNode* _next = nullptr;
-    XMLNode* _previous = nullptr; // of the first of its siblings: the last one
-    String _name;
-    String _value;
     XMLNodeKind _kind;
     // A text of white space that stood in a parsed document as such, and was asked to be kept. It
     // is written as it is; the line breaks of any other such text are escaped, so that it is read
     // back.
     bool _isLayout = false;
+    XMLNode* _parent = nullptr; // owns this node
+    XMLNode* _next = nullptr;
+    XMLNode* _previous = nullptr; // of the first of its siblings: the last one
+    String _name;
+    String _value;
 };
 
 inline XMLNodeRange::Iterator& XMLNodeRange::Iterator::operator++() noexcept {

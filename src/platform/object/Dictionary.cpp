@@ -12,6 +12,8 @@
 
 namespace qx {
 
+constinit const Dictionary::Index Dictionary::noIndex;
+
 Dictionary::~Dictionary() = default;
 
 void Dictionary::checkUnchanged(std::size_t changes) const {
@@ -22,7 +24,7 @@ void Dictionary::checkUnchanged(std::size_t changes) const {
 inline std::size_t Dictionary::positionOf(const String& key) const noexcept {
     if (key.isNull())
         return nameindex::none;
-    return nameindex::find(_index, _entries.size(), key, _allInterned,
+    return nameindex::find(index(), _entries.size(), key, _allInterned,
                            [this](std::size_t i) -> const String& { return _entries[i].key; });
 }
 
@@ -72,23 +74,24 @@ bool Dictionary::addAny(const String& key, Value&& value) {
 }
 
 inline void Dictionary::append(const String& key, Value&& value) {
-    if (nameindex::isFull(_index, _entries.size()))
+    if (nameindex::isFull(index(), _entries.size()))
         makeRoom();
     _entries.emplace_back(key, std::move(value));
     _allInterned = _allInterned && key.isInterned();
-    if (!_index.empty())
-        nameindex::add(_index, key, _entries.size() - 1);
+    if (_index)
+        nameindex::add(*_index, key, _entries.size() - 1);
     ++_count;
 }
 
 // Drops the places of removed keys and gives the index twice the room.
 void Dictionary::makeRoom() {
     _entries.eraseIf([](const Entry& entry) { return entry.key.isNull(); });
-    _index = nameindex::tableFor(_entries.size() + 1);
-    if (_index.empty())
+    Index index = nameindex::tableFor(_entries.size() + 1);
+    _index = index.empty() ? nullptr : std::make_unique<Index>(std::move(index));
+    if (!_index)
         return;
     for (std::size_t i = 0; i < _entries.size(); ++i)
-        nameindex::add(_index, _entries[i].key, i);
+        nameindex::add(*_index, _entries[i].key, i);
 }
 
 // A removed entry keeps its place, so that the index stays true.
@@ -99,14 +102,14 @@ void Dictionary::remove(const String& key) {
     changed();
     --_count;
     const Entry removed = std::exchange(_entries[position], Entry());
-    if (_index.empty())
+    if (!_index)
         _entries.erase(position);
 }
 
 void Dictionary::removeAll() {
     changed();
     _count = 0;
-    _index.clear();
+    _index.reset();
     _allInterned = true;
     // What ends with its last count may lead back to this dictionary.
     const std::vector<Entry> removed(std::make_move_iterator(_entries.begin()),

@@ -46,8 +46,8 @@ void requireChild(const XMLNode* child, const XMLElement& element) {
 
 } // namespace
 
-// Documents hold millions of elements: the count of children fills a hole, lists keep one end.
-static_assert(sizeof(void*) != 8 || (sizeof(XMLElement) <= 112 && sizeof(XMLNode) <= 80));
+// Documents hold millions of elements: small members fill holes, lists keep one end.
+static_assert(sizeof(void*) != 8 || (sizeof(XMLElement) <= 112 && sizeof(XMLNode) <= 72));
 
 XMLElement::~XMLElement() {
     dropHeldAttributes();
