@@ -55,60 +55,56 @@ void ElementSource::indexIfWorthIt() {
     index();
 }
 
-template <class Visit>
-void ElementSource::forEachNamed(const String& name, Visit visit) {
-    indexIfWorthIt();
-    if (_children && _children->indexed) {
-        const auto run = _children->runs.find(name);
-        if (run == _children->runs.end())
-            return;
-        auto& list = _children->list;
-        for (std::uint32_t i = run->second.first; i != none; i = list[i].next)
-            if (!visit(static_cast<XMLElement&>(*list[i].node)))
-                return;
+ElementSource::Walk::Walk(ElementSource& source, String name) : _name(std::move(name)) {
+    source.indexIfWorthIt();
+    if (!source._children) {
+        _child = source._element.firstChild();
         return;
     }
-    const auto matches = [&](const XMLNode& node) {
-        return node.isElement() && node.name() == name;
-    };
-    if (_children) {
-        for (const Child& child : _children->list)
-            if (!child.taken && matches(*child.node) &&
-                !visit(static_cast<XMLElement&>(*child.node)))
-                return;
-    } else {
-        for (XMLNode& child : _element.children())
-            if (matches(child) && !visit(static_cast<XMLElement&>(child)))
-                return;
+    _list = &source._children->list;
+    _isIndexed = source._children->indexed;
+    if (!_isIndexed)
+        return;
+    const auto run = source._children->runs.find(_name);
+    _position = run != source._children->runs.end() ? run->second.first : none;
+}
+
+XMLElement* ElementSource::Walk::nextIndexed() noexcept {
+    if (_position == none)
+        return nullptr;
+    const Child& child = (*_list)[_position];
+    _position = child.next;
+    return static_cast<XMLElement*>(child.node);
+}
+
+XMLElement* ElementSource::Walk::nextListed() noexcept {
+    while (_position < _list->size()) {
+        const Child& child = (*_list)[_position++];
+        if (!child.taken && isOne(*child.node))
+            return static_cast<XMLElement*>(child.node);
     }
+    return nullptr;
 }
 
 ElementSource::Found ElementSource::find(const String& name) {
-    Found found;
-    forEachNamed(name, [&](XMLElement& child) {
-        found.several = found.first != nullptr;
-        if (!found.several)
-            found.first = &child;
-        return !found.several;
-    });
-    return found;
+    Walk walk(*this, name);
+    XMLElement* const first = walk.next();
+    return {first, first != nullptr && walk.next() != nullptr};
 }
 
 XMLElement* ElementSource::last(const String& name) {
+    Walk walk(*this, name);
     XMLElement* last = nullptr;
-    forEachNamed(name, [&](XMLElement& child) {
-        last = &child;
-        return true;
-    });
+    while (XMLElement* child = walk.next())
+        last = child;
     return last;
 }
 
 std::vector<XMLElement*> ElementSource::all(const String& name) {
+    Walk walk(*this, name);
     std::vector<XMLElement*> all;
-    forEachNamed(name, [&](XMLElement& child) {
-        all.push_back(&child);
-        return true;
-    });
+    while (XMLElement* child = walk.next())
+        all.push_back(child);
     return all;
 }
 

@@ -47,6 +47,9 @@ public:
     Found find(const qx::String& name);
     qx::XMLElement* last(const qx::String& name);
     std::vector<qx::XMLElement*> all(const qx::String& name);
+    // One after the other of these, as long as the source is not used otherwise. To bind one before
+    // the next is looked for finds that one in memory that is still at hand.
+    class Walk;
 
     // Calls visit(XMLNode&) for each child node in document order.
     template <class Visit>
@@ -93,13 +96,40 @@ private:
     void list();
     void index();
     void indexIfWorthIt();
-    // Calls visit(XMLElement&) for each child element of that name until it returns false.
-    template <class Visit>
-    void forEachNamed(const qx::String& name, Visit visit);
-
     qx::XMLElement& _element;
     CopyScope* _scope;
     std::size_t _lookups;
     std::unique_ptr<Children> _children;  // a private copy's, or the index of an element's
     std::unique_ptr<CopyScope> _ownScope; // of a private copy
+};
+
+class ElementSource::Walk {
+public:
+    Walk(ElementSource& source, qx::String name);
+    // Null behind the last.
+    qx::XMLElement* next() noexcept {
+        return _isIndexed ? nextIndexed() : _list != nullptr ? nextListed() : nextChild();
+    }
+
+private:
+    bool isOne(const qx::XMLNode& node) const noexcept {
+        return node.isElement() && node.name() == _name;
+    }
+    qx::XMLElement* nextIndexed() noexcept;
+    qx::XMLElement* nextListed() noexcept;
+    qx::XMLElement* nextChild() noexcept {
+        while (_child != nullptr) {
+            qx::XMLNode* const node = _child;
+            _child = node->nextSibling();
+            if (isOne(*node))
+                return static_cast<qx::XMLElement*>(node);
+        }
+        return nullptr;
+    }
+
+    const qx::String _name;
+    const std::vector<Child>* _list = nullptr; // null: the element's own children are walked
+    bool _isIndexed = false;
+    std::uint32_t _position = 0;    // in the list
+    qx::XMLNode* _child = nullptr; // among the children
 };

@@ -69,7 +69,8 @@ bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target
         return qx::fail(error, qx::errors::noMappingForClass, field.mapping->type());
     std::unique_ptr<ElementSource> wrapper;
     ElementSource* root = &target.source;
-    std::vector<XMLElement*> elements;
+    std::optional<ElementSource::Walk> elements;
+    XMLElement* element = nullptr;
     for (const BindingPlan& binding : field.bindings) {
         if (!binding.location.isEmpty()) {
             const auto found = root->find(binding.location);
@@ -82,16 +83,20 @@ bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target
                 countField(target, binding.location);
             }
         }
-        if (!binding.bindTo.isEmpty())
-            elements = root->all(binding.bindTo);
-        if (!elements.empty() || wrapper)
+        if (!binding.bindTo.isEmpty()) {
+            elements.emplace(*root, binding.bindTo);
+            element = elements->next();
+        }
+        if (element != nullptr || wrapper)
             break;
     }
-    if (elements.empty())
+    if (element == nullptr)
         return true;
+    // Most collections are short, and alone in their element.
+    constexpr std::size_t usualSize = 16;
     auto array = qx::make<qx::Array>();
-    array->reserve(elements.size());
-    for (XMLElement* element : elements) {
+    array->reserve(std::min(root->element().childCount(), usualSize));
+    for (; element != nullptr; element = elements->next()) {
         const auto item = build(*field.typeClass, *element, target.source.scope(), error);
         if (error != nullptr && *error)
             return false;

@@ -24,7 +24,7 @@ public:
             : key(std::move(aKey)), value(std::move(aValue)) {}
     };
 
-    Dictionary() = default;
+    Dictionary() noexcept {} // not defaulted: the room inside would be set to zero first
     ~Dictionary() override;
     static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
     static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
