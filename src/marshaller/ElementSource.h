@@ -36,6 +36,7 @@ public:
 
     qx::XMLElement& element() const noexcept { return _element; }
     CopyScope* scope() const noexcept { return _scope; }
+    bool isCopy() const noexcept { return _ownScope != nullptr; }
     // Says that another object will look that many names up, too.
     void expectLookups(std::size_t lookups) noexcept { _lookups += lookups; }
 
@@ -130,6 +131,6 @@ private:
     const qx::String _name;
     const std::vector<Child>* _list = nullptr; // null: the element's own children are walked
     bool _isIndexed = false;
-    std::uint32_t _position = 0;    // in the list
+    std::uint32_t _position = 0;   // in the list
     qx::XMLNode* _child = nullptr; // among the children
 };

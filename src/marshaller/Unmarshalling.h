@@ -61,7 +61,8 @@ public:
     bool bindCollection(const FieldPlan& field, const Target& target, ErrorSlot error);
     bool bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error);
 
-    bool validate(const Target& target, ErrorSlot error) const;
+    // `plan` is the class whose fields were bound, null where they were bound one by one.
+    bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error) const;
 
 private:
     // An object that is being bound, and those whose binding led to it.
@@ -83,6 +84,7 @@ private:
     qx::Value flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error);
     Items findItems(const FieldPlan& field, const Target& target);
     bool adopt(qx::Object& item, qx::Object& parent, ErrorSlot error);
+    static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
     bool validateChildren(const Target& target, ErrorSlot error) const;
     bool validateAttributes(const Target& target, ErrorSlot error) const;
 

@@ -4,6 +4,9 @@
 
 #include "platform/system/Errors.h"
 
+#include <algorithm>
+#include <optional>
+
 using qx::XMLElement;
 using qx::XMLNode;
 

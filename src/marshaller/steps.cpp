@@ -207,7 +207,7 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
     NameCounts attributes(boundAttributes);
     ElementSource source(element, nullptr, 0);
     return Unmarshalling(*this, Unmarshalling::Use::steps)
-        .validate({object, source, {fields, attributes}, false}, error);
+        .validate(nullptr, {object, source, {fields, attributes}, false}, error);
 }
 
 bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,

@@ -167,7 +167,7 @@ bool Unmarshalling::bindFields(const ClassPlan& plan, const Target& target, Erro
     if (!walk.broken().isNull())
         return qx::fail(error, qx::errors::noExtends, walk.broken());
     const Target rest{target.object, *source, target.bound, target.isFlattened};
-    return keepNamespaces(rest, error) && validate(rest, error);
+    return keepNamespaces(rest, error) && validate(&plan, rest, error);
 }
 
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {

@@ -38,15 +38,23 @@ private:
 
 } // namespace
 
-bool Unmarshalling::validate(const Target& target, ErrorSlot error) const {
+bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorSlot error) const {
     if (!validates())
         return true;
-    if (_use == Use::document)
-        return validateChildren(target, error) && validateAttributes(target, error);
+    if (_use == Use::document) {
+        const bool allBound = plan != nullptr && hasBoundAllChildren(*plan, target);
+        return (allBound || validateChildren(target, error)) && validateAttributes(target, error);
+    }
     NameCounts fields = target.bound.fields;
     NameCounts attributes = target.bound.attributes;
     const Target copied{target.object, target.source, {fields, attributes}, target.isFlattened};
     return validateChildren(copied, error) && validateAttributes(copied, error);
+}
+
+// Told without a look at the children, which may be many and far away.
+bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& target) {
+    return plan.bindsChildrenOnce && !target.isFlattened && !target.source.isCopy() &&
+           target.bound.fields.size() == target.source.element().childCount();
 }
 
 // A name that is left is kept with all its elements, those that were consumed included.

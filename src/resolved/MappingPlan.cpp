@@ -1,6 +1,7 @@
 #include "resolved/MappingPlan.h"
 
 #include <algorithm>
+#include <vector>
 
 using qx::Key;
 using qx::String;
@@ -48,6 +49,8 @@ MappingPlan::MappingPlan(const QXXMLDocumentMapping& document) {
         fill(*plan);
     markCycles();
     for (const auto& plan : _classes)
+        plan->bindsChildrenOnce = bindsChildrenOnce(*plan);
+    for (const auto& plan : _classes)
         for (const FieldPlan& field : plan->fields)
             _fields.emplace(field.mapping, &field);
 }
@@ -61,7 +64,8 @@ void MappingPlan::fill(ClassPlan& plan) const {
     for (const auto& field : mapping.fields()) {
         plan.fields.push_back(planFor(*field));
         plan.bindingCount += std::max<std::size_t>(field->bindToMappings().size(), 1);
-        if (field->nodeType() == QXXMLNodeTypeAttribute || field->nodeType() == QXXMLNodeTypeUnknown)
+        if (field->nodeType() == QXXMLNodeTypeAttribute ||
+            field->nodeType() == QXXMLNodeTypeUnknown)
             ++plan.attributeCount;
     }
     if (!mapping.extends().isEmpty())
@@ -84,6 +88,49 @@ void MappingPlan::markCycles() {
              member = _classes[member->parent->index].get())
             member->isOnCycle = true;
     }
+}
+
+namespace {
+
+// The child elements that the field may bind; false where that could be any.
+bool nameChildren(const FieldPlan& field, std::vector<String>& names) {
+    const bool isTyped = field.typeClass != nullptr;
+    if (!field.isContainer || (field.collection != CollectionKind::none && !isTyped))
+        return false;
+    if (field.collection == CollectionKind::none && field.nodeType == QXXMLNodeTypeAttribute)
+        return true;
+    for (const BindingPlan& binding : field.bindings)
+        for (const String& name : {binding.name, binding.location})
+            if (!name.isEmpty())
+                names.push_back(name);
+    return true;
+}
+
+} // namespace
+
+bool MappingPlan::bindsChildrenOnce(const ClassPlan& plan) {
+    // Of larger classes it is not worked out.
+    constexpr std::size_t mostNames = 64;
+    constexpr std::size_t mostLevels = 16;
+    std::vector<String> taken;
+    ExtendsWalk walk(plan);
+    std::size_t levels = 0;
+    do {
+        if (++levels > mostLevels)
+            return false;
+        for (const FieldPlan& field : walk.current().fields) {
+            std::vector<String> names;
+            if (!nameChildren(field, names))
+                return false;
+            const bool isFree = std::none_of(names.begin(), names.end(), [&](const String& name) {
+                return std::find(taken.begin(), taken.end(), name) != taken.end();
+            });
+            if (!isFree || taken.size() + names.size() > mostNames)
+                return false;
+            taken.insert(taken.end(), names.begin(), names.end());
+        }
+    } while (walk.next());
+    return true;
 }
 
 bool ExtendsWalk::next() {

@@ -73,6 +73,9 @@ public:
     // The class that this one extends; null where it extends none or one that is not mapped.
     const ClassPlan* parent = nullptr;
     bool isOnCycle = false; // of `extends`
+    // Whether the class with its ancestors binds no child element to two fields: as many children
+    // bound as there are then means that all are. Only known of classes that stand in the mapping.
+    bool bindsChildrenOnce = false;
 };
 
 // Walks a class and its ancestors, this one first:
@@ -128,6 +131,7 @@ private:
     }
     void fill(ClassPlan& plan) const;
     void markCycles();
+    static bool bindsChildrenOnce(const ClassPlan& plan);
 
     std::vector<std::unique_ptr<ClassPlan>> _classes;
     StringMap<const ClassPlan*> _byClassName;

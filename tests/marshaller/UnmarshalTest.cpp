@@ -293,6 +293,11 @@ constexpr Case wholes[] = {
      "<order title='t' a='1' b='2'><note>n</note><!--c--><note/>text<?pi x?></order>", strict,
      R"(Order{title: "t", unboundAttributes: [a="1", b="2"], )"
      R"(unboundChildren: {note: [<note>n</note>, <note></note>], pi: []}})"},
+    {"a child that is bound twice does not make up for one that is not bound",
+     "<class name='Order'><field name='text'><bind-xml name='t' node='element'/></field>"
+     "<field name='note'><bind-xml name='t' node='element'/></field></class>",
+     "<order><t>1</t><other/></order>", usual,
+     R"(Order{note: "1", text: "1", unboundChildren: {other: [<other></other>]}})"},
     {"unknown children fail before unknown attributes", "<class name='Order'/>",
      "<order a='1'><note/><note/></order>", strict | discard,
      "-214: Unknown fields found in XML document: (note [2]) element: order (Invalid XML)"},

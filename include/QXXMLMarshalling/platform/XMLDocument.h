@@ -40,11 +40,9 @@ public:
     XMLBytes(std::string_view bytes) noexcept : _view(bytes) {}
     XMLBytes(const std::string& text) noexcept : _view(text), _isTerminated(true) {}
     XMLBytes(const String& text) noexcept : _view(text), _isTerminated(true) {}
-    XMLBytes(const Data& data) noexcept
-        : _view(data.view()), _isTerminated(data.isTerminated()) {}
+    XMLBytes(const Data& data) noexcept : _view(data.view()), _isTerminated(data.isTerminated()) {}
     // A null pointer gives no bytes.
-    XMLBytes(const char* text) noexcept
-        : _view(text != nullptr ? text : ""), _isTerminated(true) {}
+    XMLBytes(const char* text) noexcept : _view(text != nullptr ? text : ""), _isTerminated(true) {}
 
     std::string_view view() const noexcept { return _view; }
     bool isTerminated() const noexcept { return _isTerminated; }

@@ -29,8 +29,8 @@ String::Rep* String::allocate(std::size_t size, std::uint32_t count) {
         rep->count.store(count, std::memory_order_relaxed);
         return rep;
     }
-    auto* const rep = new (MemoryBlocks::ofTexts().allocate(sizeof(Rep) + size + 1))
-        Rep{{count}, {0}, size};
+    auto* const rep =
+        new (MemoryBlocks::ofTexts().allocate(sizeof(Rep) + size + 1)) Rep{{count}, {0}, size};
     reinterpret_cast<char*>(rep + 1)[size] = '\0';
     return rep;
 }

@@ -106,9 +106,8 @@ std::string XMLDocument::XMLData(XMLOptions options) const {
 }
 
 bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error) const {
-    return withBytes(options, [&](std::string_view bytes) {
-        return writeFileAtomically(path, bytes, error);
-    });
+    return withBytes(
+        options, [&](std::string_view bytes) { return writeFileAtomically(path, bytes, error); });
 }
 
 bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error) const {

@@ -106,8 +106,9 @@ void XMLTreeBuilder::placeText(bool endsElement) {
     if (isLayout && !open.hasText && !open.preservesSpace && !_options.keepWhiteSpace) {
         // No text follows that would have it kept once the element ends.
         if (!endsElement)
-            _layouts.push_back({XMLNode::lastOf(open.element->_firstChild),
-                                _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting});
+            _layouts.push_back(
+                {XMLNode::lastOf(open.element->_firstChild),
+                 _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting});
     } else if (endsElement && !isLayout && open.element->_childCount == 0 &&
                _layouts.size() == open.firstLayout) {
         open.element->holdText(_values.valued(text));

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include <functional>
 #include <gtest/gtest.h>
 #include <thread>
 
@@ -12,6 +13,16 @@ using qx::Ref;
 using qx::XMLDocument;
 using qx::XMLElement;
 using qx::XMLNode;
+using namespace std::string_literals;
+
+std::string thrownBy(const std::function<void()>& call) {
+    try {
+        call();
+    } catch (const qx::Exception& exception) {
+        return std::string(exception.reason());
+    }
+    return "nothing";
+}
 
 Ref<XMLDocument> parsed(std::string_view text, const qx::XMLParseOptions& options = {}) {
     Ref<qx::Error> error;
@@ -126,6 +137,46 @@ TEST(XMLElement, AnAttributeThatIsThereKeepsItsValue) {
     element->removeAttributeForName("b");
     element->removeAttributeForName("nothing");
     EXPECT_EQ(element->XMLString(), "<a c=\"2\"></a>");
+}
+
+TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
+    std::string many = "<a";
+    for (int i = 0; i < 40; ++i)
+        many += " n" + std::to_string(i) + "=\"" + std::to_string(i) + "\"";
+    for (const std::string& text : {"<a b=\"1\" c=\"\"></a>"s, many + "></a>"}) {
+        const auto document = parsed(text);
+        XMLElement& held = *document->rootElement();
+        const Ref<XMLNode> copied = held.copy();
+        std::string seen = "<a";
+        held.forEachAttribute([&](const qx::String& name, const qx::String& value) {
+            seen += " " + name.str() + "=\"" + value.str() + "\"";
+        });
+        EXPECT_EQ(seen + "></a>", text);
+        EXPECT_EQ(held.XMLString().view(), text);
+        std::string spelledOut = "<a";
+        for (const XMLNode& attribute : held.attributes()) {
+            EXPECT_EQ(attribute.parent(), &held);
+            spelledOut += " " + attribute.XMLString().str();
+        }
+        EXPECT_EQ(spelledOut + "></a>", text);
+        EXPECT_EQ(held.XMLString().view(), text);
+        EXPECT_EQ(copied->XMLString().view(), text);
+    }
+    const auto element = XMLElement::initForAttributes("a", 2);
+    element->addAttribute("b", "1");
+    element->addAttribute("b", "2");
+    EXPECT_EQ(element->attributeValue("b"), "1");
+    EXPECT_TRUE(element->attributeValue("c").isNull());
+    EXPECT_EQ(element->attributeForName("c"), nullptr);
+    element->addAttribute("c", nullptr);
+    element->addAttribute("d", "\x1F");
+    EXPECT_EQ(element->description(), "<a b=\"1\" c=\"\" d=\"\x1F\"></a>");
+    const auto refused = XMLElement::initForAttributes("a", 2);
+    refused->addAttribute("b", "\x1F");
+    EXPECT_EQ(thrownBy([&] { static_cast<void>(refused->XMLString()); }),
+              "a text holds a control character at /a/@b");
+    refused->removeAttributeForName("b");
+    EXPECT_EQ(refused->XMLString(), "<a></a>");
 }
 
 TEST(XMLElement, TheFirstOfTwoEqualPrefixesWins) {

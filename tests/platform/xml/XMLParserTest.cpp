@@ -14,7 +14,7 @@ using qx::XMLNode;
 using namespace std::string_literals;
 
 // The document as XML, or its error as "line:column code message".
-std::string outcome(std::string_view bytes, const qx::XMLParseOptions& options = {}) {
+std::string outcome(qx::XMLBytes bytes, const qx::XMLParseOptions& options = {}) {
     Ref<qx::Error> error;
     const auto document = XMLDocument::initWithData(bytes, options, &error);
     if (document)
@@ -30,8 +30,12 @@ struct Case {
 };
 
 void run(const std::vector<Case>& cases, const qx::XMLParseOptions& options = {}) {
-    for (const auto& [document, expected] : cases)
+    for (const auto& [document, expected] : cases) {
         EXPECT_EQ(outcome(document, options), expected) << document.substr(0, 200);
+        // Bytes that nothing follows.
+        const std::vector<char> bare(document.begin(), document.end());
+        EXPECT_EQ(outcome(std::string_view(bare.data(), bare.size()), options), expected);
+    }
 }
 
 TEST(XMLParser, WhatTheDocumentSaysComesIntoTheTree) {
@@ -284,7 +288,8 @@ TEST(XMLParser, EveryBeginningOfADocumentIsRefusedWithAnError) {
     for (std::size_t size = 0; size < whole.size(); ++size) {
         // Memory of that very size, so that the sanitizer sees a look behind the end.
         const std::vector<char> bytes(whole.data(), whole.data() + size);
-        EXPECT_NE(outcome({bytes.data(), size}).front(), '<') << whole.substr(0, size);
+        EXPECT_NE(outcome(std::string_view(bytes.data(), size)).front(), '<')
+            << whole.substr(0, size);
     }
 }
 
