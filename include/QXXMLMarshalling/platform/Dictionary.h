@@ -24,7 +24,8 @@ public:
             : key(std::move(aKey)), value(std::move(aValue)) {}
     };
 
-    Dictionary() noexcept {} // not defaulted: the room inside would be set to zero first
+    // NOLINTNEXTLINE(modernize-use-equals-default): the room inside would be set to zero first
+    Dictionary() noexcept {}
     ~Dictionary() override;
     static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
     static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }

@@ -102,7 +102,8 @@ auto XMLDocument::withBytes(XMLOptions options, Use use) const {
 }
 
 std::string XMLDocument::XMLData(XMLOptions options) const {
-    return withBytes(options, [](auto&& bytes) { return std::string(std::move(bytes)); });
+    return withBytes(
+        options, [](auto&& bytes) { return std::string(std::forward<decltype(bytes)>(bytes)); });
 }
 
 bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error) const {

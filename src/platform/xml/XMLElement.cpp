@@ -112,7 +112,9 @@ void XMLElement::spellAttributesOut() const {
 }
 
 XMLNode* XMLElement::attributeForName(const String& name) const {
-    const String wanted = name; // which may be the name of one that is held
+    // The name may be that of one that is held.
+    // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
+    const String wanted = name;
     if (_heldCount != 0 && !attributeValue(wanted).isNull())
         spellAttributesOut();
     for (XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)

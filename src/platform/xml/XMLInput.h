@@ -26,7 +26,7 @@ public:
     const String& declaredEncoding() const noexcept { return _declaredEncoding; }
 
 private:
-    void decodeBytes(XMLBytes bytes);
+    void decodeBytes(XMLBytes given);
     void lend(std::string_view bytes, bool isTerminated);
     void convert(std::string_view bytes, const String& encoding);
     void checkStart() const;
