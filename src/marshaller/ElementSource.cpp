@@ -100,14 +100,6 @@ XMLElement* ElementSource::last(const String& name) {
     return last;
 }
 
-std::vector<XMLElement*> ElementSource::all(const String& name) {
-    Walk walk(*this, name);
-    std::vector<XMLElement*> all;
-    while (XMLElement* child = walk.next())
-        all.push_back(child);
-    return all;
-}
-
 String ElementSource::stringValue() const {
     if (!_ownScope)
         return _element.stringValue();

@@ -47,9 +47,8 @@ public:
     };
     Found find(const qx::String& name);
     qx::XMLElement* last(const qx::String& name);
-    std::vector<qx::XMLElement*> all(const qx::String& name);
-    // One after the other of these, as long as the source is not used otherwise. To bind one before
-    // the next is looked for finds that one in memory that is still at hand.
+    // All of them, one after the other, as long as the source is not used otherwise. To bind one
+    // before the next is looked for finds that one in memory that is still at hand.
     class Walk;
 
     // Calls visit(XMLNode&) for each child node in document order.

@@ -24,8 +24,9 @@ Unmarshalling::Items Unmarshalling::findItems(const FieldPlan& field, const Targ
         if (binding.bindTo.isEmpty())
             continue;
         if (binding.classOfBindTo != nullptr) {
-            const auto named = target.source.all(binding.bindTo);
-            items.nodes.assign(named.begin(), named.end());
+            ElementSource::Walk walk(target.source, binding.bindTo);
+            while (XMLElement* element = walk.next())
+                items.nodes.push_back(element);
         } else if (const XMLElement* wrapper = target.source.last(binding.bindTo)) {
             for (XMLNode& child : wrapper->children())
                 items.nodes.push_back(&child);

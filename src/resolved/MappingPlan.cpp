@@ -49,7 +49,7 @@ MappingPlan::MappingPlan(const QXXMLDocumentMapping& document) {
         fill(*plan);
     markCycles();
     for (const auto& plan : _classes)
-        plan->bindsChildrenOnce = bindsChildrenOnce(*plan);
+        summarise(*plan);
     for (const auto& plan : _classes)
         for (const FieldPlan& field : plan->fields)
             _fields.emplace(field.mapping, &field);
@@ -92,45 +92,49 @@ void MappingPlan::markCycles() {
 
 namespace {
 
-// The child elements that the field may bind; false where that could be any.
-bool nameChildren(const FieldPlan& field, std::vector<String>& names) {
-    const bool isTyped = field.typeClass != nullptr;
-    if (!field.isContainer || (field.collection != CollectionKind::none && !isTyped))
+bool mayBeAttribute(const FieldPlan& field) {
+    return field.collection == CollectionKind::none && field.location.isEmpty() &&
+           (field.nodeType == QXXMLNodeTypeAttribute || field.nodeType == QXXMLNodeTypeUnknown);
+}
+
+// Adds the names of the child elements that the field may bind. False where that could be any, or
+// one of those that are there already.
+bool addChildren(const FieldPlan& field, std::vector<String>& names) {
+    const bool isArray = field.collection != CollectionKind::none;
+    if (!field.isContainer || (isArray && field.typeClass == nullptr))
         return false;
-    if (field.collection == CollectionKind::none && field.nodeType == QXXMLNodeTypeAttribute)
+    if (!isArray && field.nodeType == QXXMLNodeTypeAttribute)
         return true;
+    const auto earlier = static_cast<std::ptrdiff_t>(names.size());
     for (const BindingPlan& binding : field.bindings)
-        for (const String& name : {binding.name, binding.location})
+        for (const String& name : {binding.name, binding.location}) {
+            const auto last = names.begin() + earlier;
+            if (std::find(names.begin(), last, name) != last)
+                return false;
             if (!name.isEmpty())
                 names.push_back(name);
+        }
     return true;
 }
 
 } // namespace
 
-bool MappingPlan::bindsChildrenOnce(const ClassPlan& plan) {
-    // Of larger classes it is not worked out.
+void MappingPlan::summarise(ClassPlan& plan) {
+    // Of larger classes less is worked out.
     constexpr std::size_t mostNames = 64;
     constexpr std::size_t mostLevels = 16;
-    std::vector<String> taken;
-    ExtendsWalk walk(plan);
+    std::vector<String> children;
     std::size_t levels = 0;
+    plan.bindsChildrenOnce = true;
+    ExtendsWalk walk(plan);
     do {
-        if (++levels > mostLevels)
-            return false;
         for (const FieldPlan& field : walk.current().fields) {
-            std::vector<String> names;
-            if (!nameChildren(field, names))
-                return false;
-            const bool isFree = std::none_of(names.begin(), names.end(), [&](const String& name) {
-                return std::find(taken.begin(), taken.end(), name) != taken.end();
-            });
-            if (!isFree || taken.size() + names.size() > mostNames)
-                return false;
-            taken.insert(taken.end(), names.begin(), names.end());
+            plan.attributeCount += mayBeAttribute(field) ? 1 : 0;
+            plan.bindsChildrenOnce = plan.bindsChildrenOnce && children.size() < mostNames &&
+                                     addChildren(field, children);
         }
-    } while (walk.next());
-    return true;
+    } while (walk.next() && ++levels < mostLevels);
+    plan.bindsChildrenOnce = plan.bindsChildrenOnce && levels < mostLevels;
 }
 
 bool ExtendsWalk::next() {

@@ -66,9 +66,9 @@ public:
     qx::Key classNameToInstantiate;
     qx::String elementName; // "map-to", or the class name as written
     std::vector<FieldPlan> fields;
-    // About how many names are looked up to bind the class with its ancestors.
+    // About how many names are looked up to bind the class's own fields.
     std::size_t bindingCount = 0;
-    // How many of the class's own fields an element of it may hold as attributes.
+    // How many fields, those of the ancestors too, may be attributes of the class's element.
     std::size_t attributeCount = 0;
     // The class that this one extends; null where it extends none or one that is not mapped.
     const ClassPlan* parent = nullptr;
@@ -131,7 +131,7 @@ private:
     }
     void fill(ClassPlan& plan) const;
     void markCycles();
-    static bool bindsChildrenOnce(const ClassPlan& plan);
+    static void summarise(ClassPlan& plan);
 
     std::vector<std::unique_ptr<ClassPlan>> _classes;
     StringMap<const ClassPlan*> _byClassName;

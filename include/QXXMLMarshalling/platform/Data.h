@@ -22,7 +22,7 @@ public:
     std::size_t size() const noexcept { return _size; }
     std::string_view view() const noexcept { return {_bytes, _size}; }
     // Whether a zero byte follows them, which is so for bytes of the object's own.
-    bool isTerminated() const noexcept { return _giveBack == nullptr; }
+    bool isTerminated() const noexcept { return _bytes == _own.data(); }
 
     // "<Data: N bytes>".
     String description() const override;
@@ -34,7 +34,7 @@ protected:
 
 private:
     std::string _own;
-    const char* _bytes = "";
+    const char* _bytes = _own.data();
     std::size_t _size = 0;
     void (*_giveBack)(const char*, std::size_t) = nullptr;
 };

@@ -128,8 +128,6 @@ private:
     void changed() noexcept { ++_changes; }
 
     using Index = std::vector<std::uint32_t>; // see NameIndex.h
-    static const Index noIndex;
-    const Index& index() const noexcept { return _index ? *_index : noIndex; }
 
     bool _allInterned = true; // the keys, removed ones too
     ShortVector<Entry, usualSize> _entries;

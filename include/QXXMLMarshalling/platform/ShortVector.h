@@ -40,7 +40,7 @@ public:
     template <class... Arguments>
     void emplace_back(Arguments&&... arguments) {
         if (isFull())
-            grow();
+            return growWith(std::forward<Arguments>(arguments)...);
         new (_items + _size) T(std::forward<Arguments>(arguments)...);
         ++_size;
     }
@@ -54,10 +54,8 @@ public:
         while (end() != kept)
             std::destroy_at(_items + --_size);
     }
-    void clear() noexcept {
-        while (_size != 0)
-            std::destroy_at(_items + --_size);
-    }
+    // The first one ends first.
+    void clear() noexcept { std::destroy_n(_items, std::exchange(_size, 0)); }
 
 private:
     T* inside() noexcept { return reinterpret_cast<T*>(_inside); }
@@ -65,15 +63,26 @@ private:
         if (_items != inside())
             ObjectAllocator<T>().deallocate(_items, _capacity);
     }
-    void grow() {
+    // The new element first: it may be made from one of the others.
+    template <class... Arguments>
+    void growWith(Arguments&&... arguments) {
         if (_capacity > UINT32_MAX / 2)
             throw std::length_error("too many elements");
-        T* const items = ObjectAllocator<T>().allocate(std::size_t{2} * _capacity);
+        ObjectAllocator<T> allocator;
+        const std::size_t capacity = std::size_t{2} * _capacity;
+        T* const items = allocator.allocate(capacity);
+        try {
+            new (items + _size) T(std::forward<Arguments>(arguments)...);
+        } catch (...) {
+            allocator.deallocate(items, capacity);
+            throw;
+        }
         std::uninitialized_move(begin(), end(), items);
         std::destroy(begin(), end());
         giveBack();
         _items = items;
         _capacity *= 2;
+        ++_size;
     }
 
     T* _items = inside();

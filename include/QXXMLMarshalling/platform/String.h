@@ -91,17 +91,19 @@ private:
     struct Rep {
         std::atomic<std::uint32_t> count;
         std::atomic<std::uint32_t> hash; // 0: not worked out yet
-        std::size_t size;
+        std::size_t isInBlock : 1;       // in memory shared with others
+        std::size_t size : sizeof(std::size_t) * 8 - 1;
     };
     static constexpr std::uint32_t immortalBit = 0x80000000U;
     static constexpr std::uint32_t internedBit = 0x40000000U;
     static constexpr std::uint32_t propertyBit = 0x20000000U; // see Key::namesProperty
-    static constexpr std::uint32_t blockBit = 0x10000000U;    // in memory shared with others
 
     explicit String(Rep* rep) noexcept : _rep(rep) {}
     static const char* text(const Rep* rep) noexcept {
         return reinterpret_cast<const char*>(rep + 1);
     }
+    // A text of that many bytes, which the caller fills in, with a count of one.
+    static Rep* newRep(void* memory, std::size_t size, bool isInBlock) noexcept;
     static Rep* allocate(std::size_t size, std::uint32_t count);
     // For the many short texts of a document.
     static String inBlock(std::string_view text);
@@ -116,7 +118,7 @@ private:
     void release() const noexcept {
         if (_rep == nullptr || (_rep->count.load(std::memory_order_relaxed) & immortalBit) != 0)
             return;
-        if ((count::decrease(_rep->count) & ~blockBit) == 1)
+        if (count::decrease(_rep->count) == 1)
             destroy(_rep);
     }
 

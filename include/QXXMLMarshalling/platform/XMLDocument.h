@@ -13,6 +13,9 @@
 // well-formed XML, the result is null and the error says what, where: domain
 // qx::Error::parserDomain, the parser's code and text, line() and column(). Any number of threads
 // may parse at the same time.
+//
+// A document's short texts share memory, a kilobyte each time: whoever keeps single ones of very
+// many documents saves memory with copies, qx::String(text.view()).
 
 #include <QXXMLMarshalling/platform/Data.h>
 #include <QXXMLMarshalling/platform/Error.h>

@@ -15,7 +15,7 @@ class QX_API XMLElement final : public XMLNode {
 public:
     static Ref<XMLElement> initWithName(const String& name);
     static Ref<XMLElement> initWithName(const String& name, const String& stringValue);
-    // With memory for that many attributes, which is the fastest way to have them.
+    // With memory for that many attributes, which is the fastest way to have a few of them.
     static Ref<XMLElement> initForAttributes(const String& name, std::size_t count);
     ~XMLElement() override;
 
@@ -46,12 +46,19 @@ public:
     XMLNode* attributeForName(const String& name) const;
     // The value of the attribute; null when there is none. It needs no node.
     String attributeValue(const String& name) const noexcept;
-    // Calls visit(name, value) for each attribute in document order; that needs no nodes.
+    // Calls visit(name, value) for each attribute in document order; that needs no nodes. The
+    // attributes must not change meanwhile.
     template <class Visit>
     void forEachAttribute(Visit visit) const {
-        for (const HeldAttribute& attribute : held())
+        std::size_t visited = 0;
+        for (; visited < _heldCount; ++visited) {
+            const HeldAttribute attribute = held()[visited]; // nodes may be made of them
             visit(attribute.name, attribute.value);
-        for (const XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
+        }
+        const XMLNode* node = _firstAttribute;
+        for (; visited != 0 && node != nullptr; --visited)
+            node = node->_next;
+        for (; node != nullptr; node = node->_next)
             visit(node->_name, node->_value);
     }
     // Adds nothing when an attribute of that name is there already. A node that has a parent or is

@@ -15,8 +15,9 @@ CountedSet::CountedSet(std::initializer_list<std::string_view> names) {
 CountedSet::~CountedSet() = default;
 
 std::size_t CountedSet::positionOf(const String& name) const noexcept {
-    return nameindex::find(_index, _entries.size(), name, _allInterned,
-                           [this](std::size_t i) -> const String& { return _entries[i].name; });
+    const auto nameOf = [this](std::size_t i) -> const String& { return _entries[i].name; };
+    return _index.empty() ? nameindex::scan(_entries.size(), name, _allInterned, nameOf)
+                          : nameindex::lookUp(_index, name, nameOf);
 }
 
 void CountedSet::add(const String& name, std::size_t times) {

@@ -12,8 +12,6 @@
 
 namespace qx {
 
-constinit const Dictionary::Index Dictionary::noIndex;
-
 Dictionary::~Dictionary() = default;
 
 void Dictionary::checkUnchanged(std::size_t changes) const {
@@ -24,8 +22,9 @@ void Dictionary::checkUnchanged(std::size_t changes) const {
 inline std::size_t Dictionary::positionOf(const String& key) const noexcept {
     if (key.isNull())
         return nameindex::none;
-    return nameindex::find(index(), _entries.size(), key, _allInterned,
-                           [this](std::size_t i) -> const String& { return _entries[i].key; });
+    const auto keyOf = [this](std::size_t i) -> const String& { return _entries[i].key; };
+    return _index ? nameindex::lookUp(*_index, key, keyOf)
+                  : nameindex::scan(_entries.size(), key, _allInterned, keyOf);
 }
 
 const Value* Dictionary::find(const String& key) const noexcept {
@@ -74,7 +73,8 @@ bool Dictionary::addAny(const String& key, Value&& value) {
 }
 
 inline void Dictionary::append(const String& key, Value&& value) {
-    if (nameindex::isFull(index(), _entries.size()))
+    static_assert(fewKeys == nameindex::scanLimit);
+    if (_index ? nameindex::isFull(*_index, _entries.size()) : _entries.size() >= fewKeys)
         makeRoom();
     _entries.emplace_back(key, std::move(value));
     _allInterned = _allInterned && key.isInterned();
@@ -107,13 +107,13 @@ void Dictionary::remove(const String& key) {
 }
 
 void Dictionary::removeAll() {
+    // What ends with its last count may lead back to this dictionary.
+    const std::vector<Entry> removed(std::make_move_iterator(_entries.begin()),
+                                     std::make_move_iterator(_entries.end()));
     changed();
     _count = 0;
     _index.reset();
     _allInterned = true;
-    // What ends with its last count may lead back to this dictionary.
-    const std::vector<Entry> removed(std::make_move_iterator(_entries.begin()),
-                                     std::make_move_iterator(_entries.end()));
     _entries.clear();
 }
 

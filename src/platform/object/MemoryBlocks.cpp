@@ -2,14 +2,16 @@
 
 #include <QXXMLMarshalling/platform/Count.h>
 
+#include <algorithm>
+
 namespace qx {
 
 namespace {
 
-// A host may keep a few of many texts or objects, but seldom a few of a document's nodes.
+// A host may keep a few of many objects, and one text of each document, but seldom a few nodes.
 constexpr std::size_t nodeBlockSize = 64 * 1024 - 64;
 constexpr std::size_t objectBlockSize = 8 * 1024 - 64;
-constexpr std::size_t textBlockSize = 4 * 1024 - 64;
+constexpr std::size_t textBlockSize = 1024 - 16;
 
 // Without destructors, so that they can be used until the very end of the thread.
 [[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks nodesOfThread(nodeBlockSize);
@@ -45,7 +47,7 @@ void MemoryBlocks::begin(std::size_t whole) {
     // So that what follows the address in front is aligned.
     constexpr std::size_t start = 2 * anyScalar - header;
     static_assert(start >= sizeof(Block));
-    const std::size_t size = hasRetired ? start + whole : _blockSize;
+    const std::size_t size = hasRetired ? start + whole : std::max(_blockSize, start + whole);
     auto* const memory = static_cast<char*>(::operator new(size));
     _block = new (memory) Block{hasRetired ? 1 : reserve};
     _isReserved = !hasRetired;

@@ -3,8 +3,8 @@
 // Memory for things that are made in one go and mostly die together: the nodes of a document, its
 // texts, the objects that are read from it. They are cut from blocks, one after the other, and a
 // block is given back when the last thing in it is gone. So what is kept for long keeps its block:
-// some hundred nodes, some dozen objects or texts. Each thread cuts from blocks of its own; any
-// thread may release anything.
+// some hundred nodes, some dozen objects, a kilobyte of texts. Each thread cuts from blocks of its
+// own; any thread may release anything.
 
 #include <atomic>
 #include <cstddef>

@@ -15,20 +15,24 @@ constexpr std::size_t none = static_cast<std::size_t>(-1);
 // Position of the live entry with that name; `nameOf(position)` gives each one's name. Where all
 // names are interned, `allInterned`, an interned one is told from them without a look at its text.
 template <class NameOf>
-std::size_t find(const std::vector<std::uint32_t>& index, std::size_t entries, const String& name,
-                 bool allInterned, NameOf nameOf) noexcept {
-    if (index.empty()) {
-        // Most names are the very ones that were put in.
-        for (std::size_t i = 0; i < entries; ++i)
-            if (nameOf(i).isSameAs(name))
-                return i;
-        if (allInterned && name.isInterned())
-            return none;
-        for (std::size_t i = 0; i < entries; ++i)
-            if (nameOf(i) == name)
-                return i;
+std::size_t scan(std::size_t entries, const String& name, bool allInterned,
+                 NameOf nameOf) noexcept {
+    // Most names are the very ones that were put in.
+    for (std::size_t i = 0; i < entries; ++i)
+        if (nameOf(i).isSameAs(name))
+            return i;
+    if (allInterned && name.isInterned())
         return none;
-    }
+    for (std::size_t i = 0; i < entries; ++i)
+        if (nameOf(i) == name)
+            return i;
+    return none;
+}
+
+// The same by a table, which must not be empty.
+template <class NameOf>
+std::size_t lookUp(const std::vector<std::uint32_t>& index, const String& name,
+                   NameOf nameOf) noexcept {
     const std::size_t mask = index.size() - 1;
     for (std::size_t slot = name.hash() & mask; index[slot] != 0; slot = (slot + 1) & mask)
         if (nameOf(index[slot] - 1) == name)

@@ -11,34 +11,32 @@
 
 namespace qx {
 
-// Memory that the C library can resize in place.
-String::Rep* String::resized(Rep* rep, std::size_t size) {
-    if (size > SIZE_MAX - sizeof(Rep) - 1)
-        throw std::bad_alloc();
-    void* const memory = std::realloc(static_cast<void*>(rep), sizeof(Rep) + size + 1);
-    if (memory == nullptr)
-        throw std::bad_alloc();
-    auto* const resized = new (memory) Rep{{1}, {0}, size};
-    reinterpret_cast<char*>(resized + 1)[size] = '\0';
-    return resized;
-}
-
-String::Rep* String::allocate(std::size_t size, std::uint32_t count) {
-    if ((count & blockBit) == 0) {
-        Rep* const rep = resized(nullptr, size);
-        rep->count.store(count, std::memory_order_relaxed);
-        return rep;
-    }
-    auto* const rep =
-        new (MemoryBlocks::ofTexts().allocate(sizeof(Rep) + size + 1)) Rep{{count}, {0}, size};
+inline String::Rep* String::newRep(void* memory, std::size_t size, bool isInBlock) noexcept {
+    auto* const rep = new (memory) Rep{{1}, {0}, isInBlock, size & (SIZE_MAX >> 1)};
     reinterpret_cast<char*>(rep + 1)[size] = '\0';
     return rep;
 }
 
+// Memory that the C library can resize in place.
+String::Rep* String::resized(Rep* rep, std::size_t size) {
+    if (size > (SIZE_MAX >> 1) - sizeof(Rep) - 1)
+        throw std::bad_alloc();
+    void* const memory = std::realloc(static_cast<void*>(rep), sizeof(Rep) + size + 1);
+    if (memory == nullptr)
+        throw std::bad_alloc();
+    return newRep(memory, size, false);
+}
+
+String::Rep* String::allocate(std::size_t size, std::uint32_t count) {
+    Rep* const rep = resized(nullptr, size);
+    rep->count.store(count, std::memory_order_relaxed);
+    return rep;
+}
+
 void String::destroy(Rep* rep) noexcept {
-    const bool isShared = (rep->count.load(std::memory_order_relaxed) & blockBit) != 0;
+    const bool isInBlock = rep->isInBlock != 0;
     rep->~Rep();
-    if (isShared)
+    if (isInBlock)
         MemoryBlocks::release(rep);
     else
         std::free(rep);
@@ -48,7 +46,8 @@ String String::inBlock(std::string_view text) {
     constexpr std::size_t longest = 256;
     if (text.empty() || text.size() > longest)
         return text;
-    Rep* const rep = allocate(text.size(), blockBit | 1U);
+    void* const memory = MemoryBlocks::ofTexts().allocate(sizeof(Rep) + text.size() + 1);
+    Rep* const rep = newRep(memory, text.size(), true);
     std::memcpy(reinterpret_cast<char*>(rep + 1), text.data(), text.size());
     return String(rep);
 }

@@ -145,9 +145,10 @@ void XMLElement::addAttribute(Ref<XMLNode> attribute) {
 
 void XMLElement::addAttribute(const String& name, const String& value) {
     if (!canHoldAttribute())
-        addAttribute(attributeWithName(name, value));
-    else if (attributeValue(name).isNull())
-        holdAttribute(name.isNull() ? String("") : name, value.isNull() ? String("") : value);
+        return addAttribute(attributeWithName(name, value));
+    String present = name.isNull() ? String("") : name;
+    if (attributeValue(present).isNull())
+        holdAttribute(std::move(present), value.isNull() ? String("") : value);
 }
 
 // NOLINTNEXTLINE(readability-make-member-function-const): it changes what the element holds

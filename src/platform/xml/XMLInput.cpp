@@ -70,38 +70,34 @@ std::size_t countAttributes(std::string_view tag) {
 } // namespace
 
 void XMLInput::read(XMLBytes bytes) {
-    decodeBytes(bytes);
+    const bool isConverted = decodeBytes(bytes.view());
     checkStart();
+    if (!isConverted && !bytes.isTerminated())
+        _text = _converted = _text;
     checkStartTags();
 }
 
-void XMLInput::lend(std::string_view bytes, bool isTerminated) {
-    _text = bytes;
-    if (!isTerminated)
-        _text = _converted = bytes;
-}
-
-void XMLInput::decodeBytes(XMLBytes given) {
-    std::string_view bytes = given.view();
+bool XMLInput::decodeBytes(std::string_view bytes) {
     const EncodingSignature signature = encodingSignature(bytes);
     if (signature.encoding != nullptr) {
         bytes.remove_prefix(signature.markSize);
         if (isUTF8Name(signature.encoding))
-            lend(bytes, given.isTerminated());
+            _text = bytes;
         else
             convert(bytes, signature.encoding);
         _declaredEncoding = encodingInDeclaration(_text);
-        return;
+        return !isUTF8Name(signature.encoding);
     }
     _declaredEncoding = encodingInDeclaration(bytes);
     if (_declaredEncoding.isEmpty() || isUTF8Name(_declaredEncoding)) {
-        lend(bytes, given.isTerminated());
-        return;
+        _text = bytes;
+        return false;
     }
     convert(bytes, _declaredEncoding);
     // An encoding that stores ASCII in another way cannot be what the declaration was read in.
     if (!_text.starts_with(declarationStart))
         throw ParseFailure(parseErrors::otherEncoding, {_declaredEncoding}, 0);
+    return true;
 }
 
 void XMLInput::convert(std::string_view bytes, const String& encoding) {

@@ -26,8 +26,8 @@ public:
     const String& declaredEncoding() const noexcept { return _declaredEncoding; }
 
 private:
-    void decodeBytes(XMLBytes given);
-    void lend(std::string_view bytes, bool isTerminated);
+    // Whether the text was converted, and is our own.
+    bool decodeBytes(std::string_view bytes);
     void convert(std::string_view bytes, const String& encoding);
     void checkStart() const;
     void checkStartTags() const;

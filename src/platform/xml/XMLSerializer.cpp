@@ -102,7 +102,7 @@ void XMLSerializer::writeTree(const XMLNode& top) {
         if (element != nullptr && element->holdsText()) {
             startTag(*element);
             const String text = element->_value;
-            writeEscaped(text, Where::text, isWhite(text), {*element, Place::Part::text});
+            writeEscaped(text, Where::text, isWhite(text), {*element, true});
             endTag(*element);
         } else if (element != nullptr) {
             startElement(*element);
@@ -135,7 +135,7 @@ void XMLSerializer::startTag(const XMLElement& element) {
     }
     element.forEachAttribute([&](const String& name, const String& value) {
         _output += ' ';
-        writeAttribute(name, value, &element, {element, Place::Part::attribute, &name});
+        writeAttribute(name, value, &element, {element, false, &name});
     });
     if (element.childCount() != 0 || !has(XMLCompactEmptyElements))
         _output += '>';
@@ -318,10 +318,9 @@ XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
 }
 
 const XMLNode& XMLSerializer::Place::spelledOut() const {
-    if (part == Part::itself)
-        return node;
-    return part == Part::text ? *node.firstChild()
-                              : *node.asElement()->attributeForName(*attributeName);
+    if (attributeName != nullptr)
+        return *node.asElement()->attributeForName(*attributeName);
+    return isItsText ? *node.firstChild() : node;
 }
 
 void XMLSerializer::refuse(std::string_view what, const Place& place) {

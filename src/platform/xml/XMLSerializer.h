@@ -35,10 +35,9 @@ private:
     };
     // What is being written, for messages: a node, or what an element holds instead of one.
     struct Place {
-        enum class Part : std::uint8_t { itself, text, attribute };
         const XMLNode& node;
-        Part part = Part::itself;
-        const String* attributeName = nullptr;
+        bool isItsText = false;
+        const String* attributeName = nullptr; // of the node's attribute
         const XMLNode& spelledOut() const;
     };
     enum class Where { text, attribute };

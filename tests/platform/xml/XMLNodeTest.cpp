@@ -149,6 +149,7 @@ TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
         const Ref<XMLNode> copied = held.copy();
         std::string seen = "<a";
         held.forEachAttribute([&](const qx::String& name, const qx::String& value) {
+            EXPECT_TRUE(name != "n7" || held.attributeForName("n39")); // makes nodes of all
             seen += " " + name.str() + "=\"" + value.str() + "\"";
         });
         EXPECT_EQ(seen + "></a>", text);
@@ -169,6 +170,10 @@ TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
     EXPECT_TRUE(element->attributeValue("c").isNull());
     EXPECT_EQ(element->attributeForName("c"), nullptr);
     element->addAttribute("c", nullptr);
+    const auto nameless = XMLElement::initForAttributes("a", 2);
+    nameless->addAttribute(nullptr, "1");
+    nameless->addAttribute(nullptr, "2");
+    EXPECT_EQ(nameless->description(), "<a =\"1\"></a>");
     element->addAttribute("d", "\x1F");
     EXPECT_EQ(element->description(), "<a b=\"1\" c=\"\" d=\"\x1F\"></a>");
     const auto refused = XMLElement::initForAttributes("a", 2);
