@@ -40,13 +40,14 @@ void TextPosition::moveTo(std::size_t offset) noexcept {
     const char* from = _text.data() + _offset;
     const char* const to = _text.data() + offset;
     _offset = offset;
-    while (const void* lineEnd = std::memchr(from, '\n', static_cast<std::size_t>(to - from))) {
+    while (from != to) {
+        const void* lineEnd = std::memchr(from, '\n', static_cast<std::size_t>(to - from));
+        if (lineEnd == nullptr)
+            break;
         ++_line;
         const char* const start = static_cast<const char*>(lineEnd) + 1;
         from = skipBlanks(start, to);
         _column = static_cast<std::size_t>(from - start) + 1;
-        if (from == to)
-            return;
     }
     _column += countCodePoints(from, to);
 }
