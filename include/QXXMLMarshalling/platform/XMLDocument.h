@@ -21,6 +21,7 @@
 #include <QXXMLMarshalling/platform/Error.h>
 #include <QXXMLMarshalling/platform/XMLElement.h>
 
+#include <concepts>
 #include <iosfwd>
 
 namespace qx {
@@ -41,6 +42,11 @@ struct XMLParseOptions {
 class XMLBytes {
 public:
     XMLBytes(std::string_view bytes) noexcept : _view(bytes) {}
+    XMLBytes(const char* bytes, std::size_t size) noexcept : _view(bytes, size) {}
+    // Any other text, such as a host's own strings.
+    template <class Text>
+    requires std::convertible_to<const Text&, std::string_view> XMLBytes(const Text& text)
+    noexcept : _view(text) {}
     XMLBytes(const std::string& text) noexcept : _view(text), _isTerminated(true) {}
     XMLBytes(const String& text) noexcept : _view(text), _isTerminated(true) {}
     XMLBytes(const Data& data) noexcept : _view(data.view()), _isTerminated(data.isTerminated()) {}
