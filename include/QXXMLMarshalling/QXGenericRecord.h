@@ -46,7 +46,8 @@ public:
 
     // A new record of the same class with the same class name and flag, and a copy of the contents:
     // a deep one where the host has installed one (qx::Dictionary::setDeepCopyFunction), else one
-    // that shares the values. It has no undo manager.
+    // that shares the values. It has no undo manager. Raises NSInternalInconsistencyException where
+    // the class cannot be created: nobody described it, or it takes arguments.
     virtual qx::Ref<QXGenericRecord> copyWithZone() const;
 
     // The value under the key as a T; none when there is no value or T does not take it.
@@ -87,7 +88,7 @@ public:
     void setClassName(const qx::String& name) { _className = name; }
     // Null until the first value is set.
     const qx::Ref<qx::Dictionary>& contents() const noexcept { return _contents; }
-    void setContents(qx::Ref<qx::Dictionary> contents) { _contents = std::move(contents); }
+    void setContents(qx::Ref<qx::Dictionary> contents);
 
     // Remember the value before a change; register the change with the undo manager after it.
     void willChangeValueForKey(qx::Key key) override;
@@ -95,7 +96,7 @@ public:
     void willChange(qx::ChangeKind kind, std::span<const std::size_t> indexes,
                     qx::Key key) override;
     // False where the class or the record vetoes undo for the key; see ChangeTracking.h.
-    bool isUndoRegistrationEnabledForKey(qx::Key key);
+    bool isUndoRegistrationEnabledForKey(qx::Key key) const;
 
     // Have the operation, which takes the change dictionary (Observation.h), called on this record
     // at each change of the value at the key path. The collection is an array or a dictionary,
@@ -128,14 +129,18 @@ private:
     friend class ObjectDoor;
 
     const qx::Ref<qx::Dictionary>& filledContents() {
-        if (!_contents)
+        if (!_contents) {
             _contents = qx::make<qx::Dictionary>();
+            _isFilledQuietly = _tracking.isIdle();
+        }
         return _contents;
     }
     // False when the value has to be set the usual way; it is left alone then.
     bool addQuietly(qx::Key key, qx::Value&& value);
 
     bool _notifyBindingsObservers = true;
+    // The change cache lacks the keys that were added quietly: each was null before.
+    mutable bool _isFilledQuietly = false;
     qx::ChangeTracking _tracking;
     qx::String _className;
     qx::Ref<qx::Dictionary> _contents;

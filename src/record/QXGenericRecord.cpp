@@ -1,6 +1,9 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
 #include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/platform/Null.h>
+#include <QXXMLMarshalling/platform/Observation.h>
 #include <QXXMLMarshalling/platform/UserDefaults.h>
 
 #include "platform/object/NameList.h"
@@ -22,6 +25,11 @@ QXGenericRecord::~QXGenericRecord() {
 }
 
 namespace {
+
+// The zone is a relic that every caller passes and nobody looks at.
+Ref<QXGenericRecord> copyInZone(const QXGenericRecord& record, const Value&) {
+    return record.copyWithZone();
+}
 
 const qx::Class& describe() {
     using Record = QXGenericRecord;
@@ -62,7 +70,7 @@ const qx::Class& describe() {
                         instanceOperation<Record, &Record::description>("description"),
                         instanceOperation<Record, &Record::isUndoRegistrationEnabledForKey>(
                             "isUndoRegistrationEnabledForKey:"),
-                        instanceOperation<Record, &Record::copyWithZone>("copyWithZone:"),
+                        instanceOperation<Record, &copyInZone>("copyWithZone:"),
                         instanceOperation<Record, &Record::_cacheValueForKey>("_cacheValueForKey:"),
                         instanceOperation<Record, &Record::_setValue>("_setValue:forKey:")},
          .classOperations = {classOperation<&Record::allKnownKeyPaths>("allKnownKeyPaths"),
@@ -83,9 +91,13 @@ const qx::Class& QXGenericRecord::classObject() {
 const qx::Class& QXGenericRecord::describedClass() const { return classObject(); }
 
 Ref<QXGenericRecord> QXGenericRecord::copyWithZone() const {
-    auto copy = isa().create().as<QXGenericRecord>();
-    if (!copy)
-        copy = qx::make<QXGenericRecord>();
+    const auto copy = isa().create().as<QXGenericRecord>();
+    const QXGenericRecord& self = *this;
+    if (!copy || typeid(*copy) != typeid(self))
+        throw qx::Exception(
+            qx::Exception::internalInconsistency,
+            String::concat({"a record of class ", isa().name(),
+                            " cannot be copied: its description makes no such record"}));
     copy->setClassName(_className);
     if (_contents) {
         auto deep = Dictionary::deepCopyFunction();
@@ -109,10 +121,11 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
     return _contents ? _contents->get(key.string()) : Value();
 }
 
-// The many first values of a record that is read from a document: nobody is told, nothing is
-// remembered.
+// The many first values of a record that is read from a document: nobody is told, and what there is
+// to remember, that the key had no value, can be told later from the contents.
 bool QXGenericRecord::addQuietly(Key key, Value&& value) {
-    const bool isQuiet = _tracking.isIdle() && !hasCompany() && &isa() == &described;
+    const bool isQuiet = (_isFilledQuietly || !_contents) && _tracking.isIdle() && !hasCompany() &&
+                         &isa() == &described;
     return isQuiet && !value.isNull() && !key.view().starts_with('@') &&
            filledContents()->add(key.string(), std::move(value));
 }
@@ -121,18 +134,17 @@ void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
     filledContents();
     if (addQuietly(key, Value(value)))
         return;
-    willChangeValueForKey(key);
+    const qx::ChangeScope scope(*this, key);
     // Whoever was told may have given the record other contents.
     if (const Ref<Dictionary> contents = filledContents(); value.isNull())
         contents->remove(key.string());
     else
         contents->set(key.string(), value);
-    didChangeValueForKey(key);
 }
 
 Ref<QXGenericRecord> QXGenericRecord::init() { return qx::make<QXGenericRecord>(); }
 
-void QXGenericRecord::_cacheValueForKey(Key key) { _tracking.willChangeValueForKey(key); }
+void QXGenericRecord::_cacheValueForKey(Key key) { _tracking.cacheValueForKey(key); }
 
 void QXGenericRecord::_setValue(const Value& value, Key key) { _tracking.restoreValue(value, key); }
 
@@ -146,10 +158,26 @@ void QXGenericRecord::setUndoManager(Ref<qx::UndoManager> manager) {
     _tracking.setUndoManager(std::move(manager));
 }
 
-Ref<Dictionary> QXGenericRecord::changeCache() const { return _tracking.changeCache(); }
+Ref<Dictionary> QXGenericRecord::changeCache() const {
+    const Ref<Dictionary> cache = _tracking.changeCache();
+    if (_isFilledQuietly)
+        for (const auto& entry : *_contents)
+            cache->add(entry.key, Value(qx::Null::marker()));
+    _isFilledQuietly = false;
+    return cache;
+}
 
 void QXGenericRecord::setChangeCache(Ref<Dictionary> cache) {
     _tracking.setChangeCache(std::move(cache));
+    _isFilledQuietly = false;
+}
+
+// What the old contents tell of earlier changes is noted before they go.
+void QXGenericRecord::setContents(Ref<Dictionary> contents) {
+    if (_isFilledQuietly && !_contents->isEmpty())
+        changeCache();
+    _contents = std::move(contents);
+    _isFilledQuietly = false;
 }
 
 void QXGenericRecord::willChangeValueForKey(Key key) {
@@ -174,7 +202,7 @@ void QXGenericRecord::willChange(qx::ChangeKind kind, std::span<const std::size_
     Object::willChange(kind, indexes, key);
 }
 
-bool QXGenericRecord::isUndoRegistrationEnabledForKey(Key key) {
+bool QXGenericRecord::isUndoRegistrationEnabledForKey(Key key) const {
     return _tracking.isUndoRegistrationEnabledForKey(key);
 }
 

@@ -130,6 +130,9 @@ TEST(QXGenericRecordTest, ACopyHasItsOwnDictionaryAndNoHistory) {
     EXPECT_TRUE(book->valueForKey("title").isNull());
     EXPECT_EQ(copy->valueForKey("author").object(), author.get());
     EXPECT_FALSE(make<Record>()->copyWithZone()->contents());
+    EXPECT_TRUE(book->perform("copyWithZone:", nullptr).as<Book>());
+    struct Undescribed : Record {};
+    EXPECT_THROW(make<Undescribed>()->copyWithZone(), Exception);
 }
 
 TEST(QXGenericRecordTest, ACopyIsDeepWhereTheHostSaysHow) {

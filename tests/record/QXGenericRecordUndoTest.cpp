@@ -9,6 +9,7 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <functional>
 #include <random>
 #include <stdexcept>
@@ -78,6 +79,88 @@ TEST_F(QXGenericRecordUndoTest, UndoingRemovesAKeyThatWasNewAndRedoingBringsItBa
     EXPECT_EQ(book->valueForKey("name"), Value("Emma"));
     EXPECT_EQ(book->changeCache()->get("name"), Value("Emma"));
     EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(QXGenericRecordUndoTest, TheCacheIsTheSameWithoutAnUndoManager) {
+    for (const Ref<Object>& object :
+         {Ref<Object>(make<Record>()), Ref<Object>(make<Book>()), Ref<Object>(make<Reader>())}) {
+        const auto cached = [&] {
+            const auto record = object.as<Record>();
+            const auto cache = record ? record->changeCache() : object.as<Reader>()->changeCache();
+            return cache->get("name");
+        };
+        object->setValueForKey("Emma", "name");
+        EXPECT_EQ(cached().object(), Null::marker());
+        object->setValueForKey("Ann", "name");
+        EXPECT_EQ(cached(), Value("Emma"));
+    }
+    // What was not announced is no change, and what was dropped stays so.
+    const auto record = make<Record>();
+    record->setValueForKey(1, "a");
+    record->setContents(record->contents()->mutableCopy());
+    record->contents()->set("b", 2);
+    EXPECT_EQ(record->changeCache()->allKeys()->count(), 1U);
+    record->setChangeCache(nullptr);
+    EXPECT_TRUE(record->changeCache()->isEmpty());
+}
+
+TEST_F(QXGenericRecordUndoTest, AKeyThatComesBackHasItsPlaceAgain) {
+    for (const int size : {3, 8, 500}) {
+        const auto record = make<Record>();
+        for (int i = 0; i < size; ++i)
+            record->setValueForKey(i, std::to_string(i));
+        record->setUndoManager(manager);
+        const std::vector<String> keys = record->keys();
+        {
+            const UndoGroup group(manager);
+            for (int i = 0; i < size; i += 2)
+                record->setValueForKey(nullptr, std::to_string(i));
+            for (int i = 0; i < size; ++i)
+                record->setValueForKey(i, "new" + std::to_string(i));
+        }
+        const std::vector<String> changed = record->keys();
+        for (int round = 0; round < 2; ++round) {
+            manager->undo();
+            EXPECT_EQ(record->keys(), keys);
+            manager->redo();
+            EXPECT_EQ(record->keys(), changed);
+        }
+    }
+}
+
+TEST_F(QXGenericRecordUndoTest, KeysComeAndGoBesideManyOthers) {
+    const auto record = make<Record>();
+    for (int i = 0; i < 100000; ++i)
+        record->setValueForKey(i, std::to_string(i));
+    record->setUndoManager(manager);
+    const auto begin = std::chrono::steady_clock::now();
+    for (int i = 0; i < 20000; ++i) {
+        record->setValueForKey(nullptr, "50000");
+        record->setValueForKey(i, "50000");
+    }
+    for (int i = 0; i < 50000; ++i)
+        record->setValueForKey(nullptr, std::to_string(i));
+    manager->undo();
+    manager->redo();
+    manager->undo();
+    EXPECT_EQ(record->keys()[50000], "50000");
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));
+}
+
+TEST_F(QXGenericRecordUndoTest, AnObserverThatThrowsDoesNotStopUndoOrRedo) {
+    const auto token = book->observe("b", [&](const ValueChange&) {
+        if (manager->isUndoing() || manager->isRedoing())
+            throw std::runtime_error("observer");
+    });
+    for (const char* key : {"a", "b", "c"})
+        book->setValueForKey(key, key);
+    const std::vector<String> keys = book->keys();
+    for (int round = 0; round < 2; ++round) {
+        EXPECT_THROW(manager->undo(), std::runtime_error);
+        EXPECT_TRUE(book->keys().empty());
+        EXPECT_THROW(manager->redo(), std::runtime_error);
+        EXPECT_EQ(book->keys(), keys);
+    }
 }
 
 TEST_F(QXGenericRecordUndoTest, OnlyRealChangesAreRegistered) {

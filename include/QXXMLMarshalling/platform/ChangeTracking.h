@@ -12,13 +12,15 @@
 // UndoableObject (UndoableObject.h) is such a class, ready to derive from.
 //
 // Before a change the value is remembered; after it, where the value differs, an action that sets
-// the old one back is registered with the undo manager. The owner's class may veto that:
+// the old one back is registered with the undo manager. What memory that takes is had before the
+// change: where it fails, there is neither. The owner's class may veto the registration:
 //
 //     class operation "disabledKeyPathsForUndoRegistration"     returns the keys, a set or an array
 //     operation "isUndoRegistrationEnabledForTitle"             returns false (for the key "title")
 //     class operation "isUndoRegistrationEnabledForTitle"       vetoes whatever it returns
 //
-// The key is capitalized word by word in these names: "firstName" gives "…ForFirstname".
+// The key is capitalized word by word in these names: "firstName" gives "…ForFirstname". A veto
+// that throws is none: the change is registered, and the exception comes out.
 
 #include <QXXMLMarshalling/platform/Dictionary.h>
 #include <QXXMLMarshalling/platform/UndoManager.h>
@@ -42,12 +44,13 @@ public:
     Ref<Dictionary> changeCache() const;
     void setChangeCache(Ref<Dictionary> cache) noexcept { _cache = std::move(cache); }
 
-    // True while there is no undo manager and nothing is remembered: then a change from null leaves
-    // no trace here.
+    // True while there is no undo manager and nothing is remembered.
     bool isIdle() const noexcept { return !_undoManager && !_cache; }
 
     // Remembers the value of the key, for changes of a collection's items too.
     void willChangeValueForKey(Key key);
+    // No more than that, for when no change follows.
+    void cacheValueForKey(Key key);
     // Registers the change, if it is one. To be called before observers are told.
     void didChangeValueForKey(Key key);
 
@@ -59,6 +62,7 @@ public:
     void restoreValue(const Value& value, Key key);
 
 private:
+    bool isToBeRegistered(const UndoManager& manager, Key key, const Value& before) const;
     bool isCache(const Value& value) const noexcept;
 
     Object& _owner;

@@ -1,8 +1,10 @@
 #pragma once
 
 // Values by string key, shared by reference, in the order in which keys were first set: output is
-// the same on every run. Changing it while it is walked raises NSGenericException at the walk's
-// next step. Small dictionaries are scanned, larger ones carry an index.
+// the same on every run. A key that was removed comes back to its place when it is set again,
+// unless the dictionary has lost 1,000 keys more than it holds and then gained others. Changing it
+// while it is walked raises NSGenericException at the walk's next step. Small dictionaries are
+// scanned, larger ones carry an index.
 
 #include <QXXMLMarshalling/platform/ObjectMemory.h>
 #include <QXXMLMarshalling/platform/ShortVector.h>
@@ -17,8 +19,8 @@ class Array;
 class QX_API Dictionary final : public Object {
 public:
     struct Entry {
-        String key; // null: removed
-        Value value;
+        String key;
+        Value value; // null: removed, the key keeps its place
         Entry() noexcept = default;
         Entry(String aKey, Value aValue) noexcept
             : key(std::move(aKey)), value(std::move(aValue)) {}
@@ -51,7 +53,7 @@ public:
     private:
         void skipRemoved() noexcept {
             while (_index < _dictionary->_entries.size() &&
-                   _dictionary->_entries[_index].key.isNull())
+                   _dictionary->_entries[_index].value.isNull())
                 ++_index;
         }
 
@@ -81,7 +83,7 @@ public:
             return addAny(key, std::move(value));
         for (const Entry& entry : _entries)
             if (entry.key.isSameAs(key))
-                return false;
+                return addAny(key, std::move(value));
         changed();
         _entries.emplace_back(key, std::move(value));
         ++_count;
@@ -119,6 +121,8 @@ private:
     static constexpr std::uint32_t usualSize = 4;
     // Up to that many are scanned.
     static constexpr std::size_t fewKeys = 8;
+    // How many more keys than there are keep their places after their removal.
+    static constexpr std::size_t emptyPlaces = 1000;
 
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;

@@ -12,10 +12,10 @@
 // that is its own argument lives until the action goes; removeAllActions() breaks such rings.
 //
 // Without an open group a registration opens one by itself (unless setGroupsByEvent(false)); it
-// ends with endEventGroup(), undo(), redo() or endUndoGrouping(). A group without actions leaves no
-// entry. A manager belongs to one thread at a time. Faults raise NSInternalInconsistencyException:
-// a group ended that is not open, a registration outside any group when none opens by itself, undo
-// and redo inside nested groups or called by an action.
+// ends with endEventGroup(), undo(), redo(), endUndoGrouping() or the next UndoGroup. A group
+// without actions leaves no entry. A manager belongs to one thread at a time. Faults raise
+// NSInternalInconsistencyException: a group ended that is not open, a registration outside any
+// group when none opens by itself, undo and redo inside nested groups or called by an action.
 
 #include <QXXMLMarshalling/platform/Object.h>
 
@@ -83,8 +83,10 @@ public:
     bool isUndoRegistrationEnabled() const noexcept;
 
     // Ends the group that is open, if there is one, and performs the last group. With nothing to
-    // undo nothing happens. What an action throws comes out; its group and what was registered
-    // meanwhile are dropped.
+    // undo nothing happens. Where actions throw, observers of their changes say, the others are
+    // performed all the same, and the first exception comes out at the end. But std::bad_alloc
+    // stops: what was changed is changed back, and the group can be undone again. Should memory
+    // fail for that too, the values in between stay, and both undo() and redo() lead on from them.
     void undo();
     void redo();
     // The same for the last group inside the one that is open, which stays open.
@@ -111,13 +113,17 @@ public:
     String redoActionName() const;
 
 private:
+    friend class ChangeTracking;
     friend class UndoGroup;
     friend class UndoRecorder;
     struct State;
 
     void registerCall(Object& target, std::function<void(Object&)> call);
     void registerOperation(Object* target, Selector selector, std::vector<Value> arguments);
-    std::uint64_t beginGroup();
+    std::uint64_t beginGroup(const String& actionName);
+    // To be called before a change, so that it can be registered afterwards though memory fails.
+    void prepareChange(Object& target);
+    void registerChange(Object& target, Selector selector, const Value& before, Key key);
     void endGroup(std::uint64_t identifier) noexcept;
 
     std::unique_ptr<State> _state;
@@ -125,12 +131,16 @@ private:
 
 // A group that ends with the scope, however it is left, together with groups left open inside it.
 // A group that has ended otherwise meanwhile is left alone. Without a manager nothing happens.
+//
+// The group that opened by itself ends first: outside any other group, the guard is a step of its
+// own. The name is that of the step; inside a step that has one it says nothing.
 class QX_API UndoGroup {
 public:
-    explicit UndoGroup(UndoManager* manager, const String& actionName = nullptr);
-    explicit UndoGroup(UndoManager& manager, const String& actionName = nullptr)
+    [[nodiscard]] explicit UndoGroup(UndoManager* manager, const String& actionName = nullptr);
+    [[nodiscard]] explicit UndoGroup(UndoManager& manager, const String& actionName = nullptr)
         : UndoGroup(&manager, actionName) {}
-    explicit UndoGroup(const Ref<UndoManager>& manager, const String& actionName = nullptr)
+    [[nodiscard]] explicit UndoGroup(const Ref<UndoManager>& manager,
+                                     const String& actionName = nullptr)
         : UndoGroup(manager.get(), actionName) {}
     ~UndoGroup();
     UndoGroup(const UndoGroup&) = delete;

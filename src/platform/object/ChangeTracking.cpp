@@ -7,6 +7,8 @@
 #include "platform/object/NameList.h"
 #include "platform/object/Warning.h"
 
+#include <exception>
+
 namespace qx {
 
 namespace {
@@ -20,6 +22,12 @@ Value entry(const Dictionary& cache, Key key) {
     } catch (const UndefinedKeyException&) {
         return {};
     }
+}
+
+// The operation that undoing calls.
+Selector restoring() {
+    static const Selector selector("_setValue:forKey:");
+    return selector;
 }
 
 // A key that is announced by hand need not be readable.
@@ -47,44 +55,61 @@ Ref<Dictionary> ChangeTracking::changeCache() const {
 }
 
 void ChangeTracking::willChangeValueForKey(Key key) {
+    cacheValueForKey(key);
+    if (_undoManager) {
+        restoring();
+        _undoManager->prepareChange(_owner);
+    }
+}
+
+void ChangeTracking::cacheValueForKey(Key key) {
     Value current = readable(_owner, key);
     if (isCache(current))
         return;
-    const bool isNull = current.isNullOrMarker();
-    // No entry reads as null, so most objects of a document that is only read need no cache. Keys
-    // with a "@" are the dictionary's own properties: they have a value in an empty cache too.
-    const bool isPlain = !key.view().starts_with('@');
-    if (isNull && isPlain && !_undoManager && (!_cache || !_cache->contains(key.string())))
-        return;
-    const Ref<Dictionary> cache = changeCache();
-    if (isNull)
+    if (current.isNullOrMarker())
         current = Value(Null::marker());
+    const Ref<Dictionary> cache = changeCache();
     const Value cached = entry(*cache, key);
     if (cached.isNull() || !(cached.isSameAs(current) || cached.isEqual(current)))
         cache->set(key.string(), std::move(current));
 }
 
+// Asks and tells the host, whose code may throw.
+bool ChangeTracking::isToBeRegistered(const UndoManager& manager, Key key,
+                                      const Value& before) const {
+    if (!isUndoRegistrationEnabledForKey(key))
+        return false;
+    const Value now = nullForMarker(readable(_owner, key));
+    if (isCache(now) || now.isSameAs(before) || (!now.isNull() && now.isEqual(before)))
+        return false;
+    if (const DebugSink log = debugSink()) {
+        const std::array<Value, 3> arguments{key.string(), before, now};
+        log(manager.isUndoing()   ? "Undo for key: %@ existing: %@ value: %@"
+            : manager.isRedoing() ? "Redo for key: %@ existing: %@ value: %@"
+                                  : "Set for key: %@ existing: %@ value: %@",
+            arguments);
+    }
+    return true;
+}
+
 void ChangeTracking::didChangeValueForKey(Key key) {
     // The vetoes are the host's code: they may take the manager away.
     const Ref<UndoManager> manager = _undoManager;
-    if (!manager || !manager->isUndoRegistrationEnabled() || !isUndoRegistrationEnabledForKey(key))
+    if (!manager || !manager->isUndoRegistrationEnabled())
         return;
-    static const Selector restore("_setValue:forKey:");
     const Value before = nullForMarker(_cache ? _cache->get(key.string()) : Value());
-    const Value now = nullForMarker(readable(_owner, key));
-    if (isCache(now))
-        return;
-    if (now.isSameAs(before) || (!now.isNull() && now.isEqual(before)))
-        return;
-    if (const DebugSink log = debugSink()) {
-        const std::array<Value, 3> arguments{key.string(), before, now};
-        log(manager->isUndoing()   ? "Undo for key: %@ existing: %@ value: %@"
-            : manager->isRedoing() ? "Redo for key: %@ existing: %@ value: %@"
-                                   : "Set for key: %@ existing: %@ value: %@",
-            arguments);
+    std::exception_ptr thrown;
+    try {
+        if (!isToBeRegistered(*manager, key, before))
+            return;
+    } catch (...) {
+        // The change has taken place: without its action, those before it would be undone alone.
+        thrown = std::current_exception();
     }
-    manager->prepareWithInvocationTarget(&_owner).perform(restore, before, key.string());
-    willChangeValueForKey(key); // the cache holds the new value now
+    manager->registerChange(_owner, restoring(), before, key);
+    cacheValueForKey(key); // the cache holds the new value now
+    if (thrown)
+        std::rethrow_exception(thrown);
 }
 
 bool ChangeTracking::isUndoRegistrationEnabledForKey(Key key) const {

@@ -29,7 +29,8 @@ inline std::size_t Dictionary::positionOf(const String& key) const noexcept {
 
 const Value* Dictionary::find(const String& key) const noexcept {
     const std::size_t position = positionOf(key);
-    return position != nameindex::none ? &_entries[position].value : nullptr;
+    const bool isThere = position != nameindex::none && !_entries[position].value.isNull();
+    return isThere ? &_entries[position].value : nullptr;
 }
 
 Value Dictionary::get(const String& key) const {
@@ -58,6 +59,8 @@ void Dictionary::set(const String& key, Value value) {
     if (const std::size_t position = positionOf(key); position != nameindex::none) {
         // The replaced value ends last: it may lead back to this dictionary.
         const Value replaced = std::exchange(_entries[position].value, std::move(value));
+        if (replaced.isNull())
+            ++_count;
         return;
     }
     append(key, std::move(value));
@@ -65,10 +68,9 @@ void Dictionary::set(const String& key, Value value) {
 
 bool Dictionary::addAny(const String& key, Value&& value) {
     refuseNull(key, value);
-    if (positionOf(key) != nameindex::none)
+    if (contains(key))
         return false;
-    changed();
-    append(key, std::move(value));
+    set(key, std::move(value));
     return true;
 }
 
@@ -83,27 +85,27 @@ inline void Dictionary::append(const String& key, Value&& value) {
     ++_count;
 }
 
-// Drops the places of removed keys and gives the index twice the room.
+// Gives the index twice the room, and drops the places of removed keys where they are too many.
 void Dictionary::makeRoom() {
-    _entries.eraseIf([](const Entry& entry) { return entry.key.isNull(); });
-    Index index = nameindex::tableFor(_entries.size() + 1);
-    _index = index.empty() ? nullptr : std::make_unique<Index>(std::move(index));
+    const bool drops = _entries.size() - _count > _count + emptyPlaces;
+    Index index = nameindex::tableFor((drops ? _count : _entries.size()) + 1);
+    auto room = index.empty() ? nullptr : std::make_unique<Index>(std::move(index));
+    if (drops)
+        _entries.eraseIf([](const Entry& entry) { return entry.value.isNull(); });
+    _index = std::move(room);
     if (!_index)
         return;
     for (std::size_t i = 0; i < _entries.size(); ++i)
         nameindex::add(*_index, _entries[i].key, i);
 }
 
-// A removed entry keeps its place, so that the index stays true.
 void Dictionary::remove(const String& key) {
     const std::size_t position = positionOf(key);
-    if (position == nameindex::none)
+    if (position == nameindex::none || _entries[position].value.isNull())
         return;
     changed();
     --_count;
-    const Entry removed = std::exchange(_entries[position], Entry());
-    if (!_index)
-        _entries.erase(position);
+    const Value removed = std::exchange(_entries[position].value, {});
 }
 
 void Dictionary::removeAll() {
@@ -160,7 +162,7 @@ String Dictionary::descriptionWithLocale(const Object* locale, std::size_t inden
         return Printing::cutShort;
     std::string text = indentation(indent) + "{\n";
     for (const Entry& entry : _entries) {
-        if (entry.key.isNull())
+        if (entry.value.isNull())
             continue;
         text += indentation(indent + 1);
         text += entry.key.view();
@@ -180,7 +182,7 @@ bool Dictionary::isEqual(const Object& other) const {
     if (dictionary == nullptr || dictionary->_count != _count)
         return false;
     return std::all_of(_entries.begin(), _entries.end(), [&](const Entry& entry) {
-        if (entry.key.isNull())
+        if (entry.value.isNull())
             return true;
         const Value* value = dictionary->find(entry.key);
         return value != nullptr && value->isEqual(entry.value);

@@ -128,6 +128,18 @@ ChangeScope::ChangeScope(Object& object, Key key, ChangeKind kind, std::vector<s
         object.willChange(kind, _indexes, key);
 }
 
+namespace {
+
+void reportThrown(Key key, const char* what) noexcept {
+    try {
+        reportWarning(String::concat(
+            {"An observer of ", key.view(), " threw while the change failed: ", what}));
+    } catch (...) { // NOLINT(bugprone-empty-catch): there is no memory left to say it
+    }
+}
+
+} // namespace
+
 ChangeScope::~ChangeScope() noexcept(false) {
     if (std::uncaught_exceptions() == _exceptions) {
         announceEnd();
@@ -136,11 +148,9 @@ ChangeScope::~ChangeScope() noexcept(false) {
     try {
         announceEnd();
     } catch (const std::exception& exception) {
-        reportWarning(String::concat({"An observer of ", _key.view(),
-                                      " threw while the change failed: ", exception.what()}));
+        reportThrown(_key, exception.what());
     } catch (...) {
-        reportWarning(
-            String::concat({"An observer of ", _key.view(), " threw while the change failed"}));
+        reportThrown(_key, "an exception of its own");
     }
 }
 

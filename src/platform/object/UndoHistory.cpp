@@ -33,21 +33,36 @@ void UndoItemGroup::takeAll(UndoItemGroup& other) noexcept {
     }
 }
 
+void UndoItemGroup::takeAllReversed(UndoItemGroup& other) noexcept {
+    while (UndoItem* item = other.last) {
+        other.unlink(*item);
+        append(*item);
+    }
+}
+
 UndoHistory::~UndoHistory() {
     removeContents(_undoStack);
     removeContents(_redoStack);
+    // Room may have been made for targets that got no action.
+    for (const auto& [target, first] : _firstOfTarget)
+        ObjectInternals::removeEndListener(*target, *this);
+}
+
+void UndoHistory::makeRoomFor(Object& target) {
+    const auto [entry, isNew] = _firstOfTarget.try_emplace(&target, nullptr);
+    if (!isNew)
+        return;
+    try {
+        ObjectInternals::addEndListener(target, *this);
+    } catch (...) {
+        _firstOfTarget.erase(entry);
+        throw;
+    }
 }
 
 void UndoHistory::add(UndoAction* action, UndoItemGroup& group) {
-    UndoAction*& first = _firstOfTarget[action->target];
-    if (first == nullptr) {
-        try {
-            ObjectInternals::addEndListener(*action->target, *this);
-        } catch (...) {
-            _firstOfTarget.erase(action->target);
-            throw;
-        }
-    }
+    makeRoomFor(*action->target);
+    UndoAction*& first = _firstOfTarget.find(action->target)->second;
     action->nextOfTarget = first;
     if (first != nullptr)
         first->previousOfTarget = action;
@@ -61,7 +76,7 @@ void UndoHistory::unlinkFromTarget(UndoAction& action) noexcept {
     if (action.previousOfTarget != nullptr) {
         action.previousOfTarget->nextOfTarget = action.nextOfTarget;
     } else if (action.nextOfTarget != nullptr) {
-        _firstOfTarget[action.target] = action.nextOfTarget;
+        _firstOfTarget.find(action.target)->second = action.nextOfTarget;
     } else {
         _firstOfTarget.erase(action.target);
         ObjectInternals::removeEndListener(*action.target, *this);
@@ -70,11 +85,22 @@ void UndoHistory::unlinkFromTarget(UndoAction& action) noexcept {
 }
 
 void UndoHistory::forgetTarget(const Object* target) noexcept {
-    const auto found = _firstOfTarget.find(target);
+    const auto found = _firstOfTarget.find(const_cast<Object*>(target));
     if (found == _firstOfTarget.end())
         return;
+    if (found->second == nullptr) {
+        ObjectInternals::removeEndListener(*found->first, *this);
+        _firstOfTarget.erase(found);
+        return;
+    }
     UndoItemGroup forgotten;
-    for (UndoAction* action = found->second; action != nullptr; action = action->nextOfTarget) {
+    UndoAction* following = nullptr;
+    for (UndoAction* action = found->second; action != nullptr; action = following) {
+        following = action->nextOfTarget;
+        if (action->parent == nullptr) {
+            forgetPerformed(*action);
+            continue;
+        }
         // A group that this empties leaves no entry, nor do those around it.
         UndoItem* item = action;
         UndoItemGroup* parent = item->parent;
@@ -88,6 +114,11 @@ void UndoHistory::forgetTarget(const Object* target) noexcept {
         forgotten.append(*action);
     }
     removeContents(forgotten);
+}
+
+void UndoHistory::forgetPerformed(UndoAction& action) noexcept {
+    unlinkFromTarget(action);
+    action.target = nullptr;
 }
 
 void UndoHistory::destroy(UndoItem* item) noexcept {
@@ -122,11 +153,8 @@ void UndoHistory::removeContents(UndoItemGroup& group) noexcept {
 UndoAction* UndoHistory::takeLastAction(UndoItemGroup& group) noexcept {
     while (UndoItem* item = group.last) {
         group.unlink(*item);
-        if (!item->isGroup) {
-            auto* action = static_cast<UndoAction*>(item);
-            unlinkFromTarget(*action);
-            return action;
-        }
+        if (!item->isGroup)
+            return static_cast<UndoAction*>(item);
         auto* nested = static_cast<UndoItemGroup*>(item);
         group.takeAll(*nested);
         delete nested;

@@ -5,7 +5,8 @@
 // linked, and so are the actions of one target, so that forgetting a target costs what it has here.
 //
 // Ending an action may run a host's destructors, which may come back in here: items are unlinked
-// first and destroyed last.
+// first and destroyed last. An action that is being performed is in no group, but still among those
+// of its target, whose room here so lasts; its performer destroys it.
 
 #include <QXXMLMarshalling/platform/Value.h>
 
@@ -55,6 +56,8 @@ struct UndoItemGroup : UndoItem {
     void unlink(UndoItem& item) noexcept;
     // Moves the other's items to the end.
     void takeAll(UndoItemGroup& other) noexcept;
+    // The same, the other's last item first.
+    void takeAllReversed(UndoItemGroup& other) noexcept;
 };
 
 class UndoHistory final : private EndListener {
@@ -67,15 +70,19 @@ public:
     UndoItemGroup& undoStack() noexcept { return _undoStack; }
     UndoItemGroup& redoStack() noexcept { return _redoStack; }
 
-    // Adds the action to the group and to those of its target.
+    // Adds the action to the group and to those of its target. Cannot fail after makeRoomFor.
     void add(UndoAction* action, UndoItemGroup& group);
+    // The room lasts until the target's last action goes.
+    void makeRoomFor(Object& target);
     void forgetTarget(const Object* target) noexcept;
+    // Takes an action that is being performed from its target.
+    void forgetPerformed(UndoAction& action) noexcept;
     // Destroys the item; it must be unlinked.
     void destroy(UndoItem* item) noexcept;
     void removeContents(UndoItemGroup& group) noexcept;
     // Takes the last action out, those of nested groups one by one; null when there is none left.
-    // It belongs to the caller and to no target any more.
-    UndoAction* takeLastAction(UndoItemGroup& group) noexcept;
+    // It belongs to the caller; its target is null once it was forgotten meanwhile.
+    static UndoAction* takeLastAction(UndoItemGroup& group) noexcept;
 
 private:
     void objectEnds(Object& object) noexcept override { forgetTarget(&object); }
@@ -83,7 +90,7 @@ private:
 
     UndoItemGroup _undoStack;
     UndoItemGroup _redoStack;
-    std::unordered_map<const Object*, UndoAction*> _firstOfTarget;
+    std::unordered_map<Object*, UndoAction*> _firstOfTarget; // null: only room
 };
 
 } // namespace qx

@@ -7,12 +7,19 @@
 #include "platform/object/UndoHistory.h"
 
 #include <algorithm>
+#include <exception>
+#include <new>
+#include <utility>
 
 namespace qx {
 
 namespace {
 
 enum class Doing : std::uint8_t { nothing, undo, redo };
+
+// How many changes that are announced at once are sure to be registered, should memory fail.
+constexpr std::size_t spareActionCount = 8;
+constexpr std::size_t argumentsOfChange = 2;
 
 [[noreturn]] void raiseInconsistency(std::string_view reason) {
     throw Exception(Exception::internalInconsistency, reason);
@@ -21,11 +28,16 @@ enum class Doing : std::uint8_t { nothing, undo, redo };
 } // namespace
 
 struct UndoManager::State {
+    struct Performance;
+
     UndoHistory history;
     std::vector<std::unique_ptr<UndoItemGroup>> open; // the outermost first
+    // Made beforehand: what a change needs to be registered, once it has taken place.
+    std::unique_ptr<UndoItemGroup> spareGroup;
+    std::vector<std::unique_ptr<UndoAction>> spareActions;
     // Groups below this one were open when an undo began: its actions cannot end them.
     std::size_t floor = 0;
-    UndoItemGroup* performed = nullptr;
+    Performance* performance = nullptr; // the undo or redo that runs
     Doing doing = Doing::nothing;
     bool groupsByEvent = true;
     bool outermostOpenedByItself = false;
@@ -37,10 +49,38 @@ struct UndoManager::State {
         return doing == Doing::undo ? history.redoStack() : history.undoStack();
     }
 
+    // After it one group opens without fail.
+    void prepareGroup() {
+        if (!spareGroup)
+            spareGroup = std::make_unique<UndoItemGroup>();
+        if (open.size() == open.capacity())
+            open.reserve(2 * open.size() + 1);
+    }
+
+    // After it a change of the target is registered without fail.
+    void prepareChange(Object& target) {
+        prepareGroup();
+        spareActions.reserve(spareActionCount);
+        while (spareActions.size() < spareActionCount) {
+            auto action = std::make_unique<UndoAction>();
+            action->arguments.reserve(argumentsOfChange);
+            spareActions.push_back(std::move(action));
+        }
+        history.makeRoomFor(target);
+    }
+
+    std::unique_ptr<UndoAction> takeAction() {
+        if (spareActions.empty())
+            return std::make_unique<UndoAction>();
+        std::unique_ptr<UndoAction> action = std::move(spareActions.back());
+        spareActions.pop_back();
+        return action;
+    }
+
     UndoItemGroup& openGroup() {
-        auto group = std::make_unique<UndoItemGroup>();
-        group->identifier = ++lastIdentifier;
-        open.push_back(std::move(group));
+        prepareGroup();
+        spareGroup->identifier = ++lastIdentifier;
+        open.push_back(std::move(spareGroup));
         return *open.back();
     }
 
@@ -107,52 +147,113 @@ struct UndoManager::State {
     void performLast(UndoItemGroup& stack, Doing what);
 };
 
-// Performs the last group of the stack. Whatever is registered meanwhile goes into one group, which
-// becomes an entry of the other stack when all has gone well.
+// One undo or redo: performs the last group of a stack. Whatever is registered meanwhile goes into
+// one group, which becomes an entry of the other stack. Actions that were performed are kept until
+// all is over: should memory fail, what was recorded is performed to take their effect back, and
+// they return to where they were.
+struct UndoManager::State::Performance {
+    Performance(State& itsState, UndoItemGroup& itsStack, Doing what)
+        : state(itsState), stack(itsStack), outerFloor(itsState.floor) {
+        state.prepareGroup();
+        group.reset(static_cast<UndoItemGroup*>(stack.last));
+        stack.unlink(*group);
+        group->stays = true;
+        state.openGroup().actionName = group->actionName;
+        state.floor = state.open.size() - 1;
+        state.performance = this;
+        state.doing = what;
+    }
+
+    UndoItemGroup& recording() noexcept { return *state.open[state.floor]; }
+
+    // Performs the group's actions, each moved to `to` then. What they throw first is kept. False
+    // when memory failed: the rest is left.
+    bool perform(UndoItemGroup& from, UndoItemGroup& to, std::exception_ptr& thrown) noexcept {
+        while ((running = UndoHistory::takeLastAction(from)) != nullptr) {
+            bool memoryLasts = true;
+            try {
+                if (!ObjectInternals::isEnding(*running->target)) {
+                    const Ref<Object> target(running->target);
+                    running->performOn(*target);
+                }
+            } catch (const std::bad_alloc&) {
+                thrown = std::current_exception();
+                memoryLasts = false;
+            } catch (...) {
+                if (!thrown)
+                    thrown = std::current_exception();
+            }
+            UndoAction* const action = std::exchange(running, nullptr);
+            if (action->target != nullptr)
+                to.append(*action);
+            else
+                delete action;
+            if (!memoryLasts)
+                return false;
+        }
+        return true;
+    }
+
+    void run() {
+        std::exception_ptr thrown;
+        if (perform(*group, performed, thrown))
+            end();
+        else
+            takeBack();
+        // Ends arguments of the host, when nothing here is in use any more.
+        state.history.removeContents(performed);
+        if (thrown)
+            std::rethrow_exception(thrown);
+    }
+
+    void closeGroupsAbove(std::size_t level) noexcept {
+        while (state.open.size() > level)
+            state.closeGroup();
+    }
+
+    void end() noexcept {
+        closeGroupsAbove(state.floor);
+        state.performance = nullptr;
+        state.doing = Doing::nothing;
+        state.floor = outerFloor;
+    }
+
+    // Where memory does not even suffice for that, the recording is kept too: both groups then set
+    // values that some objects have already, and nothing is lost.
+    void takeBack() noexcept {
+        closeGroupsAbove(state.floor + 1);
+        const std::size_t disabled = std::exchange(state.disabled, 1);
+        std::exception_ptr ignored;
+        bool memoryLasts = true;
+        while (!perform(recording(), takenBack, ignored))
+            memoryLasts = false;
+        closeGroupsAbove(state.floor + 1);
+        state.disabled = disabled;
+        if (!memoryLasts)
+            recording().takeAllReversed(takenBack);
+        group->takeAllReversed(performed);
+        performed.takeAll(takenBack);
+        end();
+        group->stays = false;
+        if (group->count != 0)
+            stack.append(*group.release());
+    }
+
+    State& state;
+    UndoItemGroup& stack;
+    std::size_t outerFloor;
+    std::unique_ptr<UndoItemGroup> group;
+    UndoAction* running = nullptr;
+    UndoItemGroup performed;
+    UndoItemGroup takenBack;
+};
+
 void UndoManager::State::performLast(UndoItemGroup& stack, Doing what) {
     if (stack.last == nullptr)
         return;
     if (!stack.last->isGroup)
         raiseInconsistency("the last entry of the open group is an action, not a nested group");
-
-    struct Performance {
-        State& state;
-        std::unique_ptr<UndoItemGroup> group;
-        std::size_t outerFloor = state.floor;
-        bool completed = false;
-
-        ~Performance() {
-            if (!completed)
-                state.history.removeContents(*group);
-            while (state.open.size() > state.floor) {
-                if (!completed)
-                    state.history.removeContents(*state.open.back());
-                state.closeGroup();
-            }
-            state.performed = nullptr;
-            state.doing = Doing::nothing;
-            state.floor = outerFloor;
-        }
-    };
-
-    UndoItemGroup& recording = openGroup();
-    auto* group = static_cast<UndoItemGroup*>(stack.last);
-    stack.unlink(*group);
-    group->stays = true;
-    recording.actionName = group->actionName;
-    performed = group;
-    doing = what;
-    Performance performance{*this, std::unique_ptr<UndoItemGroup>(group)};
-    floor = open.size() - 1;
-
-    while (UndoAction* last = history.takeLastAction(*group)) {
-        const std::unique_ptr<UndoAction> action(last);
-        if (ObjectInternals::isEnding(*action->target))
-            continue;
-        const Ref<Object> target(action->target);
-        action->performOn(*target);
-    }
-    performance.completed = true;
+    Performance(*this, stack, what).run();
 }
 
 UndoManager::UndoManager() : _state(std::make_unique<State>()) {}
@@ -162,9 +263,20 @@ UndoManager::~UndoManager() {
         _state->history.removeContents(*group);
 }
 
-void UndoManager::beginUndoGrouping() { beginGroup(); }
+void UndoManager::beginUndoGrouping() { _state->openGroup(); }
 
-std::uint64_t UndoManager::beginGroup() { return _state->openGroup().identifier; }
+// What was registered outside any group is a step of its own, not the beginning of this one.
+std::uint64_t UndoManager::beginGroup(const String& actionName) {
+    State& state = *_state;
+    state.prepareGroup();
+    if (state.outermostOpenedByItself && state.open.size() == 1)
+        state.closeGroup();
+    const std::uint64_t identifier = state.openGroup().identifier;
+    UndoItemGroup& step = *state.open.front();
+    if (state.doing == Doing::nothing && step.actionName.isNull())
+        step.actionName = actionName;
+    return identifier;
+}
 
 void UndoManager::endUndoGrouping() {
     const Ref<UndoManager> kept(this);
@@ -214,6 +326,18 @@ void UndoRecorder::performWithArguments(Selector selector, std::vector<Value> ar
     _manager.registerOperation(_target, selector, std::move(arguments));
 }
 
+namespace {
+
+void checkAnswers(const Object& target, Selector selector) {
+    if (!target.respondsTo(selector) && !target.methodSignatureForSelector(selector))
+        throw Exception(
+            Exception::invalidArgument,
+            String::concat({"an undo action was registered for the operation ", selector.name(),
+                            ", which class ", target.isa().name(), " does not answer"}));
+}
+
+} // namespace
+
 void UndoManager::registerOperation(Object* target, Selector selector,
                                     std::vector<Value> arguments) {
     if (!isUndoRegistrationEnabled())
@@ -222,16 +346,31 @@ void UndoManager::registerOperation(Object* target, Selector selector,
         throw Exception(Exception::invalidArgument, "an undo action was registered without target");
     if (ObjectInternals::isEnding(*target))
         return;
-    if (!target->respondsTo(selector) && !target->methodSignatureForSelector(selector))
-        throw Exception(
-            Exception::invalidArgument,
-            String::concat({"an undo action was registered for the operation ", selector.name(),
-                            ", which class ", target->isa().name(), " does not answer"}));
+    checkAnswers(*target, selector);
     const Ref<UndoManager> kept(this);
     auto action = std::make_unique<UndoAction>();
     action->target = target;
     action->selector = selector;
     action->arguments = std::move(arguments);
+    _state->add(std::move(action));
+}
+
+void UndoManager::prepareChange(Object& target) {
+    if (isUndoRegistrationEnabled() && !ObjectInternals::isEnding(target))
+        _state->prepareChange(target);
+}
+
+void UndoManager::registerChange(Object& target, Selector selector, const Value& before, Key key) {
+    if (!isUndoRegistrationEnabled() || ObjectInternals::isEnding(target))
+        return;
+    checkAnswers(target, selector);
+    const Ref<UndoManager> kept(this);
+    std::unique_ptr<UndoAction> action = _state->takeAction();
+    action->target = &target;
+    action->selector = selector;
+    action->arguments.reserve(argumentsOfChange);
+    action->arguments.push_back(before);
+    action->arguments.emplace_back(key.string());
     _state->add(std::move(action));
 }
 
@@ -257,12 +396,14 @@ bool UndoManager::isUndoRegistrationEnabled() const noexcept { return _state->di
 
 void UndoManager::undo() {
     const Ref<UndoManager> kept(this);
+    _state->prepareGroup();
     _state->closeOutermost("undo");
     _state->performLast(_state->history.undoStack(), Doing::undo);
 }
 
 void UndoManager::redo() {
     const Ref<UndoManager> kept(this);
+    _state->prepareGroup();
     _state->closeOutermost("redo");
     _state->performLast(_state->history.redoStack(), Doing::redo);
 }
@@ -293,8 +434,13 @@ void UndoManager::removeAllActions() {
         removed.takeAll(*stack);
     for (const auto& group : state.open)
         removed.takeAll(*group);
-    if (state.performed != nullptr)
-        removed.takeAll(*state.performed);
+    if (State::Performance* performance = state.performance) {
+        for (UndoItemGroup* group :
+             {performance->group.get(), &performance->performed, &performance->takenBack})
+            removed.takeAll(*group);
+        if (UndoAction* running = performance->running; running && running->target)
+            state.history.forgetPerformed(*running);
+    }
     if (state.outermostOpenedByItself && state.open.size() == 1)
         state.closeGroup();
     state.history.removeContents(removed);
@@ -335,11 +481,8 @@ String UndoManager::redoActionName() const {
 }
 
 UndoGroup::UndoGroup(UndoManager* manager, const String& actionName) : _manager(manager) {
-    if (manager == nullptr)
-        return;
-    _identifier = manager->beginGroup();
-    if (!actionName.isNull())
-        manager->setActionName(actionName);
+    if (manager != nullptr)
+        _identifier = manager->beginGroup(actionName);
 }
 
 UndoGroup::~UndoGroup() {

@@ -95,6 +95,9 @@ TEST_F(ChangeTrackingTest, AVetoMayThrowAndAnAnnouncedKeyNeedNotBeReadable) {
     EXPECT_THROW(person->setValueForKey(7, "age"), std::runtime_error);
     EXPECT_EQ(person->age, 7);
     EXPECT_EQ(told, 1);
+    EXPECT_THROW(manager->undo(), std::runtime_error);
+    EXPECT_EQ(person->age, 0);
+    manager->removeAllActions();
     person->willChangeValueForKey("mood");
     person->didChangeValueForKey("mood");
     EXPECT_FALSE(manager->canUndo());

@@ -118,6 +118,24 @@ TEST_F(UndoManagerTest, ScopesEndTheirGroupWhateverWasLeftOpenOrClosedInside) {
     EXPECT_EQ(counter->number, 0);
 }
 
+TEST_F(UndoManagerTest, AScopeIsAStepOfItsOwnUnderItsOwnName) {
+    counter->setNumber(1); // in the group that opens by itself
+    {
+        const UndoGroup outer(manager, "Outer");
+        counter->setNumber(2);
+        const UndoGroup inner(manager, "Inner");
+        counter->setNumber(3);
+    }
+    setInGroup(4);
+    EXPECT_EQ(manager->undoActionName(), nullptr);
+    manager->undo();
+    EXPECT_EQ(manager->undoActionName(), "Outer");
+    manager->undo();
+    EXPECT_EQ(counter->number, 1);
+    manager->undo();
+    EXPECT_EQ(counter->number, 0);
+}
+
 TEST_F(UndoManagerTest, DisablingIsCounted) {
     manager->disableUndoRegistration();
     manager->disableUndoRegistration();
@@ -166,19 +184,100 @@ TEST_F(UndoManagerTest, ArgumentsAreKeptUntilTheActionGoes) {
     EXPECT_FALSE(watched);
 }
 
-TEST_F(UndoManagerTest, AnActionThatThrowsDropsItsGroupAndLeavesTheRest) {
+TEST_F(UndoManagerTest, AnActionThatThrowsDoesNotKeepTheOthersFromBeingUndone) {
+    const auto other = make<Counter>(*manager);
     setInGroup(1);
     {
         const UndoGroup group(manager);
-        manager->registerUndoWithTarget(counter.get(), "fail", nullptr);
         counter->setNumber(2);
+        manager->registerUndoWithTarget(counter.get(), "fail", nullptr);
+        other->setNumber(3);
     }
     EXPECT_THROW(manager->undo(), std::runtime_error);
     EXPECT_FALSE(manager->isUndoing());
     EXPECT_EQ(manager->groupingLevel(), 0U);
+    EXPECT_EQ(counter->number * 10 + other->number, 10);
+    manager->redo();
+    EXPECT_EQ(counter->number * 10 + other->number, 23);
     EXPECT_FALSE(manager->canRedo());
+}
+
+TEST_F(UndoManagerTest, AnUndoOrRedoWithoutMemoryLeavesEverythingAsItWas) {
+    bool fails = true;
+    manager->beginUndoGrouping();
+    setInGroup(1, "One");
+    {
+        const UndoGroup group(manager);
+        counter->setNumber(2);
+        manager->registerUndo(*counter, [&](Counter& c) {
+            c.setNumber(9); // half of what it does
+            if (fails)
+                throw std::bad_alloc();
+        });
+        counter->setNumber(3);
+    }
+    EXPECT_THROW(manager->undoNestedGroup(), std::bad_alloc);
+    manager->endUndoGrouping();
+    for (int i = 0; i < 2; ++i) {
+        EXPECT_THROW(manager->undo(), std::bad_alloc);
+        EXPECT_EQ(counter->number, 3);
+        EXPECT_FALSE(manager->isUndoing() || manager->canRedo() || manager->groupingLevel() != 0);
+    }
+    EXPECT_EQ(manager->undoActionName(), "One");
+    fails = false;
     manager->undo();
     EXPECT_EQ(counter->number, 0);
+    manager->redo();
+    EXPECT_EQ(counter->number, 3);
+}
+
+// Each as the second of three actions, alone and before one that finds no memory.
+TEST_F(UndoManagerTest, ActionsMayDoAnythingToTheManagerAndItsTargets) {
+    Ref<Counter> ending;
+    const std::function<void(Counter&)> deeds[] = {
+        [](Counter& c) { c.manager.removeAllActions(); },
+        [](Counter& c) { c.manager.removeAllActionsWithTarget(&c); },
+        [&](Counter& c) { c.manager.removeAllActionsWithTarget(ending.get()); },
+        [&](Counter&) { ending = nullptr; },
+        [&](Counter&) { counter = nullptr; },
+        [&](Counter&) { manager = nullptr; },
+        [](Counter& c) { c.manager.beginUndoGrouping(); },
+        [](Counter& c) { c.manager.setLevelsOfUndo(1); },
+        [](Counter& c) { c.manager.endEventGroup(); },
+        [](Counter& c) {
+            const UndoGroup group(c.manager, "Inner");
+            c.setNumber(9);
+            c.manager.endUndoGrouping();
+        },
+    };
+    for (const auto& deed : deeds)
+        for (const bool memoryFails : {false, true}) {
+            manager = make<UndoManager>();
+            counter = make<Counter>(*manager);
+            ending = make<Counter>(*manager);
+            {
+                const UndoGroup group(manager, "Outer");
+                if (memoryFails)
+                    manager->registerUndo(*ending, [](Counter&) { throw std::bad_alloc(); });
+                ending->setNumber(1);
+                manager->registerUndo(*counter, deed);
+                counter->setNumber(2);
+                ending->setNumber(3);
+            }
+            const WeakRef<UndoManager> watched(manager);
+            try {
+                manager->undo();
+            } catch (const std::bad_alloc&) {
+                EXPECT_TRUE(memoryFails);
+            }
+            if (!watched.lock())
+                continue;
+            EXPECT_FALSE(manager->isUndoing() || manager->groupingLevel() != 0);
+            EXPECT_TRUE(!manager->canRedo() || manager->redoActionName() == "Outer");
+            while (manager->canRedo())
+                manager->redo();
+            manager->removeAllActions();
+        }
 }
 
 TEST_F(UndoManagerTest, ActionsCannotUndoOrEndTheGroupTheyRunIn) {
