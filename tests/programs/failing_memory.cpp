@@ -37,6 +37,9 @@ void* allocate(std::size_t size, std::size_t alignment = alignof(std::max_align_
     return memory;
 }
 
+// Not inlined, where the compiler would miss its counterpart.
+[[gnu::noinline]] void release(void* memory) noexcept { std::free(memory); }
+
 } // namespace
 
 void* operator new(std::size_t size) { return allocate(size); }
@@ -44,12 +47,19 @@ void* operator new[](std::size_t size) { return allocate(size); }
 void* operator new(std::size_t size, std::align_val_t alignment) {
     return allocate(size, static_cast<std::size_t>(alignment));
 }
-void operator delete(void* memory) noexcept { std::free(memory); }
-void operator delete[](void* memory) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
-void operator delete[](void* memory, std::size_t) noexcept { std::free(memory); }
-void operator delete(void* memory, std::align_val_t) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t, std::align_val_t) noexcept { std::free(memory); }
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    try {
+        return allocate(size);
+    } catch (const std::bad_alloc&) {
+        return nullptr;
+    }
+}
+void operator delete(void* memory) noexcept { release(memory); }
+void operator delete[](void* memory) noexcept { release(memory); }
+void operator delete(void* memory, std::size_t) noexcept { release(memory); }
+void operator delete[](void* memory, std::size_t) noexcept { release(memory); }
+void operator delete(void* memory, std::align_val_t) noexcept { release(memory); }
+void operator delete(void* memory, std::size_t, std::align_val_t) noexcept { release(memory); }
 
 namespace {
 
@@ -155,8 +165,9 @@ void expect(bool holds, const char* what, const char* step, long allocation) {
                 allocation);
 }
 
-// False when the step needed no more than so many allocations.
-bool fails(const std::function<void()>& step, long allocation) {
+enum class Outcome { failed, managed, undisturbed };
+
+Outcome outcome(const std::function<void()>& step, long allocation) {
     untilFailure = allocation;
     bool failed = false;
     try {
@@ -164,13 +175,13 @@ bool fails(const std::function<void()>& step, long allocation) {
     } catch (const std::bad_alloc&) {
         failed = true;
     }
-    const bool reached = untilFailure <= 0 && (untilFailure < 0 || failsForGood);
-    untilFailure = -1;
-    return failed || reached;
+    const long left = std::exchange(untilFailure, -1);
+    return failed ? Outcome::failed : left > 0 ? Outcome::undisturbed : Outcome::managed;
 }
 
-void tryEach(const char* name, bool observed, const std::function<void(Scene&)>& before,
-             const std::function<void(Scene&)>& step) {
+// A step that is whole has happened or not.
+void tryEach(const char* name, bool isWhole, bool observed,
+             const std::function<void(Scene&)>& before, const std::function<void(Scene&)>& step) {
     for (long allocation = 0;; ++allocation) {
         Scene scene(observed);
         const State first = scene.undone();
@@ -178,10 +189,11 @@ void tryEach(const char* name, bool observed, const std::function<void(Scene&)>&
         const State start = scene.state();
         const bool canUndo = scene.manager->canUndo();
         const bool canRedo = scene.manager->canRedo();
-        if (!fails([&] { step(scene); }, allocation))
+        const Outcome end = outcome([&] { step(scene); }, allocation);
+        if (end == Outcome::undisturbed)
             return;
         // Without memory nobody can be told, and what nobody is told of stays as it is.
-        if (!(observed && failsForGood)) {
+        if (isWhole && end == Outcome::failed && !(observed && failsForGood)) {
             expect(scene.state() == start, "other values", name, allocation);
             expect(scene.manager->canUndo() == canUndo, "other steps to undo", name, allocation);
             expect(scene.manager->canRedo() == canRedo, "other steps to redo", name, allocation);
@@ -189,11 +201,12 @@ void tryEach(const char* name, bool observed, const std::function<void(Scene&)>&
         expect(scene.manager->groupingLevel() == 0, "an open group", name, allocation);
         const State last = canRedo ? scene.redone() : start;
         expect(scene.undone() == first, "not undone", name, allocation);
-        expect(scene.redone() == last, "not redone", name, allocation);
-        const int told = std::exchange(scene.told, 0);
+        const State redone = scene.redone();
+        if (isWhole)
+            expect(redone == last, "not redone", name, allocation);
+        scene.told = 0;
         scene.record->setValueForKey("told?", "key3");
-        expect(scene.told == (observed ? 1 : 0), "an observer is deaf", name,
-               allocation + told * 0);
+        expect(scene.told == (observed ? 1 : 0), "an observer is deaf", name, allocation);
     }
 }
 
@@ -206,10 +219,12 @@ int main() {
     for (failsForGood = false;; failsForGood = true) {
         for (const bool observed : {false, true}) {
             tryEach(
-                "undo", observed, [](Scene& scene) { scene.change(); },
+                "set", false, observed, [](Scene&) {}, [](Scene& scene) { scene.change(); });
+            tryEach(
+                "undo", true, observed, [](Scene& scene) { scene.change(); },
                 [](Scene& scene) { scene.manager->undo(); });
             tryEach(
-                "redo", observed,
+                "redo", true, observed,
                 [](Scene& scene) {
                     scene.change();
                     scene.manager->undo();

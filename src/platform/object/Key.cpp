@@ -31,7 +31,12 @@ struct NameTable {
         if (!name.empty())
             std::memcpy(reinterpret_cast<char*>(rep + 1), name.data(), name.size());
         rep->hash.store(String::hashOf(name), std::memory_order_relaxed);
-        names.emplace(std::string_view(String::text(rep), rep->size), rep);
+        try {
+            names.emplace(std::string_view(String::text(rep), rep->size), rep);
+        } catch (...) {
+            String::destroy(rep);
+            throw;
+        }
         return rep;
     }
 
