@@ -91,7 +91,7 @@ private:
     friend struct ClassRegistry;
 
     explicit Class(Draft draft);
-    // The class of the object's dynamic type, made from describedClass() when nobody described it.
+    // The class of the object's dynamic type; a stand-in when nobody described it.
     static const Class& ofObject(const Object& object);
 
     Key _name;
