@@ -95,8 +95,9 @@ public:
     // Tells the observer of changes at the key path, with old and new value unless other options
     // are given; see Observation.h for these and for what the change holds. Each adding is ended by
     // one removing, the latest first, or with one of the objects; removing what is not there raises
-    // NSRangeException, but in the destructor of either, when the observation has ended already.
-    // Without an observer, NSInvalidArgumentException.
+    // NSRangeException, but in the destructor of either, when the observation has ended already and
+    // adding does nothing. Without an observer, NSInvalidArgumentException; what the objects on the
+    // path raise when they are asked for it comes out, and nothing is added.
     void addObserver(Object* observer, Key keyPath, unsigned options = 3, Selector context = {});
     void removeObserver(Object* observer, Key keyPath);
     void removeObserver(Object* observer, Key keyPath, Selector context);

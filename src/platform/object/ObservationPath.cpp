@@ -25,14 +25,10 @@ void addPaths(const Value& paths, std::vector<String>& result) {
     }
 }
 
-std::vector<String> pathsThatAffect(const Object& object, Key key) {
-    static const Selector general("keyPathsForValuesAffectingValueForKey:");
-    const Class& type = object.isa();
-    std::vector<String> result;
-    if (type.classOperation(general) != nullptr)
-        addPaths(type.perform(general, key.string()), result);
+// Of the operation "keyPathsForValuesAffecting" and the key with a capital.
+void addPathsOfOperationFor(const Class& type, Key key, std::vector<String>& result) {
     if (key.view().empty())
-        return result;
+        return;
     std::string name("keyPathsForValuesAffecting");
     name += key.view();
     char& first = name[name.size() - key.view().size()];
@@ -40,10 +36,20 @@ std::vector<String> pathsThatAffect(const Object& object, Key key) {
         first = static_cast<char>(first - 'a' + 'A');
     // A class that has such an operation has interned its name.
     if (Key::existing(name).isNull())
-        return result;
+        return;
     const Selector selector{std::string_view(name)};
     if (type.classOperation(selector) != nullptr)
         addPaths(type.perform(selector), result);
+}
+
+std::vector<String> pathsThatAffect(const Class& type, Key key) {
+    static const Selector general("keyPathsForValuesAffectingValueForKey:");
+    std::vector<String> result;
+    if (type.classOperation(general) != nullptr)
+        addPaths(type.perform(general, key.string()), result);
+    addPathsOfOperationFor(type, key, result);
+    std::erase_if(result,
+                  [key](const String& path) { return path.isNull() || path == key.view(); });
     return result;
 }
 
@@ -63,14 +69,11 @@ public:
     }
 
 private:
-    struct Place {
-        const Object* object;
-        Key key;
-        bool operator==(const Place&) const = default;
-    };
+    // A key beside an object or a class.
+    using Place = std::pair<const void*, Key>;
     struct HashOfPlace {
         std::size_t operator()(const Place& place) const noexcept {
-            return std::hash<Key>()(place.key) * 31 + std::hash<const Object*>()(place.object);
+            return std::hash<Key>()(place.second) * 31 + std::hash<const void*>()(place.first);
         }
     };
 
@@ -103,14 +106,22 @@ private:
                             String::concat({"too many values to observe at key ", key.view(),
                                             " of class ", object->isa().name()}));
         _values.push_back({.object = object, .key = key});
-        for (String& path : pathsThatAffect(*object, key))
-            if (!path.isNull() && path != key.view())
-                _open.emplace_back(object, std::move(path));
+        for (const String& path : dependenciesOf(object->isa(), key))
+            _open.emplace_back(object, path);
         return place;
+    }
+
+    // A class is asked once for each key.
+    const std::vector<String>& dependenciesOf(const Class& type, Key key) {
+        const auto [found, isNew] = _dependencies.try_emplace({&type, key});
+        if (isNew)
+            found->second = pathsThatAffect(type, key);
+        return found->second;
     }
 
     std::vector<ObservedValue> _values;
     std::unordered_map<Place, std::size_t, HashOfPlace> _places;
+    std::unordered_map<Place, std::vector<String>, HashOfPlace> _dependencies;
     std::vector<std::pair<Ref<Object>, String>> _open;
 };
 
