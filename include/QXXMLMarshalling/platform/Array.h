@@ -67,7 +67,7 @@ public:
     bool isEqual(const Object& other) const override;
     // The values that the items have under the key, the null marker for null; "@count" the count.
     Value valueForKey(Key key) const override;
-    // Sets the value on every item.
+    // Sets the value on every item that is not null.
     SetOutcome trySetValueForKey(const Value& value, Key key) override;
 
 protected:

@@ -16,6 +16,10 @@
 // classes that were described. It may be read and written from any thread. A description is
 // published whole when its builder ends; a name that is taken stays with the first, and a warning
 // is logged. Descriptions live for ever; forget() takes a name back when a plug-in is unloaded.
+//
+// A class that nobody described is, for its objects, a subclass of the nearest of its C++ bases that
+// is; a description that comes later, of the class or of a base, holds for objects that are asked
+// for their class from then on.
 
 #include <QXXMLMarshalling/platform/ClassDescription.h>
 
@@ -91,7 +95,7 @@ private:
     friend struct ClassRegistry;
 
     explicit Class(Draft draft);
-    // The class of the object's dynamic type, made from describedClass() when nobody described it.
+    // The class of the object's dynamic type; a stand-in when nobody described it.
     static const Class& ofObject(const Object& object);
 
     Key _name;

@@ -54,7 +54,8 @@ public:
     }
 
     // The object's class as described with Class::define; a class that nobody described gets a
-    // description of its own with the properties and operations of the nearest described base.
+    // description of its own with the properties and operations of the nearest base that is
+    // described when the object is first asked.
     const Class& isa() const {
         const Class* known = _isa.load(std::memory_order_acquire);
         return known != nullptr ? *known : findClass();
@@ -78,7 +79,9 @@ public:
     virtual SetOutcome trySetValueForKey(const Value& value, Key key);
     virtual Value valueForUndefinedKey(Key key) const;
     virtual void setValueForUndefinedKey(const Value& value, Key key);
-    // Keys separated by dots, followed from object to object; null as soon as one is null.
+    // Keys separated by dots, followed from object to object. Null, or the null marker, on the way
+    // reads as null and takes nothing that is set; a text or a number on the way raises
+    // NSUndefinedKeyException in both directions.
     Value valueForKeyPath(std::string_view path) const;
     void setValueForKeyPath(const Value& value, std::string_view path);
 
@@ -92,8 +95,9 @@ public:
     // Tells the observer of changes at the key path, with old and new value unless other options
     // are given; see Observation.h for these and for what the change holds. Each adding is ended by
     // one removing, the latest first, or with one of the objects; removing what is not there raises
-    // NSRangeException, but in the destructor of either, when the observation has ended already.
-    // Without an observer, NSInvalidArgumentException.
+    // NSRangeException, but in the destructor of either, when the observation has ended already and
+    // adding does nothing. Without an observer, NSInvalidArgumentException; what the objects on the
+    // path raise when they are asked for it comes out, and nothing is added.
     void addObserver(Object* observer, Key keyPath, unsigned options = 3, Selector context = {});
     void removeObserver(Object* observer, Key keyPath);
     void removeObserver(Object* observer, Key keyPath, Selector context);
@@ -126,8 +130,7 @@ public:
     static std::int64_t liveCount() noexcept;
 
 protected:
-    // The nearest described class: what an undescribed subclass takes its description from.
-    // Classes that others derive from override it.
+    // The library's own class that the object is of, described by then. Host classes leave it alone.
     virtual const Class& describedClass() const;
 
     // False as long as nobody observes the object, waits for its end or refers to it weakly.
@@ -143,7 +146,7 @@ private:
     Extras& extras() const;
 
     mutable std::atomic<const Class*> _isa{nullptr};
-    mutable Extras* _extras = nullptr;
+    mutable Extras* _extras = nullptr; // in an object that waits for its end, perhaps a link
     mutable std::atomic<std::uint32_t> _count{1}; // last: small members of other classes fit behind
 };
 

@@ -1,6 +1,7 @@
 #pragma once
 
-// A reference that does not keep its object alive and yields null once the object is gone.
+// A reference that does not keep its object alive and yields null once the last counted reference
+// to it is gone: in the object's destructor, too.
 
 #include <QXXMLMarshalling/platform/Object.h>
 

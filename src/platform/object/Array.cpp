@@ -115,7 +115,7 @@ Value Array::valueForKey(Key key) const {
     auto values = make<Array>();
     values->reserve(count());
     for (const Value& item : *this) {
-        const Object* object = item.object();
+        const Object* object = item.isNullOrMarker() ? nullptr : item.object();
         const Value value = object != nullptr ? object->valueForKey(key) : Value();
         values->add(value.isNull() ? Value(Null::marker()) : value);
     }
@@ -124,6 +124,8 @@ Value Array::valueForKey(Key key) const {
 
 SetOutcome Array::trySetValueForKey(const Value& value, Key key) {
     for (const Value& item : *this) {
+        if (item.isNullOrMarker())
+            continue;
         Object* object = item.object();
         if (object == nullptr)
             return SetOutcome::unknownKey;

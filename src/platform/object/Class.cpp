@@ -4,6 +4,7 @@
 
 #include "platform/object/Warning.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <mutex>
 #include <shared_mutex>
@@ -12,6 +13,35 @@
 #include <cxxabi.h>
 
 namespace qx {
+
+namespace {
+
+std::string readableName(const std::type_info& type) {
+    int status = 0;
+    char* demangled = abi::__cxa_demangle(type.name(), nullptr, nullptr, &status);
+    std::string name = demangled != nullptr ? demangled : type.name();
+    std::free(demangled);
+    return name;
+}
+
+// Adds the public bases of a class, as far as they are not among the types yet.
+void addBases(const std::type_info& type, std::vector<const std::type_info*>& types) {
+    const auto add = [&types](const std::type_info* base) {
+        if (std::find_if(types.begin(), types.end(),
+                         [&](const auto* known) { return *known == *base; }) == types.end())
+            types.push_back(base);
+    };
+    if (const auto* single = dynamic_cast<const abi::__si_class_type_info*>(&type)) {
+        add(single->__base_type);
+    } else if (const auto* several = dynamic_cast<const abi::__vmi_class_type_info*>(&type)) {
+        const abi::__base_class_type_info* bases = several->__base_info;
+        for (unsigned i = 0; i < several->__base_count; ++i)
+            if (bases[i].__is_public_p())
+                add(bases[i].__base_type);
+    }
+}
+
+} // namespace
 
 // Classes by name and by C++ type. Never destroyed: static objects may ask while they end.
 struct ClassRegistry {
@@ -32,6 +62,38 @@ struct ClassRegistry {
         return found != byType.end() ? found->second : nullptr;
     }
 
+    // The class described for the type, or what stands in for it already.
+    const Class* known(const std::type_info& type) {
+        const std::shared_lock lock(mutex);
+        if (const auto found = byType.find(type); found != byType.end())
+            return found->second;
+        const auto found = standIns.find(&type);
+        return found != standIns.end() && found->second.typeName == type.name()
+                   ? found->second.description
+                   : nullptr;
+    }
+
+    // The class of the type, else of its nearest base that is described; null when there is none.
+    const Class* nearest(const std::type_info& type) {
+        const std::shared_lock lock(mutex);
+        return nearestLocked(type);
+    }
+
+    // A class for a type that nobody described. It is kept by the place of the type's information,
+    // which is not looked at again: a plug-in may take it along. The name tells the type from
+    // another that comes to lie there.
+    const Class& standIn(const std::type_info& type) {
+        const std::unique_lock lock(mutex);
+        const Class* base = nearestLocked(type);
+        retired.reserve(retired.size() + 1);
+        auto* made =
+            new Class({.name = readableName(type), .type = &type, .superclass = &typeid(Object)});
+        retired.push_back(made);
+        made->_superclass.store(base, std::memory_order_relaxed);
+        standIns[&type] = {type.name(), made};
+        return *made;
+    }
+
     const Class& publish(Class::Draft draft, bool listed) {
         const Key name = draft.name;
         const std::type_index type(*draft.type);
@@ -47,6 +109,7 @@ struct ClassRegistry {
         // Descriptions are immortal: objects keep pointers to them.
         const auto* published = new Class(std::move(draft));
         byType.emplace(type, published);
+        standIns.clear(); // it may be the base, or the very class, of what one stands in for
         const bool isTaken = listed && !byName.emplace(name, published).second;
         lock.unlock();
         if (isTaken)
@@ -63,24 +126,36 @@ struct ClassRegistry {
         retired.push_back(found->second);
         byType.erase(*found->second->_type);
         byName.erase(found);
+        standIns.clear();
         return true;
     }
 
     std::shared_mutex mutex;
     std::unordered_map<Key, const Class*> byName;
     std::unordered_map<std::type_index, const Class*> byType;
-    std::vector<const Class*> retired; // forgotten, but perhaps still pointed to
+    std::vector<const Class*> retired; // not to be found any more, but perhaps still pointed to
+
+private:
+    struct StandIn {
+        std::string typeName;
+        const Class* description = nullptr;
+    };
+
+    // Breadth first, so that of several bases the nearest is found.
+    const Class* nearestLocked(const std::type_info& type) const {
+        std::vector<const std::type_info*> types{&type};
+        for (std::size_t i = 0; i < types.size(); ++i) {
+            if (const auto found = byType.find(*types[i]); found != byType.end())
+                return found->second;
+            addBases(*types[i], types);
+        }
+        return nullptr;
+    }
+
+    std::unordered_map<const std::type_info*, StandIn> standIns;
 };
 
 namespace {
-
-std::string readableName(const std::type_info& type) {
-    int status = 0;
-    char* demangled = abi::__cxa_demangle(type.name(), nullptr, nullptr, &status);
-    std::string name = demangled != nullptr ? demangled : type.name();
-    std::free(demangled);
-    return name;
-}
 
 template <class Item, class Name>
 const Item* findIn(const std::vector<Item>& items, Name Item::*name, Name wanted) {
@@ -125,25 +200,25 @@ const Class& Class::publish(Draft draft, bool listed) {
 const Class& Class::ofObject(const Object& object) {
     const std::type_info& type = typeid(object);
     ClassRegistry& registry = ClassRegistry::shared();
-    if (const Class* described = registry.described(type))
-        return *described;
-    const Class& nearest = object.describedClass();
-    if (*nearest._type == type)
-        return nearest;
-    return registry.publish(
-        {.name = readableName(type), .type = &type, .superclass = nearest._type}, false);
+    if (const Class* known = registry.known(type))
+        return *known;
+    // Describes the library's class among the bases, unless that was done.
+    const Class& own = object.describedClass();
+    return *own._type == type ? own : registry.standIn(type);
 }
 
-// Found late, since a base may be described after the classes that derive from it.
+// Found late, since a base may be described after the classes that derive from it; until then the
+// nearest of its own bases does.
 const Class* Class::superclass() const {
     if (_superclassType == nullptr)
         return nullptr;
     const Class* known = _superclass.load(std::memory_order_acquire);
     if (known != nullptr)
         return known;
-    known = ClassRegistry::shared().described(*_superclassType);
+    known = ClassRegistry::shared().nearest(*_superclassType);
     if (known != nullptr) {
-        _superclass.store(known, std::memory_order_release);
+        if (*known->_type == *_superclassType)
+            _superclass.store(known, std::memory_order_release);
         return known;
     }
     static const Class& root = Object().isa();

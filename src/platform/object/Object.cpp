@@ -19,12 +19,14 @@ std::atomic<std::int64_t> liveObjects{0};
 // Objects that end while this many others are ending above them on the stack wait for their turn.
 constexpr unsigned deepestRelease = 64;
 
-// A count that no reference made and dropped by a destructor brings back to zero.
+// A count that no reference made and dropped by a destructor brings back to zero, and that of an
+// ending object which waits and whose place for extras holds the next one that waits.
 constexpr std::uint32_t endingCount = 0x40000000U;
+constexpr std::uint32_t waitingCount = 2 * endingCount;
 
 struct Ending {
     unsigned depth = 0;
-    Object* waiting = nullptr;
+    Object* waiting = nullptr; // the latest; the others are linked to it
 };
 // In the library's initial block of thread memory: it is looked at for every object that ends.
 [[gnu::tls_model("initial-exec")]] thread_local Ending ending;
@@ -45,6 +47,7 @@ Object::Object() noexcept {
 Object::~Object() {
     // Told already unless this object was never counted, or gained listeners while it ended.
     if (_extras != nullptr) {
+        _count.store(endingCount, std::memory_order_relaxed);
         if (_extras->anchor)
             _extras->anchor->clear();
         ObjectInternals::tellEndListeners(*this);
@@ -64,31 +67,29 @@ std::int64_t Object::liveCount() noexcept {
 }
 
 // A long chain of objects would end by recursion, one frame a link. Past a fixed depth they queue
-// up instead, linked through the class pointer, which is only a cache.
+// up instead. While an object waits it is whole, and others may still read it.
 void Object::destroy() const noexcept {
     auto* self = const_cast<Object*>(this);
     _count.store(endingCount, std::memory_order_relaxed);
     if (_extras != nullptr && _extras->anchor)
         _extras->anchor->clear();
     if (ending.depth >= deepestRelease) {
-        self->_isa.store(reinterpret_cast<const Class*>(ending.waiting));
+        ObjectInternals::linkWaiting(*self, ending.waiting);
         ending.waiting = self;
         return;
     }
-    ++ending.depth;
-    if (_extras != nullptr)
-        ObjectInternals::tellEndListeners(*self);
-    delete self;
-    --ending.depth;
+    const auto finish = [](Object& object) {
+        ++ending.depth;
+        if (object._extras != nullptr)
+            ObjectInternals::tellEndListeners(object);
+        delete &object;
+        --ending.depth;
+    };
+    finish(*self);
     while (ending.depth == 0 && ending.waiting != nullptr) {
         Object* next = ending.waiting;
-        ending.waiting = reinterpret_cast<Object*>(
-            const_cast<Class*>(next->_isa.load(std::memory_order_relaxed)));
-        next->_isa.store(nullptr);
-        ++ending.depth;
-        ObjectInternals::tellEndListeners(*next);
-        delete next;
-        --ending.depth;
+        ending.waiting = ObjectInternals::unlinkWaiting(*next);
+        finish(*next);
     }
 }
 
@@ -96,16 +97,43 @@ bool ObjectInternals::isEnding(const Object& object) noexcept {
     return object._count.load(std::memory_order_relaxed) >= endingCount / 2;
 }
 
-Object::Extras& Object::extras() const {
-    if (_extras == nullptr)
-        _extras = new Extras;
-    return *_extras;
+bool ObjectInternals::hasLinkForExtras(const Object& object) noexcept {
+    return object._count.load(std::memory_order_relaxed) >= waitingCount - endingCount / 2;
 }
 
+void ObjectInternals::linkWaiting(Object& object, Object* next) noexcept {
+    if (object._extras != nullptr) {
+        object._extras->nextWaiting = next;
+        return;
+    }
+    object._extras = reinterpret_cast<Object::Extras*>(next);
+    object._count.fetch_add(waitingCount - endingCount, std::memory_order_relaxed);
+}
+
+Object* ObjectInternals::unlinkWaiting(Object& object) noexcept {
+    if (!hasLinkForExtras(object))
+        return object._extras->nextWaiting;
+    object._count.fetch_sub(waitingCount - endingCount, std::memory_order_relaxed);
+    return reinterpret_cast<Object*>(std::exchange(object._extras, nullptr));
+}
+
+Object::Extras& Object::extras() const {
+    auto* existing = ObjectInternals::existingExtras(*this);
+    if (existing != nullptr)
+        return *existing;
+    auto* made = new Extras;
+    if (ObjectInternals::hasLinkForExtras(*this))
+        made->nextWaiting = ObjectInternals::unlinkWaiting(const_cast<Object&>(*this));
+    _extras = made;
+    return *made;
+}
+
+// Of an object that ends there is nothing to refer to any more.
 Ref<WeakAnchor> Object::weakAnchor() const {
     Ref<WeakAnchor>& anchor = extras().anchor;
     if (!anchor)
-        anchor = make<WeakAnchor>(const_cast<Object*>(this));
+        anchor = make<WeakAnchor>(ObjectInternals::isEnding(*this) ? nullptr
+                                                                   : const_cast<Object*>(this));
     return anchor;
 }
 
@@ -216,17 +244,26 @@ void Object::setValueForUndefinedKey(const Value& value, Key key) {
                                                 " to set to ", value.description()}));
 }
 
+namespace {
+
+// A text or a number is no object whose keys a path could follow.
+[[noreturn]] void raiseNoObject(const Value& value, Key rest, const char* purpose) {
+    throw UndefinedKeyException(nullptr, rest,
+                                String::concat({"class ", value.classNameForMarshalling(),
+                                                " has no key ", rest.view(), purpose}));
+}
+
+} // namespace
+
 Value Object::valueForKeyPath(std::string_view path) const {
     std::size_t dot = path.find('.');
     Value value = valueForKey(path.substr(0, dot));
-    while (dot != std::string_view::npos && !value.isNull()) {
+    while (dot != std::string_view::npos) {
+        if (value.isNullOrMarker())
+            return {};
         path.remove_prefix(dot + 1);
-        if (value.object() == nullptr) {
-            const Key rest = path;
-            throw UndefinedKeyException(nullptr, rest,
-                                        String::concat({"class ", value.classNameForMarshalling(),
-                                                        " has no key ", rest.view(), " to read"}));
-        }
+        if (value.object() == nullptr)
+            raiseNoObject(value, path, " to read");
         dot = path.find('.');
         value = value.object()->valueForKey(path.substr(0, dot));
     }
@@ -238,8 +275,11 @@ void Object::setValueForKeyPath(const Value& value, std::string_view path) {
     if (dot == std::string_view::npos)
         return setValueForKey(value, path);
     const Value holder = valueForKeyPath(path.substr(0, dot));
-    if (Object* object = holder.object())
-        object->setValueForKey(value, path.substr(dot + 1));
+    if (holder.isNullOrMarker())
+        return;
+    if (holder.object() == nullptr)
+        raiseNoObject(holder, path.substr(dot + 1), " to set");
+    holder.object()->setValueForKey(value, path.substr(dot + 1));
 }
 
 bool Object::respondsTo(Selector selector) const { return isa().operation(selector) != nullptr; }

@@ -14,9 +14,10 @@ void ObjectInternals::addEndListener(Object& object, EndListener& listener) {
 }
 
 void ObjectInternals::removeEndListener(Object& object, EndListener& listener) noexcept {
-    if (object._extras == nullptr)
+    Object::Extras* extras = existingExtras(object);
+    if (extras == nullptr)
         return;
-    auto& listeners = object._extras->endListeners;
+    auto& listeners = extras->endListeners;
     const auto found = std::find(listeners.begin(), listeners.end(), &listener);
     if (found != listeners.end())
         listeners.erase(found);

@@ -24,6 +24,7 @@ struct Object::Extras {
     Ref<WeakAnchor> anchor;
     std::vector<EndListener*> endListeners;
     std::unique_ptr<ObservationInfo> observation;
+    Object* nextWaiting = nullptr; // of the ending objects that wait for their turn
 
     Extras() noexcept;
     ~Extras();
@@ -33,9 +34,17 @@ struct Object::Extras {
 struct ObjectInternals {
     static Object::Extras& extras(const Object& object) { return object.extras(); }
     // Null when the object has none.
-    static Object::Extras* existingExtras(const Object& object) noexcept { return object._extras; }
+    static Object::Extras* existingExtras(const Object& object) noexcept {
+        return object._extras == nullptr || hasLinkForExtras(object) ? nullptr : object._extras;
+    }
     // Whether the object's last reference is gone.
     static bool isEnding(const Object& object) noexcept;
+
+    // Ending objects that wait for their turn are linked through their extras, or in the place of
+    // these: no memory may be needed to end an object.
+    static void linkWaiting(Object& object, Object* next) noexcept;
+    static Object* unlinkWaiting(Object& object) noexcept;
+    static bool hasLinkForExtras(const Object& object) noexcept;
 
     static void addEndListener(Object& object, EndListener& listener);
     // Does nothing when the listener was told already.

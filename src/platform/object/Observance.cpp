@@ -1,8 +1,5 @@
 #include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/CountedSet.h>
 #include <QXXMLMarshalling/platform/Dictionary.h>
-#include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/Null.h>
 
 #include "platform/object/ObservationInfo.h"
@@ -10,120 +7,6 @@
 namespace qx {
 
 namespace {
-
-using Path = std::shared_ptr<const std::vector<Key>>;
-
-// Links further than this from the observed object are left out, so that a value that depends on
-// the same value of the next object, and so on, needs a bounded stack.
-constexpr std::size_t deepestLink = 256;
-
-Path componentsOf(std::string_view keyPath) {
-    auto path = std::make_shared<std::vector<Key>>();
-    for (;;) {
-        const std::size_t dot = keyPath.find('.');
-        path->emplace_back(keyPath.substr(0, dot));
-        if (dot == std::string_view::npos)
-            return path;
-        keyPath.remove_prefix(dot + 1);
-    }
-}
-
-void addPaths(const Value& paths, std::vector<String>& result) {
-    if (const auto array = paths.as<Array>()) {
-        for (const Value& path : *array)
-            result.push_back(path.string());
-    } else if (const auto set = paths.as<CountedSet>()) {
-        for (const String& path : set->names())
-            result.push_back(path);
-    }
-}
-
-std::vector<String> pathsThatAffect(const Object& object, Key key) {
-    static const Selector general("keyPathsForValuesAffectingValueForKey:");
-    const Class& type = object.isa();
-    std::vector<String> result;
-    if (type.classOperation(general) != nullptr)
-        addPaths(type.perform(general, key.string()), result);
-    if (key.view().empty())
-        return result;
-    std::string name("keyPathsForValuesAffecting");
-    name += key.view();
-    char& first = name[name.size() - key.view().size()];
-    if (first >= 'a' && first <= 'z')
-        first = static_cast<char>(first - 'a' + 'A');
-    // A class that has such an operation has interned its name.
-    if (Key::existing(name).isNull())
-        return result;
-    const Selector selector{std::string_view(name)};
-    if (type.classOperation(selector) != nullptr)
-        addPaths(type.perform(selector), result);
-    return result;
-}
-
-Value valueOf(const Object& object, std::string_view keyPath) {
-    try {
-        return object.valueForKeyPath(keyPath);
-    } catch (const UndefinedKeyException&) {
-        // A key that is announced by hand need not be readable.
-        return {};
-    }
-}
-
-// False where the link would close a ring of dependencies, or hang too deep.
-bool mayLink(const ObservationLink* parent, const Object& object, Key key, const Path& path) {
-    std::size_t depth = 0;
-    for (const ObservationLink* above = parent; above != nullptr; above = above->parent) {
-        if (++depth == deepestLink)
-            return false;
-        if (above->object == &object && above->key == key && above->path != path)
-            return false;
-    }
-    return true;
-}
-
-std::shared_ptr<ObservationLink> makeLink(Observance& observance, ObservationLink* parent,
-                                          Object& object, const Path& path, std::size_t index,
-                                          bool onMainPath);
-
-void addDependencies(ObservationLink& link, Object& object) {
-    for (const String& affecting : pathsThatAffect(object, link.key)) {
-        if (affecting.isNull() || affecting == link.key.view())
-            continue;
-        auto dependency =
-            makeLink(*link.observance, &link, object, componentsOf(affecting), 0, false);
-        if (dependency && link.object == nullptr)
-            dependency->end();
-        else if (dependency)
-            link.dependencies.push_back(std::move(dependency));
-    }
-}
-
-// Null where there may be none. Asking the objects runs foreign code, which may end the link.
-std::shared_ptr<ObservationLink> makeLink(Observance& observance, ObservationLink* parent,
-                                          Object& object, const Path& path, std::size_t index,
-                                          bool onMainPath) {
-    const Key key = (*path)[index];
-    if (!mayLink(parent, object, key, path))
-        return nullptr;
-    auto link = std::make_shared<ObservationLink>();
-    link->observance = &observance;
-    link->parent = parent;
-    link->key = key;
-    link->path = path;
-    link->index = index;
-    link->onMainPath = onMainPath;
-    auto& links = ObservationInfo::of(object).links[key];
-    link->position = links.insert(links.end(), link);
-    link->object = &object;
-    try {
-        addDependencies(*link, object);
-        link->rebuildNext();
-    } catch (...) {
-        link->end();
-        throw;
-    }
-    return link;
-}
 
 Value itemsAt(const Value& collection, const std::vector<std::size_t>& indexes) {
     const auto array = collection.as<Array>();
@@ -164,40 +47,6 @@ Ref<Dictionary> dictionaryOf(const ValueChange& change, unsigned options) {
 
 } // namespace
 
-void ObservationLink::rebuildNext() {
-    if (next)
-        std::exchange(next, nullptr)->end();
-    if (object == nullptr || isLast())
-        return;
-    // What this runs may end this very link.
-    const auto kept = shared_from_this();
-    const Value value = valueOf(*object, key.view());
-    if (object == nullptr || value.object() == nullptr)
-        return;
-    auto following = makeLink(*observance, this, *value.object(), path, index + 1, onMainPath);
-    if (object != nullptr)
-        next = std::move(following);
-    else if (following)
-        following->end();
-}
-
-void ObservationLink::end() noexcept {
-    if (object == nullptr)
-        return;
-    const auto kept = shared_from_this();
-    auto& links = ObservationInfo::existing(*object)->links;
-    const auto list = links.find(key);
-    list->second.erase(position);
-    if (list->second.empty())
-        links.erase(list);
-    object = nullptr;
-    parent = nullptr;
-    if (next)
-        std::exchange(next, nullptr)->end();
-    for (const auto& dependency : std::exchange(dependencies, {}))
-        dependency->end();
-}
-
 namespace {
 
 std::atomic<std::uint64_t> observancesMade{0};
@@ -208,22 +57,40 @@ Observance::Observance(Object& root, Key keyPath, unsigned options)
     : _number(observancesMade.fetch_add(1, std::memory_order_relaxed)), _root(&root),
       _keyPath(keyPath), _options(options) {}
 
+// All memory is there before the first of the lists changes.
+void Observance::enlist(Object* observer) {
+    std::list<Ref<Observance>> here{Ref<Observance>(this)};
+    auto& root = ObservationInfo::of(*_root);
+    if (observer != nullptr) {
+        std::list<Observance*> there{this};
+        auto& observing = ObservationInfo::of(*observer).observing;
+        _observer = observer;
+        try {
+            root._byObserver.emplace(ObservationInfo::listingOf(*this), this);
+        } catch (...) {
+            _observer = nullptr;
+            throw;
+        }
+        _observerPosition = there.begin();
+        observing.splice(observing.end(), there);
+    }
+    _rootPosition = here.begin();
+    root.observances.splice(root.observances.end(), here);
+}
+
 void Observance::begin(Object* observer, Selector context,
                        std::function<void(const ValueChange&)> call) {
-    auto& observances = ObservationInfo::of(*_root).observances;
-    _call = std::move(call);
-    _context = context;
-    if (observer != nullptr) {
-        auto& observing = ObservationInfo::of(*observer).observing;
-        _observerPosition = observing.insert(observing.end(), this);
-        _observer = observer;
+    if (ObjectInternals::isEnding(*_root) ||
+        (observer != nullptr && ObjectInternals::isEnding(*observer))) {
+        _root = nullptr;
+        return;
     }
     const Ref<Observance> kept(this);
-    _rootPosition = observances.insert(observances.end(), kept);
+    _call = std::move(call);
+    _context = context;
+    enlist(observer);
     try {
-        _first = makeLink(*this, nullptr, *_root, componentsOf(_keyPath.view()), 0, true);
-        if (hasEnded() && _first)
-            _first->end();
+        walkPath();
         if (!hasEnded() && (_options & Observing::initial) != 0) {
             ValueChange change{.object = *_root};
             if ((_options & Observing::newValue) != 0)
@@ -243,23 +110,88 @@ void Observance::end() noexcept {
     if (_root == nullptr)
         return;
     const Ref<Observance> kept(this);
-    ObservationInfo::existing(*_root)->observances.erase(_rootPosition);
-    _root = nullptr;
+    auto& root = *ObservationInfo::existing(*_root);
     if (_observer != nullptr) {
+        root._byObserver.erase(ObservationInfo::listingOf(*this));
         ObservationInfo::existing(*_observer)->observing.erase(_observerPosition);
         _observer = nullptr;
     }
-    if (_first)
-        _first->end();
+    root.observances.erase(_rootPosition);
+    _root = nullptr;
+    unlink(std::exchange(_links, {}));
 }
 
-Value Observance::currentValue() const { return valueOf(*_root, _keyPath.view()); }
+void Observance::unlink(const std::vector<ObservationLink*>& links) noexcept {
+    for (const ObservationLink* link : links)
+        if (link != nullptr)
+            ObservationInfo::existing(*link->object)->removeLink(*link);
+}
 
-void Observance::changeBegins(const ObservationLink& link, ChangeKind kind,
-                              std::span<const std::size_t> indexes) {
-    if (_changing++ != 0 || hasEnded())
+// A change that a getter announces meanwhile makes the walk outdated: it is made once more, not for
+// ever, since the getter may do so each time.
+void Observance::walkPath() {
+    if (std::exchange(_isWalking, true)) {
+        _isOutdated = true;
         return;
-    const bool isIndexed = kind != ChangeKind::setting && link.onMainPath && link.isLast();
+    }
+    const Ref<Observance> kept(this);
+    try {
+        bool isOutdated = true;
+        for (int walks = 0; walks < 2 && isOutdated && !hasEnded(); ++walks) {
+            _isOutdated = false;
+            const std::vector<ObservedValue> values = valuesOnPath(*_root, _keyPath);
+            isOutdated = _isOutdated;
+            if (!hasEnded())
+                link(values);
+        }
+    } catch (...) {
+        _isOutdated = true;
+        _isWalking = false;
+        throw;
+    }
+    _isWalking = false;
+}
+
+void Observance::link(const std::vector<ObservedValue>& values) {
+    std::vector<ObservationLink*> links;
+    links.reserve(values.size());
+    try {
+        for (const ObservedValue& value : values) {
+            if (ObjectInternals::isEnding(*value.object))
+                continue;
+            ObservationLink& link = ObservationInfo::of(*value.object).addLink(value.key);
+            link.observance = this;
+            link.place = links.size();
+            link.endsPath = value.endsPath;
+            link.leadsOn = value.leadsOn;
+            link.next = objectLedTo(value.value);
+            links.push_back(&link);
+        }
+    } catch (...) {
+        unlink(links);
+        throw;
+    }
+    unlink(std::exchange(_links, std::move(links)));
+}
+
+void Observance::loseLink(const ObservationLink& link) noexcept {
+    _links[link.place] = nullptr;
+    _isOutdated = true;
+}
+
+// An object that is ending may still be read by others, but not observed.
+bool Observance::maySpeak() const noexcept {
+    return !hasEnded() && !ObjectInternals::isEnding(*_root) &&
+           (_observer == nullptr || !ObjectInternals::isEnding(*_observer));
+}
+
+Value Observance::currentValue() const { return valueOnPath(*_root, _keyPath.view()); }
+
+void Observance::changeBegins(bool atEndOfPath, ChangeKind kind,
+                              std::span<const std::size_t> indexes) {
+    if (_changing++ != 0 || !maySpeak())
+        return;
+    const bool isIndexed = kind != ChangeKind::setting && atEndOfPath;
     _kind = isIndexed ? kind : ChangeKind::setting;
     _indexes.clear();
     if (isIndexed)
@@ -271,7 +203,7 @@ void Observance::changeBegins(const ObservationLink& link, ChangeKind kind,
 }
 
 std::optional<ValueChange> Observance::priorChange() const {
-    if (hasEnded() || (_options & Observing::prior) == 0 || _changing != 1)
+    if (!maySpeak() || (_options & Observing::prior) == 0 || _changing != 1)
         return {};
     return ValueChange{.object = *_root,
                        .kind = _kind,
@@ -282,7 +214,7 @@ std::optional<ValueChange> Observance::priorChange() const {
 }
 
 std::optional<ValueChange> Observance::finishedChange() {
-    if (hasEnded())
+    if (!maySpeak())
         return {};
     ValueChange change{.object = *_root,
                        .kind = _kind,
@@ -296,14 +228,12 @@ std::optional<ValueChange> Observance::finishedChange() {
 }
 
 void Observance::tell(const ValueChange& change) {
-    if (hasEnded())
+    if (!maySpeak())
         return;
     const Ref<Observance> kept(this);
     const Ref<Object> root(_root);
     if (_call)
         return _call(change);
-    if (ObjectInternals::isEnding(*_observer))
-        return;
     const Ref<Object> observer(_observer);
     observer->observeValueForKeyPath(_keyPath.string(), _root, *dictionaryOf(change, _options),
                                      _context);

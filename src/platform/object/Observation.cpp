@@ -6,7 +6,6 @@
 #include "platform/object/ObservationInfo.h"
 #include "platform/object/Warning.h"
 
-#include <algorithm>
 #include <exception>
 
 namespace qx {
@@ -50,17 +49,13 @@ ObservationToken Object::observe(Key keyPath, std::function<void(const ValueChan
 
 namespace {
 
-// The latest observance that suits ends. A destructor may remove its object once more: all that the
+// The latest such observance ends. A destructor may remove its object once more: all that the
 // object had to do with has ended by then.
-template <class Suits>
-void removeLatest(Object& object, const Object* observer, Key keyPath, Suits suits) {
-    if (ObservationInfo* info = ObservationInfo::existing(object)) {
-        auto& all = info->observances;
-        const auto found = std::find_if(all.rbegin(), all.rend(),
-                                        [&](const auto& observance) { return suits(*observance); });
-        if (found != all.rend())
-            return (*found)->end();
-    }
+void removeLatest(Object& object, const Object* observer, Key keyPath, const Selector* context) {
+    if (ObservationInfo* info = ObservationInfo::existing(object))
+        if (Observance* latest =
+                observer != nullptr ? info->latest(observer, keyPath, context) : nullptr)
+            return latest->end();
     if (ObjectInternals::isEnding(object) ||
         (observer != nullptr && ObjectInternals::isEnding(*observer)))
         return;
@@ -72,16 +67,11 @@ void removeLatest(Object& object, const Object* observer, Key keyPath, Suits sui
 } // namespace
 
 void Object::removeObserver(Object* observer, Key keyPath) {
-    removeLatest(*this, observer, keyPath, [&](const Observance& observance) {
-        return observer != nullptr && observance.isFor(observer, keyPath);
-    });
+    removeLatest(*this, observer, keyPath, nullptr);
 }
 
 void Object::removeObserver(Object* observer, Key keyPath, Selector context) {
-    removeLatest(*this, observer, keyPath, [&](const Observance& observance) {
-        return observer != nullptr && observance.isFor(observer, keyPath) &&
-               observance.context() == context;
-    });
+    removeLatest(*this, observer, keyPath, &context);
 }
 
 void Object::observeValueForKeyPath(const String& keyPath, Object*, const Dictionary&, Selector) {

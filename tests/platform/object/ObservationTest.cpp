@@ -9,6 +9,9 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <random>
+
 namespace {
 
 using namespace qx;
@@ -151,19 +154,36 @@ TEST_F(ObservationTest, DependentValuesAreToldOfWhatTheyDependOn) {
               Texts{"address: Roma,  in EU > Roma, EU in Europe"});
 }
 
-TEST_F(ObservationTest, RingsOfDependenciesEnd) {
+TEST_F(ObservationTest, DependenciesReachAnyDistanceAndMayFormRings) {
     const auto one = place("One");
     const auto two = place("Two", one);
     one->within = two;
-    auto token = two->observe("ring", [](const ValueChange&) {});
-    auto chain = place("end");
-    for (int i = 0; i < 2000; ++i)
+    two->addObserver(notebook.get(), "ring", 0, "of two");
+    EXPECT_EQ(notes([&] { one->setValueForKey("one", "ring"); }), Texts{"of two: (null) > (null)"});
+    const auto end = place("end", one);
+    auto chain = end;
+    for (int i = 0; i < 20000; ++i)
         chain = place("link", chain);
-    notebook->notes.clear();
     chain->addObserver(notebook.get(), "ring");
-    chain->within->setValueForKey("new", "ring");
-    EXPECT_EQ(notebook->notes, Texts{"ring: link > link"});
+    EXPECT_EQ(notes([&] { end->setValueForKey("new", "ring"); }), Texts{"ring: link > link"});
+    EXPECT_EQ(notes([&] { end->setValueForKey(place("other"), "within"); }),
+              Texts{"ring: link > link"});
+    EXPECT_EQ(notes([&] { one->setValueForKey("1", "ring"); }), Texts{"of two: (null) > (null)"});
+    EXPECT_EQ(notes([&] { end->within->setValueForKey("2", "ring"); }), Texts{"ring: link > link"});
     one->setValueForKey(nullptr, "within");
+}
+
+TEST_F(ObservationTest, APathMayComeBackToWhereItBeganAndEndInADependentValue) {
+    const auto italy = place("Italy");
+    const auto rome = place("Rome", italy);
+    italy->within = rome;
+    rome->addObserver(notebook.get(), "within.within.address", 0, "back");
+    EXPECT_EQ(notes([&] { italy->setValueForKey("Italia", "city"); }),
+              Texts{"back: (null) > (null)"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey("EU", "country"); }),
+              Texts{"back: (null) > (null)"});
+    italy->setValueForKey(nullptr, "within");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("IT", "country"); }), Texts{});
 }
 
 TEST_F(ObservationTest, NestedChangesOfOneKeyAreToldWhenTheOutermostEnds) {
@@ -366,15 +386,112 @@ TEST_F(ObservationTest, AThrowingPriorObserverCancelsTheAnnouncement) {
     EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
 }
 
-TEST_F(ObservationTest, ObservancesThroughASharedObjectEndWithTheirRoots) {
+TEST_F(ObservationTest, ManyObservationsCostTheSameInAnyOrder) {
+    constexpr int many = 40000;
+    const auto start = std::chrono::steady_clock::now();
     const auto shared = place("Italy");
     std::vector<Ref<Place>> places;
-    for (int i = 0; i < 100000; ++i) {
+    std::vector<Ref<Notebook>> notebooks;
+    std::vector<Key> keys;
+    for (int i = 0; i < many; ++i) {
         places.push_back(place("town", shared));
         places.back()->addObserver(notebook.get(), "within.city", 0);
+        notebooks.push_back(make<Notebook>());
+        shared->addObserver(notebooks.back().get(), "city", 0);
+        keys.emplace_back("key" + std::to_string(i));
+        shared->addObserver(notebook.get(), keys.back(), 0);
     }
     places.clear();
     EXPECT_EQ(notes([&] { shared->setValueForKey("Italia", "city"); }), Texts{});
+    for (const Key key : keys)
+        shared->willChangeValueForKey(key);
+    EXPECT_EQ(notes([&] {
+                  for (const Key key : keys)
+                      shared->didChangeValueForKey(key);
+              }).size(),
+              many);
+    for (int i = 0; i < many; ++i) {
+        shared->removeObserver(notebooks[i].get(), "city");
+        shared->removeObserver(notebook.get(), keys[i]);
+    }
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(20));
+}
+
+// Observers that do at random what they may do at all: the sanitizers watch.
+struct Chaos {
+    std::minstd_rand random{7};
+    std::vector<Ref<Place>> places = std::vector<Ref<Place>>(12);
+    std::vector<Ref<Notebook>> notebooks = std::vector<Ref<Notebook>>(4);
+    std::vector<ObservationToken> tokens = std::vector<ObservationToken>(6);
+    std::vector<WeakRef<Place>> all;
+    int depth = 0;
+
+    ~Chaos() {
+        for (const auto& one : all)
+            if (one)
+                one.lock()->within = nullptr; // there are rings
+    }
+    template <class List>
+    auto& any(List& list) {
+        return list[random() % list.size()];
+    }
+    void act() {
+        const std::function<void(Object&)> further = [this](Object&) {
+            if (depth < 4)
+                act();
+        };
+        static const std::vector<Key> keys = {"city", "within", "ring"};
+        static const std::vector<Key> paths = {
+            "city", "within.city", "within.within.ring", "address", "within.within.within", "ring"};
+        const auto options = static_cast<unsigned>(random() % 16);
+        const Ref<Place> one = any(places);
+        const Ref<Notebook> observer = any(notebooks);
+        const Key key = any(keys);
+        ++depth;
+        try {
+            switch (one && observer ? random() % 10 : random() % 3) {
+            case 0:
+                all.emplace_back(any(places) = place("new", any(places)));
+                break;
+            case 1:
+                any(places) = nullptr;
+                break;
+            case 2:
+                (any(notebooks) = make<Notebook>())->then = further;
+                break;
+            case 3:
+                throw std::runtime_error("observer");
+            case 4:
+                any(tokens) = one->observe(
+                    any(paths), [=](const ValueChange& change) { further(change.object); },
+                    options);
+                break;
+            case 5:
+                one->addObserver(observer.get(), any(paths), options);
+                break;
+            case 6:
+                one->removeObserver(observer.get(), any(paths));
+                break;
+            default:
+                one->setValueForKey(key == "within" ? Value(any(places).get()) : Value("new"), key);
+            }
+        } catch (const std::exception&) {
+            if (--depth > 0 && options < 8)
+                throw;
+            return;
+        }
+        --depth;
+    }
+};
+
+TEST_F(ObservationTest, ObserversMayDoAnythingWhileTheyAreTold) {
+    Chaos chaos;
+    for (int i = 0; i < 20000; ++i)
+        chaos.act();
+    // Whatever happened, what is observed now is told.
+    const auto rome = place("Rome", chaos.places[0] ? chaos.places[0] : place("Italy"));
+    rome->addObserver(notebook.get(), "within.city", 0);
+    EXPECT_EQ(notes([&] { rome->within->setValueForKey("Italia", "city"); }).size(), 1U);
 }
 
 } // namespace
