@@ -53,11 +53,15 @@ Ref<XMLNode> CopyScope::counterpart(XMLNode& node, ReadingBudget& budget,
                                     ReadingBudget::ErrorSlot error) {
     if (auto known = find(node))
         return known;
-    XMLNode& top = topOf(node);
-    if (!find(top) && !copyWhole(top, budget, error))
-        return nullptr;
+    if (_copied.empty())
+        _copied.reserve(_element.childCount());
     const XMLElement* holder = node.parent() != nullptr ? node.parent()->asElement() : nullptr;
-    if (!node.isElement() && holder != nullptr)
+    if (holder == nullptr || !find(*holder)) {
+        XMLNode& top = topOf(node);
+        if (!find(top) && !copyWhole(top, budget, error))
+            return nullptr;
+    }
+    if (holder != nullptr && !node.isElement())
         if (const auto copy = find(*holder))
             pairAttributes(*holder, *copy->asElement());
     if (!find(node) && !copyWhole(node, budget, error)) // a host has put it there since

@@ -36,6 +36,9 @@ bool Unmarshalling::findItems(const FieldPlan& field, const Target& target, Item
             return true;
         }
     }
+    const XMLElement& element = target.source.element();
+    if (!_budget.takeVisits(element.childCount(), element, error))
+        return false;
     target.source.forEachChild(add);
     return true;
 }

@@ -83,15 +83,20 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, 
         kept->set(name, qx::make<qx::Array>());
     bool fits = true;
     target.source.forEachChild([&](XMLNode& child) {
-        const Value* elements = fits ? kept->find(child.name()) : nullptr;
+        const Value* elements = fits && child.isElement() ? kept->find(child.name()) : nullptr;
         if (elements == nullptr)
             return;
         const auto node = target.source.keep(child, _budget, error);
         fits = node.get() != nullptr;
-        if (fits && child.isElement())
+        if (fits)
             static_cast<qx::Array*>(elements->object())->add(node);
     });
-    return fits && ObjectDoor::set(target.object, key, kept, error);
+    // A processing instruction leaves a name alone.
+    std::size_t lone = 0;
+    for (const auto& entry : *kept)
+        lone += static_cast<const qx::Array*>(entry.value.object())->isEmpty() ? 1 : 0;
+    return fits && _budget.takeKept(lone, target.source.element(), error) &&
+           ObjectDoor::set(target.object, key, kept, error);
 }
 
 bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {

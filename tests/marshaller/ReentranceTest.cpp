@@ -110,9 +110,12 @@ std::string document() {
             items += "<" + name + " id='" + id + "' more='m'>x<u/></" + name + ">";
         return items;
     };
+    std::string padding; // so many children that an index is built of them
+    for (int i = 0; i < 30; ++i)
+        padding += "<p/>";
     return "<order xmlns:n='urn:n' spare='s'><head id='h'/><one id='1'/><word>w</word><w>f</w>" +
            two("t") + "<box>" + two("l") + "</box>" + two("item") + "<wrap>" + two("item") +
-           "</wrap><unknown><deep/></unknown></order>";
+           "</wrap><unknown><deep/></unknown>" + padding + "</order>";
 }
 
 void takeApart(qx::XMLElement& element) {
