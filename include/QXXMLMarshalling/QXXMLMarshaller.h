@@ -10,7 +10,9 @@
 //
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
-// setters of host classes throw passes through every operation here.
+// setters of host classes throw passes through every operation here. They may use the marshaller,
+// the document and its nodes while they are called by a reading: what is changed then is found
+// changed by the fields that follow, but a list that is being filled stays as it was found.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/platform/Array.h>
@@ -62,15 +64,29 @@ public:
         _maximumDepth = depth < highestMaximumDepth ? depth : highestMaximumDepth;
     }
     static constexpr std::size_t highestMaximumDepth = 2'048;
+    // How much one reading may make, so that no mapping makes much of a small document: `base`, and
+    // `perElement` more for each element of what is read. Beyond a limit a reading ends in
+    //   -224  "Reading makes more objects than the limit of %@: %@"   (the limit, the class)
+    //   -224  "Reading keeps more nodes than the limit of %@: %@"     (the limit, the element)
+    //   -224  "Reading goes over more nodes than the limit of %@: %@"   (likewise)
+    struct Limit {
+        std::size_t base;
+        std::size_t perElement;
+    };
+    // The objects that it makes; 10,000 and 16 at first. To make them it goes over at most 16 times
+    // as many nodes, and 64 times as many as there are.
+    Limit maximumObjects() const noexcept { return _maximumObjects; }
+    void setMaximumObjects(Limit limit) noexcept { _maximumObjects = limit; }
+    // The unknown XML that objects keep, and the nodes that are copied for that; 10,000 and 64.
+    Limit maximumKeptNodes() const noexcept { return _maximumKeptNodes; }
+    void setMaximumKeptNodes(Limit limit) noexcept { _maximumKeptNodes = limit; }
 
     // A new document, version "1.0" and encoding "UTF-8", whose root represents the object; null
     // with one of the errors of marshallObject and of the fields. Kept unknown XML is moved, not
     // copied, into the document: out of an earlier one if the object was marshalled before.
     qx::Ref<qx::XMLDocument> marshall(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
     // The object built from the document's root element; null on failure, and without an error when
-    // a lenient marshaller finds no class for the root element. See unmarshallElement. One element
-    // is bound to at most 1,000 objects (by flattened fields), more end in
-    //   -224  "Element is bound more often than the limit of %@: %@"   (the limit, the element)
+    // a lenient marshaller finds no class for the root element. See unmarshallElement.
     qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, qx::Ref<qx::Error>* error = nullptr);
     template <class T>
     qx::Ref<qx::Object> unmarshall(const qx::Ref<T>& document,
@@ -198,6 +214,8 @@ private:
     bool _usingNamespaceURIs = true;
     qx::Ref<qx::UndoManager> _undoManager;
     std::size_t _maximumDepth = 256;
+    Limit _maximumObjects{10'000, 16};
+    Limit _maximumKeptNodes{10'000, 64};
 };
 
 // Converts the value by the field's type and sets it under the key. False with

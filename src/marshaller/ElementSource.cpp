@@ -14,11 +14,12 @@ constexpr std::size_t scanLimit = 256;
 
 std::unique_ptr<ElementSource> ElementSource::copyOf(const ElementSource& other) {
     auto copy = std::make_unique<ElementSource>(other._element, nullptr, other._lookups);
-    copy->_ownScope = std::make_unique<CopyScope>();
+    copy->_ownScope = std::make_unique<CopyScope>(other._element);
     copy->_scope = copy->_ownScope.get();
     copy->_children = std::make_unique<Children>();
     copy->_children->list.reserve(other._element.childCount());
-    other.forEachChild([&](XMLNode& child) { copy->_children->list.push_back({.node = &child}); });
+    other.forEachChild(
+        [&](XMLNode& child) { copy->_children->list.push_back({Ref<XMLNode>(&child)}); });
     return copy;
 }
 
@@ -26,7 +27,7 @@ void ElementSource::list() {
     _children = std::make_unique<Children>();
     _children->list.reserve(_element.childCount());
     for (XMLNode& child : _element.children())
-        _children->list.push_back({.node = &child});
+        _children->list.push_back({Ref<XMLNode>(&child)});
 }
 
 void ElementSource::index() {
@@ -55,49 +56,53 @@ void ElementSource::indexIfWorthIt() {
     index();
 }
 
-ElementSource::Walk::Walk(ElementSource& source, String name) : _name(std::move(name)) {
-    source.indexIfWorthIt();
-    if (!source._children) {
-        _child = source._element.firstChild();
+template <class Visit>
+void ElementSource::forEachNamed(const String& name, Visit visit) {
+    indexIfWorthIt();
+    const auto isOne = [&](const XMLNode& node) { return node.isElement() && node.name() == name; };
+    if (!_children) {
+        for (XMLNode& child : _element.children())
+            if (isOne(child) && !visit(static_cast<XMLElement&>(child)))
+                return;
         return;
     }
-    _list = &source._children->list;
-    _isIndexed = source._children->indexed;
-    if (!_isIndexed)
+    const auto& list = _children->list;
+    if (_children->indexed) {
+        const auto run = _children->runs.find(name);
+        std::uint32_t at = run != _children->runs.end() ? run->second.first : none;
+        while (at != none && visit(static_cast<XMLElement&>(*list[at].node)))
+            at = list[at].next;
         return;
-    const auto run = source._children->runs.find(_name);
-    _position = run != source._children->runs.end() ? run->second.first : none;
-}
-
-XMLElement* ElementSource::Walk::nextIndexed() noexcept {
-    if (_position == none)
-        return nullptr;
-    const Child& child = (*_list)[_position];
-    _position = child.next;
-    return static_cast<XMLElement*>(child.node);
-}
-
-XMLElement* ElementSource::Walk::nextListed() noexcept {
-    while (_position < _list->size()) {
-        const Child& child = (*_list)[_position++];
-        if (!child.taken && isOne(*child.node))
-            return static_cast<XMLElement*>(child.node);
     }
-    return nullptr;
+    for (const Child& child : list)
+        if (!child.taken && isOne(*child.node) && !visit(static_cast<XMLElement&>(*child.node)))
+            return;
 }
 
 ElementSource::Found ElementSource::find(const String& name) {
-    Walk walk(*this, name);
-    XMLElement* const first = walk.next();
-    return {first, first != nullptr && walk.next() != nullptr};
+    Found found;
+    forEachNamed(name, [&](XMLElement& child) {
+        found.several = found.first != nullptr;
+        if (!found.several)
+            found.first = &child;
+        return !found.several;
+    });
+    return found;
 }
 
 XMLElement* ElementSource::last(const String& name) {
-    Walk walk(*this, name);
     XMLElement* last = nullptr;
-    while (XMLElement* child = walk.next())
-        last = child;
+    forEachNamed(name, [&](XMLElement& child) { return (last = &child) != nullptr; });
     return last;
+}
+
+ElementSource::Nodes ElementSource::all(const String& name) {
+    Nodes nodes;
+    forEachNamed(name, [&](XMLElement& child) {
+        nodes.emplace_back(&child);
+        return true;
+    });
+    return nodes;
 }
 
 String ElementSource::stringValue() const {
@@ -128,15 +133,13 @@ void ElementSource::take(XMLElement& child) {
         return;
     }
     for (Child& listed : _children->list)
-        if (listed.node == &child)
+        if (listed.node.get() == &child)
             listed.taken = true;
 }
 
-Ref<XMLNode> ElementSource::keep(XMLNode& node) const {
-    if (_scope == nullptr)
-        return Ref<XMLNode>(&node);
-    Ref<XMLNode>& copy = _scope->copies[&node];
-    if (!copy)
-        copy = node.copy();
-    return copy;
+Ref<XMLNode> ElementSource::keep(XMLNode& node, ReadingBudget& budget,
+                                 ReadingBudget::ErrorSlot error) const {
+    if (!budget.takeKept(1, _element, error))
+        return nullptr;
+    return _scope != nullptr ? _scope->counterpart(node, budget, error) : Ref<XMLNode>(&node);
 }

@@ -5,30 +5,25 @@
 // A class with flattened fields works on a private copy, so that the flattened objects can take
 // children away from each other without touching the document. The copy is a view: it lists the
 // element's children and forgets those that are taken. What an object keeps of a copy (unknown XML)
-// is copied when it is kept, once, so that nothing of the document itself is ever moved out of it;
-// that holds for nested elements too, which share the copy's scope.
+// is copied when it is kept (CopyScope.h), so that nothing of the document itself is ever moved out
+// of it; that holds for nested elements too, which share the copy's scope.
 //
 // Children are found by scanning, or through an index where many names are looked up among many
-// children.
+// children. A list of children holds them: a host may change the element meanwhile.
 
-#include <QXXMLMarshalling/platform/XMLElement.h>
+#include "marshaller/CopyScope.h"
 
 #include <memory>
-#include <optional>
-#include <unordered_map>
 #include <vector>
 
 class ElementSource {
 public:
-    // The copies that objects bound from one private copy keep.
-    struct CopyScope {
-        std::unordered_map<const qx::XMLNode*, qx::Ref<qx::XMLNode>> copies;
-    };
+    using Nodes = std::vector<qx::Ref<qx::XMLNode>>;
 
-    // The element itself; `scope` is that of the source in which it was found, null in the
-    // document. `lookups` is how many names will be looked up.
+    // The element itself, which must outlive the source; `scope` is that of the source in which it
+    // was found, null in the document. `lookups` is how many names will be looked up.
     ElementSource(qx::XMLElement& element, CopyScope* scope, std::size_t lookups) noexcept
-        : _element(element), _scope(scope), _lookups(lookups) {}
+        : _element(element), _scope(scope), _lookups(lookups), _childCount(element.childCount()) {}
     // A private copy of what is left in the other.
     static std::unique_ptr<ElementSource> copyOf(const ElementSource& other);
     ElementSource(const ElementSource&) = delete;
@@ -37,6 +32,8 @@ public:
     qx::XMLElement& element() const noexcept { return _element; }
     CopyScope* scope() const noexcept { return _scope; }
     bool isCopy() const noexcept { return _ownScope != nullptr; }
+    // How many children the element had at first.
+    std::size_t firstChildCount() const noexcept { return _childCount; }
     // Says that another object will look that many names up, too.
     void expectLookups(std::size_t lookups) noexcept { _lookups += lookups; }
 
@@ -47,9 +44,8 @@ public:
     };
     Found find(const qx::String& name);
     qx::XMLElement* last(const qx::String& name);
-    // All of them, one after the other, as long as the source is not used otherwise. To bind one
-    // before the next is looked for finds that one in memory that is still at hand.
-    class Walk;
+    // All of them, held.
+    Nodes all(const qx::String& name);
 
     // Calls visit(XMLNode&) for each child node in document order.
     template <class Visit>
@@ -69,13 +65,14 @@ public:
 
     // Takes the child, the first of its name, out: of the copy, else of the element itself.
     void take(qx::XMLElement& child);
-    // The node as an object may keep it.
-    qx::Ref<qx::XMLNode> keep(qx::XMLNode& node) const;
+    // The node as an object may keep it; null with -224 when that is more than the budget has.
+    qx::Ref<qx::XMLNode> keep(qx::XMLNode& node, ReadingBudget& budget,
+                              ReadingBudget::ErrorSlot error) const;
 
 private:
     static constexpr std::uint32_t none = UINT32_MAX;
     struct Child {
-        qx::XMLNode* node;
+        qx::Ref<qx::XMLNode> node;
         std::uint32_t next = none; // of the same name; only among elements
         bool taken = false;
     };
@@ -96,40 +93,14 @@ private:
     void list();
     void index();
     void indexIfWorthIt();
+    // Calls visit(XMLElement&) for each child element of that name until it says false.
+    template <class Visit>
+    void forEachNamed(const qx::String& name, Visit visit);
+
     qx::XMLElement& _element;
     CopyScope* _scope;
     std::size_t _lookups;
+    std::size_t _childCount;
     std::unique_ptr<Children> _children;  // a private copy's, or the index of an element's
     std::unique_ptr<CopyScope> _ownScope; // of a private copy
-};
-
-class ElementSource::Walk {
-public:
-    Walk(ElementSource& source, qx::String name);
-    // Null behind the last.
-    qx::XMLElement* next() noexcept {
-        return _isIndexed ? nextIndexed() : _list != nullptr ? nextListed() : nextChild();
-    }
-
-private:
-    bool isOne(const qx::XMLNode& node) const noexcept {
-        return node.isElement() && node.name() == _name;
-    }
-    qx::XMLElement* nextIndexed() noexcept;
-    qx::XMLElement* nextListed() noexcept;
-    qx::XMLElement* nextChild() noexcept {
-        while (_child != nullptr) {
-            qx::XMLNode* const node = _child;
-            _child = node->nextSibling();
-            if (isOne(*node))
-                return static_cast<qx::XMLElement*>(node);
-        }
-        return nullptr;
-    }
-
-    const qx::String _name;
-    const std::vector<Child>* _list = nullptr; // null: the element's own children are walked
-    bool _isIndexed = false;
-    std::uint32_t _position = 0;   // in the list
-    qx::XMLNode* _child = nullptr; // among the children
 };

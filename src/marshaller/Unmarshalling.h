@@ -11,6 +11,10 @@
 //
 // Error slots are handed along as they come: a step reports only to a caller who passed one, and
 // collections behave differently without.
+//
+// Between any two steps stands the code of host classes, which may change the document and the
+// marshaller, or let go of them. So the call holds both, whoever binds an element holds it, and the
+// options are read where they count.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
@@ -37,17 +41,17 @@ public:
     };
 
     // Of a whole document's unmarshalling the counts of consumed names are its own affair; in
-    // single steps they are the caller's: always counted, and left as they are by the validation.
+    // single steps they are the caller's, and left as they are by the validation.
     enum class Use : std::uint8_t { document, steps };
-    explicit Unmarshalling(QXXMLMarshaller& marshaller, Use use = Use::document);
+    // `root` is the element that all is read from; null for none.
+    Unmarshalling(QXXMLMarshaller& marshaller, qx::XMLElement* root, Use use = Use::document);
 
-    qx::Ref<qx::Object> unmarshallNode(qx::XMLNode* node, ElementSource::CopyScope* scope,
-                                       ErrorSlot error);
+    qx::Ref<qx::Object> unmarshallNode(qx::XMLNode* node, CopyScope* scope, ErrorSlot error);
     // `source` may be shared with the object that this one is flattened into.
     qx::Ref<qx::Object> build(const ClassPlan& plan, ElementSource& source, bool isFlattened,
                               ErrorSlot error);
-    qx::Ref<qx::Object> build(const ClassPlan& plan, qx::XMLElement& element,
-                              ElementSource::CopyScope* scope, ErrorSlot error);
+    qx::Ref<qx::Object> build(const ClassPlan& plan, qx::XMLElement& element, CopyScope* scope,
+                              ErrorSlot error);
     qx::Ref<qx::Object> allocate(const ClassPlan& plan);
     bool bindFields(const ClassPlan& plan, const Target& target, ErrorSlot error);
     bool bindField(const FieldPlan& field, const Target& target, ErrorSlot error);
@@ -62,7 +66,7 @@ public:
     bool bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error);
 
     // `plan` is the class whose fields were bound, null where they were bound one by one.
-    bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error) const;
+    bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error);
 
 private:
     // An object that is being bound, and those whose binding led to it.
@@ -75,35 +79,38 @@ private:
     struct Items;
 
     bool isBeingBound(const ClassPlan& plan, const qx::XMLElement& element) const;
-    bool countBuild(const ElementSource& source, bool isFlattened, ErrorSlot error);
+    bool mayBuild(const ClassPlan& plan, const ElementSource& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
     bool findElement(const FieldPlan& field, const Target& target, qx::XMLElement*& child,
                      const BindingPlan*& binding, ErrorSlot error);
     qx::Value elementValue(const FieldPlan& field, const Target& target, qx::XMLElement& child,
                            const ClassPlan* classOfElement, ErrorSlot error);
     qx::Value flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error);
-    Items findItems(const FieldPlan& field, const Target& target);
+    bool findItems(const FieldPlan& field, const Target& target, Items& items, ErrorSlot error);
+    bool findItemsByType(const FieldPlan& field, const Target& target, Items& items,
+                         ErrorSlot error);
+    template <class Make>
+    bool bindItems(const FieldPlan& field, const Target& target, const Items& items,
+                   ErrorSlot error, Make make);
+    bool endsAfter(ErrorSlot error) const {
+        return (error != nullptr && *error) || _budget.isSpent();
+    }
     bool adopt(qx::Object& item, qx::Object& parent, ErrorSlot error);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
-    bool validateChildren(const Target& target, ErrorSlot error) const;
-    bool validateAttributes(const Target& target, ErrorSlot error) const;
+    bool validateChildren(const Target& target, ErrorSlot error);
+    bool keepChildren(const Target& target, const qx::CountedSet& names, ErrorSlot error);
+    bool validateAttributes(const Target& target, ErrorSlot error);
+    bool keepAttributes(const Target& target, const qx::CountedSet& names, ErrorSlot error);
 
-    // Whether consumed names are counted at all.
-    bool counts() const noexcept { return _use == Use::steps || validates(); }
-    bool validates() const noexcept { return !_lenient || _saveUnknownXML; }
-    void countField(const Target& target, const qx::String& name) const;
-
-    QXXMLMarshaller& _marshaller;
+    const qx::Ref<QXXMLMarshaller> _marshaller;
+    const qx::Ref<qx::XMLElement> _root;
     const MappingPlan& _plan;
-    const bool _lenient;
-    const bool _saveUnknownXML;
     const Use _use;
+    ReadingBudget _budget;
     ObjectDoor _door;
     std::vector<const qx::Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
-    // How often elements were bound, of those that may be bound several times.
-    std::unordered_map<const qx::XMLElement*, std::size_t> _builds;
     // Counts of consumed names; the first few are lent to the objects that are being bound.
     std::vector<std::unique_ptr<NameCounts>> _counts;
     std::size_t _countsLent = 0;

@@ -4,41 +4,96 @@
 
 #include "platform/system/Errors.h"
 
-#include <algorithm>
-#include <optional>
-
+using qx::Ref;
 using qx::XMLElement;
 using qx::XMLNode;
 
-// The nodes that an untyped collection's items are made from.
+// The nodes that a collection's items are made from: all that there are before the first item is.
 struct Unmarshalling::Items {
-    std::vector<XMLNode*> nodes;
-    bool areNamed = false; // found under a bind name, which is then counted as a whole
+    ElementSource::Nodes nodes;
+    bool areCounted = false; // as a whole, by their bind name or their wrapper's
 };
 
 // Elements of a bind name that a class maps to are the items; of any other bind name the last
 // element is a wrapper around them. Without either, all children of the element are.
-Unmarshalling::Items Unmarshalling::findItems(const FieldPlan& field, const Target& target) {
-    Items items;
+bool Unmarshalling::findItems(const FieldPlan& field, const Target& target, Items& items,
+                              ErrorSlot error) {
+    const auto add = [&](XMLNode& child) { items.nodes.emplace_back(&child); };
     for (const BindingPlan& binding : field.bindings) {
         if (binding.bindTo.isEmpty())
             continue;
         if (binding.classOfBindTo != nullptr) {
-            ElementSource::Walk walk(target.source, binding.bindTo);
-            while (XMLElement* element = walk.next())
-                items.nodes.push_back(element);
+            items.nodes = target.source.all(binding.bindTo);
         } else if (const XMLElement* wrapper = target.source.last(binding.bindTo)) {
+            if (!_budget.takeVisits(wrapper->childCount(), *wrapper, error))
+                return false;
             for (XMLNode& child : wrapper->children())
-                items.nodes.push_back(&child);
+                add(child);
         }
         if (!items.nodes.empty()) {
-            countField(target, binding.bindTo);
-            items.areNamed = true;
-            return items;
+            target.bound.fields.add(binding.bindTo);
+            items.areCounted = true;
+            return true;
         }
     }
-    target.source.forEachChild([&](XMLNode& child) { items.nodes.push_back(&child); });
-    return items;
+    const XMLElement& element = target.source.element();
+    if (!_budget.takeVisits(element.childCount(), element, error))
+        return false;
+    target.source.forEachChild(add);
+    return true;
+}
+
+// Items are the elements of a bind name, whatever class their own name maps to, in the element or
+// in the one wrapper that a location names. A wrapper counts instead of its items, and once found
+// it is searched by the later bindings too.
+bool Unmarshalling::findItemsByType(const FieldPlan& field, const Target& target, Items& items,
+                                    ErrorSlot error) {
+    std::unique_ptr<ElementSource> wrapper;
+    ElementSource* root = &target.source;
+    for (const BindingPlan& binding : field.bindings) {
+        if (!binding.location.isEmpty()) {
+            const auto found = root->find(binding.location);
+            if (found.first == nullptr)
+                continue;
+            if (!found.several) {
+                if (!_budget.takeVisits(found.first->childCount(), *found.first, error))
+                    return false;
+                wrapper = std::make_unique<ElementSource>(*found.first, target.source.scope(),
+                                                          field.bindings.size());
+                root = wrapper.get();
+                items.areCounted = true;
+                target.bound.fields.add(binding.location);
+            }
+        }
+        if (!binding.bindTo.isEmpty())
+            items.nodes = root->all(binding.bindTo);
+        if (!items.nodes.empty() || wrapper)
+            break;
+    }
+    return true;
+}
+
+// Calls make(XMLNode&) for each item, and sets the list of those that were made.
+template <class Make>
+bool Unmarshalling::bindItems(const FieldPlan& field, const Target& target, const Items& items,
+                              ErrorSlot error, Make make) {
+    if (items.nodes.empty())
+        return true;
+    auto array = qx::make<qx::Array>();
+    array->reserve(items.nodes.size());
+    for (const Ref<XMLNode>& node : items.nodes) {
+        const auto item = make(*node);
+        if (endsAfter(error))
+            return false;
+        if (!item)
+            continue;
+        if (!items.areCounted)
+            target.bound.fields.add(node->name());
+        if (!adopt(*item, target.object, error))
+            return false;
+        array->add(item);
+    }
+    return ObjectDoor::set(target.object, field.key, array, error);
 }
 
 bool Unmarshalling::bindCollection(const FieldPlan& field, const Target& target, ErrorSlot error) {
@@ -46,71 +101,22 @@ bool Unmarshalling::bindCollection(const FieldPlan& field, const Target& target,
         return qx::fail(error, qx::errors::unknownCollectionClass, field.mapping->collection());
     if (field.hasType())
         return bindArrayByType(field, target, error);
-    const Items items = findItems(field, target);
-    if (items.nodes.empty())
-        return true;
-    auto array = qx::make<qx::Array>();
-    for (XMLNode* node : items.nodes) {
-        const auto item = unmarshallNode(node, target.source.scope(), error);
-        if (error != nullptr && *error)
-            return false;
-        if (!item)
-            continue;
-        if (!items.areNamed)
-            countField(target, node->name());
-        if (!adopt(*item, target.object, error))
-            return false;
-        array->add(item);
-    }
-    return ObjectDoor::set(target.object, field.key, array, error);
+    Items items;
+    if (!findItems(field, target, items, error))
+        return false;
+    return bindItems(field, target, items, error, [&](XMLNode& node) {
+        return unmarshallNode(&node, target.source.scope(), error);
+    });
 }
 
-// Items are the elements of a bind name, whatever class their own name maps to, in the element or
-// in the one wrapper that a location names. A wrapper counts instead of its items, and once found
-// it is searched by the later bindings too.
 bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (field.typeClass == nullptr)
         return qx::fail(error, qx::errors::noMappingForClass, field.mapping->type());
-    std::unique_ptr<ElementSource> wrapper;
-    ElementSource* root = &target.source;
-    std::optional<ElementSource::Walk> elements;
-    XMLElement* element = nullptr;
-    for (const BindingPlan& binding : field.bindings) {
-        if (!binding.location.isEmpty()) {
-            const auto found = root->find(binding.location);
-            if (found.first == nullptr)
-                continue;
-            if (!found.several) {
-                wrapper = std::make_unique<ElementSource>(*found.first, target.source.scope(),
-                                                          field.bindings.size());
-                root = wrapper.get();
-                countField(target, binding.location);
-            }
-        }
-        if (!binding.bindTo.isEmpty()) {
-            elements.emplace(*root, binding.bindTo);
-            element = elements->next();
-        }
-        if (element != nullptr || wrapper)
-            break;
-    }
-    if (element == nullptr)
-        return true;
-    // Most collections are short, and alone in their element.
-    constexpr std::size_t usualSize = 16;
-    auto array = qx::make<qx::Array>();
-    array->reserve(std::min(root->element().childCount(), usualSize));
-    for (; element != nullptr; element = elements->next()) {
-        const auto item = build(*field.typeClass, *element, target.source.scope(), error);
-        if (error != nullptr && *error)
-            return false;
-        if (!item)
-            continue;
-        array->add(item);
-        if (!adopt(*item, target.object, error))
-            return false;
-        if (!wrapper)
-            countField(target, element->name());
-    }
-    return ObjectDoor::set(target.object, field.key, array, error);
+    Items items;
+    if (!findItemsByType(field, target, items, error))
+        return false;
+    return bindItems(field, target, items, error, [&](XMLNode& node) {
+        return build(*field.typeClass, static_cast<XMLElement&>(node), target.source.scope(),
+                     error);
+    });
 }

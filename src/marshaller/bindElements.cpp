@@ -22,7 +22,7 @@ bool Unmarshalling::findElement(const FieldPlan& field, const Target& target, XM
         if (found.first == nullptr)
             continue;
         child = found.first;
-        countField(target, candidate.name);
+        target.bound.fields.add(candidate.name);
         return true;
     }
     if (field.isRequired && error != nullptr)
@@ -35,9 +35,11 @@ bool Unmarshalling::findElement(const FieldPlan& field, const Target& target, XM
 Value Unmarshalling::elementValue(const FieldPlan& field, const Target& target, XMLElement& child,
                                   const ClassPlan* classOfElement, ErrorSlot error) {
     const ClassPlan* plan = field.typeClass != nullptr ? field.typeClass : classOfElement;
-    if (plan != nullptr)
+    if (plan != nullptr) {
+        const Ref<XMLElement> held(&child);
         return build(*plan, child, target.source.scope(), error);
-    return child.stringValue();
+    }
+    return _budget.takeText(child, error) ? Value(child.stringValue()) : Value();
 }
 
 Value Unmarshalling::flattenedValue(const FieldPlan& field, const Target& target, ErrorSlot error) {
@@ -46,7 +48,8 @@ Value Unmarshalling::flattenedValue(const FieldPlan& field, const Target& target
     const ClassPlan* plan = _plan.classForElement(target.source.element().name());
     if (plan != nullptr)
         return build(*plan, target.source, false, error);
-    return target.source.stringValue();
+    return _budget.takeText(target.source.element(), error) ? Value(target.source.stringValue())
+                                                            : Value();
 }
 
 bool Unmarshalling::bindAsElement(const FieldPlan& field, const Target& target, ErrorSlot error) {

@@ -28,8 +28,7 @@ bool Unmarshalling::bindAsAttribute(const FieldPlan& field, const Target& target
             break;
     }
     if (!value.isNull()) {
-        if (counts())
-            target.bound.attributes.add(tried->name);
+        target.bound.attributes.add(tried->name);
         return takeValue(target.object, field, field.key, std::move(value), error);
     }
     if (field.isRequired)
@@ -50,12 +49,14 @@ bool Unmarshalling::bindAsText(const FieldPlan& field, const Target& target, Err
             return qx::fail(error, qx::errors::tooManyChildren, binding.bindTo,
                             &target.source.element());
         if (found.first != nullptr) {
-            countField(target, binding.bindTo);
+            target.bound.fields.add(binding.bindTo);
             holder = found.first;
             isChild = true;
             break;
         }
     }
+    if (!_budget.takeText(*holder, error))
+        return false;
     const String text = isChild ? holder->stringValue() : target.source.stringValue();
     if (!text.isEmpty())
         return takeValue(target.object, field, field.key, text, error);

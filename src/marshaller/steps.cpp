@@ -42,12 +42,14 @@ class Step {
 public:
     Step(QXXMLMarshaller& marshaller, XMLElement& element, std::size_t lookups, CountedSet& fields,
          CountedSet& attributes)
-        : _unmarshalling(marshaller, Unmarshalling::Use::steps), _source(element, nullptr, lookups),
-          _fieldSet(fields), _attributeSet(attributes), _fields(fields), _attributes(attributes) {}
+        : _unmarshalling(marshaller, &element, Unmarshalling::Use::steps),
+          _source(element, nullptr, lookups), _fieldSet(fields), _attributeSet(attributes),
+          _fields(fields), _attributes(attributes) {}
 
     // Calls bind(Unmarshalling&, const Unmarshalling::Target&).
     template <class Bind>
     bool run(Object& object, bool isFlattened, Bind bind) {
+        const Ref<Object> held(&object);
         const Unmarshalling::Target target{object, _source, {_fields, _attributes}, isFlattened};
         struct Counted {
             Step& step;
@@ -99,7 +101,8 @@ bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
 }
 
 Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>* error) {
-    return Unmarshalling(*this).unmarshallNode(element, nullptr, error);
+    return Unmarshalling(*this, element != nullptr ? element->asElement() : nullptr)
+        .unmarshallNode(element, nullptr, error);
 }
 
 Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapping,
@@ -109,13 +112,14 @@ Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapp
         return nullptr;
     const PlanOfClass plan(this->plan(), mapping);
     ElementSource source(*element, nullptr, (*plan).bindingCount);
-    return Unmarshalling(*this, Unmarshalling::Use::steps).build(*plan, source, isFlattened, error);
+    return Unmarshalling(*this, element, Unmarshalling::Use::steps)
+        .build(*plan, source, isFlattened, error);
 }
 
 Ref<Object> QXXMLMarshaller::allocateClassWithMapping(const QXXMLClassMapping& mapping,
                                                       Ref<Error>*) {
     const PlanOfClass plan(this->plan(), mapping);
-    return Unmarshalling(*this, Unmarshalling::Use::steps).allocate(*plan);
+    return Unmarshalling(*this, nullptr, Unmarshalling::Use::steps).allocate(*plan);
 }
 
 bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Object& object,
@@ -206,7 +210,8 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
     NameCounts fields(boundFields);
     NameCounts attributes(boundAttributes);
     ElementSource source(element, nullptr, 0);
-    return Unmarshalling(*this, Unmarshalling::Use::steps)
+    const Ref<Object> held(&object);
+    return Unmarshalling(*this, &element, Unmarshalling::Use::steps)
         .validate(nullptr, {object, source, {fields, attributes}, false}, error);
 }
 

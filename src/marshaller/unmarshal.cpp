@@ -10,17 +10,9 @@ using qx::Key;
 using qx::Ref;
 using qx::Value;
 
-namespace {
-
-// A few classes with two flattened fields each would bind an element more often than any machine
-// can.
-constexpr std::size_t mostBuildsOfElement = 1'000;
-
-} // namespace
-
-Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, Use use)
-    : _marshaller(marshaller), _plan(marshaller.plan()), _lenient(marshaller._lenient),
-      _saveUnknownXML(marshaller._saveUnknownXML), _use(use), _classes(_plan.classCount() + 1),
+Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, qx::XMLElement* root, Use use)
+    : _marshaller(&marshaller), _root(root), _plan(marshaller.plan()), _use(use),
+      _budget(marshaller, root), _classes(_plan.classCount() + 1),
       _classKnown(_plan.classCount() + 1) {}
 
 // Lends counts for the time of one object's binding.
@@ -45,19 +37,19 @@ private:
     NameCounts* _counts;
 };
 
-Ref<qx::Object> Unmarshalling::unmarshallNode(qx::XMLNode* node, ElementSource::CopyScope* scope,
+Ref<qx::Object> Unmarshalling::unmarshallNode(qx::XMLNode* node, CopyScope* scope,
                                               ErrorSlot error) {
     qx::XMLElement* element = node != nullptr ? node->asElement() : nullptr;
     const ClassPlan* plan = element != nullptr ? _plan.classForElement(element->name()) : nullptr;
     if (plan != nullptr)
         return build(*plan, *element, scope, error);
-    if (_lenient)
+    if (_marshaller->isLenient())
         return nullptr;
     return qx::fail(error, qx::errors::noDefinitionForElement, node);
 }
 
 Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, qx::XMLElement& element,
-                                     ElementSource::CopyScope* scope, ErrorSlot error) {
+                                     CopyScope* scope, ErrorSlot error) {
     ElementSource source(element, scope, plan.bindingCount);
     return build(plan, source, false, error);
 }
@@ -71,21 +63,21 @@ bool Unmarshalling::isBeingBound(const ClassPlan& plan, const qx::XMLElement& el
     return false;
 }
 
-bool Unmarshalling::countBuild(const ElementSource& source, bool isFlattened, ErrorSlot error) {
-    const bool mayRecur = isFlattened || source.scope() != nullptr;
-    return !mayRecur || ++_builds[&source.element()] <= mostBuildsOfElement ||
-           qx::fail(error, qx::errors::boundTooOften, mostBuildsOfElement, source.element().name());
+bool Unmarshalling::mayBuild(const ClassPlan& plan, const ElementSource& source, ErrorSlot error) {
+    const qx::XMLElement& element = source.element();
+    if (isBeingBound(plan, element))
+        return qx::fail(error, qx::errors::noDefinitionForElement, &element);
+    const std::size_t depth = _frame != nullptr ? _frame->depth : 0;
+    const std::size_t deepest = _marshaller->maximumDepth();
+    if (depth >= deepest)
+        return qx::fail(error, qx::errors::nestedTooDeep, deepest, plan.className.string());
+    return _budget.takeObject(plan.className.string(), error) &&
+           _budget.takeVisits(element.childCount(), element, error);
 }
 
 Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& source, bool isFlattened,
                                      ErrorSlot error) {
-    if (isBeingBound(plan, source.element()))
-        return qx::fail(error, qx::errors::noDefinitionForElement, &source.element());
-    const std::size_t depth = _frame != nullptr ? _frame->depth + 1 : 1;
-    if (depth > _marshaller._maximumDepth)
-        return qx::fail(error, qx::errors::nestedTooDeep, _marshaller._maximumDepth,
-                        plan.className.string());
-    if (!countBuild(source, isFlattened, error))
+    if (!mayBuild(plan, source, error))
         return nullptr;
     Ref<qx::Object> object = allocate(plan);
     // Whoever set it: a caller's earlier error stops the binding, too.
@@ -94,9 +86,9 @@ Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& sourc
     QXGenericRecord* const record = ObjectDoor::plainRecord(*object);
     const ObjectHooks* const hooks = record == nullptr ? &_door.hooksOf(*object) : nullptr;
     if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
-        ObjectDoor::send(*object, *hooks->setUndoManager, _marshaller.undoManager());
+        ObjectDoor::send(*object, *hooks->setUndoManager, _marshaller->undoManager());
 
-    const Frame frame{&plan, &source.element(), _frame, depth};
+    const Frame frame{&plan, &source.element(), _frame, _frame != nullptr ? _frame->depth + 1 : 1};
     struct Restore {
         const Frame*& current;
         const Frame* outer;
@@ -176,8 +168,12 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
     if (namespaces.empty())
         return true;
     auto kept = qx::make<qx::Array>();
-    for (qx::XMLNode& declaration : namespaces)
-        kept->add(target.source.keep(declaration));
+    for (qx::XMLNode& declaration : namespaces) {
+        auto node = target.source.keep(declaration, _budget, error);
+        if (!node)
+            return false;
+        kept->add(std::move(node));
+    }
     return ObjectDoor::set(target.object, key, kept, error);
 }
 
@@ -223,9 +219,4 @@ bool Unmarshalling::adopt(qx::Object& item, qx::Object& parent, ErrorSlot error)
         return qx::fail(error, qx::errors::unableToSetValue, argument, "parent", item.isa().name());
     ObjectDoor::send(item, *setParent, argument);
     return true;
-}
-
-void Unmarshalling::countField(const Target& target, const qx::String& name) const {
-    if (counts())
-        target.bound.fields.add(name);
 }

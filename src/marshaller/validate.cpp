@@ -38,8 +38,8 @@ private:
 
 } // namespace
 
-bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorSlot error) const {
-    if (!validates())
+bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorSlot error) {
+    if (_marshaller->isLenient() && !_marshaller->saveUnknownXML())
         return true;
     if (_use == Use::document) {
         const bool allBound = plan != nullptr && hasBoundAllChildren(*plan, target);
@@ -54,17 +54,16 @@ bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorS
 // Told without a look at the children, which may be many and far away.
 bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& target) {
     return plan.bindsChildrenOnce && !target.isFlattened && !target.source.isCopy() &&
+           target.bound.fields.size() == target.source.firstChildCount() &&
            target.bound.fields.size() == target.source.element().childCount();
 }
 
-// A name that is left is kept with all its elements, those that were consumed included.
-bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) const {
-    static const Key key("unboundChildren");
+bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     Unknown unknown(target.bound.fields);
     target.source.forEachChild([&](const XMLNode& child) { unknown.see(child.name()); });
     if (!unknown.names())
         return true;
-    if (!_saveUnknownXML)
+    if (!_marshaller->saveUnknownXML())
         return qx::fail(error, qx::errors::unknownFields, unknown.names(),
                         target.source.element().name());
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
@@ -73,32 +72,61 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) cons
         qx::logDebug("*** Warning: Unbound fields: %@", unknown.names());
     else
         qx::log("Unbound fields: %@", unknown.names());
-
-    auto kept = qx::make<qx::Dictionary>();
-    for (const String& name : unknown.names()->names())
-        kept->set(name, qx::make<qx::Array>());
-    target.source.forEachChild([&](XMLNode& child) {
-        if (!child.isElement())
-            return;
-        if (const Value* elements = kept->find(child.name()))
-            static_cast<qx::Array*>(elements->object())->add(target.source.keep(child));
-    });
-    return ObjectDoor::set(target.object, key, kept, error);
+    return keepChildren(target, *unknown.names(), error);
 }
 
-bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) const {
-    static const Key key("unboundAttributes");
+// A name that is left is kept with all its elements, those that were consumed included.
+bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, ErrorSlot error) {
+    static const Key key("unboundChildren");
+    auto kept = qx::make<qx::Dictionary>();
+    for (const String& name : names.names())
+        kept->set(name, qx::make<qx::Array>());
+    bool fits = true;
+    target.source.forEachChild([&](XMLNode& child) {
+        const Value* elements = fits && child.isElement() ? kept->find(child.name()) : nullptr;
+        if (elements == nullptr)
+            return;
+        const auto node = target.source.keep(child, _budget, error);
+        fits = node.get() != nullptr;
+        if (fits)
+            static_cast<qx::Array*>(elements->object())->add(node);
+    });
+    // A processing instruction leaves a name alone.
+    std::size_t lone = 0;
+    for (const auto& entry : *kept)
+        lone += static_cast<const qx::Array*>(entry.value.object())->isEmpty() ? 1 : 0;
+    return fits && _budget.takeKept(lone, target.source.element(), error) &&
+           ObjectDoor::set(target.object, key, kept, error);
+}
+
+bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     const XMLElement& element = target.source.element();
     Unknown unknown(target.bound.attributes);
-    element.forEachAttribute([&](const String& name, const String&) { unknown.see(name); });
+    std::size_t seen = 0;
+    element.forEachAttribute([&](const String& name, const String&) {
+        unknown.see(name);
+        ++seen;
+    });
+    if (!_budget.takeVisits(seen, element, error))
+        return false;
     if (!unknown.names())
         return true;
-    if (!_saveUnknownXML)
+    if (!_marshaller->saveUnknownXML())
         return qx::fail(error, qx::errors::unknownAttributes, unknown.names(), element.name());
     qx::logWarningOrLine("Unbound attributes: %@", unknown.names());
+    return keepAttributes(target, *unknown.names(), error);
+}
 
+bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error) {
+    static const Key key("unboundAttributes");
     auto kept = qx::make<qx::Array>();
-    for (const String& name : unknown.names()->names())
-        kept->add(target.source.keep(*element.attributeForName(name)));
+    for (XMLNode& attribute : target.source.element().attributes()) {
+        if (!names.contains(attribute.name()))
+            continue;
+        auto node = target.source.keep(attribute, _budget, error);
+        if (!node)
+            return false;
+        kept->add(std::move(node));
+    }
     return ObjectDoor::set(target.object, key, kept, error);
 }

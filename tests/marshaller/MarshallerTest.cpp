@@ -195,19 +195,6 @@ TEST(Marshaller, MakesRecordsInPlaceOfAClassThatNeedsArguments) {
     qx::Class::forget("Point");
 }
 
-TEST(Marshaller, EndsFlatteningThatMultipliesInAnError) {
-    std::string mapping;
-    for (int i = 0; i < 30; ++i) {
-        const std::string next = "type='C" + std::to_string(i + 1) + "' container='false'";
-        mapping += "<class name='C" + std::to_string(i) + "'>" +
-                   field("a", next, "node='element'") + field("b", next, "node='element'") +
-                   "</class>";
-    }
-    const auto marshaller = scenario::marshaller(mapping + "<class name='C30'/>");
-    EXPECT_EQ(scenario::read(*marshaller, "<c0/>"),
-              "-224: Element is bound more often than the limit of 1000: c0 (Invalid Mapping)");
-}
-
 TEST(Marshaller, ReportsTextThatNoDocumentCanHold) {
     const auto marshaller = scenario::marshaller("<class name='Order'>" +
                                                  field("title", "", "node='text'") + "</class>");

@@ -157,3 +157,26 @@ TEST(RoundTrip, LeavesTheDocumentAloneWhereObjectsAreFlattened) {
     EXPECT_EQ(written->rootElement()->XMLString(),
               "<order><street>s</street><note><deep></deep></note></order>");
 }
+
+TEST(RoundTrip, WritesUnknownXMLInsideWhatAFlattenedObjectKeepsOnce) {
+    const auto marshaller = scenario::marshaller(
+        "<class name='Order'><map-to xml='order'/>"
+        "<field name='item'><bind-xml node='element'/></field>"
+        "<field name='before' type='Flat' container='false'><bind-xml node='element'/></field>"
+        "<field name='last' type='Item'><bind-xml name='last' node='element'/></field></class>"
+        "<class name='Flat'/>"
+        "<class name='Item'><map-to xml='item'/><field name='item'><bind-xml node='element'/>"
+        "</field></class>");
+    const std::string document =
+        "<order><last xmlns:n='urn:n' a='1'>t<item b='2'><deep/></item><deeper><x/></deeper></last>"
+        "</order>";
+    const auto object = marshaller->readString(document);
+    EXPECT_EQ(scenario::write(*marshaller, object),
+              R"(<order><last xmlns:n="urn:n">t<item></item></last><last xmlns:n="urn:n" a="1">)"
+              R"(<item b="2"><deep></deep></item><deeper><x></x></deeper></last></order>)");
+    // Not written by another object first, it is still whole.
+    EXPECT_EQ(
+        support::show(marshaller->readString(document)->valueForKey("before")),
+        R"(Flat{unboundChildren: {last: [<last xmlns:n="urn:n" a="1">t<item b="2"><deep></deep>)"
+        R"(</item><deeper><x></x></deeper></last>]}})");
+}

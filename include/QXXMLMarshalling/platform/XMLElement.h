@@ -5,11 +5,19 @@
 
 #include <QXXMLMarshalling/platform/XMLNode.h>
 
+#include <functional>
 #include <memory>
 #include <span>
 #include <vector>
 
 namespace qx {
+
+// How much an element holds, itself included.
+struct XMLExtent {
+    std::size_t elements = 0;
+    std::size_t nodes = 0;    // of all kinds, attributes and namespace declarations too
+    std::size_t textSize = 0; // the bytes of texts, comments, processing instructions, attributes
+};
 
 class QX_API XMLElement final : public XMLNode {
 public:
@@ -77,8 +85,16 @@ public:
     void addNamespace(Ref<XMLNode> declaration);
 
     String stringValue() const override;
+    // Whether the content is one text that nobody has asked for as a node: stringValue() only
+    // hands it out then.
+    bool holdsText() const noexcept { return !_value.isNull(); }
     void setStringValue(const String& value) override;
     Ref<XMLNode> copy() const override;
+    // The same; calls visit(original, copy) for this element and each one inside.
+    using CopyVisitor = std::function<void(XMLElement& original, XMLElement& copy)>;
+    Ref<XMLElement> copy(const CopyVisitor& visit);
+    // Counted anew each time, which needs no nodes of texts and attributes.
+    XMLExtent extent() const noexcept;
 
 private:
     friend class XMLNode;
@@ -99,6 +115,8 @@ private:
         return sizeof(XMLElement) + room * sizeof(HeldAttribute);
     }
     static XMLElement* newElement(const String& name, std::size_t attributes);
+    Ref<XMLElement> copyAlone() const;
+    Ref<XMLElement> copyVisiting(const CopyVisitor* visit) const;
     std::span<HeldAttribute> held() const noexcept {
         auto* first = reinterpret_cast<HeldAttribute*>(const_cast<XMLElement*>(this) + 1);
         return {first, _heldCount};
@@ -118,7 +136,6 @@ private:
 
     // Most elements with text have one text and nothing else. The element then holds it as its
     // value, and makes the node when somebody asks for its children.
-    bool holdsText() const noexcept { return !_value.isNull(); }
     void holdText(String text) noexcept {
         _value = std::move(text);
         _childCount = 1;

@@ -81,8 +81,12 @@ inline constexpr ErrorText unableToSetValue{
     -222, "Unable to set value: %@ for key: %@ in class: %@", invalidValue};
 inline constexpr ErrorText nestedTooDeep{-223, "Objects nest deeper than the limit of %@: %@",
                                          invalidValue};
-inline constexpr ErrorText boundTooOften{
-    -224, "Element is bound more often than the limit of %@: %@", "Invalid Mapping"};
+inline constexpr ErrorText tooManyObjects{
+    -224, "Reading makes more objects than the limit of %@: %@", "Invalid Mapping"};
+inline constexpr ErrorText tooManyKeptNodes{
+    -224, "Reading keeps more nodes than the limit of %@: %@", "Invalid Mapping"};
+inline constexpr ErrorText tooManyVisits{
+    -224, "Reading goes over more nodes than the limit of %@: %@", "Invalid Mapping"};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 
@@ -137,7 +141,9 @@ inline constexpr std::array table{&tooManyDescriptions,
                                   &notAnInteger,
                                   &unableToSetValue,
                                   &nestedTooDeep,
-                                  &boundTooOften,
+                                  &tooManyObjects,
+                                  &tooManyKeptNodes,
+                                  &tooManyVisits,
                                   &areaIsNoDirectory,
                                   &readFailed,
                                   &noRegularFile,

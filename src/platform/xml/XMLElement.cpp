@@ -237,21 +237,59 @@ void XMLElement::setStringValue(const String& value) {
         holdText(std::move(text));
 }
 
+XMLExtent XMLElement::extent() const noexcept {
+    XMLExtent extent;
+    const auto add = [&](const XMLNode& node) {
+        ++extent.nodes;
+        extent.textSize += node._value.size();
+    };
+    for (const XMLNode* node = this; node != nullptr; node = following(node)) {
+        add(*node);
+        const XMLElement* element = node->asElement();
+        if (element == nullptr)
+            continue;
+        ++extent.elements;
+        extent.nodes += element->holdsText() ? 1 : 0;
+        for (const HeldAttribute& attribute : element->held()) {
+            ++extent.nodes;
+            extent.textSize += attribute.value.size();
+        }
+        for (const XMLNode* attribute = element->_firstAttribute; attribute != nullptr;
+             attribute = attribute->_next)
+            add(*attribute);
+        for (const XMLNode* declaration = element->_firstNamespace; declaration != nullptr;
+             declaration = declaration->_next)
+            add(*declaration);
+    }
+    return extent;
+}
+
+Ref<XMLNode> XMLElement::copy() const { return copyVisiting(nullptr); }
+
+Ref<XMLElement> XMLElement::copy(const CopyVisitor& visit) { return copyVisiting(&visit); }
+
+Ref<XMLElement> XMLElement::copyAlone() const {
+    auto element = Ref<XMLElement>::adopt(newElement(_name, _heldCount));
+    element->_line = _line;
+    element->_column = _column;
+    if (holdsText())
+        element->holdText(_value);
+    for (const HeldAttribute& attribute : held())
+        element->holdAttribute(attribute.name, attribute.value);
+    for (const XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
+        XMLSiblings::append(*element, element->_firstAttribute, node->copy().detach());
+    for (const XMLNode* node = _firstNamespace; node != nullptr; node = node->_next)
+        XMLSiblings::append(*element, element->_firstNamespace, node->copy().detach());
+    return element;
+}
+
 // Walks both trees in step, so that depth costs no stack.
-Ref<XMLNode> XMLElement::copy() const {
-    const auto alone = [](const XMLElement& from) {
-        auto element = Ref<XMLElement>::adopt(newElement(from._name, from._heldCount));
-        element->_line = from._line;
-        element->_column = from._column;
-        if (from.holdsText())
-            element->holdText(from._value);
-        for (const HeldAttribute& attribute : from.held())
-            element->holdAttribute(attribute.name, attribute.value);
-        for (const XMLNode* node = from._firstAttribute; node != nullptr; node = node->_next)
-            XMLSiblings::append(*element, element->_firstAttribute, node->copy().detach());
-        for (const XMLNode* node = from._firstNamespace; node != nullptr; node = node->_next)
-            XMLSiblings::append(*element, element->_firstNamespace, node->copy().detach());
-        return element;
+Ref<XMLElement> XMLElement::copyVisiting(const CopyVisitor* visit) const {
+    const auto alone = [&](const XMLElement& from) {
+        Ref<XMLElement> made = from.copyAlone();
+        if (visit != nullptr)
+            (*visit)(const_cast<XMLElement&>(from), *made);
+        return made;
     };
     Ref<XMLElement> top = alone(*this);
     XMLElement* target = top.get();
