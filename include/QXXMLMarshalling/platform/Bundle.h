@@ -43,12 +43,12 @@ public:
     Value objectForInfoDictionaryKey(const String& key) const;
     // The path of a file or folder in the bundle, which may lie in a folder of it ("maps/a.xml");
     // null when there is none or the name leads out of the bundle. A type is added behind a dot.
-    String pathForResource(std::string_view name, const String& type = nullptr) const;
+    String pathForResource(const String& name, const String& type = nullptr) const;
 
     // The translation of an English text, from <language>.lproj/Localizable.strings; the English
     // text itself where there is none. The language is that of the first of LC_ALL, LC_MESSAGES and
     // LANG that is set; its texts are read once.
-    String localizedString(std::string_view englishText) const;
+    String localizedString(const String& englishText) const;
 
     // The class name, the address and the path.
     String description() const override;

@@ -145,8 +145,9 @@ Ref<Bundle> Bundle::mainBundle() {
 
 void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
     OpenBundles& open = OpenBundles::shared();
+    Ref<Bundle> former = bundle; // ends after the lock, as do objects that the host gave it
     const std::lock_guard lock(open.mutex);
-    open.main = bundle;
+    std::swap(open.main, former);
 }
 
 Ref<Bundle> Bundle::frameworkBundle() {
@@ -199,8 +200,8 @@ Value Bundle::objectForInfoDictionaryKey(const String& key) const {
 
 String Bundle::bundleIdentifier() const { return _info->get("CFBundleIdentifier").string(); }
 
-String Bundle::pathForResource(std::string_view name, const String& type) const {
-    const String file = type.isEmpty() ? String(name) : String::concat({name, ".", type});
+String Bundle::pathForResource(const String& name, const String& type) const {
+    const String file = type.isEmpty() ? name : String::concat({name, ".", type});
     const String relative = relativePath(file);
     if (relative.isNull())
         return nullptr;

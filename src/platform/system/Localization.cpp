@@ -103,13 +103,13 @@ thread_local bool Opening::isActive = false;
 
 } // namespace
 
-String Bundle::localizedString(std::string_view englishText) const {
+String Bundle::localizedString(const String& englishText) const {
     const std::string_view language = languageOf(localeName());
-    if (language.empty() || englishText.empty())
+    if (language.empty() || englishText.isEmpty())
         return englishText;
     const Strings& texts = Languages::shared().textsFor(*this, language);
-    const auto found = texts.find(englishText);
-    return found != texts.end() ? found->second : String(englishText);
+    const auto found = texts.find(englishText.view());
+    return found != texts.end() ? found->second : englishText;
 }
 
 String localizedText(std::string_view englishText) {

@@ -1,10 +1,15 @@
 #include <QXXMLMarshalling/platform/UserDefaults.h>
 
+#include <QXXMLMarshalling/platform/Array.h>
+
 #include "platform/system/Directories.h"
 
 #include "support/FileSandbox.h"
 
 #include <gtest/gtest.h>
+
+#include <atomic>
+#include <thread>
 
 using namespace qx;
 
@@ -58,7 +63,9 @@ TEST_F(UserDefaultsTest, ArgumentsArePairsOfAKeyAndAValue) {
              {{"--Key", "v", "-Other", "w"}, nullptr, "w"},
              {{"-Other", "w", "--", "-Key", "v"}, nullptr, "w"},
              {{"-", "Key", "-Key", ""}, "", nullptr},
-             {{"-Key", "v", "-Key", "last"}, "last", nullptr}};
+             {{"-Key", "v", "-Key", "last"}, "last", nullptr},
+             {{"-Key", nullptr, "-Other", "w"}, nullptr, nullptr}, // the end, as in argv
+             {{nullptr, "-Key", "v"}, nullptr, nullptr}};
     for (const auto& row : rows) {
         defaults->registerDefault("registered", "Key");
         defaults->setArguments(row.arguments);
@@ -86,6 +93,35 @@ TEST_F(UserDefaultsTest, BooleansAndNumbersAreReadFromListsAndTexts) {
         EXPECT_EQ(defaults->boolForKey("Key"), row.boolean) << row.value;
         EXPECT_EQ(defaults->integerForKey("Key"), row.integer) << row.value;
     }
+}
+
+TEST_F(UserDefaultsTest, AValueThatEndsMayAskForDefaults) {
+    struct Asking : Object {
+        ~Asking() override { UserDefaults::standardUserDefaults()->objectForKey("Key"); }
+    };
+    sandbox.write("config/Client.plist", listWith("<array/>"));
+    for (int i = 0; i < 2; ++i) {
+        defaults->registerDefault(make<Asking>(), "Asking");
+        defaults->setObject(make<Asking>(), "Asking");
+    }
+    defaults->removeObjectForKey("Asking");
+    defaults->registerDefault(0, "Asking");
+    defaults->objectForKey("Key").as<Array>()->add(make<Asking>());
+    defaults->synchronize();
+    EXPECT_EQ(defaults->objectForKey("Key").as<Array>()->count(), 0U);
+}
+
+TEST_F(UserDefaultsTest, WhatOneThreadReadsStaysWhileAnotherForgetsTheFile) {
+    sandbox.write("config/Client.plist", listWith("<string>of the file</string>"));
+    std::atomic<bool> isDone = false;
+    std::thread other([this, &isDone] {
+        while (!isDone)
+            defaults->synchronize();
+    });
+    for (int i = 0; i < 2000; ++i)
+        EXPECT_EQ(defaults->stringForKey("Key"), "of the file");
+    isDone = true;
+    other.join();
 }
 
 TEST_F(UserDefaultsTest, ABrokenFileIsWarnedAboutOnceAndHoldsNothing) {
