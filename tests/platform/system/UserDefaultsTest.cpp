@@ -8,7 +8,10 @@
 
 #include <gtest/gtest.h>
 
+#include <sys/stat.h>
+
 #include <atomic>
+#include <functional>
 #include <thread>
 
 using namespace qx;
@@ -118,22 +121,43 @@ TEST_F(UserDefaultsTest, WhatOneThreadReadsStaysWhileAnotherForgetsTheFile) {
         while (!isDone)
             defaults->synchronize();
     });
-    for (int i = 0; i < 2000; ++i)
+    for (int i = 0; i < 20000; ++i)
         EXPECT_EQ(defaults->stringForKey("Key"), "of the file");
     isDone = true;
     other.join();
 }
 
-TEST_F(UserDefaultsTest, ABrokenFileIsWarnedAboutOnceAndHoldsNothing) {
-    for (const char* text :
-         {"<plist><dict>", "", "<plist><string>x</string></plist>", "<plist/>"}) {
-        const std::string path = sandbox.write("config/Client.plist", text);
+TEST_F(UserDefaultsTest, AnUnusableFileIsWarnedAboutOnceAndHoldsNothing) {
+    const std::string path = sandbox.write("config/Client.plist", "");
+    const auto text = [&](const char* bytes) {
+        return [this, bytes] { sandbox.write("config/Client.plist", bytes); };
+    };
+    const auto link = [&](const char* target) {
+        return [&path, target] {
+            std::filesystem::remove(path);
+            std::filesystem::create_symlink(target, path);
+        };
+    };
+    const std::function<void()> layouts[]{
+        text("<plist><dict>"),
+        text(""),
+        text("<plist><string>x</string></plist>"),
+        text("<plist/>"),
+        [&] { std::filesystem::resize_file(path, std::uintmax_t{1} << 40U); },
+        link("/dev/zero"),
+        link("/"),
+        [&] {
+            std::filesystem::remove(path);
+            ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
+        }};
+    for (const auto& lay : layouts) {
+        lay();
         defaults->synchronize();
         ::testing::internal::CaptureStderr();
         EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
         EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
         const std::string warning = ::testing::internal::GetCapturedStderr();
-        EXPECT_NE(warning.find(path), std::string::npos) << text;
+        EXPECT_NE(warning.find(path), std::string::npos) << warning;
         EXPECT_EQ(std::count(warning.begin(), warning.end(), '\n'), 1) << warning;
     }
 }
