@@ -17,11 +17,13 @@ namespace qx {
 
 class QX_API Bundle final : public Object {
 public:
+    // Never null: where the program's folder is gone or cannot be told, it holds nothing.
     static Ref<Bundle> mainBundle();
     // Null goes back to the program's own.
     static void setMainBundle(const Ref<Bundle>& bundle);
     static Ref<Bundle> frameworkBundle();
     // The bundle of the program or shared object that holds the class: bundleForClass(typeid(*x)).
+    // A class without a virtual function outside of its header lies in each that uses it.
     static Ref<Bundle> bundleForClass(const std::type_info& type);
     // Null when there is no folder at the path.
     static Ref<Bundle> bundleWithPath(const String& path);
