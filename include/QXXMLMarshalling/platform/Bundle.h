@@ -49,7 +49,8 @@ public:
 
     // The translation of an English text, from <language>.lproj/Localizable.strings; the English
     // text itself where there is none. The language is that of the first of LC_ALL, LC_MESSAGES and
-    // LANG that is set; its texts are read once.
+    // LANG that is set; what "de_AT" lacks comes from "de". Texts are read once, from UTF-8 or
+    // UTF-16; entries that cannot be read are warned about and passed over.
     String localizedString(const String& englishText) const;
 
     // The class name, the address and the path.
