@@ -23,12 +23,13 @@ extern QX_API const char* const QXXMLDataRepositoryPersistentName;
 
 class QX_API QXXMLDataRepositoryManager : public qx::Object {
 public:
-    // The shared manager, made when it is first asked for.
+    // The shared manager, made when it is first asked for; raises what init raises.
     static qx::Ref<QXXMLDataRepositoryManager> defaultManager();
     // Drops it: the next call of defaultManager makes a fresh one.
     static void flushDefaultManager();
 
-    // Raises what QXXMLFileSystemDataRepository::init raises.
+    // Raises what QXXMLFileSystemDataRepository::init raises: NSInternalInconsistencyException for a
+    // user without any home.
     static qx::Ref<QXXMLDataRepositoryManager> init();
     QXXMLDataRepositoryManager();
     ~QXXMLDataRepositoryManager() override;
@@ -36,7 +37,8 @@ public:
     // Null when there is none of that name.
     qx::Ref<QXXMLDataRepository> repositoryForName(const qx::String& name) const;
     // Stores the repository under the name. One that had the name is replaced and keeps its place
-    // in the order; a new name comes last. Null raises NSInvalidArgumentException.
+    // in the order; a new name comes last, unless the order has it already. Null raises
+    // NSInvalidArgumentException.
     void setRepository(const qx::Ref<QXXMLDataRepository>& repository, const qx::String& name);
     void addRepository(const qx::Ref<QXXMLDataRepository>& repository, const qx::String& name);
 

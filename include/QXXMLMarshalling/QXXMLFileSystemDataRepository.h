@@ -51,17 +51,20 @@ public:
     // Sets both lists to what is drawn above.
     virtual void initializeSearchPaths();
     // Appends the versioned directory and the plain one below `directory`, which gets the process
-    // name appended unless it ends with it already.
+    // name appended unless it ends with it already. A version that leads out of the plain one, as
+    // ".." does, has no directory.
     virtual void addPathToSearchPaths(const qx::String& directory, const qx::String& processName);
     // The client application's bundle. An unknown identifier is warned about, and the main bundle
     // taken.
     virtual qx::Ref<qx::Bundle> applicationBundle();
     // CFBundleShortVersionString and CFBundleVersion of that bundle, cleaned and joined by a dot;
     // one alone where the other is empty. Cleaned are leading digits and dots, "(" becoming a dot:
-    // "1.0(23)" is "1.0.23", "3.0b2" is "3.0", "v1.0" is empty.
+    // "1.0(23)" is "1.0.23", "3.0b2" is "3.0", "v1.0" is empty. One that names no directory of its
+    // own ("..") is passed over when reading, and 514 when a versioned file is written.
     virtual qx::String applicationVersion();
 
-    // Whatever has the name counts as a hit; reading a directory, a pipe or a device is an error.
+    // Whatever has the name counts as a hit; reading a directory, a pipe or a device is an error
+    // (256), and so is reading more than 2 GB.
     qx::String pathForResourceNamed(const qx::String& name) override;
     virtual qx::String pathForResourceInBundlesNamed(const qx::String& name);
 
@@ -80,10 +83,13 @@ public:
     // or the file system's error.
     virtual qx::Ref<qx::Error> createUserOverrideArea(const qx::String& directory);
     // Writes into the directory, which is made first, in one step: the file is whole or not there.
+    // One that is replaced leaves its permissions, group and access list to the new one; a symbolic
+    // link of that name stays, and what it leads to is replaced.
     // The path written; null with an error, an older file then being untouched:
     //   514   "The file name is invalid."            see above
-    //   512   "The file cannot be written: %@"       also for null data, and for a null or empty
-    //                                                directory; the reason says why
+    //   512   "The file cannot be written: %@"       also for null data, for a null or empty
+    //                                                directory, and where a pipe or a device has
+    //                                                the name; the reason says why
     //   513, 640, 642                                no permission, disk full, disk read-only
     //   -2000 or what else createUserOverrideArea answers
     // For 514, null data, and names that are too long not even a directory is made.

@@ -26,7 +26,8 @@ public:
     // Never fails; a null mapping counts as one that holds no class.
     static qx::Ref<QXXMLMarshaller> initWithMapping(qx::Ref<QXXMLMarshallingMapping> mapping,
                                                     qx::Ref<qx::Error>* error = nullptr);
-    // Null with the error of QXXMLMarshallingMapping::initWithDocument.
+    // Null with the error of QXXMLMarshallingMapping::initWithDocument, which raises where the user
+    // has no home at all, whether or not the mapping includes others.
     static qx::Ref<QXXMLMarshaller> initWithMappingXML(qx::XMLDocument* document,
                                                        qx::Ref<qx::Error>* error = nullptr);
     // Null with the error of reading the document (XMLDocument.h), or as above.

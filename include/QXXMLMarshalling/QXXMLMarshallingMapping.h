@@ -26,7 +26,9 @@ public:
     // What a repository raises when it is asked for a document passes through where this document
     // includes it, and becomes -218 where an included one does. Null, too, without reading anything
     // further when the slot holds an error already. A null document, like one without a root, holds
-    // no class.
+    // no class. The shared repository manager is made even without an include: for a user without
+    // any home (no XDG_DATA_HOME, no HOME, none in the account) that raises
+    // NSInternalInconsistencyException, "No application support directories found".
     static qx::Ref<QXXMLMarshallingMapping> initWithDocument(qx::XMLDocument* document,
                                                              qx::Ref<qx::Error>* error = nullptr);
     ~QXXMLMarshallingMapping() override;

@@ -87,7 +87,8 @@ Ref<QXXMLDataRepository> QXXMLDataRepositoryManager::repositoryForName(const Str
 
 void QXXMLDataRepositoryManager::setRepository(const Ref<QXXMLDataRepository>& repository,
                                                const String& name) {
-    const bool isNew = !_repositories->contains(name);
+    // The host may have placed the name before its repository.
+    const bool isNew = !_repositories->contains(name) && !_repositoryNames->contains(name);
     _repositories->set(name, repository);
     if (isNew)
         _repositoryNames->add(name);

@@ -24,6 +24,15 @@ String directoryForProcess(const String& directory, const String& processName) {
     return base.view().ends_with(processName) ? base : appendingPathComponent(base, processName);
 }
 
+// The directory of a version below the program's: that one itself without a version, null for a
+// version that leads out of it ("..") or is none (".").
+String directoryForVersion(const String& base, const String& version) {
+    if (version.isEmpty())
+        return base;
+    const String relative = relativePath(version);
+    return relative.isNull() ? String() : appendingPathComponent(base, relative);
+}
+
 // What may stand in a directory's name: digits and dots from the start, "(" as one more dot.
 std::string cleanedVersion(const Value& version) {
     const String text = version.isNumber() ? version.description() : version.string();
@@ -85,9 +94,10 @@ void QXXMLFileSystemDataRepository::initializeSearchPaths() {
 
 void QXXMLFileSystemDataRepository::addPathToSearchPaths(const String& directory,
                                                          const String& processName) {
-    const String version = applicationVersion();
     const String base = directoryForProcess(directory, processName);
-    _searchPaths->add(appendingPathComponent(base, version));
+    const String versioned = directoryForVersion(base, applicationVersion());
+    if (!versioned.isNull())
+        _searchPaths->add(versioned);
     _searchPaths->add(base);
 }
 
@@ -215,8 +225,11 @@ String QXXMLFileSystemDataRepository::writeFileToVersionedUserOverrideArea(const
                                                                            const String& name,
                                                                            Ref<Error>* error) {
     const String area = userOverrideArea();
-    const String versioned =
-        area.isNull() ? area : appendingPathComponent(area, applicationVersion());
+    if (area.isNull())
+        return writeFile(data, area, name, error);
+    const String versioned = directoryForVersion(area, applicationVersion());
+    if (versioned.isNull())
+        return fail(error, errors::invalidFileName);
     return writeFile(data, versioned, name, error);
 }
 

@@ -106,6 +106,11 @@ TEST_F(RepositoryManagerTest, ARepositoryUnderAKnownNameKeepsItsPlace) {
     EXPECT_THROW(manager->setRepository(nullptr, "three"), Exception);
     EXPECT_THROW(manager->setRepository(replacement, nullptr), Exception);
     EXPECT_EQ(namesOf(*manager), "QXXMLDataRepositoryPersistentName one two ");
+    manager->setRepositoryNames(make<Array>(std::initializer_list<Value>{
+        QXXMLDataRepositoryVolatileName, QXXMLDataRepositoryPersistentName}));
+    manager->setVolatileRepository(replacement); // whose name has its place already
+    EXPECT_EQ(namesOf(*manager),
+              "QXXMLDataRepositoryVolatileName QXXMLDataRepositoryPersistentName ");
 }
 
 TEST_F(RepositoryManagerTest, ChangingTheOrderDuringALookUpRaises) {

@@ -189,6 +189,23 @@ TEST_F(FileSystemRepositoryTest, ANameThatLeavesItsDirectoryFindsNothingAndIsNot
     EXPECT_EQ(sandbox.list("data/Client"), "");
 }
 
+TEST_F(FileSystemRepositoryTest, AVersionThatLeavesTheProgramsDirectoryHasNone) {
+    sandbox.write("data/a.xml", "<out/>");
+    for (const char* version : {"((", "..", "."}) {
+        ProcessInfo::setProcessVersion(version, "");
+        const auto repository = QXXMLFileSystemDataRepository::init();
+        EXPECT_EQ(pathsOf(*repository), "/data/Client ") << version;
+        EXPECT_FALSE(repository->containsData("a.xml"));
+        error.reset();
+        EXPECT_TRUE(
+            repository->writeFileToVersionedUserOverrideArea(data("x"), "a.xml", &error).isNull());
+        ASSERT_TRUE(error) << version;
+        EXPECT_EQ(error->code(), 514);
+    }
+    EXPECT_EQ(sandbox.list("data"), "a.xml ");
+    EXPECT_EQ(sandbox.read("data/a.xml"), "<out/>");
+}
+
 TEST_F(FileSystemRepositoryTest, WhatIsWrittenShadowsWhatShips) {
     sandbox.write("app/a.xml", "ships");
     const auto repository = QXXMLFileSystemDataRepository::init();

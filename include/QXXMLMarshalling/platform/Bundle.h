@@ -17,11 +17,13 @@ namespace qx {
 
 class QX_API Bundle final : public Object {
 public:
+    // Never null: where the program's folder is gone or cannot be told, it holds nothing.
     static Ref<Bundle> mainBundle();
     // Null goes back to the program's own.
     static void setMainBundle(const Ref<Bundle>& bundle);
     static Ref<Bundle> frameworkBundle();
     // The bundle of the program or shared object that holds the class: bundleForClass(typeid(*x)).
+    // A class without a virtual function outside of its header lies in each that uses it.
     static Ref<Bundle> bundleForClass(const std::type_info& type);
     // Null when there is no folder at the path.
     static Ref<Bundle> bundleWithPath(const String& path);
@@ -43,12 +45,13 @@ public:
     Value objectForInfoDictionaryKey(const String& key) const;
     // The path of a file or folder in the bundle, which may lie in a folder of it ("maps/a.xml");
     // null when there is none or the name leads out of the bundle. A type is added behind a dot.
-    String pathForResource(std::string_view name, const String& type = nullptr) const;
+    String pathForResource(const String& name, const String& type = nullptr) const;
 
     // The translation of an English text, from <language>.lproj/Localizable.strings; the English
     // text itself where there is none. The language is that of the first of LC_ALL, LC_MESSAGES and
-    // LANG that is set; its texts are read once.
-    String localizedString(std::string_view englishText) const;
+    // LANG that is set; what "de_AT" lacks comes from "de". Texts are read once, from UTF-8 or
+    // UTF-16; entries that cannot be read are warned about and passed over.
+    String localizedString(const String& englishText) const;
 
     // The class name, the address and the path.
     String description() const override;

@@ -1,7 +1,6 @@
 #pragma once
 
-// Immutable bytes. They stand in memory of the object's own, or in a file mapped for reading, which
-// is unmapped when the object goes away.
+// Immutable bytes, in memory of the object's own.
 
 #include <QXXMLMarshalling/platform/Object.h>
 
@@ -14,15 +13,12 @@ public:
     Data() = default;
     explicit Data(std::string bytes) noexcept;
     explicit Data(std::string_view bytes) : Data(std::string(bytes)) {}
-    // Bytes that another owner holds; `giveBack` is called once with them at the end.
-    Data(const char* bytes, std::size_t size, void (*giveBack)(const char*, std::size_t)) noexcept;
     ~Data() override;
 
-    const char* bytes() const noexcept { return _bytes; }
-    std::size_t size() const noexcept { return _size; }
-    std::string_view view() const noexcept { return {_bytes, _size}; }
-    // Whether a zero byte follows them, which is so for bytes of the object's own.
-    bool isTerminated() const noexcept { return _bytes == _own.data(); }
+    // A zero byte follows them.
+    const char* bytes() const noexcept { return _bytes.c_str(); }
+    std::size_t size() const noexcept { return _bytes.size(); }
+    std::string_view view() const noexcept { return _bytes; }
 
     // "<Data: N bytes>".
     String description() const override;
@@ -33,10 +29,7 @@ protected:
     const Class& describedClass() const override;
 
 private:
-    std::string _own;
-    const char* _bytes = _own.data();
-    std::size_t _size = 0;
-    void (*_giveBack)(const char*, std::size_t) = nullptr;
+    std::string _bytes;
 };
 
 } // namespace qx

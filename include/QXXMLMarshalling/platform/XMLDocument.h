@@ -49,7 +49,7 @@ public:
     noexcept : _view(text) {}
     XMLBytes(const std::string& text) noexcept : _view(text), _isTerminated(true) {}
     XMLBytes(const String& text) noexcept : _view(text), _isTerminated(true) {}
-    XMLBytes(const Data& data) noexcept : _view(data.view()), _isTerminated(data.isTerminated()) {}
+    XMLBytes(const Data& data) noexcept : _view(data.view()), _isTerminated(true) {}
     // A null pointer gives no bytes.
     XMLBytes(const char* text) noexcept : _view(text != nullptr ? text : ""), _isTerminated(true) {}
 

@@ -4,19 +4,12 @@
 
 namespace qx {
 
-Data::Data(std::string bytes) noexcept
-    : _own(std::move(bytes)), _bytes(_own.data()), _size(_own.size()) {}
+Data::Data(std::string bytes) noexcept : _bytes(std::move(bytes)) {}
 
-Data::Data(const char* bytes, std::size_t size, void (*giveBack)(const char*, std::size_t)) noexcept
-    : _bytes(bytes), _size(size), _giveBack(giveBack) {}
-
-Data::~Data() {
-    if (_giveBack != nullptr)
-        _giveBack(_bytes, _size);
-}
+Data::~Data() = default;
 
 String Data::description() const {
-    return String::concat({"<Data: ", std::to_string(_size), " bytes>"});
+    return String::concat({"<Data: ", std::to_string(size()), " bytes>"});
 }
 
 bool Data::isEqual(const Object& other) const {

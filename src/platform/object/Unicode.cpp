@@ -5,6 +5,8 @@
 #include <unicode/brkiter.h>
 #include <unicode/locid.h>
 #include <unicode/unistr.h>
+#include <unicode/utf16.h>
+#include <unicode/utf8.h>
 
 namespace qx::unicode {
 
@@ -72,6 +74,30 @@ bool equalIgnoringCase(std::string_view a, std::string_view b) {
                           [](char x, char y) { return asciiLower(x) == asciiLower(y); });
     }
     return decoded(a).caseCompare(decoded(b), U_FOLD_CASE_DEFAULT) == 0;
+}
+
+bool isWellFormed(std::string_view text) {
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
+    for (std::size_t i = 0; i < text.size();) {
+        UChar32 point = 0;
+        U8_NEXT(bytes, i, text.size(), point);
+        if (point < 0)
+            return false;
+    }
+    return true;
+}
+
+std::string fromUTF16(std::u16string_view units) {
+    std::string text;
+    for (std::size_t i = 0; i < units.size();) {
+        UChar32 point = 0;
+        U16_NEXT_OR_FFFD(units, i, units.size(), point);
+        std::uint8_t bytes[U8_MAX_LENGTH];
+        std::size_t size = 0;
+        U8_APPEND_UNSAFE(bytes, size, point);
+        text.append(bytes, bytes + size);
+    }
+    return text;
 }
 
 } // namespace qx::unicode

@@ -3,11 +3,11 @@
 #include <QXXMLMarshalling/platform/ProcessInfo.h>
 
 #include "platform/object/LibraryClass.h"
+#include "platform/system/FileAccess.h"
 #include "platform/system/Files.h"
+#include "platform/system/LoadedFile.h"
 #include "platform/system/PropertyList.h"
 
-#include <cstdlib>
-#include <dlfcn.h>
 #include <mutex>
 #include <vector>
 
@@ -27,41 +27,20 @@ struct OpenBundles {
     Ref<Bundle> main;                 // set by the host
 };
 
-String folderOf(std::string_view path) {
-    const std::size_t slash = path.rfind('/');
-    if (slash == std::string_view::npos)
-        return ".";
-    return path.substr(0, slash == 0 ? 1 : slash);
-}
-
-// Absolute, without "." and ".." and symbolic links; null when nothing is there.
-String realPath(const String& path) {
-    char* const resolved = ::realpath(path.c_str(), nullptr);
-    String result = resolved;
-    std::free(resolved);
-    return result;
-}
-
 // The resources of a program or library that lies in `folder`: <folder>/../share/<name>. Null when
 // there is no such folder.
 String sharedFolder(const String& folder, std::string_view name) {
-    const String share = appendingPathComponent(folderOf(folder), "share");
+    if (folder.isNull())
+        return nullptr;
+    const String share = appendingPathComponent(directoryOf(folder), "share");
     const String path = appendingPathComponent(share, name);
     return isDirectory(path) ? path : String();
 }
 
+// Null where nobody knows.
 String folderOfProgram() {
     const String program = ProcessInfo::executablePath();
-    return program.isNull() ? String(".") : folderOf(program);
-}
-
-// The file that holds the address: null for the program itself, and where nobody knows.
-String sharedObjectHolding(const void* address) {
-    Dl_info found{};
-    if (::dladdr(address, &found) == 0 || found.dli_fname == nullptr)
-        return nullptr;
-    const String file = realPath(found.dli_fname);
-    return file == ProcessInfo::executablePath() ? String() : file;
+    return program.isNull() ? String() : String(directoryOf(program));
 }
 
 // "name" of …/libname.so.1.2
@@ -77,7 +56,7 @@ constexpr std::string_view frameworkName = "QXXMLMarshalling";
 String frameworkPath() {
     static const char anchor = 0; // lies where this library lies
     const String file = sharedObjectHolding(&anchor);
-    String folder = file.isNull() ? folderOfProgram() : folderOf(file);
+    String folder = file.isNull() ? folderOfProgram() : String(directoryOf(file));
     String installed = sharedFolder(folder, frameworkName);
     if (!installed.isNull())
         return installed;
@@ -138,15 +117,22 @@ Ref<Bundle> Bundle::mainBundle() {
         const String shared = sharedFolder(folder, ProcessInfo::processName());
         bundle = bundleWithPath(shared.isNull() ? folder : shared);
     }
-    if (!bundle)
-        bundle = bundleWithPath("/"); // the program's folder was removed while it runs
-    return bundle;
+    if (bundle)
+        return bundle;
+    // The program's folder was removed while it runs, or cannot be told. Nothing lies below this.
+    static Bundle* const nowhere = [] {
+        String path = "/dev/null";
+        const auto info = make<Dictionary>();
+        return make<Bundle>(path, info).detach();
+    }();
+    return Ref<Bundle>(nowhere);
 }
 
 void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
     OpenBundles& open = OpenBundles::shared();
+    Ref<Bundle> former = bundle; // ends after the lock, as do objects that the host gave it
     const std::lock_guard lock(open.mutex);
-    open.main = bundle;
+    std::swap(open.main, former);
 }
 
 Ref<Bundle> Bundle::frameworkBundle() {
@@ -156,13 +142,15 @@ Ref<Bundle> Bundle::frameworkBundle() {
 }
 
 Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
-    const String file = sharedObjectHolding(&type);
+    // Where the type itself lies says nothing: the linker copies it into a program that casts to
+    // it. Its name is not copied.
+    const String file = sharedObjectHolding(type.name());
     if (file.isNull())
         return mainBundle();
     const std::string_view name = libraryName(file);
     if (name == frameworkName)
         return frameworkBundle();
-    const String folder = folderOf(file);
+    const String folder = directoryOf(file);
     const String shared = sharedFolder(folder, name);
     Ref<Bundle> bundle = bundleWithPath(shared.isNull() ? folder : shared);
     return bundle ? bundle : mainBundle();
@@ -199,8 +187,8 @@ Value Bundle::objectForInfoDictionaryKey(const String& key) const {
 
 String Bundle::bundleIdentifier() const { return _info->get("CFBundleIdentifier").string(); }
 
-String Bundle::pathForResource(std::string_view name, const String& type) const {
-    const String file = type.isEmpty() ? String(name) : String::concat({name, ".", type});
+String Bundle::pathForResource(const String& name, const String& type) const {
+    const String file = type.isEmpty() ? name : String::concat({name, ".", type});
     const String relative = relativePath(file);
     if (relative.isNull())
         return nullptr;

@@ -99,9 +99,12 @@ inline constexpr ErrorText streamNotWritten{512, "Cannot write the document to i
                                             "The stream failed"};
 inline constexpr ErrorText noRegularFile{256, readFailed.message,
                                          "It is a pipe, a socket or a device."};
+inline constexpr ErrorText fileTooLarge{256, readFailed.message,
+                                        "It is larger than the limit for such files."};
 inline constexpr ErrorText readNotPermitted{257, "Permission to read is missing: %@", ""};
 inline constexpr ErrorText fileNotFound{260, "There is no such file: %@", ""};
 inline constexpr ErrorText writeFailed{512, "The file cannot be written: %@", ""};
+inline constexpr ErrorText noRegularTarget{512, writeFailed.message, noRegularFile.reason};
 inline constexpr ErrorText writeNotPermitted{513, "Permission to write is missing: %@", ""};
 inline constexpr ErrorText invalidFileName{
     514, "The file name is invalid.",
@@ -147,12 +150,14 @@ inline constexpr std::array table{&tooManyDescriptions,
                                   &areaIsNoDirectory,
                                   &readFailed,
                                   &noRegularFile,
+                                  &fileTooLarge,
                                   &noLocalURL,
                                   &streamNotRead,
                                   &streamNotWritten,
                                   &readNotPermitted,
                                   &fileNotFound,
                                   &writeFailed,
+                                  &noRegularTarget,
                                   &writeNotPermitted,
                                   &invalidFileName,
                                   &textCannotBeWritten,

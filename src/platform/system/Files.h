@@ -12,17 +12,31 @@
 
 namespace qx {
 
-// The file's bytes; null with an error. A large file is mapped where nobody without privileges can
-// cut it short meanwhile (reading behind its end would end the process); any other is copied.
-// Pipes and devices are read to their end, if they have one; with `regular` they are refused (256).
+// What a document may hold at most, and what a property list or a file of texts may.
+inline constexpr std::size_t largestFile = 0x7FFF'FFFF;
+inline constexpr std::size_t largestResource = 16 * 1024 * 1024;
+
+// The file's bytes, copied: a mapped file that is cut short would end the process. Null with an
+// error, 256 for more than `maximumSize` bytes. Pipes and devices are read to their end, if they
+// have one; with `regular` they are refused (256).
 enum class ReadableFiles : std::uint8_t { all, regular };
 Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr,
-                   ReadableFiles readable = ReadableFiles::all);
+                   ReadableFiles readable = ReadableFiles::all,
+                   std::size_t maximumSize = largestFile);
 
 // Writes a temporary file beside the target, flushes it to disk and renames it over the target: at
-// every moment, a power failure included, the path names the old bytes or the new ones, whole. The
-// permissions of a file that is replaced are kept; a symbolic link is replaced, not followed. False
-// with an error; the old file is then untouched and the temporary one gone.
+// every moment, a power failure included, the path names the old bytes or the new ones, whole.
+// False with an error; the old file is then untouched and the temporary one gone. Of a file that is
+// replaced
+// - the permissions, group, owner and access list are kept as far as the system lets this process.
+//   Where the group cannot be, its rights go to no other, and where the permissions cannot be told,
+//   the new file is the owner's alone. The folder has to be writable, the file has not;
+// - other hard links keep the old bytes;
+// - symbolic links that the path ends in stay: what they lead to is replaced, or made. One that the
+//   system refuses to follow is an error;
+// - pipes, sockets and devices are refused (512), directories too.
+// A temporary file is called ".~qx-save-N.tmp". What a writer left that was killed is removed by
+// the next that saves into the same folder.
 bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>* error = nullptr);
 
 // False with an error for a path that is too long to be written, or has a component that is: to be

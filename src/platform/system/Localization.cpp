@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/platform/Bundle.h>
 
 #include "platform/system/Files.h"
+#include "platform/system/Log.h"
 #include "platform/system/StringsFile.h"
 
 #include <cstdlib>
@@ -34,18 +35,45 @@ std::string_view languageOf(std::string_view locale) {
     return locale;
 }
 
-// The texts for a language and region, else for the language.
-Strings readStrings(const Bundle& bundle, std::string_view language) {
-    for (const auto name : {language, language.substr(0, language.find('_'))}) {
-        const String folder = String::concat({name, ".lproj"});
-        const String path =
-            bundle.pathForResource(appendingPathComponent(folder, "Localizable.strings"));
-        if (path.isNull())
-            continue;
-        if (const Ref<Data> data = readFile(path))
-            return parseStrings(data->view());
+// The texts of one language, and what is wrong with their files.
+struct Language {
+    String bundlePath;
+    std::string name;
+    StringsFile::Texts texts;
+    std::vector<String> problems;
+};
+
+// Adds the texts of a file, in place of those that are there.
+void readStrings(const Bundle& bundle, std::string_view name, Language& language) {
+    const String folder = String::concat({name, ".lproj"});
+    const String path =
+        bundle.pathForResource(appendingPathComponent(folder, "Localizable.strings"));
+    if (path.isNull())
+        return;
+    Ref<Error> error;
+    const Ref<Data> data = readFile(path, &error, ReadableFiles::regular, largestResource);
+    if (!data) {
+        language.problems.push_back(error->description());
+        return;
     }
-    return {};
+    StringsFile file = parseStrings(data->view());
+    file.texts.merge(language.texts);
+    std::swap(file.texts, language.texts);
+    for (const std::size_t line : file.faultyLines)
+        language.problems.push_back(String::concat(
+            {"Unable to read the text in line ", std::to_string(line), " of ", path}));
+}
+
+// What the language and region lack comes from the language.
+std::unique_ptr<Language> readLanguage(const Bundle& bundle, std::string_view name) {
+    auto language = std::make_unique<Language>();
+    language->bundlePath = bundle.bundlePath();
+    language->name = name;
+    const std::string_view general = name.substr(0, name.find('_'));
+    readStrings(bundle, general, *language);
+    if (general != name)
+        readStrings(bundle, name, *language);
+    return language;
 }
 
 // The texts of each bundle and language that were asked for; they stay for ever.
@@ -56,32 +84,32 @@ public:
         return *languages;
     }
 
-    const Strings& textsFor(const Bundle& bundle, std::string_view language) {
+    const StringsFile::Texts& textsFor(const Bundle& bundle, std::string_view name) {
         {
             const std::lock_guard lock(_mutex);
-            if (const Strings* known = find(bundle, language))
-                return *known;
+            if (const Language* known = find(bundle, name))
+                return known->texts;
         }
-        auto read = std::make_unique<Language>(
-            Language{bundle.bundlePath(), std::string(language), readStrings(bundle, language)});
-        const std::lock_guard lock(_mutex);
-        if (const Strings* known = find(bundle, language))
-            return *known;
-        _languages.push_back(std::move(read));
-        return _languages.back()->texts;
+        auto read = readLanguage(bundle, name);
+        const std::vector<String> problems = std::exchange(read->problems, {});
+        const Language* language = nullptr;
+        {
+            const std::lock_guard lock(_mutex);
+            if (const Language* known = find(bundle, name))
+                return known->texts;
+            language = _languages.emplace_back(std::move(read)).get();
+        }
+        // The host's log function may ask for these very texts.
+        for (const String& problem : problems)
+            logWarningOrLine("%@", problem);
+        return language->texts;
     }
 
 private:
-    struct Language {
-        String bundlePath;
-        std::string name;
-        Strings texts;
-    };
-
-    const Strings* find(const Bundle& bundle, std::string_view language) const {
+    const Language* find(const Bundle& bundle, std::string_view name) const {
         for (const auto& known : _languages)
-            if (known->name == language && known->bundlePath == bundle.bundlePath())
-                return &known->texts;
+            if (known->name == name && known->bundlePath == bundle.bundlePath())
+                return known.get();
         return nullptr;
     }
 
@@ -103,13 +131,13 @@ thread_local bool Opening::isActive = false;
 
 } // namespace
 
-String Bundle::localizedString(std::string_view englishText) const {
+String Bundle::localizedString(const String& englishText) const {
     const std::string_view language = languageOf(localeName());
-    if (language.empty() || englishText.empty())
+    if (language.empty() || englishText.isEmpty())
         return englishText;
-    const Strings& texts = Languages::shared().textsFor(*this, language);
-    const auto found = texts.find(englishText);
-    return found != texts.end() ? found->second : String(englishText);
+    const StringsFile::Texts& texts = Languages::shared().textsFor(*this, language);
+    const auto found = texts.find(englishText.view());
+    return found != texts.end() ? found->second : englishText;
 }
 
 String localizedText(std::string_view englishText) {

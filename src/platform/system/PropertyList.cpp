@@ -100,11 +100,13 @@ PropertyList readPropertyList(const String& path) {
     if (!fileExists(path))
         return {make<Dictionary>(), {}};
     Ref<Error> error;
+    const Ref<Data> file = readFile(path, &error, ReadableFiles::regular, largestResource);
     // White space may be all that a string holds.
     const auto document =
-        XMLDocument::initWithContentsOfFile(path, {.keepWhiteSpace = true}, &error);
+        file ? XMLDocument::initWithData(*file, {.keepWhiteSpace = true}, &error) : nullptr;
     if (!document)
-        return none(error->localizedDescription());
+        return none(String::concat(
+            {error->localizedDescription(), " (", error->localizedFailureReason(), ")"}));
     const XMLElement* root = document->rootElement();
     if (root != nullptr && root->name() == "plist") {
         const auto values = childElements(*root);

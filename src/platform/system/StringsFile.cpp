@@ -1,119 +1,189 @@
 #include "platform/system/StringsFile.h"
 
+#include "platform/object/Unicode.h"
+
+#include <algorithm>
 #include <charconv>
 
 namespace qx {
 
 namespace {
 
+constexpr std::string_view blanks = " \t\r\n";
+
+// Reads tokens. One that fails leaves the place where it was given up; no place is looked at by
+// more than a few entries, however many are faulty.
 class Scanner {
 public:
-    explicit Scanner(std::string_view text) noexcept : _rest(text) {
-        constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
-        accept(byteOrderMark);
+    explicit Scanner(std::string_view text) noexcept : _text(text), _lineEnd(endOfLine(0)) {}
+
+    bool isAtEnd() const noexcept { return _at == _text.size(); }
+    std::size_t position() const noexcept { return _at; }
+
+    // White space and comments. One that does not end is none: it would hide all that follows.
+    void skipLayout() noexcept {
+        do
+            _at = std::min(_text.find_first_not_of(blanks, _at), _text.size());
+        while (skipComment());
     }
 
-    bool accept(std::string_view token) noexcept {
-        if (!_rest.starts_with(token))
+    bool accept(char c) noexcept {
+        skipLayout();
+        if (isAtEnd() || _text[_at] != c)
             return false;
-        _rest.remove_prefix(token.size());
+        ++_at;
         return true;
     }
 
-    // White space and comments.
-    void skipLayout() noexcept {
-        while (!_rest.empty()) {
-            if (_rest.starts_with("/*"))
-                skipBehind("*/", 2);
-            else if (_rest.starts_with("//"))
-                skipBehind("\n", 2);
-            else if (std::string_view(" \t\r\n").find(_rest.front()) != std::string_view::npos)
-                _rest.remove_prefix(1);
-            else
-                return;
-        }
-    }
-
-    // A text in quotation marks. False when none stands here or it does not end.
+    // A text in quotation marks. False when none stands here, it does not end, or it holds what is
+    // no character.
     bool quoted(std::string& text) {
-        skipLayout();
-        if (!accept("\""))
+        if (!accept('"'))
             return false;
         text.clear();
-        while (!_rest.empty()) {
-            const char c = take();
+        bool isSound = true;
+        while (!isAtEnd()) {
+            const char c = _text[_at++];
             if (c == '"')
-                return true;
-            if (c == '\\' && !_rest.empty())
-                escaped(text);
+                return isSound && unicode::isWellFormed(text);
+            if (c == '\\' && !isAtEnd())
+                isSound = escaped(text) && isSound;
             else
                 text += c;
         }
         return false;
     }
 
+    // To where the next entry may begin after one that began at `start` is faulty: behind its
+    // semicolon on the same line, else on the line below. A quotation mark that is missing or too
+    // many costs no entry of a further line so.
+    void recover(std::size_t start) noexcept {
+        const std::size_t from = std::max(start, _behindComment);
+        if (_lineEnd < from)
+            _lineEnd = endOfLine(from);
+        const std::size_t end = skipToSemicolon(_at, _lineEnd);
+        _at = end != std::string_view::npos ? end : std::min(_lineEnd + 1, _text.size());
+    }
+
 private:
-    char take() noexcept {
-        const char c = _rest.front();
-        _rest.remove_prefix(1);
-        return c;
+    std::string_view rest() const noexcept { return _text.substr(_at); }
+    std::size_t endOfLine(std::size_t from) const noexcept {
+        return std::min(_text.find('\n', from), _text.size());
     }
 
-    void skipBehind(std::string_view token, std::size_t from) noexcept {
-        const std::size_t found = _rest.find(token, from);
-        _rest.remove_prefix(found == std::string_view::npos ? _rest.size() : found + token.size());
-    }
-
-    void escaped(std::string& text) {
-        const char c = take();
-        if (c == 'n')
-            text += '\n';
-        else if (c == 't')
-            text += '\t';
-        else if ((c == 'U' || c == 'u') && _rest.size() >= 4)
-            appendCodePoint(text);
-        else
-            text += c;
-    }
-
-    void appendCodePoint(std::string& text) {
-        unsigned point = 0;
-        const char* const end = _rest.data() + 4;
-        if (std::from_chars(_rest.data(), end, point, 16).ptr != end)
-            return;
-        _rest.remove_prefix(4);
-        if (point < 0x80) {
-            text += static_cast<char>(point);
-            return;
+    bool skipComment() noexcept {
+        std::size_t end = std::string_view::npos;
+        if (rest().starts_with("//")) {
+            end = endOfLine(_at);
+        } else if (rest().starts_with("/*") && _mayEndComment) {
+            end = _text.find("*/", _at + 2);
+            _mayEndComment = end != std::string_view::npos;
+            end += _mayEndComment ? 2 : 0;
         }
-        if (point < 0x800) {
-            text += static_cast<char>(0xC0U | point >> 6U);
-        } else {
-            text += static_cast<char>(0xE0U | point >> 12U);
-            text += static_cast<char>(0x80U | (point >> 6U & 0x3FU));
-        }
-        text += static_cast<char>(0x80U | (point & 0x3FU));
+        if (end == std::string_view::npos)
+            return false;
+        _at = _behindComment = end;
+        return true;
     }
 
-    std::string_view _rest;
+    std::size_t skipToSemicolon(std::size_t at, std::size_t end) const noexcept {
+        bool isQuoted = false;
+        for (; at < end; ++at) {
+            if (_text[at] == ';' && !isQuoted)
+                return at + 1;
+            if (_text[at] == '"')
+                isQuoted = !isQuoted;
+            else if (_text[at] == '\\')
+                ++at;
+        }
+        return std::string_view::npos;
+    }
+
+    bool escaped(std::string& text) {
+        constexpr std::string_view letters = "nrt";
+        constexpr std::string_view characters = "\n\r\t";
+        const char c = _text[_at++];
+        if (c == 'U' || c == 'u')
+            return escapedUnits(text);
+        const std::size_t letter = letters.find(c);
+        text += letter != std::string_view::npos ? characters[letter] : c;
+        return true;
+    }
+
+    // "xxxx" and as many "\\Uxxxx" as follow: two may be one character.
+    bool escapedUnits(std::string& text) {
+        std::u16string units;
+        while (true) {
+            const char* const digits = _text.data() + _at;
+            unsigned unit = 0;
+            if (rest().size() < 4 ||
+                std::from_chars(digits, digits + 4, unit, 16).ptr != digits + 4 || unit == 0)
+                return false;
+            units += static_cast<char16_t>(unit);
+            _at += 4;
+            if (!rest().starts_with("\\U") && !rest().starts_with("\\u"))
+                break;
+            _at += 2;
+        }
+        text += unicode::fromUTF16(units);
+        return true;
+    }
+
+    std::string_view _text;
+    std::size_t _at = 0;
+    std::size_t _behindComment = 0;
+    std::size_t _lineEnd;       // the first at or behind the last faulty entry
+    bool _mayEndComment = true; // false once no "*/" stands in what is left
 };
+
+// The text as UTF-8, without a byte-order mark. UTF-16 shows by one, or by the zero byte that is
+// half of its first character.
+std::string decoded(std::string_view file) {
+    if (file.starts_with("\xEF\xBB\xBF"))
+        return std::string(file.substr(3));
+    if (file.size() < 2)
+        return std::string(file);
+    const bool hasMark = file.starts_with("\xFF\xFE") || file.starts_with("\xFE\xFF");
+    if (!hasMark && file[0] != '\0' && file[1] != '\0')
+        return std::string(file);
+    const std::size_t high = file[0] == '\0' || file[0] == '\xFE' ? 0 : 1;
+    std::u16string units;
+    units.reserve(file.size() / 2);
+    for (std::size_t i = hasMark ? 2 : 0; i + 1 < file.size(); i += 2)
+        units += static_cast<char16_t>(static_cast<unsigned char>(file[i + high]) << 8U |
+                                       static_cast<unsigned char>(file[i + 1 - high]));
+    return unicode::fromUTF16(units);
+}
 
 } // namespace
 
-Strings parseStrings(std::string_view file) {
-    Strings strings;
-    Scanner scanner(file);
+StringsFile parseStrings(std::string_view file) {
+    constexpr std::size_t mostFaults = 10;
+    const std::string text = decoded(file);
+    StringsFile result;
+    Scanner scanner(text);
     std::string key;
     std::string translation;
-    const auto punctuation = [&](std::string_view token) {
-        scanner.skipLayout();
-        return scanner.accept(token);
-    };
-    while (scanner.quoted(key) && punctuation("=") && scanner.quoted(translation) &&
-           punctuation(";"))
-        if (!translation.empty())
-            strings.insert_or_assign(key, String(translation));
-    return strings;
+    std::size_t line = 1;
+    std::size_t counted = 0;
+    while (scanner.skipLayout(), !scanner.isAtEnd()) {
+        const std::size_t start = scanner.position();
+        if (scanner.quoted(key) && scanner.accept('=') && scanner.quoted(translation) &&
+            scanner.accept(';')) {
+            if (!translation.empty())
+                result.texts.insert_or_assign(key, String(translation));
+            continue;
+        }
+        if (result.faultyLines.size() < mostFaults) {
+            line += static_cast<std::size_t>(
+                std::count(text.data() + counted, text.data() + start, '\n'));
+            counted = start;
+            if (result.faultyLines.empty() || result.faultyLines.back() != line)
+                result.faultyLines.push_back(line);
+        }
+        scanner.recover(start);
+    }
+    return result;
 }
 
 } // namespace qx

@@ -68,6 +68,10 @@ TEST_F(BundleTest, ResourcesAreFoundInsideTheBundleOnly) {
     for (const char* name : {"order.xml", "../outside.xml", "", ".", "maps/../../outside.xml"})
         EXPECT_TRUE(bundle->pathForResource(name).isNull()) << name;
     EXPECT_TRUE(bundle->pathForResource(sandbox.path("outside.xml")).isNull());
+    EXPECT_TRUE(bundle->pathForResource(nullptr).isNull());
+    EXPECT_TRUE(bundle->localizedString(nullptr).isNull());
+    EXPECT_TRUE(bundle->objectForInfoDictionaryKey(nullptr).isNull());
+    EXPECT_FALSE(Bundle::bundleWithPath(nullptr));
 }
 
 TEST_F(BundleTest, ABundleIsOpenedOnceAndThenFoundByItsIdentifier) {
@@ -77,6 +81,18 @@ TEST_F(BundleTest, ABundleIsOpenedOnceAndThenFoundByItsIdentifier) {
     EXPECT_EQ(Bundle::bundleWithIdentifier("org.example.Once"), bundle);
     EXPECT_EQ(Bundle::bundleWithPath(sandbox.path("app/../app/")), bundle);
     EXPECT_FALSE(Bundle::bundleWithIdentifier(nullptr));
+}
+
+TEST_F(BundleTest, WhatEndsWithTheMainBundleMayAskForBundles) {
+    struct Asking : Object {
+        ~Asking() override { Bundle::bundleWithIdentifier("org.example.Asked"); }
+    };
+    sandbox.write("asking/Info.plist", "<dict/>");
+    auto bundle = Bundle::bundleWithPath(sandbox.path("asking"));
+    bundle->infoDictionary()->set("asking", make<Asking>());
+    Bundle::setMainBundle(bundle);
+    Bundle::forget(std::exchange(bundle, nullptr));
+    Bundle::setMainBundle(nullptr);
 }
 
 TEST_F(BundleTest, TheLibrarysOwnBundleHoldsItsResources) {

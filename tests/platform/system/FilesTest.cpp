@@ -4,8 +4,13 @@
 
 #include <gtest/gtest.h>
 
+#include <fcntl.h>
+#include <grp.h>
+#include <sys/file.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <sys/xattr.h>
 
 #include <csignal>
 
@@ -16,23 +21,55 @@ namespace {
 class FilesTest : public ::testing::Test {
 protected:
     FileSandbox sandbox;
+    const std::string special = " (It is a pipe, a socket or a device.)";
 };
+
+struct Rights {
+    mode_t mode;
+    uid_t owner;
+    gid_t group;
+    bool operator==(const Rights&) const = default;
+};
+
+Rights rightsOf(const std::string& path) {
+    struct stat status {};
+    EXPECT_EQ(::stat(path.c_str(), &status), 0);
+    return {status.st_mode & 0777U, status.st_uid, status.st_gid};
+}
 
 } // namespace
 
-TEST_F(FilesTest, AFileIsReadWholeWhetherMappedOrCopied) {
+TEST_F(FilesTest, AFileIsReadWholeAndItsBytesStay) {
     for (const std::size_t size : {std::size_t{0}, std::size_t{1}, std::size_t{70'000}}) {
         const std::string text(size, 'x');
         const std::string path = sandbox.write("file" + std::to_string(size), text);
-        for (const auto mode : {0600U, 0666U}) { // everybody may shorten the second
-            ASSERT_EQ(::chmod(path.c_str(), mode), 0);
-            const auto data = readFile(path);
-            ASSERT_TRUE(data);
-            EXPECT_EQ(data->view(), text);
-        }
+        const auto data = readFile(path);
+        ASSERT_TRUE(data);
+        ASSERT_EQ(::truncate(path.c_str(), 0), 0);
+        EXPECT_EQ(data->view(), text);
     }
     // Files of the kernel claim to be empty.
     EXPECT_GT(readFile("/proc/self/status")->size(), 100U);
+}
+
+TEST_F(FilesTest, WhatIsTooLargeOrNoFileIsRefusedWhereThatWasAsked) {
+    const std::string pipe = sandbox.path("pipe");
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    const std::string tooLarge = " (It is larger than the limit for such files.)";
+    const std::tuple<std::string, ReadableFiles, std::string> rows[]{
+        {sandbox.write("four", "four"), ReadableFiles::regular, tooLarge},
+        {"/dev/zero", ReadableFiles::all, tooLarge},
+        {"/proc/self/status", ReadableFiles::regular, tooLarge},
+        {"/dev/zero", ReadableFiles::regular, special},
+        {pipe, ReadableFiles::regular, special}};
+    for (const auto& [path, readable, reason] : rows) {
+        Ref<Error> error;
+        EXPECT_FALSE(readFile(path, &error, readable, 3));
+        ASSERT_TRUE(error) << path;
+        EXPECT_EQ(error->description().str(),
+                  "NSCocoaErrorDomain 256: The file cannot be read: " + path + reason);
+    }
+    EXPECT_EQ(readFile(sandbox.path("four"), nullptr, ReadableFiles::regular, 4)->size(), 4U);
 }
 
 TEST_F(FilesTest, WhatCannotBeReadIsToldWithItsPathAndTheSystemsReason) {
@@ -63,40 +100,135 @@ TEST_F(FilesTest, AZeroByteInAPathNamesNothing) {
     EXPECT_EQ(sandbox.read("secret"), "x");
 }
 
-TEST_F(FilesTest, AWrittenFileTakesThePlaceOfTheOldOneWithItsPermissions) {
+TEST_F(FilesTest, AWrittenFileTakesThePlaceOfWhatItsPathLeadsTo) {
     const std::string path = sandbox.write("area/a.xml", "old");
-    ASSERT_EQ(::chmod(path.c_str(), 0640), 0);
-    // A link is replaced and not followed.
-    std::filesystem::create_symlink(path, sandbox.path("area/link.xml"));
-    for (const char* name : {"link.xml", "b.xml"})
-        EXPECT_TRUE(writeFileAtomically(sandbox.path("area/") + name, "other"));
-    EXPECT_FALSE(std::filesystem::is_symlink(sandbox.path("area/link.xml")));
-    EXPECT_EQ(sandbox.read("area/a.xml"), "old");
-    EXPECT_TRUE(writeFileAtomically(path, "new"));
-    struct stat status {};
-    ASSERT_EQ(::stat(path.c_str(), &status), 0);
-    EXPECT_EQ(status.st_mode & 0777U, 0640U);
+    ASSERT_EQ(::chmod(path.c_str(), 0600), 0);
+    std::filesystem::create_hard_link(path, sandbox.path("area/hard.xml"));
+    const std::pair<const char*, const char*> links[]{
+        {"link.xml", "a.xml"}, {"second.xml", "../area/link.xml"}, {"dangling.xml", "b.xml"}};
+    for (const auto& [link, target] : links)
+        std::filesystem::create_symlink(target, sandbox.path("area/") + link);
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/second.xml"), "new"));
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/dangling.xml"), "made"));
     EXPECT_EQ(sandbox.read("area/a.xml"), "new");
-    EXPECT_EQ(sandbox.list("area"), "a.xml b.xml link.xml ");
+    EXPECT_EQ(rightsOf(path).mode, 0600U);
+    EXPECT_EQ(sandbox.read("area/b.xml"), "made");
+    EXPECT_EQ(sandbox.read("area/hard.xml"), "old");
+    for (const auto& [link, target] : links)
+        EXPECT_EQ(std::filesystem::read_symlink(sandbox.path("area/") + link), target);
+    EXPECT_EQ(sandbox.list("area"), "a.xml b.xml dangling.xml hard.xml link.xml second.xml ");
+}
+
+TEST_F(FilesTest, AFileThatIsReplacedKeepsTheRightsThatItsWriterMayGive) {
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only the superuser can be others";
+    ASSERT_EQ(::chmod(sandbox.root().c_str(), 0777), 0);
+    const std::string path = sandbox.path("a.xml");
+    const gid_t staff = 1234;
+    const struct {
+        uid_t writer;
+        bool isMember;
+        mode_t before;
+        Rights after;
+    } rows[]{{0, false, 0640, {0640, 99, staff}},
+             {65534, true, 0664, {0664, 65534, staff}},
+             {65534, false, 0664, {0604, 65534, 65534}},
+             {65534, false, 0640, {0600, 65534, 65534}},
+             {65534, false, 0604, {0600, 65534, 65534}}};
+    for (const auto& row : rows) {
+        sandbox.write("a.xml", "old");
+        ASSERT_EQ(::chown(path.c_str(), 99, staff), 0);
+        ASSERT_EQ(::chmod(path.c_str(), row.before), 0);
+        const pid_t child = ::fork();
+        if (child == 0) {
+            const bool isOther =
+                row.writer == 0 || (::setgroups(row.isMember ? 1 : 0, &staff) == 0 &&
+                                    ::setgid(row.writer) == 0 && ::setuid(row.writer) == 0);
+            ::_exit(isOther && writeFileAtomically(path, "new") ? 0 : 1);
+        }
+        int status = 0;
+        ASSERT_EQ(::waitpid(child, &status, 0), child);
+        EXPECT_EQ(status, 0);
+        EXPECT_EQ(rightsOf(path), row.after)
+            << std::oct << row.before << " " << rightsOf(path).mode;
+        std::filesystem::remove(path);
+    }
+}
+
+TEST_F(FilesTest, AnAccessListIsKeptAndNoneIsInherited) {
+    // Version 2; owner, user 1234, group, mask, others.
+    const auto list = [](char group) {
+        const char text[] = "\2\0\0\0"
+                            "\1\0\6\0\xFF\xFF\xFF\xFF"
+                            "\2\0\4\0\xD2\4\0\0"
+                            "\4\0\0\0\xFF\xFF\xFF\xFF"
+                            "\x10\0\4\0\xFF\xFF\xFF\xFF"
+                            "\x20\0\0\0\xFF\xFF\xFF\xFF";
+        std::string bytes(text, sizeof text - 1);
+        bytes[22] = group;
+        return bytes;
+    };
+    const auto set = [](const std::string& path, const char* name, const std::string& value) {
+        return ::setxattr(path.c_str(), name, value.data(), value.size(), 0) == 0;
+    };
+    const auto listOf = [](const std::string& path) {
+        std::string value(100, ' ');
+        const ssize_t size =
+            ::getxattr(path.c_str(), "system.posix_acl_access", value.data(), value.size());
+        return value.substr(0, size < 0 ? 0 : static_cast<std::size_t>(size));
+    };
+    const std::string listed = sandbox.write("area/listed.xml", "old");
+    const std::string plain = sandbox.write("area/plain.xml", "old");
+    ASSERT_EQ(::chmod(plain.c_str(), 0640), 0);
+    if (!set(listed, "system.posix_acl_access", list(0)) ||
+        !set(sandbox.path("area"), "system.posix_acl_default", list(4)))
+        GTEST_SKIP() << "no access lists here";
+    EXPECT_TRUE(writeFileAtomically(listed, "new"));
+    EXPECT_TRUE(writeFileAtomically(plain, "new"));
+    EXPECT_EQ(listOf(listed), list(0));
+    EXPECT_EQ(listOf(plain), "");
+    EXPECT_EQ(rightsOf(plain).mode, 0640U);
+}
+
+TEST_F(FilesTest, WhatAKilledWriterLeftIsSweptAndWhatALiveOneWritesIsNot) {
+    const std::string live = sandbox.write("area/.~qx-save-0.tmp", "being written");
+    sandbox.write("area/.~qx-save-1.tmp", "left");
+    const int descriptor = ::open(live.c_str(), O_RDONLY | O_CLOEXEC);
+    ASSERT_EQ(::flock(descriptor, LOCK_EX), 0);
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/a.xml"), "new"));
+    EXPECT_EQ(sandbox.list("area"), ".~qx-save-0.tmp a.xml ");
+    ::close(descriptor);
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/a.xml"), "new"));
+    EXPECT_EQ(sandbox.list("area"), "a.xml ");
 }
 
 TEST_F(FilesTest, WhatCannotBeWrittenIsToldAndNothingIsLeftBehind) {
     const std::string file = sandbox.write("area/file", "x");
     std::filesystem::create_directory(sandbox.path("area/folder"));
     const std::string longName = sandbox.path("area/" + std::string(300, 'n'));
+    const std::string pipe = sandbox.path("area/pipe");
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    std::filesystem::create_symlink("pipe", sandbox.path("area/link"));
+    std::filesystem::create_symlink("loop", sandbox.path("area/loop"));
     const std::pair<std::string, std::string> rows[]{
         {file + "/below", "512: The file cannot be written: " + file + "/below (Not a directory)"},
         {sandbox.path("area/folder"),
          "512: The file cannot be written: " + sandbox.path("area/folder") + " (Is a directory)"},
         {"/proc/a.xml", "512: The file cannot be written: /proc/a.xml (No such file or directory)"},
-        {longName, "512: The file cannot be written: " + longName + " (File name too long)"}};
+        {longName, "512: The file cannot be written: " + longName + " (File name too long)"},
+        {pipe, "512: The file cannot be written: " + pipe + special},
+        {sandbox.path("area/link"),
+         "512: The file cannot be written: " + sandbox.path("area/link") + special},
+        {sandbox.path("area/loop"),
+         "512: The file cannot be written: " + sandbox.path("area/loop") +
+             " (Too many levels of symbolic links)"}};
     for (const auto& [path, expected] : rows) {
         Ref<Error> error;
         EXPECT_FALSE(writeFileAtomically(path, "y", &error));
         ASSERT_TRUE(error) << path;
         EXPECT_EQ(error->description().str(), "NSCocoaErrorDomain " + expected);
     }
-    EXPECT_EQ(sandbox.list("area"), "file folder ");
+    EXPECT_EQ(sandbox.list("area"), "file folder link loop pipe ");
     EXPECT_EQ(sandbox.read("area/file"), "x");
 }
 

@@ -1,10 +1,18 @@
 #include <QXXMLMarshalling/platform/UserDefaults.h>
 
+#include <QXXMLMarshalling/platform/Array.h>
+
 #include "platform/system/Directories.h"
 
 #include "support/FileSandbox.h"
 
 #include <gtest/gtest.h>
+
+#include <sys/stat.h>
+
+#include <atomic>
+#include <functional>
+#include <thread>
 
 using namespace qx;
 
@@ -58,7 +66,9 @@ TEST_F(UserDefaultsTest, ArgumentsArePairsOfAKeyAndAValue) {
              {{"--Key", "v", "-Other", "w"}, nullptr, "w"},
              {{"-Other", "w", "--", "-Key", "v"}, nullptr, "w"},
              {{"-", "Key", "-Key", ""}, "", nullptr},
-             {{"-Key", "v", "-Key", "last"}, "last", nullptr}};
+             {{"-Key", "v", "-Key", "last"}, "last", nullptr},
+             {{"-Key", nullptr, "-Other", "w"}, nullptr, nullptr}, // the end, as in argv
+             {{nullptr, "-Key", "v"}, nullptr, nullptr}};
     for (const auto& row : rows) {
         defaults->registerDefault("registered", "Key");
         defaults->setArguments(row.arguments);
@@ -88,16 +98,66 @@ TEST_F(UserDefaultsTest, BooleansAndNumbersAreReadFromListsAndTexts) {
     }
 }
 
-TEST_F(UserDefaultsTest, ABrokenFileIsWarnedAboutOnceAndHoldsNothing) {
-    for (const char* text :
-         {"<plist><dict>", "", "<plist><string>x</string></plist>", "<plist/>"}) {
-        const std::string path = sandbox.write("config/Client.plist", text);
+TEST_F(UserDefaultsTest, AValueThatEndsMayAskForDefaults) {
+    struct Asking : Object {
+        ~Asking() override { UserDefaults::standardUserDefaults()->objectForKey("Key"); }
+    };
+    sandbox.write("config/Client.plist", listWith("<array/>"));
+    for (int i = 0; i < 2; ++i) {
+        defaults->registerDefault(make<Asking>(), "Asking");
+        defaults->setObject(make<Asking>(), "Asking");
+    }
+    defaults->removeObjectForKey("Asking");
+    defaults->registerDefault(0, "Asking");
+    defaults->objectForKey("Key").as<Array>()->add(make<Asking>());
+    defaults->synchronize();
+    EXPECT_EQ(defaults->objectForKey("Key").as<Array>()->count(), 0U);
+}
+
+TEST_F(UserDefaultsTest, WhatOneThreadReadsStaysWhileAnotherForgetsTheFile) {
+    sandbox.write("config/Client.plist", listWith("<string>of the file</string>"));
+    std::atomic<bool> isDone = false;
+    std::thread other([this, &isDone] {
+        while (!isDone)
+            defaults->synchronize();
+    });
+    for (int i = 0; i < 20000; ++i)
+        EXPECT_EQ(defaults->stringForKey("Key"), "of the file");
+    isDone = true;
+    other.join();
+}
+
+TEST_F(UserDefaultsTest, AnUnusableFileIsWarnedAboutOnceAndHoldsNothing) {
+    const std::string path = sandbox.write("config/Client.plist", "");
+    const auto text = [&](const char* bytes) {
+        return [this, bytes] { sandbox.write("config/Client.plist", bytes); };
+    };
+    const auto link = [&](const char* target) {
+        return [&path, target] {
+            std::filesystem::remove(path);
+            std::filesystem::create_symlink(target, path);
+        };
+    };
+    const std::function<void()> layouts[]{
+        text("<plist><dict>"),
+        text(""),
+        text("<plist><string>x</string></plist>"),
+        text("<plist/>"),
+        [&] { std::filesystem::resize_file(path, std::uintmax_t{1} << 40U); },
+        link("/dev/zero"),
+        link("/"),
+        [&] {
+            std::filesystem::remove(path);
+            ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
+        }};
+    for (const auto& lay : layouts) {
+        lay();
         defaults->synchronize();
         ::testing::internal::CaptureStderr();
         EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
         EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
         const std::string warning = ::testing::internal::GetCapturedStderr();
-        EXPECT_NE(warning.find(path), std::string::npos) << text;
+        EXPECT_NE(warning.find(path), std::string::npos) << warning;
         EXPECT_EQ(std::count(warning.begin(), warning.end(), '\n'), 1) << warning;
     }
 }
