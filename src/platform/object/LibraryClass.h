@@ -9,12 +9,13 @@ namespace qx {
 
 template <class T, class Base = Object>
 const Class& libraryClass(const char* name, std::vector<Property> properties = {}) {
-    static const Class& described = Class::publish({.name = name,
-                                                    .type = &typeid(T),
-                                                    .superclass = &typeid(Base),
-                                                    .properties = std::move(properties)},
-                                                   false);
-    return described;
+    // A pointer: compilers take a reference that a call with temporaries gave for one to those.
+    static const Class* const described = &Class::publish({.name = name,
+                                                           .type = &typeid(T),
+                                                           .superclass = &typeid(Base),
+                                                           .properties = std::move(properties)},
+                                                          false);
+    return *described;
 }
 
 } // namespace qx
