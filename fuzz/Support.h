@@ -36,8 +36,8 @@ inline void requireError(const qx::Ref<qx::Error>& error) {
     require(!error->description().isEmpty(), "an error can be printed");
 }
 
-// Lets mappings include documents, all of them in memory: "common.xml" with a class, "twice.xml" that
-// includes it, "loop.xml" that includes itself, "faulty.xml". No file is looked for.
+// Lets mappings include documents, all of them in memory: "common.xml" with a class, "twice.xml"
+// that includes it, "loop.xml" that includes itself, "faulty.xml". No file is looked for.
 inline void offerIncludes() {
     constexpr std::pair<const char*, const char*> documents[]{
         {"common.xml", "<m><class name='Common'><map-to xml='common'/><field name='id'>"

@@ -1,5 +1,5 @@
-// Any document as a mapping: it is refused with an error, or resolves, twice alike, to classes that are
-// found under their names, and can be described.
+// Any document as a mapping: it is refused with an error, or resolves, twice alike, to classes that
+// are found under their names, and can be described.
 
 #include "Support.h"
 

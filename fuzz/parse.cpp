@@ -1,6 +1,6 @@
 // Any bytes as a document: they are refused with an error that has a place, or make a tree that is
-// written, read again and written the same. The first byte chooses how it is read and written; in the
-// seeds it is a digit.
+// written, read again and written the same. The first byte chooses how it is read and written; in
+// the seeds it is a digit.
 
 #include "Support.h"
 
