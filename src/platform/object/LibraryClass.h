@@ -9,7 +9,8 @@ namespace qx {
 
 template <class T, class Base = Object>
 const Class& libraryClass(const char* name, std::vector<Property> properties = {}) {
-    // A pointer: compilers take a reference that a call with temporaries gave for one to those.
+    // A pointer, here and wherever a description is kept: some compilers take a reference that came
+    // of a call with temporaries for one to these.
     static const Class* const described = &Class::publish({.name = name,
                                                            .type = &typeid(T),
                                                            .superclass = &typeid(Base),
