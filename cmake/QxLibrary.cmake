@@ -99,7 +99,7 @@ target_include_directories(QXXMLMarshalling INTERFACE
     "$<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>")
 target_compile_features(QXXMLMarshalling INTERFACE cxx_std_20)
 target_link_libraries(QXXMLMarshalling PRIVATE $<BUILD_INTERFACE:qx_dependencies>)
-if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" OR NOT (QX_SANITIZE OR QX_FUZZ))
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" OR NOT (QX_SANITIZE OR QX_SANITIZE_THREADS OR QX_FUZZ))
     # Clang leaves its sanitizers' symbols to the program.
     target_link_options(QXXMLMarshalling PRIVATE -Wl,-z,defs)
 endif()

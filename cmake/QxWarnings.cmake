@@ -16,7 +16,7 @@ target_compile_options(qx_warnings INTERFACE
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
     target_compile_options(qx_warnings INTERFACE
         -Wmissing-declarations -Wduplicated-cond -Wlogical-op -Wsuggest-override)
-    if(QX_SANITIZE)
+    if(QX_SANITIZE OR QX_SANITIZE_THREADS)
         # The sanitizers' instrumentation hides initialisations from these analyses.
         target_compile_options(qx_warnings INTERFACE
             -Wno-maybe-uninitialized -Wno-array-bounds -Wno-stringop-overflow -Wno-restrict)

@@ -12,8 +12,11 @@
 
 class QX_API QXXMLMapping : public qx::Object {
 public:
-    // Null, with the error below, when the element has two "description" children.
+    // Null, with the first error below, when the element has two "description" children.
     //   -200  "Too many descriptions in element: %@"
+    // Every kind of node can fail, besides, in a tree built by hand that nests mapping nodes more
+    // than 1,024 deep (a parsed document is limited already):
+    //   -223  "Objects nest deeper than the limit of %@: %@"   (the limit, the element's name)
     // A null element counts as one without attributes and children.
     static qx::Ref<QXXMLMapping> initWithXML(qx::XMLElement* element,
                                              qx::Ref<qx::Error>* error = nullptr);

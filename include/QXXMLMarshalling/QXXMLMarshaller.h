@@ -158,12 +158,14 @@ public:
                                qx::XMLElement& element, qx::CountedSet& boundFields,
                                qx::CountedSet& boundAttributes, bool isFlattened,
                                qx::Ref<qx::Error>* error = nullptr);
+    // True unless it failed: also when there was nothing to bind.
     //   -209  "Unknown field node type: %@ - %@"
     bool bindField(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
                    qx::XMLElement& element, qx::CountedSet& boundFields,
                    qx::CountedSet& boundAttributes, bool isFlattened,
                    qx::Ref<qx::Error>* error = nullptr);
-    // True when a value was set; false without an error when there was nothing to bind.
+    // The steps of bindField, by the kind of field. Those for attributes and texts answer true when
+    // a value was set; false without an error when there was nothing to bind.
     //   -202  "Required attribute missing for field: %@ in element: %@"
     //   -220  "Too many elements defined for field: %@ in element: %@"
     bool bindFieldAsAttribute(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
@@ -174,12 +176,17 @@ public:
     bool bindFieldAsText(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
                          qx::XMLElement& element, qx::CountedSet& boundFields,
                          qx::CountedSet& boundAttributes, qx::Ref<qx::Error>* error = nullptr);
+    // True unless it failed: also when there was nothing to bind. Without a slot no failure inside
+    // the child is one, and nothing is set.
     //   -202  "Missing required element named: %@ in element: %@"
     //   -210  "Too many child elements of name: %@ in element: %@"
     bool bindFieldAsElement(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
                             qx::XMLElement& element, qx::CountedSet& boundFields,
                             qx::CountedSet& boundAttributes, bool isFlattened,
                             qx::Ref<qx::Error>* error = nullptr);
+    // True unless they failed: also when there were no items, and the key was left alone. An item
+    // that fails fails the collection when there is a slot; without one it is left out, and the
+    // array holds the others.
     //   -208  "Unable to process collection class: %@"
     bool bindCollectionField(const QXXMLFieldMapping& field, qx::Object& object,
                              qx::XMLElement& element, qx::CountedSet& boundFields,
@@ -188,7 +195,9 @@ public:
     bool bindArrayFieldByType(const QXXMLFieldMapping& field, qx::Object& object,
                               qx::XMLElement& element, qx::CountedSet& boundFields,
                               qx::CountedSet& boundAttributes, qx::Ref<qx::Error>* error = nullptr);
-    // Compares what the element holds with what was consumed; keeps or refuses the rest.
+    // Compares what the element holds with what was consumed; keeps or refuses the rest. Unknown
+    // children are child elements and processing instructions, which count under their targets; of
+    // the latter nothing but an empty array under the target is kept. False with
     //   -214  "Unknown fields found in XML document: %@ element: %@"
     //   -215  "Unknown attributes found in XML document: %@ element: %@"
     bool validateBoundFields(const qx::CountedSet& boundFields,

@@ -14,11 +14,10 @@ block cpp "$2" >"$work/program.cpp"
 printf '<order number="7"><customer>Bea</customer><note/></order>' >"$work/order.xml"
 
 compiler=$(sed -n 's/^CMAKE_CXX_COMPILER:[A-Z]*=//p' "$1/CMakeCache.txt")
-sanitize=()
-if grep -q '^QX_SANITIZE:BOOL=ON' "$1/CMakeCache.txt"; then
-    sanitize=(-fsanitize=address,undefined)
-fi
-"$compiler" -std=c++20 -Wall -Wextra -Werror "${sanitize[@]}" -I "$2/include" "$work/program.cpp" \
+flags=()
+! grep -q '^QX_SANITIZE:BOOL=ON' "$1/CMakeCache.txt" || flags+=(-fsanitize=address,undefined)
+! grep -q '^QX_WARNINGS_AS_ERRORS:BOOL=ON' "$1/CMakeCache.txt" || flags+=(-Werror)
+"$compiler" -std=c++20 -Wall -Wextra "${flags[@]}" -I "$2/include" "$work/program.cpp" \
     -L "$1/lib" -lQXXMLMarshalling -Wl,-rpath,"$1/lib" -o "$work/program"
 cd -- "$work"
 ./program

@@ -79,8 +79,9 @@ void addReading(CLI::App& command, Options& options) {
         ->option_text(" ")
         ->required();
     command.add_flag("--strict", options.strict,
-                     "Fail at a document that no class handles; with --discard-unknown, at any XML "
-                     "that the mapping does not describe");
+                     "Fail at a document, or an item of an untyped collection, that no class "
+                     "handles; with --discard-unknown, at any XML that the mapping does not "
+                     "describe");
     command.add_flag("--discard-unknown", options.discardUnknown,
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,

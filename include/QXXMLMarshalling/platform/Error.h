@@ -5,8 +5,14 @@
 // nobody reads costs no copy of an element's XML; an error keeps the nodes that its message quotes.
 //
 //     qx::Ref<qx::Error> error;                      // a slot must hold null when passed in
-//     if (!marshaller->unmarshall(document, &error))
+//     if (!marshaller->unmarshall(document, &error) && error)
 //         std::cerr << error->localizedDescription().view() << '\n';
+//
+// An error that a slot holds already counts as one of the operation that looks at the slot: it
+// stays there and the result is null, although nothing was wrong. So a slot is used for one
+// operation, or set to null before the next. Without a slot a failing operation answers the same,
+// but for the steps of reading that say otherwise (QXXMLMarshaller.h): a collection leaves out the
+// items that fail.
 
 #include <QXXMLMarshalling/platform/Object.h>
 

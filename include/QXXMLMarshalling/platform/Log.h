@@ -14,6 +14,9 @@
 // has to export its symbols (-rdynamic), or to define the functions in a shared object that is
 // loaded for everybody (RTLD_GLOBAL). They are looked for anew whenever shared objects come or go.
 //
+// An empty QXLogWarning silences the library: nothing goes to standard error then. What it would
+// have said of unknown child elements goes to QXLogDebug, which need not be there.
+//
 // They may be called on any thread, while the library is at work: they must not use the objects
 // that it is working on. Without QXLogWarning, warnings go to standard error, one line each;
 // without QXLogDebug, debugging messages go nowhere.

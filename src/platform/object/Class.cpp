@@ -221,8 +221,8 @@ const Class* Class::superclass() const {
             _superclass.store(known, std::memory_order_release);
         return known;
     }
-    static const Class& root = Object().isa();
-    return this == &root ? nullptr : &root;
+    static const Class* const root = &Object().isa();
+    return this == root ? nullptr : root;
 }
 
 bool Class::isSubclassOf(const Class& other) const {

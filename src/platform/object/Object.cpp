@@ -162,7 +162,7 @@ Value valueForKeyPathOf(const Object& object, const String& path) {
 // What every object answers, so that one which forwards operations does not take these for others.
 const Class& Object::describedClass() const {
     using describe::instanceOperation;
-    static const Class& described = Class::publish(
+    static const Class* const described = &Class::publish(
         {.name = "qx::Object",
          .type = &typeid(Object),
          .superclass = nullptr,
@@ -178,7 +178,7 @@ const Class& Object::describedClass() const {
               instanceOperation<Object, &Object::willChangeValueForKey>("willChangeValueForKey:"),
               instanceOperation<Object, &Object::didChangeValueForKey>("didChangeValueForKey:")}},
         false);
-    return described;
+    return *described;
 }
 
 String Object::description() const {

@@ -14,7 +14,7 @@ UndoableObject::~UndoableObject() {
 const Class& UndoableObject::classObject() {
     using Self = UndoableObject;
     using describe::instanceOperation;
-    static const Class& described = Class::publish(
+    static const Class* const described = &Class::publish(
         {.name = "qx::UndoableObject",
          .type = &typeid(Self),
          .superclass = &typeid(Object),
@@ -22,7 +22,7 @@ const Class& UndoableObject::classObject() {
                         instanceOperation<Self, &Self::undoManager>("undoManager"),
                         instanceOperation<Self, &Self::setUndoManager>("setUndoManager:")}},
         false);
-    return described;
+    return *described;
 }
 
 namespace {
