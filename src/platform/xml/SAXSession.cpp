@@ -222,8 +222,6 @@ void SAXSession::ContextDeleter::operator()(xmlParserCtxt* context) const noexce
 }
 
 SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
-    static std::once_flag initialized;
-    std::call_once(initialized, xmlInitParser);
     requireThreadState();
     _function = xmlStructuredError;
     _user = xmlStructuredErrorContext;
@@ -232,16 +230,18 @@ SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
         if (error != nullptr)
             Callbacks::guarded(user, [&](SAXSession& self) { self.report(*error); });
     });
+    static std::once_flag initialized;
+    std::call_once(initialized, xmlInitParser);
 }
 
 SAXSession::ErrorChannel::~ErrorChannel() { xmlSetStructuredErrorFunc(_user, _function); }
 
 SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLParseOptions& options)
-    : _channel(*this), _text(text), _refusesDoctype(options.refuseDoctype), _document(document),
+    : _text(text), _refusesDoctype(options.refuseDoctype), _document(document),
       _builder(document, options), _position(text), _subset(options.maximumSubsetSize),
-      _texts(text) {
+      _texts(text), _channel(*this) {
     _context.reset(xmlNewParserCtxt());
-    if (_context == nullptr)
+    if (_context == nullptr || _lacksMemory)
         throw std::bad_alloc();
     pushInput();
     xmlCtxtUseOptions(_context.get(),

@@ -87,7 +87,6 @@ private:
         void operator()(xmlParserCtxt* context) const noexcept;
     };
 
-    ErrorChannel _channel;
     std::string_view _text;
     const bool _refusesDoctype;
     XMLDocument& _document;
@@ -111,6 +110,7 @@ private:
     bool _lacksMemory = false;
     std::optional<ParseFailure> _failure;
     std::exception_ptr _exception;
+    ErrorChannel _channel; // the last: it uses what stands above
 };
 
 } // namespace qx
