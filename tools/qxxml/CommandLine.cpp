@@ -88,6 +88,7 @@ void addReading(CLI::App& command, Options& options) {
                      "Do not write namespace declarations");
     command.add_flag("--keep-white-space", options.keepWhiteSpace,
                      "Keep the white space between elements");
+    command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
 // Defines the commands; the one that was called is left in `chosen`.

@@ -16,6 +16,7 @@ struct Options {
     bool discardUnknown = false;
     bool noNamespaceURIs = false;
     bool keepWhiteSpace = false;
+    bool noDoctype = false;
     bool pretty = false;
 
     // Folders that are searched before the usual places, in this order.

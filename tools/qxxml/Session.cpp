@@ -58,6 +58,7 @@ qx::Ref<qx::Object> Session::readObject(QXXMLMarshaller& marshaller) const {
     const std::string file = isStandardInput ? "<stdin>" : _options.document;
     qx::XMLParseOptions parsing;
     parsing.keepWhiteSpace = _options.keepWhiteSpace;
+    parsing.refuseDoctype = _options.noDoctype;
     qx::Ref<qx::Error> error;
     const auto document = isStandardInput
                               ? qx::XMLDocument::initWithStream(std::cin, parsing, &error)

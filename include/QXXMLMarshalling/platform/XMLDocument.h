@@ -8,11 +8,18 @@
 //
 // Parsing reads the given bytes and nothing else: no other file, no network, whatever the document
 // says. Internal entities and attribute defaults of the internal subset work, an entity that stands
-// elsewhere is an error; CDATA and entities become text. Limits bound depth, text size, what
-// entities bring in and what one element may declare. Beyond one, and for anything that is no
+// elsewhere is an error; CDATA and entities become text. A parameter entity that stands elsewhere
+// is left out; unless the document says standalone="yes", what is declared behind it is left out
+// too. Limits bound depth, text size, what is declared, what entities bring in (1 MB and five times
+// the document) and what one element may declare. Beyond one, and for anything that is no
 // well-formed XML, the result is null and the error says what, where: domain
-// qx::Error::parserDomain, the parser's code and text, line() and column(). Any number of threads
-// may parse at the same time.
+// qx::Error::parserDomain, the parser's code and text, line() and column(). Where memory lacks,
+// std::bad_alloc comes out. Any number of threads may parse at the same time.
+//
+// Codes, texts in English and the last few columns of what is no well-formed XML are those of the
+// libxml2 in use, and differ among its versions; limits and all else do not, with two exceptions:
+// from 2.12 on elements never nest deeper than 2,048, and from 2.14 on documents and texts beyond
+// 1 GB are refused.
 //
 // A document's short texts share memory, a kilobyte each time: whoever keeps single ones of very
 // many documents saves memory with copies, qx::String(text.view()).
@@ -33,8 +40,13 @@ struct XMLParseOptions {
     bool keepWhiteSpace = false;
     // How deep elements may nest.
     std::size_t maximumDepth = 256;
-    // The largest text, attribute value or name in bytes.
+    // The largest text, comment, attribute value or name in bytes.
     std::size_t maximumTextSize = 10'000'000;
+    // How many bytes a DOCTYPE may declare in the document itself, with what parameter entities
+    // bring in. The parser's work grows with the square of it.
+    std::size_t maximumSubsetSize = 64 * 1024;
+    // Refuse any document that has a DOCTYPE.
+    bool refuseDoctype = false;
 };
 
 // The bytes of a document, lent for the time of a call. Those that a zero byte follows, as in a

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <iconv.h>
+#include <new>
 
 namespace qx {
 
@@ -26,8 +27,24 @@ iconv_t noConverter() {
     return reinterpret_cast<iconv_t>(-1); // NOLINT(performance-no-int-to-ptr): so it is defined
 }
 
+iconv_t open(const char* to, const char* from) {
+    const iconv_t converter = ::iconv_open(to, from);
+    if (converter == noConverter() && errno != EINVAL)
+        throw std::bad_alloc();
+    return converter;
+}
+
+// The C library also says that it does not know an encoding when it lacks the memory to load it. An
+// answer counts when there is memory for it.
 iconv_t openConverter(const char* to, const char* from, std::string_view name) {
-    return isEncodingName(name) ? ::iconv_open(to, from) : noConverter();
+    constexpr std::size_t enough = std::size_t{1} << 20;
+    if (!isEncodingName(name))
+        return noConverter();
+    const iconv_t converter = open(to, from);
+    if (converter != noConverter())
+        return converter;
+    ::operator delete(::operator new(enough));
+    return open(to, from);
 }
 
 // False at bytes that mean nothing in the one encoding or cannot be said in the other.

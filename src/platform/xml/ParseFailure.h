@@ -17,6 +17,7 @@ namespace parseErrors {
 
 inline constexpr const char* notWellFormed = "The document is not well-formed XML";
 inline constexpr const char* beyondLimit = "The document exceeds a limit";
+inline constexpr const char* notAllowed = "The document is not accepted";
 inline constexpr const char* notReadable = "The document's encoding cannot be read";
 
 inline constexpr ErrorText empty{4, "The document is empty", notWellFormed};
@@ -24,9 +25,11 @@ inline constexpr ErrorText noStartTag{3, "Start tag expected, '<' not found", no
 inline constexpr ErrorText zeroByte{9, "The document holds a zero byte", notWellFormed};
 inline constexpr ErrorText externalEntity{
     29, "The entity %@ stands outside of the document and is not read", notWellFormed};
-// The parser says the same of loops and of its limit: its own words come first.
-inline constexpr ErrorText loopOrExpansion{
-    89, "%@, or entities that bring in more than 10 times what the document holds", notWellFormed};
+inline constexpr ErrorText undeclaredEntity{26, "The entity %@ is not declared", notWellFormed};
+inline constexpr ErrorText notationWithoutIdentifier{105, "The notation %@ has no identifier",
+                                                     notWellFormed};
+inline constexpr ErrorText doctypeRefused{
+    1, "The document has a DOCTYPE, which is not allowed here", notAllowed};
 
 inline constexpr ErrorText unknownEncoding{32, "The encoding %@ is not known", notReadable};
 inline constexpr ErrorText otherEncoding{
@@ -48,8 +51,10 @@ inline constexpr ErrorText instructionTooLarge{
     1, "A processing instruction is larger than the limit of %@ bytes", beyondLimit};
 inline constexpr ErrorText tooManyNames{
     1, "The document has more different names than the limit of %@", beyondLimit};
-inline constexpr ErrorText tooManyDeclarations{
-    1, "The document has more declarations than the limit of %@", beyondLimit};
+inline constexpr ErrorText subsetTooLarge{1, "The DOCTYPE declares more than the limit of %@ bytes",
+                                          beyondLimit};
+inline constexpr ErrorText entitiesTooDeep{
+    89, "Entities refer to themselves, or nest deeper than the limit of %@", beyondLimit};
 inline constexpr ErrorText tooManyDefaults{1, "More attributes have defaults than the limit of %@",
                                            beyondLimit};
 inline constexpr ErrorText tooManyAttributes{
@@ -63,7 +68,9 @@ inline constexpr std::array table{&empty,
                                   &noStartTag,
                                   &zeroByte,
                                   &externalEntity,
-                                  &loopOrExpansion,
+                                  &undeclaredEntity,
+                                  &notationWithoutIdentifier,
+                                  &doctypeRefused,
                                   &otherEncoding,
                                   &unknownEncoding,
                                   &malformedCharacter,
@@ -77,7 +84,8 @@ inline constexpr std::array table{&empty,
                                   &tooManyNames,
                                   &tooManyDefaults,
                                   &tooManyAttributes,
-                                  &tooManyDeclarations,
+                                  &subsetTooLarge,
+                                  &entitiesTooDeep,
                                   &tooManyNamespaces,
                                   &expansionTooLarge};
 

@@ -5,27 +5,23 @@
 #include <algorithm>
 #include <cstring>
 #include <libxml/SAX2.h>
+#include <libxml/hash.h>
 #include <libxml/parserInternals.h>
 #include <mutex>
 #include <new>
+#include <utility>
 
 namespace qx {
 
 namespace {
 
-// Up to these the C parser keeps its own, stricter checks; beyond, ours alone hold.
-constexpr std::size_t parsersDepth = 256;
-constexpr std::size_t parsersTextSize = 10'000'000;
-
 // What entities and attribute defaults may add to a document.
 constexpr std::size_t freeExpansion = 1'000'000;
-constexpr std::size_t expansionFactor = 10;
+constexpr std::size_t expansionFactor = 5;
 
 // The parser compares each default of an element with its other attributes, at each such element.
 constexpr std::size_t maximumAttributeDefaults = 2000;
-
-// Declarations bring names into the parser's table, which gets slow with very many.
-constexpr std::size_t maximumDeclarations = 20'000;
+constexpr std::size_t comparisonsPerByte = 64; // in the account of expansions
 
 // What a node and a reference cost beside their text, in the account of expansions.
 constexpr std::size_t nodeCost = 16;
@@ -41,7 +37,10 @@ std::string_view viewOf(const xmlChar* text) {
     return text != nullptr ? std::string_view(reinterpret_cast<const char*>(text)) : "";
 }
 
+// Without memory the parser has nothing where a text starts.
 std::string_view viewOf(const xmlChar* from, const xmlChar* to) {
+    if (from == nullptr)
+        throw std::bad_alloc();
     return {reinterpret_cast<const char*>(from), static_cast<std::size_t>(to - from)};
 }
 
@@ -51,9 +50,45 @@ ParseFailure failureOf(const xmlError& error, std::size_t offset) {
     while (!message.empty() && isWhite(message.back()))
         message.pop_back();
     std::replace(message.begin(), message.end(), '\n', ' ');
-    if (error.code == XML_ERR_ENTITY_LOOP)
-        return ParseFailure(parseErrors::loopOrExpansion, {message}, offset);
     return {error.code, message, offset};
+}
+
+bool isParameter(int type) {
+    return type == XML_INTERNAL_PARAMETER_ENTITY || type == XML_EXTERNAL_PARAMETER_ENTITY;
+}
+
+xmlEntityPtr declared(xmlDoc* document, const xmlChar* name, int type) {
+    return isParameter(type) ? xmlGetParameterEntity(document, name)
+                             : xmlGetDocEntity(document, name);
+}
+
+// Older parsers without memory for the URI of a namespace say that it is empty.
+bool hidesMemory(const xmlError& error) {
+#if LIBXML_VERSION < 21200
+    if (error.code != XML_NS_ERR_XML_NAMESPACE || error.str1 == nullptr || error.ctxt == nullptr)
+        return false;
+    const xmlParserInput& input = *static_cast<xmlParserCtxt*>(error.ctxt)->input;
+    const std::string_view read = viewOf(input.base, input.cur);
+    if (read.size() < 2)
+        return false;
+    // The parser stands behind the closing quote.
+    const std::size_t opening = read.rfind(read.back(), read.size() - 2);
+    const std::string_view value = read.substr(opening + 1, read.size() - opening - 2);
+    return !isWhite(value) && value.find('&') == std::string_view::npos;
+#else
+    return false;
+#endif
+}
+
+// The parser keeps some state for each thread, and does not survive when it cannot.
+void requireThreadState() {
+#if LIBXML_VERSION >= 21200
+    const bool isThere = xmlCheckThreadLocalStorage() == 0;
+#else
+    const bool isThere = xmlGetGlobalState() != nullptr;
+#endif
+    if (!isThere)
+        throw std::bad_alloc();
 }
 
 } // namespace
@@ -74,7 +109,7 @@ struct SAXSession::Callbacks {
             self.stop(std::move(failure));
         } catch (...) {
             self._exception = std::current_exception();
-            xmlStopParser(self._context.get());
+            self.stop();
         }
     }
 
@@ -83,33 +118,38 @@ struct SAXSession::Callbacks {
     }
     static void internalSubset(void* user, const xmlChar* name, const xmlChar* publicID,
                                const xmlChar* systemID) {
-        xmlSAX2InternalSubset(session(user)._context.get(), name, publicID, systemID);
+        guarded(user, [&](SAXSession& self) { self.startSubset(name, publicID, systemID); });
+    }
+    static void externalSubset(void* user, const xmlChar*, const xmlChar*, const xmlChar*) {
+        guarded(user, [](SAXSession& self) { self.endSubset(); });
     }
     static void entityDeclaration(void* user, const xmlChar* name, int type,
                                   const xmlChar* publicID, const xmlChar* systemID,
                                   xmlChar* content) {
-        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
-        xmlSAX2EntityDecl(session(user)._context.get(), name, type, publicID, systemID, content);
+        guarded(user, [&](SAXSession& self) {
+            self.declareEntity(name, type, publicID, systemID, content);
+        });
     }
     static void unparsedEntityDeclaration(void* user, const xmlChar* name, const xmlChar* publicID,
                                           const xmlChar* systemID, const xmlChar* notation) {
-        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
-        xmlSAX2UnparsedEntityDecl(session(user)._context.get(), name, publicID, systemID, notation);
-    }
-    static void attributeDeclaration(void* user, const xmlChar*, const xmlChar*, int, int,
-                                     const xmlChar* defaultValue, xmlEnumerationPtr values) {
-        xmlFreeEnumeration(values);
         guarded(user, [&](SAXSession& self) {
-            self.countDeclaration();
-            if (defaultValue != nullptr)
-                self.countAttributeDefault();
+            xmlSAX2UnparsedEntityDecl(self._context.get(), name, publicID, systemID, notation);
         });
     }
-    static void elementDeclaration(void* user, const xmlChar*, int, xmlElementContentPtr) {
-        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
+    static void attributeDeclaration(void* user, const xmlChar* element, const xmlChar* name, int,
+                                     int, const xmlChar* defaultValue, xmlEnumerationPtr values) {
+        xmlFreeEnumeration(values);
+        guarded(user, [&](SAXSession& self) {
+            self.declareAttribute(viewOf(element), viewOf(name), defaultValue);
+        });
     }
-    static void notationDeclaration(void* user, const xmlChar*, const xmlChar*, const xmlChar*) {
-        guarded(user, [](SAXSession& self) { self.countDeclaration(); });
+    // The parser leaves it to this callback to refuse one.
+    static void notationDeclaration(void* user, const xmlChar* name, const xmlChar* publicID,
+                                    const xmlChar* systemID) {
+        guarded(user, [&](SAXSession&) {
+            if (publicID == nullptr && systemID == nullptr)
+                throw ParseFailure(parseErrors::notationWithoutIdentifier, {viewOf(name)});
+        });
     }
     static xmlEntityPtr entity(void* user, const xmlChar* name) {
         xmlEntityPtr found = nullptr;
@@ -136,9 +176,7 @@ struct SAXSession::Callbacks {
         guarded(user, [&](SAXSession& self) { self.addText(viewOf(text, text + length)); });
     }
     static void cdata(void* user, const xmlChar* text, int length) {
-        guarded(user, [&](SAXSession& self) {
-            self._builder.addText(viewOf(text, text + length), false, false);
-        });
+        guarded(user, [&](SAXSession& self) { self.addCDATA(viewOf(text, text + length)); });
     }
     static void comment(void* user, const xmlChar* text) {
         guarded(user, [&](SAXSession& self) {
@@ -159,10 +197,10 @@ struct SAXSession::Callbacks {
         handler.initialized = XML_SAX2_MAGIC;
         handler.startDocument = startDocument;
         handler.internalSubset = internalSubset;
+        handler.externalSubset = externalSubset;
         handler.entityDecl = entityDeclaration;
         handler.unparsedEntityDecl = unparsedEntityDeclaration;
         handler.attributeDecl = attributeDeclaration;
-        handler.elementDecl = elementDeclaration;
         handler.notationDecl = notationDeclaration;
         handler.getEntity = entity;
         handler.getParameterEntity = parameterEntity;
@@ -173,11 +211,6 @@ struct SAXSession::Callbacks {
         handler.cdataBlock = cdata;
         handler.comment = comment;
         handler.processingInstruction = processingInstruction;
-        // The error's constness differs among the parser's versions.
-        handler.serror = [](void* user, auto* error) {
-            if (error != nullptr)
-                guarded(user, [&](SAXSession& self) { self.report(*error); });
-        };
         return handler;
     }
 };
@@ -188,18 +221,31 @@ void SAXSession::ContextDeleter::operator()(xmlParserCtxt* context) const noexce
     xmlFreeParserCtxt(context);
 }
 
-SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLParseOptions& options)
-    : _text(text), _document(document), _builder(document, options), _position(text) {
+SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
+    requireThreadState();
+    _function = xmlStructuredError;
+    _user = xmlStructuredErrorContext;
+    // The error's constness differs among the parser's versions.
+    xmlSetStructuredErrorFunc(&session, [](void* user, auto* error) {
+        if (error != nullptr)
+            Callbacks::guarded(user, [&](SAXSession& self) { self.report(*error); });
+    });
     static std::once_flag initialized;
     std::call_once(initialized, xmlInitParser);
+}
+
+SAXSession::ErrorChannel::~ErrorChannel() { xmlSetStructuredErrorFunc(_user, _function); }
+
+SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLParseOptions& options)
+    : _text(text), _refusesDoctype(options.refuseDoctype), _document(document),
+      _builder(document, options), _position(text), _subset(options.maximumSubsetSize),
+      _texts(text), _channel(*this) {
     _context.reset(xmlNewParserCtxt());
-    if (_context == nullptr)
+    if (_context == nullptr || _lacksMemory)
         throw std::bad_alloc();
     pushInput();
-    int flags = XML_PARSE_NOENT | XML_PARSE_NONET | XML_PARSE_IGNORE_ENC;
-    if (options.maximumDepth > parsersDepth || options.maximumTextSize > parsersTextSize)
-        flags |= XML_PARSE_HUGE;
-    xmlCtxtUseOptions(_context.get(), flags);
+    xmlCtxtUseOptions(_context.get(),
+                      XML_PARSE_NOENT | XML_PARSE_NONET | XML_PARSE_IGNORE_ENC | XML_PARSE_HUGE);
     *_context->sax = Callbacks::handler();
     // Were it the context itself, the parser would look up and open external entities on its own.
     _context->userData = this;
@@ -229,24 +275,51 @@ void SAXSession::pushInput() {
     throw std::bad_alloc();
 }
 
+// Where memory lacks the parser may go on without the thing that it could not make. A document that
+// it has read to the end has a root, and every element of it has ended.
 void SAXSession::run() {
     xmlParseDocument(_context.get());
     if (_exception)
         std::rethrow_exception(_exception);
-    if (!_failure && _context->wellFormed == 0)
-        _failure = failureOf(_context->lastError, offset());
+    if (_lacksMemory)
+        throw std::bad_alloc();
     if (_failure)
         throw ParseFailure(*_failure);
+    if (_context->wellFormed == 0 || !_builder.isComplete())
+        throw std::bad_alloc();
 }
 
 void SAXSession::startDocument() {
     xmlSAX2StartDocument(_context.get());
+    if (_context->myDoc == nullptr)
+        throw std::bad_alloc();
     const int standalone = _context->standalone;
     if (!_text.starts_with("<?xml") || _text.size() == 5 || !isWhite(_text[5]))
         return;
     _document.setVersion(viewOf(_context->version));
     if (standalone == 0 || standalone == 1)
         _document.setStandalone(standalone == 1 ? "yes" : "no");
+}
+
+// The parser stands at the bracket, if there is one.
+void SAXSession::startSubset(const xmlChar* name, const xmlChar* publicID,
+                             const xmlChar* systemID) {
+    if (_refusesDoctype)
+        throw ParseFailure(parseErrors::doctypeRefused);
+    _subset.read(_text.substr(offset()));
+    xmlSAX2InternalSubset(_context.get(), name, publicID, systemID);
+    if (_context->myDoc->intSubset == nullptr)
+        throw std::bad_alloc();
+}
+
+// Also called for a document that has no external subset.
+void SAXSession::endSubset() {
+    _context->sax2 = 1;
+#if LIBXML_VERSION < 21200
+    const int known = _context->attsSpecial != nullptr ? xmlHashSize(_context->attsSpecial) : 0;
+    if (static_cast<std::size_t>(known) != _attributes.size())
+        throw std::bad_alloc();
+#endif
 }
 
 // The parser stands behind the tag's last attribute. Inside a tag there is no other "<"; where the
@@ -270,6 +343,11 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
     for (int i = 0; i < attributeCount; ++i) {
         const xmlChar** const attribute = attributes + 5 * i;
         const std::string_view value = viewOf(attribute[3], attribute[4]);
+        if (_texts.isMarked(value)) {
+            _builder.addAttribute(_names.named(attribute[0], attribute[1]),
+                                  _texts.unmarked(value, ' '));
+            continue;
+        }
         if (attribute[0] == _space && attribute[1] == _xml)
             _builder.setPreservesSpace(value == "preserve");
         _builder.addAttribute(_names.named(attribute[0], attribute[1]), value);
@@ -281,50 +359,129 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
 // a reference. Most pieces are parts of the document's text; the parser hands others out while it
 // stands behind them, or behind the reference.
 void SAXSession::addText(std::string_view piece) {
+    if (_texts.isMarked(piece))
+        return _builder.addText(_texts.unmarked(piece, '\r'), false, false);
     const bool isOwn = addressOf(piece.data()) - addressOf(_text.data()) < _text.size();
-    _builder.addText(piece, isOwn || !isInsideReference(), isOwn);
+    try {
+        _builder.addText(piece, isOwn || !isInsideReference(), isOwn);
+    } catch (ParseFailure& failure) {
+        // Versions of the parser differ in where they stand meanwhile.
+        if (isOwn)
+            failure.offset = addressOf(piece.data()) - addressOf(_text.data());
+        throw;
+    }
+}
+
+void SAXSession::addCDATA(std::string_view piece) {
+    if (_texts.isMarked(piece))
+        return _builder.addText(_texts.unmarked(piece, '\r'), false, false);
+    _builder.addText(piece, false, false);
+}
+
+// The first declaration of a name counts.
+void SAXSession::declareEntity(const xmlChar* name, int type, const xmlChar* publicID,
+                               const xmlChar* systemID, const xmlChar* content) {
+    xmlDoc* const document = _context->myDoc;
+    const bool isNew = declared(document, name, type) == nullptr;
+    std::string text(viewOf(content));
+    if (type == XML_INTERNAL_GENERAL_ENTITY)
+        text = _texts.prepared(text);
+    xmlSAX2EntityDecl(_context.get(), name, type, publicID, systemID,
+                      content != nullptr ? reinterpret_cast<xmlChar*>(text.data()) : nullptr);
+    const xmlEntity* const made = declared(document, name, type);
+    if (made == nullptr || (isNew && viewOf(made->content) != text))
+        throw std::bad_alloc();
+    if (isNew && _hasUnread)
+        _uncertain.insert(made);
+    if (content != nullptr)
+        _justDeclared = name;
+}
+
+// The parser looks an entity up once more after it has declared it.
+bool SAXSession::isJustDeclared(const xmlChar* name) noexcept {
+    return std::exchange(_justDeclared, nullptr) == name;
 }
 
 xmlEntityPtr SAXSession::entity(const xmlChar* name) {
+    const bool isInSubset = _context->inSubset != 0;
     xmlEntityPtr found = xmlGetDocEntity(_context->myDoc, name);
-    if (found == nullptr || found->etype == XML_INTERNAL_PREDEFINED_ENTITY)
+    if (isJustDeclared(name))
         return found;
-    if (found->etype == XML_EXTERNAL_GENERAL_PARSED_ENTITY) {
-        if (_context->inSubset != 0)
+    if (found == nullptr || _uncertain.contains(found)) {
+        if (isInSubset && _hasUnread) // of a default that does not count either
             return nullptr;
-        throw ParseFailure(parseErrors::externalEntity, {viewOf(name)});
+        throw ParseFailure(parseErrors::undeclaredEntity, {viewOf(name)});
     }
+    if (found->etype == XML_EXTERNAL_GENERAL_PARSED_ENTITY && !isInSubset)
+        throw ParseFailure(parseErrors::externalEntity, {viewOf(name)});
+    if (found->etype != XML_INTERNAL_GENERAL_ENTITY)
+        return found;
+    _texts.requireFlat(_context->myDoc, *found);
     countExpansion(static_cast<std::size_t>(found->length) + referenceCost);
     return found;
 }
 
-// An external one is left out, as a parser that does not validate may. The parser then goes on as
-// for any document that it has not read all declarations of.
+// An external one is left out, as a parser that does not validate may. Unless the document stands
+// alone, what is declared behind it does not count then; to the parser itself defaults and types of
+// attributes belong to the way in which it reports elements.
 xmlEntityPtr SAXSession::parameterEntity(const xmlChar* name) {
     xmlEntityPtr found = xmlGetParameterEntity(_context->myDoc, name);
-    if (found == nullptr)
+    if (isJustDeclared(name))
+        return found;
+    if (found == nullptr || _uncertain.contains(found))
         return nullptr;
     if (found->etype == XML_EXTERNAL_PARAMETER_ENTITY) {
-        _context->hasPErefs = 1;
-        return nullptr;
+        if (_context->standalone != 1) {
+            _hasUnread = true;
+            _context->sax2 = 0;
+        }
+        return emptyEntity();
     }
-    countExpansion(static_cast<std::size_t>(found->length) + referenceCost);
+    _subset.expand(static_cast<std::size_t>(found->length) + referenceCost);
     return found;
 }
 
-void SAXSession::countDeclaration() {
-    if (++_declarations > maximumDeclarations)
-        throw ParseFailure(parseErrors::tooManyDeclarations, {maximumDeclarations});
+// Stands in for one that is not read: what the parser makes of none differs among its versions.
+xmlEntityPtr SAXSession::emptyEntity() {
+    const auto* const name = reinterpret_cast<const xmlChar*>(" "); // that no reference can have
+    xmlEntityPtr empty = xmlGetParameterEntity(_context->myDoc, name);
+    if (empty == nullptr)
+        empty = xmlAddDocEntity(_context->myDoc, name, XML_INTERNAL_PARAMETER_ENTITY, nullptr,
+                                nullptr, reinterpret_cast<const xmlChar*>(""));
+    if (empty == nullptr || empty->content == nullptr)
+        throw std::bad_alloc();
+    return empty;
 }
 
-void SAXSession::countAttributeDefault() {
+// What is declared behind an unread entity leaves no trace in the parser.
+void SAXSession::declareAttribute(std::string_view element, std::string_view name,
+                                  const xmlChar* defaultValue) {
+    if (_context->sax2 == 0)
+        return;
+    _attributes.insert(std::string(element).append(1, ' ').append(name));
+    if (defaultValue == nullptr)
+        return;
     if (++_attributeDefaults > maximumAttributeDefaults)
         throw ParseFailure(parseErrors::tooManyDefaults, {maximumAttributeDefaults});
+    provide(element);
+    provide(name);
+    provide(viewOf(defaultValue));
+}
+
+// Older parsers do not notice that they find no memory for a part of a default: they have each in
+// their table beforehand.
+void SAXSession::provide(std::string_view name) {
+    const std::size_t colon = name.find(':');
+    for (const std::string_view part : {name, name.substr(0, colon), name.substr(colon + 1)})
+        if (xmlDictLookup(_context->dict, reinterpret_cast<const xmlChar*>(part.data()),
+                          static_cast<int>(part.size())) == nullptr)
+            throw std::bad_alloc();
 }
 
 void SAXSession::countDefaulted(int namespaceCount, const xmlChar** namespaces, int defaultedCount,
                                 const xmlChar** defaulted) {
-    std::size_t bytes = 0;
+    const auto defaults = static_cast<std::size_t>(defaultedCount);
+    std::size_t bytes = defaults * defaults / comparisonsPerByte;
     for (int i = 0; i < namespaceCount; ++i)
         bytes += lengthOf(namespaces[2 * i]) + lengthOf(namespaces[2 * i + 1]) + nodeCost;
     for (int i = 0; i < defaultedCount; ++i)
@@ -340,15 +497,21 @@ void SAXSession::countExpansion(std::size_t bytes) {
         throw ParseFailure(parseErrors::expansionTooLarge, {limit});
 }
 
-// The parser goes on after an error to find more; only the first one counts. Undeclared prefixes
-// and the like are errors too, but leave the document well-formed. An entity that may be declared
-// where we do not look must be refused: its text would be missing.
+// Undeclared prefixes and the like are errors too, but leave the document well-formed. An error has
+// no message where there was no memory for one.
 void SAXSession::report(const xmlError& error) {
-    if (error.code == XML_ERR_NO_MEMORY)
-        throw std::bad_alloc();
-    if (error.level == XML_ERR_FATAL ||
-        (error.level == XML_ERR_ERROR && error.code == XML_WAR_UNDECLARED_ENTITY))
-        _failure = failureOf(error, offset());
+    if (error.code == XML_ERR_NO_MEMORY || error.message == nullptr || hidesMemory(error)) {
+        _lacksMemory = true;
+        return stop();
+    }
+    if (error.level != XML_ERR_FATAL)
+        return;
+        // Older parsers read the text of an entity in a context of its own.
+#if LIBXML_VERSION < 21200
+    if (error.ctxt != nullptr)
+        static_cast<xmlParserCtxt*>(error.ctxt)->instate = XML_PARSER_EOF;
+#endif
+    stop(failureOf(error, offset()));
 }
 
 std::size_t SAXSession::offset() const noexcept {
@@ -367,7 +530,12 @@ void SAXSession::stop(ParseFailure failure) noexcept {
     if (failure.offset == ParseFailure::here)
         failure.offset = _tagOffset != ParseFailure::here ? _tagOffset : offset();
     _failure = std::move(failure);
-    xmlStopParser(_context.get());
+    stop();
+}
+
+void SAXSession::stop() noexcept {
+    if (_context != nullptr)
+        xmlStopParser(_context.get());
 }
 
 } // namespace qx

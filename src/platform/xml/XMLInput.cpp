@@ -2,6 +2,7 @@
 
 #include "platform/xml/Encoding.h"
 #include "platform/xml/ParseFailure.h"
+#include "platform/xml/StartTags.h"
 #include "platform/xml/XMLCharacters.h"
 
 #include <algorithm>
@@ -10,11 +11,6 @@
 namespace qx {
 
 namespace {
-
-// The parser compares each attribute of a start tag with all others. Tags shorter than this cannot
-// hold enough of them to matter, and are not looked at.
-constexpr std::size_t longStartTag = 16 * 1024;
-constexpr std::size_t maximumAttributes = 4096;
 
 constexpr std::string_view declarationStart = "<?xml";
 
@@ -46,27 +42,6 @@ String encodingInDeclaration(std::string_view text) {
     return text.substr(1, end - 1);
 }
 
-// Attributes in a tag, or in what a declaration might turn into one. Text has no quotes to heed.
-std::size_t countAttributes(std::string_view tag) {
-    if (tag.starts_with("<!--") || tag.starts_with("<![CDATA[") || tag.starts_with("<?") ||
-        tag.starts_with("</"))
-        return 0;
-    const bool isDeclaration = tag.starts_with("<!");
-    std::size_t count = 0;
-    char quote = '\0';
-    for (const char c : tag) {
-        if (c == '=' && (quote == '\0' || isDeclaration))
-            ++count;
-        else if (quote != '\0')
-            quote = c == quote ? '\0' : quote;
-        else if (c == '"' || c == '\'')
-            quote = c;
-        else if (c == '>')
-            break;
-    }
-    return count;
-}
-
 } // namespace
 
 void XMLInput::read(XMLBytes bytes) {
@@ -74,7 +49,9 @@ void XMLInput::read(XMLBytes bytes) {
     checkStart();
     if (!isConverted && !bytes.isTerminated())
         _text = _converted = _text;
-    checkStartTags();
+    const std::size_t tag = findTagBeyond(_text, maximumAttributes);
+    if (tag != std::string_view::npos)
+        throw ParseFailure(parseErrors::tooManyAttributes, {maximumAttributes}, tag);
 }
 
 bool XMLInput::decodeBytes(std::string_view bytes) {
@@ -120,27 +97,6 @@ void XMLInput::checkStart() const {
     const std::size_t zero = _text.find('\0');
     if (zero != std::string_view::npos)
         throw ParseFailure(parseErrors::zeroByte, {}, zero);
-}
-
-// Only tags can have no "<" inside for long and matter here; so it is enough to look for the last
-// "<" of each stretch of text, and to walk through stretches that have none.
-void XMLInput::checkStartTags() const {
-    std::size_t tag = 0;   // the last "<" found
-    std::size_t known = 1; // there is none between it and here
-    while (_text.size() - tag >= longStartTag) {
-        const std::size_t last = _text.substr(known, tag + longStartTag - known).rfind('<');
-        if (last != std::string_view::npos) {
-            const std::size_t found = known + last;
-            known = tag + longStartTag;
-            tag = found;
-            continue;
-        }
-        const std::size_t next = std::min(_text.find('<', tag + longStartTag), _text.size());
-        if (countAttributes(_text.substr(tag, next - tag)) > maximumAttributes)
-            throw ParseFailure(parseErrors::tooManyAttributes, {maximumAttributes}, tag);
-        tag = next;
-        known = next + 1;
-    }
 }
 
 } // namespace qx

@@ -30,7 +30,6 @@ private:
     bool decodeBytes(std::string_view bytes);
     void convert(std::string_view bytes, const String& encoding);
     void checkStart() const;
-    void checkStartTags() const;
 
     std::string_view _text;
     std::string _converted;

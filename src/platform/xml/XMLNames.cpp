@@ -2,6 +2,8 @@
 
 #include "platform/xml/ParseFailure.h"
 
+#include <new>
+
 namespace qx {
 
 namespace {
@@ -13,6 +15,8 @@ std::string_view viewOf(XMLNames::Name name) {
 } // namespace
 
 const String& XMLNames::add(Name local, Name prefix) {
+    if (local == nullptr) // the parser had no memory for it
+        throw std::bad_alloc();
     if (_count >= maximumNames)
         throw ParseFailure(parseErrors::tooManyNames, {maximumNames});
     String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})

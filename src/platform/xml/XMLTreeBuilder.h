@@ -28,6 +28,8 @@ public:
     void addAttribute(const String& name, std::string_view value);
     void setPreservesSpace(bool preserves) { _open.back().preservesSpace = preserves; }
     void endElement();
+    // Whether there is a root, and every element has ended.
+    bool isComplete() const noexcept { return _open.empty() && _document.rootElement() != nullptr; }
 
     // A piece of text. `mayBeLayout`: white space would be the document's own, not a reference's;
     // `isLasting`: the piece stays where it is until the document is finished.

@@ -2,8 +2,12 @@
 
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include <algorithm>
+#include <ctime>
 #include <functional>
 #include <gtest/gtest.h>
+
+#include "platform/xml/ParseFailure.h"
 
 namespace {
 
@@ -13,15 +17,27 @@ using qx::XMLElement;
 using qx::XMLNode;
 using namespace std::string_literals;
 
-// The document as XML, or its error as "line:column code message".
+// The library's own texts; those of the C parser differ among its versions.
+bool isOurs(const qx::Error& error) {
+    const auto& texts = qx::parseErrors::table;
+    return std::any_of(texts.begin(), texts.end(), [&](const qx::ErrorText* text) {
+        const std::string_view message = text->message;
+        return error.code() == text->code && error.localizedDescription().view().starts_with(
+                                                 message.substr(0, message.find("%@")));
+    });
+}
+
+// The document as XML, or its error as "line:column code", with the message when it is ours.
 std::string outcome(qx::XMLBytes bytes, const qx::XMLParseOptions& options = {}) {
     Ref<qx::Error> error;
     const auto document = XMLDocument::initWithData(bytes, options, &error);
     if (document)
         return document->XMLString().str();
     EXPECT_EQ(error->domain(), qx::Error::parserDomain);
+    EXPECT_FALSE(error->localizedDescription().isEmpty());
     return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
-           std::to_string(error->code()) + " " + error->localizedDescription().str();
+           std::to_string(error->code()) +
+           (isOurs(*error) ? " " + error->localizedDescription().str() : "");
 }
 
 struct Case {
@@ -58,36 +74,48 @@ TEST(XMLParser, WhatTheDocumentSaysComesIntoTheTree) {
         {"<!DOCTYPE a [<!ATTLIST a b CDATA 'd' c (x|y) 'y' xmlns CDATA 'u'>]><a c='x'/>",
          "<a xmlns=\"u\" c=\"x\" b=\"d\"></a>"},
         {"<!DOCTYPE a SYSTEM 'nowhere.dtd'><a/>", "<a></a>"},
-        {"<!DOCTYPE a [<!ENTITY % e SYSTEM 'nowhere.dtd'> %e;]><a/>", "<a></a>"},
+        // Behind what is not read no declaration counts, unless the document stands alone.
+        {"<!DOCTYPE a [<!ATTLIST a b CDATA '1'><!ENTITY % e SYSTEM 'nowhere.dtd'> %e;%e; %x; "
+         "<!ATTLIST a c CDATA '2' d NMTOKENS #IMPLIED xmlns:f CDATA 'u'>]><a d=' 3 '/>",
+         "<a d=\" 3 \" b=\"1\"></a>"},
+        {"<?xml version='1.0' standalone='yes'?><!DOCTYPE a [<!ENTITY % e SYSTEM 'x'> %e; "
+         "<!ATTLIST a c CDATA '2'>]><a/>",
+         "<?xml version=\"1.0\" standalone=\"yes\"?><a c=\"2\"></a>"},
+        // A carriage return that a reference brings is white space in a tag, text elsewhere.
+        {"<!DOCTYPE a [<!ENTITY e '&#13;&#10;'><!ENTITY f '<b&#13;c=\"x&#13;\">"
+         "<![CDATA[&#13;]]>&#38;#13;<?p q?></b>'>]><a b='&e;'>&e;&f;&#xFDD0;</a>",
+         "<a b=\"  \">&#13;&#10;<b c=\"x \">&#13;&#13;<?p q?></b>\xEF\xB7\x90</a>"},
+        {"<!DOCTYPE a [<!ATTLIST a b (x|x) #IMPLIED>]><a/>", "<a></a>"},
     });
 }
 
 TEST(XMLParser, WhatIsNoXMLIsAnErrorWithItsPlace) {
     run({
         {"", "1:1 4 The document is empty"},
-        {"  \n", "2:1 4 Start tag expected, '<' not found"},
+        {"  \n", "2:1 4"},
         {"hello", "1:1 3 Start tag expected, '<' not found"},
-        {"<a>", "1:4 77 Premature end of data in tag a line 1"},
-        {"<a>\n <b></a>", "2:9 76 Opening and ending tag mismatch: b line 2 and a"},
-        {"<a b='1' b='2'/>", "1:15 42 Attribute b redefined"},
-        {"<a b=1/>", "1:6 39 AttValue: \" or ' expected"},
-        {"<a/><b/>", "1:5 5 Extra content at the end of the document"},
-        {"<a>&x;</a>", "1:7 26 Entity 'x' not defined"},
-        {"<a>\x01</a>", "1:4 9 PCDATA invalid Char value 1"},
+        {"<a>", "1:4 77"},
+        {"<a>\n <b></a>", "2:9 76"},
+        {"<a b='1' b='2'/>", "1:15 42"},
+        {"<a b=1/>", "1:6 39"},
+        {"<a/><b/>", "1:5 5"},
+        {"<a>&x;</a>", "1:7 26 The entity x is not declared"},
+        {"<a>\x01</a>", "1:4 9"},
         {"<a>\0</a>"s, "1:4 9 The document holds a zero byte"},
         {"<a/>\0"s, "1:5 9 The document holds a zero byte"},
-        {"\xEF\xBB\xBF<a>\xC3\xA9<b</a>", "1:7 68 error parsing attribute name"},
-        {"<a>\xC3(</a>",
-         "1:4 9 Input is not proper UTF-8, indicate encoding ! Bytes: 0xC3 0x28 0x3C 0x2F"},
-        {"<!DOCTYPE a SYSTEM 'x'><a>&x;</a>", "1:30 27 Entity 'x' not defined"},
-        {"<!DOCTYPE a SYSTEM 'x'><a b='&x;'/>", "1:33 27 Entity 'x' not defined"},
+        {"\xEF\xBB\xBF<a>\xC3\xA9<b</a>", "1:7 68"},
+        {"<a>\xC3(</a>", "1:4 9"},
+        {"<!DOCTYPE a SYSTEM 'x'><a>&x;</a>", "1:30 26 The entity x is not declared"},
+        {"<!DOCTYPE a SYSTEM 'x'><a b='&x;'/>", "1:33 26 The entity x is not declared"},
         {"<!DOCTYPE a [<!ENTITY e SYSTEM '/etc/passwd'>]><a>&e;</a>",
          "1:54 29 The entity e stands outside of the document and is not read"},
         {"<!DOCTYPE a [<!ENTITY e PUBLIC 'p' 'file:///etc/passwd'>]><a b='&e;'/>",
          "1:68 29 The entity e stands outside of the document and is not read"},
         {"<!DOCTYPE a [<!ENTITY e '&e;'>]><a>&e;</a>",
-         "1:39 89 Detected an entity reference loop, or entities that bring in more than 10 times "
-         "what the document holds"},
+         "1:39 89 Entities refer to themselves, or nest deeper than the limit of 32"},
+        {"<!DOCTYPE a [<!NOTATION n >]><a/>", "1:28 105 The notation n has no identifier"},
+        {"<!DOCTYPE a [<!ENTITY % e SYSTEM 'x'>%e;<!ENTITY f 'y'>]><a>&f;</a>",
+         "1:64 26 The entity f is not declared"},
     });
 }
 
@@ -174,67 +202,117 @@ TEST(XMLParser, BeyondALimitIsAnErrorThatNamesIt) {
 }
 
 TEST(XMLParser, RaisedLimitsGoBeyondTheParsersOwn) {
-    const std::string deep = repeated("<a>", 5000) + repeated("</a>", 5000);
-    EXPECT_EQ(outcome(deep, {.maximumDepth = 5000}).size(), deep.size());
-    EXPECT_EQ(outcome("<a>" + deep + "</a>", {.maximumDepth = 5000}),
-              "1:15001 1 Elements nest deeper than the limit of 5000");
+    const std::string deep = repeated("<a>", 2000) + repeated("</a>", 2000);
+    EXPECT_EQ(outcome(deep, {.maximumDepth = 2000}).size(), deep.size());
+    EXPECT_EQ(outcome("<a>" + deep + "</a>", {.maximumDepth = 2000}),
+              "1:6001 1 Elements nest deeper than the limit of 2000");
     const std::string wide =
         "<a b=\"" + repeated("x", 10'500'000) + "\">" + repeated("y", 10'500'000) + "</a>";
     EXPECT_EQ(outcome(wide, {.maximumTextSize = 11'000'000}).size(), wide.size());
 }
 
-// Each level doubles ten times; the innermost would be met ten thousand million times.
-std::string laughs(const std::string& innermost, const std::string& root) {
-    std::string text = "<!DOCTYPE a [<!ENTITY e0 \"" + innermost + "\">";
-    for (int i = 1; i <= 10; ++i)
-        text += "<!ENTITY e" + std::to_string(i) + " \"" +
-                repeated("&e" + std::to_string(i - 1) + ";", 10) + "\">";
-    return text + "]>" + root;
-}
-
-TEST(XMLParser, EntitiesCannotBlowUp) {
-    const std::string flat = "<!DOCTYPE a [<!ENTITY e '" + repeated("x", 10'000) + "'>]><a>" +
-                             repeated("&e;", 10'000) + "</a>";
-    const std::string cases[] = {
-        laughs("lol lol lol", "<a>&e10;</a>"), laughs("", "<a>&e10;</a>"),
-        laughs("<b/>", "<a b='x'>&e10;</a>"),  laughs("lol", "<a b='&e10;'/>"),
-        laughs("", "<a b='&e10;'/>"),          flat};
-    const qx::XMLParseOptions raised{.maximumDepth = 1000, .maximumTextSize = 1'000'000'000};
-    for (const std::string& document : cases) {
-        EXPECT_NE(outcome(document).find(" 89 "), std::string::npos) << document.substr(0, 200);
-        EXPECT_NE(outcome(document, raised).find(" 89 "), std::string::npos)
-            << document.substr(0, 200);
-    }
-}
-
-TEST(XMLParser, NamesAndDeclarationsCannotBlowUp) {
-    std::string defaults, attributes, namespaces, names, entities;
-    for (int i = 0; i <= 100'000; ++i) {
+// What each number from 0 on adds, together with the one before it.
+template <class Text>
+std::string joined(int count, Text text) {
+    std::string all;
+    for (int i = 0; i < count; ++i) {
         const std::string number = std::to_string(i);
-        names += "\n<b" + number + "/>";
-        if (i <= 20'000)
-            entities += "\n<!ENTITY b" + number + " 'x'>";
-        if (i < 5000) {
-            defaults += " a" + number + " CDATA 'v'";
-            attributes += " a" + number + "='='";
-        }
-        if (i < 2000)
-            namespaces += " xmlns:n" + number + "='u'";
+        const std::string before = std::to_string(i - 1);
+        all += text(number, before);
     }
-    const std::string some = defaults.substr(0, defaults.find(" a1000 "));
-    run({{"<!DOCTYPE a [<!ATTLIST a " + defaults + ">]><a/>",
-          "1:30933 1 More attributes have defaults than the limit of 2000"},
-         {"<!DOCTYPE r [<!ATTLIST a " + some + ">]><r>" + repeated("<a/>", 1000),
-          "1:15146 89 Entities and attribute defaults bring in more than the limit of 1189210 "
-          "bytes"},
-         {"<r>\n" + repeated("x", 40'000) + "<a" + attributes + "/></r>",
-          "2:40001 1 An element has more attributes than the limit of 4096"},
-         {"<r>\n<a" + namespaces + "/></r>",
-          "2:1 1 More namespace declarations are in force than the limit of 1000"},
-         {"<a>" + names,
-          "100001:1 1 The document has more different names than the limit of 100000"},
-         {"<!DOCTYPE a [" + entities + "]><a/>",
-          "20002:20 1 The document has more declarations than the limit of 20000"}});
+    return all;
+}
+
+std::string withSubset(const std::string& subset, const std::string& root) {
+    return "<!DOCTYPE a [" + subset + "]>" + root;
+}
+
+// Entities of which each refers ten times to the one before it.
+std::string laughs(const std::string& innermost, const std::string& kind = "") {
+    const std::string reference = kind.empty() ? "&e" : "&#37;e";
+    return joined(10, [&](const std::string& number, const std::string& before) {
+        return "<!ENTITY " + kind + "e" + number + " \"" +
+               (number == "0" ? innermost : repeated(reference + before + ";", 10)) + "\">";
+    });
+}
+
+// Each of these took more than linear time or memory, in one version of the C parser or another.
+TEST(XMLParser, HostileDocumentsEndSoon) {
+    const std::string expansion = " 89 Entities and attribute defaults bring in more than";
+    const std::string subset = " 1 The DOCTYPE declares more than the limit of 65536 bytes";
+    const std::string attributes = joined(5000, [](auto& i, auto&) { return " a" + i + "='='"; });
+    const std::string few = joined(600, [](auto& i, auto&) { return " a" + i + "&#61;''"; });
+    const std::string names = joined(2500, [](auto& i, auto&) { return " a" + i + " CDATA ''"; });
+    const std::string tokens = joined(20'000, [](auto& i, auto&) { return "|t" + i; });
+    const Case cases[] = {
+        {withSubset(laughs("lol"), "<a>&e9;</a>"), expansion},
+        {withSubset(laughs(""), "<a b='&e9;'/>"), expansion},
+        {withSubset(laughs("<b/>"), "<a>&e9;</a>"), expansion},
+        {withSubset(laughs("") + "<!ATTLIST a b CDATA '&e9;'>", "<a/>"), expansion},
+        {withSubset("<!ENTITY e '" + repeated("x", 10'000) + "'>",
+                    "<a>" + repeated("&e;", 10'000) + "</a>"),
+         expansion},
+        {withSubset("<!ENTITY e '<b/>'>", "<a>" + repeated("&e;", 60'000) + "</a>"), expansion},
+        {withSubset("<!ATTLIST a" + names.substr(0, names.find(" a1999 ")) + ">",
+                    repeated("<a>\n", 200)),
+         expansion},
+        {withSubset("<!ATTLIST a" + names + ">", "<a/>"),
+         " 1 More attributes have defaults than the limit of 2000"},
+        {withSubset(laughs("", "% ") + "%e9;", "<a/>"), subset},
+        {withSubset("<!ENTITY % p '&#37;p;&#37;p;'> %p;", "<a/>"), " 89"},
+        {withSubset("<!ENTITY % p \"<!ENTITY e '&#37;p;&#37;p;'>\"> %p;", "<a/>"), " 89"},
+        {withSubset("<!ENTITY e '&f;'><!ENTITY f '&e;'>", "<a b='&e;'/>"),
+         " 89 Entities refer to themselves"},
+        {withSubset("<!ENTITY e-1 ''>" + joined(40,
+                                                [](auto& i, auto& before) {
+                                                    return "<!ENTITY e" + i + " '<b>&e" + before +
+                                                           ";</b>'>";
+                                                }),
+                    "<a>&e39;</a>"),
+         " 89 Entities refer to themselves, or nest deeper than the limit of 32"},
+        {withSubset("<!ENTITY e \"<b" + few + "/>\">", "<a>&e;</a>"),
+         " 1 An element has more attributes than the limit of 512"},
+        {withSubset("<!ATTLIST a b (x" + tokens + ") #IMPLIED>", "<a/>"), subset},
+        {withSubset("<!ENTITY % p '<!ATTLIST a b (x" + tokens.substr(0, 20'000) + ") #IMPLIED>'>" +
+                        repeated("%p;<?p?>", 1000),
+                    "<a/>"),
+         subset},
+        {withSubset("<!-- ] ' --><?p ] \" ?><!ENTITY e ']'>" + repeated(" ", 65'500), "<a/>"),
+         subset},
+        {withSubset("<!ELEMENT a " + repeated("(", 30'000) + "b" + repeated(")", 30'000) + ">",
+                    "<a/>"),
+         " 55"},
+        {"<!--" + repeated("-", 500'000) + "--><a/>", " 80"},
+        {repeated("<!-- --", 100'000) + "<a/>", " 80"},
+        {"<a><!--" + repeated("--a", 100'000) + "--></a>", " 80"},
+        {repeated("<a ", 300'000), " 68"},
+        {"<r>\n" + repeated("x", 40'000) + "<a" + attributes + "/></r>",
+         "2:40001 1 An element has more attributes than the limit of 4096"},
+        {"<r>\n<a" + joined(2000, [](auto& i, auto&) { return " xmlns:n" + i + "='u'"; }) +
+             "/></r>",
+         "2:1 1 More namespace declarations are in force than the limit of 1000"},
+        {"<a>" + joined(100'001, [](auto& i, auto&) { return "\n<b" + i + "/>"; }),
+         "100001:1 1 The document has more different names than the limit of 100000"},
+    };
+    for (const auto& [document, expected] : cases) {
+        const std::clock_t start = std::clock();
+        const std::string came = outcome(document);
+        EXPECT_LT(std::clock() - start, 2 * CLOCKS_PER_SEC) << document.substr(0, 200);
+        EXPECT_NE(came.find(expected), std::string::npos) << document.substr(0, 200) << '\n'
+                                                          << came.substr(0, 200);
+    }
+}
+
+TEST(XMLParser, TheHostSaysWhatADoctypeMayDeclare) {
+    const std::string document = withSubset("<!ENTITY % p ' '>%p;<!ENTITY e 'x'>", "<a>&e;</a>");
+    EXPECT_EQ(outcome(document, {.maximumSubsetSize = 68}), "<a>x</a>");
+    EXPECT_EQ(outcome(document, {.maximumSubsetSize = 67}),
+              "1:34 1 The DOCTYPE declares more than the limit of 67 bytes");
+    EXPECT_EQ(outcome(document, {.maximumSubsetSize = 34}),
+              "1:13 1 The DOCTYPE declares more than the limit of 34 bytes");
+    EXPECT_EQ(outcome(document, {.refuseDoctype = true}),
+              "1:13 1 The document has a DOCTYPE, which is not allowed here");
+    EXPECT_EQ(outcome("<a>&lt;</a>", {.refuseDoctype = true}), "<a>&lt;</a>");
 }
 
 TEST(XMLParser, OnlyAttributesCountAsAttributes) {

@@ -103,6 +103,11 @@ const Case cases[] = {
      {1, "",
       "qxxml: error 76: open.xml:2:17: Opening and ending tag mismatch: line line 2 and order\n"
       "qxxml: error 76: <stdin>:2:17: Opening and ending tag mismatch: line line 2 and order\n"}},
+    {"a DOCTYPE is refused when that is asked for",
+     "echo '<!DOCTYPE other [<!ENTITY e \"x\">]><other>&e;</other>' >dtd.xml; "
+     "qxxml read --no-doctype mapping.xml dtd.xml",
+     {1, "",
+      "qxxml: error 1: dtd.xml:1:17: The document has a DOCTYPE, which is not allowed here\n"}},
     {"a parse error in an include of an include names that file",
      "qxxml describe maps/outer.xml",
      {1, "",
