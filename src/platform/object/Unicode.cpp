@@ -5,6 +5,7 @@
 #include <unicode/brkiter.h>
 #include <unicode/locid.h>
 #include <unicode/unistr.h>
+#include <unicode/utf8.h>
 
 namespace qx::unicode {
 
@@ -72,6 +73,18 @@ bool equalIgnoringCase(std::string_view a, std::string_view b) {
                           [](char x, char y) { return asciiLower(x) == asciiLower(y); });
     }
     return decoded(a).caseCompare(decoded(b), U_FOLD_CASE_DEFAULT) == 0;
+}
+
+std::string_view withoutLeadingSpace(std::string_view text) noexcept {
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
+    std::size_t start = 0;
+    for (std::size_t next = 0; next < text.size(); start = next) {
+        UChar32 c = 0;
+        U8_NEXT(bytes, next, text.size(), c);
+        if (c < 0 || !u_isUWhiteSpace(c))
+            break;
+    }
+    return text.substr(start);
 }
 
 } // namespace qx::unicode
