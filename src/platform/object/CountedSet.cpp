@@ -39,8 +39,10 @@ void CountedSet::add(const String& name, std::size_t times) {
 }
 
 void CountedSet::makeRoom() {
+    // The table first: without it nothing has changed.
+    std::vector<std::uint32_t> table = nameindex::tableFor(_count + 1);
     std::erase_if(_entries, [](const Entry& entry) { return entry.count == 0; });
-    _index = nameindex::tableFor(_entries.size() + 1);
+    _index = std::move(table);
     if (_index.empty())
         return;
     for (std::size_t i = 0; i < _entries.size(); ++i)
