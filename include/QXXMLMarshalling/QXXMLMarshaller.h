@@ -4,9 +4,12 @@
 //
 //     qx::Ref<qx::Error> error;
 //     auto marshaller = QXXMLMarshaller::initWithMappingFile("orders-mapping.xml", &error);
-//     auto order = marshaller->readFile("order.xml", &error);
-//     order->setValueForKey("shipped", "state");
-//     marshaller->writeFile(order, "order.xml", &error);
+//     auto order = marshaller ? marshaller->readFile("order.xml", &error) : nullptr;
+//     if (order) {
+//         order->setValueForKey("shipped", "state");
+//         marshaller->writeFile(order, "order.xml", &error);
+//     }
+//     if (error) std::cerr << error->localizedDescription().view();
 //
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
@@ -95,14 +98,17 @@ public:
         return unmarshall(document.get(), error);
     }
 
-    // Parse and unmarshall in one step; with the parser's error too.
+    // Parse and unmarshall in one step: the object, or null with an error. Besides those of
+    // unmarshall() and of the parser, whether the marshaller is lenient or not:
+    //   -211  "No definition to handle element: %@"   (the root)
     qx::Ref<qx::Object> readString(qx::XMLBytes xml, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readFile(const qx::String& path, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readStream(std::istream& stream, qx::Ref<qx::Error>* error = nullptr);
     // Marshall and serialise in one step, one element a line. The string is null on failure; a file
     // is replaced atomically, and untouched on failure. Besides the errors of marshall() and of
     // writing:
-    //   517  "The text cannot be written: %@"   (a character or a name that XML has no place for)
+    //   517  "The text cannot be written: %@"   (a character or a name that XML has no place for,
+    //         or what this marshaller could not read again: see the limits in XMLDocument.h)
     qx::String writeString(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
     bool writeFile(const qx::Value& object, const qx::String& path,
                    qx::Ref<qx::Error>* error = nullptr);

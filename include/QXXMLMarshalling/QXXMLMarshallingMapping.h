@@ -13,7 +13,6 @@
 
 class ClassPlan;
 class MappingPlan;
-class QXXMLDataRepositoryManager;
 
 class QX_API QXXMLMarshallingMapping final : public qx::Object {
 public:
@@ -58,18 +57,12 @@ protected:
 
 private:
     friend qx::Ref<QXXMLMarshallingMapping> qx::make<QXXMLMarshallingMapping>();
-    struct Loading;
 
     QXXMLMarshallingMapping();
-    bool init(qx::XMLDocument* document, const Loading* loading, qx::Ref<qx::Error>* error);
-    bool loadIncludedDocument(const QXXMLDataRepositoryManager& manager, const Loading& here,
-                              qx::Ref<qx::Error>* error);
-    bool loadIncludedDocuments(const Loading* loading, qx::Ref<qx::Error>* error);
+    bool init(qx::XMLDocument* document, qx::Ref<qx::Error>* error);
+    QXXMLClassMapping* mappingOf(const ClassPlan* plan) const;
 
-    struct Index;
     qx::Ref<QXXMLDocumentMapping> _mapping;
     qx::Ref<qx::XMLDocument> _document;
-    std::unique_ptr<Index> _mappingByClass;
-    std::unique_ptr<Index> _mappingByElementName;
     std::unique_ptr<MappingPlan> _plan;
 };

@@ -40,7 +40,6 @@ void QXXMLDocumentMapping::mergeDocumentMapping(const QXXMLDocumentMapping* othe
         return;
     // Indexes, not iterators: a document may be merged with itself.
     const std::size_t count = other->_classMappings.size();
-    _classMappings.reserve(_classMappings.size() + count);
     for (std::size_t i = 0; i < count; ++i)
         _classMappings.push_back(other->_classMappings[i]);
 }

@@ -7,8 +7,8 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "marshaller/LastChildren.h"
 #include "marshaller/ObjectDoor.h"
-#include "resolved/MappingPlan.h"
 
 class Marshalling {
 public:
@@ -34,7 +34,7 @@ private:
     const ClassPlan* classOf(const qx::Value& value) const;
     bool bindOwnFields(const ClassPlan& plan, qx::XMLElement& element, qx::Object& object,
                        ErrorSlot error);
-    void restoreUnknownXML(qx::XMLElement& element, const qx::Object& object) const;
+    void restoreUnknownXML(qx::XMLElement& element, const qx::Object& object);
     void restoreNamespaces(qx::XMLElement& element, const qx::Object& object) const;
 
     bool mapAsAttribute(const FieldPlan& field, qx::XMLElement& element, const qx::Value& value);
@@ -42,6 +42,7 @@ private:
                       ErrorSlot error);
     bool mapAutomatically(const FieldPlan& field, qx::XMLElement& element, const qx::Value& value,
                           ErrorSlot error);
+    qx::XMLElement* lastChildNamed(const qx::XMLElement& element, const qx::String& name);
     static qx::XMLElement& arrayTarget(const FieldPlan& field, qx::XMLElement& element);
     bool isToBeWritten(const qx::Value& item);
 
@@ -51,4 +52,6 @@ private:
     const bool _usingNamespaceURIs;
     ObjectDoor _door;
     std::size_t _depth = 0;
+    // Of the elements in which names were looked up among many children.
+    std::unordered_map<const qx::XMLElement*, LastChildren> _lastChildren;
 };

@@ -38,13 +38,24 @@ public:
         _next = 0;
         _rest.reset();
     }
-    // Adds the counts to the set.
+    // Adds the counts to the set: all of them, or none where memory fails.
     void addTo(qx::CountedSet& set) const {
-        for (const qx::String& name : _added)
-            set.add(name);
+        std::size_t added = 0;
+        try {
+            for (; added < _added.size(); ++added)
+                set.add(_added[added]);
+        } catch (...) {
+            takeFrom(set, added);
+            throw;
+        }
     }
+    void takeFrom(qx::CountedSet& set) const { takeFrom(set, _added.size()); }
 
 private:
+    void takeFrom(qx::CountedSet& set, std::size_t count) const {
+        for (std::size_t i = 0; i < count; ++i)
+            set.remove(_added[i]);
+    }
     qx::CountedSet& countRest() {
         if (!_rest)
             _rest = qx::make<qx::CountedSet>();

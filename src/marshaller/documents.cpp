@@ -16,6 +16,7 @@ namespace {
 
 constexpr qx::XMLOptions layout = qx::XMLPrettyPrint;
 
+// What is written is meant to be read by such a marshaller, too.
 qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
     qx::XMLParseOptions options;
     // An object may stand in a wrapper, and hold a last element with text.
@@ -23,7 +24,16 @@ qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
     return options;
 }
 
-// A name or a text that no XML document can hold raises while the tree is written.
+// A lenient marshaller gives no object for a root that no class maps to, and no error either:
+// whoever reads in one step is told.
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, XMLDocument& document, Ref<Error>* error) {
+    auto object = marshaller.unmarshall(&document, error);
+    if (object || (error != nullptr && *error))
+        return object;
+    return qx::fail(error, qx::errors::noDefinitionForElement, document.rootElement());
+}
+
+// What no XML document can hold, or none that could be read again, raises while it is written.
 template <class Result, class Write>
 Result written(Write write, Ref<Error>* error) {
     try {
@@ -37,35 +47,39 @@ Result written(Write write, Ref<Error>* error) {
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
     const auto document = XMLDocument::initWithData(xml, parseOptions(*this), error);
-    return document ? unmarshall(document, error) : nullptr;
+    return document ? objectOf(*this, *document, error) : nullptr;
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error) {
     const auto document = XMLDocument::initWithContentsOfFile(path, parseOptions(*this), error);
-    return document ? unmarshall(document, error) : nullptr;
+    return document ? objectOf(*this, *document, error) : nullptr;
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
     const auto document = XMLDocument::initWithStream(stream, parseOptions(*this), error);
-    return document ? unmarshall(document, error) : nullptr;
+    return document ? objectOf(*this, *document, error) : nullptr;
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
     const auto document = marshall(object, error);
     if (!document)
         return nullptr;
-    return written<String>([&] { return document->XMLString(layout); }, error);
+    return written<String>([&] { return document->XMLString(layout, parseOptions(*this)); }, error);
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
     const auto document = marshall(object, error);
-    return document &&
-           written<bool>([&] { return document->writeToFile(path, layout, error); }, error);
+    const auto write = [&] {
+        return document->writeToFile(path, layout, error, parseOptions(*this));
+    };
+    return document && written<bool>(write, error);
 }
 
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
                                   Ref<Error>* error) {
     const auto document = marshall(object, error);
-    return document &&
-           written<bool>([&] { return document->writeToStream(stream, layout, error); }, error);
+    const auto write = [&] {
+        return document->writeToStream(stream, layout, error, parseOptions(*this));
+    };
+    return document && written<bool>(write, error);
 }

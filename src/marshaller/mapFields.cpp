@@ -18,13 +18,6 @@ bool isZeroOrEmpty(const Value& value, const String& text) {
     return (value.isNumber() && value.intValue() == 0) || text.isEmpty();
 }
 
-XMLElement* lastChildNamed(const XMLElement& element, const String& name) {
-    for (XMLNode* child = element.lastChild(); child != nullptr; child = child->previousSibling())
-        if (child->isElement() && child->name() == name)
-            return child->asElement();
-    return nullptr;
-}
-
 XMLElement& appendNew(XMLElement& parent, const String& name) {
     auto child = XMLElement::initWithName(name);
     XMLElement& appended = *child;
@@ -69,17 +62,30 @@ bool Marshalling::mapField(const FieldPlan& field, XMLElement& element, qx::Obje
     return true;
 }
 
+XMLElement* Marshalling::lastChildNamed(const XMLElement& element, const String& name) {
+    // Up to so many, looking through the children costs no more than an index of them.
+    constexpr std::size_t mostScanned = 64;
+    if (element.childCount() > mostScanned)
+        return _lastChildren[&element].named(element, name);
+    for (XMLNode* child = element.lastChild(); child != nullptr; child = child->previousSibling())
+        if (child->isElement() && child->name() == name)
+            return child->asElement();
+    return nullptr;
+}
+
 bool Marshalling::mapAsAttribute(const FieldPlan& field, XMLElement& element, const Value& value) {
     const String written = text(value, field.valueType);
     if (!field.isRequired && isZeroOrEmpty(value, written))
         return true;
-    XMLElement* target = &element;
-    if (!field.location.isEmpty()) {
-        target = lastChildNamed(element, field.location);
-        if (target == nullptr)
-            target = &appendNew(element, field.location);
+    XMLElement* const target =
+        field.location.isEmpty() ? &element : lastChildNamed(element, field.location);
+    if (target != nullptr) {
+        target->addAttribute(field.xmlName, written);
+    } else {
+        auto wrapper = XMLElement::initForAttributes(field.location, 1);
+        wrapper->addAttribute(field.xmlName, written);
+        element.addChild(std::move(wrapper));
     }
-    target->addAttribute(field.xmlName, written);
     return true;
 }
 
@@ -101,7 +107,7 @@ bool Marshalling::mapAsElement(const FieldPlan& field, XMLElement& element, cons
     }
     if (!field.isRequired && value.isNullOrMarker())
         return true;
-    appendNew(element, field.xmlName).setStringValue(text(value, field.valueType));
+    element.addChild(XMLElement::initWithName(field.xmlName, text(value, field.valueType)));
     return true;
 }
 

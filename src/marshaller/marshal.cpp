@@ -110,15 +110,23 @@ Ref<XMLNode> moved(const Value& kept, qx::XMLNodeKind kind) {
 
 } // namespace
 
-void Marshalling::restoreUnknownXML(XMLElement& element, const qx::Object& object) const {
+void Marshalling::restoreUnknownXML(XMLElement& element, const qx::Object& object) {
     static const Key childrenKey("unboundChildren");
     static const Key attributesKey("unboundAttributes");
-    if (const auto children = ObjectDoor::get(object, childrenKey).as<qx::Dictionary>())
+    if (const auto children = ObjectDoor::get(object, childrenKey).as<qx::Dictionary>()) {
+        const auto known = _lastChildren.find(&element);
+        LastChildren* const last = known != _lastChildren.end() ? &known->second : nullptr;
+        if (last != nullptr)
+            last->catchUp(element);
         for (const auto& entry : *children)
             if (const auto elements = entry.value.as<qx::Array>())
                 for (const Value& kept : *elements)
-                    if (auto child = moved(kept, qx::XMLNodeKind::element))
-                        element.addChild(std::move(child));
+                    if (const auto child = moved(kept, qx::XMLNodeKind::element)) {
+                        element.addChild(child);
+                        if (last != nullptr)
+                            last->see(*child);
+                    }
+    }
     if (const auto attributes = ObjectDoor::get(object, attributesKey).as<qx::Array>())
         for (const Value& kept : *attributes)
             if (auto attribute = moved(kept, qx::XMLNodeKind::attribute))

@@ -51,17 +51,29 @@ public:
     bool run(Object& object, bool isFlattened, Bind bind) {
         const Ref<Object> held(&object);
         const Unmarshalling::Target target{object, _source, {_fields, _attributes}, isFlattened};
-        struct Counted {
-            Step& step;
-            ~Counted() {
-                step._fields.addTo(step._fieldSet);
-                step._attributes.addTo(step._attributeSet);
-            }
-        } const counted{*this}; // also when a host's setter throws
-        return bind(_unmarshalling, target);
+        bool bound = false;
+        try {
+            bound = bind(_unmarshalling, target);
+        } catch (...) { // what a host's setter throws
+            count();
+            throw;
+        }
+        count();
+        return bound;
     }
 
 private:
+    // In both sets, or in none where memory fails.
+    void count() {
+        _fields.addTo(_fieldSet);
+        try {
+            _attributes.addTo(_attributeSet);
+        } catch (...) {
+            _fields.takeFrom(_fieldSet);
+            throw;
+        }
+    }
+
     Unmarshalling _unmarshalling;
     ElementSource _source;
     CountedSet& _fieldSet;

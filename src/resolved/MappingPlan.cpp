@@ -64,9 +64,6 @@ void MappingPlan::fill(ClassPlan& plan) const {
     for (const auto& field : mapping.fields()) {
         plan.fields.push_back(planFor(*field));
         plan.bindingCount += std::max<std::size_t>(field->bindToMappings().size(), 1);
-        if (field->nodeType() == QXXMLNodeTypeAttribute ||
-            field->nodeType() == QXXMLNodeTypeUnknown)
-            ++plan.attributeCount;
     }
     if (!mapping.extends().isEmpty())
         plan.parent = classNamed(mapping.extends());
@@ -187,6 +184,7 @@ std::unique_ptr<ClassPlan> MappingPlan::planFor(const QXXMLClassMapping& mapping
     plan->mapping = &mapping;
     plan->index = _classes.size();
     fill(*plan);
+    summarise(*plan);
     return plan;
 }
 

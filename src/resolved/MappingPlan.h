@@ -74,7 +74,7 @@ public:
     const ClassPlan* parent = nullptr;
     bool isOnCycle = false; // of `extends`
     // Whether the class with its ancestors binds no child element to two fields: as many children
-    // bound as there are then means that all are. Only known of classes that stand in the mapping.
+    // bound as there are then means that all are.
     bool bindsChildrenOnce = false;
 };
 

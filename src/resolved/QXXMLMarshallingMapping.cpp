@@ -1,63 +1,58 @@
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 
 #include "platform/object/LibraryClass.h"
-#include "platform/system/Errors.h"
-#include "resolved/MappingIndex.h"
+#include "resolved/IncludeLoader.h"
 
 using qx::Error;
 using qx::Ref;
 using qx::String;
 
-QXXMLMarshallingMapping::QXXMLMarshallingMapping()
-    : _mappingByClass(std::make_unique<Index>()), _mappingByElementName(std::make_unique<Index>()) {
-}
-
+QXXMLMarshallingMapping::QXXMLMarshallingMapping() = default;
 QXXMLMarshallingMapping::~QXXMLMarshallingMapping() = default;
 
 Ref<QXXMLMarshallingMapping> QXXMLMarshallingMapping::initWithDocument(qx::XMLDocument* document,
                                                                        Ref<Error>* error) {
     auto mapping = qx::make<QXXMLMarshallingMapping>();
-    return mapping->init(document, nullptr, error) ? mapping : nullptr;
+    return mapping->init(document, error) ? mapping : nullptr;
 }
 
-bool QXXMLMarshallingMapping::init(qx::XMLDocument* document, const Loading* loading,
-                                   Ref<Error>* error) {
+bool QXXMLMarshallingMapping::init(qx::XMLDocument* document, Ref<Error>* error) {
     qx::XMLElement* root = document != nullptr ? document->rootElement() : nullptr;
     _mapping = QXXMLDocumentMapping::initWithXML(root, error);
     // A slot that held an error before fails the construction too.
     if (!_mapping || (error != nullptr && *error))
         return false;
     _document = Ref<qx::XMLDocument>(document);
-    if (!loadIncludedDocuments(loading, error) || !populateLookupCaches(error))
+    return loadIncludedDocuments(error) && populateLookupCaches(error);
+}
+
+bool QXXMLMarshallingMapping::loadIncludedDocuments(Ref<Error>* error) {
+    if (_plan != nullptr)
+        return true;
+    IncludeLoader loader;
+    if (!loader.load(*_mapping, error))
         return false;
-    // An included mapping is merged into another and never worked from.
-    if (loading == nullptr)
+    for (const auto& included : loader.included())
+        _mapping->mergeDocumentMapping(included.get());
+    return true;
+}
+
+bool QXXMLMarshallingMapping::populateLookupCaches(Ref<Error>*) {
+    if (_plan == nullptr)
         _plan = std::make_unique<MappingPlan>(*_mapping);
     return true;
 }
 
-bool QXXMLMarshallingMapping::populateLookupCaches(Ref<Error>* error) {
-    if (_plan != nullptr)
-        return true;
-    for (const auto& mapping : _mapping->classMappings()) {
-        const String& className = mapping->className();
-        const String elementName = MappingPlan::elementNameOf(*mapping);
-        if (_mappingByClass->mappings.contains(className))
-            return qx::fail(error, qx::errors::classRedefined, className);
-        if (_mappingByElementName->mappings.contains(elementName))
-            return qx::fail(error, qx::errors::elementRedefined, elementName, className);
-        _mappingByClass->mappings.emplace(className, mapping);
-        _mappingByElementName->mappings.emplace(elementName, mapping);
-    }
-    return true;
+QXXMLClassMapping* QXXMLMarshallingMapping::mappingOf(const ClassPlan* plan) const {
+    return plan != nullptr ? _mapping->classMappings()[plan->index].get() : nullptr;
 }
 
 QXXMLClassMapping* QXXMLMarshallingMapping::mappingForClassName(const String& className) const {
-    return _mappingByClass->find(className);
+    return mappingOf(_plan->classNamed(className));
 }
 
 QXXMLClassMapping* QXXMLMarshallingMapping::mappingForElementName(const String& elementName) const {
-    return _mappingByElementName->find(elementName);
+    return mappingOf(_plan->classForElement(elementName));
 }
 
 QXXMLClassMapping* QXXMLMarshallingMapping::mappingForNode(const qx::XMLNode* node) const {

@@ -1,9 +1,7 @@
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
-#include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/platform/Exception.h>
 
-#include "platform/system/Errors.h"
-#include "resolved/MappingIndex.h"
+#include "resolved/IncludeLoader.h"
 
 using qx::Error;
 using qx::Ref;
@@ -20,48 +18,54 @@ constexpr std::size_t mostIncludes = 10'000;
 
 } // namespace
 
-bool QXXMLMarshallingMapping::loadIncludedDocuments(Ref<Error>* error) {
-    return _plan != nullptr || loadIncludedDocuments(nullptr, error);
+// A document's classes are checked once its includes are there, those of its includes before it. A
+// document reached on two branches is merged twice, and its classes are then reported as redefined.
+bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
+    const std::size_t begin = _classes.count();
+    _classes.add(document);
+    return loadIncludes(document, error) && _classes.areDistinctFrom(begin, error);
 }
 
-// Depth first: each document's own classes, then those of its includes in order. A document reached
-// on two branches is merged twice, and its classes are then reported as redefined.
-bool QXXMLMarshallingMapping::loadIncludedDocuments(const Loading* loading, Ref<Error>* error) {
+bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error) {
     // Made even without an include: hosts rely on the shared manager being there afterwards.
     const auto manager = QXXMLDataRepositoryManager::defaultManager();
-    std::size_t first = 0;
-    std::size_t& count = loading != nullptr ? loading->count : first;
-    const std::size_t depth = loading != nullptr ? loading->depth + 1 : 1;
-    for (const String& href : _mapping->includes()) {
-        bool isCycle = false;
-        for (const Loading* above = loading; above != nullptr; above = above->parent)
-            isCycle = isCycle || above->href == href;
-        if (isCycle || depth > deepestInclude || count == mostIncludes)
+    for (const String& href : document.includes()) {
+        const bool isCycle = std::any_of(_open.begin(), _open.end(),
+                                         [&](const String* open) { return *open == href; });
+        if (isCycle || _open.size() == deepestInclude || _count == mostIncludes)
             return qx::fail(error, qx::errors::unableToLoadInclude, href);
-        ++count;
-        if (!loadIncludedDocument(*manager, {href, loading, depth, count}, error))
+        ++_count;
+        _open.push_back(&href);
+        if (!loadInclude(*manager, href, error))
             return false;
+        _open.pop_back();
     }
     return true;
 }
 
-bool QXXMLMarshallingMapping::loadIncludedDocument(const QXXMLDataRepositoryManager& manager,
-                                                   const Loading& here, Ref<Error>* error) {
+bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager, const String& href,
+                                Ref<Error>* error) {
     std::uint64_t size = 0;
     Ref<Error> problem;
-    const auto document = manager.documentNamed(here.href, &size, &problem);
-    bool merged = false;
+    const auto document = manager.documentNamed(href, &size, &problem);
+    bool loaded = false;
     if (!problem) {
         try {
-            auto included = qx::make<QXXMLMarshallingMapping>();
-            merged = included->init(document.get(), &here, &problem);
-            if (merged)
-                _mapping->mergeDocumentMapping(included->mapping());
+            loaded = resolve(document.get(), &problem);
         } catch (const qx::Exception&) {
-            return qx::fail(error, qx::errors::unableToLoadInclude, here.href);
+            return qx::fail(error, qx::errors::unableToLoadInclude, href);
         }
     }
-    if (!merged && error != nullptr)
+    if (!loaded && error != nullptr)
         *error = std::move(problem);
-    return merged;
+    return loaded;
+}
+
+bool IncludeLoader::resolve(qx::XMLDocument* document, Ref<Error>* error) {
+    qx::XMLElement* const root = document != nullptr ? document->rootElement() : nullptr;
+    const auto mapping = QXXMLDocumentMapping::initWithXML(root, error);
+    if (!mapping || *error)
+        return false;
+    _included.push_back(mapping);
+    return load(*mapping, error);
 }

@@ -28,3 +28,9 @@ diff - order.xml <<'EOF'
     <note></note>
 </order>
 EOF
+printf '<invoice/>' >order.xml
+if ./program 2>errors; then
+    echo "readme.sh: the program took a document that its mapping does not know"
+    exit 1
+fi
+diff - errors <<<'No definition to handle element: <invoice></invoice>'

@@ -7,6 +7,7 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <map>
 #include <new>
 
@@ -133,6 +134,35 @@ TEST_F(MarshallingMapping, ReportsAnIncludeReachedTwiceAsRedefinition) {
     EXPECT_EQ(resolve("<class name='D'/><include href='d'/>"),
               "-205: Class redefined: D (Invalid XML)");
     EXPECT_EQ(resolve("<include href='twice'/>"), "-205: Class redefined: T (Invalid XML)");
+    // A document is checked once its includes are there, and before the next document is loaded.
+    repository->documents["own"] = "<class name='D'/><include href='d'/>";
+    repository->documents["x"] = "<class name='X'><map-to xml='d'/></class><class name='A'/>";
+    EXPECT_EQ(resolve("<class name='A'/><class name='A'/><include href='own'/><include "
+                      "href='twice'/>"),
+              "-205: Class redefined: D (Invalid XML)");
+    EXPECT_EQ(resolve("<class name='A'/><include href='d'/><include href='x'/>"),
+              "-205: Element redefined: d class: X (Invalid XML)");
+}
+
+TEST_F(MarshallingMapping, ResolvesAChainOfIncludesInTheTimeOfItsClasses) {
+    constexpr int documents = 250;
+    constexpr int classes = 80;
+    const auto timed = [&](bool isChain) {
+        std::string all;
+        for (int i = 0; i < documents; ++i) {
+            const std::string next = "<include href='" + std::to_string(i + 1) + "'/>";
+            std::string content = isChain ? next : "";
+            for (int k = 0; k < classes; ++k)
+                content += "<class name='C" + std::to_string(i * classes + k) + "'/>";
+            repository->documents[std::to_string(i)] = content;
+            all += "<include href='" + std::to_string(i) + "'/>";
+        }
+        const auto start = std::chrono::steady_clock::now();
+        const std::string names = resolve(isChain ? "<include href='0'/>" : all);
+        EXPECT_TRUE(names.starts_with("C0C1C2") && names.ends_with("C19999"));
+        return std::chrono::steady_clock::now() - start;
+    };
+    EXPECT_LT(timed(true), 5 * timed(false));
 }
 
 TEST_F(MarshallingMapping, EndsCyclesOfIncludes) {

@@ -11,7 +11,8 @@
 // elsewhere is an error; CDATA and entities become text. A parameter entity that stands elsewhere
 // is left out; unless the document says standalone="yes", what is declared behind it is left out
 // too. Limits bound depth, text size, what is declared, what entities bring in (1 MB and five times
-// the document) and what one element may declare. Beyond one, and for anything that is no
+// the document), an element's attributes and declarations (4,096), the declarations in force
+// (1,000), different names (100,000), and the whole (2 GB). Beyond one, and for anything that is no
 // well-formed XML, the result is null and the error says what, where: domain
 // qx::Error::parserDomain, the parser's code and text, line() and column(). Where memory lacks,
 // std::bad_alloc comes out. Any number of threads may parse at the same time.
@@ -110,15 +111,22 @@ public:
 
     // The document as bytes, with an XML declaration when a version or an encoding is set, in that
     // encoding (UTF-8 without one); characters that the encoding lacks go as character references.
-    // Raises NSInvalidArgumentException as XMLString does, and for an unknown encoding.
-    std::string XMLData(XMLOptions options = XMLNoOptions) const;
+    // Raises NSInvalidArgumentException as XMLString does, for an unknown encoding, and for what
+    // could not be read again with the options `reading`: a document that was read with higher
+    // limits than the default ones is written with the same.
+    std::string XMLData(XMLOptions options = XMLNoOptions,
+                        const XMLParseOptions& reading = {}) const;
+    // The same as text. XMLString(options), as of any node, heeds no limit.
+    using XMLNode::XMLString;
+    String XMLString(XMLOptions options, const XMLParseOptions& reading) const;
     // Writes XMLData to a file atomically: to a temporary file beside it, which then takes its
-    // place. False with an error that says what and where; the old file is then untouched.
+    // place. False with an error that says what and where; raises as XMLData does. The old file is
+    // untouched then.
     bool writeToFile(const String& path, XMLOptions options = XMLNoOptions,
-                     Ref<Error>* error = nullptr) const;
-    // False with an error when the stream fails.
+                     Ref<Error>* error = nullptr, const XMLParseOptions& reading = {}) const;
+    // False with an error when the stream fails. Raises as XMLData does, with nothing written.
     bool writeToStream(std::ostream& stream, XMLOptions options = XMLNoOptions,
-                       Ref<Error>* error = nullptr) const;
+                       Ref<Error>* error = nullptr, const XMLParseOptions& reading = {}) const;
 
     String stringValue() const override;
     void setStringValue(const String& value) override;
@@ -131,7 +139,7 @@ private:
 
     XMLDocument() noexcept;
     template <class Use>
-    auto withBytes(XMLOptions options, Use use) const;
+    auto withBytes(XMLOptions options, const XMLParseOptions& reading, Use use) const;
     void unlink(XMLNode& node) noexcept;
 
     XMLNode* _firstChild = nullptr;

@@ -134,6 +134,18 @@ private:
     }
     void spellAttributesOut() const;
 
+    // Attributes and declarations beyond the first few are found by name through an index.
+    struct Indexes;
+    static constexpr std::size_t mostScanned = 64;
+    Indexes* indexes() const noexcept;
+    Indexes& madeIndexes();
+    XMLNode* findNode(XMLNode* first, const String& name) const noexcept;
+    // Nothing where one of that name is there already.
+    void appendUnlessThere(XMLNode*& first, Ref<XMLNode> node);
+    // Makes it known that as many nodes come, each of another name.
+    void expectAttributes(std::size_t count);
+    void appendAttribute(Ref<XMLNode> node);
+
     // Most elements with text have one text and nothing else. The element then holds it as its
     // value, and makes the node when somebody asks for its children.
     void holdText(String text) noexcept {

@@ -20,11 +20,17 @@ protected:
     ~EndListener() = default;
 };
 
+// What a class of object keeps of its own kind.
+struct ObjectAttachment {
+    virtual ~ObjectAttachment() = default;
+};
+
 struct Object::Extras {
     Ref<WeakAnchor> anchor;
     std::vector<EndListener*> endListeners;
     std::unique_ptr<ObservationInfo> observation;
     Object* nextWaiting = nullptr; // of the ending objects that wait for their turn
+    std::unique_ptr<ObjectAttachment> attachment;
 
     Extras() noexcept;
     ~Extras();

@@ -1,22 +1,15 @@
 #include "platform/object/Scan.h"
 
+#include "platform/object/Unicode.h"
+
 #include <array>
 #include <charconv>
 #include <cmath>
 
 namespace qx {
 
-namespace {
-
-std::string_view withoutLeadingSpace(std::string_view text) {
-    const std::size_t start = text.find_first_not_of(" \t\n\v\f\r");
-    return start == std::string_view::npos ? std::string_view() : text.substr(start);
-}
-
-} // namespace
-
 std::optional<std::int64_t> scanInteger(std::string_view text) noexcept {
-    text = withoutLeadingSpace(text);
+    text = unicode::withoutLeadingSpace(text);
     const bool negative = !text.empty() && text.front() == '-';
     if (negative || (!text.empty() && text.front() == '+'))
         text.remove_prefix(1);
@@ -32,7 +25,7 @@ std::optional<std::int64_t> scanInteger(std::string_view text) noexcept {
 }
 
 std::optional<double> scanReal(std::string_view text) noexcept {
-    text = withoutLeadingSpace(text);
+    text = unicode::withoutLeadingSpace(text);
     if (!text.empty() && text.front() == '+')
         text.remove_prefix(1);
     double value = 0;

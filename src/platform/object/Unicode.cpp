@@ -100,4 +100,16 @@ std::string fromUTF16(std::u16string_view units) {
     return text;
 }
 
+std::string_view withoutLeadingSpace(std::string_view text) noexcept {
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
+    std::size_t start = 0;
+    for (std::size_t next = 0; next < text.size(); start = next) {
+        UChar32 c = 0;
+        U8_NEXT(bytes, next, text.size(), c);
+        if (c < 0 || !u_isUWhiteSpace(c))
+            break;
+    }
+    return text.substr(start);
+}
+
 } // namespace qx::unicode

@@ -1,6 +1,7 @@
 #include "platform/xml/SAXSession.h"
 
 #include "platform/xml/XMLCharacters.h"
+#include "platform/xml/XMLLimits.h"
 
 #include <algorithm>
 #include <cstring>

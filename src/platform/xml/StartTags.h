@@ -8,8 +8,7 @@
 
 namespace qx {
 
-// In a document, and in the text of an entity, which may come again and again.
-constexpr std::size_t maximumAttributes = 4096;
+// In the text of an entity, which may come again and again.
 constexpr std::size_t maximumEntityAttributes = 512;
 
 // Where the first tag that has more attributes stands; npos for none.

@@ -90,29 +90,39 @@ void XMLDocument::unlink(XMLNode& node) noexcept { XMLSiblings::remove(_firstChi
 
 // Calls use(bytes) with the document's bytes in its encoding.
 template <class Use>
-auto XMLDocument::withBytes(XMLOptions options, Use use) const {
+auto XMLDocument::withBytes(XMLOptions options, const XMLParseOptions& reading, Use use) const {
     TextBuffer text;
     if (_encoding.isEmpty() || isUTF8Name(_encoding)) {
-        XMLSerializer(text, options, XMLChecks::on).write(*this);
+        XMLSerializer(text, options, XMLChecks::on, nullptr, &reading).write(*this);
         return use(text.view());
     }
     TextEncoder encoder(_encoding);
-    XMLSerializer(text, options, XMLChecks::on, &encoder).write(*this);
+    XMLSerializer(text, options, XMLChecks::on, &encoder, &reading).write(*this);
     return use(encoder.encoded(text.view()));
 }
 
-std::string XMLDocument::XMLData(XMLOptions options) const {
-    return withBytes(
-        options, [](auto&& bytes) { return std::string(std::forward<decltype(bytes)>(bytes)); });
+std::string XMLDocument::XMLData(XMLOptions options, const XMLParseOptions& reading) const {
+    return withBytes(options, reading, [](auto&& bytes) {
+        return std::string(std::forward<decltype(bytes)>(bytes));
+    });
 }
 
-bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error) const {
-    return withBytes(
-        options, [&](std::string_view bytes) { return writeFileAtomically(path, bytes, error); });
+String XMLDocument::XMLString(XMLOptions options, const XMLParseOptions& reading) const {
+    TextBuffer text;
+    XMLSerializer(text, options, XMLChecks::on, nullptr, &reading).write(*this);
+    return text.take();
 }
 
-bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error) const {
-    withBytes(options, [&](std::string_view bytes) {
+bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error,
+                              const XMLParseOptions& reading) const {
+    return withBytes(options, reading, [&](std::string_view bytes) {
+        return writeFileAtomically(path, bytes, error);
+    });
+}
+
+bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error,
+                                const XMLParseOptions& reading) const {
+    withBytes(options, reading, [&](std::string_view bytes) {
         stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
     });
     if (stream.flush())

@@ -3,9 +3,12 @@
 #include <QXXMLMarshalling/platform/Exception.h>
 
 #include "platform/object/MemoryBlocks.h"
+#include "platform/object/ObjectExtras.h"
 #include "platform/xml/Siblings.h"
 
+#include <optional>
 #include <string>
+#include <unordered_map>
 
 namespace qx {
 
@@ -48,6 +51,79 @@ void requireChild(const XMLNode* child, const XMLElement& element) {
 
 // Documents hold millions of elements: small members fill holes, lists keep one end.
 static_assert(sizeof(void*) != 8 || (sizeof(XMLElement) <= 112 && sizeof(XMLNode) <= 72));
+
+// An index holds all the nodes of its list, or is not there.
+struct XMLElement::Indexes final : ObjectAttachment {
+    struct Hash {
+        std::size_t operator()(const String& name) const noexcept { return name.hash(); }
+    };
+    using Index = std::unordered_map<String, XMLNode*, Hash>;
+
+    std::optional<Index>& of(XMLNodeKind kind) noexcept {
+        return kind == XMLNodeKind::attribute ? attributes : namespaces;
+    }
+    std::optional<Index> attributes;
+    std::optional<Index> namespaces;
+};
+
+XMLElement::Indexes* XMLElement::indexes() const noexcept {
+    const auto* extras = ObjectInternals::existingExtras(*this);
+    return extras != nullptr ? static_cast<Indexes*>(extras->attachment.get()) : nullptr;
+}
+
+XMLElement::Indexes& XMLElement::madeIndexes() {
+    auto& attachment = ObjectInternals::extras(*this).attachment;
+    if (!attachment)
+        attachment = std::make_unique<Indexes>();
+    return *indexes();
+}
+
+XMLNode* XMLElement::findNode(XMLNode* first, const String& name) const noexcept {
+    if (first == nullptr)
+        return nullptr;
+    if (Indexes* const all = indexes())
+        if (const auto& index = all->of(first->_kind)) {
+            const auto found = index->find(name);
+            return found != index->end() ? found->second : nullptr;
+        }
+    for (XMLNode* node = first; node != nullptr; node = node->_next)
+        if (node->_name == name)
+            return node;
+    return nullptr;
+}
+
+void XMLElement::appendUnlessThere(XMLNode*& first, Ref<XMLNode> node) {
+    Indexes* all = indexes();
+    if (all != nullptr && all->of(node->_kind)) {
+        if (!all->of(node->_kind)->try_emplace(node->_name, node.get()).second)
+            return;
+        return XMLSiblings::append(*this, first, node.detach());
+    }
+    std::size_t scanned = 0;
+    for (const XMLNode* other = first; other != nullptr; other = other->_next, ++scanned)
+        if (other->_name == node->_name)
+            return;
+    if (scanned >= mostScanned) {
+        Indexes::Index index;
+        for (XMLNode* other = first; other != nullptr; other = other->_next)
+            index.try_emplace(other->_name, other);
+        index.try_emplace(node->_name, node.get());
+        madeIndexes().of(node->_kind) = std::move(index);
+    }
+    XMLSiblings::append(*this, first, node.detach());
+}
+
+void XMLElement::expectAttributes(std::size_t count) {
+    if (count > mostScanned)
+        madeIndexes().attributes.emplace().reserve(count);
+}
+
+void XMLElement::appendAttribute(Ref<XMLNode> node) {
+    Indexes* const all = indexes();
+    if (all != nullptr && all->attributes)
+        all->attributes->try_emplace(node->_name, node.get());
+    XMLSiblings::append(*this, _firstAttribute, node.detach());
+}
 
 XMLElement::~XMLElement() {
     dropHeldAttributes();
@@ -117,30 +193,25 @@ XMLNode* XMLElement::attributeForName(const String& name) const {
     const String wanted = name;
     if (_heldCount != 0 && !attributeValue(wanted).isNull())
         spellAttributesOut();
-    for (XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
-        if (node->_name == wanted)
-            return node;
-    return nullptr;
+    return findNode(_firstAttribute, wanted);
 }
 
 String XMLElement::attributeValue(const String& name) const noexcept {
     for (const HeldAttribute& attribute : held())
         if (attribute.name == name)
             return attribute.value;
-    for (const XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
-        if (node->_name == name)
-            return node->_value;
-    return nullptr;
+    const XMLNode* const node = findNode(_firstAttribute, name);
+    return node != nullptr ? node->_value : String();
 }
 
 void XMLElement::addAttribute(Ref<XMLNode> attribute) {
     requireFree(attribute.get(), *this);
     if (attribute->_kind != XMLNodeKind::attribute)
         refuse("a node that is no attribute cannot be added as one", *this);
-    if (!attributeValue(attribute->_name).isNull())
+    if (_heldCount != 0 && !attributeValue(attribute->_name).isNull())
         return;
     attributes(); // those that are held stand in the list from now on
-    XMLSiblings::append(*this, _firstAttribute, attribute.detach());
+    appendUnlessThere(_firstAttribute, std::move(attribute));
 }
 
 void XMLElement::addAttribute(const String& name, const String& value) {
@@ -163,24 +234,38 @@ void XMLElement::setNamespaces(std::span<const Ref<XMLNode>> namespaces) {
         if (declaration->_kind != XMLNodeKind::namespaceDeclaration)
             refuse("a node that is no namespace cannot be set as one", *this);
     }
+    std::optional<Indexes::Index> index;
+    if (namespaces.size() > mostScanned) {
+        index.emplace();
+        for (const Ref<XMLNode>& declaration : namespaces)
+            index->try_emplace(declaration->_name, declaration.get());
+        madeIndexes();
+    }
+    // Nothing fails from here on.
     XMLSiblings::releaseAll(_firstNamespace);
-    // A node that stands in the list twice has a parent by then, and its prefix is taken.
-    for (const Ref<XMLNode>& declaration : namespaces)
-        if (declaration->_parent == nullptr)
-            addNamespace(declaration);
+    if (Indexes* const all = indexes())
+        all->namespaces = std::move(index);
+    // A node that stands in the list twice has a parent by then.
+    for (const Ref<XMLNode>& declaration : namespaces) {
+        const XMLNode* const first = findNode(_firstNamespace, declaration->_name);
+        if (declaration->_parent == nullptr && (first == nullptr || first == declaration.get()))
+            XMLSiblings::append(*this, _firstNamespace, Ref<XMLNode>(declaration).detach());
+    }
 }
 
 void XMLElement::addNamespace(Ref<XMLNode> declaration) {
     requireFree(declaration.get(), *this);
     if (declaration->_kind != XMLNodeKind::namespaceDeclaration)
         refuse("a node that is no namespace cannot be added as one", *this);
-    for (const XMLNode* node = _firstNamespace; node != nullptr; node = node->_next)
-        if (node->_name == declaration->_name)
-            return;
-    XMLSiblings::append(*this, _firstNamespace, declaration.detach());
+    appendUnlessThere(_firstNamespace, std::move(declaration));
 }
 
 void XMLElement::unlink(XMLNode& node) noexcept {
+    const bool isChild =
+        node._kind != XMLNodeKind::attribute && node._kind != XMLNodeKind::namespaceDeclaration;
+    if (Indexes* const all = isChild ? nullptr : indexes())
+        if (auto& index = all->of(node._kind))
+            index->erase(node._name);
     if (node._kind == XMLNodeKind::attribute) {
         XMLSiblings::remove(_firstAttribute, node);
     } else if (node._kind == XMLNodeKind::namespaceDeclaration) {
@@ -277,9 +362,9 @@ Ref<XMLElement> XMLElement::copyAlone() const {
     for (const HeldAttribute& attribute : held())
         element->holdAttribute(attribute.name, attribute.value);
     for (const XMLNode* node = _firstAttribute; node != nullptr; node = node->_next)
-        XMLSiblings::append(*element, element->_firstAttribute, node->copy().detach());
+        element->appendUnlessThere(element->_firstAttribute, node->copy());
     for (const XMLNode* node = _firstNamespace; node != nullptr; node = node->_next)
-        XMLSiblings::append(*element, element->_firstNamespace, node->copy().detach());
+        element->appendUnlessThere(element->_firstNamespace, node->copy());
     return element;
 }
 

@@ -4,9 +4,9 @@
 #include "platform/xml/ParseFailure.h"
 #include "platform/xml/StartTags.h"
 #include "platform/xml/XMLCharacters.h"
+#include "platform/xml/XMLLimits.h"
 
 #include <algorithm>
-#include <climits>
 
 namespace qx {
 
@@ -49,9 +49,9 @@ void XMLInput::read(XMLBytes bytes) {
     checkStart();
     if (!isConverted && !bytes.isTerminated())
         _text = _converted = _text;
-    const std::size_t tag = findTagBeyond(_text, maximumAttributes);
+    const std::size_t tag = findTagBeyond(_text, xmlLimits::attributes);
     if (tag != std::string_view::npos)
-        throw ParseFailure(parseErrors::tooManyAttributes, {maximumAttributes}, tag);
+        throw ParseFailure(parseErrors::tooManyAttributes, {xmlLimits::attributes}, tag);
 }
 
 bool XMLInput::decodeBytes(std::string_view bytes) {
@@ -89,7 +89,7 @@ void XMLInput::convert(std::string_view bytes, const String& encoding) {
 void XMLInput::checkStart() const {
     if (_text.empty())
         throw ParseFailure(parseErrors::empty, {}, 0);
-    if (_text.size() > INT_MAX - 1)
+    if (_text.size() > xmlLimits::documentSize)
         throw ParseFailure(parseErrors::documentTooLarge, {}, 0);
     if (_text.front() != '<' && !isWhite(_text.front()))
         throw ParseFailure(parseErrors::noStartTag, {}, 0);

@@ -6,6 +6,8 @@
 
 #include <QXXMLMarshalling/platform/Key.h>
 
+#include "platform/xml/XMLLimits.h"
+
 #include <bit>
 #include <vector>
 
@@ -37,7 +39,7 @@ private:
         String name;
     };
     static constexpr std::size_t initialSize = 256; // a power of two
-    static constexpr std::size_t maximumNames = 100'000;
+    static constexpr std::size_t maximumNames = xmlLimits::names;
 
     std::size_t slot(Name local, Name prefix) const noexcept {
         const auto mixed = (reinterpret_cast<std::uintptr_t>(local) +

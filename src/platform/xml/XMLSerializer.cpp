@@ -4,6 +4,7 @@
 
 #include "platform/xml/Encoding.h"
 #include "platform/xml/XMLCharacters.h"
+#include "platform/xml/XMLLimits.h"
 
 #include <algorithm>
 #include <array>
@@ -67,6 +68,8 @@ void XMLSerializer::writeDocument(const XMLDocument& document) {
         if (has(XMLPrettyPrint))
             _output += '\n';
     }
+    if (_reading != nullptr && _output.size() > xmlLimits::documentSize)
+        refuseBeyond("the document is larger than", xmlLimits::documentSize, {document});
 }
 
 void XMLSerializer::writeDeclaration(const XMLDocument& document) {
@@ -102,8 +105,10 @@ void XMLSerializer::writeTree(const XMLNode& top) {
         if (element != nullptr && element->holdsText()) {
             startTag(*element);
             const String text = element->_value;
+            requireSize(text.size(), "a text is larger than", {*element, true});
             writeEscaped(text, Where::text, isWhite(text), {*element, true});
             endTag(*element);
+            leave();
         } else if (element != nullptr) {
             startElement(*element);
             if (const XMLNode* child = element->firstChild()) {
@@ -129,14 +134,21 @@ void XMLSerializer::writeTree(const XMLNode& top) {
 void XMLSerializer::startTag(const XMLElement& element) {
     _output += '<';
     writeName(element.name(), {element});
+    std::size_t declarations = 0;
     for (const XMLNode& declaration : element.namespaces()) {
         _output += ' ';
         writeNamespace(declaration);
+        ++declarations;
     }
+    std::size_t attributes = declarations;
     element.forEachAttribute([&](const String& name, const String& value) {
         _output += ' ';
         writeAttribute(name, value, &element, {element, false, &name});
+        ++attributes;
+        declarations += isDeclaration(name) ? 1 : 0;
     });
+    if (_reading != nullptr)
+        enter(element, attributes, declarations);
     if (element.childCount() != 0 || !has(XMLCompactEmptyElements))
         _output += '>';
 }
@@ -148,6 +160,7 @@ void XMLSerializer::startElement(const XMLElement& element) {
 }
 
 void XMLSerializer::endElement(const XMLElement& element) {
+    leave();
     if (has(XMLPrettyPrint)) {
         const bool ownLine = element.firstChild() != nullptr && !_levels.back().isInline();
         _levels.pop_back();
@@ -169,6 +182,8 @@ void XMLSerializer::endTag(const XMLElement& element) {
 
 void XMLSerializer::writeLeaf(const XMLNode& node) {
     const String text = node.stringValue();
+    if (node.kind() != XMLNodeKind::text)
+        _textSize = 0;
     switch (node.kind()) {
     case XMLNodeKind::attribute:
         writeAttribute(node.name(), text,
@@ -180,6 +195,7 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
     case XMLNodeKind::comment:
         if (isChecked() && (holds(text, "--") || text.view().ends_with('-')))
             refuse(R"(a comment holds "--" or ends in "-")", {node});
+        requireSize(text.size(), "a comment is larger than", {node});
         _output += "<!--";
         writeLiteral(text, {node});
         _output += "-->";
@@ -188,6 +204,7 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
         if (isChecked() && (holds(text, "?>") || node.name().equalsIgnoringCase("xml") ||
                             (!text.isEmpty() && isWhite(text.view().front()))))
             refuse("a processing instruction would not be read back as it is", {node});
+        requireSize(text.size(), "a processing instruction is larger than", {node});
         _output += "<?";
         writeName(node.name(), {node});
         if (!text.isEmpty())
@@ -200,15 +217,19 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
     }
 }
 
-void XMLSerializer::writeAttribute(const String& name, std::string_view value,
+bool XMLSerializer::isDeclaration(const String& attribute) noexcept {
+    const std::string_view name = attribute.view();
+    return name.starts_with("xmlns") && (name.size() == 5 || name[5] == ':');
+}
+
+void XMLSerializer::writeAttribute(const String& name, const String& value,
                                    const XMLElement* parent, const Place& place) {
-    // An attribute that would declare a prefix a second time.
-    if (isChecked() && parent != nullptr && name.view().starts_with("xmlns")) {
-        const std::string_view prefix = name.view().substr(std::min<std::size_t>(name.size(), 6));
-        if (name.size() == 5 || name.view()[5] == ':')
-            for (const XMLNode& declared : parent->namespaces())
-                if (declared.name() == prefix)
-                    refuse("a namespace is declared twice", place);
+    requireSize(value.size(), "an attribute's value is larger than", place);
+    if (isChecked() && isDeclaration(name)) {
+        const String prefix = name.view().substr(std::min<std::size_t>(name.size(), 6));
+        if (parent != nullptr && parent->findNode(parent->_firstNamespace, prefix) != nullptr)
+            refuse("a namespace is declared twice", place);
+        countURI(value, place);
     }
     writeName(name, place);
     _output += "=\"";
@@ -223,13 +244,17 @@ void XMLSerializer::writeNamespace(const XMLNode& declaration) {
         writeName(declaration.name(), {declaration});
     }
     _output += "=\"";
-    writeEscaped(declaration.stringValue(), Where::attribute, true, {declaration});
+    requireSize(declaration._value.size(), "a namespace's URI is larger than", {declaration});
+    countURI(declaration._value, {declaration});
+    writeEscaped(declaration._value, Where::attribute, true, {declaration});
     _output += '"';
 }
 
 // White space with a line break would be dropped as layout when the document is read again.
 void XMLSerializer::writeText(const XMLNode& text) {
     const String value = text.stringValue();
+    _textSize += value.size();
+    requireSize(_textSize, "a text is larger than", {text});
     writeEscaped(value, Where::text, !text._isLayout && isWhite(value), {text});
 }
 
@@ -278,12 +303,71 @@ void XMLSerializer::writeLiteral(std::string_view text, const Place& place) {
     _output += text;
 }
 
-void XMLSerializer::writeName(std::string_view name, const Place& place) {
-    if (isChecked() && !isXMLName(name))
-        refuse("a name is no XML name", place);
+void XMLSerializer::writeName(const String& name, const Place& place) {
+    const char* const address = name.view().data();
+    const char*& checked = _checked[reinterpret_cast<std::uintptr_t>(address) / 16 % nameSlots];
+    if (isChecked() && (checked != address || address == nullptr)) {
+        checkName(name, place);
+        checked = address;
+    }
     if (_encoder != nullptr)
         return writeLiteral(name, place);
     _output += name;
+}
+
+void XMLSerializer::checkName(const String& name, const Place& place) {
+    if (!isXMLName(name))
+        refuse("a name is no XML name", place);
+    if (_reading != nullptr)
+        countName(name, place);
+}
+
+void XMLSerializer::enter(const XMLElement& element, std::size_t attributes,
+                          std::size_t declarations) {
+    if (++_depth > _reading->maximumDepth)
+        refuseBeyond("elements nest deeper than", _reading->maximumDepth, {element});
+    if (attributes > xmlLimits::attributes)
+        refuseBeyond("an element has more attributes than", xmlLimits::attributes, {element});
+    _textSize = 0;
+    if (declarations == 0)
+        return;
+    _declarations.push_back({_depth, declarations});
+    _namespaces += declarations;
+    if (_namespaces > xmlLimits::namespaces)
+        refuseBeyond("more namespace declarations are in force than", xmlLimits::namespaces,
+                     {element});
+}
+
+void XMLSerializer::leave() noexcept {
+    if (_reading == nullptr)
+        return;
+    if (!_declarations.empty() && _declarations.back().depth == _depth) {
+        _namespaces -= _declarations.back().count;
+        _declarations.pop_back();
+    }
+    --_depth;
+    _textSize = 0;
+}
+
+void XMLSerializer::requireSize(std::size_t size, std::string_view what, const Place& place) const {
+    if (_reading != nullptr && size > _reading->maximumTextSize)
+        refuseBeyond(what, _reading->maximumTextSize, place);
+}
+
+void XMLSerializer::countName(const String& name, const Place& place) {
+    requireSize(name.size(), "a name is larger than", place);
+    if (_names.insert(name).second)
+        requireFewNames(place);
+}
+
+void XMLSerializer::countURI(const String& URI, const Place& place) {
+    if (_reading != nullptr && _URIs.insert(URI).second)
+        requireFewNames(place);
+}
+
+void XMLSerializer::requireFewNames(const Place& place) const {
+    if (_names.size() + _URIs.size() > xmlLimits::names)
+        refuseBeyond("the document has more different names than", xmlLimits::names, place);
 }
 
 // Empty texts, which no line would show, may stand among nodes that have lines of their own.
@@ -326,6 +410,10 @@ const XMLNode& XMLSerializer::Place::spelledOut() const {
 void XMLSerializer::refuse(std::string_view what, const Place& place) {
     throw Exception(Exception::invalidArgument,
                     String::concat({what, " at ", placeOf(place.spelledOut())}));
+}
+
+void XMLSerializer::refuseBeyond(std::string_view what, std::size_t limit, const Place& place) {
+    refuse(std::string(what) + " the limit of " + std::to_string(limit), place);
 }
 
 std::string placeOf(const XMLNode& node) {

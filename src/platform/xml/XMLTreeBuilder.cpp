@@ -3,6 +3,7 @@
 #include "platform/xml/ParseFailure.h"
 #include "platform/xml/Siblings.h"
 #include "platform/xml/XMLCharacters.h"
+#include "platform/xml/XMLLimits.h"
 
 #include <algorithm>
 #include <libxml/xmlerror.h>
@@ -11,8 +12,7 @@ namespace qx {
 
 namespace {
 
-// For a prefix the parser goes through the declarations in force, one by one.
-constexpr std::size_t maximumNamespaces = 1000;
+constexpr std::size_t maximumNamespaces = xmlLimits::namespaces;
 
 std::uint32_t saturated(std::size_t number) {
     return static_cast<std::uint32_t>(std::min<std::size_t>(number, UINT32_MAX));
@@ -41,15 +41,18 @@ void XMLTreeBuilder::startElement(const String& name, std::size_t attributes, st
         XMLSiblings::append(_document, _document._firstChild, element);
     else
         appendChild(*_open.back().element, element);
+    element->expectAttributes(attributes);
     _open.push_back({element, _layouts.size(), namespaces, false, preserves});
 }
 
 void XMLTreeBuilder::addNamespace(const String& prefix, const String& URI) {
     if (++_open.back().namespaces > maximumNamespaces)
         throw ParseFailure(parseErrors::tooManyNamespaces, {maximumNamespaces});
+    requireSize(URI.size(), parseErrors::valueTooLarge);
     XMLElement& element = *_open.back().element;
-    XMLSiblings::append(element, element._firstNamespace,
-                        newNode(XMLNodeKind::namespaceDeclaration, prefix, URI));
+    element.appendUnlessThere(
+        element._firstNamespace,
+        Ref<XMLNode>::adopt(newNode(XMLNodeKind::namespaceDeclaration, prefix, URI)));
 }
 
 void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
@@ -59,8 +62,8 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
     if (element.canHoldAttribute())
         element.holdAttribute(name, _values.valued(value));
     else
-        XMLSiblings::append(element, element._firstAttribute,
-                            newNode(XMLNodeKind::attribute, name, _values.valued(value)));
+        element.appendAttribute(
+            Ref<XMLNode>::adopt(newNode(XMLNodeKind::attribute, name, _values.valued(value))));
 }
 
 void XMLTreeBuilder::endElement() {

@@ -88,6 +88,8 @@ TEST(ValueTest, AnyValueIsANumberAndATruth) {
                  {1e30, INT64_MAX, true},
                  {-1e30, INT64_MIN, true},
                  {" -007 pieces", -7, true},
+                 {"\xC2\x85\xC2\xA0\xE2\x80\x83\xE2\x80\xA8\xE3\x80\x80\x0B+7", 7, false},
+                 {"\xE3\x80", 0, false},
                  {"Yes", 0, true},
                  {"  ", 0, false},
                  {"+0", 0, false},

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/platform/Exception.h>
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include <ctime>
 #include <functional>
 #include <gtest/gtest.h>
 #include <thread>
@@ -182,6 +183,43 @@ TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
               "a text holds a control character at /a/@b");
     refused->removeAttributeForName("b");
     EXPECT_EQ(refused->XMLString(), "<a></a>");
+}
+
+TEST(XMLElement, VeryManyAttributesAndNamespacesTakeNoLongerEach) {
+    constexpr int count = 40'000;
+    const std::clock_t start = std::clock();
+    const auto element = XMLElement::initWithName("a");
+    std::vector<Ref<XMLNode>> declarations;
+    const auto name = [](int i) { return "n" + std::to_string(i % count); };
+    for (int i = 0; i < count + 100; ++i) { // the last ones are there already
+        element->addAttribute(name(i), std::to_string(i));
+        element->addNamespace(XMLNode::namespaceWithName(name(i), std::to_string(i)));
+        declarations.push_back(XMLNode::namespaceWithName(name(i), "set"));
+    }
+    const Ref<XMLElement> copied(element->copy()->asElement());
+    element->setNamespaces(declarations);
+    for (const Ref<XMLElement>& one : {element, copied}) {
+        int at = 0;
+        for (const XMLNode& attribute : one->attributes())
+            EXPECT_EQ(attribute.stringValue().view(), std::to_string(at++));
+        for (const XMLNode& declaration : one->namespaces()) {
+            const std::string value = one == element ? "set" : std::to_string(at - count);
+            EXPECT_TRUE(declaration.stringValue().view() == value && ++at > 0);
+        }
+        EXPECT_EQ(at, 2 * count);
+        for (int i = 0; i < count; ++i) {
+            EXPECT_EQ(one->attributeValue(name(i)).view(), std::to_string(i));
+            one->removeAttributeForName(name(i));
+            EXPECT_TRUE(one->attributeValue(name(i)).isNull());
+        }
+        EXPECT_TRUE(one->attributes().empty());
+        one->addAttribute("n7", "again");
+        EXPECT_EQ(one->attributeForName("n7")->stringValue(), "again");
+    }
+    element->setNamespaces({});
+    element->addNamespace(XMLNode::namespaceWithName("n7", "again"));
+    EXPECT_EQ(element->XMLString(), "<a xmlns:n7=\"again\" n7=\"again\"></a>");
+    EXPECT_LT(std::clock() - start, 15 * CLOCKS_PER_SEC);
 }
 
 TEST(XMLElement, TheFirstOfTwoEqualPrefixesWins) {

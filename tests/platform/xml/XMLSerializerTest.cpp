@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/platform/XMLDocument.h>
 
+#include <functional>
 #include <gtest/gtest.h>
 
 namespace {
@@ -10,6 +11,7 @@ using qx::Ref;
 using qx::XMLDocument;
 using qx::XMLElement;
 using qx::XMLNode;
+using namespace std::string_literals;
 
 std::string utf8(char32_t c) {
     const auto byte = [](char32_t bits) { return static_cast<char>(bits); };
@@ -146,6 +148,104 @@ TEST(XMLSerializer, WhatWouldBeNoXMLIsRefusedByItsPlace) {
                   "NSInvalidArgumentException: " + reason);
         EXPECT_TRUE(document->description().view().starts_with("<order><item></item><item"));
     }
+}
+
+// Rows make <a> with as much in it as may be read, or one more.
+TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
+    const auto x = [](std::size_t size) { return std::string(size, 'x'); };
+    const auto number = [](std::size_t i) { return "n" + std::to_string(i); };
+    const auto nested = [](XMLElement& a, std::size_t depth) {
+        Ref<XMLElement> inner = XMLElement::initWithName("b", "text");
+        for (std::size_t i = 2; i < depth; ++i) {
+            auto outer = XMLElement::initWithName("b");
+            outer->addChild(inner);
+            inner = outer;
+        }
+        a.addChild(inner);
+    };
+    const auto declared = [&](XMLElement& element, std::size_t from, std::size_t to) {
+        for (std::size_t i = from; i < to; ++i)
+            element.addNamespace(XMLNode::namespaceWithName(number(i), "u"));
+    };
+    const qx::XMLParseOptions usual;
+    const qx::XMLParseOptions deep{.maximumDepth = 1000};
+    const qx::XMLParseOptions small{.maximumTextSize = 100};
+    const struct {
+        const char* reason;
+        qx::XMLParseOptions reading;
+        std::function<void(XMLElement& a, std::size_t extra)> fill;
+    } rows[] = {
+        {"elements nest deeper than the limit of 256", usual,
+         [&](XMLElement& a, std::size_t extra) { nested(a, 256 + extra); }},
+        {"elements nest deeper than the limit of 1000", deep,
+         [&](XMLElement& a, std::size_t extra) { nested(a, 1000 + extra); }},
+        {"an element has more attributes than the limit of 4096", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             declared(a, 0, 96);
+             for (std::size_t i = 0; i < 4000 + extra; ++i)
+                 a.addAttribute(number(i), "value");
+         }},
+        {"more namespace declarations are in force than the limit of 1000", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             declared(a, 0, 600);
+             a.addAttribute("xmlns:p", "u");
+             for (int i = 0; i < 3; ++i) { // one beside the other
+                 auto b = XMLElement::initWithName("b");
+                 declared(*b, 600, 999 + extra);
+                 a.addChild(b);
+             }
+         }},
+        {"a text is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             for (const std::size_t size : {60 + extra, std::size_t{0}, std::size_t{40}})
+                 a.addChild(XMLNode::initTextWithStringValue(x(size)));
+             a.addChild(XMLElement::initWithName("b"));
+             a.addChild(XMLNode::initTextWithStringValue(x(100)));
+         }},
+        {"an attribute's value is larger than the limit of 10000000", usual,
+         [&](XMLElement& a, std::size_t extra) { a.addAttribute("b", x(10'000'000 + extra)); }},
+        {"a namespace's URI is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addNamespace(XMLNode::namespaceWithName("", x(100 + extra)));
+         }},
+        {"a comment is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addChild(XMLNode::initCommentWithStringValue(x(100 + extra)));
+         }},
+        {"a processing instruction is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addChild(XMLNode::initProcessingInstructionWithName("p", x(100 + extra)));
+         }},
+        {"a name is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) { a.addAttribute(x(100 + extra), ""); }},
+        {"a part of a name is larger than the limit of 50000", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addChild(XMLElement::initWithName("p:" + x(50'000 + extra)));
+         }},
+        {"the document has more different names than the limit of 100000", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addNamespace(XMLNode::namespaceWithName("p", "u"));
+             for (std::size_t i = 0; i < 100'000 - 3 + extra; ++i)
+                 a.addChild(XMLElement::initWithName(number(i)));
+             a.addChild(XMLElement::initWithName(number(7)));
+         }},
+    };
+    for (const auto& [reason, reading, fill] : rows)
+        for (const std::size_t extra : {0, 1}) {
+            const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
+            fill(*document->rootElement(), extra);
+            Ref<qx::Error> error;
+            const auto read = XMLDocument::initWithData(
+                document->XMLString(qx::XMLCompactEmptyElements), reading, &error);
+            EXPECT_EQ(read.get() != nullptr, extra == 0)
+                << reason << (error ? error->localizedDescription().str() : "");
+            const std::string outcome = support::raised([&] {
+                static_cast<void>(document->XMLData(qx::XMLPrettyPrint, reading));
+                static_cast<void>(document->XMLString(qx::XMLNoOptions, reading));
+            });
+            const std::string refusal = "NSInvalidArgumentException: "s + reason + " at ";
+            EXPECT_EQ(outcome.substr(0, refusal.size()), extra == 0 ? "nothing" : refusal);
+        }
 }
 
 TEST(XMLSerializer, ADocumentDeclaresWhatIsSet) {

@@ -1,0 +1,41 @@
+#pragma once
+
+// The last child element of each name, for an element that is being written and has many children
+// by now. Children that are appended meanwhile are found when somebody asks; a host that takes
+// others out has them forgotten.
+
+#include <QXXMLMarshalling/platform/XMLElement.h>
+
+#include "resolved/MappingPlan.h"
+
+class LastChildren {
+public:
+    // Null when no child has that name.
+    qx::XMLElement* named(const qx::XMLElement& parent, const qx::String& name) {
+        catchUp(parent);
+        const auto found = _last.find(name);
+        const bool isThere = found != _last.end() && found->second->parent() == &parent;
+        return isThere ? found->second->asElement() : nullptr;
+    }
+
+    // Looks at the children behind the last one that was looked at.
+    void catchUp(const qx::XMLElement& parent) {
+        const bool goesOn = _seen && _seen->parent() == &parent;
+        if (!goesOn)
+            _last.clear();
+        qx::XMLNode* child = goesOn ? _seen->nextSibling() : parent.firstChild();
+        for (; child != nullptr; child = child->nextSibling())
+            see(*child);
+    }
+
+    // The child was appended, after all others had been looked at.
+    void see(qx::XMLNode& child) {
+        if (child.isElement())
+            _last.insert_or_assign(child.name(), qx::Ref<qx::XMLNode>(&child));
+        _seen = qx::Ref<qx::XMLNode>(&child);
+    }
+
+private:
+    qx::Ref<qx::XMLNode> _seen;
+    StringMap<qx::Ref<qx::XMLNode>> _last;
+};

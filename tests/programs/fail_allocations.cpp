@@ -1,0 +1,356 @@
+// Has each allocation of each operation of a marshaller fail, one run after the other: once alone,
+// once with all that follow. The operation then gives std::bad_alloc or what it gives otherwise,
+// and does its work on the same objects when it is called again.
+
+#include <QXXMLMarshalling/QXXMLMarshalling.h>
+
+#include <array>
+#include <cstdlib>
+#include <functional>
+#include <iostream>
+#include <new>
+#include <streambuf>
+
+#include <dlfcn.h>
+
+namespace {
+
+constexpr long never = -1;
+long countdown = never; // allocations until one fails
+bool allFollowing = false;
+long failures = 0;
+
+bool failsNow() {
+    if (countdown > 0)
+        --countdown;
+    else if (countdown == 0) {
+        ++failures;
+        countdown = allFollowing ? 0 : never;
+        return true;
+    }
+    return false;
+}
+
+void* allocated(std::size_t size) {
+    void* const memory = failsNow() ? nullptr : std::malloc(size);
+    if (memory == nullptr)
+        throw std::bad_alloc();
+    return memory;
+}
+
+} // namespace
+
+// The memory of texts. What Clang links into a program of its own for the sanitizers stays there.
+#ifndef __clang__
+extern "C" void* realloc(void* memory, std::size_t size) {
+    using Realloc = void* (*)(void*, std::size_t);
+    static const auto next = reinterpret_cast<Realloc>(::dlsym(RTLD_NEXT, "realloc"));
+    return failsNow() ? nullptr : next(memory, size);
+}
+#endif
+
+void* operator new(std::size_t size) { return allocated(size); }
+void* operator new[](std::size_t size) { return allocated(size); }
+void operator delete(void* memory) noexcept { std::free(memory); }
+void operator delete[](void* memory) noexcept { std::free(memory); }
+void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
+void operator delete[](void* memory, std::size_t) noexcept { std::free(memory); }
+
+namespace {
+
+using qx::Error;
+using qx::Ref;
+
+constexpr const char* mappingText = R"(<mapping>
+    <class name="Order" extends="Base"><map-to xml="order" ns-uri="urn:o"/>
+        <field name="number" required="true"><bind-xml name="n" node="attribute"/></field>
+        <field name="day"><bind-xml name="on" node="attribute" location="received"/></field>
+        <field name="text"><bind-xml name="text" node="element"/></field>
+        <field name="any"><bind-xml name="any"/></field>
+        <field name="to" type="Address"><bind-xml name="to" node="element"/></field>
+        <field name="lines" type="Line" collection="array">
+            <bind-xml name="line" location="lines"/></field>
+        <field name="rest" collection="array"><bind-xml name="rest"/></field>
+        <field name="flat" type="Address" container="false"><bind-xml node="element"/></field>
+    </class>
+    <class name="Base"><field name="count" type="int"><bind-xml name="c" node="attribute"/></field>
+    </class>
+    <class name="Address"><field name="street"><bind-xml name="street" node="element"/></field>
+    </class>
+    <class name="Line"><field name="text"><bind-xml node="text"/></field></class>
+</mapping>)";
+constexpr const char* documentText =
+    "<order xmlns='urn:o' xmlns:p='urn:p' n='a number that is long' c='7' extra='1'>"
+    "<received on='today'/><text>a text that needs memory of its own</text><any>any</any>"
+    "<to><street>Quay</street><more/></to><lines><line>one</line><line>two</line></lines>"
+    "<rest><line>three</line></rest><street>Road</street><unknown a='1'>kept</unknown></order>";
+
+// What one operation works on; made anew for each run, without failures.
+struct Stage {
+    Ref<QXXMLMarshaller> marshaller =
+        QXXMLMarshaller::initWithMappingXML(qx::XMLDocument::initWithData(mappingText).get());
+    Ref<qx::XMLDocument> document = qx::XMLDocument::initWithData(documentText);
+    Ref<qx::XMLElement> root{document->rootElement()};
+    Ref<qx::Object> order = marshaller->readString(documentText);
+    Ref<QXGenericRecord> target = qx::make<QXGenericRecord>();
+    Ref<qx::XMLElement> written = qx::XMLElement::initWithName("order");
+    Ref<qx::CountedSet> fields = qx::make<qx::CountedSet>();
+    Ref<qx::CountedSet> attributes = qx::make<qx::CountedSet>();
+    Ref<Error> error;
+
+    Stage() { target->setClassNameForMarshalling("Order"); }
+    const QXXMLClassMapping& type() const {
+        return *marshaller->mapping()->mappingForClassName("Order");
+    }
+    const QXXMLFieldMapping& field(std::size_t i) const { return *type().fields()[i]; }
+    // What the operation gave or changed. Moves kept XML, as writing does.
+    template <class T>
+    std::string shown(const Ref<T>& made) {
+        Ref<qx::XMLElement> element;
+        if constexpr (std::is_same_v<T, qx::XMLElement>)
+            element = made;
+        else
+            element = marshaller->marshallObject(made, error ? nullptr : &error);
+        return element ? element->XMLString().str()
+                       : "none: " + (error ? error->description().str() : "no error");
+    }
+    std::string bound(bool result) {
+        return (result ? "true " : "false ") + shown(target) + fields->description().str() +
+               attributes->description().str();
+    }
+};
+
+// A stream's memory: what failed here would be the stream's failure, which it keeps to itself.
+class Buffer : public std::streambuf {
+public:
+    Buffer() { setp(_room.data(), _room.data() + _room.size()); }
+    std::string text() const { return {pbase(), pptr()}; }
+
+private:
+    std::array<char, 4096> _room;
+};
+
+// Does its work on the stage; what it returns then shows the outcome.
+using Operation = std::function<std::function<std::string()>(Stage&)>;
+
+struct Named {
+    std::string name;
+    Operation run;
+    // What a run that failed may leave in place, which a second one then adds to.
+    std::function<void(Stage&)> restore = [](Stage&) {};
+};
+
+// What a flattened object took out of its element before memory failed stays out.
+void startAgain(Stage& stage) {
+    stage.document = qx::XMLDocument::initWithData(documentText);
+    stage.root = Ref<qx::XMLElement>(stage.document->rootElement());
+    stage.fields->removeAll();
+    stage.attributes->removeAll();
+}
+
+template <class Make>
+Named making(const char* name, Make make) {
+    return {name, [make](Stage& stage) {
+                const auto made = make(stage);
+                return [&stage, made] { return stage.shown(made); };
+            }};
+}
+
+template <class Bind>
+Named binding(const std::string& name, Bind bind) {
+    return {name,
+            [bind](Stage& stage) {
+                const bool result = bind(stage);
+                return [&stage, result] { return stage.bound(result); };
+            },
+            startAgain};
+}
+
+template <class Write>
+Named writing(const std::string& name, Write write) {
+    return {name,
+            [write](Stage& stage) {
+                const bool result = write(stage);
+                return [&stage, result] {
+                    return (result ? "true " : "false ") + stage.shown(stage.written);
+                };
+            },
+            [](Stage& stage) { stage.written = qx::XMLElement::initWithName("order"); }};
+}
+
+std::vector<Named> readingOperations() {
+    std::vector<Named> all{
+        {"initWithMappingXML",
+         [](Stage& s) {
+             const auto made =
+                 QXXMLMarshaller::initWithMappingXML(s.marshaller->mapping()->document(), &s.error);
+             return [made] {
+                 return std::to_string(made ? made->mapping()->mapping()->classMappings().size()
+                                            : 0);
+             };
+         }},
+        making("unmarshall",
+               [](Stage& s) { return s.marshaller->unmarshall(s.document, &s.error); }),
+        making("unmarshallElement",
+               [](Stage& s) { return s.marshaller->unmarshallElement(s.root.get(), &s.error); }),
+        making("buildClassWithMapping",
+               [](Stage& s) {
+                   return s.marshaller->buildClassWithMapping(s.type(), s.root.get(), false,
+                                                              &s.error);
+               }),
+        making("allocateClassWithMapping",
+               [](Stage& s) {
+                   auto made = s.marshaller->allocateClassWithMapping(s.type(), &s.error);
+                   made->setValueForKey("n", "number");
+                   made->setValueForKey(s.order, "flat");
+                   return made;
+               }),
+        making("readString",
+               [](Stage& s) { return s.marshaller->readString(documentText, &s.error); }),
+        binding("bindFieldsWithMapping",
+                [](Stage& s) {
+                    return s.marshaller->bindFieldsWithMapping(
+                        s.type(), *s.target, *s.root, *s.fields, *s.attributes, false, &s.error);
+                }),
+        binding("validateBoundFields",
+                [](Stage& s) {
+                    return s.marshaller->validateBoundFields(*s.fields, *s.attributes, *s.root,
+                                                             *s.target, &s.error);
+                }),
+        binding("TakeValueForKey", [](Stage& s) {
+            return TakeValueForKey(*s.target, "text", "a text of some length", s.field(2),
+                                   &s.error);
+        })};
+    const std::size_t count = Stage().type().fields().size();
+    for (std::size_t i = 0; i < count; ++i) {
+        const std::string number = " " + std::to_string(i);
+        all.push_back(binding("bindField" + number, [i](Stage& s) {
+            return s.marshaller->bindField(s.field(i), *s.target, 0, *s.root, *s.fields,
+                                           *s.attributes, false, &s.error);
+        }));
+        all.push_back(binding("bindFieldAsAttribute" + number, [i](Stage& s) {
+            return s.marshaller->bindFieldAsAttribute(s.field(i), *s.target, 0, *s.root, *s.fields,
+                                                      *s.attributes, &s.error);
+        }));
+        all.push_back(binding("bindFieldAsText" + number, [i](Stage& s) {
+            return s.marshaller->bindFieldAsText(s.field(i), *s.target, 0, *s.root, *s.fields,
+                                                 *s.attributes, &s.error);
+        }));
+        all.push_back(binding("bindFieldAsElement" + number, [i](Stage& s) {
+            return s.marshaller->bindFieldAsElement(s.field(i), *s.target, 0, *s.root, *s.fields,
+                                                    *s.attributes, false, &s.error);
+        }));
+        all.push_back(binding("bindCollectionField" + number, [i](Stage& s) {
+            return s.marshaller->bindCollectionField(s.field(i), *s.target, *s.root, *s.fields,
+                                                     *s.attributes, &s.error);
+        }));
+        all.push_back(binding("bindArrayFieldByType" + number, [i](Stage& s) {
+            return s.marshaller->bindArrayFieldByType(s.field(i), *s.target, *s.root, *s.fields,
+                                                      *s.attributes, &s.error);
+        }));
+    }
+    return all;
+}
+
+std::vector<Named> writingOperations() {
+    std::vector<Named> all{
+        making("marshallObject",
+               [](Stage& s) { return s.marshaller->marshallObject(s.order, &s.error); }),
+        making("elementWithMapping",
+               [](Stage& s) {
+                   return s.marshaller->elementWithMapping(s.type(), *s.order, &s.error);
+               }),
+        making("marshall",
+               [](Stage& s) {
+                   const auto document = s.marshaller->marshall(s.order, &s.error);
+                   return Ref<qx::XMLElement>(document ? document->rootElement() : nullptr);
+               }),
+        {"writeString",
+         [](Stage& s) {
+             const qx::String text = s.marshaller->writeString(s.order, &s.error);
+             return [text] { return text.str(); };
+         }},
+        {"writeStream",
+         [](Stage& s) {
+             auto buffer = std::make_shared<Buffer>();
+             std::ostream out(buffer.get());
+             const bool result = s.marshaller->writeStream(s.order, out, &s.error);
+             return [buffer, result] { return (result ? "true " : "false ") + buffer->text(); };
+         }},
+        writing("bindFieldMappings", [](Stage& s) {
+            return s.marshaller->bindFieldMappings(s.type(), *s.written, *s.order, &s.error);
+        })};
+    const std::size_t count = Stage().type().fields().size();
+    for (std::size_t i = 0; i < count; ++i) {
+        const std::string number = " " + std::to_string(i);
+        all.push_back(writing("mapField" + number, [i](Stage& s) {
+            return s.marshaller->mapField(s.field(i), *s.written, *s.order, &s.error);
+        }));
+    }
+    all.push_back(writing("mapArray", [](Stage& s) {
+        const auto lines = s.order->valueForKey("lines").as<qx::Array>();
+        return s.marshaller->mapArray(*lines, *s.written, s.field(5), &s.error);
+    }));
+    return all;
+}
+
+std::string outcome(const Named& operation, Stage& stage) {
+    const auto show = operation.run(stage);
+    countdown = never;
+    return show();
+}
+
+bool complain(const std::string& what, long n, const std::string& got,
+              const std::string& expected) {
+    std::cout << what << ", allocation " << n << ":\n  " << got << "\ninstead of\n  " << expected
+              << '\n';
+    return false;
+}
+
+bool survives(const Named& operation) {
+    std::string expected;
+    {
+        Stage stage;
+        expected = outcome(operation, stage);
+    }
+    for (allFollowing = false;; allFollowing = true) {
+        for (long n = 0;; ++n) {
+            Stage stage;
+            failures = 0;
+            bool threw = false;
+            countdown = n;
+            try {
+                const std::string got = outcome(operation, stage);
+                if (got != expected)
+                    return complain(operation.name, n, got, expected);
+            } catch (const std::bad_alloc&) {
+                threw = true;
+            }
+            countdown = never;
+            if (failures == 0)
+                break;
+            if (!threw)
+                continue;
+            operation.restore(stage);
+            stage.error = nullptr;
+            const std::string again = outcome(operation, stage);
+            if (again != expected)
+                return complain(operation.name + " called again", n, again, expected);
+        }
+        if (allFollowing)
+            return true;
+    }
+}
+
+} // namespace
+
+extern "C" void QXLogWarning(std::string_view, std::span<const qx::Value>) {}
+extern "C" void QXLogDebug(std::string_view, std::span<const qx::Value>) {}
+
+int main() {
+    bool good = true;
+    for (const auto& operations : {readingOperations(), writingOperations()})
+        for (const Named& operation : operations)
+            good = survives(operation) && good;
+    return good ? 0 : 1;
+}
