@@ -102,7 +102,7 @@ std::vector<ObservationInfo::Concerned> ObservationInfo::concernedBy(Key key) co
     for (const ObservationLink& link : found->second.links)
         concerned.push_back({Ref<Observance>(link.observance), link.endsPath});
     // A path that was walked again has got new links at the end.
-    std::stable_sort(concerned.begin(), concerned.end(), [](const auto& one, const auto& other) {
+    std::sort(concerned.begin(), concerned.end(), [](const auto& one, const auto& other) {
         return one.observance->isEarlierThan(*other.observance);
     });
     return concerned;
@@ -133,8 +133,8 @@ std::vector<Ref<Observance>> ObservationInfo::outdatedBy(Key key) const {
     for (const ObservationLink& link : *links)
         if (link.observance->isOutdated() || (link.leadsOn && link.next != objectLedTo(value)))
             outdated.emplace_back(link.observance);
-    std::stable_sort(outdated.begin(), outdated.end(),
-                     [](const auto& one, const auto& other) { return one->isEarlierThan(*other); });
+    std::sort(outdated.begin(), outdated.end(),
+              [](const auto& one, const auto& other) { return one->isEarlierThan(*other); });
     return outdated;
 }
 
