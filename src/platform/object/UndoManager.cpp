@@ -222,13 +222,12 @@ struct UndoManager::State::Performance {
     // values that some objects have already, and nothing is lost.
     void takeBack() noexcept {
         closeGroupsAbove(state.floor + 1);
-        const std::size_t disabled = std::exchange(state.disabled, 1);
+        isTakingBack = true;
         std::exception_ptr ignored;
         bool memoryLasts = true;
         while (!perform(recording(), takenBack, ignored))
             memoryLasts = false;
         closeGroupsAbove(state.floor + 1);
-        state.disabled = disabled;
         if (!memoryLasts)
             recording().takeAllReversed(takenBack);
         group->takeAllReversed(performed);
@@ -244,6 +243,7 @@ struct UndoManager::State::Performance {
     std::size_t outerFloor;
     std::unique_ptr<UndoItemGroup> group;
     UndoAction* running = nullptr;
+    bool isTakingBack = false; // nothing is registered then
     UndoItemGroup performed;
     UndoItemGroup takenBack;
 };
@@ -392,7 +392,10 @@ void UndoManager::enableUndoRegistration() {
     --_state->disabled;
 }
 
-bool UndoManager::isUndoRegistrationEnabled() const noexcept { return _state->disabled == 0; }
+bool UndoManager::isUndoRegistrationEnabled() const noexcept {
+    const State::Performance* performance = _state->performance;
+    return _state->disabled == 0 && (performance == nullptr || !performance->isTakingBack);
+}
 
 void UndoManager::undo() {
     const Ref<UndoManager> kept(this);

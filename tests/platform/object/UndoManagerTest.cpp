@@ -245,6 +245,12 @@ TEST_F(UndoManagerTest, ActionsMayDoAnythingToTheManagerAndItsTargets) {
         [](Counter& c) { c.manager.setLevelsOfUndo(1); },
         [](Counter& c) { c.manager.endEventGroup(); },
         [](Counter& c) {
+            c.manager.registerUndo(c, [](Counter& changed) {
+                changed.setNumber(7);
+                changed.manager.enableUndoRegistration();
+            });
+        },
+        [](Counter& c) {
             const UndoGroup group(c.manager, "Inner");
             c.setNumber(9);
             c.manager.endUndoGrouping();
@@ -275,7 +281,7 @@ TEST_F(UndoManagerTest, ActionsMayDoAnythingToTheManagerAndItsTargets) {
             EXPECT_FALSE(manager->isUndoing() || manager->groupingLevel() != 0);
             EXPECT_TRUE(!manager->canRedo() || manager->redoActionName() == "Outer");
             while (manager->canRedo())
-                manager->redo();
+                raised([&] { manager->redo(); });
             manager->removeAllActions();
         }
 }
