@@ -101,7 +101,9 @@ public:
     // Raises NSInvalidArgumentException as XMLString does, and for an unknown encoding.
     std::string XMLData(XMLOptions options = XMLNoOptions) const;
     // Writes XMLData to a file atomically: to a temporary file beside it, which then takes its
-    // place. False with an error that says what and where; the old file is then untouched.
+    // place and its permissions. What a symbolic link leads to is replaced, other hard links keep
+    // the old bytes, pipes and devices are refused. False with an error that says what and where
+    // (512, 513, 640, 642); the old file is then untouched.
     bool writeToFile(const String& path, XMLOptions options = XMLNoOptions,
                      Ref<Error>* error = nullptr) const;
     // False with an error when the stream fails.
