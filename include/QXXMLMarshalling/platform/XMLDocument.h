@@ -120,8 +120,9 @@ public:
     using XMLNode::XMLString;
     String XMLString(XMLOptions options, const XMLParseOptions& reading) const;
     // Writes XMLData to a file atomically: to a temporary file beside it, which then takes its
-    // place. False with an error that says what and where; raises as XMLData does. The old file is
-    // untouched then.
+    // place and its permissions. What a symbolic link leads to is replaced, other hard links keep
+    // the old bytes, pipes and devices are refused. False with an error that says what and where
+    // (512, 513, 640, 642); raises as XMLData does. The old file is then untouched.
     bool writeToFile(const String& path, XMLOptions options = XMLNoOptions,
                      Ref<Error>* error = nullptr, const XMLParseOptions& reading = {}) const;
     // False with an error when the stream fails. Raises as XMLData does, with nothing written.

@@ -18,6 +18,18 @@ bool isSameFile(const struct stat& a, const struct stat& b) {
     return a.st_dev == b.st_dev && a.st_ino == b.st_ino;
 }
 
+// In a folder where anybody may put something, a link that somebody else put there may lead to a
+// file that only this process can write. Most systems refuse to follow such links by themselves.
+bool isTrap(const std::string& link) {
+    constexpr mode_t shared = S_ISVTX | S_IWOTH;
+    struct stat own {};
+    struct stat folder {};
+    if (::lstat(link.c_str(), &own) != 0 || ::stat(directoryOf(link).c_str(), &folder) != 0)
+        return true;
+    return (folder.st_mode & shared) == shared && own.st_uid != ::geteuid() &&
+           own.st_uid != folder.st_uid;
+}
+
 // What is to be replaced.
 struct Target {
     enum class Kind : std::uint8_t { nothing, file, special, unknown };
@@ -43,6 +55,8 @@ int Target::followLinks(std::size_t& count) {
         const std::string_view next(link, static_cast<std::size_t>(length));
         if (next.size() == sizeof link)
             return ENAMETOOLONG;
+        if (isTrap(path))
+            return EACCES;
         path =
             next.starts_with('/') ? std::string(next) : directoryOf(path).append("/").append(next);
     }
@@ -58,7 +72,7 @@ int Target::find() {
         return 0;
     if (failure != 0) {
         kind = Kind::unknown;
-        return links == 0 ? 0 : failure; // nobody may follow another's link where it is a trap
+        return links == 0 ? 0 : failure;
     }
     if (S_ISDIR(status.st_mode))
         return EISDIR;

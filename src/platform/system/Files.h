@@ -32,8 +32,8 @@ Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr,
 //   Where the group cannot be, its rights go to no other, and where the permissions cannot be told,
 //   the new file is the owner's alone. The folder has to be writable, the file has not;
 // - other hard links keep the old bytes;
-// - symbolic links that the path ends in stay: what they lead to is replaced, or made. One that the
-//   system refuses to follow is an error;
+// - symbolic links that the path ends in stay: what they lead to is replaced, or made. One that
+//   another user put into a folder like /tmp is not followed (513);
 // - pipes, sockets and devices are refused (512), directories too.
 // A temporary file is called ".~qx-save-N.tmp". What a writer left that was killed is removed by
 // the next that saves into the same folder.

@@ -155,6 +155,22 @@ TEST_F(FilesTest, AFileThatIsReplacedKeepsTheRightsThatItsWriterMayGive) {
     }
 }
 
+TEST_F(FilesTest, AnothersLinkInASharedFolderIsNotFollowed) {
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only the superuser can make another's link";
+    const std::string link = sandbox.path("shared/a.xml");
+    sandbox.write("victim.xml", "old");
+    std::filesystem::create_directory(sandbox.path("shared"));
+    std::filesystem::create_symlink("../victim.xml", link);
+    ASSERT_EQ(::lchown(link.c_str(), 99, 99), 0);
+    ASSERT_EQ(::chmod(sandbox.path("shared").c_str(), 01777), 0);
+    Ref<Error> error;
+    EXPECT_FALSE(writeFileAtomically(link, "new", &error));
+    EXPECT_EQ(error->code(), 513);
+    EXPECT_EQ(sandbox.read("victim.xml"), "old");
+    EXPECT_EQ(sandbox.list("shared"), "a.xml ");
+}
+
 TEST_F(FilesTest, AnAccessListIsKeptAndNoneIsInherited) {
     // Version 2; owner, user 1234, group, mask, others.
     const auto list = [](char group) {
