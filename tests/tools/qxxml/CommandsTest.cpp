@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <regex>
+
 namespace {
 
 constexpr const char* mapping = R"(<mapping>
@@ -98,21 +100,19 @@ const Case cases[] = {
      {1, "",
       "qxxml: warning: <count>: Unable to convert value to integer: many\n"
       "qxxml: error -221: <count>: Unable to convert value to integer: many\n"}},
+    // The column and the text behind it are the parser's, whose version decides.
     {"a parse error names file, line and column",
-     "qxxml read mapping.xml open.xml; qxxml read mapping.xml - <open.xml",
-     {1, "",
-      "qxxml: error 76: open.xml:2:17: Opening and ending tag mismatch: line line 2 and order\n"
-      "qxxml: error 76: <stdin>:2:17: Opening and ending tag mismatch: line line 2 and order\n"}},
+     "for file in open.xml -; do qxxml read mapping.xml $file <open.xml 2>&1 | "
+     "sed -E 's/:[1-9][0-9]*: .+/ and column/'; done",
+     {0, "qxxml: error 76: open.xml:2 and column\nqxxml: error 76: <stdin>:2 and column\n", ""}},
     {"a DOCTYPE is refused when that is asked for",
      "echo '<!DOCTYPE other [<!ENTITY e \"x\">]><other>&e;</other>' >dtd.xml; "
      "qxxml read --no-doctype mapping.xml dtd.xml",
      {1, "",
       "qxxml: error 1: dtd.xml:1:17: The document has a DOCTYPE, which is not allowed here\n"}},
     {"a parse error in an include of an include names that file",
-     "qxxml describe maps/outer.xml",
-     {1, "",
-      "qxxml: error 76: maps/broken.xml:2:18: Opening and ending tag mismatch: class line 2 and "
-      "mapping\n"}},
+     "qxxml describe maps/outer.xml 2>&1 | sed -E 's/:[1-9][0-9]*: .+/ and column/'",
+     {0, "qxxml: error 76: maps/broken.xml:2 and column\n", ""}},
     {"a mapping that includes itself fails",
      "qxxml describe maps/self.xml",
      {1, "", "qxxml: error -218: Unable to load included file: self.xml\n"}},
@@ -159,23 +159,27 @@ const Case cases[] = {
       "qxxml: error 512: The standard output cannot be written: No space left on device\n"
       "qxxml: error 512: The standard output cannot be written: Bad file descriptor\n"
       "qxxml: error 512: The standard output cannot be written: Broken pipe\n"}},
-    {"wrong usage has a status of its own",
-     "for arguments in '' tell 'read mapping.xml' 'read a b c' 'read --fast a b' "
-     "'where x --application ..' 'where x --application A/' "
-     "'where x --application A/v2' 'where x --application A/..'; do "
-     "qxxml $arguments 2>&1 | sed 1q; qxxml $arguments 2>&- || echo $?; done",
+    {"wrong usage has a status of its own, and says what is wrong",
+     "check() { qxxml $2 2>&1 >/dev/null | grep -cE \"^qxxml: .*$1\"; qxxml $2 2>&- || echo $?; }; "
+     "check subcommand; check 'subcommand|tell' tell; check DOCUMENT 'read mapping.xml'; "
+     "check ' c$' 'read a b c'; check ' --fast$' 'read --fast a b'",
+     {0, "1\n2\n1\n2\n1\n2\n1\n2\n1\n2\n", ""}},
+    {"an application and its version are checked",
+     "for name in .. A/ A/v2 A/..; do qxxml where x --application $name 2>&1 | "
+     "sed -nE '1s/.*--application: //p'; qxxml where x --application $name 2>&- || echo $?; done",
      {0,
-      "qxxml: A subcommand is required\n2\n"
-      "qxxml: A subcommand is required\n2\n"
-      "qxxml: DOCUMENT is required\n2\n"
-      "qxxml: The following argument was not expected: c\n2\n"
-      "qxxml: The following argument was not expected: --fast\n2\n"
-      "qxxml: --application: an application's name is a file name, not \"..\"\n2\n"
-      "qxxml: --application: NAME or NAME/VERSION is expected, not \"A/\"\n2\n"
-      "qxxml: --application: a version begins with a number, unlike \"v2\"\n2\n"
-      "qxxml: --application: a version begins with a number, unlike \"..\"\n2\n",
+      "an application's name is a file name, not \"..\"\n2\n"
+      "NAME or NAME/VERSION is expected, not \"A/\"\n2\n"
+      "a version begins with a number, unlike \"v2\"\n2\n"
+      "a version begins with a number, unlike \"..\"\n2\n",
       ""}},
 };
+
+// Without the column and the text of a parser's error, which its version decides.
+std::string withoutParserText(const std::string& output) {
+    static const std::regex parserError("(qxxml: error [0-9]+: [^:\n]+:[0-9]+):[0-9]+: .+");
+    return std::regex_replace(output, parserError, "$1");
+}
 
 } // namespace
 
@@ -196,7 +200,9 @@ TEST(Commands, DoWhatTheirPageShows) {
             continue;
         const std::size_t end = text.find('\n');
         ASSERT_TRUE(text.starts_with("$ ")) << line;
-        EXPECT_EQ(home.run(text.substr(2, end - 2) + " 2>&1").output, text.substr(end + 1)) << line;
+        EXPECT_EQ(withoutParserText(home.run(text.substr(2, end - 2) + " 2>&1").output),
+                  withoutParserText(text.substr(end + 1)))
+            << line;
         ++commands;
     }
     EXPECT_GE(commands, 8U);
