@@ -1,6 +1,7 @@
 #include "platform/xml/EntityTexts.h"
 
 #include "platform/xml/ParseFailure.h"
+#include "platform/xml/ParserText.h"
 #include "platform/xml/StartTags.h"
 
 #include <algorithm>
@@ -78,10 +79,6 @@ std::size_t referredTo(std::string_view text) {
     std::size_t number = 0;
     std::from_chars(start, text.data() + text.size(), number, base);
     return number;
-}
-
-std::string_view viewOf(const xmlChar* text) {
-    return text != nullptr ? reinterpret_cast<const char*>(text) : "";
 }
 
 } // namespace

@@ -1,18 +1,11 @@
 #include "platform/xml/XMLNames.h"
 
 #include "platform/xml/ParseFailure.h"
+#include "platform/xml/ParserText.h"
 
 #include <new>
 
 namespace qx {
-
-namespace {
-
-std::string_view viewOf(XMLNames::Name name) {
-    return name != nullptr ? reinterpret_cast<const char*>(name) : "";
-}
-
-} // namespace
 
 const String& XMLNames::add(Name local, Name prefix) {
     if (local == nullptr) // the parser had no memory for it
