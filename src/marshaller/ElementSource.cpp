@@ -105,6 +105,12 @@ ElementSource::Nodes ElementSource::all(const String& name) {
     return nodes;
 }
 
+ElementSource::Nodes ElementSource::all() const {
+    Nodes nodes;
+    forEachChild([&](XMLNode& child) { nodes.emplace_back(&child); });
+    return nodes;
+}
+
 String ElementSource::stringValue() const {
     if (!_ownScope)
         return _element.stringValue();

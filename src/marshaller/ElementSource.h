@@ -46,6 +46,13 @@ public:
     qx::XMLElement* last(const qx::String& name);
     // All of them, held.
     Nodes all(const qx::String& name);
+    // All children.
+    Nodes all() const;
+    // Whether children are found in a list, which holds them; else the element's own are walked.
+    bool isListed() {
+        indexIfWorthIt();
+        return _children != nullptr;
+    }
 
     // Calls visit(XMLNode&) for each child node in document order.
     template <class Visit>

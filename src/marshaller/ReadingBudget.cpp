@@ -6,50 +6,68 @@
 
 namespace {
 
-// Bytes of text that count as one node that is gone over.
-constexpr std::size_t bytesPerVisit = 16;
+constexpr std::size_t visitsPerObject = 16;
 // How often a reading may go over the whole document.
 constexpr std::size_t visitsPerNode = 64;
+// Bytes of text that count as one node that is gone over.
+constexpr std::size_t bytesPerVisit = 16;
+// The nodes that are measured first, and how many times as many next.
+constexpr std::size_t measuredFirst = 4'096;
+constexpr std::size_t measuredNext = 4;
 
 // base + each * count, the largest number where that is more.
-std::size_t total(std::size_t base, std::size_t each, std::size_t count) {
+std::size_t total(std::size_t base, std::size_t each, std::size_t count) noexcept {
     constexpr std::size_t most = std::numeric_limits<std::size_t>::max();
     return count != 0 && each > (most - base) / count ? most : base + each * count;
 }
 
-std::size_t visitsFor(const qx::XMLExtent& extent) {
+std::size_t visitsFor(const qx::XMLExtent& extent) noexcept {
     return extent.nodes + extent.textSize / bytesPerVisit;
 }
 
 } // namespace
 
-const qx::XMLExtent& ReadingBudget::whole() {
-    if (!_whole)
-        _whole = _root != nullptr ? _root->extent() : qx::XMLExtent();
-    return *_whole;
+ReadingBudget::ReadingBudget(const QXXMLMarshaller& marshaller, const qx::XMLElement* root) noexcept
+    : _marshaller(marshaller), _root(root) {
+    setLimits();
 }
 
-std::size_t ReadingBudget::among(QXXMLMarshaller::Limit limit) {
-    return total(limit.base, limit.perElement, whole().elements);
+void ReadingBudget::setLimits() noexcept {
+    const auto among = [this](QXXMLMarshaller::Limit limit) {
+        return total(limit.base, limit.perElement, _measured.elements);
+    };
+    _objects.limit = among(_marshaller.maximumObjects());
+    _kept.limit = among(_marshaller.maximumKeptNodes());
+    _visits.limit =
+        total(total(0, visitsPerObject, _objects.limit), visitsPerNode, visitsFor(_measured));
+}
+
+// Measures the document until it gives what was taken, or there is no more of it.
+bool ReadingBudget::isWithin(const Count& count) noexcept {
+    while (!_isSpent && count.taken > count.limit) {
+        _isSpent = _root == nullptr || _measured.nodes < _enough;
+        if (_isSpent)
+            break;
+        _enough = total(measuredFirst, measuredNext, _enough);
+        _measured = _root->extent(_enough);
+        setLimits();
+    }
+    return !_isSpent;
 }
 
 bool ReadingBudget::mayMake(const qx::String& className, ErrorSlot error) {
-    const std::size_t limit = among(_marshaller.maximumObjects());
-    _isSpent = _isSpent || _objects > limit;
-    return !_isSpent || qx::fail(error, qx::errors::tooManyObjects, limit, className);
+    return isWithin(_objects) ||
+           qx::fail(error, qx::errors::tooManyObjects, _objects.limit, className);
 }
 
 bool ReadingBudget::mayKeep(const qx::XMLElement& element, ErrorSlot error) {
-    const std::size_t limit = among(_marshaller.maximumKeptNodes());
-    _isSpent = _isSpent || _kept > limit;
-    return !_isSpent || qx::fail(error, qx::errors::tooManyKeptNodes, limit, element.name());
+    return isWithin(_kept) ||
+           qx::fail(error, qx::errors::tooManyKeptNodes, _kept.limit, element.name());
 }
 
 bool ReadingBudget::mayVisit(const qx::XMLElement& element, ErrorSlot error) {
-    const std::size_t forObjects = total(0, visitsPerObject, among(_marshaller.maximumObjects()));
-    const std::size_t limit = total(forObjects, visitsPerNode, visitsFor(whole()));
-    _isSpent = _isSpent || _visits > limit;
-    return !_isSpent || qx::fail(error, qx::errors::tooManyVisits, limit, element.name());
+    return isWithin(_visits) ||
+           qx::fail(error, qx::errors::tooManyVisits, _visits.limit, element.name());
 }
 
 bool ReadingBudget::mayJoin(const qx::XMLElement& element, ErrorSlot error) {

@@ -13,8 +13,8 @@
 // collections behave differently without.
 //
 // Between any two steps stands the code of host classes, which may change the document and the
-// marshaller, or let go of them. So the call holds both, whoever binds an element holds it, and the
-// options are read where they count.
+// marshaller, or let go of them. So the call holds both, whoever binds an element holds it (or sees
+// to it in hostActs), and the options are read where they count.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
@@ -76,8 +76,10 @@ private:
         const Frame* parent;
         std::size_t depth;
     };
-    struct Items;
+    class Items;
 
+    // To be called before any code of the host's may run.
+    void hostActs();
     bool isBeingBound(const ClassPlan& plan, const qx::XMLElement& element) const;
     bool mayBuild(const ClassPlan& plan, const ElementSource& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
@@ -90,8 +92,8 @@ private:
     bool findItemsByType(const FieldPlan& field, const Target& target, Items& items,
                          ErrorSlot error);
     template <class Make>
-    bool bindItems(const FieldPlan& field, const Target& target, const Items& items,
-                   ErrorSlot error, Make make);
+    bool bindItems(const FieldPlan& field, const Target& target, Items& items, ErrorSlot error,
+                   Make make);
     bool endsAfter(ErrorSlot error) const {
         return (error != nullptr && *error) || _budget.isSpent();
     }
@@ -111,6 +113,8 @@ private:
     std::vector<const qx::Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
+    Items* _items = nullptr; // of the innermost collection that is being bound
+    bool _hostActs;          // whether any code of the host's may have run
     // Counts of consumed names; the first few are lent to the objects that are being bound.
     std::vector<std::unique_ptr<NameCounts>> _counts;
     std::size_t _countsLent = 0;

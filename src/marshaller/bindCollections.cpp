@@ -4,33 +4,118 @@
 
 #include "platform/system/Errors.h"
 
-using qx::Ref;
+#include <algorithm>
+
+using qx::String;
 using qx::XMLElement;
 using qx::XMLNode;
 
-// The nodes that a collection's items are made from: all that there are before the first item is.
-struct Unmarshalling::Items {
-    ElementSource::Nodes nodes;
+// The nodes that a collection's items are made from: those that there are before the first item is.
+// The siblings are walked as they stand while nothing can change them, which finds each in memory
+// that is at hand when it is bound (a tenth of the time of reading). Before a host's code runs,
+// what is left of them is listed and held.
+class Unmarshalling::Items {
+public:
+    explicit Items(Unmarshalling& reading) noexcept : _reading(reading), _outer(reading._items) {
+        reading._items = this;
+    }
+    ~Items() { _reading._items = _outer; }
+    Items(const Items&) = delete;
+    Items& operator=(const Items&) = delete;
+
+    // The child elements of that name, which must outlive the items.
+    void setNamed(ElementSource& source, const String& name) {
+        if (source.isListed())
+            setList(source.all(name));
+        else
+            setFirst(source.element().firstChild(), &name);
+    }
+    void setChildren(ElementSource& source) {
+        if (source.isListed())
+            setList(source.all());
+        else
+            setChildren(source.element());
+    }
+    void setChildren(const XMLElement& wrapper) { setFirst(wrapper.firstChild(), nullptr); }
+
+    bool isEmpty() const noexcept { return _first == nullptr && _list.empty(); }
+    // Null behind the last.
+    XMLNode* next() {
+        if (_isListed)
+            return _position < _list.size() ? _list[_position++].get() : nullptr;
+        _current = _current != nullptr ? matching(_current->nextSibling()) : _first;
+        _first = nullptr;
+        return _current;
+    }
+    // Lists and holds the one that is being bound and those that follow, here and in all
+    // collections around.
+    static void holdAll(Items* innermost) {
+        for (Items* items = innermost; items != nullptr; items = items->_outer)
+            items->hold();
+    }
+
     bool areCounted = false; // as a whole, by their bind name or their wrapper's
+
+private:
+    void setList(ElementSource::Nodes nodes) noexcept {
+        _list = std::move(nodes);
+        _isListed = true;
+    }
+    void setFirst(XMLNode* first, const String* name) {
+        _name = name;
+        _first = matching(first);
+        _isListed = false;
+        if (_reading._hostActs)
+            hold();
+    }
+    XMLNode* matching(XMLNode* node) const noexcept {
+        while (node != nullptr && _name != nullptr &&
+               !(node->isElement() && node->name() == *_name))
+            node = node->nextSibling();
+        return node;
+    }
+    void hold() {
+        if (_isListed)
+            return;
+        XMLNode* node = _current != nullptr ? _current : _first;
+        for (; node != nullptr; node = matching(node->nextSibling()))
+            _list.emplace_back(node);
+        _position = _current != nullptr ? 1 : 0;
+        _isListed = true;
+    }
+
+    Unmarshalling& _reading;
+    Items* _outer; // of the collection whose item this one's owner is, or is inside
+    const String* _name = nullptr;
+    XMLNode* _first = nullptr;   // where nothing was bound yet
+    XMLNode* _current = nullptr; // what is being bound
+    ElementSource::Nodes _list;
+    std::size_t _position = 0;
+    bool _isListed = false;
 };
+
+void Unmarshalling::hostActs() {
+    if (_hostActs)
+        return;
+    _hostActs = true;
+    Items::holdAll(_items);
+}
 
 // Elements of a bind name that a class maps to are the items; of any other bind name the last
 // element is a wrapper around them. Without either, all children of the element are.
 bool Unmarshalling::findItems(const FieldPlan& field, const Target& target, Items& items,
                               ErrorSlot error) {
-    const auto add = [&](XMLNode& child) { items.nodes.emplace_back(&child); };
     for (const BindingPlan& binding : field.bindings) {
         if (binding.bindTo.isEmpty())
             continue;
         if (binding.classOfBindTo != nullptr) {
-            items.nodes = target.source.all(binding.bindTo);
+            items.setNamed(target.source, binding.bindTo);
         } else if (const XMLElement* wrapper = target.source.last(binding.bindTo)) {
             if (!_budget.takeVisits(wrapper->childCount(), *wrapper, error))
                 return false;
-            for (XMLNode& child : wrapper->children())
-                add(child);
+            items.setChildren(*wrapper);
         }
-        if (!items.nodes.empty()) {
+        if (!items.isEmpty()) {
             target.bound.fields.add(binding.bindTo);
             items.areCounted = true;
             return true;
@@ -39,7 +124,7 @@ bool Unmarshalling::findItems(const FieldPlan& field, const Target& target, Item
     const XMLElement& element = target.source.element();
     if (!_budget.takeVisits(element.childCount(), element, error))
         return false;
-    target.source.forEachChild(add);
+    items.setChildren(target.source);
     return true;
 }
 
@@ -66,8 +151,8 @@ bool Unmarshalling::findItemsByType(const FieldPlan& field, const Target& target
             }
         }
         if (!binding.bindTo.isEmpty())
-            items.nodes = root->all(binding.bindTo);
-        if (!items.nodes.empty() || wrapper)
+            items.setNamed(*root, binding.bindTo);
+        if (!items.isEmpty() || wrapper)
             break;
     }
     return true;
@@ -75,13 +160,15 @@ bool Unmarshalling::findItemsByType(const FieldPlan& field, const Target& target
 
 // Calls make(XMLNode&) for each item, and sets the list of those that were made.
 template <class Make>
-bool Unmarshalling::bindItems(const FieldPlan& field, const Target& target, const Items& items,
+bool Unmarshalling::bindItems(const FieldPlan& field, const Target& target, Items& items,
                               ErrorSlot error, Make make) {
-    if (items.nodes.empty())
+    if (items.isEmpty())
         return true;
+    // Most collections are short, and alone in their element.
+    constexpr std::size_t usualSize = 16;
     auto array = qx::make<qx::Array>();
-    array->reserve(items.nodes.size());
-    for (const Ref<XMLNode>& node : items.nodes) {
+    array->reserve(std::min(target.source.element().childCount(), usualSize));
+    while (XMLNode* node = items.next()) {
         const auto item = make(*node);
         if (endsAfter(error))
             return false;
@@ -101,7 +188,7 @@ bool Unmarshalling::bindCollection(const FieldPlan& field, const Target& target,
         return qx::fail(error, qx::errors::unknownCollectionClass, field.mapping->collection());
     if (field.hasType())
         return bindArrayByType(field, target, error);
-    Items items;
+    Items items(*this);
     if (!findItems(field, target, items, error))
         return false;
     return bindItems(field, target, items, error, [&](XMLNode& node) {
@@ -112,7 +199,7 @@ bool Unmarshalling::bindCollection(const FieldPlan& field, const Target& target,
 bool Unmarshalling::bindArrayByType(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (field.typeClass == nullptr)
         return qx::fail(error, qx::errors::noMappingForClass, field.mapping->type());
-    Items items;
+    Items items(*this);
     if (!findItemsByType(field, target, items, error))
         return false;
     return bindItems(field, target, items, error, [&](XMLNode& node) {

@@ -13,7 +13,8 @@ using qx::Value;
 Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, qx::XMLElement* root, Use use)
     : _marshaller(&marshaller), _root(root), _plan(marshaller.plan()), _use(use),
       _budget(marshaller, root), _classes(_plan.classCount() + 1),
-      _classKnown(_plan.classCount() + 1) {}
+      _classKnown(_plan.classCount() + 1),
+      _hostActs(use == Use::steps || qx::hostHasLogDebug() || qx::hostHasLogWarning()) {}
 
 // Lends counts for the time of one object's binding.
 class Unmarshalling::SpareCounts {
@@ -112,6 +113,8 @@ Ref<qx::Object> Unmarshalling::allocate(const ClassPlan& plan) {
         _classes[plan.index] = qx::Class::named(plan.classNameToInstantiate.view());
     }
     const qx::Class* type = _classes[plan.index];
+    if (type != nullptr)
+        hostActs();
     Ref<qx::Object> object = type != nullptr ? type->create() : nullptr;
     if (type != nullptr && !object) {
         qx::logWarningOrLine("Class %@ cannot be made without arguments, records stand in for it",

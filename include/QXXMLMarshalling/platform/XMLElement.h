@@ -93,8 +93,9 @@ public:
     // The same; calls visit(original, copy) for this element and each one inside.
     using CopyVisitor = std::function<void(XMLElement& original, XMLElement& copy)>;
     Ref<XMLElement> copy(const CopyVisitor& visit);
-    // Counted anew each time, which needs no nodes of texts and attributes.
-    XMLExtent extent() const noexcept;
+    // Counted anew each time, which needs no nodes of texts and attributes. The count ends early
+    // once there are `enough` nodes in it.
+    XMLExtent extent(std::size_t enough = SIZE_MAX) const noexcept;
 
 private:
     friend class XMLNode;

@@ -322,13 +322,14 @@ void XMLElement::setStringValue(const String& value) {
         holdText(std::move(text));
 }
 
-XMLExtent XMLElement::extent() const noexcept {
+XMLExtent XMLElement::extent(std::size_t enough) const noexcept {
     XMLExtent extent;
     const auto add = [&](const XMLNode& node) {
         ++extent.nodes;
         extent.textSize += node._value.size();
     };
-    for (const XMLNode* node = this; node != nullptr; node = following(node)) {
+    for (const XMLNode* node = this; node != nullptr && extent.nodes < enough;
+         node = following(node)) {
         add(*node);
         const XMLElement* element = node->asElement();
         if (element == nullptr)
