@@ -4,8 +4,8 @@
 
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
-#include <QXXMLMarshalling/platform/Format.h>
-#include <QXXMLMarshalling/platform/Log.h>
+#include <QXXMLMarshalling/host/Log.h>
+#include <QXXMLMarshalling/model/Format.h>
 
 #include <cstdlib>
 #include <iostream>

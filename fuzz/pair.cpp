@@ -6,9 +6,9 @@
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 namespace {
 

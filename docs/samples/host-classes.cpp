@@ -4,9 +4,9 @@
 #include "marshaller/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <cstdio>
 

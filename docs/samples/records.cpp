@@ -4,12 +4,12 @@
 #include "marshaller/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
-#include <QXXMLMarshalling/platform/WeakRef.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/WeakRef.h>
+#include <QXXMLMarshalling/observe/Observation.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <iostream>
 #include <sstream>

@@ -3,7 +3,7 @@
 #include "Task.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Error.h>
+#include <QXXMLMarshalling/model/Error.h>
 
 #include <ostream>
 #include <sstream>

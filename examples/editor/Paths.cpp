@@ -1,7 +1,7 @@
 #include "Paths.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 #include <charconv>
 #include <optional>

@@ -2,7 +2,7 @@
 
 // Places in a document by name: "owner.name", or "tasks.2.days" for a value of the second task.
 
-#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/model/Array.h>
 
 #include <string>
 #include <vector>

@@ -1,6 +1,6 @@
 #include "Task.h"
 
-#include <QXXMLMarshalling/platform/Observation.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
 namespace {
 

@@ -3,8 +3,8 @@
 // A task of a project: the class that this program has in C++. Deriving from qx::UndoableObject is
 // all that it does to be undone as records are.
 
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 class Task : public qx::UndoableObject {
 public:

@@ -3,8 +3,8 @@
 // Prints every change of a document's objects while it lives, one a line, with old and new value.
 // Objects are told apart by where they stand in the document when they change.
 
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/Value.h>
+#include <QXXMLMarshalling/model/Value.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
 #include <iosfwd>
 #include <map>

@@ -8,9 +8,9 @@
 #include "Editor.h"
 #include "Task.h"
 
-#include <QXXMLMarshalling/platform/Error.h>
-#include <QXXMLMarshalling/platform/Format.h>
-#include <QXXMLMarshalling/platform/Log.h>
+#include <QXXMLMarshalling/host/Log.h>
+#include <QXXMLMarshalling/model/Error.h>
+#include <QXXMLMarshalling/model/Format.h>
 
 #include <fstream>
 #include <iostream>

@@ -3,8 +3,8 @@
 // The two classes of the MIME database that have something to do: all others stay records. Once
 // they are described, documents under mapping.xml bring them to life.
 
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/ValueTraits.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
 
 // What a class needs so that its objects can be written: the keys under which the marshaller keeps
 // XML that the mapping does not know, and the word that an item of a collection is to be written.

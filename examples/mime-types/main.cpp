@@ -9,7 +9,7 @@
 #include "MimeType.h"
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
-#include <QXXMLMarshalling/platform/Error.h>
+#include <QXXMLMarshalling/model/Error.h>
 
 #include <iostream>
 

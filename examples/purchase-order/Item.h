@@ -3,8 +3,8 @@
 // An item of an order: the one class of mapping.xml that this program has in C++, since items are
 // what it calculates with. Orders, parties, addresses and all else are records.
 
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/ValueTraits.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
 
 // An amount of money, exact to the cent; "12.50" in documents.
 struct Money {

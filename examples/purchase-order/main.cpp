@@ -7,9 +7,9 @@
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
-#include <QXXMLMarshalling/platform/Error.h>
-#include <QXXMLMarshalling/platform/Format.h>
-#include <QXXMLMarshalling/platform/Log.h>
+#include <QXXMLMarshalling/host/Log.h>
+#include <QXXMLMarshalling/model/Error.h>
+#include <QXXMLMarshalling/model/Format.h>
 
 #include <charconv>
 #include <iostream>

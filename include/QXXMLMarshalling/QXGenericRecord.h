@@ -18,11 +18,11 @@
 // messages for keys that it has no operation for: perform("title") reads, perform("setTitle:", …)
 // writes "title". Only the one character behind "set" becomes lower case.
 
-#include <QXXMLMarshalling/platform/ChangeTracking.h>
-#include <QXXMLMarshalling/platform/CountedSet.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
-#include <QXXMLMarshalling/platform/UndoManager.h>
-#include <QXXMLMarshalling/platform/ValueTraits.h>
+#include <QXXMLMarshalling/model/CountedSet.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
+#include <QXXMLMarshalling/undo/ChangeTracking.h>
+#include <QXXMLMarshalling/undo/UndoManager.h>
 
 // The user default that lets records answer accessor messages; its registered value is "NO".
 extern QX_API const char* const AllowMethodForwardingInGenericRecords;

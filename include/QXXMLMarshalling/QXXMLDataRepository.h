@@ -9,8 +9,8 @@
 // A class may be both of the latter. A name is a relative path such as "orders.xml" or
 // "maps/orders.xml". Repositories are asked by one thread at a time.
 
-#include <QXXMLMarshalling/platform/Data.h>
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/model/Data.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 class QX_API QXXMLDataRepository : public qx::Object {
 public:

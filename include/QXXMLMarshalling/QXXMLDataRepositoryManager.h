@@ -12,8 +12,8 @@
 // manager is used by one thread at a time; the shared one may be asked for from any.
 
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
 
 // Names of the two repositories that have accessors of their own; each is its own text.
 extern "C" {
@@ -28,8 +28,8 @@ public:
     // Drops it: the next call of defaultManager makes a fresh one.
     static void flushDefaultManager();
 
-    // Raises what QXXMLFileSystemDataRepository::init raises: NSInternalInconsistencyException for a
-    // user without any home.
+    // Raises what QXXMLFileSystemDataRepository::init raises: NSInternalInconsistencyException for
+    // a user without any home.
     static qx::Ref<QXXMLDataRepositoryManager> init();
     QXXMLDataRepositoryManager();
     ~QXXMLDataRepositoryManager() override;

@@ -7,7 +7,7 @@
 //     </field>
 
 #include <QXXMLMarshalling/QXXMLBindToMapping.h>
-#include <QXXMLMarshalling/platform/WeakRef.h>
+#include <QXXMLMarshalling/model/WeakRef.h>
 
 class QXXMLClassMapping;
 

@@ -13,8 +13,8 @@
 // and fails when it is written (514, "The file name is invalid."), before anything is touched.
 
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Bundle.h>
+#include <QXXMLMarshalling/host/Bundle.h>
+#include <QXXMLMarshalling/model/Array.h>
 
 #include <vector>
 

@@ -5,8 +5,8 @@
 // that any of them may have. Nodes are immutable once made (but for the back-references that are
 // set while their parent is made) and may be read by several threads.
 
-#include <QXXMLMarshalling/platform/Error.h>
-#include <QXXMLMarshalling/platform/XMLElement.h>
+#include <QXXMLMarshalling/model/Error.h>
+#include <QXXMLMarshalling/xml/XMLElement.h>
 
 #include <vector>
 

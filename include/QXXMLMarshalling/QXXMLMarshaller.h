@@ -18,9 +18,9 @@
 // changed by the fields that follow, but a list that is being filled stays as it was found.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/CountedSet.h>
-#include <QXXMLMarshalling/platform/UndoManager.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/CountedSet.h>
+#include <QXXMLMarshalling/undo/UndoManager.h>
 
 #include <iosfwd>
 

@@ -7,7 +7,7 @@
 //     auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), &error);
 
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <memory>
 

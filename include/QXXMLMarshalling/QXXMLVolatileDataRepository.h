@@ -4,7 +4,7 @@
 // name. Register one with QXXMLDataRepositoryManager::setVolatileRepository to have it asked.
 
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
 
 class QX_API QXXMLVolatileDataRepository : public QXXMLMutableDataRepository {
 public:

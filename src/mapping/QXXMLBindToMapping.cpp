@@ -2,9 +2,9 @@
 
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 
-#include "platform/object/LibraryClass.h"
-#include "platform/object/Printing.h"
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
+#include "model/LibraryClass.h"
+#include "model/Printing.h"
 
 using qx::Error;
 using qx::Ref;

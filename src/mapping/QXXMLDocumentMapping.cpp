@@ -1,7 +1,7 @@
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 
-#include "platform/object/LibraryClass.h"
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
+#include "model/LibraryClass.h"
 
 using qx::Error;
 using qx::Key;

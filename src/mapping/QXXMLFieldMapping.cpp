@@ -2,8 +2,8 @@
 
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 
-#include "platform/object/LibraryClass.h"
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
+#include "model/LibraryClass.h"
 
 using qx::Error;
 using qx::Ref;

@@ -1,9 +1,9 @@
 #include <QXXMLMarshalling/QXXMLMapping.h>
 
-#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/model/Array.h>
 
-#include "platform/object/LibraryClass.h"
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
+#include "model/LibraryClass.h"
 
 using qx::Error;
 using qx::Key;

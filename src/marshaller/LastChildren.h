@@ -4,9 +4,9 @@
 // by now. Children that are appended meanwhile are found when somebody asks; a host that takes
 // others out has them forgotten.
 
-#include <QXXMLMarshalling/platform/XMLElement.h>
+#include <QXXMLMarshalling/xml/XMLElement.h>
 
-#include "resolved/MappingPlan.h"
+#include "plan/MappingPlan.h"
 
 class LastChildren {
 public:

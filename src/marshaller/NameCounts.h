@@ -4,7 +4,7 @@
 // the order of the fields: then taking the names in document order only compares each with the next
 // one that was added. The first name out of order has the rest counted.
 
-#include <QXXMLMarshalling/platform/CountedSet.h>
+#include <QXXMLMarshalling/model/CountedSet.h>
 
 class NameCounts {
 public:

@@ -1,6 +1,6 @@
 #include "marshaller/ObjectDoor.h"
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 ObjectHooks::ObjectHooks(const qx::Class& describedType)
     : type(&describedType),

@@ -5,8 +5,8 @@
 // and call of the marshaller.
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Error.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Error.h>
 
 #include <unordered_map>
 

@@ -2,7 +2,7 @@
 
 #include "marshaller/Marshalling.h"
 #include "marshaller/Unmarshalling.h"
-#include "platform/object/LibraryClass.h"
+#include "model/LibraryClass.h"
 
 using qx::Error;
 using qx::Ref;

@@ -1,6 +1,6 @@
 #include "marshaller/ReadingBudget.h"
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 #include <limits>
 

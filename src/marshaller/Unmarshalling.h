@@ -21,7 +21,7 @@
 #include "marshaller/ElementSource.h"
 #include "marshaller/NameCounts.h"
 #include "marshaller/ObjectDoor.h"
-#include "resolved/MappingPlan.h"
+#include "plan/MappingPlan.h"
 
 class Unmarshalling {
 public:

@@ -1,8 +1,8 @@
 #include "marshaller/Unmarshalling.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/model/Array.h>
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 #include <algorithm>
 

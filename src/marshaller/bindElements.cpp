@@ -1,6 +1,6 @@
 #include "marshaller/Unmarshalling.h"
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 using qx::Error;
 using qx::Ref;

@@ -1,8 +1,8 @@
 #include "marshaller/Unmarshalling.h"
 
-#include "platform/object/Scan.h"
-#include "platform/system/Errors.h"
-#include "platform/system/Log.h"
+#include "base/Scan.h"
+#include "host/Log.h"
+#include "model/Errors.h"
 
 using qx::String;
 using qx::Value;

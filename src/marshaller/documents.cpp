@@ -1,9 +1,9 @@
 // Reading objects from files, texts and streams, and writing them.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
-#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/base/Exception.h>
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 #include <algorithm>
 

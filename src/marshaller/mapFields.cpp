@@ -1,9 +1,9 @@
 #include "marshaller/Marshalling.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 using qx::Ref;
 using qx::String;

@@ -1,10 +1,10 @@
 #include "marshaller/Marshalling.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 
 #include <algorithm>
 

@@ -1,9 +1,9 @@
 #include "marshaller/Unmarshalling.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/model/Array.h>
 
-#include "platform/system/Errors.h"
-#include "platform/system/Log.h"
+#include "host/Log.h"
+#include "model/Errors.h"
 
 using qx::Error;
 using qx::Key;

@@ -1,10 +1,10 @@
 #include "marshaller/Unmarshalling.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
 
-#include "platform/system/Errors.h"
-#include "platform/system/Log.h"
+#include "host/Log.h"
+#include "model/Errors.h"
 
 using qx::CountedSet;
 using qx::Key;

@@ -1,12 +1,12 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Null.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Null.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
-#include "platform/object/NameList.h"
+#include "model/NameList.h"
 
 using qx::Dictionary;
 using qx::Key;

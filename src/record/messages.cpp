@@ -2,10 +2,10 @@
 // and answering accessor messages for its keys.
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Invocation.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Invocation.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
 using qx::Dictionary;
 using qx::Object;

@@ -1,13 +1,13 @@
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
 
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/ProcessInfo.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/host/ProcessInfo.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
 
-#include "platform/system/Directories.h"
-#include "platform/system/Errors.h"
-#include "platform/system/Files.h"
-#include "platform/system/Log.h"
+#include "files/Files.h"
+#include "host/Directories.h"
+#include "host/Log.h"
+#include "model/Errors.h"
 
 #include <atomic>
 #include <cerrno>

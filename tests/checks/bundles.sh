@@ -24,7 +24,7 @@ cd -- "$root"
 mkdir -p usr/{bin,lib,plugins,share/{Client,thing}} here gone
 
 cat >thing.h <<'END'
-#include <QXXMLMarshalling/platform/Object.h>
+#include <QXXMLMarshalling/model/Object.h>
 struct QX_API Thing : qx::Object { ~Thing() override; };
 extern "C" QX_API qx::Object* makeThing();
 END
@@ -36,7 +36,7 @@ END
 cat >client.cpp <<'END'
 #include "thing.h"
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
-#include <QXXMLMarshalling/platform/Bundle.h>
+#include <QXXMLMarshalling/host/Bundle.h>
 #include <dlfcn.h>
 #include <filesystem>
 #include <iostream>

@@ -31,10 +31,10 @@ declare -A header_only=(
 # Single headers of another room: documents are files, what is wrong with them is told in the user's
 # language, and property lists are documents.
 declare -A lent=(
-    ['platform/xml includes "platform/system/Files.h"']=1
-    ['platform/xml includes "platform/system/Errors.h"']=1
-    ['platform/xml includes "platform/system/Localization.h"']=1
-    ['platform/system includes <QXXMLMarshalling/platform/XMLDocument.h>']=1
+    ['platform/xml includes "files/Files.h"']=1
+    ['platform/xml includes "model/Errors.h"']=1
+    ['platform/xml includes "host/Localization.h"']=1
+    ['platform/system includes <QXXMLMarshalling/xml/XMLDocument.h>']=1
 )
 
 libxml='^libxml/'
@@ -164,12 +164,12 @@ self_test() {
     local tree=$1 expected actual
     mkdir -p "$tree"/{src/platform/{object,xml},src/{mapping,record,marshaller},include/QXXMLMarshalling/platform,tools/t}
     put() { printf '%s\n' "${@:2}" >"$tree/$1"; }
-    put include/QXXMLMarshalling/platform/Export.h '#pragma once'
-    put include/QXXMLMarshalling/platform/Value.h '#include <QXXMLMarshalling/QXRecord.h>'
-    put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/platform/Value.h>' '#include "record/Table.h"'
-    put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/platform/Export.h>' '#include <sys/stat.h>'
+    put include/QXXMLMarshalling/base/Export.h '#pragma once'
+    put include/QXXMLMarshalling/model/Value.h '#include <QXXMLMarshalling/QXRecord.h>'
+    put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/model/Value.h>' '#include "record/Table.h"'
+    put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/base/Export.h>' '#include <sys/stat.h>'
     put include/QXXMLMarshalling/QXNowhere.h '#include <string>'
-    put src/platform/object/Value.cpp '#include <QXXMLMarshalling/platform/Value.h>' '#include <unistd.h>' '#  include <libxml/tree.h>'
+    put src/model/Value.cpp '#include <QXXMLMarshalling/model/Value.h>' '#include <unistd.h>' '#  include <libxml/tree.h>'
     put src/platform/object/Key.h '#pragma once'
     put src/platform/xml/Node.cpp '#include "platform/object/Key.h"' '#include <libxml/tree.h>' '#include <unicode/uchar.h>'
     put src/mapping/read.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include "record/Table.h"' '#include "Key.h"'
@@ -180,10 +180,10 @@ self_test() {
     expected='include/QXXMLMarshalling/QXMapping.h:2: the operating system (<sys/stat.h>) outside platform
 include/QXXMLMarshalling/QXNowhere.h:1: belongs to no folder: enter it in layers.sh
 include/QXXMLMarshalling/QXRecord.h:2: a public header includes "record/Table.h"
-include/QXXMLMarshalling/platform/Value.h:1: platform/object includes <QXXMLMarshalling/QXRecord.h> of record
+include/QXXMLMarshalling/model/Value.h:1: platform/object includes <QXXMLMarshalling/QXRecord.h> of record
 src/mapping/read.cpp:2: mapping includes "record/Table.h" of record
 src/mapping/read.cpp:3: "Key.h" is not named from src/
-src/platform/object/Value.cpp:3: libxml2 outside platform/xml
+src/model/Value.cpp:3: libxml2 outside platform/xml
 src/platform/xml/Node.cpp:3: ICU outside platform/object
 src/record/QXRecord.cpp:2: record includes <QXXMLMarshalling/QXMapping.h> of mapping
 src/record/QXRecord.cpp:3: the operating system (<fstream>) outside platform

@@ -24,7 +24,7 @@ cd -- "$folder"
 
 # A plug-in that links the library and makes it warn.
 cat >plugin.cpp <<'END'
-#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/model/Class.h>
 struct One : qx::Object {};
 struct Two : qx::Object {};
 extern "C" QX_API void warn() {
@@ -34,7 +34,7 @@ extern "C" QX_API void warn() {
 }
 END
 cat >hooks.cpp <<'END'
-#include <QXXMLMarshalling/platform/Log.h>
+#include <QXXMLMarshalling/host/Log.h>
 #include <cstdio>
 void QXLogWarning(std::string_view, std::span<const qx::Value>) { std::puts("host"); }
 END

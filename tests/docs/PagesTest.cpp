@@ -9,7 +9,7 @@
 //
 // Options are "strict", "discard" and "no-namespaces"; blocks with other words are left alone.
 
-#include "platform/system/Errors.h"
+#include "model/Errors.h"
 #include "support/Page.h"
 #include "support/Show.h"
 

@@ -1,7 +1,7 @@
 // Mapping documents are read into nodes, refused with exact errors, and printed.
 
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <gtest/gtest.h>
 

@@ -4,8 +4,8 @@
 #include "Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <random>
 

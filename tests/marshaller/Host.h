@@ -4,7 +4,7 @@
 // every key that the scenarios use, takes any value, and says as records do that it is written as
 // an item of a collection.
 
-#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 namespace host {
 

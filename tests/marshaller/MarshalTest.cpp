@@ -4,9 +4,9 @@
 #include "Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Null.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Null.h>
 
 namespace {
 

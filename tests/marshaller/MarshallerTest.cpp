@@ -4,8 +4,8 @@
 #include "Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
-#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
 
 #include <ctime>
 #include <sstream>

@@ -4,7 +4,7 @@
 #include "Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 #include <functional>
 

@@ -1,8 +1,8 @@
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
-#include <QXXMLMarshalling/platform/Null.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Null.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
 extern "C" void makeLastingObjects();
 

@@ -3,10 +3,10 @@
 // What the programs log_*.cpp share: they make the library say things and look where they go.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Format.h>
-#include <QXXMLMarshalling/platform/Log.h>
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/host/Log.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Format.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <cstdio>
 #include <cstdlib>

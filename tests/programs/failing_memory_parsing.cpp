@@ -2,7 +2,7 @@
 // from there on. What comes out is std::bad_alloc or what came out with enough memory: the same
 // document, or the same error.
 
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <cstdlib>
 #include <cstring>

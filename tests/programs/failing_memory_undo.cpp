@@ -2,9 +2,9 @@
 // redone: what fails has changed nothing, and what was told to observers is never left half said.
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/observe/Observation.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <cstdio>
 #include <cstdlib>

@@ -2,8 +2,8 @@
 // and of each value that undoing and redoing set.
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Format.h>
-#include <QXXMLMarshalling/platform/Log.h>
+#include <QXXMLMarshalling/host/Log.h>
+#include <QXXMLMarshalling/model/Format.h>
 
 #include <cstdio>
 

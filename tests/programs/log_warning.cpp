@@ -3,9 +3,9 @@
 
 #include "LogRun.h"
 
-#include <QXXMLMarshalling/platform/Bundle.h>
-#include <QXXMLMarshalling/platform/ProcessInfo.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/host/Bundle.h>
+#include <QXXMLMarshalling/host/ProcessInfo.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
 
 #include <filesystem>
 #include <fstream>

@@ -1,7 +1,7 @@
 // Reads the files given and tells of each what became of it: its text, or the error. Without any it
 // reads one that refers to a file, which must fail.
 
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <cstdlib>
 #include <iostream>

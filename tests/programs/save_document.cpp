@@ -2,7 +2,7 @@
 // call itself stands between two calls of getppid(), by which a trace finds it.
 
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
-#include <QXXMLMarshalling/platform/ProcessInfo.h>
+#include <QXXMLMarshalling/host/ProcessInfo.h>
 
 #include <cstdlib>
 #include <filesystem>

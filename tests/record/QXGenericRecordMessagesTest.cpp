@@ -2,12 +2,12 @@
 
 #include "support/Texts.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Invocation.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Invocation.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
 #include <gtest/gtest.h>
 

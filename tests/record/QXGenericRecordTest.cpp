@@ -1,9 +1,9 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Observation.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 
 #include <gtest/gtest.h>
 

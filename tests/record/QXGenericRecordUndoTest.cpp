@@ -2,10 +2,10 @@
 
 #include "record/RandomHistory.h"
 
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Null.h>
-#include <QXXMLMarshalling/platform/Observation.h>
-#include <QXXMLMarshalling/platform/UndoableObject.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Null.h>
+#include <QXXMLMarshalling/observe/Observation.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <gtest/gtest.h>
 

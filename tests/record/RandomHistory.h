@@ -5,8 +5,8 @@
 //
 //     ASSERT_TRUE(RandomHistory(seed, objects, rename).agreesFor(30)) << "seed " << seed;
 
-#include <QXXMLMarshalling/platform/UndoManager.h>
-#include <QXXMLMarshalling/platform/Value.h>
+#include <QXXMLMarshalling/model/Value.h>
+#include <QXXMLMarshalling/undo/UndoManager.h>
 
 #include <optional>
 #include <random>

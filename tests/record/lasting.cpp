@@ -1,5 +1,5 @@
-#include <QXXMLMarshalling/platform/Null.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Null.h>
 
 extern "C" void makeLastingObjects();
 

@@ -2,7 +2,7 @@
 
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
-#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/base/Exception.h>
 
 #include "support/FileSandbox.h"
 

@@ -1,6 +1,6 @@
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
 
-#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/base/Exception.h>
 
 #include "support/FileSandbox.h"
 

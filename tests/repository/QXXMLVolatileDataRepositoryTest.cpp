@@ -1,6 +1,6 @@
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
 
-#include <QXXMLMarshalling/platform/Exception.h>
+#include <QXXMLMarshalling/base/Exception.h>
 
 #include <gtest/gtest.h>
 

@@ -1,7 +1,7 @@
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
 
-#include <QXXMLMarshalling/platform/Array.h>
+#include <QXXMLMarshalling/model/Array.h>
 
 #include "support/FileSandbox.h"
 

@@ -4,9 +4,9 @@
 // home, data and configuration directories, another process name, and no locale. All of it is taken
 // back at the end.
 
-#include <QXXMLMarshalling/platform/Bundle.h>
-#include <QXXMLMarshalling/platform/ProcessInfo.h>
-#include <QXXMLMarshalling/platform/UserDefaults.h>
+#include <QXXMLMarshalling/host/Bundle.h>
+#include <QXXMLMarshalling/host/ProcessInfo.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
 
 #include <cstdlib>
 #include <filesystem>

@@ -1,9 +1,9 @@
 #include "support/Show.h"
 
-#include <QXXMLMarshalling/platform/Array.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Dictionary.h>
-#include <QXXMLMarshalling/platform/XMLNode.h>
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
+#include <QXXMLMarshalling/xml/XMLNode.h>
 
 #include <map>
 

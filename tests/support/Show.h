@@ -6,7 +6,7 @@
 //
 // Keys come sorted, so that records and host classes print alike; keys without a value do not come.
 
-#include <QXXMLMarshalling/platform/Value.h>
+#include <QXXMLMarshalling/model/Value.h>
 
 #include <string>
 

@@ -2,8 +2,8 @@
 
 // What tests compare, as one text.
 
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Value.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Value.h>
 
 #include <regex>
 #include <string>

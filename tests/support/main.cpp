@@ -1,6 +1,6 @@
 // Runs the tests, and after each one checks that it has left no live object behind.
 
-#include <QXXMLMarshalling/platform/Object.h>
+#include <QXXMLMarshalling/model/Object.h>
 
 #include <gtest/gtest.h>
 

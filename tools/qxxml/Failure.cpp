@@ -1,7 +1,7 @@
 #include "qxxml/Failure.h"
 
-#include <QXXMLMarshalling/platform/Bundle.h>
-#include <QXXMLMarshalling/platform/Format.h>
+#include <QXXMLMarshalling/host/Bundle.h>
+#include <QXXMLMarshalling/model/Format.h>
 
 namespace qxxml {
 

@@ -3,7 +3,7 @@
 // Thrown by a command that cannot do its work: what stands behind "qxxml: error " on standard
 // error.
 
-#include <QXXMLMarshalling/platform/Error.h>
+#include <QXXMLMarshalling/model/Error.h>
 
 #include <exception>
 #include <string>

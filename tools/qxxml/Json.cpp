@@ -1,9 +1,9 @@
 #include "qxxml/Json.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Data.h>
-#include <QXXMLMarshalling/platform/XMLNode.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Data.h>
+#include <QXXMLMarshalling/xml/XMLNode.h>
 
 #include "qxxml/Failure.h"
 

@@ -16,7 +16,7 @@
 // an object holds one that it stands in, {"@above": N} tells that it is the one N levels further
 // up.
 
-#include <QXXMLMarshalling/platform/Value.h>
+#include <QXXMLMarshalling/model/Value.h>
 
 #include <nlohmann/json.hpp>
 

@@ -1,7 +1,7 @@
 #include "qxxml/Session.h"
 
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
-#include <QXXMLMarshalling/platform/ProcessInfo.h>
+#include <QXXMLMarshalling/host/ProcessInfo.h>
 
 #include "qxxml/Failure.h"
 

@@ -1,7 +1,7 @@
 // qxxml: tries mapping documents on XML documents from the command line.
 
-#include <QXXMLMarshalling/platform/Format.h>
-#include <QXXMLMarshalling/platform/Log.h>
+#include <QXXMLMarshalling/host/Log.h>
+#include <QXXMLMarshalling/model/Format.h>
 
 #include "qxxml/CommandLine.h"
 

@@ -3,11 +3,11 @@
 #include "qxxml/Failure.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/platform/Class.h>
-#include <QXXMLMarshalling/platform/Data.h>
-#include <QXXMLMarshalling/platform/Exception.h>
-#include <QXXMLMarshalling/platform/Null.h>
-#include <QXXMLMarshalling/platform/XMLDocument.h>
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Data.h>
+#include <QXXMLMarshalling/model/Null.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
 #include "tools/qxxml/Shell.h"
 
-#include <QXXMLMarshalling/platform/Null.h>
+#include <QXXMLMarshalling/model/Null.h>
 
 #include <cstdlib>
 

@@ -1,0 +1,241 @@
+#pragma once
+
+// The parts of a class description and how they are made from members: each accessor becomes a
+// captureless function pointer. Hosts use them through Class::define (Class.h).
+
+#include <QXXMLMarshalling/model/Object.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
+
+#include <cstring>
+#include <functional>
+#include <tuple>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+namespace qx {
+
+// A property of instances. `get` and `set` are handed the property, for the members it stores.
+struct Property {
+    static constexpr std::size_t memberSize = 16;
+    using Member = std::array<std::byte, memberSize>;
+
+    Key key;
+    Value (*get)(const Property&, const Object&) = nullptr;
+    // False when the value is refused; null for a read-only property.
+    bool (*set)(const Property&, Object&, const Value&) = nullptr;
+    // Member function pointers that were only known at run time.
+    Member getter{};
+    Member setter{};
+};
+
+// An operation of instances (receiver: the object) or of the class object (receiver: null).
+struct Operation {
+    Selector selector;
+    bool returnsValue = false;
+    // Raises NSInvalidArgumentException for arguments that the function does not take.
+    Value (*invoke)(Selector, const Class&, Object*, std::span<const Value>) = nullptr;
+    // Whether the function takes these arguments: their number, and each as the type it wants.
+    bool (*takes)(std::span<const Value>) = nullptr;
+};
+
+namespace describe {
+
+// Raise NSInvalidArgumentException.
+[[noreturn]] QX_API void raiseArgumentCount(Selector selector, const Class& receiver,
+                                            std::size_t given);
+[[noreturn]] QX_API void raiseArgument(Selector selector, const Class& receiver,
+                                       const Value& value);
+
+template <class M>
+struct Signature;
+template <class R, class C, class... A>
+struct Signature<R (C::*)(A...)> {
+    using Result = R;
+    using Arguments = std::tuple<A...>;
+};
+template <class R, class C, class... A>
+struct Signature<R (C::*)(A...) const> : Signature<R (C::*)(A...)> {};
+template <class R, class C, class... A>
+struct Signature<R (C::*)(A...) noexcept> : Signature<R (C::*)(A...)> {};
+template <class R, class C, class... A>
+struct Signature<R (C::*)(A...) const noexcept> : Signature<R (C::*)(A...)> {};
+template <class R, class... A>
+struct Signature<R (*)(A...)> {
+    using Result = R;
+    using Arguments = std::tuple<A...>;
+};
+template <class R, class... A>
+struct Signature<R (*)(A...) noexcept> : Signature<R (*)(A...)> {};
+
+template <class T>
+using Stored = std::remove_cvref_t<T>;
+
+template <class T>
+Value toValue(const T& value) {
+    return ValueTraits<Stored<T>>::toValue(value);
+}
+
+template <class T, auto Member>
+Value getMember(const Property&, const Object& object) {
+    return toValue(std::invoke(Member, static_cast<const T&>(object)));
+}
+
+template <class T, auto Member>
+bool setMember(const Property&, Object& object, const Value& value) {
+    using V = Stored<decltype(std::declval<T&>().*Member)>;
+    return ValueTraits<V>::fromValue(value, static_cast<T&>(object).*Member);
+}
+
+template <class T, auto Setter>
+bool callSetter(const Property&, Object& object, const Value& value) {
+    using V = Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
+    V converted{};
+    if (!ValueTraits<V>::fromValue(value, converted))
+        return false;
+    std::invoke(Setter, static_cast<T&>(object), std::move(converted));
+    return true;
+}
+
+template <class T, auto Member>
+Property memberProperty(std::string_view name) {
+    Property property;
+    property.key = name;
+    property.get = &getMember<T, Member>;
+    if constexpr (std::is_member_object_pointer_v<decltype(Member)>) {
+        using M = std::remove_reference_t<decltype(std::declval<T&>().*Member)>;
+        if constexpr (!std::is_const_v<M>)
+            property.set = &setMember<T, Member>;
+    }
+    return property;
+}
+
+template <class T, auto Getter, auto Setter>
+Property accessorProperty(std::string_view name) {
+    Property property;
+    property.key = name;
+    property.get = &getMember<T, Getter>;
+    property.set = &callSetter<T, Setter>;
+    return property;
+}
+
+template <class P>
+void store(P pointer, Property::Member& member) {
+    static_assert(sizeof(P) <= Property::memberSize);
+    std::memcpy(member.data(), &pointer, sizeof(P));
+}
+template <class P>
+P load(const Property::Member& member) {
+    P pointer;
+    std::memcpy(&pointer, member.data(), sizeof(P));
+    return pointer;
+}
+
+// Accessors that overload resolution chose by the value type V; the setter's parameter is S.
+template <class T, class V, class S>
+Property boundProperty(std::string_view name, V (T::*getter)() const, void (T::*setter)(S)) {
+    using Getter = V (T::*)() const;
+    using Setter = void (T::*)(S);
+    Property property;
+    property.key = name;
+    store(getter, property.getter);
+    store(setter, property.setter);
+    property.get = [](const Property& self, const Object& object) -> Value {
+        return toValue((static_cast<const T&>(object).*load<Getter>(self.getter))());
+    };
+    property.set = [](const Property& self, Object& object, const Value& value) {
+        Stored<V> converted{};
+        if (!ValueTraits<Stored<V>>::fromValue(value, converted))
+            return false;
+        (static_cast<T&>(object).*load<Setter>(self.setter))(std::move(converted));
+        return true;
+    };
+    return property;
+}
+
+// Calls `function` with `leading` and then the arguments converted to the types from First on.
+template <std::size_t First, auto Function, class... Leading>
+Value call(Selector selector, const Class& receiver, std::span<const Value> arguments,
+           Leading&... leading) {
+    using S = Signature<decltype(Function)>;
+    constexpr std::size_t count = std::tuple_size_v<typename S::Arguments> - First;
+    if (arguments.size() != count)
+        raiseArgumentCount(selector, receiver, arguments.size());
+    return [&]<std::size_t... I>(std::index_sequence<I...>)->Value {
+        std::tuple<Stored<std::tuple_element_t<First + I, typename S::Arguments>>...> converted;
+        [[maybe_unused]] const auto convert = [&]<class V>(const Value& value, V& result) {
+            if (!ValueTraits<V>::fromValue(value, result))
+                raiseArgument(selector, receiver, value);
+        };
+        (convert(arguments[I], std::get<I>(converted)), ...);
+        if constexpr (std::is_void_v<typename S::Result>) {
+            std::invoke(Function, leading..., std::move(std::get<I>(converted))...);
+            return {};
+        } else {
+            return toValue(std::invoke(Function, leading..., std::move(std::get<I>(converted))...));
+        }
+    }
+    (std::make_index_sequence<count>{});
+}
+
+// Whether the arguments convert to the types from First on.
+template <std::size_t First, auto Function>
+bool takes(std::span<const Value> arguments) {
+    using Types = typename Signature<decltype(Function)>::Arguments;
+    constexpr std::size_t count = std::tuple_size_v<Types> - First;
+    if (arguments.size() != count)
+        return false;
+    return [&]<std::size_t... I>(std::index_sequence<I...>) {
+        [[maybe_unused]] const auto converts = []<class V>(const Value& value, V result) {
+            return ValueTraits<V>::fromValue(value, result);
+        };
+        return (converts(arguments[I], Stored<std::tuple_element_t<First + I, Types>>{}) && ...);
+    }
+    (std::make_index_sequence<count>{});
+}
+
+template <class F>
+constexpr bool returnsValue = !std::is_void_v<typename Signature<F>::Result>;
+
+template <class T, auto Function>
+Operation instanceOperation(std::string_view name) {
+    Operation operation;
+    operation.selector = name;
+    operation.returnsValue = returnsValue<decltype(Function)>;
+    constexpr std::size_t first = std::is_member_function_pointer_v<decltype(Function)> ? 0 : 1;
+    operation.takes = &takes<first, Function>;
+    operation.invoke = [](Selector selector, const Class& receiver, Object* object,
+                          std::span<const Value> arguments) {
+        return call<first, Function>(selector, receiver, arguments, static_cast<T&>(*object));
+    };
+    return operation;
+}
+
+template <auto Function>
+constexpr bool takesClass() {
+    using Arguments = typename Signature<decltype(Function)>::Arguments;
+    if constexpr (std::tuple_size_v<Arguments> == 0)
+        return false;
+    else
+        return std::is_same_v<std::tuple_element_t<0, Arguments>, const Class&>;
+}
+
+template <auto Function>
+Operation classOperation(std::string_view name) {
+    Operation operation;
+    operation.selector = name;
+    operation.returnsValue = returnsValue<decltype(Function)>;
+    constexpr std::size_t first = takesClass<Function>() ? 1 : 0;
+    operation.takes = &takes<first, Function>;
+    operation.invoke = [](Selector selector, const Class& receiver, Object*,
+                          std::span<const Value> arguments) {
+        if constexpr (first == 1)
+            return call<first, Function>(selector, receiver, arguments, receiver);
+        else
+            return call<first, Function>(selector, receiver, arguments);
+    };
+    return operation;
+}
+
+} // namespace describe
+} // namespace qx

@@ -1,0 +1,174 @@
+#pragma once
+
+// A class by name, as data: its superclass, how to create an instance, its properties and the
+// operations that instances and the class itself answer. A host describes each of its classes once,
+// before the first object of it is used:
+//
+//     qx::Class::define<Invoice>("Invoice")
+//         .property<&Invoice::number>("number")                     // a data member
+//         .property<&Invoice::total, &Invoice::setTotal>("total")   // a pair of accessors
+//         .property<&Invoice::age>("age")                           // a getter: read-only
+//         .property<double>("net", &Invoice::net, &Invoice::net)    // overloads of one type
+//         .operation<&Invoice::setParent>("setParent:");
+//     qx::Class::define<CreditNote, Invoice>("CreditNote");         // with its base class
+//
+// The registry of classes is the list of what a document can bring to life: a mapping creates only
+// classes that were described. It may be read and written from any thread. A description is
+// published whole when its builder ends; a name that is taken stays with the first, and a warning
+// is logged. Descriptions live for ever; forget() takes a name back when a plug-in is unloaded.
+//
+// A class that nobody described is, for its objects, a subclass of the nearest of its C++ bases
+// that is; a description that comes later, of the class or of a base, holds for objects that are
+// asked for their class from then on.
+
+#include <QXXMLMarshalling/detail/ClassDescription.h>
+
+#include <memory>
+#include <typeindex>
+
+namespace qx {
+
+template <class T>
+class ClassBuilder;
+
+class QX_API Class {
+public:
+    // The class described under the name; null when there is none.
+    static const Class* named(std::string_view name);
+    // The class described for the C++ type; null when there is none.
+    static const Class* described(const std::type_info& type);
+    // Begins the description of T, whose base class is Base (Object when not given).
+    template <class T, class Base = Object>
+    static ClassBuilder<T> define(std::string_view name);
+    // Takes the name and the C++ type back; objects of the class must be gone. False when unknown.
+    static bool forget(std::string_view name);
+
+    String name() const noexcept { return _name.string(); }
+    Key key() const noexcept { return _name; }
+    // Null for Object itself.
+    const Class* superclass() const;
+    bool isSubclassOf(const Class& other) const;
+
+    // A new instance; null where the class cannot be created without arguments.
+    Ref<Object> create() const;
+
+    // The property of that name, inherited ones included; null when there is none.
+    const Property* property(Key key) const;
+    // The class's own properties in the order of their description, not the inherited ones.
+    const std::vector<Property>& ownProperties() const noexcept { return _properties; }
+
+    // The operation of instances, or of the class object, inherited ones included; null when none.
+    const Operation* operation(Selector selector) const;
+    const Operation* classOperation(Selector selector) const;
+    // Calls an operation of the class object; the receiver's class is passed on to operations that
+    // ask for it. Raises NSInvalidArgumentException when there is none of that name.
+    Value performWithArguments(Selector selector, std::span<const Value> arguments) const;
+    template <class... Arguments>
+    Value perform(Selector selector, const Arguments&... arguments) const {
+        const std::array<Value, sizeof...(Arguments)> values{Value(arguments)...};
+        return performWithArguments(selector, values);
+    }
+
+    // Whether setValueForKey tells observers of the property by itself: the answer of the class
+    // operation "automaticallyNotifiesObserversForKey:", else true.
+    bool automaticallyNotifiesObserversForKey(Key key) const;
+
+    // Used by the library for its own classes and by ClassBuilder.
+    struct Draft {
+        Key name;
+        const std::type_info* type = nullptr;
+        const std::type_info* superclass = nullptr;
+        Ref<Object> (*create)() = nullptr;
+        std::vector<Property> properties{};
+        std::vector<Operation> operations{};
+        std::vector<Operation> classOperations{};
+    };
+    // Publishes the draft, under its name too unless `listed` is false (a class that no mapping may
+    // name). The class that holds the type afterwards.
+    static const Class& publish(Draft draft, bool listed = true);
+
+    Class(const Class&) = delete;
+    Class& operator=(const Class&) = delete;
+
+private:
+    friend class Object;
+    friend struct ClassRegistry;
+
+    explicit Class(Draft draft);
+    // The class of the object's dynamic type; a stand-in when nobody described it.
+    static const Class& ofObject(const Object& object);
+
+    Key _name;
+    const std::type_info* _type;
+    const std::type_info* _superclassType;
+    mutable std::atomic<const Class*> _superclass{nullptr};
+    Ref<Object> (*_create)();
+    std::vector<Property> _properties;
+    std::vector<Operation> _operations;
+    std::vector<Operation> _classOperations;
+};
+
+// Collects the description of T and publishes it when it ends, at the end of the statement.
+template <class T>
+class ClassBuilder {
+public:
+    explicit ClassBuilder(Class::Draft draft) : _draft(std::move(draft)) {}
+    ClassBuilder(const ClassBuilder&) = delete;
+    ClassBuilder& operator=(const ClassBuilder&) = delete;
+    ~ClassBuilder() { Class::publish(std::move(_draft)); }
+
+    // A data member, or a getter without arguments (read-only).
+    template <auto Member>
+    ClassBuilder& property(std::string_view name) {
+        _draft.properties.push_back(describe::memberProperty<T, Member>(name));
+        return *this;
+    }
+    // A pair of accessors.
+    template <auto Getter, auto Setter>
+    ClassBuilder& property(std::string_view name) {
+        _draft.properties.push_back(describe::accessorProperty<T, Getter, Setter>(name));
+        return *this;
+    }
+    // Overloaded accessors of the value type V.
+    template <class V>
+    ClassBuilder& property(std::string_view name, V (T::*getter)() const, void (T::*setter)(V)) {
+        _draft.properties.push_back(describe::boundProperty<T, V, V>(name, getter, setter));
+        return *this;
+    }
+    template <class V>
+    ClassBuilder& property(std::string_view name, V (T::*getter)() const,
+                           void (T::*setter)(const V&)) {
+        _draft.properties.push_back(describe::boundProperty<T, V, const V&>(name, getter, setter));
+        return *this;
+    }
+    // A member function, or a free function that takes a T& first; one argument for each colon.
+    template <auto Function>
+    ClassBuilder& operation(std::string_view name) {
+        _draft.operations.push_back(describe::instanceOperation<T, Function>(name));
+        return *this;
+    }
+    // A static or free function; it may take a `const qx::Class&` first, the receiver's class.
+    template <auto Function>
+    ClassBuilder& classOperation(std::string_view name) {
+        _draft.classOperations.push_back(describe::classOperation<Function>(name));
+        return *this;
+    }
+
+private:
+    Class::Draft _draft;
+};
+
+template <class T, class Base>
+ClassBuilder<T> Class::define(std::string_view name) {
+    static_assert(std::derived_from<T, Object>, "described classes derive from qx::Object");
+    static_assert(std::derived_from<T, Base>);
+    Draft draft;
+    draft.name = name;
+    draft.type = &typeid(T);
+    draft.superclass = &typeid(Base);
+    if constexpr (std::is_default_constructible_v<T>)
+        draft.create = []() -> Ref<Object> { return make<T>(); };
+    return ClassBuilder<T>(std::move(draft));
+}
+
+} // namespace qx

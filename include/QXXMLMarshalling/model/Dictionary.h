@@ -1,0 +1,143 @@
+#pragma once
+
+// Values by string key, shared by reference, in the order in which keys were first set: output is
+// the same on every run. A key that was removed comes back to its place when it is set again,
+// unless the dictionary has lost 1,000 keys more than it holds and then gained others. Changing it
+// while it is walked raises NSGenericException at the walk's next step. Small dictionaries are
+// scanned, larger ones carry an index.
+
+#include <QXXMLMarshalling/detail/ObjectMemory.h>
+#include <QXXMLMarshalling/detail/ShortVector.h>
+#include <QXXMLMarshalling/model/Value.h>
+
+#include <vector>
+
+namespace qx {
+
+class Array;
+
+class QX_API Dictionary final : public Object {
+public:
+    struct Entry {
+        String key;
+        Value value; // null: removed, the key keeps its place
+        Entry() noexcept = default;
+        Entry(String aKey, Value aValue) noexcept
+            : key(std::move(aKey)), value(std::move(aValue)) {}
+    };
+
+    // NOLINTNEXTLINE(modernize-use-equals-default): the room inside would be set to zero first
+    Dictionary() noexcept {}
+    ~Dictionary() override;
+    static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
+    static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
+
+    class Iterator {
+    public:
+        Iterator(const Dictionary& dictionary, std::size_t index) noexcept
+            : _dictionary(&dictionary), _index(index), _changes(dictionary._changes) {
+            skipRemoved();
+        }
+        const Entry& operator*() const { return _dictionary->_entries[_index]; }
+        Iterator& operator++() {
+            _dictionary->checkUnchanged(_changes);
+            ++_index;
+            skipRemoved();
+            return *this;
+        }
+        bool operator!=(const Iterator& end) const {
+            _dictionary->checkUnchanged(_changes);
+            return _index < end._index;
+        }
+
+    private:
+        void skipRemoved() noexcept {
+            while (_index < _dictionary->_entries.size() &&
+                   _dictionary->_entries[_index].value.isNull())
+                ++_index;
+        }
+
+        const Dictionary* _dictionary;
+        std::size_t _index;
+        std::size_t _changes;
+    };
+    Iterator begin() const { return {*this, 0}; }
+    Iterator end() const { return {*this, _entries.size()}; }
+
+    std::size_t count() const noexcept { return _count; }
+    bool isEmpty() const noexcept { return _count == 0; }
+
+    // Null when absent.
+    Value get(const String& key) const;
+    bool contains(const String& key) const { return find(key) != nullptr; }
+    // The stored value without a copy; null pointer when absent. Good until the next change.
+    const Value* find(const String& key) const noexcept;
+    // A null key or a null value raises NSInvalidArgumentException.
+    void set(const String& key, Value value);
+    // Adds the value unless the key is there; false when it is, and then the value is left alone.
+    // Neither may be null.
+    bool add(const String& key, Value&& value) {
+        // The first few keys of most dictionaries are names, which tell themselves apart.
+        const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
+        if (!isFew || value.isNull())
+            return addAny(key, std::move(value));
+        for (const Entry& entry : _entries)
+            if (entry.key.isSameAs(key))
+                return addAny(key, std::move(value));
+        changed();
+        _entries.emplace_back(key, std::move(value));
+        ++_count;
+        return true;
+    }
+    // Nothing happens when the key is absent.
+    void remove(const String& key);
+    void removeAll();
+    // A new array of the keys, in order.
+    Ref<Array> allKeys() const;
+    Ref<Array> allValues() const;
+    // A new dictionary with the same keys and the very same values.
+    Ref<Dictionary> mutableCopy() const;
+    // How a dictionary is copied with the values inside it: null until the host installs a way.
+    using DeepCopyFunction = Ref<Dictionary> (*)(const Dictionary&);
+    static DeepCopyFunction deepCopyFunction() noexcept;
+    static void setDeepCopyFunction(DeepCopyFunction function) noexcept;
+
+    String description() const override;
+    // "{", one "key = value;" a line, "}".
+    String descriptionWithLocale(const Object* locale, std::size_t indent) const override;
+    // Same keys with equal values, in any order.
+    bool isEqual(const Object& other) const override;
+    // The value under the key; a key that begins with "@" is one of the dictionary's own
+    // properties: "@count", "@allKeys", "@allValues".
+    Value valueForKey(Key key) const override;
+    // Stores the value; null removes the key.
+    SetOutcome trySetValueForKey(const Value& value, Key key) override;
+
+protected:
+    const Class& describedClass() const override;
+
+private:
+    // Most records hold no more keys.
+    static constexpr std::uint32_t usualSize = 4;
+    // Up to that many are scanned.
+    static constexpr std::size_t fewKeys = 8;
+    // How many more keys than there are keep their places after their removal.
+    static constexpr std::size_t emptyPlaces = 1000;
+
+    std::size_t positionOf(const String& key) const noexcept;
+    void checkUnchanged(std::size_t changes) const;
+    bool addAny(const String& key, Value&& value);
+    void append(const String& key, Value&& value);
+    void makeRoom();
+    void changed() noexcept { ++_changes; }
+
+    using Index = std::vector<std::uint32_t>; // see NameIndex.h
+
+    bool _allInterned = true; // the keys, removed ones too
+    ShortVector<Entry, usualSize> _entries;
+    std::unique_ptr<Index> _index; // null while the entries are scanned
+    std::uint32_t _count = 0;
+    std::uint32_t _changes = 0;
+};
+
+} // namespace qx

@@ -1,0 +1,137 @@
+#pragma once
+
+// What key-value access carries: null, a boolean, a 64-bit integer, a double, a string or an
+// object. 16 bytes; copying shares strings and objects.
+//
+// Conversions, and what any other kind answers:
+//   boolValue()    numbers: not zero. Strings: after blanks, a sign and zeros, one of Y y T t 1-9.
+//                  Objects: true, the null marker false. Null: false.
+//   intValue()     numbers: cut towards zero, saturating at 64 bits. Strings: the integer at the
+//                  start, else 0. Everything else: 0.
+//   doubleValue()  likewise.
+//   string()       the text of a string; the null string for every other kind.
+//   object()       the object; null for every other kind.
+
+#include <QXXMLMarshalling/base/String.h>
+#include <QXXMLMarshalling/model/Object.h>
+
+#include <concepts>
+#include <cstdint>
+
+namespace qx {
+
+class QX_API Value {
+public:
+    enum class Kind : std::uint8_t { null, boolean, integer, real, string, object };
+
+    Value() noexcept = default;
+    Value(std::nullptr_t) noexcept {}
+    Value(std::same_as<bool> auto value) noexcept : _kind(Kind::boolean) {
+        _payload.boolean = value;
+    }
+    // Unsigned values above the signed 64-bit range become the nearest double.
+    template <std::integral Integer>
+    requires(!std::same_as<Integer, bool>) Value(Integer value)
+    noexcept : _kind(Kind::integer) {
+        if constexpr (std::unsigned_integral<Integer> && sizeof(Integer) == 8) {
+            if (value > static_cast<Integer>(INT64_MAX)) {
+                _kind = Kind::real;
+                _payload.real = static_cast<double>(value);
+                return;
+            }
+        }
+        _payload.integer = static_cast<std::int64_t>(value);
+    }
+    Value(std::floating_point auto value) noexcept : _kind(Kind::real) {
+        _payload.real = static_cast<double>(value);
+    }
+    // A null string gives a null value.
+    Value(const String& text) noexcept : Value(String(text)) {}
+    Value(String&& text) noexcept;
+    Value(const char* text) : Value(String(text)) {}
+    Value(std::string_view text) : Value(String(text)) {}
+    Value(const std::string& text) : Value(String(text)) {}
+    // A null reference gives a null value.
+    template <std::derived_from<Object> T>
+    Value(const Ref<T>& object) noexcept : Value(object.get()) {}
+    template <std::derived_from<Object> T>
+    Value(Ref<T>&& object) noexcept : _kind(object ? Kind::object : Kind::null) {
+        _payload.object = object.detach();
+    }
+    Value(const Object* object) noexcept;
+
+    Value(const Value& other) noexcept;
+    Value(Value&& other) noexcept : _payload(other._payload), _kind(other._kind) {
+        other._kind = Kind::null;
+    }
+    ~Value() {
+        if (_kind >= Kind::string)
+            releasePayload();
+    }
+    Value& operator=(Value other) noexcept {
+        std::swap(_payload, other._payload);
+        std::swap(_kind, other._kind);
+        return *this;
+    }
+
+    Kind kind() const noexcept { return _kind; }
+    bool isNull() const noexcept { return _kind == Kind::null; }
+    // True for booleans, integers and doubles.
+    bool isNumber() const noexcept { return _kind >= Kind::boolean && _kind <= Kind::real; }
+    bool isString() const noexcept { return _kind == Kind::string; }
+    bool isObject() const noexcept { return _kind == Kind::object; }
+    // True for null and for the null marker (Null.h).
+    bool isNullOrMarker() const noexcept;
+
+    bool boolValue() const noexcept;
+    std::int64_t intValue() const noexcept;
+    double doubleValue() const noexcept;
+    String string() const noexcept;
+    Object* object() const noexcept { return isObject() ? _payload.object : nullptr; }
+    // The object as class T, or null where the value is no object of that class.
+    template <class T>
+    Ref<T> as() const noexcept {
+        return Ref<T>(dynamic_cast<T*>(object()));
+    }
+
+    // The value as text. A boolean gives "1" or "0", an integer its decimal form, a double the
+    // shortest text that reads back equal (without an exponent from 1e-5 to below 1e17), an object
+    // its description(), null "(null)".
+    String description() const;
+    // The same inside a printed collection, whose items stand `indent` levels deep.
+    String descriptionWithLocale(const Object* locale, std::size_t indent) const;
+
+    // Numbers by value across kinds, strings by text, objects by Object::isEqual.
+    bool isEqual(const Value& other) const;
+    // The same object, the same text in memory, or equal numbers of one kind; null is null.
+    bool isSameAs(const Value& other) const noexcept;
+    friend bool operator==(const Value& a, const Value& b) { return a.isEqual(b); }
+
+    // The class name under which the value is looked up when it is marshalled: an object's own
+    // answer; for strings and numbers a name in angle brackets that no mapping can hold; null for
+    // null.
+    String classNameForMarshalling() const;
+
+private:
+    void releasePayload() noexcept;
+
+    union Payload {
+        bool boolean;
+        std::int64_t integer;
+        double real;
+        String::Rep* text;
+        Object* object;
+    };
+    Payload _payload{.integer = 0};
+    Kind _kind = Kind::null;
+};
+
+static_assert(sizeof(Value) == 16);
+
+template <class... Arguments>
+Value Object::perform(Selector selector, const Arguments&... arguments) {
+    const std::array<Value, sizeof...(Arguments)> values{Value(arguments)...};
+    return performWithArguments(selector, values);
+}
+
+} // namespace qx

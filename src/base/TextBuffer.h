@@ -1,0 +1,55 @@
+#pragma once
+
+// A text that is put together piece by piece, and becomes a String without being copied.
+
+#include <QXXMLMarshalling/base/String.h>
+
+#include <cstring>
+
+namespace qx {
+
+class TextBuffer {
+public:
+    TextBuffer() noexcept = default;
+    TextBuffer(const TextBuffer&) = delete;
+    TextBuffer& operator=(const TextBuffer&) = delete;
+    ~TextBuffer();
+
+    std::size_t size() const noexcept { return _size; }
+    std::string_view view() const noexcept {
+        return _rep != nullptr ? std::string_view(String::text(_rep), _size) : "";
+    }
+
+    TextBuffer& operator+=(std::string_view text) {
+        if (!text.empty())
+            std::memcpy(room(text.size()), text.data(), text.size());
+        return *this;
+    }
+    TextBuffer& operator+=(char c) {
+        *room(1) = c;
+        return *this;
+    }
+    void append(std::size_t count, char c) {
+        if (count != 0)
+            std::memset(room(count), c, count);
+    }
+
+    // The text; the buffer is empty afterwards.
+    String take();
+
+private:
+    char* room(std::size_t count) {
+        if (_capacity - _size < count)
+            grow(count);
+        char* const place = reinterpret_cast<char*>(_rep + 1) + _size;
+        _size += count;
+        return place;
+    }
+    void grow(std::size_t count);
+
+    String::Rep* _rep = nullptr;
+    std::size_t _size = 0;
+    std::size_t _capacity = 0; // of text, without the zero byte at its end
+};
+
+} // namespace qx

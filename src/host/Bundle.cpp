@@ -1,0 +1,203 @@
+#include <QXXMLMarshalling/host/Bundle.h>
+
+#include <QXXMLMarshalling/host/ProcessInfo.h>
+
+#include "files/Files.h"
+#include "host/FileAccess.h"
+#include "host/LoadedFile.h"
+#include "host/PropertyList.h"
+#include "model/LibraryClass.h"
+
+#include <mutex>
+#include <vector>
+
+namespace qx {
+
+namespace {
+
+struct OpenBundles {
+    // Lives for ever: code that runs while the program ends may still ask.
+    static OpenBundles& shared() {
+        static auto* const bundles = new OpenBundles;
+        return *bundles;
+    }
+
+    std::mutex mutex;
+    std::vector<Ref<Bundle>> bundles; // in the order in which they were opened
+    Ref<Bundle> main;                 // set by the host
+};
+
+// The resources of a program or library that lies in `folder`: <folder>/../share/<name>. Null when
+// there is no such folder.
+String sharedFolder(const String& folder, std::string_view name) {
+    if (folder.isNull())
+        return nullptr;
+    const String share = appendingPathComponent(directoryOf(folder), "share");
+    const String path = appendingPathComponent(share, name);
+    return isDirectory(path) ? path : String();
+}
+
+// Null where nobody knows.
+String folderOfProgram() {
+    const String program = ProcessInfo::executablePath();
+    return program.isNull() ? String() : String(directoryOf(program));
+}
+
+// "name" of …/libname.so.1.2
+std::string_view libraryName(std::string_view file) {
+    file.remove_prefix(file.rfind('/') + 1);
+    if (file.starts_with("lib"))
+        file.remove_prefix(3);
+    return file.substr(0, file.find(".so"));
+}
+
+constexpr std::string_view frameworkName = "QXXMLMarshalling";
+
+String frameworkPath() {
+    static const char anchor = 0; // lies where this library lies
+    const String file = sharedObjectHolding(&anchor);
+    String folder = file.isNull() ? folderOfProgram() : String(directoryOf(file));
+    String installed = sharedFolder(folder, frameworkName);
+    if (!installed.isNull())
+        return installed;
+#ifdef QX_FRAMEWORK_SHARE_DIR
+    if (isDirectory(QX_FRAMEWORK_SHARE_DIR))
+        return QX_FRAMEWORK_SHARE_DIR;
+#endif
+    return folder;
+}
+
+} // namespace
+
+Bundle::Bundle(String path, Ref<Dictionary> info) noexcept
+    : _path(std::move(path)), _info(std::move(info)) {}
+
+Bundle::~Bundle() = default;
+
+Ref<Bundle> Bundle::bundleWithPath(const String& path) {
+    if (!isDirectory(path))
+        return nullptr;
+    String real = realPath(path);
+    if (real.isNull())
+        return nullptr;
+    OpenBundles& open = OpenBundles::shared();
+    const auto find = [&]() -> Ref<Bundle> {
+        for (const auto& bundle : open.bundles)
+            if (bundle->bundlePath() == real)
+                return bundle;
+        return nullptr;
+    };
+    {
+        const std::lock_guard lock(open.mutex);
+        if (auto known = find())
+            return known;
+    }
+    // Read outside the lock: an error looks for its text in a bundle.
+    const PropertyList info = readPropertyList(appendingPathComponent(real, "Info.plist"));
+    auto made = make<Bundle>(real, info.values);
+    {
+        const std::lock_guard lock(open.mutex);
+        if (auto known = find())
+            return known;
+        open.bundles.push_back(made);
+    }
+    info.warn();
+    return made;
+}
+
+Ref<Bundle> Bundle::mainBundle() {
+    Ref<Bundle> bundle;
+    OpenBundles& open = OpenBundles::shared();
+    {
+        const std::lock_guard lock(open.mutex);
+        bundle = open.main;
+    }
+    if (!bundle) {
+        const String folder = folderOfProgram();
+        const String shared = sharedFolder(folder, ProcessInfo::processName());
+        bundle = bundleWithPath(shared.isNull() ? folder : shared);
+    }
+    if (bundle)
+        return bundle;
+    // The program's folder was removed while it runs, or cannot be told. Nothing lies below this.
+    static Bundle* const nowhere = [] {
+        String path = "/dev/null";
+        const auto info = make<Dictionary>();
+        return make<Bundle>(path, info).detach();
+    }();
+    return Ref<Bundle>(nowhere);
+}
+
+void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
+    OpenBundles& open = OpenBundles::shared();
+    Ref<Bundle> former = bundle; // ends after the lock, as do objects that the host gave it
+    const std::lock_guard lock(open.mutex);
+    std::swap(open.main, former);
+}
+
+Ref<Bundle> Bundle::frameworkBundle() {
+    // Looked for once: the library does not move.
+    static const String& path = *new String(frameworkPath());
+    return bundleWithPath(path);
+}
+
+Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
+    // Where the type itself lies says nothing: the linker copies it into a program that casts to
+    // it. Its name is not copied.
+    const String file = sharedObjectHolding(type.name());
+    if (file.isNull())
+        return mainBundle();
+    const std::string_view name = libraryName(file);
+    if (name == frameworkName)
+        return frameworkBundle();
+    const String folder = directoryOf(file);
+    const String shared = sharedFolder(folder, name);
+    Ref<Bundle> bundle = bundleWithPath(shared.isNull() ? folder : shared);
+    return bundle ? bundle : mainBundle();
+}
+
+void Bundle::forget(const Ref<Bundle>& bundle) {
+    OpenBundles& open = OpenBundles::shared();
+    const std::lock_guard lock(open.mutex);
+    std::erase(open.bundles, bundle);
+}
+
+Ref<Bundle> Bundle::bundleWithIdentifier(const String& identifier) {
+    if (identifier.isNull())
+        return nullptr;
+    for (const auto& bundle : {mainBundle(), frameworkBundle()})
+        if (bundle && bundle->bundleIdentifier() == identifier)
+            return bundle;
+    OpenBundles& open = OpenBundles::shared();
+    const std::lock_guard lock(open.mutex);
+    for (const auto& bundle : open.bundles)
+        if (bundle->bundleIdentifier() == identifier)
+            return bundle;
+    return nullptr;
+}
+
+Value Bundle::objectForInfoDictionaryKey(const String& key) const {
+    String set;
+    if (key == "CFBundleShortVersionString")
+        set = ProcessInfo::processVersion();
+    else if (key == "CFBundleVersion")
+        set = ProcessInfo::processBuild();
+    return !set.isNull() && mainBundle().get() == this ? Value(set) : _info->get(key);
+}
+
+String Bundle::bundleIdentifier() const { return _info->get("CFBundleIdentifier").string(); }
+
+String Bundle::pathForResource(const String& name, const String& type) const {
+    const String file = type.isEmpty() ? name : String::concat({name, ".", type});
+    const String relative = relativePath(file);
+    if (relative.isNull())
+        return nullptr;
+    String path = appendingPathComponent(_path, relative);
+    return fileExists(path) ? path : String();
+}
+
+String Bundle::description() const { return String::concat({Object::description(), " ", _path}); }
+
+const Class& Bundle::describedClass() const { return libraryClass<Bundle>("qx::Bundle"); }
+
+} // namespace qx

@@ -1,0 +1,214 @@
+#include <QXXMLMarshalling/model/Dictionary.h>
+
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Array.h>
+
+#include "model/LibraryClass.h"
+#include "model/NameIndex.h"
+#include "model/Printing.h"
+
+#include <algorithm>
+#include <iterator>
+
+namespace qx {
+
+Dictionary::~Dictionary() = default;
+
+void Dictionary::checkUnchanged(std::size_t changes) const {
+    if (changes != _changes)
+        throw Exception(Exception::generic, "a dictionary was changed while it was walked");
+}
+
+inline std::size_t Dictionary::positionOf(const String& key) const noexcept {
+    if (key.isNull())
+        return nameindex::none;
+    const auto keyOf = [this](std::size_t i) -> const String& { return _entries[i].key; };
+    return _index ? nameindex::lookUp(*_index, key, keyOf)
+                  : nameindex::scan(_entries.size(), key, _allInterned, keyOf);
+}
+
+const Value* Dictionary::find(const String& key) const noexcept {
+    const std::size_t position = positionOf(key);
+    const bool isThere = position != nameindex::none && !_entries[position].value.isNull();
+    return isThere ? &_entries[position].value : nullptr;
+}
+
+Value Dictionary::get(const String& key) const {
+    const Value* value = find(key);
+    return value != nullptr ? *value : Value();
+}
+
+namespace {
+
+[[noreturn, gnu::cold]] void raiseNull(const String& key) {
+    throw Exception(
+        Exception::invalidArgument,
+        String::concat({"a dictionary takes no null for its key ", Value(key).description()}));
+}
+
+inline void refuseNull(const String& key, const Value& value) {
+    if (key.isNull() || value.isNull())
+        raiseNull(key);
+}
+
+} // namespace
+
+void Dictionary::set(const String& key, Value value) {
+    refuseNull(key, value);
+    changed();
+    if (const std::size_t position = positionOf(key); position != nameindex::none) {
+        // The replaced value ends last: it may lead back to this dictionary.
+        const Value replaced = std::exchange(_entries[position].value, std::move(value));
+        if (replaced.isNull())
+            ++_count;
+        return;
+    }
+    append(key, std::move(value));
+}
+
+bool Dictionary::addAny(const String& key, Value&& value) {
+    refuseNull(key, value);
+    if (contains(key))
+        return false;
+    set(key, std::move(value));
+    return true;
+}
+
+inline void Dictionary::append(const String& key, Value&& value) {
+    static_assert(fewKeys == nameindex::scanLimit);
+    if (_index ? nameindex::isFull(*_index, _entries.size()) : _entries.size() >= fewKeys)
+        makeRoom();
+    _entries.emplace_back(key, std::move(value));
+    _allInterned = _allInterned && key.isInterned();
+    if (_index)
+        nameindex::add(*_index, key, _entries.size() - 1);
+    ++_count;
+}
+
+// Gives the index twice the room, and drops the places of removed keys where they are too many.
+void Dictionary::makeRoom() {
+    const bool drops = _entries.size() - _count > _count + emptyPlaces;
+    Index index = nameindex::tableFor((drops ? _count : _entries.size()) + 1);
+    auto room = index.empty() ? nullptr : std::make_unique<Index>(std::move(index));
+    if (drops)
+        _entries.eraseIf([](const Entry& entry) { return entry.value.isNull(); });
+    _index = std::move(room);
+    if (!_index)
+        return;
+    for (std::size_t i = 0; i < _entries.size(); ++i)
+        nameindex::add(*_index, _entries[i].key, i);
+}
+
+void Dictionary::remove(const String& key) {
+    const std::size_t position = positionOf(key);
+    if (position == nameindex::none || _entries[position].value.isNull())
+        return;
+    changed();
+    --_count;
+    const Value removed = std::exchange(_entries[position].value, {});
+}
+
+void Dictionary::removeAll() {
+    // What ends with its last count may lead back to this dictionary.
+    const std::vector<Entry> removed(std::make_move_iterator(_entries.begin()),
+                                     std::make_move_iterator(_entries.end()));
+    changed();
+    _count = 0;
+    _index.reset();
+    _allInterned = true;
+    _entries.clear();
+}
+
+Ref<Array> Dictionary::allKeys() const {
+    auto keys = make<Array>();
+    for (const Entry& entry : *this)
+        keys->add(entry.key);
+    return keys;
+}
+
+Ref<Array> Dictionary::allValues() const {
+    auto values = make<Array>();
+    for (const Entry& entry : *this)
+        values->add(entry.value);
+    return values;
+}
+
+Ref<Dictionary> Dictionary::mutableCopy() const {
+    auto copy = make<Dictionary>();
+    for (const Entry& entry : *this)
+        copy->set(entry.key, entry.value);
+    return copy;
+}
+
+namespace {
+
+std::atomic<Dictionary::DeepCopyFunction> installedDeepCopy{nullptr};
+
+} // namespace
+
+Dictionary::DeepCopyFunction Dictionary::deepCopyFunction() noexcept {
+    return installedDeepCopy.load();
+}
+
+void Dictionary::setDeepCopyFunction(DeepCopyFunction function) noexcept {
+    installedDeepCopy.store(function);
+}
+
+String Dictionary::description() const { return descriptionWithLocale(nullptr, 0); }
+
+String Dictionary::descriptionWithLocale(const Object* locale, std::size_t indent) const {
+    const Printing printing(*this);
+    if (!printing.mayDescend())
+        return Printing::cutShort;
+    std::string text = indentation(indent) + "{\n";
+    for (const Entry& entry : _entries) {
+        if (entry.value.isNull())
+            continue;
+        text += indentation(indent + 1);
+        text += entry.key.view();
+        text += " = ";
+        const String value = entry.value.descriptionWithLocale(locale, indent + 1);
+        // A nested list begins on the key's own line.
+        const std::size_t blanks = value.view().find_first_not_of(' ');
+        const bool nested = entry.value.isObject() && blanks != std::string_view::npos;
+        text += nested ? value.view().substr(blanks) : value.view();
+        text += ";\n";
+    }
+    return text + indentation(indent) + "}";
+}
+
+bool Dictionary::isEqual(const Object& other) const {
+    const auto* dictionary = dynamic_cast<const Dictionary*>(&other);
+    if (dictionary == nullptr || dictionary->_count != _count)
+        return false;
+    return std::all_of(_entries.begin(), _entries.end(), [&](const Entry& entry) {
+        if (entry.value.isNull())
+            return true;
+        const Value* value = dictionary->find(entry.key);
+        return value != nullptr && value->isEqual(entry.value);
+    });
+}
+
+Value Dictionary::valueForKey(Key key) const {
+    if (!key.view().starts_with('@'))
+        return get(key.string());
+    return Object::valueForKey(key.view().substr(1));
+}
+
+SetOutcome Dictionary::trySetValueForKey(const Value& value, Key key) {
+    if (value.isNull())
+        remove(key.string());
+    else
+        set(key.string(), value);
+    return SetOutcome::set;
+}
+
+const Class& Dictionary::describedClass() const {
+    using describe::memberProperty;
+    return libraryClass<Dictionary>(
+        "qx::Dictionary", {memberProperty<Dictionary, &Dictionary::count>("count"),
+                           memberProperty<Dictionary, &Dictionary::allKeys>("allKeys"),
+                           memberProperty<Dictionary, &Dictionary::allValues>("allValues")});
+}
+
+} // namespace qx

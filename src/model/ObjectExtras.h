@@ -1,0 +1,61 @@
+#pragma once
+
+// What only some objects have, kept apart so that the others stay small.
+
+#include <QXXMLMarshalling/model/Object.h>
+
+#include <memory>
+#include <vector>
+
+namespace qx {
+
+struct ObservationInfo;
+
+// Told once when an object that it was added to ends, while the object is still whole.
+class EndListener {
+public:
+    virtual void objectEnds(Object& object) noexcept = 0;
+
+protected:
+    ~EndListener() = default;
+};
+
+// What a class of object keeps of its own kind.
+struct ObjectAttachment {
+    virtual ~ObjectAttachment() = default;
+};
+
+struct Object::Extras {
+    Ref<WeakAnchor> anchor;
+    std::vector<EndListener*> endListeners;
+    std::unique_ptr<ObservationInfo> observation;
+    Object* nextWaiting = nullptr; // of the ending objects that wait for their turn
+    std::unique_ptr<ObjectAttachment> attachment;
+
+    Extras() noexcept;
+    ~Extras();
+};
+
+// The extras for the rest of this room.
+struct ObjectInternals {
+    static Object::Extras& extras(const Object& object) { return object.extras(); }
+    // Null when the object has none.
+    static Object::Extras* existingExtras(const Object& object) noexcept {
+        return object._extras == nullptr || hasLinkForExtras(object) ? nullptr : object._extras;
+    }
+    // Whether the object's last reference is gone.
+    static bool isEnding(const Object& object) noexcept;
+
+    // Ending objects that wait for their turn are linked through their extras, or in the place of
+    // these: no memory may be needed to end an object.
+    static void linkWaiting(Object& object, Object* next) noexcept;
+    static Object* unlinkWaiting(Object& object) noexcept;
+    static bool hasLinkForExtras(const Object& object) noexcept;
+
+    static void addEndListener(Object& object, EndListener& listener);
+    // Does nothing when the listener was told already.
+    static void removeEndListener(Object& object, EndListener& listener) noexcept;
+    static void tellEndListeners(Object& object) noexcept;
+};
+
+} // namespace qx

@@ -1,0 +1,219 @@
+#include <QXXMLMarshalling/model/Value.h>
+
+#include <QXXMLMarshalling/model/Null.h>
+
+#include "base/Scan.h"
+
+#include <algorithm>
+#include <cmath>
+
+namespace qx {
+
+Value::Value(String&& text) noexcept : _kind(text.isNull() ? Kind::null : Kind::string) {
+    _payload.text = std::exchange(text._rep, nullptr);
+}
+
+Value::Value(const Object* object) noexcept : _kind(object != nullptr ? Kind::object : Kind::null) {
+    if (object != nullptr)
+        object->retain();
+    _payload.object = const_cast<Object*>(object);
+}
+
+Value::Value(const Value& other) noexcept : _payload(other._payload), _kind(other._kind) {
+    if (_kind == Kind::object)
+        _payload.object->retain();
+    else if (_kind == Kind::string)
+        new (&_payload) String(other.string()); // one pointer wide: the copy's count is ours
+}
+
+void Value::releasePayload() noexcept {
+    if (_kind == Kind::object) {
+        _payload.object->release();
+    } else if (_kind == Kind::string) {
+        const String last(_payload.text); // takes the count over and gives it up
+        _kind = Kind::null;
+    }
+}
+
+String Value::string() const noexcept {
+    if (!isString())
+        return {};
+    String shared(_payload.text);
+    shared.retain();
+    return shared;
+}
+
+bool Value::isNullOrMarker() const noexcept { return isNull() || object() == Null::marker(); }
+
+namespace {
+
+// What a text says as a yes or no: blanks, a sign and zeros are passed over.
+bool textIsTrue(std::string_view text) {
+    const std::size_t start = text.find_first_not_of(" \t\r\n");
+    if (start == std::string_view::npos)
+        return false;
+    text.remove_prefix(start);
+    if (text.front() == '+' || text.front() == '-')
+        text.remove_prefix(1);
+    text.remove_prefix(std::min(text.find_first_not_of('0'), text.size()));
+    return !text.empty() &&
+           (std::string_view("YyTt").find(text.front()) != std::string_view::npos ||
+            (text.front() >= '1' && text.front() <= '9'));
+}
+
+std::int64_t saturated(double value) {
+    constexpr double limit = 9223372036854775808.0; // 2^63
+    if (std::isnan(value))
+        return 0;
+    if (value >= limit)
+        return INT64_MAX;
+    if (value < -limit)
+        return INT64_MIN;
+    return static_cast<std::int64_t>(value);
+}
+
+// Exact, where a comparison of doubles would round the integer.
+bool equal(std::int64_t integer, double real) {
+    return std::trunc(real) == real && real >= -9223372036854775808.0 &&
+           real < 9223372036854775808.0 && static_cast<std::int64_t>(real) == integer;
+}
+
+} // namespace
+
+bool Value::boolValue() const noexcept {
+    switch (_kind) {
+    case Kind::null:
+        return false;
+    case Kind::boolean:
+        return _payload.boolean;
+    case Kind::integer:
+        return _payload.integer != 0;
+    case Kind::real:
+        return _payload.real != 0;
+    case Kind::string:
+        return textIsTrue({String::text(_payload.text), _payload.text->size});
+    case Kind::object:
+        return _payload.object != Null::marker();
+    }
+    return false;
+}
+
+std::int64_t Value::intValue() const noexcept {
+    switch (_kind) {
+    case Kind::boolean:
+        return _payload.boolean ? 1 : 0;
+    case Kind::integer:
+        return _payload.integer;
+    case Kind::real:
+        return saturated(_payload.real);
+    case Kind::string:
+        return scanInteger({String::text(_payload.text), _payload.text->size}).value_or(0);
+    case Kind::null:
+    case Kind::object:
+        return 0;
+    }
+    return 0;
+}
+
+double Value::doubleValue() const noexcept {
+    switch (_kind) {
+    case Kind::boolean:
+        return _payload.boolean ? 1 : 0;
+    case Kind::integer:
+        return static_cast<double>(_payload.integer);
+    case Kind::real:
+        return _payload.real;
+    case Kind::string:
+        return scanReal({String::text(_payload.text), _payload.text->size}).value_or(0);
+    case Kind::null:
+    case Kind::object:
+        return 0;
+    }
+    return 0;
+}
+
+String Value::description() const {
+    switch (_kind) {
+    case Kind::null:
+        return "(null)";
+    case Kind::boolean:
+        return _payload.boolean ? "1" : "0";
+    case Kind::integer:
+        return std::to_string(_payload.integer);
+    case Kind::real:
+        return describeReal(_payload.real);
+    case Kind::string:
+        return string();
+    case Kind::object:
+        return _payload.object->description();
+    }
+    return {};
+}
+
+String Value::descriptionWithLocale(const Object* locale, std::size_t indent) const {
+    return isObject() ? _payload.object->descriptionWithLocale(locale, indent) : description();
+}
+
+bool Value::isEqual(const Value& other) const {
+    if (isNumber() && other.isNumber()) {
+        const bool realHere = _kind == Kind::real;
+        const bool realThere = other._kind == Kind::real;
+        if (realHere && realThere)
+            return _payload.real == other._payload.real;
+        if (realHere)
+            return equal(other.intValue(), _payload.real);
+        if (realThere)
+            return equal(intValue(), other._payload.real);
+        return intValue() == other.intValue();
+    }
+    if (_kind != other._kind)
+        return false;
+    if (_kind == Kind::string)
+        return std::string_view(String::text(_payload.text), _payload.text->size) ==
+               std::string_view(String::text(other._payload.text), other._payload.text->size);
+    if (_kind == Kind::object)
+        return _payload.object == other._payload.object ||
+               _payload.object->isEqual(*other._payload.object);
+    return true;
+}
+
+bool Value::isSameAs(const Value& other) const noexcept {
+    if (_kind != other._kind)
+        return false;
+    switch (_kind) {
+    case Kind::null:
+        return true;
+    case Kind::boolean:
+        return _payload.boolean == other._payload.boolean;
+    case Kind::integer:
+        return _payload.integer == other._payload.integer;
+    case Kind::real:
+        return _payload.real == other._payload.real;
+    case Kind::string:
+        return _payload.text == other._payload.text;
+    case Kind::object:
+        return _payload.object == other._payload.object;
+    }
+    return false;
+}
+
+// The brackets keep these names from meeting a class name: no class of a mapping can be meant.
+String Value::classNameForMarshalling() const {
+    static const Key number("<number>");
+    static const Key text("<string>");
+    switch (_kind) {
+    case Kind::null:
+        return {};
+    case Kind::boolean:
+    case Kind::integer:
+    case Kind::real:
+        return number;
+    case Kind::string:
+        return text;
+    case Kind::object:
+        return _payload.object->classNameForMarshalling();
+    }
+    return {};
+}
+
+} // namespace qx

@@ -1,0 +1,55 @@
+#include "xml/TextPosition.h"
+
+#include <algorithm>
+#include <cstring>
+
+namespace qx {
+
+namespace {
+
+// Bytes that are no continuation of a UTF-8 sequence, eight at a time.
+std::size_t countCodePoints(const char* from, const char* to) noexcept {
+    auto count = static_cast<std::size_t>(to - from);
+    constexpr std::uint64_t lowBits = 0x0101010101010101U;
+    for (; to - from >= 8; from += 8) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, from, 8);
+        const std::uint64_t continuations = (word >> 7) & ~(word >> 6) & lowBits;
+        count -= static_cast<std::size_t>((continuations * lowBits) >> 56); // adds the bytes up
+    }
+    for (; from != to; ++from)
+        count -= (static_cast<unsigned char>(*from) & 0xC0U) == 0x80U;
+    return count;
+}
+
+// Most lines begin with some, and most places are found behind them.
+const char* skipBlanks(const char* from, const char* to) noexcept {
+    while (to - from >= 8 && std::memcmp(from, "        ", 8) == 0)
+        from += 8;
+    while (from != to && *from == ' ')
+        ++from;
+    return from;
+}
+
+} // namespace
+
+void TextPosition::moveTo(std::size_t offset) noexcept {
+    offset = std::min(offset, _text.size());
+    if (offset < _offset)
+        *this = TextPosition(_text);
+    const char* from = _text.data() + _offset;
+    const char* const to = _text.data() + offset;
+    _offset = offset;
+    while (from != to) {
+        const void* lineEnd = std::memchr(from, '\n', static_cast<std::size_t>(to - from));
+        if (lineEnd == nullptr)
+            break;
+        ++_line;
+        const char* const start = static_cast<const char*>(lineEnd) + 1;
+        from = skipBlanks(start, to);
+        _column = static_cast<std::size_t>(from - start) + 1;
+    }
+    _column += countCodePoints(from, to);
+}
+
+} // namespace qx

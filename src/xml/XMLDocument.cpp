@@ -1,0 +1,153 @@
+#include <QXXMLMarshalling/xml/XMLDocument.h>
+
+#include <QXXMLMarshalling/base/Exception.h>
+
+#include "files/Files.h"
+#include "model/Errors.h"
+#include "xml/Encoding.h"
+#include "xml/Siblings.h"
+#include "xml/XMLParser.h"
+#include "xml/XMLSerializer.h"
+
+#include <istream>
+#include <ostream>
+
+namespace qx {
+
+XMLDocument::XMLDocument() noexcept : XMLNode(XMLNodeKind::document, String(), String()) {}
+
+XMLDocument::~XMLDocument() { XMLSiblings::releaseAll(_firstChild); }
+
+Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
+                                                    const XMLParseOptions& options,
+                                                    Ref<Error>* error) {
+    const String path = pathOfURL(URL);
+    if (!path.isNull())
+        return initWithContentsOfFile(path, options, error);
+    return fail(error, errors::noLocalURL, URL);
+}
+
+Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
+                                                     const XMLParseOptions& options,
+                                                     Ref<Error>* error) {
+    const Ref<Data> data = readFile(path, error);
+    return data ? initWithData(*data, options, error) : nullptr;
+}
+
+Ref<XMLDocument> XMLDocument::initWithData(XMLBytes bytes, const XMLParseOptions& options,
+                                           Ref<Error>* error) {
+    return XMLParser::parse(bytes, options, error);
+}
+
+Ref<XMLDocument> XMLDocument::initWithStream(std::istream& stream, const XMLParseOptions& options,
+                                             Ref<Error>* error) {
+    std::string bytes;
+    char block[16 * 1024];
+    while (stream.read(block, sizeof block) || stream.gcount() > 0)
+        bytes.append(block, static_cast<std::size_t>(stream.gcount()));
+    if (stream.eof() && !stream.bad())
+        return XMLParser::parse(bytes, options, error);
+    return fail(error, errors::streamNotRead);
+}
+
+Ref<XMLDocument> XMLDocument::initWithRootElement(Ref<XMLElement> root) {
+    auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+    if (root)
+        document->addChild(std::move(root));
+    return document;
+}
+
+XMLElement* XMLDocument::rootElement() const noexcept {
+    for (XMLNode& node : children())
+        if (node.isElement())
+            return node.asElement();
+    return nullptr;
+}
+
+void XMLDocument::addChild(Ref<XMLNode> child) {
+    const auto refuse = [](const char* reason) {
+        throw Exception(Exception::invalidArgument, reason);
+    };
+    if (!child)
+        refuse("a null node cannot be added to a document");
+    if (child->parent() != nullptr)
+        refuse("a node that has a parent cannot be added to a document");
+    switch (child->kind()) {
+    case XMLNodeKind::element:
+        if (rootElement() != nullptr)
+            refuse("a document cannot have two root elements");
+        break;
+    case XMLNodeKind::comment:
+    case XMLNodeKind::processingInstruction:
+        break;
+    default:
+        refuse("a document holds an element, comments and processing instructions only");
+    }
+    XMLSiblings::append(*this, _firstChild, child.detach());
+}
+
+void XMLDocument::unlink(XMLNode& node) noexcept { XMLSiblings::remove(_firstChild, node); }
+
+// Calls use(bytes) with the document's bytes in its encoding.
+template <class Use>
+auto XMLDocument::withBytes(XMLOptions options, const XMLParseOptions& reading, Use use) const {
+    TextBuffer text;
+    if (_encoding.isEmpty() || isUTF8Name(_encoding)) {
+        XMLSerializer(text, options, XMLChecks::on, nullptr, &reading).write(*this);
+        return use(text.view());
+    }
+    TextEncoder encoder(_encoding);
+    XMLSerializer(text, options, XMLChecks::on, &encoder, &reading).write(*this);
+    return use(encoder.encoded(text.view()));
+}
+
+std::string XMLDocument::XMLData(XMLOptions options, const XMLParseOptions& reading) const {
+    return withBytes(options, reading, [](auto&& bytes) {
+        return std::string(std::forward<decltype(bytes)>(bytes));
+    });
+}
+
+String XMLDocument::XMLString(XMLOptions options, const XMLParseOptions& reading) const {
+    TextBuffer text;
+    XMLSerializer(text, options, XMLChecks::on, nullptr, &reading).write(*this);
+    return text.take();
+}
+
+bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>* error,
+                              const XMLParseOptions& reading) const {
+    return withBytes(options, reading, [&](std::string_view bytes) {
+        return writeFileAtomically(path, bytes, error);
+    });
+}
+
+bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error,
+                                const XMLParseOptions& reading) const {
+    withBytes(options, reading, [&](std::string_view bytes) {
+        stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    });
+    if (stream.flush())
+        return true;
+    return fail(error, errors::streamNotWritten);
+}
+
+String XMLDocument::stringValue() const {
+    const XMLElement* root = rootElement();
+    return root != nullptr ? root->stringValue() : String("");
+}
+
+void XMLDocument::setStringValue(const String& value) {
+    if (XMLElement* root = rootElement())
+        root->setStringValue(value);
+}
+
+Ref<XMLNode> XMLDocument::copy() const {
+    auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+    document->_version = _version;
+    document->_encoding = _encoding;
+    document->_standalone = _standalone;
+    for (const XMLNode& node : children())
+        XMLSiblings::append(*document, document->_firstChild, node.copy().detach());
+    return document;
+}
+
+} // namespace qx

@@ -1,0 +1,42 @@
+#include "xml/XMLNames.h"
+
+#include "xml/ParseFailure.h"
+#include "xml/ParserText.h"
+
+#include <new>
+
+namespace qx {
+
+const String& XMLNames::add(Name local, Name prefix) {
+    if (local == nullptr) // the parser had no memory for it
+        throw std::bad_alloc();
+    if (_count >= maximumNames)
+        throw ParseFailure(parseErrors::tooManyNames, {maximumNames});
+    String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})
+                                    : String(viewOf(local));
+    const Key known = Key::existing(name);
+    if (!known.isNull())
+        name = known.string();
+    if (_count * 2 >= _entries.size()) {
+        std::vector<Entry> old(_entries.size() * 2);
+        old.swap(_entries);
+        for (Entry& entry : old)
+            if (entry.local != nullptr)
+                freeEntry(entry.local, entry.prefix).name = std::move(entry.name);
+    }
+    Entry& entry = freeEntry(local, prefix);
+    entry.name = std::move(name);
+    ++_count;
+    return entry.name;
+}
+
+XMLNames::Entry& XMLNames::freeEntry(Name local, Name prefix) noexcept {
+    std::size_t at = slot(local, prefix);
+    while (_entries[at].local != nullptr)
+        at = (at + 1) & (_entries.size() - 1);
+    _entries[at].local = local;
+    _entries[at].prefix = prefix;
+    return _entries[at];
+}
+
+} // namespace qx

@@ -1,0 +1,467 @@
+#include "xml/XMLSerializer.h"
+
+#include <QXXMLMarshalling/base/Exception.h>
+
+#include "xml/Encoding.h"
+#include "xml/XMLCharacters.h"
+#include "xml/XMLLimits.h"
+
+#include <algorithm>
+#include <array>
+
+namespace qx {
+
+namespace {
+
+bool holds(std::string_view text, std::string_view part) {
+    return text.find(part) != std::string_view::npos;
+}
+
+// "1." and digits.
+bool isVersion(std::string_view text) {
+    return text.size() > 2 && text.starts_with("1.") &&
+           text.find_first_not_of("0123456789", 2) == std::string_view::npos;
+}
+
+// Bytes that can be copied from text as they are.
+constexpr std::array<bool, 256> plainBytes = [] {
+    std::array<bool, 256> plain{};
+    for (std::size_t c = 0x20; c < 0x80; ++c)
+        plain[c] = c != '&' && c != '<' && c != '>' && c != '"';
+    return plain;
+}();
+
+std::string_view reference(char c) {
+    switch (c) {
+    case '&':
+        return "&amp;";
+    case '<':
+        return "&lt;";
+    case '>':
+        return "&gt;";
+    case '"':
+        return "&quot;";
+    case '\t':
+        return "&#9;";
+    case '\n':
+        return "&#10;";
+    default:
+        return "&#13;";
+    }
+}
+
+} // namespace
+
+void XMLSerializer::write(const XMLNode& node) {
+    if (node.kind() == XMLNodeKind::document)
+        writeDocument(static_cast<const XMLDocument&>(node));
+    else
+        writeTree(node);
+}
+
+void XMLSerializer::writeDocument(const XMLDocument& document) {
+    if (isChecked() && document.rootElement() == nullptr)
+        throw Exception(Exception::invalidArgument, "the document has no root element");
+    writeDeclaration(document);
+    for (const XMLNode& node : document.children()) {
+        writeTree(node);
+        if (has(XMLPrettyPrint))
+            _output += '\n';
+    }
+    if (_reading != nullptr && _output.size() > xmlLimits::documentSize)
+        refuseBeyond("the document is larger than", xmlLimits::documentSize, {document});
+}
+
+void XMLSerializer::writeDeclaration(const XMLDocument& document) {
+    const String& version = document.version();
+    const String& encoding = document.characterEncoding();
+    const String& standalone = document.standalone();
+    if (version.isEmpty() && encoding.isEmpty() && standalone.isEmpty())
+        return;
+    if (isChecked() && !version.isEmpty() && !isVersion(version))
+        refuse("the version is no XML version", {document});
+    if (isChecked() && !standalone.isEmpty() && standalone != "yes" && standalone != "no")
+        refuse("standalone is neither yes nor no", {document});
+    _output += "<?xml version=\"";
+    _output += version.isEmpty() ? std::string_view("1.0") : version.view();
+    for (const auto& [name, value] :
+         {std::pair(" encoding=", &encoding), std::pair(" standalone=", &standalone)}) {
+        if (value->isEmpty())
+            continue;
+        _output += '"';
+        _output += name;
+        _output += '"';
+        _output += value->view();
+    }
+    _output += "\"?>";
+    if (has(XMLPrettyPrint))
+        _output += '\n';
+}
+
+void XMLSerializer::writeTree(const XMLNode& top) {
+    const XMLNode* node = &top;
+    while (true) {
+        const XMLElement* element = node->asElement();
+        if (element != nullptr && element->holdsText()) {
+            startTag(*element);
+            const String text = element->_value;
+            requireSize(text.size(), "a text is larger than", {*element, true});
+            writeEscaped(text, Where::text, isWhite(text), {*element, true});
+            endTag(*element);
+            leave();
+        } else if (element != nullptr) {
+            startElement(*element);
+            if (const XMLNode* child = element->firstChild()) {
+                node = child;
+                startLine(*node);
+                continue;
+            }
+            endElement(*element);
+        } else {
+            writeLeaf(*node);
+        }
+        while (node != &top && node->nextSibling() == nullptr) {
+            node = node->parent();
+            endElement(*node->asElement());
+        }
+        if (node == &top)
+            return;
+        node = node->nextSibling();
+        startLine(*node);
+    }
+}
+
+void XMLSerializer::startTag(const XMLElement& element) {
+    _output += '<';
+    writeName(element.name(), {element});
+    std::size_t declarations = 0;
+    for (const XMLNode& declaration : element.namespaces()) {
+        _output += ' ';
+        writeNamespace(declaration);
+        ++declarations;
+    }
+    std::size_t attributes = declarations;
+    element.forEachAttribute([&](const String& name, const String& value) {
+        _output += ' ';
+        writeAttribute(name, value, &element, {element, false, &name});
+        ++attributes;
+        declarations += isDeclaration(name) ? 1 : 0;
+    });
+    if (_reading != nullptr)
+        enter(element, attributes, declarations);
+    if (element.childCount() != 0 || !has(XMLCompactEmptyElements))
+        _output += '>';
+}
+
+void XMLSerializer::startElement(const XMLElement& element) {
+    startTag(element);
+    if (has(XMLPrettyPrint))
+        _levels.push_back(levelOf(element));
+}
+
+void XMLSerializer::endElement(const XMLElement& element) {
+    leave();
+    if (has(XMLPrettyPrint)) {
+        const bool ownLine = element.firstChild() != nullptr && !_levels.back().isInline();
+        _levels.pop_back();
+        if (ownLine)
+            breakLine(_levels.size());
+    }
+    if (element.firstChild() == nullptr && has(XMLCompactEmptyElements)) {
+        _output += "/>";
+        return;
+    }
+    endTag(element);
+}
+
+void XMLSerializer::endTag(const XMLElement& element) {
+    _output += "</";
+    _output += element.name().view();
+    _output += '>';
+}
+
+void XMLSerializer::writeLeaf(const XMLNode& node) {
+    const String text = node.stringValue();
+    if (node.kind() != XMLNodeKind::text)
+        _textSize = 0;
+    switch (node.kind()) {
+    case XMLNodeKind::attribute:
+        writeAttribute(node.name(), text,
+                       node.parent() != nullptr ? node.parent()->asElement() : nullptr, {node});
+        break;
+    case XMLNodeKind::namespaceDeclaration:
+        writeNamespace(node);
+        break;
+    case XMLNodeKind::comment:
+        if (isChecked() && (holds(text, "--") || text.view().ends_with('-')))
+            refuse(R"(a comment holds "--" or ends in "-")", {node});
+        requireSize(text.size(), "a comment is larger than", {node});
+        _output += "<!--";
+        writeLiteral(text, {node});
+        _output += "-->";
+        break;
+    case XMLNodeKind::processingInstruction:
+        if (isChecked() && (holds(text, "?>") || node.name().equalsIgnoringCase("xml") ||
+                            (!text.isEmpty() && isWhite(text.view().front()))))
+            refuse("a processing instruction would not be read back as it is", {node});
+        requireSize(text.size(), "a processing instruction is larger than", {node});
+        _output += "<?";
+        writeName(node.name(), {node});
+        if (!text.isEmpty())
+            _output += ' ';
+        writeLiteral(text, {node});
+        _output += "?>";
+        break;
+    default:
+        writeText(node);
+    }
+}
+
+bool XMLSerializer::isDeclaration(const String& attribute) noexcept {
+    const std::string_view name = attribute.view();
+    return name.starts_with("xmlns") && (name.size() == 5 || name[5] == ':');
+}
+
+void XMLSerializer::writeAttribute(const String& name, const String& value,
+                                   const XMLElement* parent, const Place& place) {
+    requireSize(value.size(), "an attribute's value is larger than", place);
+    if (isChecked() && isDeclaration(name)) {
+        const String prefix = name.view().substr(std::min<std::size_t>(name.size(), 6));
+        if (parent != nullptr && parent->findNode(parent->_firstNamespace, prefix) != nullptr)
+            refuse("a namespace is declared twice", place);
+        countURI(value, place);
+    }
+    writeName(name, place);
+    _output += "=\"";
+    writeEscaped(value, Where::attribute, true, place);
+    _output += '"';
+}
+
+void XMLSerializer::writeNamespace(const XMLNode& declaration) {
+    _output += "xmlns";
+    if (!declaration.name().isEmpty()) {
+        _output += ':';
+        writeName(declaration.name(), {declaration});
+    }
+    _output += "=\"";
+    requireSize(declaration._value.size(), "a namespace's URI is larger than", {declaration});
+    countURI(declaration._value, {declaration});
+    writeEscaped(declaration._value, Where::attribute, true, {declaration});
+    _output += '"';
+}
+
+// White space with a line break would be dropped as layout when the document is read again.
+void XMLSerializer::writeText(const XMLNode& text) {
+    const String value = text.stringValue();
+    _textSize += value.size();
+    requireSize(_textSize, "a text is larger than", {text});
+    writeEscaped(value, Where::text, !text._isLayout && isWhite(value), {text});
+}
+
+void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escapesBreaks,
+                                 const Place& place) {
+    std::size_t written = 0;
+    const auto replace = [&](std::size_t from, std::size_t to, std::string_view by) {
+        _output += text.substr(written, from - written);
+        _output += by;
+        written = to;
+    };
+    for (std::size_t at = 0; at < text.size();) {
+        const char byte = text[at];
+        if (plainBytes[static_cast<unsigned char>(byte)]) {
+            ++at;
+            continue;
+        }
+        const std::size_t start = at;
+        const char32_t c = decodeCharacter(text, at);
+        if (c >= 0x80) {
+            if (isChecked() && !isXMLCharacter(c))
+                refuse("a text holds what is no XML character", place);
+            if (_encoder != nullptr && !_encoder->canEncode(c, text.substr(start, at - start)))
+                replace(start, at, "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";");
+        } else if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
+                   (c == '"' && where == Where::attribute) ||
+                   (c == '\t' && where == Where::attribute) || (c == '\n' && escapesBreaks)) {
+            replace(start, at, reference(byte));
+        } else if (isChecked() && !isXMLCharacter(c)) {
+            refuse("a text holds a control character", place);
+        }
+    }
+    _output += text.substr(written);
+}
+
+void XMLSerializer::writeLiteral(std::string_view text, const Place& place) {
+    if (isChecked() && !isXMLText(text))
+        refuse("a text holds what is no XML character", place);
+    if (_encoder != nullptr)
+        for (std::size_t at = 0; at < text.size();) {
+            const std::size_t start = at;
+            const char32_t c = decodeCharacter(text, at);
+            if (c >= 0x80 && !_encoder->canEncode(c, text.substr(start, at - start)))
+                refuse("the encoding lacks a character that cannot be referred to", place);
+        }
+    _output += text;
+}
+
+void XMLSerializer::writeName(const String& name, const Place& place) {
+    const char* const address = name.view().data();
+    const char*& checked = _checked[reinterpret_cast<std::uintptr_t>(address) / 16 % nameSlots];
+    if (isChecked() && (checked != address || address == nullptr)) {
+        checkName(name, place);
+        checked = address;
+    }
+    if (_encoder != nullptr)
+        return writeLiteral(name, place);
+    _output += name;
+}
+
+void XMLSerializer::checkName(const String& name, const Place& place) {
+    if (!isXMLName(name))
+        refuse("a name is no XML name", place);
+    if (_reading != nullptr)
+        countName(name, place);
+}
+
+void XMLSerializer::enter(const XMLElement& element, std::size_t attributes,
+                          std::size_t declarations) {
+    if (++_depth > _reading->maximumDepth)
+        refuseBeyond("elements nest deeper than", _reading->maximumDepth, {element});
+    if (attributes > xmlLimits::attributes)
+        refuseBeyond("an element has more attributes than", xmlLimits::attributes, {element});
+    _textSize = 0;
+    if (declarations == 0)
+        return;
+    _declarations.push_back({_depth, declarations});
+    _namespaces += declarations;
+    if (_namespaces > xmlLimits::namespaces)
+        refuseBeyond("more namespace declarations are in force than", xmlLimits::namespaces,
+                     {element});
+}
+
+void XMLSerializer::leave() noexcept {
+    if (_reading == nullptr)
+        return;
+    if (!_declarations.empty() && _declarations.back().depth == _depth) {
+        _namespaces -= _declarations.back().count;
+        _declarations.pop_back();
+    }
+    --_depth;
+    _textSize = 0;
+}
+
+void XMLSerializer::requireSize(std::size_t size, std::string_view what, const Place& place) const {
+    if (_reading != nullptr && size > _reading->maximumTextSize)
+        refuseBeyond(what, _reading->maximumTextSize, place);
+}
+
+void XMLSerializer::countName(const String& name, const Place& place) {
+    requireSize(name.size(), "a name is larger than", place);
+    if (_names.insert(name).second)
+        requireFewNames(place);
+}
+
+void XMLSerializer::countURI(const String& URI, const Place& place) {
+    if (_reading != nullptr && _URIs.insert(URI).second)
+        requireFewNames(place);
+}
+
+void XMLSerializer::requireFewNames(const Place& place) const {
+    if (_names.size() + _URIs.size() > xmlLimits::names)
+        refuseBeyond("the document has more different names than", xmlLimits::names, place);
+}
+
+// Empty texts, which no line would show, may stand among nodes that have lines of their own.
+void XMLSerializer::startLine(const XMLNode& child) {
+    if (has(XMLPrettyPrint) && !_levels.back().isInline() && child.kind() != XMLNodeKind::text)
+        breakLine(_levels.size());
+}
+
+void XMLSerializer::breakLine(std::size_t depth) {
+    // Deeper than documents are by default, blanks would outgrow all else.
+    constexpr std::size_t deepestIndent = 256;
+    _output += '\n';
+    _output.append(std::min(depth, deepestIndent) * 4, ' ');
+}
+
+XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
+    Level level = _levels.empty() ? Level{false, false} : _levels.back();
+    element.forEachAttribute([&](const String& name, const String& value) {
+        if (name == "xml:space")
+            level.preserves = value == "preserve";
+    });
+    bool hasMarkup = false;
+    for (const XMLNode& child : element.children()) {
+        if (level.isMixed)
+            break;
+        const bool isText = child.kind() == XMLNodeKind::text;
+        hasMarkup = hasMarkup || !isText;
+        level.isMixed = isText && !child.stringValue().isEmpty();
+    }
+    level.isMixed = level.isMixed || !hasMarkup;
+    return level;
+}
+
+const XMLNode& XMLSerializer::Place::spelledOut() const {
+    if (attributeName != nullptr)
+        return *node.asElement()->attributeForName(*attributeName);
+    return isItsText ? *node.firstChild() : node;
+}
+
+void XMLSerializer::refuse(std::string_view what, const Place& place) {
+    throw Exception(Exception::invalidArgument,
+                    String::concat({what, " at ", placeOf(place.spelledOut())}));
+}
+
+void XMLSerializer::refuseBeyond(std::string_view what, std::size_t limit, const Place& place) {
+    refuse(std::string(what) + " the limit of " + std::to_string(limit), place);
+}
+
+std::string placeOf(const XMLNode& node) {
+    // How many levels are named; what stands above them is left out.
+    constexpr std::size_t namedLevels = 32;
+    std::string place;
+    std::size_t named = 0;
+    const XMLNode* at = &node;
+    for (; at != nullptr && at->kind() != XMLNodeKind::document && named < namedLevels;
+         at = at->parent(), ++named) {
+        std::size_t before = 0;
+        bool isAlone = true;
+        const auto isLike = [at](const XMLNode& other) {
+            return &other != at && other.kind() == at->kind() && other.name() == at->name();
+        };
+        for (const XMLNode* other = at->previousSibling(); other; other = other->previousSibling())
+            before += isLike(*other);
+        for (const XMLNode* other = at->nextSibling(); other && isAlone;
+             other = other->nextSibling())
+            isAlone = !isLike(*other);
+        std::string step = "/";
+        switch (at->kind()) {
+        case XMLNodeKind::attribute:
+            step += '@';
+            break;
+        case XMLNodeKind::namespaceDeclaration:
+            step += at->name().isEmpty() ? "@xmlns" : "@xmlns:";
+            break;
+        case XMLNodeKind::text:
+            step += "text()";
+            break;
+        case XMLNodeKind::comment:
+            step += "comment()";
+            break;
+        case XMLNodeKind::processingInstruction:
+            step += '?';
+            break;
+        default:
+            break;
+        }
+        step += at->name().view();
+        if (before != 0 || !isAlone)
+            step += "[" + std::to_string(before + 1) + "]";
+        place.insert(0, step);
+    }
+    if (at != nullptr && at->kind() != XMLNodeKind::document)
+        place.insert(0, "...");
+    return place.empty() ? "/" : place;
+}
+
+} // namespace qx

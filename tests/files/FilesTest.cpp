@@ -1,0 +1,303 @@
+#include "files/Files.h"
+
+#include "support/FileSandbox.h"
+
+#include <gtest/gtest.h>
+
+#include <fcntl.h>
+#include <grp.h>
+#include <sys/file.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <sys/xattr.h>
+
+#include <csignal>
+
+using namespace qx;
+
+namespace {
+
+class FilesTest : public ::testing::Test {
+protected:
+    FileSandbox sandbox;
+    const std::string special = " (It is a pipe, a socket or a device.)";
+};
+
+struct Rights {
+    mode_t mode;
+    uid_t owner;
+    gid_t group;
+    bool operator==(const Rights&) const = default;
+};
+
+Rights rightsOf(const std::string& path) {
+    struct stat status {};
+    EXPECT_EQ(::stat(path.c_str(), &status), 0);
+    return {status.st_mode & 0777U, status.st_uid, status.st_gid};
+}
+
+} // namespace
+
+TEST_F(FilesTest, AFileIsReadWholeAndItsBytesStay) {
+    for (const std::size_t size : {std::size_t{0}, std::size_t{1}, std::size_t{70'000}}) {
+        const std::string text(size, 'x');
+        const std::string path = sandbox.write("file" + std::to_string(size), text);
+        const auto data = readFile(path);
+        ASSERT_TRUE(data);
+        ASSERT_EQ(::truncate(path.c_str(), 0), 0);
+        EXPECT_EQ(data->view(), text);
+    }
+    // Files of the kernel claim to be empty.
+    EXPECT_GT(readFile("/proc/self/status")->size(), 100U);
+}
+
+TEST_F(FilesTest, WhatIsTooLargeOrNoFileIsRefusedWhereThatWasAsked) {
+    const std::string pipe = sandbox.path("pipe");
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    const std::string tooLarge = " (It is larger than the limit for such files.)";
+    const std::tuple<std::string, ReadableFiles, std::string> rows[]{
+        {sandbox.write("four", "four"), ReadableFiles::regular, tooLarge},
+        {"/dev/zero", ReadableFiles::all, tooLarge},
+        {"/proc/self/status", ReadableFiles::regular, tooLarge},
+        {"/dev/zero", ReadableFiles::regular, special},
+        {pipe, ReadableFiles::regular, special}};
+    for (const auto& [path, readable, reason] : rows) {
+        Ref<Error> error;
+        EXPECT_FALSE(readFile(path, &error, readable, 3));
+        ASSERT_TRUE(error) << path;
+        EXPECT_EQ(error->description().str(),
+                  "NSCocoaErrorDomain 256: The file cannot be read: " + path + reason);
+    }
+    EXPECT_EQ(readFile(sandbox.path("four"), nullptr, ReadableFiles::regular, 4)->size(), 4U);
+}
+
+TEST_F(FilesTest, WhatCannotBeReadIsToldWithItsPathAndTheSystemsReason) {
+    const std::string file = sandbox.write("file", "x");
+    const std::pair<std::string, std::string> rows[]{
+        {sandbox.path("none"), "NSCocoaErrorDomain 260: There is no such file: " +
+                                   sandbox.path("none") + " (No such file or directory)"},
+        {file + "/below",
+         "NSCocoaErrorDomain 260: There is no such file: " + file + "/below (Not a directory)"},
+        {sandbox.root(), "NSCocoaErrorDomain 256: The file cannot be read: " + sandbox.root() +
+                             " (Is a directory)"},
+        {"", "NSCocoaErrorDomain 260: There is no such file:  (No such file or directory)"}};
+    for (const auto& [path, expected] : rows) {
+        Ref<Error> error;
+        EXPECT_FALSE(readFile(path, &error));
+        ASSERT_TRUE(error) << path;
+        EXPECT_EQ(error->description().str(), expected);
+    }
+}
+
+TEST_F(FilesTest, AZeroByteInAPathNamesNothing) {
+    const std::string path = sandbox.write("secret", "x") + std::string("\0.xml", 5);
+    Ref<Error> error;
+    EXPECT_FALSE(readFile(path, &error));
+    EXPECT_FALSE(fileExists(path));
+    EXPECT_FALSE(writeFileAtomically(path, "y", &error));
+    EXPECT_EQ(error->code(), 514);
+    EXPECT_EQ(sandbox.read("secret"), "x");
+}
+
+TEST_F(FilesTest, AWrittenFileTakesThePlaceOfWhatItsPathLeadsTo) {
+    const std::string path = sandbox.write("area/a.xml", "old");
+    ASSERT_EQ(::chmod(path.c_str(), 0600), 0);
+    std::filesystem::create_hard_link(path, sandbox.path("area/hard.xml"));
+    const std::pair<const char*, const char*> links[]{
+        {"link.xml", "a.xml"}, {"second.xml", "../area/link.xml"}, {"dangling.xml", "b.xml"}};
+    for (const auto& [link, target] : links)
+        std::filesystem::create_symlink(target, sandbox.path("area/") + link);
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/second.xml"), "new"));
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/dangling.xml"), "made"));
+    EXPECT_EQ(sandbox.read("area/a.xml"), "new");
+    EXPECT_EQ(rightsOf(path).mode, 0600U);
+    EXPECT_EQ(sandbox.read("area/b.xml"), "made");
+    EXPECT_EQ(sandbox.read("area/hard.xml"), "old");
+    for (const auto& [link, target] : links)
+        EXPECT_EQ(std::filesystem::read_symlink(sandbox.path("area/") + link), target);
+    EXPECT_EQ(sandbox.list("area"), "a.xml b.xml dangling.xml hard.xml link.xml second.xml ");
+}
+
+TEST_F(FilesTest, AFileThatIsReplacedKeepsTheRightsThatItsWriterMayGive) {
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only the superuser can be others";
+    ASSERT_EQ(::chmod(sandbox.root().c_str(), 0777), 0);
+    const std::string path = sandbox.path("a.xml");
+    const gid_t staff = 1234;
+    const struct {
+        uid_t writer;
+        bool isMember;
+        mode_t before;
+        Rights after;
+    } rows[]{{0, false, 0640, {0640, 99, staff}},
+             {65534, true, 0664, {0664, 65534, staff}},
+             {65534, false, 0664, {0604, 65534, 65534}},
+             {65534, false, 0640, {0600, 65534, 65534}},
+             {65534, false, 0604, {0600, 65534, 65534}}};
+    for (const auto& row : rows) {
+        sandbox.write("a.xml", "old");
+        ASSERT_EQ(::chown(path.c_str(), 99, staff), 0);
+        ASSERT_EQ(::chmod(path.c_str(), row.before), 0);
+        const pid_t child = ::fork();
+        if (child == 0) {
+            const bool isOther =
+                row.writer == 0 || (::setgroups(row.isMember ? 1 : 0, &staff) == 0 &&
+                                    ::setgid(row.writer) == 0 && ::setuid(row.writer) == 0);
+            ::_exit(isOther && writeFileAtomically(path, "new") ? 0 : 1);
+        }
+        int status = 0;
+        ASSERT_EQ(::waitpid(child, &status, 0), child);
+        EXPECT_EQ(status, 0);
+        EXPECT_EQ(rightsOf(path), row.after)
+            << std::oct << row.before << " " << rightsOf(path).mode;
+        std::filesystem::remove(path);
+    }
+}
+
+TEST_F(FilesTest, AnothersLinkInASharedFolderIsNotFollowed) {
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only the superuser can make another's link";
+    const std::string link = sandbox.path("shared/a.xml");
+    sandbox.write("victim.xml", "old");
+    std::filesystem::create_directory(sandbox.path("shared"));
+    std::filesystem::create_symlink("../victim.xml", link);
+    ASSERT_EQ(::lchown(link.c_str(), 99, 99), 0);
+    ASSERT_EQ(::chmod(sandbox.path("shared").c_str(), 01777), 0);
+    Ref<Error> error;
+    EXPECT_FALSE(writeFileAtomically(link, "new", &error));
+    EXPECT_EQ(error->code(), 513);
+    EXPECT_EQ(sandbox.read("victim.xml"), "old");
+    EXPECT_EQ(sandbox.list("shared"), "a.xml ");
+}
+
+TEST_F(FilesTest, AnAccessListIsKeptAndNoneIsInherited) {
+    // Version 2; owner, user 1234, group, mask, others.
+    const auto list = [](char group) {
+        const char text[] = "\2\0\0\0"
+                            "\1\0\6\0\xFF\xFF\xFF\xFF"
+                            "\2\0\4\0\xD2\4\0\0"
+                            "\4\0\0\0\xFF\xFF\xFF\xFF"
+                            "\x10\0\4\0\xFF\xFF\xFF\xFF"
+                            "\x20\0\0\0\xFF\xFF\xFF\xFF";
+        std::string bytes(text, sizeof text - 1);
+        bytes[22] = group;
+        return bytes;
+    };
+    const auto set = [](const std::string& path, const char* name, const std::string& value) {
+        return ::setxattr(path.c_str(), name, value.data(), value.size(), 0) == 0;
+    };
+    const auto listOf = [](const std::string& path) {
+        std::string value(100, ' ');
+        const ssize_t size =
+            ::getxattr(path.c_str(), "system.posix_acl_access", value.data(), value.size());
+        return value.substr(0, size < 0 ? 0 : static_cast<std::size_t>(size));
+    };
+    const std::string listed = sandbox.write("area/listed.xml", "old");
+    const std::string plain = sandbox.write("area/plain.xml", "old");
+    ASSERT_EQ(::chmod(plain.c_str(), 0640), 0);
+    if (!set(listed, "system.posix_acl_access", list(0)) ||
+        !set(sandbox.path("area"), "system.posix_acl_default", list(4)))
+        GTEST_SKIP() << "no access lists here";
+    EXPECT_TRUE(writeFileAtomically(listed, "new"));
+    EXPECT_TRUE(writeFileAtomically(plain, "new"));
+    EXPECT_EQ(listOf(listed), list(0));
+    EXPECT_EQ(listOf(plain), "");
+    EXPECT_EQ(rightsOf(plain).mode, 0640U);
+}
+
+TEST_F(FilesTest, WhatAKilledWriterLeftIsSweptAndWhatALiveOneWritesIsNot) {
+    const std::string live = sandbox.write("area/.~qx-save-0.tmp", "being written");
+    sandbox.write("area/.~qx-save-1.tmp", "left");
+    const int descriptor = ::open(live.c_str(), O_RDONLY | O_CLOEXEC);
+    ASSERT_EQ(::flock(descriptor, LOCK_EX), 0);
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/a.xml"), "new"));
+    EXPECT_EQ(sandbox.list("area"), ".~qx-save-0.tmp a.xml ");
+    ::close(descriptor);
+    EXPECT_TRUE(writeFileAtomically(sandbox.path("area/a.xml"), "new"));
+    EXPECT_EQ(sandbox.list("area"), "a.xml ");
+}
+
+TEST_F(FilesTest, WhatCannotBeWrittenIsToldAndNothingIsLeftBehind) {
+    const std::string file = sandbox.write("area/file", "x");
+    std::filesystem::create_directory(sandbox.path("area/folder"));
+    const std::string longName = sandbox.path("area/" + std::string(300, 'n'));
+    const std::string pipe = sandbox.path("area/pipe");
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    std::filesystem::create_symlink("pipe", sandbox.path("area/link"));
+    std::filesystem::create_symlink("loop", sandbox.path("area/loop"));
+    const std::pair<std::string, std::string> rows[]{
+        {file + "/below", "512: The file cannot be written: " + file + "/below (Not a directory)"},
+        {sandbox.path("area/folder"),
+         "512: The file cannot be written: " + sandbox.path("area/folder") + " (Is a directory)"},
+        {"/proc/a.xml", "512: The file cannot be written: /proc/a.xml (No such file or directory)"},
+        {longName, "512: The file cannot be written: " + longName + " (File name too long)"},
+        {pipe, "512: The file cannot be written: " + pipe + special},
+        {sandbox.path("area/link"),
+         "512: The file cannot be written: " + sandbox.path("area/link") + special},
+        {sandbox.path("area/loop"),
+         "512: The file cannot be written: " + sandbox.path("area/loop") +
+             " (Too many levels of symbolic links)"}};
+    for (const auto& [path, expected] : rows) {
+        Ref<Error> error;
+        EXPECT_FALSE(writeFileAtomically(path, "y", &error));
+        ASSERT_TRUE(error) << path;
+        EXPECT_EQ(error->description().str(), "NSCocoaErrorDomain " + expected);
+    }
+    EXPECT_EQ(sandbox.list("area"), "file folder link loop pipe ");
+    EXPECT_EQ(sandbox.read("area/file"), "x");
+}
+
+TEST_F(FilesTest, AFileThatOutgrowsItsLimitLeavesTheOldOne) {
+    const std::string path = sandbox.write("area/a.xml", "old");
+    rlimit former{};
+    ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &former), 0);
+    const rlimit small{1000, former.rlim_max};
+    const auto formerHandler = std::signal(SIGXFSZ, SIG_IGN);
+    ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &small), 0);
+    Ref<Error> error;
+    const bool written = writeFileAtomically(path, std::string(5000, 'x'), &error);
+    ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &former), 0);
+    std::signal(SIGXFSZ, formerHandler);
+    EXPECT_FALSE(written);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->localizedFailureReason(), "File too large");
+    EXPECT_EQ(sandbox.list("area"), "a.xml ");
+    EXPECT_EQ(sandbox.read("area/a.xml"), "old");
+}
+
+TEST_F(FilesTest, DirectoriesAreMadeWithThoseAboveThem) {
+    EXPECT_TRUE(createDirectoryWithParents(sandbox.path("a/b//c/")));
+    EXPECT_TRUE(createDirectoryWithParents(sandbox.path("a/b/c")));
+    EXPECT_TRUE(isDirectory(sandbox.path("a/b/c")));
+
+    sandbox.write("plain", "x");
+    Ref<Error> error;
+    EXPECT_FALSE(createDirectoryWithParents(sandbox.path("plain/c"), &error));
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->localizedDescription().str(),
+              "The file cannot be written: " + sandbox.path("plain"));
+}
+
+TEST(FileNames, ANameStaysBelowItsDirectoryOrIsNone) {
+    for (const char* name :
+         {"", ".", "..", "/a.xml", "../a.xml", "sub/../../a.xml", "sub/..", "//"})
+        EXPECT_TRUE(relativePath(name).isNull()) << name;
+    EXPECT_TRUE(relativePath(std::string_view("a\0b", 3)).isNull());
+    for (const char* name : {"a.xml", "sub/a.xml", "...", "a..b/..c"})
+        EXPECT_EQ(relativePath(name), name);
+    EXPECT_EQ(relativePath("./sub//a.xml"), "sub/a.xml");
+    EXPECT_EQ(relativePath("sub/../a.xml"), "a.xml");
+}
+
+TEST(FileNames, AFileURLIsAPath) {
+    const char* const rows[][2] = {{"/a b", "/a b"},
+                                   {"sub/a%20b", "sub/a%20b"},
+                                   {"file:///a%20b%C3%A4", "/a b\xC3\xA4"},
+                                   {"file:/a", "/a"},
+                                   {"file://localhost/a%2", "/a%2"},
+                                   {"file://elsewhere/a", nullptr},
+                                   {"https://example.org/a.xml", nullptr}};
+    for (const auto& [url, expected] : rows)
+        EXPECT_EQ(pathOfURL(url), expected) << url;
+}

@@ -1,0 +1,497 @@
+#include "support/Texts.h"
+
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
+#include <QXXMLMarshalling/model/Null.h>
+#include <QXXMLMarshalling/model/WeakRef.h>
+#include <QXXMLMarshalling/observe/Observation.h>
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <random>
+
+namespace {
+
+using namespace qx;
+using Texts = std::vector<std::string>;
+
+class Place : public Object {
+public:
+    String city;
+    String country;
+    Ref<Place> within;
+    Ref<Array> streets = make<Array>();
+    String silent;
+
+    String label() const { return String::concat({city, ", ", country}); }
+    static std::vector<String> affecting(const String& key) {
+        if (key == "label")
+            return {"city", "country"};
+        if (key == "ring")
+            return {"within.ring"};
+        return {};
+    }
+    static std::vector<String> affectingAddress() { return {"label", "within.city"}; }
+    String address() const {
+        return String::concat({label(), " in ", within ? within->city : String("the world")});
+    }
+    static bool notifies(const String& key) { return key != "silent"; }
+};
+
+const bool described = [] {
+    Class::define<Place>("ObservationTest.Place")
+        .property<&Place::city>("city")
+        .property<&Place::country>("country")
+        .property<&Place::within>("within")
+        .property<&Place::streets>("streets")
+        .property<&Place::silent>("silent")
+        .property<&Place::label>("label")
+        .property<&Place::address>("address")
+        .property<&Place::city>("ring")
+        .classOperation<&Place::affecting>("keyPathsForValuesAffectingValueForKey:")
+        .classOperation<&Place::affectingAddress>("keyPathsForValuesAffectingAddress")
+        .classOperation<&Place::notifies>("automaticallyNotifiesObserversForKey:");
+    return true;
+}();
+
+Ref<Place> place(const char* city, Ref<Place> within = nullptr) {
+    auto result = make<Place>();
+    result->city = city;
+    result->within = std::move(within);
+    return result;
+}
+
+// Notes "context: old > new", or the whole change with everything in it.
+class Notebook : public Object {
+public:
+    void observeValueForKeyPath(const String& keyPath, Object* object, const Dictionary& change,
+                                Selector context) override {
+        seen = change.mutableCopy();
+        notes.push_back(String::concat({context.isNull() ? keyPath.view() : context.name(), ": ",
+                                        change.get("old").description(), " > ",
+                                        change.get("new").description()})
+                            .str());
+        if (then)
+            then(*object);
+    }
+    Texts notes;
+    Ref<Dictionary> seen;
+    std::function<void(Object&)> then;
+};
+
+struct ObservationTest : testing::Test {
+    Ref<Notebook> notebook = make<Notebook>();
+
+    // What the call adds to the notebook.
+    template <class F>
+    Texts notes(F call) {
+        notebook->notes.clear();
+        call();
+        return notebook->notes;
+    }
+};
+
+TEST_F(ObservationTest, EachChangeIsToldOnceWithOldAndNew) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey(nullptr, "city"); }), Texts{"city: Roma > <null>"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Italy", "country"); }), Texts{});
+    rome->removeObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Rome", "city"); }), Texts{});
+    EXPECT_THROW(rome->removeObserver(notebook.get(), "city"), Exception);
+}
+
+TEST_F(ObservationTest, OptionsChooseWhatIsTold) {
+    const auto rome = place("Rome");
+    const auto told = [&](unsigned options) {
+        std::string all;
+        notebook->then = [&](Object&) { all += support::oneLine(notebook->seen); };
+        rome->city = "Rome";
+        rome->addObserver(notebook.get(), "city", options);
+        rome->setValueForKey("Roma", "city");
+        rome->removeObserver(notebook.get(), "city");
+        return all;
+    };
+    constexpr unsigned both = Observing::newValue | Observing::oldValue;
+    EXPECT_EQ(told(0), "{ kind = 1; }");
+    EXPECT_EQ(told(Observing::newValue), "{ kind = 1; new = Roma; }");
+    EXPECT_EQ(told(Observing::oldValue), "{ kind = 1; old = Rome; }");
+    EXPECT_EQ(told(both | Observing::initial | Observing::prior),
+              "{ kind = 1; new = Rome; }{ kind = 1; old = Rome; notificationIsPrior = 1; }"
+              "{ kind = 1; old = Rome; new = Roma; }");
+}
+
+TEST_F(ObservationTest, APathThroughThreeObjectsHearsOfEachOfThem) {
+    const auto europe = place("Europe"), asia = place("Asia");
+    const auto italy = place("Italy", europe), japan = place("Japan", asia);
+    const auto rome = place("Rome", italy);
+    rome->addObserver(notebook.get(), "within.within.city",
+                      Observing::newValue | Observing::oldValue, "far");
+    EXPECT_EQ(notes([&] { europe->setValueForKey("EU", "city"); }), Texts{"far: Europe > EU"});
+    EXPECT_EQ(notes([&] { italy->setValueForKey(asia, "within"); }), Texts{"far: EU > Asia"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey(japan, "within"); }), Texts{"far: Asia > Asia"});
+    EXPECT_EQ(notes([&] { italy->setValueForKey(europe, "within"); }), Texts{});
+    EXPECT_EQ(notes([&] { rome->setValueForKey(nullptr, "within"); }), Texts{"far: Asia > <null>"});
+    EXPECT_EQ(notes([&] { asia->setValueForKey("A", "city"); }), Texts{});
+}
+
+TEST_F(ObservationTest, DependentValuesAreToldOfWhatTheyDependOn) {
+    const auto rome = place("Rome", place("Italy"));
+    rome->addObserver(notebook.get(), "address");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }),
+              Texts{"address: Rome,  in Italy > Roma,  in Italy"});
+    EXPECT_EQ(notes([&] { rome->within->setValueForKey("Italia", "city"); }),
+              Texts{"address: Roma,  in Italy > Roma,  in Italia"});
+    rome->setValueForKey(place("EU"), "within");
+    EXPECT_EQ(notes([&] {
+                  const ChangeScope scope(*rome, "address");
+                  rome->within->setValueForKey("Europe", "city");
+                  rome->setValueForKey("EU", "country");
+              }),
+              Texts{"address: Roma,  in EU > Roma, EU in Europe"});
+}
+
+TEST_F(ObservationTest, DependenciesReachAnyDistanceAndMayFormRings) {
+    const auto one = place("One");
+    const auto two = place("Two", one);
+    one->within = two;
+    two->addObserver(notebook.get(), "ring", 0, "of two");
+    EXPECT_EQ(notes([&] { one->setValueForKey("one", "ring"); }), Texts{"of two: (null) > (null)"});
+    const auto end = place("end", one);
+    auto chain = end;
+    for (int i = 0; i < 20000; ++i)
+        chain = place("link", chain);
+    chain->addObserver(notebook.get(), "ring");
+    EXPECT_EQ(notes([&] { end->setValueForKey("new", "ring"); }), Texts{"ring: link > link"});
+    EXPECT_EQ(notes([&] { end->setValueForKey(place("other"), "within"); }),
+              Texts{"ring: link > link"});
+    EXPECT_EQ(notes([&] { one->setValueForKey("1", "ring"); }), Texts{"of two: (null) > (null)"});
+    EXPECT_EQ(notes([&] { end->within->setValueForKey("2", "ring"); }), Texts{"ring: link > link"});
+    one->setValueForKey(nullptr, "within");
+}
+
+TEST_F(ObservationTest, APathMayComeBackToWhereItBeganAndEndInADependentValue) {
+    const auto italy = place("Italy");
+    const auto rome = place("Rome", italy);
+    italy->within = rome;
+    rome->addObserver(notebook.get(), "within.within.address", 0, "back");
+    EXPECT_EQ(notes([&] { italy->setValueForKey("Italia", "city"); }),
+              Texts{"back: (null) > (null)"});
+    EXPECT_EQ(notes([&] { rome->setValueForKey("EU", "country"); }),
+              Texts{"back: (null) > (null)"});
+    italy->setValueForKey(nullptr, "within");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("IT", "country"); }), Texts{});
+}
+
+TEST_F(ObservationTest, NestedChangesOfOneKeyAreToldWhenTheOutermostEnds) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] {
+                  const ChangeScope scope(*rome, "city");
+                  rome->setValueForKey("Roma", "city");
+                  rome->setValueForKey("ROMA", "city");
+                  EXPECT_TRUE(notebook->notes.empty());
+              }),
+              Texts{"city: Rome > ROMA"});
+    rome->didChangeValueForKey("city"); // no change was announced
+    EXPECT_EQ(notebook->notes.size(), 1U);
+}
+
+TEST_F(ObservationTest, KeysWithoutAutomaticNotificationAreAnnouncedByHand) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "silent");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("one", "silent"); }), Texts{});
+    EXPECT_EQ(notes([&] {
+                  rome->willChangeValueForKey("silent");
+                  rome->setValueForKey("two", "silent");
+                  rome->didChangeValueForKey("silent");
+              }),
+              Texts{"silent: one > two"});
+}
+
+TEST_F(ObservationTest, ChangesOfItemsCarryIndexesAndTheItems) {
+    const auto rome = place("Rome");
+    rome->streets = make<Array>(std::initializer_list<Value>{"a", "b", "c"});
+    rome->addObserver(notebook.get(), "streets");
+    const auto told = [&](ChangeKind kind, std::vector<std::size_t> indexes, const auto& apply) {
+        rome->willChange(kind, indexes, "streets");
+        apply(*rome->streets);
+        rome->didChange(kind, indexes, "streets");
+        return support::oneLine(notebook->seen);
+    };
+    EXPECT_EQ(told(ChangeKind::insertion, {1}, [](Array& array) { array.insert(1, "x"); }),
+              "{ kind = 2; new = ( x ); indexes = ( 1 ); }");
+    EXPECT_EQ(told(ChangeKind::removal, {3}, [](Array& array) { array.remove(3); }),
+              "{ kind = 3; old = ( c ); indexes = ( 3 ); }");
+    const std::vector<std::size_t> ends = {0, 2};
+    {
+        const ChangeScope scope(*rome, "streets", ChangeKind::replacement, ends);
+        for (const std::size_t index : ends)
+            rome->streets->replace(index, "y");
+    }
+    EXPECT_EQ(support::oneLine(notebook->seen),
+              "{ kind = 4; old = ( a, b ); new = ( y, y ); indexes = ( 0, 2 ); }");
+}
+
+TEST_F(ObservationTest, ObserversAreToldInTheirOrderAndRemovedLatestFirst) {
+    const auto rome = place("Rome");
+    for (const char* context : {"a", "b", "c", "a"})
+        rome->addObserver(notebook.get(), "city", 0, context);
+    const auto told = [&] {
+        std::string order;
+        for (const auto& note : notes([&] { rome->setValueForKey("Roma", "city"); }))
+            order += note.front();
+        return order;
+    };
+    EXPECT_EQ(told(), "abca");
+    rome->removeObserver(notebook.get(), "city", "a");
+    EXPECT_EQ(told(), "abc");
+    rome->removeObserver(notebook.get(), "city");
+    EXPECT_EQ(told(), "ab");
+}
+
+TEST_F(ObservationTest, AnObserverMayRemoveItselfAndOthersWhileItIsTold) {
+    const auto rome = place("Rome");
+    auto second = make<Notebook>();
+    rome->addObserver(notebook.get(), "city");
+    rome->addObserver(second.get(), "city");
+    int calls = 0;
+    ObservationToken token = rome->observe("city", [&](const ValueChange&) { ++calls; });
+    notebook->then = [&](Object& object) {
+        object.removeObserver(notebook.get(), "city");
+        second = nullptr;
+        token.end();
+        token = object.observe("city", [&](const ValueChange&) { calls += 10; });
+    };
+    rome->setValueForKey("Roma", "city");
+    EXPECT_EQ(notebook->notes.size(), 1U);
+    EXPECT_EQ(calls, 0); // the one removed is told no more, the new one not yet
+    rome->setValueForKey("Rome", "city");
+    EXPECT_EQ(notebook->notes.size(), 1U);
+    EXPECT_EQ(calls, 10);
+}
+
+TEST_F(ObservationTest, EitherSideMayGoFirst) {
+    auto italy = place("Italy");
+    auto rome = place("Rome", italy);
+    {
+        const auto shortLived = make<Notebook>();
+        rome->addObserver(shortLived.get(), "within.city");
+        Place onStack;
+        onStack.addObserver(shortLived.get(), "city");
+        onStack.addObserver(notebook.get(), "city");
+    }
+    italy->setValueForKey("Italia", "city");
+    rome->addObserver(notebook.get(), "within.city");
+    ObservationToken token = rome->observe("within.city", [](const ValueChange&) {});
+    rome->within = nullptr; // by a change that nobody announced
+    const WeakRef<Place> watched(italy);
+    italy = nullptr;
+    EXPECT_FALSE(watched);
+    rome->setValueForKey(nullptr, "within");
+    rome = nullptr;
+    token.end();
+}
+
+TEST_F(ObservationTest, ADestructorMayRemoveItsObjectOnceMore) {
+    struct Watcher : Object {
+        explicit Watcher(Ref<Place> place) : watched(std::move(place)) {
+            watched->addObserver(this, "city");
+        }
+        ~Watcher() override { watched->removeObserver(this, "city"); }
+        Ref<Place> watched;
+    };
+    const auto rome = place("Rome");
+    make<Watcher>(rome);
+    rome->setValueForKey("Roma", "city");
+    EXPECT_EQ(rome->city, "Roma");
+}
+
+TEST_F(ObservationTest, APriorObserverMayLetTheObjectGo) {
+    auto rome = place("Rome");
+    Place& object = *rome;
+    const auto token = object.observe(
+        "city", [&](const ValueChange&) { rome = nullptr; }, Observing::prior);
+    object.setValueForKey("Roma", "city");
+    EXPECT_FALSE(rome);
+}
+
+TEST_F(ObservationTest, ADetourOfThePathChangesNothingInTheOrder) {
+    const auto italy = place("Italy");
+    const auto spain = place("Spain");
+    const auto rome = place("Rome", italy);
+    std::string order;
+    const auto first = rome->observe("within.city", [&](const ValueChange&) { order += '1'; });
+    const auto second = italy->observe("city", [&](const ValueChange&) { order += '2'; });
+    rome->setValueForKey(spain, "within");
+    rome->setValueForKey(italy, "within");
+    order.clear();
+    italy->setValueForKey("Italia", "city");
+    EXPECT_EQ(order, "12");
+}
+
+TEST_F(ObservationTest, AnObserverMayEndTheObservedObject) {
+    auto rome = place("Rome");
+    Place* raw = rome.get();
+    notebook->then = [&](Object&) { rome = nullptr; };
+    raw->addObserver(notebook.get(), "city");
+    raw->addObserver(notebook.get(), "city");
+    raw->setValueForKey("Roma", "city");
+    EXPECT_EQ(notebook->notes.size(), 2U);
+}
+
+TEST_F(ObservationTest, WhatAnObserverThrowsComesOutWhenAllHaveBeenTold) {
+    const auto rome = place("Rome");
+    rome->addObserver(make<Object>().get(), "city"); // gone at once
+    const auto deaf = make<Object>();
+    rome->addObserver(deaf.get(), "city"); // does not take changes
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_EQ(notes([&] { EXPECT_THROW(rome->setValueForKey("A", "city"), Exception); }),
+              Texts{"city: Rome > A"});
+    rome->removeObserver(deaf.get(), "city");
+    EXPECT_EQ(notes([&] { rome->setValueForKey("B", "city"); }), Texts{"city: A > B"});
+}
+
+TEST_F(ObservationTest, AChangeThatFailsInItsScopeIsStillTold) {
+    const auto rome = place("Rome");
+    rome->addObserver(notebook.get(), "city");
+    notebook->then = [](Object&) { throw std::runtime_error("observer"); };
+    EXPECT_THROW(
+        {
+            const ChangeScope scope(*rome, "city");
+            rome->city = "Roma";
+            throw std::logic_error("change");
+        },
+        std::logic_error);
+    EXPECT_EQ(notebook->notes, Texts{"city: Rome > Roma"});
+}
+
+TEST_F(ObservationTest, AThrowingPriorObserverCancelsTheAnnouncement) {
+    const auto rome = place("Rome");
+    bool refuses = true;
+    const auto token = rome->observe(
+        "city",
+        [&](const ValueChange& change) {
+            if (change.isPrior && refuses)
+                throw std::runtime_error("no");
+        },
+        Observing::prior);
+    rome->addObserver(notebook.get(), "city");
+    EXPECT_THROW(rome->setValueForKey("Roma", "city"), std::runtime_error);
+    EXPECT_EQ(rome->city, "Rome");
+    refuses = false;
+    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
+}
+
+TEST_F(ObservationTest, ManyObservationsCostTheSameInAnyOrder) {
+    constexpr int many = 40000;
+    const auto start = std::chrono::steady_clock::now();
+    const auto shared = place("Italy");
+    std::vector<Ref<Place>> places;
+    std::vector<Ref<Notebook>> notebooks;
+    std::vector<Key> keys;
+    for (int i = 0; i < many; ++i) {
+        places.push_back(place("town", shared));
+        places.back()->addObserver(notebook.get(), "within.city", 0);
+        notebooks.push_back(make<Notebook>());
+        shared->addObserver(notebooks.back().get(), "city", 0);
+        keys.emplace_back("key" + std::to_string(i));
+        shared->addObserver(notebook.get(), keys.back(), 0);
+    }
+    places.clear();
+    EXPECT_EQ(notes([&] { shared->setValueForKey("Italia", "city"); }), Texts{});
+    for (const Key key : keys)
+        shared->willChangeValueForKey(key);
+    EXPECT_EQ(notes([&] {
+                  for (const Key key : keys)
+                      shared->didChangeValueForKey(key);
+              }).size(),
+              many);
+    for (int i = 0; i < many; ++i) {
+        shared->removeObserver(notebooks[i].get(), "city");
+        shared->removeObserver(notebook.get(), keys[i]);
+    }
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(20));
+}
+
+// Observers that do at random what they may do at all: the sanitizers watch.
+struct Chaos {
+    std::minstd_rand random{7};
+    std::vector<Ref<Place>> places = std::vector<Ref<Place>>(12);
+    std::vector<Ref<Notebook>> notebooks = std::vector<Ref<Notebook>>(4);
+    std::vector<ObservationToken> tokens = std::vector<ObservationToken>(6);
+    std::vector<WeakRef<Place>> all;
+    int depth = 0;
+
+    ~Chaos() {
+        for (const auto& one : all)
+            if (one)
+                one.lock()->within = nullptr; // there are rings
+    }
+    template <class List>
+    auto& any(List& list) {
+        return list[random() % list.size()];
+    }
+    void act() {
+        const std::function<void(Object&)> further = [this](Object&) {
+            if (depth < 4)
+                act();
+        };
+        static const std::vector<Key> keys = {"city", "within", "ring"};
+        static const std::vector<Key> paths = {
+            "city", "within.city", "within.within.ring", "address", "within.within.within", "ring"};
+        const auto options = static_cast<unsigned>(random() % 16);
+        const Ref<Place> one = any(places);
+        const Ref<Notebook> observer = any(notebooks);
+        const Key key = any(keys);
+        ++depth;
+        try {
+            switch (one && observer ? random() % 10 : random() % 3) {
+            case 0:
+                all.emplace_back(any(places) = place("new", any(places)));
+                break;
+            case 1:
+                any(places) = nullptr;
+                break;
+            case 2:
+                (any(notebooks) = make<Notebook>())->then = further;
+                break;
+            case 3:
+                throw std::runtime_error("observer");
+            case 4:
+                any(tokens) = one->observe(
+                    any(paths), [=](const ValueChange& change) { further(change.object); },
+                    options);
+                break;
+            case 5:
+                one->addObserver(observer.get(), any(paths), options);
+                break;
+            case 6:
+                one->removeObserver(observer.get(), any(paths));
+                break;
+            default:
+                one->setValueForKey(key == "within" ? Value(any(places).get()) : Value("new"), key);
+            }
+        } catch (const std::exception&) {
+            if (--depth > 0 && options < 8)
+                throw;
+            return;
+        }
+        --depth;
+    }
+};
+
+TEST_F(ObservationTest, ObserversMayDoAnythingWhileTheyAreTold) {
+    Chaos chaos;
+    for (int i = 0; i < 20000; ++i)
+        chaos.act();
+    // Whatever happened, what is observed now is told.
+    const auto rome = place("Rome", chaos.places[0] ? chaos.places[0] : place("Italy"));
+    rome->addObserver(notebook.get(), "within.city", 0);
+    EXPECT_EQ(notes([&] { rome->within->setValueForKey("Italia", "city"); }).size(), 1U);
+}
+
+} // namespace

@@ -1,0 +1,214 @@
+// Mapping documents are resolved: includes are pulled in, classes are found by both of their names.
+
+#include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
+#include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
+#include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
+#include <QXXMLMarshalling/base/Exception.h>
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <map>
+#include <new>
+
+namespace {
+
+using qx::Error;
+using qx::Ref;
+using qx::String;
+
+Ref<qx::XMLDocument> parsed(std::string_view content) {
+    return qx::XMLDocument::initWithData("<mapping>" + std::string(content) + "</mapping>");
+}
+
+// Documents by name in memory; raises or reports instead for the names of faults.
+class Repository : public QXXMLDataRepository {
+public:
+    std::map<std::string, std::string> documents;
+    std::vector<std::string> asked;
+
+    bool containsDocument(const String& name) override { return documents.contains(name.str()); }
+    bool containsData(const String&) override { return false; }
+    Ref<qx::XMLDocument> documentNamed(const String& name, std::uint64_t*,
+                                       Ref<Error>* error) override {
+        asked.push_back(name.str());
+        const std::string& content = documents[name.str()];
+        if (content == "raise")
+            throw qx::Exception(qx::Exception::generic, "no such luck");
+        if (content == "no memory")
+            throw std::bad_alloc();
+        if (content == "flush") {
+            QXXMLDataRepositoryManager::flushDefaultManager();
+            return parsed("");
+        }
+        return content.starts_with("<!") ? qx::XMLDocument::initWithData(content, {}, error)
+                                         : parsed(content);
+    }
+    Ref<qx::Data> dataForName(const String&, Ref<Error>*) override { return nullptr; }
+};
+
+class MarshallingMapping : public testing::Test {
+protected:
+    MarshallingMapping() {
+        QXXMLDataRepositoryManager::defaultManager()->setVolatileRepository(repository);
+    }
+    ~MarshallingMapping() override { QXXMLDataRepositoryManager::flushDefaultManager(); }
+
+    // The names of the classes in order, or the error.
+    std::string resolve(std::string_view content) {
+        Ref<Error> error;
+        const auto mapping =
+            QXXMLMarshallingMapping::initWithDocument(parsed(content).get(), &error);
+        EXPECT_EQ(mapping.get() == nullptr, error.get() != nullptr);
+        if (error)
+            return std::to_string(error->code()) + ": " + error->localizedDescription().str() +
+                   " (" + error->localizedFailureReason().str() + ")";
+        std::string names;
+        for (const auto& type : mapping->mapping()->classMappings())
+            names += type->className().str();
+        return names;
+    }
+
+    Ref<Repository> repository = qx::make<Repository>();
+};
+
+} // namespace
+
+TEST_F(MarshallingMapping, FindsClassesByNameAndByElement) {
+    const auto document = parsed("<class name='PurchaseOrder'/><class name='Item'>"
+                                 "<map-to xml='x:it'/></class><class name='Empty'><map-to xml=''/>"
+                                 "</class>");
+    const auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get());
+    const auto name = [](const QXXMLClassMapping* found) {
+        return found != nullptr ? found->className().str() : "";
+    };
+    EXPECT_EQ(name(mapping->mappingForClassName("PurchaseOrder")), "PurchaseOrder");
+    EXPECT_EQ(name(mapping->mappingForClassName("purchaseorder")), "");
+    EXPECT_EQ(name(mapping->mappingForElementName("purchaseorder")), "PurchaseOrder");
+    EXPECT_EQ(name(mapping->mappingForElementName("PurchaseOrder")), "");
+    EXPECT_EQ(name(mapping->mappingForElementName("empty")), "Empty");
+    EXPECT_EQ(name(mapping->mappingForNode(qx::XMLElement::initWithName("x:it").get())), "Item");
+    EXPECT_EQ(name(mapping->mappingForNode(qx::XMLElement::initWithName("it").get())), "");
+    EXPECT_EQ(name(mapping->mappingForNode(nullptr)), "");
+    EXPECT_EQ(mapping->document(), document.get());
+}
+
+TEST_F(MarshallingMapping, RefusesNamesThatAreTakenTwice) {
+    EXPECT_EQ(resolve("<class name='A'/><class name='A'/>"),
+              "-205: Class redefined: A (Invalid XML)");
+    EXPECT_EQ(resolve("<class name='Item'/><class name='item'/>"),
+              "-205: Element redefined: item class: item (Invalid XML)");
+    EXPECT_EQ(resolve("<class name='A'><map-to xml='e' ns-uri='u'/></class>"
+                      "<class name='B'><map-to xml='e' ns-uri='v'/></class>"),
+              "-205: Element redefined: e class: B (Invalid XML)");
+}
+
+TEST_F(MarshallingMapping, FailsForASlotThatHoldsAnErrorAlready) {
+    Ref<Error> error = qx::make<Error>(Error::cocoaDomain, 1, "old", "old");
+    EXPECT_FALSE(QXXMLMarshallingMapping::initWithDocument(parsed("").get(), &error));
+    EXPECT_EQ(error->code(), 1);
+}
+
+TEST_F(MarshallingMapping, HoldsNoClassWithoutADocument) {
+    EXPECT_TRUE(
+        QXXMLMarshallingMapping::initWithDocument(nullptr)->mapping()->classMappings().empty());
+}
+
+TEST_F(MarshallingMapping, PullsIncludesInDepthFirst) {
+    repository->documents = {{"b", "<class name='B'/><include href='d'/>"},
+                             {"c", "<class name='C'/>"},
+                             {"d", "<class name='D'/>"}};
+    EXPECT_EQ(resolve("<include href='b'/><include href='nowhere'/><include href='c'/>"
+                      "<class name='A'/>"),
+              "ABDC");
+    EXPECT_EQ(repository->asked, (std::vector<std::string>{"b", "d", "c"}));
+}
+
+TEST_F(MarshallingMapping, ReportsAnIncludeReachedTwiceAsRedefinition) {
+    repository->documents = {{"b", "<include href='d'/>"},
+                             {"c", "<include href='d'/>"},
+                             {"d", "<class name='D'/>"},
+                             {"twice", "<class name='T'/><class name='T'/><include href='c'/>"}};
+    EXPECT_EQ(resolve("<include href='b'/><include href='c'/>"),
+              "-205: Class redefined: D (Invalid XML)");
+    EXPECT_EQ(resolve("<class name='D'/><include href='d'/>"),
+              "-205: Class redefined: D (Invalid XML)");
+    EXPECT_EQ(resolve("<include href='twice'/>"), "-205: Class redefined: T (Invalid XML)");
+    // A document is checked once its includes are there, and before the next document is loaded.
+    repository->documents["own"] = "<class name='D'/><include href='d'/>";
+    repository->documents["x"] = "<class name='X'><map-to xml='d'/></class><class name='A'/>";
+    EXPECT_EQ(resolve("<class name='A'/><class name='A'/><include href='own'/><include "
+                      "href='twice'/>"),
+              "-205: Class redefined: D (Invalid XML)");
+    EXPECT_EQ(resolve("<class name='A'/><include href='d'/><include href='x'/>"),
+              "-205: Element redefined: d class: X (Invalid XML)");
+}
+
+TEST_F(MarshallingMapping, ResolvesAChainOfIncludesInTheTimeOfItsClasses) {
+    constexpr int documents = 250;
+    constexpr int classes = 80;
+    const auto timed = [&](bool isChain) {
+        std::string all;
+        for (int i = 0; i < documents; ++i) {
+            const std::string next = "<include href='" + std::to_string(i + 1) + "'/>";
+            std::string content = isChain ? next : "";
+            for (int k = 0; k < classes; ++k)
+                content += "<class name='C" + std::to_string(i * classes + k) + "'/>";
+            repository->documents[std::to_string(i)] = content;
+            all += "<include href='" + std::to_string(i) + "'/>";
+        }
+        const auto start = std::chrono::steady_clock::now();
+        const std::string names = resolve(isChain ? "<include href='0'/>" : all);
+        EXPECT_TRUE(names.starts_with("C0C1C2") && names.ends_with("C19999"));
+        return std::chrono::steady_clock::now() - start;
+    };
+    EXPECT_LT(timed(true), 5 * timed(false));
+}
+
+TEST_F(MarshallingMapping, EndsCyclesOfIncludes) {
+    repository->documents = {
+        {"a", "<include href='b'/>"}, {"b", "<include href='c'/>"}, {"c", "<include href='b'/>"}};
+    EXPECT_EQ(resolve("<include href='a'/>"),
+              "-218: Unable to load included file: b (Unable to load included document)");
+    for (int i = 0; i < 2000; ++i)
+        repository->documents["n" + std::to_string(i)] =
+            "<include href='n" + std::to_string(i + 1) + "'/>";
+    EXPECT_EQ(resolve("<include href='n0'/>").substr(0, 5), "-218:");
+    // Without a ring, and still more documents than can be loaded.
+    for (int i = 0; i < 50; ++i) {
+        const std::string next = "<include href='d" + std::to_string(i + 1) + "'/>";
+        repository->documents["d" + std::to_string(i)] = next + next;
+    }
+    EXPECT_EQ(resolve("<include href='d0'/>").substr(0, 5), "-218:");
+}
+
+TEST_F(MarshallingMapping, AsksOneManagerForAllIncludesOfADocument) {
+    repository->documents = {{"a", "flush"}, {"b", "<class name='B'/>"}};
+    EXPECT_EQ(resolve("<include href='a'/><include href='b'/>"), "B");
+}
+
+TEST_F(MarshallingMapping, DoesNotChangeOnceItStands) {
+    repository->documents = {{"b", "<class name='B'/>"}};
+    const auto mapping =
+        QXXMLMarshallingMapping::initWithDocument(parsed("<include href='b'/>").get());
+    EXPECT_TRUE(mapping->loadIncludedDocuments() && mapping->populateLookupCaches());
+    EXPECT_EQ(mapping->mapping()->classMappings().size(), 1U);
+}
+
+TEST_F(MarshallingMapping, PassesErrorsOnAndTurnsExceptionsIntoOne) {
+    repository->documents = {{"broken", "<!DOCTYPE"},
+                             {"raising", "raise"},
+                             {"outer", "<include href='raising'/>"},
+                             {"full", "no memory"}};
+    Ref<Error> error;
+    EXPECT_FALSE(QXXMLMarshallingMapping::initWithDocument(parsed("<include href='broken'/>").get(),
+                                                           &error));
+    EXPECT_EQ(error->domain(), Error::parserDomain);
+    // What a repository raises comes out, and is caught while the document that asked is resolved.
+    EXPECT_THROW(resolve("<include href='raising'/>"), qx::Exception);
+    EXPECT_EQ(resolve("<include href='outer'/>"),
+              "-218: Unable to load included file: outer (Unable to load included document)");
+    EXPECT_FALSE(
+        QXXMLMarshallingMapping::initWithDocument(parsed("<include href='outer'/>").get()));
+    EXPECT_THROW(resolve("<include href='full'/>"), std::bad_alloc);
+}

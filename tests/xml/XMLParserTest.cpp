@@ -1,0 +1,376 @@
+#include "Text.h"
+
+#include <QXXMLMarshalling/xml/XMLDocument.h>
+
+#include <algorithm>
+#include <ctime>
+#include <functional>
+#include <gtest/gtest.h>
+
+#include "xml/ParseFailure.h"
+
+namespace {
+
+using qx::Ref;
+using qx::XMLDocument;
+using qx::XMLElement;
+using qx::XMLNode;
+using namespace std::string_literals;
+
+// The library's own texts; those of the C parser differ among its versions.
+bool isOurs(const qx::Error& error) {
+    const auto& texts = qx::parseErrors::table;
+    return std::any_of(texts.begin(), texts.end(), [&](const qx::ErrorText* text) {
+        const std::string_view message = text->message;
+        return error.code() == text->code && error.localizedDescription().view().starts_with(
+                                                 message.substr(0, message.find("%@")));
+    });
+}
+
+// The document as XML, or its error as "line:column code", with the message when it is ours.
+std::string outcome(qx::XMLBytes bytes, const qx::XMLParseOptions& options = {}) {
+    Ref<qx::Error> error;
+    const auto document = XMLDocument::initWithData(bytes, options, &error);
+    if (document)
+        return document->XMLString().str();
+    EXPECT_EQ(error->domain(), qx::Error::parserDomain);
+    EXPECT_FALSE(error->localizedDescription().isEmpty());
+    return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
+           std::to_string(error->code()) +
+           (isOurs(*error) ? " " + error->localizedDescription().str() : "");
+}
+
+struct Case {
+    std::string document;
+    std::string expected;
+};
+
+void run(const std::vector<Case>& cases, const qx::XMLParseOptions& options = {}) {
+    for (const auto& [document, expected] : cases) {
+        EXPECT_EQ(outcome(document, options), expected) << document.substr(0, 200);
+        // Bytes that nothing follows.
+        const std::vector<char> bare(document.begin(), document.end());
+        EXPECT_EQ(outcome(std::string_view(bare.data(), bare.size()), options), expected);
+    }
+}
+
+TEST(XMLParser, WhatTheDocumentSaysComesIntoTheTree) {
+    run({
+        {"<a/>", "<a></a>"},
+        {"<?xml version='1.0' standalone='yes'?>\n<!--c-->\n<a/>\n<?p d?>\n",
+         "<?xml version=\"1.0\" standalone=\"yes\"?><!--c--><a></a><?p d?>"},
+        {"<p:a q:b='1' xmlns='u' xmlns:p='v'/>", "<p:a xmlns=\"u\" xmlns:p=\"v\" q:b=\"1\"></p:a>"},
+        {"<a:b:c/>", "<a:b:c></a:b:c>"},
+        {"<a>x&amp;<![CDATA[<y>]]>&#x7A;</a>", "<a>x&amp;&lt;y&gt;z</a>"},
+        {"<a b='1\n2\t3 &#10;&lt;&quot;'/>", "<a b=\"1 2 3 &#10;&lt;&quot;\"></a>"},
+        {"<a>1\r\n2\r3</a>", "<a>1\n2\n3</a>"},
+        {"\xEF\xBB\xBF<a>\xC3\xA9</a>", "<a>\xC3\xA9</a>"},
+        {"<a>" + repeated("\xC3\xA9", 1000) + "</a>", "<a>" + repeated("\xC3\xA9", 1000) + "</a>"},
+        {"<!DOCTYPE a [<!--d--><?d d?><!ENTITY e 'x<b>y</b>'>]><a>&e;z&e;</a>",
+         "<a>x<b>y</b>zx<b>y</b></a>"},
+        {"<!DOCTYPE a [<!ENTITY i '1'><!ENTITY o '[&i;]'>]><a b='&o;'>&o;</a>",
+         "<a b=\"[1]\">[1]</a>"},
+        {"<!DOCTYPE a [<!ENTITY % p \"<!ENTITY e 'x'>\"> %p;]><a>&e;</a>", "<a>x</a>"},
+        {"<!DOCTYPE a [<!ATTLIST a b CDATA 'd' c (x|y) 'y' xmlns CDATA 'u'>]><a c='x'/>",
+         "<a xmlns=\"u\" c=\"x\" b=\"d\"></a>"},
+        {"<!DOCTYPE a SYSTEM 'nowhere.dtd'><a/>", "<a></a>"},
+        // Behind what is not read no declaration counts, unless the document stands alone.
+        {"<!DOCTYPE a [<!ATTLIST a b CDATA '1'><!ENTITY % e SYSTEM 'nowhere.dtd'> %e;%e; %x; "
+         "<!ATTLIST a c CDATA '2' d NMTOKENS #IMPLIED xmlns:f CDATA 'u'>]><a d=' 3 '/>",
+         "<a d=\" 3 \" b=\"1\"></a>"},
+        {"<?xml version='1.0' standalone='yes'?><!DOCTYPE a [<!ENTITY % e SYSTEM 'x'> %e; "
+         "<!ATTLIST a c CDATA '2'>]><a/>",
+         "<?xml version=\"1.0\" standalone=\"yes\"?><a c=\"2\"></a>"},
+        // A carriage return that a reference brings is white space in a tag, text elsewhere.
+        {"<!DOCTYPE a [<!ENTITY e '&#13;&#10;'><!ENTITY f '<b&#13;c=\"x&#13;\">"
+         "<![CDATA[&#13;]]>&#38;#13;<?p q?></b>'>]><a b='&e;'>&e;&f;&#xFDD0;</a>",
+         "<a b=\"  \">&#13;&#10;<b c=\"x \">&#13;&#13;<?p q?></b>\xEF\xB7\x90</a>"},
+        {"<!DOCTYPE a [<!ATTLIST a b (x|x) #IMPLIED>]><a/>", "<a></a>"},
+    });
+}
+
+TEST(XMLParser, WhatIsNoXMLIsAnErrorWithItsPlace) {
+    run({
+        {"", "1:1 4 The document is empty"},
+        {"  \n", "2:1 4"},
+        {"hello", "1:1 3 Start tag expected, '<' not found"},
+        {"<a>", "1:4 77"},
+        {"<a>\n <b></a>", "2:9 76"},
+        {"<a b='1' b='2'/>", "1:15 42"},
+        {"<a b=1/>", "1:6 39"},
+        {"<a/><b/>", "1:5 5"},
+        {"<a>&x;</a>", "1:7 26 The entity x is not declared"},
+        {"<a>\x01</a>", "1:4 9"},
+        {"<a>\0</a>"s, "1:4 9 The document holds a zero byte"},
+        {"<a/>\0"s, "1:5 9 The document holds a zero byte"},
+        {"\xEF\xBB\xBF<a>\xC3\xA9<b</a>", "1:7 68"},
+        {"<a>\xC3(</a>", "1:4 9"},
+        {"<!DOCTYPE a SYSTEM 'x'><a>&x;</a>", "1:30 26 The entity x is not declared"},
+        {"<!DOCTYPE a SYSTEM 'x'><a b='&x;'/>", "1:33 26 The entity x is not declared"},
+        {"<!DOCTYPE a [<!ENTITY e SYSTEM '/etc/passwd'>]><a>&e;</a>",
+         "1:54 29 The entity e stands outside of the document and is not read"},
+        {"<!DOCTYPE a [<!ENTITY e PUBLIC 'p' 'file:///etc/passwd'>]><a b='&e;'/>",
+         "1:68 29 The entity e stands outside of the document and is not read"},
+        {"<!DOCTYPE a [<!ENTITY e '&e;'>]><a>&e;</a>",
+         "1:39 89 Entities refer to themselves, or nest deeper than the limit of 32"},
+        {"<!DOCTYPE a [<!NOTATION n >]><a/>", "1:28 105 The notation n has no identifier"},
+        {"<!DOCTYPE a [<!ENTITY % e SYSTEM 'x'>%e;<!ENTITY f 'y'>]><a>&f;</a>",
+         "1:64 26 The entity f is not declared"},
+    });
+}
+
+TEST(XMLParser, LayoutIsDroppedAndOtherWhiteSpaceStays) {
+    run({
+        {"<a>\n  <b/>\n\t</a>", "<a><b></b></a>"},
+        {"<a>\n</a>", "<a></a>"},
+        {"<a> </a>", "<a> </a>"},
+        {"<a> <b/> </a>", "<a> <b></b> </a>"},
+        {"<a>\n<b/>\n text</a>", "<a>\n<b></b>\n text</a>"},
+        {"<a>\n<b>\n<c/>\n</b>\n<d/>text\n<e/>\n</a>", // only around the text
+         "<a>\n<b><c></c></b>\n<d></d>text\n<e></e>\n</a>"},
+        {"<a>\n<b/> <c/>\n</a>", "<a>\n<b></b> <c></c>\n</a>"},
+        {"<a>\n<!--c-->\n<?p?>\n</a>", "<a><!--c--><?p?></a>"},
+        {"<a>&#10;</a>", "<a>&#10;</a>"},
+        {"<a><![CDATA[\n]]></a>", "<a>&#10;</a>"},
+        {"<a>\n&#32;</a>", "<a>&#10; </a>"},
+        {"<!DOCTYPE a [<!ENTITY e '\n'>]><a>&e;</a>", "<a>&#10;</a>"},
+        {"<!DOCTYPE a [<!ENTITY e '<b/>'>]><a>&e;\n</a>", "<a><b></b></a>"},
+        {"<a>\r<b/>\r\n</a>", "<a><b></b></a>"},
+        {"<a xml:space='preserve'>\n<b>\n</b></a>", "<a xml:space=\"preserve\">\n<b>\n</b></a>"},
+        {"<a xml:space='preserve'>\n<b xml:space='default'>\n<c/></b>\n</a>",
+         "<a xml:space=\"preserve\">\n<b xml:space=\"default\"><c></c></b>\n</a>"},
+    });
+    const char* const kept = "<a>\n  <b></b>\n\t</a>";
+    EXPECT_EQ(outcome(kept, {.keepWhiteSpace = true}), kept);
+}
+
+// "name line:column" of each element.
+std::string positions(std::string_view bytes) {
+    const auto document = XMLDocument::initWithData(bytes);
+    if (!document)
+        return outcome(bytes);
+    std::string all;
+    const std::function<void(const XMLElement&)> visit = [&](const XMLElement& element) {
+        all += element.name().str() + " " + std::to_string(element.line()) + ":" +
+               std::to_string(element.column()) + "\n";
+        for (const XMLNode& child : element.children())
+            if (child.isElement())
+                visit(*child.asElement());
+    };
+    visit(*document->rootElement());
+    return all;
+}
+
+TEST(XMLParser, EveryElementKnowsWhereItStands) {
+    EXPECT_EQ(positions("<a\n b='>'\n><b/>\n\xC3\xA9\xE2\x82\xAC<c\n/><d>;</d><e/></a>"),
+              "a 1:1\nb 3:2\nc 4:3\nd 5:3\ne 5:11\n");
+    EXPECT_EQ(positions("\xEF\xBB\xBF<!--<x>--><a><![CDATA[<y>\n]]><b/></a>"), "a 1:11\nb 2:4\n");
+    EXPECT_EQ(positions("<!DOCTYPE a [<!ENTITY e '<b/><c/>'>]>\n<a>x;<d/>&e;<f/></a>"),
+              "a 2:1\nd 2:6\nb 2:10\nc 2:10\nf 2:13\n");
+}
+
+// The parser moves its buffer while it reads; positions must not follow it.
+TEST(XMLParser, PositionsHoldToTheEndOfLongLinesAndDocuments) {
+    const std::string line = repeated("<b c='\xC3\xA9'>\xE2\x82\xAC text</b>", 40'000);
+    const auto onOneLine = XMLDocument::initWithData("<a>" + line + "<z/></a>");
+    EXPECT_EQ(onOneLine->rootElement()->lastChild()->line(), 1U);
+    EXPECT_EQ(onOneLine->rootElement()->lastChild()->column(), 4U + 40'000U * 19U);
+    const auto onMany =
+        XMLDocument::initWithData("<a>" + repeated("\n<b>x</b>", 40'000) + "\n <z/></a>");
+    EXPECT_EQ(onMany->rootElement()->lastChild()->line(), 40'002U);
+    EXPECT_EQ(onMany->rootElement()->lastChild()->column(), 2U);
+}
+
+TEST(XMLParser, BeyondALimitIsAnErrorThatNamesIt) {
+    const std::string deep = repeated("<a>", 256);
+    EXPECT_EQ(outcome(deep + "\n<b/>"), "2:1 1 Elements nest deeper than the limit of 256");
+    EXPECT_EQ(outcome("<a><b><c/></b></a>", {.maximumDepth = 2}),
+              "1:7 1 Elements nest deeper than the limit of 2");
+    EXPECT_EQ(outcome("<!DOCTYPE a [<!ENTITY e '<b><c/></b>'>]><a>&e;</a>", {.maximumDepth = 2}),
+              "1:44 1 Elements nest deeper than the limit of 2");
+    const std::string beyond = " is larger than the limit of 9 bytes";
+    run({{"<a>12345<![CDATA[67890]]></a>", "1:26 1 A text" + beyond},
+         {"<a b='1234567890'/>", "1:1 1 An attribute's value" + beyond},
+         {"<a>\n<bcdefghijk/></a>", "2:1 1 A name" + beyond},
+         {"<a bcdefghijk=''/>", "1:1 1 A name" + beyond},
+         {"<a><!--1234567890--></a>", "1:21 1 A comment" + beyond},
+         {"<a><?b 1234567890?></a>", "1:20 1 A processing instruction" + beyond},
+         {"<a b='123456789'>123456789</a>", "<a b=\"123456789\">123456789</a>"}},
+        {.maximumTextSize = 9});
+    EXPECT_EQ(outcome("<a>" + repeated("x", 10'000'001) + "</a>"),
+              "1:4 1 A text is larger than the limit of 10000000 bytes");
+}
+
+TEST(XMLParser, RaisedLimitsGoBeyondTheParsersOwn) {
+    const std::string deep = repeated("<a>", 2000) + repeated("</a>", 2000);
+    EXPECT_EQ(outcome(deep, {.maximumDepth = 2000}).size(), deep.size());
+    EXPECT_EQ(outcome("<a>" + deep + "</a>", {.maximumDepth = 2000}),
+              "1:6001 1 Elements nest deeper than the limit of 2000");
+    const std::string wide =
+        "<a b=\"" + repeated("x", 10'500'000) + "\">" + repeated("y", 10'500'000) + "</a>";
+    EXPECT_EQ(outcome(wide, {.maximumTextSize = 11'000'000}).size(), wide.size());
+}
+
+// What each number from 0 on adds, together with the one before it.
+template <class Text>
+std::string joined(int count, Text text) {
+    std::string all;
+    for (int i = 0; i < count; ++i) {
+        const std::string number = std::to_string(i);
+        const std::string before = std::to_string(i - 1);
+        all += text(number, before);
+    }
+    return all;
+}
+
+std::string withSubset(const std::string& subset, const std::string& root) {
+    return "<!DOCTYPE a [" + subset + "]>" + root;
+}
+
+// Entities of which each refers ten times to the one before it.
+std::string laughs(const std::string& innermost, const std::string& kind = "") {
+    const std::string reference = kind.empty() ? "&e" : "&#37;e";
+    return joined(10, [&](const std::string& number, const std::string& before) {
+        return "<!ENTITY " + kind + "e" + number + " \"" +
+               (number == "0" ? innermost : repeated(reference + before + ";", 10)) + "\">";
+    });
+}
+
+// Each of these took more than linear time or memory, in one version of the C parser or another.
+TEST(XMLParser, HostileDocumentsEndSoon) {
+    const std::string expansion = " 89 Entities and attribute defaults bring in more than";
+    const std::string subset = " 1 The DOCTYPE declares more than the limit of 65536 bytes";
+    const std::string attributes = joined(5000, [](auto& i, auto&) { return " a" + i + "='='"; });
+    const std::string few = joined(600, [](auto& i, auto&) { return " a" + i + "&#61;''"; });
+    const std::string names = joined(2500, [](auto& i, auto&) { return " a" + i + " CDATA ''"; });
+    const std::string tokens = joined(20'000, [](auto& i, auto&) { return "|t" + i; });
+    const Case cases[] = {
+        {withSubset(laughs("lol"), "<a>&e9;</a>"), expansion},
+        {withSubset(laughs(""), "<a b='&e9;'/>"), expansion},
+        {withSubset(laughs("<b/>"), "<a>&e9;</a>"), expansion},
+        {withSubset(laughs("") + "<!ATTLIST a b CDATA '&e9;'>", "<a/>"), expansion},
+        {withSubset("<!ENTITY e '" + repeated("x", 10'000) + "'>",
+                    "<a>" + repeated("&e;", 10'000) + "</a>"),
+         expansion},
+        {withSubset("<!ENTITY e '<b/>'>", "<a>" + repeated("&e;", 60'000) + "</a>"), expansion},
+        {withSubset("<!ATTLIST a" + names.substr(0, names.find(" a1999 ")) + ">",
+                    repeated("<a>\n", 200)),
+         expansion},
+        {withSubset("<!ATTLIST a" + names + ">", "<a/>"),
+         " 1 More attributes have defaults than the limit of 2000"},
+        {withSubset(laughs("", "% ") + "%e9;", "<a/>"), subset},
+        {withSubset("<!ENTITY % p '&#37;p;&#37;p;'> %p;", "<a/>"), " 89"},
+        {withSubset("<!ENTITY % p \"<!ENTITY e '&#37;p;&#37;p;'>\"> %p;", "<a/>"), " 89"},
+        {withSubset("<!ENTITY e '&f;'><!ENTITY f '&e;'>", "<a b='&e;'/>"),
+         " 89 Entities refer to themselves"},
+        {withSubset("<!ENTITY e-1 ''>" + joined(40,
+                                                [](auto& i, auto& before) {
+                                                    return "<!ENTITY e" + i + " '<b>&e" + before +
+                                                           ";</b>'>";
+                                                }),
+                    "<a>&e39;</a>"),
+         " 89 Entities refer to themselves, or nest deeper than the limit of 32"},
+        {withSubset("<!ENTITY e \"<b" + few + "/>\">", "<a>&e;</a>"),
+         " 1 An element has more attributes than the limit of 512"},
+        {withSubset("<!ATTLIST a b (x" + tokens + ") #IMPLIED>", "<a/>"), subset},
+        {withSubset("<!ENTITY % p '<!ATTLIST a b (x" + tokens.substr(0, 20'000) + ") #IMPLIED>'>" +
+                        repeated("%p;<?p?>", 1000),
+                    "<a/>"),
+         subset},
+        {withSubset("<!-- ] ' --><?p ] \" ?><!ENTITY e ']'>" + repeated(" ", 65'500), "<a/>"),
+         subset},
+        {withSubset("<!ELEMENT a " + repeated("(", 30'000) + "b" + repeated(")", 30'000) + ">",
+                    "<a/>"),
+         " 55"},
+        {"<!--" + repeated("-", 500'000) + "--><a/>", " 80"},
+        {repeated("<!-- --", 100'000) + "<a/>", " 80"},
+        {"<a><!--" + repeated("--a", 100'000) + "--></a>", " 80"},
+        {repeated("<a ", 300'000), " 68"},
+        {"<r>\n" + repeated("x", 40'000) + "<a" + attributes + "/></r>",
+         "2:40001 1 An element has more attributes than the limit of 4096"},
+        {"<r>\n<a" + joined(2000, [](auto& i, auto&) { return " xmlns:n" + i + "='u'"; }) +
+             "/></r>",
+         "2:1 1 More namespace declarations are in force than the limit of 1000"},
+        {"<a>" + joined(100'001, [](auto& i, auto&) { return "\n<b" + i + "/>"; }),
+         "100001:1 1 The document has more different names than the limit of 100000"},
+    };
+    for (const auto& [document, expected] : cases) {
+        const std::clock_t start = std::clock();
+        const std::string came = outcome(document);
+        EXPECT_LT(std::clock() - start, 2 * CLOCKS_PER_SEC) << document.substr(0, 200);
+        EXPECT_NE(came.find(expected), std::string::npos) << document.substr(0, 200) << '\n'
+                                                          << came.substr(0, 200);
+    }
+}
+
+TEST(XMLParser, TheHostSaysWhatADoctypeMayDeclare) {
+    const std::string document = withSubset("<!ENTITY % p ' '>%p;<!ENTITY e 'x'>", "<a>&e;</a>");
+    EXPECT_EQ(outcome(document, {.maximumSubsetSize = 68}), "<a>x</a>");
+    EXPECT_EQ(outcome(document, {.maximumSubsetSize = 67}),
+              "1:34 1 The DOCTYPE declares more than the limit of 67 bytes");
+    EXPECT_EQ(outcome(document, {.maximumSubsetSize = 34}),
+              "1:13 1 The DOCTYPE declares more than the limit of 34 bytes");
+    EXPECT_EQ(outcome(document, {.refuseDoctype = true}),
+              "1:13 1 The document has a DOCTYPE, which is not allowed here");
+    EXPECT_EQ(outcome("<a>&lt;</a>", {.refuseDoctype = true}), "<a>&lt;</a>");
+}
+
+TEST(XMLParser, OnlyAttributesCountAsAttributes) {
+    const std::string many = repeated(" a='b'", 5000);
+    for (const std::string& inside :
+         {"<!--" + many + "-->", "<b c=\"" + many + "\"></b>", "<b></b>" + many})
+        EXPECT_EQ(outcome("<a>" + inside + "</a>").size(), inside.size() + 7)
+            << inside.substr(0, 20);
+}
+
+TEST(XMLParser, DocumentsComeInManyEncodings) {
+    const std::string utf16 = "<?xml version='1.0' encoding='UTF-16'?><a>\xC3\xA9</a>";
+    const auto wide = [](std::string_view text, bool big) {
+        std::string bytes;
+        for (std::size_t i = 0; i < text.size(); ++i) {
+            const char low = text[i] == '\xC3' ? text[++i] + 0x40 : text[i];
+            bytes += big ? std::string{'\0', low} : std::string{low, '\0'};
+        }
+        return bytes;
+    };
+    const std::string accent = "<a>\xC3\xA9</a>";
+    const auto withLabel = [&](const char* label) {
+        return "<?xml version=\"1.0\" encoding=\""s + label + "\"?>" + accent;
+    };
+    run({
+        {"\xFE\xFF" + wide(utf16, true), withLabel("UTF-16")},
+        {"\xFF\xFE" + wide(utf16, false), withLabel("UTF-16")},
+        {wide(accent, true), accent},
+        {wide(accent, false), accent},
+        {"<?xml version='1.0' encoding='ISO-8859-1'?><a>\xE9</a>", withLabel("ISO-8859-1")},
+        {"<?xml version='1.0' encoding = 'windows-1252'?><a>\xE9</a>", withLabel("windows-1252")},
+        {"<?xml version='1.0' encoding='utf-8'?><a>\xC3\xA9</a>", withLabel("utf-8")},
+        {"<?xml version='1.0' encoding='nope'?><a/>", "1:1 32 The encoding nope is not known"},
+        {"<?xml version='1.0' encoding='UTF-8//IGNORE'?><a/>",
+         "1:1 32 The encoding UTF-8//IGNORE is not known"},
+        {"<?xml version='1.0' encoding='UTF-16'?><a></a>",
+         "1:1 81 The document is not in the encoding that it declares, UTF-16"},
+        {"<?xml version='1.0' encoding='US-ASCII'?>\n<a>\xE9</a>",
+         "2:4 81 A character is not in the encoding US-ASCII"},
+        {"\xFE\xFF" + wide("<a>\n</a>", true) + "x",
+         "2:5 81 A character is not in the encoding UTF-16BE"},
+        {"\xFF\xFE", "1:1 4 The document is empty"},
+    });
+}
+
+TEST(XMLParser, EveryBeginningOfADocumentIsRefusedWithAnError) {
+    const std::string whole = "<?xml version='1.0' encoding='UTF-8'?><!DOCTYPE a [<!ENTITY e 'x'>"
+                              "<!ATTLIST a b CDATA 'c'>]><!--d--><a f='&e;'>&e;<![CDATA[g]]>"
+                              "<h xmlns:i='j'/><?k l?>\xC3\xA9&#10;</a>";
+    ASSERT_EQ(outcome(whole).front(), '<');
+    const qx::Data lent("<a/>b", 4, nullptr);
+    EXPECT_EQ(outcome(lent), "<a></a>");
+    for (std::size_t size = 0; size < whole.size(); ++size) {
+        // Memory of that very size, so that the sanitizer sees a look behind the end.
+        const std::vector<char> bytes(whole.data(), whole.data() + size);
+        EXPECT_NE(outcome(std::string_view(bytes.data(), size)).front(), '<')
+            << whole.substr(0, size);
+    }
+}
+
+} // namespace

@@ -1,0 +1,288 @@
+#include "support/Texts.h"
+
+#include <QXXMLMarshalling/xml/XMLDocument.h>
+
+#include <functional>
+#include <gtest/gtest.h>
+
+namespace {
+
+using qx::Ref;
+using qx::XMLDocument;
+using qx::XMLElement;
+using qx::XMLNode;
+using namespace std::string_literals;
+
+std::string utf8(char32_t c) {
+    const auto byte = [](char32_t bits) { return static_cast<char>(bits); };
+    if (c < 0x80)
+        return {byte(c)};
+    if (c < 0x800)
+        return {byte(0xC0 | c >> 6), byte(0x80 | (c & 0x3F))};
+    if (c < 0x10000)
+        return {byte(0xE0 | c >> 12), byte(0x80 | (c >> 6 & 0x3F)), byte(0x80 | (c & 0x3F))};
+    return {byte(0xF0 | c >> 18), byte(0x80 | (c >> 12 & 0x3F)), byte(0x80 | (c >> 6 & 0x3F)),
+            byte(0x80 | (c & 0x3F))};
+}
+
+// <a b="text">text</a>
+Ref<XMLDocument> holding(const std::string& text) {
+    const auto root = XMLElement::initWithName("a", text);
+    root->addAttribute(XMLNode::attributeWithName("b", text));
+    return XMLDocument::initWithRootElement(root);
+}
+
+void expectReadBack(const std::string& text, const std::string& bytes) {
+    const auto read = XMLDocument::initWithData(bytes);
+    ASSERT_TRUE(read) << bytes;
+    const XMLElement& root = *read->rootElement();
+    EXPECT_TRUE(root.stringValue().view() == text) << bytes.substr(0, 200);
+    EXPECT_TRUE(root.attributeForName("b")->stringValue().view() == text) << bytes.substr(0, 200);
+}
+
+TEST(XMLSerializer, EachCharacterThatXMLAllowsIsReadBackAndNoOtherIsWritten) {
+    std::string all;
+    for (char32_t c = 0; c <= 0x10FFFF; ++c) {
+        const bool isAllowed = c == 9 || c == 10 || c == 13 || (c >= 0x20 && c < 0xD800) ||
+                               (c >= 0xE000 && c <= 0xFFFD) || c >= 0x10000;
+        // Each of the first, and those at the ends of the allowed ranges, stand alone too.
+        const bool isNotable = c < 0x100 || (c >= 0xD7F0 && c <= 0xE010) ||
+                               (c >= 0xFFF0 && c <= 0x10010) || c >= 0x10FFF0;
+        if (isAllowed)
+            all += utf8(c);
+        if (!isNotable)
+            continue;
+        const auto document = holding(utf8(c));
+        if (isAllowed)
+            expectReadBack(utf8(c), document->XMLData());
+        else
+            EXPECT_THROW(document->XMLData(), qx::Exception) << static_cast<std::uint32_t>(c);
+    }
+    expectReadBack(all, holding(all)->XMLData());
+}
+
+TEST(XMLSerializer, TextsThatAParserWouldChangeAreReadBack) {
+    for (const char* text : {"]]>", "&amp;", "<![CDATA[x]]>", "\r\n", "\n", " \n ", "\t", " a ",
+                             "\n\na", "&#10;", "\"'"}) {
+        const auto document = holding(text);
+        expectReadBack(text, document->XMLData());
+        expectReadBack(text, document->XMLData(qx::XMLPrettyPrint));
+        document->rootElement()->addChild(XMLElement::initWithName("c"));
+        expectReadBack(text, document->XMLData());
+    }
+}
+
+TEST(XMLSerializer, PrettyPrintingTouchesNoText) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"<a/>", "<a></a>\n"},
+        {"<a>x</a>", "<a>x</a>\n"},
+        {"<a><b/><c>x</c></a>", "<a>\n    <b></b>\n    <c>x</c>\n</a>\n"},
+        {"<a><b><c><!--d--></c></b><?e f?></a>",
+         "<a>\n    <b>\n        <c>\n            <!--d-->\n        </c>\n    </b>\n    <?e "
+         "f?>\n</a>\n"},
+        {"<a><b>x<c><d/></c></b></a>", "<a>\n    <b>x<c><d></d></c></b>\n</a>\n"},
+        {"<a> <b/></a>", "<a> <b></b></a>\n"},
+        {"<a><b xml:space='preserve'><c/></b></a>",
+         "<a>\n    <b xml:space=\"preserve\"><c></c></b>\n</a>\n"},
+        {"<a xml:space='preserve'><b xml:space='default'><c/></b></a>",
+         "<a xml:space=\"preserve\"><b xml:space=\"default\">\n        <c></c>\n    </b></a>\n"},
+        {"<?xml version='1.0'?><!--x--><a/>", "<?xml version=\"1.0\"?>\n<!--x-->\n<a></a>\n"},
+    };
+    for (const auto& [text, pretty] : cases) {
+        const auto document = XMLDocument::initWithData(text);
+        EXPECT_EQ(document->XMLData(qx::XMLPrettyPrint), pretty) << text;
+        const auto again = XMLDocument::initWithData(document->XMLData(qx::XMLPrettyPrint));
+        EXPECT_TRUE(again->isSameXML(*document)) << text;
+    }
+}
+
+TEST(XMLSerializer, EmptyElementsMayBeCompact) {
+    const auto document = XMLDocument::initWithData("<a><b c='1'></b>x<d>y</d></a>");
+    EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements), "<a><b c=\"1\"/>x<d>y</d></a>");
+    document->rootElement()->setStringValue("");
+    EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements | qx::XMLPrettyPrint), "<a/>\n");
+}
+
+TEST(XMLSerializer, ANodeAloneIsWrittenByItsKind) {
+    EXPECT_EQ(XMLNode::attributeWithName("a", "<\"\n'")->XMLString(), "a=\"&lt;&quot;&#10;'\"");
+    EXPECT_EQ(XMLNode::namespaceWithName("", "u")->XMLString(), "xmlns=\"u\"");
+    EXPECT_EQ(XMLNode::namespaceWithName("p", "u")->XMLString(), "xmlns:p=\"u\"");
+    EXPECT_EQ(XMLNode::initTextWithStringValue("a>\"")->XMLString(), "a&gt;\"");
+    EXPECT_EQ(XMLNode::initCommentWithStringValue("a-b")->XMLString(), "<!--a-b-->");
+    EXPECT_EQ(XMLNode::initProcessingInstructionWithName("a", "")->XMLString(), "<?a?>");
+}
+
+TEST(XMLSerializer, WhatWouldBeNoXMLIsRefusedByItsPlace) {
+    const auto comment = "a comment holds \"--\" or ends in \"-\" at /order/item[2]/comment()";
+    const std::string instruction =
+        "a processing instruction would not be read back as it is at /order/item[2]/?";
+    const std::pair<Ref<XMLNode>, std::string> cases[] = {
+        {XMLNode::attributeWithName("a b", ""), "a name is no XML name at /order/item[2]/@a b"},
+        {XMLElement::initWithName("1"), "a name is no XML name at /order/item[2]/1"},
+        {XMLElement::initWithName(nullptr), "a name is no XML name at /order/item[2]/"},
+        {XMLNode::namespaceWithName("1", "u"), "a name is no XML name at /order/item[2]/@xmlns:1"},
+        {XMLNode::attributeWithName("c", "\x1F"),
+         "a text holds a control character at /order/item[2]/@c"},
+        {XMLNode::initTextWithStringValue(std::string_view("\0", 1)),
+         "a text holds a control character at /order/item[2]/text()"},
+        {XMLNode::initTextWithStringValue("\xC0\x80"),
+         "a text holds what is no XML character at /order/item[2]/text()"},
+        {XMLNode::initCommentWithStringValue("a--b"), comment},
+        {XMLNode::initCommentWithStringValue("a-"), comment},
+        {XMLNode::initProcessingInstructionWithName("p", "?>"), instruction + "p"},
+        {XMLNode::initProcessingInstructionWithName("XML", ""), instruction + "XML"},
+        {XMLNode::attributeWithName("xmlns:p", "u"),
+         "a namespace is declared twice at /order/item[2]/@xmlns:p"},
+    };
+    for (const auto& [node, reason] : cases) {
+        const auto document =
+            XMLDocument::initWithData("<order><item/><item xmlns:p='u'/></order>");
+        XMLElement& item = *document->rootElement()->lastChild()->asElement();
+        if (node->kind() == qx::XMLNodeKind::attribute)
+            item.addAttribute(node);
+        else if (node->kind() == qx::XMLNodeKind::namespaceDeclaration)
+            item.addNamespace(node);
+        else
+            item.addChild(node);
+        EXPECT_EQ(support::raised([&] { document->XMLString(); }),
+                  "NSInvalidArgumentException: " + reason);
+        EXPECT_TRUE(document->description().view().starts_with("<order><item></item><item"));
+    }
+}
+
+// Rows make <a> with as much in it as may be read, or one more.
+TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
+    const auto x = [](std::size_t size) { return std::string(size, 'x'); };
+    const auto number = [](std::size_t i) { return "n" + std::to_string(i); };
+    const auto nested = [](XMLElement& a, std::size_t depth) {
+        Ref<XMLElement> inner = XMLElement::initWithName("b", "text");
+        for (std::size_t i = 2; i < depth; ++i) {
+            auto outer = XMLElement::initWithName("b");
+            outer->addChild(inner);
+            inner = outer;
+        }
+        a.addChild(inner);
+    };
+    const auto declared = [&](XMLElement& element, std::size_t from, std::size_t to) {
+        for (std::size_t i = from; i < to; ++i)
+            element.addNamespace(XMLNode::namespaceWithName(number(i), "u"));
+    };
+    const qx::XMLParseOptions usual;
+    const qx::XMLParseOptions deep{.maximumDepth = 1000};
+    const qx::XMLParseOptions small{.maximumTextSize = 100};
+    const struct {
+        const char* reason;
+        qx::XMLParseOptions reading;
+        std::function<void(XMLElement& a, std::size_t extra)> fill;
+    } rows[] = {
+        {"elements nest deeper than the limit of 256", usual,
+         [&](XMLElement& a, std::size_t extra) { nested(a, 256 + extra); }},
+        {"elements nest deeper than the limit of 1000", deep,
+         [&](XMLElement& a, std::size_t extra) { nested(a, 1000 + extra); }},
+        {"an element has more attributes than the limit of 4096", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             declared(a, 0, 96);
+             for (std::size_t i = 0; i < 4000 + extra; ++i)
+                 a.addAttribute(number(i), "value");
+         }},
+        {"more namespace declarations are in force than the limit of 1000", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             declared(a, 0, 600);
+             a.addAttribute("xmlns:p", "u");
+             for (int i = 0; i < 3; ++i) { // one beside the other
+                 auto b = XMLElement::initWithName("b");
+                 declared(*b, 600, 999 + extra);
+                 a.addChild(b);
+             }
+         }},
+        {"a text is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             for (const std::size_t size : {60 + extra, std::size_t{0}, std::size_t{40}})
+                 a.addChild(XMLNode::initTextWithStringValue(x(size)));
+             a.addChild(XMLElement::initWithName("b"));
+             a.addChild(XMLNode::initTextWithStringValue(x(100)));
+         }},
+        {"an attribute's value is larger than the limit of 10000000", usual,
+         [&](XMLElement& a, std::size_t extra) { a.addAttribute("b", x(10'000'000 + extra)); }},
+        {"a namespace's URI is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addNamespace(XMLNode::namespaceWithName("", x(100 + extra)));
+         }},
+        {"a comment is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addChild(XMLNode::initCommentWithStringValue(x(100 + extra)));
+         }},
+        {"a processing instruction is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addChild(XMLNode::initProcessingInstructionWithName("p", x(100 + extra)));
+         }},
+        {"a name is larger than the limit of 100", small,
+         [&](XMLElement& a, std::size_t extra) { a.addAttribute(x(100 + extra), ""); }},
+        {"the document has more different names than the limit of 100000", usual,
+         [&](XMLElement& a, std::size_t extra) {
+             a.addNamespace(XMLNode::namespaceWithName("p", "u"));
+             for (std::size_t i = 0; i < 100'000 - 3 + extra; ++i)
+                 a.addChild(XMLElement::initWithName(number(i)));
+             a.addChild(XMLElement::initWithName(number(7)));
+         }},
+    };
+    for (const auto& [reason, reading, fill] : rows)
+        for (const std::size_t extra : {0, 1}) {
+            const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
+            fill(*document->rootElement(), extra);
+            Ref<qx::Error> error;
+            const auto read = XMLDocument::initWithData(
+                document->XMLString(qx::XMLCompactEmptyElements), reading, &error);
+            EXPECT_EQ(read.get() != nullptr, extra == 0)
+                << reason << (error ? error->localizedDescription().str() : "");
+            const std::string outcome = support::raised([&] {
+                static_cast<void>(document->XMLData(qx::XMLPrettyPrint, reading));
+                static_cast<void>(document->XMLString(qx::XMLNoOptions, reading));
+            });
+            const std::string refusal = "NSInvalidArgumentException: "s + reason + " at ";
+            EXPECT_EQ(outcome.substr(0, refusal.size()), extra == 0 ? "nothing" : refusal);
+        }
+}
+
+TEST(XMLSerializer, ADocumentDeclaresWhatIsSet) {
+    const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
+    EXPECT_EQ(document->XMLData(), "<a></a>");
+    document->setCharacterEncoding("utf-8");
+    EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"utf-8\"?><a></a>");
+    document->setVersion("1.0");
+    document->setStandalone("no");
+    EXPECT_EQ(document->XMLData(),
+              "<?xml version=\"1.0\" encoding=\"utf-8\" standalone=\"no\"?><a></a>");
+    document->setVersion("2.0");
+    EXPECT_THROW(document->XMLData(), qx::Exception);
+    document->setVersion("1.0");
+    document->setStandalone("maybe");
+    EXPECT_THROW(document->XMLData(), qx::Exception);
+    EXPECT_THROW(XMLDocument::initWithRootElement(nullptr)->XMLData(), qx::Exception);
+}
+
+TEST(XMLSerializer, EncodingsHoldWhatTheyCanAndReferToTheRest) {
+    const std::string text = "a\xC3\xA9\xE2\x82\xAC\xF0\x9F\x98\x80\n";
+    const auto document = holding(text);
+    for (const char* encoding : {"UTF-8", "UTF-16", "UTF-16LE", "UTF-16BE", "ISO-8859-1",
+                                 "US-ASCII", "windows-1252", "Shift_JIS"}) {
+        document->setCharacterEncoding(encoding);
+        expectReadBack(text, document->XMLData());
+        expectReadBack(text, document->XMLData(qx::XMLPrettyPrint));
+    }
+    document->setCharacterEncoding("ISO-8859-1");
+    document->rootElement()->removeAttributeForName("b");
+    EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"ISO-8859-1\"?>"
+                                   "<a>a\xE9&#8364;&#128512;\n</a>");
+    const auto named = XMLDocument::initWithData("<\xC3\xA9/>");
+    named->setCharacterEncoding("ISO-8859-1");
+    EXPECT_NE(named->XMLData().find("<\xE9>"), std::string::npos);
+    named->setCharacterEncoding("US-ASCII");
+    EXPECT_THROW(named->XMLData(), qx::Exception);
+    for (const char* encoding : {"nope", "UTF-7", "UTF-16//TRANSLIT", "IBM037"}) {
+        document->setCharacterEncoding(encoding);
+        EXPECT_THROW(document->XMLData(), qx::Exception) << encoding;
+    }
+}
+
+} // namespace
