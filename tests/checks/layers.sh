@@ -1,133 +1,91 @@
 #!/usr/bin/env bash
-# The folders of src/ are layers: nothing includes a folder above its own, only the platform sees
-# libxml2, ICU and the operating system, and programs see public headers alone.
+# The folders of src/ are layers (cmake/layers.txt): none includes or befriends what stands above it, only
+# some see libxml2, ICU and the operating system, and programs see public headers alone.
 #
 # usage: layers.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
-
-# What each folder may include beside itself.
-declare -A below=(
-    [platform/object]=''
-    [platform/xml]='platform/object'
-    [platform/system]='platform/object'
-    [mapping]='platform/object platform/xml platform/system'
-    [repository]='platform/object platform/xml platform/system'
-    [record]='platform/object platform/xml platform/system'
-    [resolved]='platform/object platform/xml platform/system mapping repository'
-    [marshaller]='platform/object platform/xml platform/system mapping repository resolved record'
-)
-# Public headers that no .cpp file, or more than one, names as its own. The one over all others stands above the layers.
-declare -A header_only=(
-    [QXXMLMarshalling]='everything'
-    [QXXMLDataRepository]='repository'
-    [QXXMLMutableDataRepository]='repository'
-    [QXXMLNodeType]='mapping'
-    [QXGenericRecord]='record'
-    [QXXMLMarshaller]='marshaller'
-    [platform/Export]='platform/object'
-    [platform/Ref]='platform/object'
-    [platform/WeakRef]='platform/object'
-)
-# Single headers of another room: documents are files, what is wrong with them is told in the user's
-# language, and property lists are documents.
-declare -A lent=(
-    ['platform/xml includes "files/Files.h"']=1
-    ['platform/xml includes "model/Errors.h"']=1
-    ['platform/xml includes "host/Localization.h"']=1
-    ['platform/system includes <QXXMLMarshalling/xml/XMLDocument.h>']=1
-)
 
 libxml='^libxml/'
 icu='^unicode/'
 os='^(sys|arpa|net|netinet|linux|bits)/|^(unistd|dlfcn|fcntl|dirent|pwd|grp|poll|link|pthread|sched|ftw|glob|spawn|termios|syslog|signal|langinfo|strings)\.h$|^(filesystem|fstream)$'
 
-# folder_of_source PATH: the layer of a path below src/, in `folder`.
-folder_of_source() {
-    folder=${1%/*}
-    while [[ -n $folder && -z ${below[$folder]+known} ]]; do
-        [[ $folder == */* ]] || { folder=; break; }
-        folder=${folder%/*}
-    done
-}
-
-# folder_of_header NAME: the layer of <QXXMLMarshalling/NAME.h>, in `folder`: that of the .cpp file of
-# the same name, else of the lowest whose first include it is, else as tabled above.
-declare -A own_folder
-folder_of_header() {
-    folder=${own_folder[$1]:-${header_only[$1]:-}}
-    if [[ -z $folder && $1 == platform/* ]]; then
-        # Templates and plain structs; those of the node tree are named for it.
-        [[ $1 == platform/XML* ]] && folder=platform/xml || folder=platform/object
-    fi
-}
-
-learn_headers() {
-    own_folder=()
-    local path name first folder layer
-    for path in "${sources[@]}"; do
-        [[ $path == src/*.cpp ]] || continue
-        folder_of_source "${path#src/}"
-        name=${path##*/}
-        name=${name%.cpp}
-        for name in "$name" "platform/$name"; do
-            [[ -f include/QXXMLMarshalling/$name.h ]] || continue
-            [[ $name == platform/* && $folder != platform/* ]] || own_folder[$name]=$folder
+# read_layers: `below[folder]`, all that a folder may use, and `listed[header]`, the folder of a header
+# that the table names.
+declare -A below listed
+read_layers() {
+    below=() listed=()
+    local folder uses headers used header
+    while IFS=: read -r folder uses headers; do
+        folder=${folder// /}
+        below[$folder]=" $folder "
+        for used in $uses; do
+            below[$folder]+=${below[$used]}
         done
-    done
-    for layer in platform/object platform/xml platform/system mapping repository record resolved marshaller; do
-        for path in "${sources[@]}"; do
-            [[ $path == src/"$layer"/*.cpp ]] || continue
-            first=${first_include[$path]:-}
-            [[ $first == '<QXXMLMarshalling/'*'.h>' ]] || continue
-            name=${first#<QXXMLMarshalling/}
-            name=${name%.h>}
-            [[ -n ${own_folder[$name]:-} || -n ${header_only[$name]:-} ]] || own_folder[$name]=$layer
+        for header in $headers; do
+            listed[$header]=$folder
         done
-    done
+    done < <(grep -v '^#' cmake/layers.txt)
 }
 
-# violations DIR: prints one line for each include that breaks a rule. Changes the current folder.
-violations() {
+# room_of PATH: the folder of the table that a file belongs to, in `room`; "program" for what stands on
+# the library, "umbrella" for the header over all others, empty for a file without a place.
+declare -A source_room
+room_of() {
+    local name=${1#include/QXXMLMarshalling/}
+    case $1 in
+    src/*) room=${1#src/} && room=${room%%/*} ;;
+    include/QXXMLMarshalling/QXXMLMarshalling.h) room=umbrella ;;
+    include/QXXMLMarshalling/detail/* | include/QXXMLMarshalling/*.h)
+        room=${name%%/*}
+        if [[ $room == "$name" || $room == detail ]]; then
+            name=${name%.h}
+            room=${listed[$name]:-${source_room[${name##*/}]:-}}
+        fi
+        ;;
+    *) room=program ;;
+    esac
+    [[ $room == program || $room == umbrella ]] || [[ -n $room && -n ${below[$room]:-} ]] || room=
+}
+
+# complaints DIR: a line for each include or friend that breaks a rule. Changes the current folder.
+complaints() {
     cd -- "$1"
-    declare -a sources=() lines=()
-    declare -A first_include=()
-    local roots=() root path number line target here folder
+    read_layers
+    local roots=() root path number target name kind room here
     for root in include src tools examples bench fuzz; do
-        [[ -d $root ]] && roots+=("$root")
+        [[ ! -d $root ]] || roots+=("$root")
     done
-    mapfile -t sources < <(find "${roots[@]}" -name '*.cpp' -o -name '*.h' | LC_ALL=C sort)
-    mapfile -t lines < <(grep -HnoE '^[[:space:]]*#[[:space:]]*include[[:space:]]*[<"][^>"]+[>"]' \
-        "${sources[@]}" | sed -E 's/:[[:space:]]*#[[:space:]]*include[[:space:]]*/:/')
-    for line in "${lines[@]}"; do
-        IFS=: read -r path number target <<<"$line"
-        [[ -n ${first_include[$path]:-} ]] || first_include[$path]=$target
-    done
-    learn_headers
+    source_room=()
+    while read -r path; do
+        name=${path##*/}
+        room_of "$path"
+        source_room[${name%.cpp}]=$room
+    done < <(find src -name '*.cpp')
 
-    for line in "${lines[@]}"; do
-        IFS=: read -r path number target <<<"$line"
-        case $path in
-        src/*)
-            folder_of_source "${path#src/}"
-            ;;
-        include/QXXMLMarshalling/*)
-            folder=${path#include/QXXMLMarshalling/}
-            folder_of_header "${folder%.h}"
-            ;;
-        *)
-            folder=program
-            ;;
-        esac
-        here=$folder
+    while IFS=: read -r path number target; do
+        room_of "$path"
+        here=$room
         check_include
-    done
+    done < <(grep -HnorE '^[[:space:]]*#[[:space:]]*include[[:space:]]*[<"][^>"]+[>"]' "${roots[@]}" \
+        --include='*.h' --include='*.cpp' | sed -E 's/:[[:space:]]*#[[:space:]]*include[[:space:]]*/:/' | LC_ALL=C sort)
+
+    declare -A defined=()
+    while IFS=: read -r path name; do
+        name=${name##* }
+        defined[$name]+="$path "
+    done < <(grep -HorE '^(class|struct)( QX_API)? [A-Za-z_]+(::[A-Za-z_]+)*[^;]*$' include src --include='*.h' --include='*.cpp' |
+        sed -E 's/:(class|struct)( QX_API)? ([A-Za-z_:]+).*/:\3/')
+    while IFS=: read -r path number kind name; do
+        check_friend
+    done < <(grep -HnorE '^[[:space:]]*friend (class|struct) [A-Za-z_]+' include src --include='*.h' |
+        sed -E 's/[[:space:]]*friend (class|struct) /\1:/' | LC_ALL=C sort)
 }
 
-# One include: `target` in line `number` of `path`, which belongs to the folder `here`.
+# One include: `target` in line `number` of `path`, which belongs to `here`.
 check_include() {
     local name=${target:1:-1} where="$path:$number"
     if [[ -z $here ]]; then
-        echo "$where: belongs to no folder: enter it in layers.sh"
+        echo "$where: belongs to no folder: enter it in cmake/layers.txt"
     elif [[ $target == \"* ]]; then
         if [[ $path == include/* ]]; then
             echo "$where: a public header includes $target"
@@ -136,59 +94,69 @@ check_include() {
         elif [[ ! -f src/$name ]]; then
             echo "$where: $target is not named from src/"
         else
-            folder_of_source "$name"
-            may_include
+            room_of "src/$name"
+            may_use "$target"
         fi
     elif [[ $name == QXXMLMarshalling/* ]]; then
-        [[ $here != program && $here != everything ]] || return 0
-        name=${name#QXXMLMarshalling/}
-        folder_of_header "${name%.h}"
-        may_include
+        room_of "include/$name"
+        [[ $here == program || $here == umbrella ]] || may_use "$target"
     elif [[ $name =~ $libxml ]]; then
-        [[ $path == src/platform/xml/* || $path == bench/* ]] || echo "$where: libxml2 outside platform/xml"
+        [[ $path == src/xml/* || $path == bench/* ]] || echo "$where: libxml2 outside xml"
     elif [[ $name =~ $icu ]]; then
-        [[ $path == src/platform/object/* ]] || echo "$where: ICU outside platform/object"
+        [[ $path == src/base/* ]] || echo "$where: ICU outside base"
     elif [[ $name =~ $os && $here != program ]]; then
-        [[ $path == src/platform/* || $path == include/QXXMLMarshalling/platform/* ]] ||
-            echo "$where: the operating system ($target) outside platform"
+        [[ " base files host " == *" $here "* ]] || echo "$where: the operating system ($target) in $here"
     fi
 }
 
-may_include() {
-    [[ $folder == "$here" || " ${below[$here]} " == *" $folder "* || -n ${lent["$here includes $target"]:-} ]] ||
-        echo "$where: $here includes $target of ${folder:-no folder}"
+# One friend: `name` in line `number` of `path`. A name that several folders define may be any of them.
+check_friend() {
+    local where="$path:$number" here definition
+    room_of "$path"
+    here=$room
+    for definition in ${defined[$name]:-}; do
+        room_of "$definition"
+        [[ ${below[$here]:-} != *" $room "* ]] || return 0
+    done
+    [[ -z ${defined[$name]:-} ]] || echo "$where: $here befriends $name of $room"
+}
+
+may_use() {
+    [[ ${below[$here]} == *" $room "* ]] || echo "$where: $here includes $1 of ${room:-no folder}"
 }
 
 # The check has to be able to fail: a small tree with one fault of each kind.
 self_test() {
     local tree=$1 expected actual
-    mkdir -p "$tree"/{src/platform/{object,xml},src/{mapping,record,marshaller},include/QXXMLMarshalling/platform,tools/t}
+    mkdir -p "$tree"/{cmake,src/{base,xml,mapping,record,marshaller},include/QXXMLMarshalling/{base,detail},tools/t}
     put() { printf '%s\n' "${@:2}" >"$tree/$1"; }
-    put include/QXXMLMarshalling/base/Export.h '#pragma once'
-    put include/QXXMLMarshalling/model/Value.h '#include <QXXMLMarshalling/QXRecord.h>'
-    put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/model/Value.h>' '#include "record/Table.h"'
-    put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/base/Export.h>' '#include <sys/stat.h>'
-    put include/QXXMLMarshalling/QXNowhere.h '#include <string>'
-    put src/model/Value.cpp '#include <QXXMLMarshalling/model/Value.h>' '#include <unistd.h>' '#  include <libxml/tree.h>'
-    put src/platform/object/Key.h '#pragma once'
-    put src/platform/xml/Node.cpp '#include "platform/object/Key.h"' '#include <libxml/tree.h>' '#include <unicode/uchar.h>'
-    put src/mapping/read.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include "record/Table.h"' '#include "Key.h"'
-    put src/record/QXRecord.cpp '#include <QXXMLMarshalling/QXRecord.h>' '#include <QXXMLMarshalling/QXMapping.h>' '#include <fstream>'
-    put src/record/Table.h '#pragma once'
-    put src/marshaller/way.cpp '#include "record/Table.h"' '#include <QXXMLMarshalling/QXMapping.h>'
+    put cmake/layers.txt '# folders' 'base : : detail/Count' 'xml : base :' 'mapping : xml :' 'record : base :' \
+        'marshaller : mapping record :'
+    put include/QXXMLMarshalling/detail/Count.h '#pragma once' '#include <sys/stat.h>'
+    put include/QXXMLMarshalling/detail/Lost.h '#include <string>'
+    put include/QXXMLMarshalling/base/Value.h '#include <QXXMLMarshalling/QXRecord.h>' '    friend class Way;'
+    put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/base/Value.h>' '#include "record/Table.h"'
+    put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/detail/Count.h>' '#include <sys/stat.h>'
+    put src/base/Value.cpp '#include <unistd.h>' '#  include <libxml/tree.h>'
+    put src/xml/Node.cpp '#include <QXXMLMarshalling/base/Value.h>' '#include <libxml/tree.h>' '#include <unicode/uchar.h>'
+    put src/mapping/QXMapping.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include "record/Table.h"' '#include "Key.h"'
+    put src/record/QXRecord.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include <fstream>'
+    put src/record/Table.h 'class Table {' '    friend class Table;' '    friend class Unknown;'
+    put src/marshaller/way.cpp '#include "record/Table.h"' 'class Way {' '#include <QXXMLMarshalling/QXMapping.h>'
     put tools/t/main.cpp '#include <QXXMLMarshalling/QXRecord.h>' '#include "record/Table.h"' '#include <fstream>'
-    expected='include/QXXMLMarshalling/QXMapping.h:2: the operating system (<sys/stat.h>) outside platform
-include/QXXMLMarshalling/QXNowhere.h:1: belongs to no folder: enter it in layers.sh
+    expected='include/QXXMLMarshalling/QXMapping.h:2: the operating system (<sys/stat.h>) in mapping
 include/QXXMLMarshalling/QXRecord.h:2: a public header includes "record/Table.h"
-include/QXXMLMarshalling/model/Value.h:1: platform/object includes <QXXMLMarshalling/QXRecord.h> of record
-src/mapping/read.cpp:2: mapping includes "record/Table.h" of record
-src/mapping/read.cpp:3: "Key.h" is not named from src/
-src/model/Value.cpp:3: libxml2 outside platform/xml
-src/platform/xml/Node.cpp:3: ICU outside platform/object
-src/record/QXRecord.cpp:2: record includes <QXXMLMarshalling/QXMapping.h> of mapping
-src/record/QXRecord.cpp:3: the operating system (<fstream>) outside platform
+include/QXXMLMarshalling/base/Value.h:1: base includes <QXXMLMarshalling/QXRecord.h> of record
+include/QXXMLMarshalling/base/Value.h:2: base befriends Way of marshaller
+include/QXXMLMarshalling/detail/Lost.h:1: belongs to no folder: enter it in cmake/layers.txt
+src/base/Value.cpp:2: libxml2 outside xml
+src/mapping/QXMapping.cpp:2: mapping includes "record/Table.h" of record
+src/mapping/QXMapping.cpp:3: "Key.h" is not named from src/
+src/record/QXRecord.cpp:1: record includes <QXXMLMarshalling/QXMapping.h> of mapping
+src/record/QXRecord.cpp:2: the operating system (<fstream>) in record
+src/xml/Node.cpp:3: ICU outside base
 tools/t/main.cpp:2: a program includes the private header "record/Table.h"'
-    actual=$(violations "$tree")
+    actual=$(complaints "$tree" | LC_ALL=C sort)
     if [[ $actual != "$expected" ]]; then
         echo "layers.sh does not find what it has to find:" >&2
         diff <(echo "$expected") <(echo "$actual") >&2 || true
@@ -200,7 +168,7 @@ scratch=$(mktemp -d)
 trap 'rm -rf -- "$scratch"' EXIT
 self_test "$scratch"
 
-found=$(violations "$2")
+found=$(complaints "$2")
 if [[ -n $found ]]; then
     echo "$found"
     exit 1
