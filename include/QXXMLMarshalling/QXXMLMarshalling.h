@@ -32,6 +32,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/CountedSet.h>
 #include <QXXMLMarshalling/model/Data.h>
+#include <QXXMLMarshalling/model/DateTime.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 #include <QXXMLMarshalling/model/Error.h>
 #include <QXXMLMarshalling/model/Format.h>

@@ -36,15 +36,17 @@ std::optional<double> scanReal(std::string_view text) noexcept {
 }
 
 String describeReal(double value) {
+    if (std::isnan(value))
+        return "NaN";
+    if (std::isinf(value))
+        return value < 0 ? "-INF" : "INF";
     constexpr double smallest = 1e-5;
     constexpr double beyond = 1e17;
     const double magnitude = std::fabs(value);
     const bool plain = value == 0 || (magnitude >= smallest && magnitude < beyond);
     std::array<char, 64> text;
     const auto format = plain ? std::chars_format::fixed : std::chars_format::scientific;
-    const auto end = std::isfinite(value)
-                         ? std::to_chars(text.data(), text.data() + text.size(), value, format)
-                         : std::to_chars(text.data(), text.data() + text.size(), value);
+    const auto end = std::to_chars(text.data(), text.data() + text.size(), value, format);
     return std::string_view(text.data(), static_cast<std::size_t>(end.ptr - text.data()));
 }
 

@@ -17,7 +17,8 @@ QX_API std::optional<std::int64_t> scanInteger(std::string_view text) noexcept;
 // The number at the start, likewise.
 std::optional<double> scanReal(std::string_view text) noexcept;
 
-// The shortest text that reads back equal, without an exponent from 1e-5 to below 1e17.
+// The shortest text that reads back equal, without an exponent from 1e-5 to below 1e17; NaN, INF
+// and -INF as XML Schema writes them.
 String describeReal(double value);
 
 } // namespace qx

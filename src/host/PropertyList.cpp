@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Data.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
+#include "base/Base64.h"
 #include "files/Files.h"
 #include "host/Log.h"
 
@@ -43,26 +44,6 @@ Ref<Array> arrayOf(const XMLElement& element) {
     return array;
 }
 
-Ref<Data> dataOf(std::string_view text) {
-    constexpr std::string_view alphabet =
-        "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
-    std::string bytes;
-    std::uint32_t bits = 0;
-    int count = 0;
-    for (const char c : text) {
-        const std::size_t digit = alphabet.find(c);
-        if (digit == std::string_view::npos)
-            continue; // layout and padding
-        bits = bits << 6U | static_cast<std::uint32_t>(digit);
-        count += 6;
-        if (count >= 8) {
-            count -= 8;
-            bytes += static_cast<char>(bits >> static_cast<unsigned>(count) & 0xFFU);
-        }
-    }
-    return make<Data>(std::move(bytes));
-}
-
 Value valueOf(const XMLElement& element) {
     const String& kind = element.name();
     if (kind == "dict")
@@ -80,8 +61,10 @@ Value valueOf(const XMLElement& element) {
         return Value(text).intValue();
     if (kind == "real")
         return Value(text).doubleValue();
-    if (kind == "data")
-        return dataOf(text);
+    if (kind == "data") {
+        auto bytes = decodeBase64(text);
+        return bytes ? make<Data>(std::move(*bytes)) : nullptr;
+    }
     return kind == "string" || kind == "date" ? Value(text) : Value();
 }
 

@@ -1,5 +1,7 @@
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
+#include "base/Base64.h"
+
 #include <charconv>
 #include <cmath>
 
@@ -79,9 +81,21 @@ bool readUnsigned(const Value& value, std::uint64_t& result) {
     return true;
 }
 
+// XML Schema's words for what is no finite number; std::from_chars has others.
 bool readReal(const Value& value, double& result) {
-    if (value.isString())
-        return readWhole(value.string(), result);
+    if (value.isString()) {
+        const String held = value.string();
+        const std::string_view text = trimmed(held);
+        double read = 0;
+        if (text == "NaN")
+            read = std::numeric_limits<double>::quiet_NaN();
+        else if (text == "INF" || text == "-INF")
+            read = text.front() == '-' ? -HUGE_VAL : HUGE_VAL;
+        else if (!readWhole(text, read) || !std::isfinite(read))
+            return false;
+        result = read;
+        return true;
+    }
     if (!value.isNumber())
         return false;
     result = value.doubleValue();
@@ -93,6 +107,21 @@ bool readText(const Value& value, String& result) {
         return false;
     result = value.description();
     return true;
+}
+
+bool readBytes(const Value& value, std::vector<std::byte>& result) {
+    if (!value.isString())
+        return false;
+    const auto bytes = decodeBase64(value.string());
+    if (!bytes)
+        return false;
+    const auto* first = reinterpret_cast<const std::byte*>(bytes->data());
+    result.assign(first, first + bytes->size());
+    return true;
+}
+
+String textOfBytes(const std::vector<std::byte>& bytes) {
+    return encodeBase64({reinterpret_cast<const char*>(bytes.data()), bytes.size()});
 }
 
 } // namespace qx

@@ -18,6 +18,18 @@ using namespace qx;
 using support::oneLine;
 using support::raised;
 
+enum class Fix { none, flat = 4 };
+
+} // namespace
+
+template <>
+struct qx::EnumNames<Fix> {
+    static constexpr auto table =
+        std::to_array<qx::EnumName<Fix>>({{Fix::none, "none"}, {Fix::flat, "2d"}});
+};
+
+namespace {
+
 class Holder : public Object {
 public:
     bool flag = false;
@@ -28,6 +40,11 @@ public:
     std::optional<int> perhaps;
     Ref<Holder> next;
     std::vector<int> numbers;
+    char letter = 'x';
+    Fix fix = Fix::none;
+    std::set<std::string> names;
+    std::array<int, 2> pair{};
+    std::vector<std::byte> bytes;
 };
 
 const bool described = [] {
@@ -40,7 +57,12 @@ const bool described = [] {
         .property<&Holder::text>("text")
         .property<&Holder::perhaps>("perhaps")
         .property<&Holder::next>("next")
-        .property<&Holder::numbers>("numbers");
+        .property<&Holder::numbers>("numbers")
+        .property<&Holder::letter>("letter")
+        .property<&Holder::fix>("fix")
+        .property<&Holder::names>("names")
+        .property<&Holder::pair>("pair")
+        .property<&Holder::bytes>("bytes");
     return true;
 }();
 
@@ -59,11 +81,20 @@ TEST(ValueTest, APropertyTakesWhatLosesNothing) {
         {"large",
          {{1e19, "10000000000000000000"}, {most, most}},
          {"18446744073709551616", -1, -1.0, object}},
-        {"real", {{"2.5", "2.5"}, {7, "7"}}, {"x", object}},
+        {"real",
+         {{"2.5", "2.5"}, {7, "7"}, {" -INF", "-INF"}, {"NaN", "NaN"}},
+         {"x", "inf", "nan", "+INF", object}},
         {"text", {{12, "12"}}, {nullptr, object}},
         {"perhaps", {{"12", "12"}, {nullptr, "(null)"}}, {"x"}},
         {"next", {{nullptr, "(null)"}}, {"text", array({})}},
         {"numbers", {{array({1, "2"}), "( 1, 2 )"}}, {array({1, "b"}), "1"}},
+        {"letter", {{"y", "y"}, {"", ""}, {7, "7"}}, {"yz", nullptr, "\u00E9"}},
+        {"fix", {{"2d", "2d"}, {0, "none"}, {4, "2d"}}, {"2D", "4", 1, nullptr}},
+        {"names", {{array({"b", "a", "b"}), "( a, b )"}}, {array({nullptr}), "a"}},
+        {"pair", {{array({1, 2}), "( 1, 2 )"}}, {array({1}), array({1, 2, 3})}},
+        {"bytes",
+         {{"", ""}, {" aGk=\n", "aGk="}, {"aGkh", "aGkh"}, {"/+8=", "/+8="}},
+         {"aGk", "aGk=a", "aG=k", "aGl=", "a", "====", "a-kh", 1}},
     };
     for (const auto& [key, taken, refused] : cases) {
         const auto holder = make<Holder>();

@@ -10,25 +10,35 @@
 //
 // What the types here take, beside their own kind (anything else is refused):
 //   bool                numbers; the texts true, yes, 1, false, no and 0 in any case
-//   integers            numbers with an integral value in range; a text that is such a number
-//   floating point      numbers; a text that is a number
+//   char                a text of one byte, or none for the zero character
+//   other integers      numbers with an integral value in range; a text that is such a number
+//   floating point      numbers; a text that is a number, NaN, INF or -INF
 //   std::string         text; numbers as their text
 //   qx::String          the same, and null
 //   qx::Key             text
-//   enums               as their underlying integer
+//   std::vector<std::byte>   base64 text
+//   enums               as their underlying integer; with EnumNames (below) by name
 //   std::optional<T>    null for none, else as T
 //   Ref<T>, T*          null and objects of class T; a T* is not kept alive
-//   std::vector<T>      arrays whose items T takes; null is refused
+//   std::vector<T>, std::set<T>, std::unordered_set<T>
+//                       arrays whose items T takes; null is refused
+//   std::array<T, N>    arrays of N such items
 //   Value               everything
+//
+// Dates, times and durations: DateTime.h.
 
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Value.h>
 
+#include <array>
 #include <concepts>
+#include <cstddef>
 #include <limits>
 #include <optional>
+#include <set>
 #include <string>
 #include <type_traits>
+#include <unordered_set>
 #include <vector>
 
 namespace qx {
@@ -36,12 +46,39 @@ namespace qx {
 template <class T>
 struct ValueTraits;
 
+// The names of an enumeration's values, for those that documents hold by name. Specialise it:
+//
+//     template <> struct qx::EnumNames<Fix> {
+//         static constexpr auto table = std::to_array<qx::EnumName<Fix>>({{Fix::none, "none"},
+//         {Fix::d2, "2d"}});
+//     };
+//
+// Texts are compared exactly, the first of several names of one value is the one that is written;
+// text that is no name, and numbers of no named value, are refused. A value without a name is
+// written as its number.
+template <class E>
+struct EnumName {
+    E value;
+    std::string_view name;
+};
+template <class E>
+struct EnumNames;
+
+template <class T>
+concept Enumeration = std::is_enum_v<T>;
+template <class T>
+concept NamedEnumeration = Enumeration<T> && requires {
+    EnumNames<T>::table;
+};
+
 // Strict readings of a value, false where it is none: no blanks are skipped but around a number.
 QX_API bool readBoolean(const Value& value, bool& result);
 QX_API bool readInteger(const Value& value, std::int64_t& result);
 QX_API bool readUnsigned(const Value& value, std::uint64_t& result);
 QX_API bool readReal(const Value& value, double& result);
 QX_API bool readText(const Value& value, String& result);
+QX_API bool readBytes(const Value& value, std::vector<std::byte>& result);
+QX_API String textOfBytes(const std::vector<std::byte>& bytes);
 
 template <>
 struct ValueTraits<Value> {
@@ -56,6 +93,18 @@ template <>
 struct ValueTraits<bool> {
     static Value toValue(bool value) { return value; }
     static bool fromValue(const Value& value, bool& result) { return readBoolean(value, result); }
+};
+
+template <>
+struct ValueTraits<char> {
+    static Value toValue(char value) { return std::string_view(&value, value != '\0' ? 1 : 0); }
+    static bool fromValue(const Value& value, char& result) {
+        String read;
+        if (!readText(value, read) || read.size() > 1)
+            return false;
+        result = *read.c_str();
+        return true;
+    }
 };
 
 template <std::signed_integral T>
@@ -99,8 +148,7 @@ struct ValueTraits<T> {
     }
 };
 
-template <class T>
-requires std::is_enum_v<T>
+template <Enumeration T>
 struct ValueTraits<T> {
     using Underlying = std::underlying_type_t<T>;
     static Value toValue(T value) {
@@ -112,6 +160,31 @@ struct ValueTraits<T> {
             return false;
         result = static_cast<T>(read);
         return true;
+    }
+};
+
+template <NamedEnumeration T>
+struct ValueTraits<T> {
+    using Underlying = std::underlying_type_t<T>;
+    static Value toValue(T value) {
+        for (const EnumName<T>& known : EnumNames<T>::table)
+            if (known.value == value)
+                return known.name;
+        return ValueTraits<Underlying>::toValue(static_cast<Underlying>(value));
+    }
+    static bool fromValue(const Value& value, T& result) {
+        for (const EnumName<T>& known : EnumNames<T>::table) {
+            if (value.isString() ? value.string() == known.name : value == toNumber(known.value)) {
+                result = known.value;
+                return true;
+            }
+        }
+        return false;
+    }
+
+private:
+    static Value toNumber(T value) {
+        return ValueTraits<Underlying>::toValue(static_cast<Underlying>(value));
     }
 };
 
@@ -202,29 +275,87 @@ struct ValueTraits<std::optional<T>> {
     }
 };
 
+namespace detail {
+
+template <class Container>
+Value arrayOf(const Container& values) {
+    auto array = make<Array>();
+    array->reserve(values.size());
+    for (const auto& value : values)
+        array->add(ValueTraits<typename Container::value_type>::toValue(value));
+    return array;
+}
+
+// Hands each item to `take`; false where one is refused.
+template <class T, class Take>
+bool readItems(const Array& array, Take take) {
+    for (const Value& item : array) {
+        T element{};
+        if (!ValueTraits<T>::fromValue(item, element))
+            return false;
+        take(std::move(element));
+    }
+    return true;
+}
+
+template <class Set>
+struct SetTraits {
+    static Value toValue(const Set& values) { return arrayOf(values); }
+    static bool fromValue(const Value& value, Set& result) {
+        const auto array = value.as<Array>();
+        Set read;
+        if (!array || !readItems<typename Set::value_type>(
+                          *array, [&](auto&& element) { read.insert(std::move(element)); }))
+            return false;
+        result = std::move(read);
+        return true;
+    }
+};
+
+} // namespace detail
+
 template <class T>
 struct ValueTraits<std::vector<T>> {
-    static Value toValue(const std::vector<T>& values) {
-        auto array = make<Array>();
-        array->reserve(values.size());
-        for (const auto& value : values)
-            array->add(ValueTraits<T>::toValue(value));
-        return array;
-    }
+    static Value toValue(const std::vector<T>& values) { return detail::arrayOf(values); }
     static bool fromValue(const Value& value, std::vector<T>& result) {
         const auto array = value.as<Array>();
         if (!array)
             return false;
         std::vector<T> read;
         read.reserve(array->count());
-        for (const Value& item : *array) {
-            T element{};
-            if (!ValueTraits<T>::fromValue(item, element))
-                return false;
-            read.push_back(std::move(element));
-        }
+        if (!detail::readItems<T>(*array, [&](T&& element) { read.push_back(std::move(element)); }))
+            return false;
         result = std::move(read);
         return true;
+    }
+};
+
+template <class T, std::size_t N>
+struct ValueTraits<std::array<T, N>> {
+    static Value toValue(const std::array<T, N>& values) { return detail::arrayOf(values); }
+    static bool fromValue(const Value& value, std::array<T, N>& result) {
+        const auto array = value.as<Array>();
+        std::array<T, N> read{};
+        std::size_t count = 0;
+        if (!array || array->count() != N ||
+            !detail::readItems<T>(*array, [&](T&& element) { read[count++] = std::move(element); }))
+            return false;
+        result = std::move(read);
+        return true;
+    }
+};
+
+template <class T, class Less>
+struct ValueTraits<std::set<T, Less>> : detail::SetTraits<std::set<T, Less>> {};
+template <class T, class Hash, class Equal>
+struct ValueTraits<std::unordered_set<T, Hash, Equal>>
+    : detail::SetTraits<std::unordered_set<T, Hash, Equal>> {};
+
+template <>
+struct ValueTraits<std::vector<std::byte>> {
+    static Value toValue(const std::vector<std::byte>& bytes) { return textOfBytes(bytes); }
+    static bool fromValue(const Value& value, std::vector<std::byte>& result) {
+        return readBytes(value, result);
     }
 };
 
