@@ -64,6 +64,24 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept 
     return c;
 }
 
+void appendCharacter(char32_t c, std::string& text) {
+    const auto add = [&](char32_t byte) { text += static_cast<char>(byte); };
+    if (c < 0x80)
+        return add(c);
+    if (c < 0x800) {
+        add(0xC0U | c >> 6U);
+    } else {
+        if (c < 0x10000) {
+            add(0xE0U | c >> 12U);
+        } else {
+            add(0xF0U | c >> 18U);
+            add(0x80U | (c >> 12U & 0x3FU));
+        }
+        add(0x80U | (c >> 6U & 0x3FU));
+    }
+    add(0x80U | (c & 0x3FU));
+}
+
 bool isXMLCharacter(char32_t c) noexcept {
     if (c < 0x20)
         return c == '\t' || c == '\n' || c == '\r';

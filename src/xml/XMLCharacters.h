@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <cstring>
+#include <string>
 #include <string_view>
 
 namespace qx {
@@ -14,6 +15,9 @@ constexpr char32_t malformedCharacter = 0xFFFFFFFF;
 // The code point at `position`, which moves behind it (by one byte for malformed ones). The
 // position must lie inside the text.
 char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
+
+// Adds the code point in UTF-8.
+void appendCharacter(char32_t c, std::string& text);
 
 // Space, tab, line feed and carriage return.
 constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }

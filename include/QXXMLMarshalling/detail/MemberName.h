@@ -1,0 +1,24 @@
+#pragma once
+
+// The name of a member as the source has it. No standard way leads to it, but GCC and Clang spell a
+// template's arguments out in the name of the function that is being compiled:
+//
+//     GCC     constexpr std::string_view qx::detail::memberName() [with auto Member = &Point::lat; …]
+//     Clang   std::string_view qx::detail::memberName() [Member = &Point::lat]
+
+#include <string_view>
+
+namespace qx::detail {
+
+template <auto Member>
+constexpr std::string_view memberName() noexcept {
+    constexpr std::string_view argument = "Member = ";
+    std::string_view name = __PRETTY_FUNCTION__;
+    name.remove_prefix(name.find(argument) + argument.size());
+    // The type of a member may be spelt out before it, and other arguments behind it.
+    name = name.substr(0, name.find_first_of(";]"));
+    name = name.substr(0, name.find_last_not_of(") ") + 1);
+    return name.substr(name.find_last_of(": &") + 1);
+}
+
+} // namespace qx::detail

@@ -1,0 +1,83 @@
+#pragma once
+
+// A document as its UTF-8 text and a flat array over it: one entry for each element, attribute,
+// namespace declaration, text, comment and processing instruction, in the order in which they
+// begin. The attributes and declarations of an element follow it, then what it contains:
+//
+//     <a x="1">hi<b/></a>           kind       begin  end  next
+//     0         1                   element a      0   19     4
+//     0123456789012345678           attribute x    6    7     2
+//                                   text           9   11     3
+//                                   element b     11   15     4
+//
+//     element                  begin: its "<"             end: behind its last ">"
+//     attribute, declaration   begin, end: its value between the quotes
+//     text                     begin, end: with the references and CDATA marks in it
+//     comment, instruction     begin: its "<"             end: behind its ">"
+//
+// `next` is the entry after everything inside; that of an element's last descendant is the
+// element's own. An entry holds no value: most are the span's bytes as they stand, the rest is
+// worked out when somebody asks. The index lends its text and never changes once it stands.
+
+#include <QXXMLMarshalling/base/String.h>
+#include <QXXMLMarshalling/xml/XMLNode.h>
+
+#include <span>
+#include <vector>
+
+namespace qx {
+
+struct XMLIndexEntry {
+    std::uint32_t begin;
+    std::uint32_t end;
+    std::uint32_t next;
+    std::uint32_t name : 20; // see XMLIndex::name; of texts and comments nothing
+    std::uint32_t kind : 4;  // an XMLNodeKind
+    // The value is not the span as it stands: references, line ends to be normalised, CDATA.
+    std::uint32_t needsWork : 1;
+    // A text of white space with a line break, and nothing but the document's own characters.
+    std::uint32_t isBlank : 1;
+
+    XMLNodeKind nodeKind() const noexcept { return static_cast<XMLNodeKind>(kind); }
+    bool isAttributeOrNamespace() const noexcept {
+        return nodeKind() == XMLNodeKind::attribute ||
+               nodeKind() == XMLNodeKind::namespaceDeclaration;
+    }
+};
+static_assert(sizeof(XMLIndexEntry) == 16);
+
+class XMLIndex {
+public:
+    using Number = std::uint32_t; // of an entry
+    static constexpr std::size_t maximumNames = 100'000;
+
+    explicit XMLIndex(std::string_view text) noexcept : _text(text) {}
+
+    std::string_view text() const noexcept { return _text; }
+    std::span<const XMLIndexEntry> entries() const noexcept { return _entries; }
+    const XMLIndexEntry& operator[](Number number) const noexcept { return _entries[number]; }
+
+    // Whether the text begins with an XML declaration, and what that says of "standalone": "yes",
+    // "no" or nothing.
+    bool hasDeclaration() const noexcept { return _hasDeclaration; }
+    std::string_view standalone() const noexcept { return _standalone; }
+
+    // The qualified name of an element or attribute, the target of an instruction, the prefix of a
+    // declaration.
+    const String& name(const XMLIndexEntry& entry) const noexcept { return _names[entry.name]; }
+    // The span of a text, attribute or declaration; the inside of a comment; an instruction's data.
+    std::string_view span(const XMLIndexEntry& entry) const noexcept;
+    // The value: the span, or, where that needs work, `room` filled with what it stands for.
+    std::string_view value(const XMLIndexEntry& entry, std::string& room) const;
+
+private:
+    friend class XMLScanner;
+
+    std::string_view _text;
+    std::vector<XMLIndexEntry> _entries;
+    std::vector<String> _names;
+    bool _hasDeclaration = false;
+    std::string_view _standalone;
+};
+
+} // namespace qx
