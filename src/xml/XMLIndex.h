@@ -49,7 +49,6 @@ static_assert(sizeof(XMLIndexEntry) == 16);
 class XMLIndex {
 public:
     using Number = std::uint32_t; // of an entry
-    static constexpr std::size_t maximumNames = 100'000;
 
     explicit XMLIndex(std::string_view text) noexcept : _text(text) {}
 

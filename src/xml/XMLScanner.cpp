@@ -1,6 +1,7 @@
 #include "xml/XMLScanner.h"
 
 #include "xml/XMLCharacters.h"
+#include "xml/XMLLimits.h"
 
 #include <QXXMLMarshalling/base/Key.h>
 
@@ -61,11 +62,9 @@ void skip(const char*& at, std::uint8_t kind) noexcept {
 constexpr std::string_view xmlNamespace = "http://www.w3.org/XML/1998/namespace";
 constexpr std::string_view xmlnsNamespace = "http://www.w3.org/2000/xmlns/";
 
-// The C parser has limits of its own near these; it decides there.
+// The C parser has had limits of its own near these; it decides there.
 constexpr std::size_t longestName = 10'000;
 constexpr std::size_t largestPiece = 10'000'000;
-constexpr std::size_t mostAttributes = 4096;
-constexpr std::size_t mostNamespaces = 1000;
 
 } // namespace
 
@@ -217,7 +216,7 @@ void XMLScanner::scanElementStart() {
 
 void XMLScanner::scanAttributes() {
     for (std::size_t count = 0; skipWhite() && is(*_at, nameByte); ++count) {
-        require(count < mostAttributes);
+        require(count < xmlLimits::attributes);
         scanAttribute();
     }
 }
@@ -263,7 +262,8 @@ void XMLScanner::scanAttribute() {
 void XMLScanner::takeDeclaration(XMLIndexEntry& entry, const Name& name) {
     const std::string_view URI = _text.substr(entry.begin, entry.end - entry.begin);
     require(!_needsWork && URI != xmlNamespace && URI != xmlnsNamespace);
-    require(++_open.back().namespaces <= mostNamespaces);
+    require(++_open.back().namespaces <= xmlLimits::namespaces);
+    require(++_declarations + _names.size() <= xmlLimits::names);
     entry.kind = static_cast<std::uint32_t>(XMLNodeKind::namespaceDeclaration) & 0xFU;
     if (name.meaning == Meaning::prefixNamespace) {
         require(!URI.empty());
@@ -483,7 +483,8 @@ XMLScanner::Number XMLScanner::numberOf(const char* begin, std::size_t size) {
 // A new name: looked at in full, and taken apart at its colon.
 XMLScanner::Number XMLScanner::addName(const char* begin, std::size_t size, std::uint32_t hash) {
     const std::string_view text(begin, size);
-    require(size <= std::min(longestName, _maximumSize) && _names.size() < XMLIndex::maximumNames);
+    require(size <= std::min(longestName, _maximumSize) &&
+            _declarations + _names.size() < xmlLimits::names);
     Name name{offset(begin), static_cast<std::uint32_t>(size), hash};
     if (begin != _end) {
         require(isXMLName(text));

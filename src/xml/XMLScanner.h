@@ -99,8 +99,9 @@ private:
     std::vector<Name> _names;
     std::vector<Number> _slots; // an open-addressing table of names: their numbers plus one
     const std::uint32_t _seed;
-    std::uint32_t _element = 0; // counts the start tags
-    bool _needsWork = false;    // of the value that is being scanned
+    std::uint32_t _element = 0;    // counts the start tags
+    std::size_t _declarations = 0; // of namespaces, in all
+    bool _needsWork = false;       // of the value that is being scanned
 };
 
 } // namespace qx
