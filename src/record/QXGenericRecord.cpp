@@ -8,6 +8,8 @@
 
 #include "model/NameList.h"
 
+#include <typeinfo>
+
 using qx::Dictionary;
 using qx::Key;
 using qx::Object;
@@ -92,8 +94,10 @@ const qx::Class& QXGenericRecord::describedClass() const { return classObject();
 
 Ref<QXGenericRecord> QXGenericRecord::copyWithZone() const {
     const auto copy = isa().create().as<QXGenericRecord>();
-    const QXGenericRecord& self = *this;
-    if (!copy || typeid(*copy) != typeid(self))
+    const auto typeOf = [](const Object& object) -> const std::type_info& {
+        return typeid(object);
+    };
+    if (!copy || typeOf(*copy) != typeOf(*this))
         throw qx::Exception(
             qx::Exception::internalInconsistency,
             String::concat({"a record of class ", isa().name(),
