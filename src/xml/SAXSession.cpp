@@ -5,6 +5,7 @@
 #include "xml/XMLLimits.h"
 
 #include <algorithm>
+#include <climits>
 #include <cstring>
 #include <libxml/SAX2.h>
 #include <libxml/parserInternals.h>
@@ -27,7 +28,7 @@ ParseFailure failureOf(const xmlError& error, std::size_t offset) {
 }
 
 // Older parsers without memory for the URI of a namespace say that it is empty.
-bool hidesMemory(const xmlError& error) {
+bool hidesMemory([[maybe_unused]] const xmlError& error) {
 #if LIBXML_VERSION < 21200
     if (error.code != XML_NS_ERR_XML_NAMESPACE || error.str1 == nullptr || error.ctxt == nullptr)
         return false;
@@ -210,6 +211,9 @@ SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLPa
     pushInput();
     xmlCtxtUseOptions(_context.get(),
                       XML_PARSE_NOENT | XML_PARSE_NONET | XML_PARSE_IGNORE_ENC | XML_PARSE_HUGE);
+#if LIBXML_VERSION >= 21300
+    xmlCtxtSetMaxAmplification(_context.get(), UINT_MAX);
+#endif
     *_context->sax = Callbacks::handler();
     // Were it the context itself, the parser would look up and open external entities on its own.
     _context->userData = this;
@@ -232,7 +236,6 @@ void SAXSession::pushInput() {
         throw std::bad_alloc();
     input->base = input->cur = reinterpret_cast<const xmlChar*>(_text.data());
     input->end = input->base + _text.size();
-    input->length = static_cast<int>(_text.size());
     if (inputPush(_context.get(), input) >= 0)
         return;
     xmlFreeInputStream(input);

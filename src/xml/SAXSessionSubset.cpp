@@ -10,6 +10,9 @@
 #include <new>
 #include <utility>
 
+// For "sax2" newer parsers have nothing else.
+#pragma GCC diagnostic ignored "-Wdeprecated-declarations"
+
 namespace qx {
 
 namespace {

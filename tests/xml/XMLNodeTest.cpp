@@ -92,7 +92,13 @@ TEST(XMLNode, ACopyIsDeepKeepsPositionsAndSharesNoNode) {
 TEST(XMLNode, NoDepthNeedsStack) {
     constexpr std::size_t depth = 100'000;
     const std::string text = repeated("<a>", depth) + "x" + repeated("</a>", depth);
-    auto document = parsed(text, {.maximumDepth = depth});
+    auto root = XMLElement::initWithName("a", "x");
+    for (std::size_t level = 1; level < depth; ++level) {
+        auto outer = XMLElement::initWithName("a");
+        outer->addChild(root);
+        root = outer;
+    }
+    auto document = XMLDocument::initWithRootElement(std::move(root));
     const Ref<XMLNode> copy = document->copy();
     EXPECT_EQ(document->stringValue(), "x");
     document.reset();

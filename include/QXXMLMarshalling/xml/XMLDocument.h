@@ -18,9 +18,9 @@
 // std::bad_alloc comes out. Any number of threads may parse at the same time.
 //
 // Codes, texts in English and the last few columns of what is no well-formed XML are those of the
-// libxml2 in use, and differ among its versions; limits and all else do not, with two exceptions:
-// from 2.12 on elements never nest deeper than 2,048, and from 2.14 on documents and texts beyond
-// 1 GB are refused.
+// libxml2 in use, and differ among its versions; limits and all else do not, with one exception:
+// from 2.12 on elements never nest deeper than 2,048, whatever the host says. In no version a
+// value or a comment is larger than 1 GB.
 //
 // A document's short texts share memory, a kilobyte each time: whoever keeps single ones of very
 // many documents saves memory with copies, qx::String(text.view()).
