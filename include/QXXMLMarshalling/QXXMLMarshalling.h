@@ -29,6 +29,7 @@
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
 #include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/CountedSet.h>
 #include <QXXMLMarshalling/model/Data.h>

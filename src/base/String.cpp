@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/base/String.h>
 
 #include "base/MemoryBlocks.h"
+#include "base/TextBlocks.h"
 #include "base/Unicode.h"
 
 #include <cstdlib>
@@ -42,12 +43,12 @@ void String::destroy(Rep* rep) noexcept {
         std::free(rep);
 }
 
-String String::inBlock(std::string_view text) {
+String textInBlock(std::string_view text) {
     constexpr std::size_t longest = 256;
     if (text.empty() || text.size() > longest)
         return text;
-    void* const memory = MemoryBlocks::ofTexts().allocate(sizeof(Rep) + text.size() + 1);
-    Rep* const rep = newRep(memory, text.size(), true);
+    void* const memory = MemoryBlocks::ofTexts().allocate(sizeof(String::Rep) + text.size() + 1);
+    auto* const rep = String::newRep(memory, text.size(), true);
     std::memcpy(reinterpret_cast<char*>(rep + 1), text.data(), text.size());
     return String(rep);
 }

@@ -1,10 +1,11 @@
 #include "files/Files.h"
 
-#include "host/FileAccess.h"
+#include "files/FileAccess.h"
 
 #include <algorithm>
 #include <cerrno>
 #include <climits>
+#include <cstring>
 #include <fcntl.h>
 #include <sys/stat.h>
 
@@ -71,6 +72,16 @@ std::string directoryOf(std::string_view path) {
     if (slash == std::string_view::npos)
         return ".";
     return std::string(path.substr(0, slash == 0 ? 1 : slash));
+}
+
+Failure failWithSystemError(Ref<Error>* error, const ErrorText& text, std::string_view path,
+                            int errorNumber) {
+    if (error == nullptr)
+        return {};
+    char buffer[256];
+    const String reason = strerror_r(errorNumber, buffer, sizeof buffer);
+    *error = make<Error>(text, std::vector<Value>{path}, reason);
+    return {};
 }
 
 Failure failReading(Ref<Error>* error, const String& path, int errorNumber) {

@@ -2,9 +2,10 @@
 
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 
+#include "files/FileAccess.h"
 #include "files/Files.h"
-#include "host/FileAccess.h"
 #include "host/LoadedFile.h"
+#include "host/Localization.h"
 #include "host/PropertyList.h"
 #include "model/LibraryClass.h"
 
@@ -53,7 +54,7 @@ std::string_view libraryName(std::string_view file) {
 
 constexpr std::string_view frameworkName = "QXXMLMarshalling";
 
-String frameworkPath() {
+String findFrameworkFolder() {
     static const char anchor = 0; // lies where this library lies
     const String file = sharedObjectHolding(&anchor);
     String folder = file.isNull() ? folderOfProgram() : String(directoryOf(file));
@@ -68,6 +69,12 @@ String frameworkPath() {
 }
 
 } // namespace
+
+const String& frameworkFolder() {
+    // Looked for once: the library does not move.
+    static const String& folder = *new String(findFrameworkFolder());
+    return folder;
+}
 
 Bundle::Bundle(String path, Ref<Dictionary> info) noexcept
     : _path(std::move(path)), _info(std::move(info)) {}
@@ -92,7 +99,7 @@ Ref<Bundle> Bundle::bundleWithPath(const String& path) {
         if (auto known = find())
             return known;
     }
-    // Read outside the lock: an error looks for its text in a bundle.
+    // Read outside the lock: what is wrong with it is told to the host.
     const PropertyList info = readPropertyList(appendingPathComponent(real, "Info.plist"));
     auto made = make<Bundle>(real, info.values);
     {
@@ -135,11 +142,7 @@ void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
     std::swap(open.main, former);
 }
 
-Ref<Bundle> Bundle::frameworkBundle() {
-    // Looked for once: the library does not move.
-    static const String& path = *new String(frameworkPath());
-    return bundleWithPath(path);
-}
+Ref<Bundle> Bundle::frameworkBundle() { return bundleWithPath(frameworkFolder()); }
 
 Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
     // Where the type itself lies says nothing: the linker copies it into a program that casts to
@@ -194,6 +197,10 @@ String Bundle::pathForResource(const String& name, const String& type) const {
         return nullptr;
     String path = appendingPathComponent(_path, relative);
     return fileExists(path) ? path : String();
+}
+
+String Bundle::localizedString(const String& englishText) const {
+    return englishText.isNull() ? englishText : qx::localizedString(_path, englishText);
 }
 
 String Bundle::description() const { return String::concat({Object::description(), " ", _path}); }

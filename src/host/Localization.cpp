@@ -1,10 +1,10 @@
 #include "host/Localization.h"
 
-#include <QXXMLMarshalling/host/Bundle.h>
-
 #include "files/Files.h"
+#include "host/LoadedFile.h"
 #include "host/Log.h"
 #include "host/StringsFile.h"
+#include "model/Localizer.h"
 
 #include <cstdlib>
 #include <memory>
@@ -35,25 +35,24 @@ std::string_view languageOf(std::string_view locale) {
     return locale;
 }
 
-// The texts of one language, and what is wrong with their files.
+// The texts of one language in a folder, and what is wrong with their files: errors and texts. An
+// error's own text is only looked up once these texts are there.
 struct Language {
-    String bundlePath;
+    String folder;
     std::string name;
     StringsFile::Texts texts;
-    std::vector<String> problems;
+    std::vector<Value> problems;
 };
 
 // Adds the texts of a file, in place of those that are there.
-void readStrings(const Bundle& bundle, std::string_view name, Language& language) {
-    const String folder = String::concat({name, ".lproj"});
-    const String path =
-        bundle.pathForResource(appendingPathComponent(folder, "Localizable.strings"));
-    if (path.isNull())
+void readStrings(std::string_view name, Language& language) {
+    const String path = String::concat({language.folder, "/", name, ".lproj/Localizable.strings"});
+    if (!fileExists(path))
         return;
     Ref<Error> error;
     const Ref<Data> data = readFile(path, &error, ReadableFiles::regular, largestResource);
     if (!data) {
-        language.problems.push_back(error->description());
+        language.problems.push_back(error);
         return;
     }
     StringsFile file = parseStrings(data->view());
@@ -65,18 +64,18 @@ void readStrings(const Bundle& bundle, std::string_view name, Language& language
 }
 
 // What the language and region lack comes from the language.
-std::unique_ptr<Language> readLanguage(const Bundle& bundle, std::string_view name) {
+std::unique_ptr<Language> readLanguage(const String& folder, std::string_view name) {
     auto language = std::make_unique<Language>();
-    language->bundlePath = bundle.bundlePath();
+    language->folder = folder;
     language->name = name;
     const std::string_view general = name.substr(0, name.find('_'));
-    readStrings(bundle, general, *language);
+    readStrings(general, *language);
     if (general != name)
-        readStrings(bundle, name, *language);
+        readStrings(name, *language);
     return language;
 }
 
-// The texts of each bundle and language that were asked for; they stay for ever.
+// The texts of each folder and language that were asked for; they stay for ever.
 class Languages {
 public:
     static Languages& shared() {
@@ -84,31 +83,31 @@ public:
         return *languages;
     }
 
-    const StringsFile::Texts& textsFor(const Bundle& bundle, std::string_view name) {
+    const StringsFile::Texts& textsFor(const String& folder, std::string_view name) {
         {
             const std::lock_guard lock(_mutex);
-            if (const Language* known = find(bundle, name))
+            if (const Language* known = find(folder, name))
                 return known->texts;
         }
-        auto read = readLanguage(bundle, name);
-        const std::vector<String> problems = std::exchange(read->problems, {});
+        auto read = readLanguage(folder, name);
+        const std::vector<Value> problems = std::exchange(read->problems, {});
         const Language* language = nullptr;
         {
             const std::lock_guard lock(_mutex);
-            if (const Language* known = find(bundle, name))
+            if (const Language* known = find(folder, name))
                 return known->texts;
             language = _languages.emplace_back(std::move(read)).get();
         }
         // The host's log function may ask for these very texts.
-        for (const String& problem : problems)
+        for (const Value& problem : problems)
             logWarningOrLine("%@", problem);
         return language->texts;
     }
 
 private:
-    const Language* find(const Bundle& bundle, std::string_view name) const {
+    const Language* find(const String& folder, std::string_view name) const {
         for (const auto& known : _languages)
-            if (known->name == name && known->bundlePath == bundle.bundlePath())
+            if (known->name == name && known->folder == folder)
                 return known.get();
         return nullptr;
     }
@@ -117,35 +116,27 @@ private:
     std::vector<std::unique_ptr<Language>> _languages;
 };
 
-// Marks, per thread, that the framework bundle is being opened for a text: an error that comes
-// about meanwhile would look for its own text there, without end.
-struct Opening {
-    Opening() noexcept { isActive = true; }
-    Opening(const Opening&) = delete;
-    Opening& operator=(const Opening&) = delete;
-    ~Opening() { isActive = false; }
-
-    static thread_local bool isActive;
-};
-thread_local bool Opening::isActive = false;
-
 } // namespace
 
-String Bundle::localizedString(const String& englishText) const {
+String localizedString(const String& folder, std::string_view englishText) {
     const std::string_view language = languageOf(localeName());
-    if (language.empty() || englishText.isEmpty())
+    if (folder.isNull() || language.empty() || englishText.empty())
         return englishText;
-    const StringsFile::Texts& texts = Languages::shared().textsFor(*this, language);
-    const auto found = texts.find(englishText.view());
-    return found != texts.end() ? found->second : englishText;
+    const StringsFile::Texts& texts = Languages::shared().textsFor(folder, language);
+    const auto found = texts.find(englishText);
+    return found != texts.end() ? found->second : String(englishText);
 }
 
-String localizedText(std::string_view englishText) {
-    if (languageOf(localeName()).empty() || Opening::isActive)
-        return englishText;
-    const Opening opening;
-    const Ref<Bundle> framework = Bundle::frameworkBundle();
-    return framework ? framework->localizedString(englishText) : String(englishText);
+namespace {
+
+// The texts of errors come out of the framework bundle's folder. The bundle itself is not opened
+// for that: what is wrong with it is told by errors.
+String frameworkText(std::string_view englishText) {
+    return localizedString(frameworkFolder(), englishText);
 }
+
+[[maybe_unused]] const bool localizerInstalled = (installLocalizer(&frameworkText), true);
+
+} // namespace
 
 } // namespace qx

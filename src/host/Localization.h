@@ -6,8 +6,8 @@
 
 namespace qx {
 
-// Bundle::localizedString of the framework bundle. An error that comes about while that bundle is
-// opened for a text gets the English one.
-String localizedText(std::string_view englishText);
+// The translation of an English text from <language>.lproj/Localizable.strings in the folder; the
+// English text itself where there is none. See Bundle::localizedString.
+String localizedString(const String& folder, std::string_view englishText);
 
 } // namespace qx

@@ -3,12 +3,22 @@
 #include <QXXMLMarshalling/model/Format.h>
 
 #include "model/LibraryClass.h"
+#include "model/Localizer.h"
 
 namespace qx {
 
-Error::Error(const ErrorText& text, std::vector<Value> arguments, Localizer localizer)
-    : _domain(cocoaDomain), _code(text.code), _text(&text), _localizer(localizer),
-      _arguments(std::move(arguments)) {}
+Error::Error(const ErrorText& text, std::vector<Value> arguments)
+    : Error(cocoaDomain, text, text.code, std::move(arguments), 0, 0) {}
+
+Error::Error(const ErrorText& text, std::vector<Value> arguments, String reason)
+    : Error(text, std::move(arguments)) {
+    _reason = std::move(reason);
+}
+
+Error::Error(const char* domain, const ErrorText& text, int code, std::vector<Value> arguments,
+             std::size_t line, std::size_t column)
+    : _domain(domain), _code(code), _text(&text), _arguments(std::move(arguments)), _line(line),
+      _column(column) {}
 
 Error::Error(const char* domain, int code, String message, String reason, std::size_t line,
              std::size_t column)
@@ -20,16 +30,11 @@ Error::~Error() = default;
 String Error::domain() const { return _domain; }
 
 String Error::localizedDescription() const {
-    if (_text == nullptr)
-        return _message;
-    return format(_localizer != nullptr ? _localizer(_text->message) : String(_text->message),
-                  _arguments);
+    return _text != nullptr ? format(localizedText(_text->message), _arguments) : _message;
 }
 
 String Error::localizedFailureReason() const {
-    if (_text == nullptr)
-        return _reason;
-    return _localizer != nullptr ? _localizer(_text->reason) : String(_text->reason);
+    return _text != nullptr && _reason.isNull() ? localizedText(_text->reason) : _reason;
 }
 
 String Error::description() const {

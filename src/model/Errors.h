@@ -198,9 +198,4 @@ Failure fail(Ref<Error>* error, const ErrorText& text, const Arguments&... argum
     return {};
 }
 
-// Reports that the operating system refused something about the path. The reason is its text for
-// the error number.
-Failure failWithSystemError(Ref<Error>* error, const ErrorText& text, std::string_view path,
-                            int errorNumber);
-
 } // namespace qx

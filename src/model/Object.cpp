@@ -1,10 +1,10 @@
 #include <QXXMLMarshalling/model/Object.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Format.h>
 #include <QXXMLMarshalling/model/Invocation.h>
-#include <QXXMLMarshalling/observe/Observation.h>
 
 #include "model/ObjectExtras.h"
 

@@ -1,13 +1,8 @@
 #include "model/ObjectExtras.h"
 
-#include "observe/ObservationInfo.h"
-
 #include <algorithm>
 
 namespace qx {
-
-Object::Extras::Extras() noexcept = default;
-Object::Extras::~Extras() = default;
 
 void ObjectInternals::addEndListener(Object& object, EndListener& listener) {
     extras(object).endListeners.push_back(&listener);

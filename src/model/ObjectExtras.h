@@ -9,8 +9,6 @@
 
 namespace qx {
 
-struct ObservationInfo;
-
 // Told once when an object that it was added to ends, while the object is still whole.
 class EndListener {
 public:
@@ -18,6 +16,14 @@ public:
 
 protected:
     ~EndListener() = default;
+};
+
+// Hears of every change that is announced of an object; it belongs to the object.
+class ChangeListener {
+public:
+    virtual ~ChangeListener() = default;
+    virtual void willChange(Key key, ChangeKind kind, std::span<const std::size_t> indexes) = 0;
+    virtual void didChange(Key key) = 0;
 };
 
 // What a class of object keeps of its own kind.
@@ -28,12 +34,9 @@ struct ObjectAttachment {
 struct Object::Extras {
     Ref<WeakAnchor> anchor;
     std::vector<EndListener*> endListeners;
-    std::unique_ptr<ObservationInfo> observation;
+    std::unique_ptr<ChangeListener> changeListener;
     Object* nextWaiting = nullptr; // of the ending objects that wait for their turn
     std::unique_ptr<ObjectAttachment> attachment;
-
-    Extras() noexcept;
-    ~Extras();
 };
 
 // The extras for the rest of this room.

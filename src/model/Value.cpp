@@ -10,7 +10,7 @@
 namespace qx {
 
 Value::Value(String&& text) noexcept : _kind(text.isNull() ? Kind::null : Kind::string) {
-    _payload.text = std::exchange(text._rep, nullptr);
+    _payload.text = std::move(text).detach();
 }
 
 Value::Value(const Object* object) noexcept : _kind(object != nullptr ? Kind::object : Kind::null) {
@@ -23,24 +23,20 @@ Value::Value(const Value& other) noexcept : _payload(other._payload), _kind(othe
     if (_kind == Kind::object)
         _payload.object->retain();
     else if (_kind == Kind::string)
-        new (&_payload) String(other.string()); // one pointer wide: the copy's count is ours
+        _payload.text = other.string().detach();
 }
 
 void Value::releasePayload() noexcept {
     if (_kind == Kind::object) {
         _payload.object->release();
     } else if (_kind == Kind::string) {
-        const String last(_payload.text); // takes the count over and gives it up
+        String::adopt(_payload.text);
         _kind = Kind::null;
     }
 }
 
 String Value::string() const noexcept {
-    if (!isString())
-        return {};
-    String shared(_payload.text);
-    shared.retain();
-    return shared;
+    return isString() ? String::shared(_payload.text) : String();
 }
 
 bool Value::isNullOrMarker() const noexcept { return isNull() || object() == Null::marker(); }
@@ -91,7 +87,7 @@ bool Value::boolValue() const noexcept {
     case Kind::real:
         return _payload.real != 0;
     case Kind::string:
-        return textIsTrue({String::text(_payload.text), _payload.text->size});
+        return textIsTrue(_payload.text->view());
     case Kind::object:
         return _payload.object != Null::marker();
     }
@@ -107,7 +103,7 @@ std::int64_t Value::intValue() const noexcept {
     case Kind::real:
         return saturated(_payload.real);
     case Kind::string:
-        return scanInteger({String::text(_payload.text), _payload.text->size}).value_or(0);
+        return scanInteger(_payload.text->view()).value_or(0);
     case Kind::null:
     case Kind::object:
         return 0;
@@ -124,7 +120,7 @@ double Value::doubleValue() const noexcept {
     case Kind::real:
         return _payload.real;
     case Kind::string:
-        return scanReal({String::text(_payload.text), _payload.text->size}).value_or(0);
+        return scanReal(_payload.text->view()).value_or(0);
     case Kind::null:
     case Kind::object:
         return 0;
@@ -169,8 +165,7 @@ bool Value::isEqual(const Value& other) const {
     if (_kind != other._kind)
         return false;
     if (_kind == Kind::string)
-        return std::string_view(String::text(_payload.text), _payload.text->size) ==
-               std::string_view(String::text(other._payload.text), other._payload.text->size);
+        return _payload.text->view() == other._payload.text->view();
     if (_kind == Kind::object)
         return _payload.object == other._payload.object ||
                _payload.object->isEqual(*other._payload.object);

@@ -10,15 +10,16 @@ ObservationInfo::ObservationInfo(Object& owner) : _owner(owner) {
 }
 
 ObservationInfo& ObservationInfo::of(Object& object) {
-    auto& info = ObjectInternals::extras(object).observation;
-    if (!info)
-        info = std::make_unique<ObservationInfo>(object);
-    return *info;
+    auto& listener = ObjectInternals::extras(object).changeListener;
+    if (!listener)
+        listener = std::make_unique<ObservationInfo>(object);
+    return static_cast<ObservationInfo&>(*listener);
 }
 
 ObservationInfo* ObservationInfo::existing(const Object& object) noexcept {
     const auto* extras = ObjectInternals::existingExtras(object);
-    return extras != nullptr ? extras->observation.get() : nullptr;
+    return extras != nullptr ? static_cast<ObservationInfo*>(extras->changeListener.get())
+                             : nullptr;
 }
 
 // Nothing is added from now on: no observance begins at or by an object that is ending, and no path

@@ -108,9 +108,9 @@ private:
     Value _oldValue;
 };
 
-struct ObservationInfo final : private EndListener {
+struct ObservationInfo final : ChangeListener, private EndListener {
     explicit ObservationInfo(Object& owner);
-    ~ObservationInfo() = default;
+    ~ObservationInfo() override = default;
     ObservationInfo(const ObservationInfo&) = delete;
     ObservationInfo& operator=(const ObservationInfo&) = delete;
 
@@ -118,8 +118,8 @@ struct ObservationInfo final : private EndListener {
     // Null when nothing was ever observed at or by the object.
     static ObservationInfo* existing(const Object& object) noexcept;
 
-    void willChange(Key key, ChangeKind kind, std::span<const std::size_t> indexes);
-    void didChange(Key key);
+    void willChange(Key key, ChangeKind kind, std::span<const std::size_t> indexes) override;
+    void didChange(Key key) override;
 
     ObservationLink& addLink(Key key);
     void removeLink(const ObservationLink& link) noexcept;

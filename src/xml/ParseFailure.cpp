@@ -1,20 +1,20 @@
 #include "xml/ParseFailure.h"
 
-#include <QXXMLMarshalling/model/Format.h>
-
-#include "host/Localization.h"
-
 namespace qx {
 
-ParseFailure::ParseFailure(const ErrorText& text, std::vector<Value> arguments, std::size_t at)
-    : code(text.code), message(format(localizedText(text.message), arguments)),
-      reason(localizedText(text.reason)), offset(at) {}
+namespace {
+
+constexpr ErrorText parsersText{0, "%@", parseErrors::notWellFormed};
+constexpr ErrorText noText{0, parseErrors::notWellFormed, parseErrors::notWellFormed};
+
+} // namespace
+
+ParseFailure::ParseFailure(const ErrorText& ours, std::vector<Value> filledIn, std::size_t at)
+    : code(ours.code), text(&ours), arguments(std::move(filledIn)), offset(at) {}
 
 ParseFailure::ParseFailure(int parsersCode, std::string_view parsersMessage, std::size_t at)
-    : code(parsersCode), message(parsersMessage), reason(localizedText(parseErrors::notWellFormed)),
-      offset(at) {
-    if (message.isEmpty())
-        message = reason;
+    : code(parsersCode),
+      text(parsersMessage.empty() ? &noText : &parsersText), arguments{parsersMessage}, offset(at) {
 }
 
 } // namespace qx

@@ -95,15 +95,15 @@ struct ParseFailure {
     // The offset of a failure that came about where the parser stands.
     static constexpr std::size_t here = static_cast<std::size_t>(-1);
 
-    // One of ours, put into the user's language.
-    explicit ParseFailure(const ErrorText& text, std::vector<Value> arguments = {},
+    // One of ours.
+    explicit ParseFailure(const ErrorText& ours, std::vector<Value> filledIn = {},
                           std::size_t at = here);
     // What the C parser says of a document that is not well-formed.
     ParseFailure(int parsersCode, std::string_view parsersMessage, std::size_t at);
 
     int code;
-    String message;
-    String reason;
+    const ErrorText* text;
+    std::vector<Value> arguments;
     // Into the document as UTF-8 text.
     std::size_t offset;
 };

@@ -94,7 +94,7 @@ Ref<XMLDocument> XMLParser::parse(XMLBytes bytes, const XMLParseOptions& options
             return nullptr;
         TextPosition place(input.text());
         place.moveTo(failure.offset);
-        *error = make<Error>(Error::parserDomain, failure.code, failure.message, failure.reason,
+        *error = make<Error>(Error::parserDomain, *failure.text, failure.code, failure.arguments,
                              place.line(), place.column());
         return nullptr;
     }

@@ -1,5 +1,6 @@
 #include "xml/XMLTreeBuilder.h"
 
+#include "base/TextBlocks.h"
 #include "xml/ParseFailure.h"
 #include "xml/Siblings.h"
 #include "xml/XMLCharacters.h"
@@ -60,10 +61,10 @@ void XMLTreeBuilder::addAttribute(const String& name, std::string_view value) {
     requireSize(value.size(), parseErrors::valueTooLarge);
     XMLElement& element = *_open.back().element;
     if (element.canHoldAttribute())
-        element.holdAttribute(name, _values.valued(value));
+        element.holdAttribute(name, textInBlock(value));
     else
         element.appendAttribute(
-            Ref<XMLNode>::adopt(newNode(XMLNodeKind::attribute, name, _values.valued(value))));
+            Ref<XMLNode>::adopt(newNode(XMLNodeKind::attribute, name, textInBlock(value))));
 }
 
 void XMLTreeBuilder::endElement() {
@@ -114,7 +115,7 @@ void XMLTreeBuilder::placeText(bool endsElement) {
                  _lasting.empty() ? _joinedLayouts.emplace_back(_joined) : _lasting});
     } else if (endsElement && !isLayout && open.element->_childCount == 0 &&
                _layouts.size() == open.firstLayout) {
-        open.element->holdText(_values.valued(text));
+        open.element->holdText(textInBlock(text));
     } else {
         if (!isLayout && !open.hasText)
             restoreLayout(open);
@@ -136,7 +137,7 @@ void XMLTreeBuilder::restoreLayout(OpenElement& open) {
 }
 
 void XMLTreeBuilder::appendText(std::string_view text, bool isLayout, XMLNode* before) {
-    auto* node = newNode(XMLNodeKind::text, String(), _values.valued(text));
+    auto* node = newNode(XMLNodeKind::text, String(), textInBlock(text));
     node->_isLayout = isLayout;
     appendChild(*_open.back().element, node, before);
 }

@@ -7,7 +7,6 @@
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include "base/MemoryBlocks.h"
-#include "xml/SharedValues.h"
 
 #include <deque>
 #include <string>
@@ -88,7 +87,6 @@ private:
     bool _mayBeLayout = false;
     std::vector<Layout> _layouts;
     std::deque<std::string> _joinedLayouts; // texts of these that came in several pieces
-    SharedValues _values;
 };
 
 } // namespace qx

@@ -6,6 +6,7 @@
 
 #include <QXXMLMarshalling/base/Export.h>
 #include <QXXMLMarshalling/detail/Count.h>
+#include <QXXMLMarshalling/detail/StringRep.h>
 
 #include <atomic>
 #include <cstddef>
@@ -80,33 +81,33 @@ public:
         return _rep != nullptr && (_rep->count.load(std::memory_order_relaxed) & internedBit) != 0;
     }
 
+    // For classes that hold a text without a String: as Ref's of the same names. `shared` adds a
+    // count.
+    [[nodiscard]] detail::StringRep* detach() && noexcept { return std::exchange(_rep, nullptr); }
+    static String adopt(detail::StringRep* rep) noexcept { return String(rep); }
+    static String shared(detail::StringRep* rep) noexcept {
+        String text(rep);
+        text.retain();
+        return text;
+    }
+
 private:
     friend class Key;
     friend class Selector;
-    friend class Value;
     friend struct NameTable;
-    friend class SharedValues;
+    friend String textInBlock(std::string_view text);
     friend class TextBuffer;
 
-    struct Rep {
-        std::atomic<std::uint32_t> count;
-        std::atomic<std::uint32_t> hash; // 0: not worked out yet
-        std::size_t isInBlock : 1;       // in memory shared with others
-        std::size_t size : sizeof(std::size_t) * 8 - 1;
-    };
+    using Rep = detail::StringRep;
     static constexpr std::uint32_t immortalBit = 0x80000000U;
     static constexpr std::uint32_t internedBit = 0x40000000U;
     static constexpr std::uint32_t propertyBit = 0x20000000U; // see Key::namesProperty
 
     explicit String(Rep* rep) noexcept : _rep(rep) {}
-    static const char* text(const Rep* rep) noexcept {
-        return reinterpret_cast<const char*>(rep + 1);
-    }
+    static const char* text(const Rep* rep) noexcept { return rep->view().data(); }
     // A text of that many bytes, which the caller fills in, with a count of one.
     static Rep* newRep(void* memory, std::size_t size, bool isInBlock) noexcept;
     static Rep* allocate(std::size_t size, std::uint32_t count);
-    // For the many short texts of a document.
-    static String inBlock(std::string_view text);
     static void destroy(Rep* rep) noexcept;
     // A text that nobody shares, with room for that many bytes; null makes a new one.
     static Rep* resized(Rep* rep, std::size_t size);

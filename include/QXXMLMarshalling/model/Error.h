@@ -32,11 +32,14 @@ public:
     static constexpr const char* cocoaDomain = "NSCocoaErrorDomain";
     static constexpr const char* parserDomain = "NSXMLParserErrorDomain";
 
-    // Looks a text up in the user's language; answers the key itself where there is no translation.
-    using Localizer = String (*)(std::string_view key);
-
-    // `text` must live for ever (a constant); it is filled with `arguments` when asked for.
-    Error(const ErrorText& text, std::vector<Value> arguments, Localizer localizer);
+    // `text` must live for ever (a constant); it is put into the user's language and filled with
+    // `arguments` when asked for.
+    Error(const ErrorText& text, std::vector<Value> arguments);
+    // The same with a reason of its own.
+    Error(const ErrorText& text, std::vector<Value> arguments, String reason);
+    // The same in another domain, with a place in a document.
+    Error(const char* domain, const ErrorText& text, int code, std::vector<Value> arguments,
+          std::size_t line, std::size_t column);
     // An error whose texts are final, with the place in a document where it came about (0: none).
     Error(const char* domain, int code, String message, String reason, std::size_t line = 0,
           std::size_t column = 0);
@@ -62,7 +65,6 @@ private:
     const char* _domain;
     int _code;
     const ErrorText* _text = nullptr;
-    Localizer _localizer = nullptr;
     std::vector<Value> _arguments;
     String _message;
     String _reason;

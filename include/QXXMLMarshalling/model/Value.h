@@ -119,7 +119,7 @@ private:
         bool boolean;
         std::int64_t integer;
         double real;
-        String::Rep* text;
+        detail::StringRep* text;
         Object* object;
     };
     Payload _payload{.integer = 0};

@@ -24,6 +24,7 @@
 // NSInternalInconsistencyException. A change that leads a path to other objects costs as much as
 // adding the observer, every other change nothing but the telling.
 
+#include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Value.h>
 
 #include <vector>
@@ -31,8 +32,6 @@
 namespace qx {
 
 class Observance;
-
-enum class ChangeKind : std::uint8_t { setting = 1, insertion, removal, replacement };
 
 // What an observer wants to be told; joined with |.
 struct Observing {
@@ -77,27 +76,6 @@ public:
 
 private:
     Ref<Observance> _observance;
-};
-
-// Announces a change that is made in its scope. The observed object must outlive it.
-class QX_API ChangeScope {
-public:
-    ChangeScope(Object& object, Key key);
-    // Items inserted into, removed from or replaced in the collection under the key.
-    ChangeScope(Object& object, Key key, ChangeKind kind, std::vector<std::size_t> indexes);
-    // What observers throw comes out, unless another exception is on its way already.
-    ~ChangeScope() noexcept(false);
-    ChangeScope(const ChangeScope&) = delete;
-    ChangeScope& operator=(const ChangeScope&) = delete;
-
-private:
-    void announceEnd();
-
-    Object& _object;
-    Key _key;
-    ChangeKind _kind = ChangeKind::setting;
-    std::vector<std::size_t> _indexes;
-    int _exceptions;
 };
 
 } // namespace qx

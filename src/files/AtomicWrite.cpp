@@ -1,6 +1,6 @@
 #include "files/Files.h"
 
-#include "host/FileAccess.h"
+#include "files/FileAccess.h"
 
 #include <cerrno>
 #include <climits>

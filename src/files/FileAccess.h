@@ -33,6 +33,10 @@ bool holdsZeroByte(std::string_view path);
 // The folder that holds the path's last component: "." for a path without a slash.
 std::string directoryOf(std::string_view path);
 
+// Reports that the operating system refused something about the path. The reason is its text for
+// the error number.
+Failure failWithSystemError(Ref<Error>* error, const ErrorText& text, std::string_view path,
+                            int errorNumber);
 Failure failReading(Ref<Error>* error, const String& path, int errorNumber);
 Failure failWriting(Ref<Error>* error, const String& path, int errorNumber);
 
