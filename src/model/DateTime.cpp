@@ -1,7 +1,8 @@
 #include <QXXMLMarshalling/model/DateTime.h>
 
+#include <algorithm>
 #include <array>
-#include <cstdio>
+#include <cstdlib>
 
 namespace qx {
 
@@ -70,9 +71,9 @@ bool nanosecondsOf(std::string_view digits, std::int64_t& nanoseconds) {
     const std::string_view finer = digits.substr(std::min(digits.size(), digitsOfNanosecond));
     if (digits.empty() || finer.find_first_not_of('0') != std::string_view::npos)
         return false;
-    std::string padded(digits.substr(0, digitsOfNanosecond));
-    padded.resize(digitsOfNanosecond, '0');
-    return numberOf(padded, nanoseconds);
+    std::string whole(digits.substr(0, digitsOfNanosecond));
+    whole.resize(digitsOfNanosecond, '0');
+    return numberOf(whole, nanoseconds);
 }
 
 // At least four digits, no needless zeros before them.
@@ -169,39 +170,35 @@ bool takeUnits(Cursor& cursor, std::span<const Unit> units, Seconds& result, boo
     return true;
 }
 
-template <class... Arguments>
-std::string printed(const char* format, Arguments... arguments) {
-    std::array<char, 64> text{};
-    const int size = std::snprintf(text.data(), text.size(), format, arguments...);
-    return std::string(text.data(), static_cast<std::size_t>(size));
+// With zeros before it, up to that many digits.
+std::string padded(std::int64_t number, std::size_t digits) {
+    const std::string text = std::to_string(number);
+    return std::string(digits - std::min(digits, text.size()), '0') + text;
 }
 
 std::string fractionText(std::int64_t nanoseconds) {
     if (nanoseconds == 0)
         return {};
-    const std::string text = printed(".%09lld", static_cast<long long>(nanoseconds));
-    return text.substr(0, text.find_last_not_of('0') + 1);
+    const std::string text = padded(nanoseconds, digitsOfNanosecond);
+    return "." + text.substr(0, text.find_last_not_of('0') + 1);
 }
 
 std::string textOf(chrono::year year) {
     const int number = static_cast<int>(year);
-    return printed(number < 0 ? "-%04d" : "%04d", number < 0 ? -number : number);
+    return (number < 0 ? "-" : "") + padded(number < 0 ? -number : number, 4);
 }
 
 std::string textOf(chrono::year_month month) {
-    return textOf(month.year()) + printed("-%02u", static_cast<unsigned>(month.month()));
+    return textOf(month.year()) + "-" + padded(static_cast<unsigned>(month.month()), 2);
 }
 
 std::string textOf(chrono::year_month_day date) {
-    return textOf(date.year() / date.month()) + printed("-%02u", static_cast<unsigned>(date.day()));
+    return textOf(date.year() / date.month()) + "-" + padded(static_cast<unsigned>(date.day()), 2);
 }
 
 std::string timeText(Seconds time) {
-    const auto part = [&](std::int64_t unit, std::int64_t many) {
-        return static_cast<int>(time.whole / unit % many);
-    };
-    return printed("%02d:%02d:%02d", static_cast<int>(time.whole / secondsOfHour),
-                   part(secondsOfMinute, 60), part(1, 60)) +
+    return padded(time.whole / secondsOfHour, 2) + ":" +
+           padded(time.whole / secondsOfMinute % 60, 2) + ":" + padded(time.whole % 60, 2) +
            fractionText(time.nanoseconds);
 }
 
@@ -238,9 +235,9 @@ String DateTime::text() const {
         return text;
     if (isZulu && offset->count() == 0)
         return text + "Z";
-    const auto minutes = static_cast<int>(offset->count());
-    const int distance = minutes < 0 ? -minutes : minutes;
-    return text + printed("%c%02d:%02d", minutes < 0 ? '-' : '+', distance / 60, distance % 60);
+    const std::int64_t minutes = std::abs(static_cast<std::int64_t>(offset->count()));
+    return text + (offset->count() < 0 ? "-" : "+") + padded(minutes / 60, 2) + ":" +
+           padded(minutes % 60, 2);
 }
 
 namespace detail {

@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
 
+#include "files/FileAccess.h"
 #include "files/Files.h"
 #include "host/Directories.h"
 #include "host/Log.h"
