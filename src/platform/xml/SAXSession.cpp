@@ -1,7 +1,6 @@
 #include "platform/xml/SAXSession.h"
 
 #include "platform/xml/XMLCharacters.h"
-#include "platform/xml/XMLLimits.h"
 
 #include <algorithm>
 #include <cstring>
@@ -13,6 +12,10 @@
 namespace qx {
 
 namespace {
+
+// Up to these the C parser keeps its own, stricter checks; beyond, ours alone hold.
+constexpr std::size_t parsersDepth = 256;
+constexpr std::size_t parsersTextSize = 10'000'000;
 
 // What entities and attribute defaults may add to a document.
 constexpr std::size_t freeExpansion = 1'000'000;
@@ -194,8 +197,7 @@ SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLPa
         throw std::bad_alloc();
     pushInput();
     int flags = XML_PARSE_NOENT | XML_PARSE_NONET | XML_PARSE_IGNORE_ENC;
-    if (options.maximumDepth > xmlLimits::parsersDepth ||
-        options.maximumTextSize > xmlLimits::parsersTextSize)
+    if (options.maximumDepth > parsersDepth || options.maximumTextSize > parsersTextSize)
         flags |= XML_PARSE_HUGE;
     xmlCtxtUseOptions(_context.get(), flags);
     *_context->sax = Callbacks::handler();

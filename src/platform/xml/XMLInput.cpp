@@ -3,9 +3,9 @@
 #include "platform/xml/Encoding.h"
 #include "platform/xml/ParseFailure.h"
 #include "platform/xml/XMLCharacters.h"
-#include "platform/xml/XMLLimits.h"
 
 #include <algorithm>
+#include <climits>
 
 namespace qx {
 
@@ -14,7 +14,7 @@ namespace {
 // The parser compares each attribute of a start tag with all others. Tags shorter than this cannot
 // hold enough of them to matter, and are not looked at.
 constexpr std::size_t longStartTag = 16 * 1024;
-constexpr std::size_t maximumAttributes = xmlLimits::attributes;
+constexpr std::size_t maximumAttributes = 4096;
 
 constexpr std::string_view declarationStart = "<?xml";
 
@@ -112,7 +112,7 @@ void XMLInput::convert(std::string_view bytes, const String& encoding) {
 void XMLInput::checkStart() const {
     if (_text.empty())
         throw ParseFailure(parseErrors::empty, {}, 0);
-    if (_text.size() > xmlLimits::documentSize)
+    if (_text.size() > INT_MAX - 1)
         throw ParseFailure(parseErrors::documentTooLarge, {}, 0);
     if (_text.front() != '<' && !isWhite(_text.front()))
         throw ParseFailure(parseErrors::noStartTag, {}, 0);

@@ -20,12 +20,4 @@ inline constexpr std::size_t namespaces = 1000;
 // Different names, namespace URIs among them: the parser's own table of names gets slow with more.
 inline constexpr std::size_t names = 100'000;
 
-// Up to these values of the options the C parser keeps its own, stricter checks; beyond, ours alone
-// hold.
-inline constexpr std::size_t parsersDepth = 256;
-inline constexpr std::size_t parsersTextSize = 10'000'000;
-// Then each part of a name, and all different names together, are bounded in bytes.
-inline constexpr std::size_t parsersNameSize = 50'000;
-inline constexpr std::size_t parsersNameMemory = 7'500'000;
-
 } // namespace qx::xmlLimits

@@ -354,42 +354,20 @@ void XMLSerializer::requireSize(std::size_t size, std::string_view what, const P
         refuseBeyond(what, _reading->maximumTextSize, place);
 }
 
-namespace {
-
-bool parserHasLimits(const XMLParseOptions& reading) {
-    return reading.maximumDepth <= xmlLimits::parsersDepth &&
-           reading.maximumTextSize <= xmlLimits::parsersTextSize;
-}
-
-} // namespace
-
 void XMLSerializer::countName(const String& name, const Place& place) {
     requireSize(name.size(), "a name is larger than", place);
-    const std::size_t colon = name.view().find(':');
-    const std::size_t prefix = colon != std::string_view::npos ? colon : 0;
-    const std::size_t local =
-        colon != std::string_view::npos ? name.size() - colon - 1 : name.size();
-    if (parserHasLimits(*_reading) && std::max(prefix, local) > xmlLimits::parsersNameSize)
-        refuseBeyond("a part of a name is larger than", xmlLimits::parsersNameSize, place);
-    if (!_names.insert(name).second)
-        return;
-    _nameMemory += name.size();
-    requireFewNames(place);
+    if (_names.insert(name).second)
+        requireFewNames(place);
 }
 
 void XMLSerializer::countURI(const String& URI, const Place& place) {
-    if (_reading == nullptr || !_URIs.insert(URI).second)
-        return;
-    _nameMemory += URI.size();
-    requireFewNames(place);
+    if (_reading != nullptr && _URIs.insert(URI).second)
+        requireFewNames(place);
 }
 
 void XMLSerializer::requireFewNames(const Place& place) const {
     if (_names.size() + _URIs.size() > xmlLimits::names)
         refuseBeyond("the document has more different names than", xmlLimits::names, place);
-    if (parserHasLimits(*_reading) && _nameMemory > xmlLimits::parsersNameMemory)
-        refuseBeyond("the document's names together are larger than", xmlLimits::parsersNameMemory,
-                     place);
 }
 
 // Empty texts, which no line would show, may stand among nodes that have lines of their own.

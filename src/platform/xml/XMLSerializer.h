@@ -111,7 +111,6 @@ private:
     std::vector<Declarations> _declarations;
     std::unordered_set<String, Hash> _names;
     std::unordered_set<String, Hash> _URIs;
-    std::size_t _nameMemory = 0;
 };
 
 // Where the node stands, such as /order/item[2]/@name.
