@@ -9,8 +9,7 @@
 // Parsing reads the given bytes and nothing else: no other file, no network, whatever the document
 // says. Internal entities and attribute defaults of the internal subset work, an entity that stands
 // elsewhere is an error; CDATA and entities become text. Limits bound depth, text size, what
-// entities bring in, an element's attributes and declarations (4,096), the declarations in force
-// (1,000), different names (100,000), and the whole (2 GB). Beyond one, and for anything that is no
+// entities bring in and what one element may declare. Beyond one, and for anything that is no
 // well-formed XML, the result is null and the error says what, where: domain
 // qx::Error::parserDomain, the parser's code and text, line() and column(). Any number of threads
 // may parse at the same time.
@@ -101,7 +100,9 @@ public:
     // encoding (UTF-8 without one); characters that the encoding lacks go as character references.
     // Raises NSInvalidArgumentException as XMLString does, for an unknown encoding, and for what
     // could not be read again with the options `reading`: a document that was read with higher
-    // limits than the default ones is written with the same.
+    // limits than the default ones is written with the same. Whatever the options, an element has
+    // at most 4,096 attributes and namespace declarations, at most 1,000 of these are in force at
+    // one place, and a document has at most 100,000 different names and 2 GB.
     std::string XMLData(XMLOptions options = XMLNoOptions,
                         const XMLParseOptions& reading = {}) const;
     // The same as text. XMLString(options), as of any node, heeds no limit.

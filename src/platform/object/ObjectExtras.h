@@ -26,10 +26,10 @@ struct ObjectAttachment {
 };
 
 struct Object::Extras {
+    std::unique_ptr<ObjectAttachment> attachment;
     Ref<WeakAnchor> anchor;
     std::vector<EndListener*> endListeners;
     std::unique_ptr<ObservationInfo> observation;
-    std::unique_ptr<ObjectAttachment> attachment;
 
     Extras() noexcept;
     ~Extras();

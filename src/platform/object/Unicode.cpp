@@ -35,6 +35,18 @@ std::string encoded(const icu::UnicodeString& text) {
 
 } // namespace
 
+std::string_view withoutLeadingSpace(std::string_view text) noexcept {
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
+    std::size_t start = 0;
+    for (std::size_t next = 0; next < text.size(); start = next) {
+        UChar32 c = 0;
+        U8_NEXT(bytes, next, text.size(), c);
+        if (c < 0 || !u_isUWhiteSpace(c))
+            break;
+    }
+    return text.substr(start);
+}
+
 std::string lowercased(std::string_view text) {
     if (!isASCII(text))
         return encoded(decoded(text).toLower(icu::Locale::getRoot()));
@@ -73,18 +85,6 @@ bool equalIgnoringCase(std::string_view a, std::string_view b) {
                           [](char x, char y) { return asciiLower(x) == asciiLower(y); });
     }
     return decoded(a).caseCompare(decoded(b), U_FOLD_CASE_DEFAULT) == 0;
-}
-
-std::string_view withoutLeadingSpace(std::string_view text) noexcept {
-    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
-    std::size_t start = 0;
-    for (std::size_t next = 0; next < text.size(); start = next) {
-        UChar32 c = 0;
-        U8_NEXT(bytes, next, text.size(), c);
-        if (c < 0 || !u_isUWhiteSpace(c))
-            break;
-    }
-    return text.substr(start);
 }
 
 } // namespace qx::unicode
