@@ -15,9 +15,9 @@
 // or others, and what they throw comes out of the change when all have been told. Changes nested in
 // a change of the same value are told once, when the outermost ends. A value that depends on others
 // is announced by the class operations "keyPathsForValuesAffectingValueForKey:" (the key) or
-// "keyPathsForValuesAffecting<Key>", which return an array or a set of key paths; asked once for each
-// class and key. A path that leads through an array hears of a new array, not of changes inside its
-// items.
+// "keyPathsForValuesAffecting<Key>", which return an array or a set of key paths; asked once for
+// each class and key. A path that leads through an array hears of a new array, not of changes
+// inside its items.
 //
 // Paths and what they depend on are followed at any distance and may come back to where they began;
 // beyond 1,000,000 values whoever adds the observer, or makes the change that leads there, gets
