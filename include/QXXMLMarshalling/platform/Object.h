@@ -130,7 +130,8 @@ public:
     static std::int64_t liveCount() noexcept;
 
 protected:
-    // The library's own class that the object is of, described by then. Host classes leave it alone.
+    // The library's own class that the object is of, described by then. Host classes leave it
+    // alone.
     virtual const Class& describedClass() const;
 
     // False as long as nobody observes the object, waits for its end or refers to it weakly.
