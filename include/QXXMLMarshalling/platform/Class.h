@@ -17,9 +17,9 @@
 // published whole when its builder ends; a name that is taken stays with the first, and a warning
 // is logged. Descriptions live for ever; forget() takes a name back when a plug-in is unloaded.
 //
-// A class that nobody described is, for its objects, a subclass of the nearest of its C++ bases that
-// is; a description that comes later, of the class or of a base, holds for objects that are asked
-// for their class from then on.
+// A class that nobody described is, for its objects, a subclass of the nearest of its C++ bases
+// that is; a description that comes later, of the class or of a base, holds for objects that are
+// asked for their class from then on.
 
 #include <QXXMLMarshalling/platform/ClassDescription.h>
 
