@@ -61,7 +61,8 @@ public:
     std::vector<ObservedValue> walk(Object& root, Key keyPath) {
         follow(Ref<Object>(&root), keyPath.view(), true);
         while (!_open.empty()) {
-            const auto [object, path] = std::move(_open.back());
+            const Ref<Object> object = std::move(_open.back().first);
+            const String path = std::move(_open.back().second);
             _open.pop_back();
             follow(object, path.view(), false);
         }
