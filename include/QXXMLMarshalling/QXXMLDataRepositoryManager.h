@@ -28,8 +28,8 @@ public:
     // Drops it: the next call of defaultManager makes a fresh one.
     static void flushDefaultManager();
 
-    // Raises what QXXMLFileSystemDataRepository::init raises: NSInternalInconsistencyException for a
-    // user without any home.
+    // Raises what QXXMLFileSystemDataRepository::init raises: NSInternalInconsistencyException for
+    // a user without any home.
     static qx::Ref<QXXMLDataRepositoryManager> init();
     QXXMLDataRepositoryManager();
     ~QXXMLDataRepositoryManager() override;
