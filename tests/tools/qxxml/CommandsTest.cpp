@@ -213,6 +213,7 @@ TEST(Commands, EachHasHelp) {
     for (const std::string command : {"", "describe ", "read ", "roundtrip ", "where "}) {
         const Outcome outcome = home.run("qxxml " + command + "--help");
         EXPECT_EQ(outcome.status, 0) << outcome;
-        EXPECT_NE(outcome.output.find("Usage: qxxml " + command), std::string::npos) << outcome;
+        EXPECT_NE(outcome.output.find("qxxml " + command + "[OPTIONS]"), std::string::npos)
+            << outcome;
     }
 }
