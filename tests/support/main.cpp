@@ -1,5 +1,6 @@
 // Runs the tests, and after each one checks that it has left no live object behind.
 
+#include <QXXMLMarshalling/model/Null.h>
 #include <QXXMLMarshalling/model/Object.h>
 
 #include <gtest/gtest.h>
@@ -25,6 +26,7 @@ class LeakCheck : public testing::EmptyTestEventListener {
 
 int main(int argc, char** argv) {
     testing::InitGoogleTest(&argc, argv);
+    qx::Null::marker();
     if (makeLastingObjects != nullptr)
         makeLastingObjects();
     testing::UnitTest::GetInstance()->listeners().Append(new LeakCheck);
