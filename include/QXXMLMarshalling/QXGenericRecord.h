@@ -24,6 +24,10 @@
 #include <QXXMLMarshalling/undo/ChangeTracking.h>
 #include <QXXMLMarshalling/undo/UndoManager.h>
 
+namespace qx::detail {
+class RecordFilling;
+}
+
 // The user default that lets records answer accessor messages; its registered value is "NO".
 extern QX_API const char* const AllowMethodForwardingInGenericRecords;
 
@@ -126,7 +130,7 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
-    friend class ObjectDoor;
+    friend class qx::detail::RecordFilling;
 
     const qx::Ref<qx::Dictionary>& filledContents() {
         if (!_contents) {

@@ -219,11 +219,6 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
-    friend class Marshalling;
-    friend class Unmarshalling;
-
-    const MappingPlan& plan() const;
-
     qx::Ref<QXXMLMarshallingMapping> _mapping;
     bool _saveUnknownXML = true;
     bool _lenient = true;

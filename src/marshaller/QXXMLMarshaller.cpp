@@ -1,7 +1,5 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include "marshaller/Marshalling.h"
-#include "marshaller/Unmarshalling.h"
 #include "model/LibraryClass.h"
 
 using qx::Error;
@@ -47,13 +45,6 @@ const Ref<qx::UndoManager>& QXXMLMarshaller::undoManager() {
     if (!_undoManager)
         _undoManager = qx::make<qx::UndoManager>();
     return _undoManager;
-}
-
-const MappingPlan& QXXMLMarshaller::plan() const {
-    if (_mapping)
-        return _mapping->plan();
-    static const MappingPlan none(*QXXMLDocumentMapping::initWithXML(nullptr));
-    return none;
 }
 
 Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* error) {

@@ -1,28 +1,26 @@
-#include "marshaller/CopyScope.h"
+#include "marshaller/KeptCopies.h"
 
-using qx::Ref;
-using qx::XMLElement;
-using qx::XMLNode;
+namespace qx::detail {
 
-Ref<XMLNode> CopyScope::find(const XMLNode& node) const {
+Ref<XMLNode> KeptCopies::find(const XMLNode& node) const {
     const auto found = _copied.find(&node);
     return found != _copied.end() ? found->second.copy : nullptr;
 }
 
-void CopyScope::add(XMLNode& original, XMLNode& copy) {
+void KeptCopies::add(XMLNode& original, XMLNode& copy) {
     _copied.try_emplace(&original, Copied{Ref<XMLNode>(&original), Ref<XMLNode>(&copy)});
 }
 
 // The child, attribute or namespace of the element that the node stands in; the node itself where
 // it stands in the element no more.
-XMLNode& CopyScope::topOf(XMLNode& node) const {
+XMLNode& KeptCopies::topOf(XMLNode& node) const {
     XMLNode* top = &node;
     while (top->parent() != nullptr && top->parent() != &_element)
         top = top->parent();
     return top->parent() != nullptr ? *top : node;
 }
 
-bool CopyScope::copyWhole(XMLNode& top, ReadingBudget& budget, ReadingBudget::ErrorSlot error) {
+bool KeptCopies::copyWhole(XMLNode& top, ReadingBudget& budget, ReadingBudget::ErrorSlot error) {
     XMLElement* element = top.asElement();
     if (element == nullptr) {
         add(top, *top.copy());
@@ -35,8 +33,8 @@ bool CopyScope::copyWhole(XMLNode& top, ReadingBudget& budget, ReadingBudget::Er
 }
 
 // Attributes and namespaces are paired as they stand, while both elements are as they were copied.
-void CopyScope::pairAttributes(const XMLElement& original, const XMLElement& copy) {
-    const auto pair = [this](qx::XMLNodeRange originals, qx::XMLNodeRange copies) {
+void KeptCopies::pairAttributes(const XMLElement& original, const XMLElement& copy) {
+    const auto pair = [this](XMLNodeRange originals, XMLNodeRange copies) {
         auto at = copies.begin();
         for (XMLNode& node : originals) {
             if (at == copies.end() || at->name() != node.name())
@@ -49,8 +47,8 @@ void CopyScope::pairAttributes(const XMLElement& original, const XMLElement& cop
     pair(original.namespaces(), copy.namespaces());
 }
 
-Ref<XMLNode> CopyScope::counterpart(XMLNode& node, ReadingBudget& budget,
-                                    ReadingBudget::ErrorSlot error) {
+Ref<XMLNode> KeptCopies::counterpart(XMLNode& node, ReadingBudget& budget,
+                                     ReadingBudget::ErrorSlot error) {
     if (auto known = find(node))
         return known;
     if (_copied.empty())
@@ -68,3 +66,5 @@ Ref<XMLNode> CopyScope::counterpart(XMLNode& node, ReadingBudget& budget,
         return nullptr;
     return find(node);
 }
+
+} // namespace qx::detail

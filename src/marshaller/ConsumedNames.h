@@ -6,15 +6,17 @@
 
 #include <QXXMLMarshalling/model/CountedSet.h>
 
-class NameCounts {
+namespace qx::detail {
+
+class ConsumedNames {
 public:
-    NameCounts() = default;
-    explicit NameCounts(const qx::CountedSet& set) : _rest(set.mutableCopy()) {}
-    NameCounts(const NameCounts& other)
+    ConsumedNames() = default;
+    explicit ConsumedNames(const CountedSet& set) : _rest(set.mutableCopy()) {}
+    ConsumedNames(const ConsumedNames& other)
         : _added(other._added), _next(other._next),
           _rest(other._rest ? other._rest->mutableCopy() : nullptr) {}
-    NameCounts(NameCounts&& other) noexcept = default;
-    NameCounts& operator=(NameCounts other) noexcept {
+    ConsumedNames(ConsumedNames&& other) noexcept = default;
+    ConsumedNames& operator=(ConsumedNames other) noexcept {
         _added.swap(other._added);
         std::swap(_next, other._next);
         std::swap(_rest, other._rest);
@@ -22,11 +24,11 @@ public:
     }
 
     // Not once the first was taken.
-    void add(const qx::String& name) { _added.push_back(name); }
+    void add(const String& name) { _added.push_back(name); }
     // How many were added.
     std::size_t size() const noexcept { return _added.size(); }
     // Lowers the name's count by one; false where it is none.
-    bool take(const qx::String& name) {
+    bool take(const String& name) {
         if (_next < _added.size() && _added[_next].isSameAs(name)) {
             ++_next;
             return true;
@@ -39,7 +41,7 @@ public:
         _rest.reset();
     }
     // Adds the counts to the set: all of them, or none where memory fails.
-    void addTo(qx::CountedSet& set) const {
+    void addTo(CountedSet& set) const {
         std::size_t added = 0;
         try {
             for (; added < _added.size(); ++added)
@@ -49,22 +51,24 @@ public:
             throw;
         }
     }
-    void takeFrom(qx::CountedSet& set) const { takeFrom(set, _added.size()); }
+    void takeFrom(CountedSet& set) const { takeFrom(set, _added.size()); }
 
 private:
-    void takeFrom(qx::CountedSet& set, std::size_t count) const {
+    void takeFrom(CountedSet& set, std::size_t count) const {
         for (std::size_t i = 0; i < count; ++i)
             set.remove(_added[i]);
     }
-    qx::CountedSet& countRest() {
+    CountedSet& countRest() {
         if (!_rest)
-            _rest = qx::make<qx::CountedSet>();
+            _rest = make<CountedSet>();
         for (; _next < _added.size(); ++_next)
             _rest->add(_added[_next]);
         return *_rest;
     }
 
-    std::vector<qx::String> _added;
+    std::vector<String> _added;
     std::size_t _next = 0; // of those that were neither taken nor counted
-    qx::Ref<qx::CountedSet> _rest;
+    Ref<CountedSet> _rest;
 };
+
+} // namespace qx::detail

@@ -2,37 +2,43 @@
 // of the class or field it is given and hands over. A mapping that stands outside the marshaller's
 // own, a copy for instance, gets a plan for the time of the call.
 
-#include "marshaller/Marshalling.h"
-#include "marshaller/Unmarshalling.h"
+#include "marshaller/FieldBinding.h"
 
 using qx::CountedSet;
 using qx::Error;
 using qx::Object;
 using qx::Ref;
 using qx::XMLElement;
+using namespace qx::detail;
 
 namespace {
 
 class PlanOfClass {
 public:
-    PlanOfClass(const MappingPlan& plan, const QXXMLClassMapping& mapping)
-        : _own(plan.classOf(mapping) == nullptr ? plan.planFor(mapping) : nullptr),
-          _plan(_own ? *_own : *plan.classOf(mapping)) {}
+    PlanOfClass(const QXXMLMarshaller& marshaller, const QXXMLClassMapping& mapping)
+        : PlanOfClass(MappingPlan::of(marshaller.mapping()), mapping) {}
     const ClassPlan& operator*() const noexcept { return _plan; }
 
 private:
+    PlanOfClass(const MappingPlan& plan, const QXXMLClassMapping& mapping)
+        : _own(plan.classOf(mapping) == nullptr ? plan.planFor(mapping) : nullptr),
+          _plan(_own ? *_own : *plan.classOf(mapping)) {}
+
     std::unique_ptr<ClassPlan> _own;
     const ClassPlan& _plan;
 };
 
 class PlanOfField {
 public:
-    PlanOfField(const MappingPlan& plan, const QXXMLFieldMapping& mapping)
-        : _own(plan.fieldOf(mapping) == nullptr ? plan.planFor(mapping) : FieldPlan()),
-          _plan(plan.fieldOf(mapping) == nullptr ? _own : *plan.fieldOf(mapping)) {}
+    PlanOfField(const QXXMLMarshaller& marshaller, const QXXMLFieldMapping& mapping)
+        : PlanOfField(MappingPlan::of(marshaller.mapping()), mapping) {}
     const FieldPlan& operator*() const noexcept { return _plan; }
 
 private:
+    PlanOfField(const MappingPlan& plan, const QXXMLFieldMapping& mapping)
+        : _own(plan.fieldOf(mapping) == nullptr ? plan.planFor(mapping) : FieldPlan()),
+          _plan(plan.fieldOf(mapping) == nullptr ? _own : *plan.fieldOf(mapping)) {}
+
     FieldPlan _own;
     const FieldPlan& _plan;
 };
@@ -75,11 +81,11 @@ private:
     }
 
     Unmarshalling _unmarshalling;
-    ElementSource _source;
+    ChildLookup _source;
     CountedSet& _fieldSet;
     CountedSet& _attributeSet;
-    NameCounts _fields;
-    NameCounts _attributes;
+    ConsumedNames _fields;
+    ConsumedNames _attributes;
 };
 
 } // namespace
@@ -90,26 +96,27 @@ Ref<XMLElement> QXXMLMarshaller::marshallObject(const qx::Value& object, Ref<Err
 
 Ref<XMLElement> QXXMLMarshaller::elementWithMapping(const QXXMLClassMapping& mapping,
                                                     Object& object, Ref<Error>* error) {
-    const PlanOfClass plan(this->plan(), mapping);
+    const PlanOfClass plan(*this, mapping);
     return Marshalling(*this).element(*plan, (*plan).elementName, &object, error);
 }
 
 bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLElement& element,
                                         Object& object, Ref<Error>* error) {
-    const PlanOfClass plan(this->plan(), mapping);
-    return Marshalling(*this).bindFields(*plan, element, object, error);
+    const PlanOfClass plan(*this, mapping);
+    return Marshalling(*this).writeFields(*plan, element, object, error);
 }
 
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
                                Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
-    return Marshalling(*this).mapField(*plan, element, object, error);
+    const PlanOfField plan(*this, field);
+    return Marshalling(*this).writeField(*plan, element, object, error);
 }
 
 bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
                                const QXXMLFieldMapping& field, Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
-    return Marshalling(*this).mapArray(*plan, element, array, error);
+    const PlanOfField plan(*this, field);
+    Marshalling writing(*this);
+    return writeCollection(writing, *plan, element, array, error);
 }
 
 Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>* error) {
@@ -122,15 +129,15 @@ Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapp
                                                    Ref<Error>* error) {
     if (element == nullptr)
         return nullptr;
-    const PlanOfClass plan(this->plan(), mapping);
-    ElementSource source(*element, nullptr, (*plan).bindingCount);
+    const PlanOfClass plan(*this, mapping);
+    ChildLookup source(*element, nullptr, (*plan).bindingCount);
     return Unmarshalling(*this, element, Unmarshalling::Use::steps)
         .build(*plan, source, isFlattened, error);
 }
 
 Ref<Object> QXXMLMarshaller::allocateClassWithMapping(const QXXMLClassMapping& mapping,
                                                       Ref<Error>*) {
-    const PlanOfClass plan(this->plan(), mapping);
+    const PlanOfClass plan(*this, mapping);
     return Unmarshalling(*this, nullptr, Unmarshalling::Use::steps).allocate(*plan);
 }
 
@@ -147,20 +154,20 @@ bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Ob
                                             XMLElement& element, CountedSet& boundFields,
                                             CountedSet& boundAttributes, bool isFlattened,
                                             Ref<Error>* error) {
-    const PlanOfClass plan(this->plan(), mapping);
+    const PlanOfClass plan(*this, mapping);
     return Step(*this, element, (*plan).bindingCount, boundFields, boundAttributes)
         .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
-            return step.bindFields(*plan, target, error);
+            return step.readFields(*plan, target, error);
         });
 }
 
 bool QXXMLMarshaller::bindField(const QXXMLFieldMapping& field, Object& object, std::size_t,
                                 XMLElement& element, CountedSet& boundFields,
                                 CountedSet& boundAttributes, bool isFlattened, Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
+    const PlanOfField plan(*this, field);
     return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
         .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
-            return step.bindField(*plan, target, error);
+            return step.readField(*plan, target, error);
         });
 }
 
@@ -168,20 +175,20 @@ bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Objec
                                            std::size_t, XMLElement& element,
                                            CountedSet& boundFields, CountedSet& boundAttributes,
                                            Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
+    const PlanOfField plan(*this, field);
     return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
         .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return step.bindAsAttribute(*plan, target, error);
+            return attributeBinding.read(step, *plan, target, error);
         });
 }
 
 bool QXXMLMarshaller::bindFieldAsText(const QXXMLFieldMapping& field, Object& object, std::size_t,
                                       XMLElement& element, CountedSet& boundFields,
                                       CountedSet& boundAttributes, Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
+    const PlanOfField plan(*this, field);
     return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
         .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return step.bindAsText(*plan, target, error);
+            return textBinding.read(step, *plan, target, error);
         });
 }
 
@@ -189,39 +196,40 @@ bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object&
                                          std::size_t, XMLElement& element, CountedSet& boundFields,
                                          CountedSet& boundAttributes, bool isFlattened,
                                          Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
+    const PlanOfField plan(*this, field);
+    const FieldBinding& binding = (*plan).isContainer ? elementBinding : flattenedBinding;
     return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
         .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
-            return step.bindAsElement(*plan, target, error);
+            return binding.read(step, *plan, target, error);
         });
 }
 
 bool QXXMLMarshaller::bindCollectionField(const QXXMLFieldMapping& field, Object& object,
                                           XMLElement& element, CountedSet& boundFields,
                                           CountedSet& boundAttributes, Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
+    const PlanOfField plan(*this, field);
     return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
         .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return step.bindCollection(*plan, target, error);
+            return readCollection(step, *plan, target, error);
         });
 }
 
 bool QXXMLMarshaller::bindArrayFieldByType(const QXXMLFieldMapping& field, Object& object,
                                            XMLElement& element, CountedSet& boundFields,
                                            CountedSet& boundAttributes, Ref<Error>* error) {
-    const PlanOfField plan(this->plan(), field);
+    const PlanOfField plan(*this, field);
     return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
         .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return step.bindArrayByType(*plan, target, error);
+            return readCollectionByType(step, *plan, target, error);
         });
 }
 
 bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
                                           const CountedSet& boundAttributes, XMLElement& element,
                                           Object& object, Ref<Error>* error) {
-    NameCounts fields(boundFields);
-    NameCounts attributes(boundAttributes);
-    ElementSource source(element, nullptr, 0);
+    ConsumedNames fields(boundFields);
+    ConsumedNames attributes(boundAttributes);
+    ChildLookup source(element, nullptr, 0);
     const Ref<Object> held(&object);
     return Unmarshalling(*this, &element, Unmarshalling::Use::steps)
         .validate(nullptr, {object, source, {fields, attributes}, false}, error);
@@ -229,9 +237,9 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
 
 bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,
                      const QXXMLFieldMapping& field, Ref<Error>* error) {
-    return Unmarshalling::takeValue(object, MappingPlan::simplePlanFor(field), key, value, error);
+    return takeValue(object, FieldPlan::withoutClasses(field), key, value, error);
 }
 
 qx::String StringValueOfObjectWithMapping(const qx::Value& value, const QXXMLFieldMapping& field) {
-    return Marshalling::text(value, MappingPlan::simplePlanFor(field).valueType);
+    return textOf(value, FieldPlan::withoutClasses(field).valueType);
 }

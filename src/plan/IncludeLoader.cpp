@@ -1,11 +1,9 @@
+#include "plan/IncludeLoader.h"
+
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/base/Exception.h>
 
-#include "plan/IncludeLoader.h"
-
-using qx::Error;
-using qx::Ref;
-using qx::String;
+namespace qx::detail {
 
 namespace {
 
@@ -33,7 +31,7 @@ bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error
         const bool isCycle = std::any_of(_open.begin(), _open.end(),
                                          [&](const String* open) { return *open == href; });
         if (isCycle || _open.size() == deepestInclude || _count == mostIncludes)
-            return qx::fail(error, qx::errors::unableToLoadInclude, href);
+            return fail(error, errors::unableToLoadInclude, href);
         ++_count;
         _open.push_back(&href);
         if (!loadInclude(*manager, href, error))
@@ -52,8 +50,8 @@ bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager, const
     if (!problem) {
         try {
             loaded = resolve(document.get(), &problem);
-        } catch (const qx::Exception&) {
-            return qx::fail(error, qx::errors::unableToLoadInclude, href);
+        } catch (const Exception&) {
+            return fail(error, errors::unableToLoadInclude, href);
         }
     }
     if (!loaded && error != nullptr)
@@ -61,11 +59,13 @@ bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager, const
     return loaded;
 }
 
-bool IncludeLoader::resolve(qx::XMLDocument* document, Ref<Error>* error) {
-    qx::XMLElement* const root = document != nullptr ? document->rootElement() : nullptr;
+bool IncludeLoader::resolve(XMLDocument* document, Ref<Error>* error) {
+    XMLElement* const root = document != nullptr ? document->rootElement() : nullptr;
     const auto mapping = QXXMLDocumentMapping::initWithXML(root, error);
     if (!mapping || *error)
         return false;
     _included.push_back(mapping);
     return load(*mapping, error);
 }
+
+} // namespace qx::detail

@@ -1,9 +1,6 @@
-#include "marshaller/ElementSource.h"
+#include "marshaller/ChildLookup.h"
 
-using qx::Ref;
-using qx::String;
-using qx::XMLElement;
-using qx::XMLNode;
+namespace qx::detail {
 
 namespace {
 
@@ -12,10 +9,10 @@ constexpr std::size_t scanLimit = 256;
 
 } // namespace
 
-std::unique_ptr<ElementSource> ElementSource::copyOf(const ElementSource& other) {
-    auto copy = std::make_unique<ElementSource>(other._element, nullptr, other._lookups);
-    copy->_ownScope = std::make_unique<CopyScope>(other._element);
-    copy->_scope = copy->_ownScope.get();
+std::unique_ptr<ChildLookup> ChildLookup::copyOf(const ChildLookup& other) {
+    auto copy = std::make_unique<ChildLookup>(other._element, nullptr, other._lookups);
+    copy->_ownCopies = std::make_unique<KeptCopies>(other._element);
+    copy->_copies = copy->_ownCopies.get();
     copy->_children = std::make_unique<Children>();
     copy->_children->list.reserve(other._element.childCount());
     other.forEachChild(
@@ -23,14 +20,14 @@ std::unique_ptr<ElementSource> ElementSource::copyOf(const ElementSource& other)
     return copy;
 }
 
-void ElementSource::list() {
+void ChildLookup::list() {
     _children = std::make_unique<Children>();
     _children->list.reserve(_element.childCount());
     for (XMLNode& child : _element.children())
         _children->list.push_back({Ref<XMLNode>(&child)});
 }
 
-void ElementSource::index() {
+void ChildLookup::index() {
     _children->indexed = true;
     auto& list = _children->list;
     for (std::uint32_t i = 0; i < list.size(); ++i) {
@@ -45,7 +42,7 @@ void ElementSource::index() {
     }
 }
 
-void ElementSource::indexIfWorthIt() {
+void ChildLookup::indexIfWorthIt() {
     if (_children && _children->indexed)
         return;
     const std::size_t children = _children ? _children->list.size() : _element.childCount();
@@ -57,7 +54,7 @@ void ElementSource::indexIfWorthIt() {
 }
 
 template <class Visit>
-void ElementSource::forEachNamed(const String& name, Visit visit) {
+void ChildLookup::forEachNamed(const String& name, Visit visit) {
     indexIfWorthIt();
     const auto isOne = [&](const XMLNode& node) { return node.isElement() && node.name() == name; };
     if (!_children) {
@@ -79,7 +76,7 @@ void ElementSource::forEachNamed(const String& name, Visit visit) {
             return;
 }
 
-ElementSource::Found ElementSource::find(const String& name) {
+ChildLookup::Found ChildLookup::find(const String& name) {
     Found found;
     forEachNamed(name, [&](XMLElement& child) {
         found.several = found.first != nullptr;
@@ -90,13 +87,13 @@ ElementSource::Found ElementSource::find(const String& name) {
     return found;
 }
 
-XMLElement* ElementSource::last(const String& name) {
+XMLElement* ChildLookup::last(const String& name) {
     XMLElement* last = nullptr;
     forEachNamed(name, [&](XMLElement& child) { return (last = &child) != nullptr; });
     return last;
 }
 
-ElementSource::Nodes ElementSource::all(const String& name) {
+ChildLookup::Nodes ChildLookup::all(const String& name) {
     Nodes nodes;
     forEachNamed(name, [&](XMLElement& child) {
         nodes.emplace_back(&child);
@@ -105,26 +102,26 @@ ElementSource::Nodes ElementSource::all(const String& name) {
     return nodes;
 }
 
-ElementSource::Nodes ElementSource::all() const {
+ChildLookup::Nodes ChildLookup::all() const {
     Nodes nodes;
     forEachChild([&](XMLNode& child) { nodes.emplace_back(&child); });
     return nodes;
 }
 
-String ElementSource::stringValue() const {
-    if (!_ownScope)
+String ChildLookup::stringValue() const {
+    if (!_ownCopies)
         return _element.stringValue();
     std::string text;
     forEachChild([&](const XMLNode& child) {
-        if (child.isElement() || child.kind() == qx::XMLNodeKind::text)
+        if (child.isElement() || child.kind() == XMLNodeKind::text)
             text += child.stringValue().view();
     });
     return text;
 }
 
 // An index is dropped with a child of the element itself, which it lists no longer truly.
-void ElementSource::take(XMLElement& child) {
-    if (!_ownScope) {
+void ChildLookup::take(XMLElement& child) {
+    if (!_ownCopies) {
         _children.reset();
         child.detach();
         return;
@@ -143,9 +140,11 @@ void ElementSource::take(XMLElement& child) {
             listed.taken = true;
 }
 
-Ref<XMLNode> ElementSource::keep(XMLNode& node, ReadingBudget& budget,
-                                 ReadingBudget::ErrorSlot error) const {
+Ref<XMLNode> ChildLookup::keep(XMLNode& node, ReadingBudget& budget,
+                               ReadingBudget::ErrorSlot error) const {
     if (!budget.takeKept(1, _element, error))
         return nullptr;
-    return _scope != nullptr ? _scope->counterpart(node, budget, error) : Ref<XMLNode>(&node);
+    return _copies != nullptr ? _copies->counterpart(node, budget, error) : Ref<XMLNode>(&node);
 }
+
+} // namespace qx::detail

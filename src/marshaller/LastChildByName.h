@@ -8,10 +8,12 @@
 
 #include "plan/MappingPlan.h"
 
-class LastChildren {
+namespace qx::detail {
+
+class LastChildByName {
 public:
     // Null when no child has that name.
-    qx::XMLElement* named(const qx::XMLElement& parent, const qx::String& name) {
+    XMLElement* named(const XMLElement& parent, const String& name) {
         catchUp(parent);
         const auto found = _last.find(name);
         const bool isThere = found != _last.end() && found->second->parent() == &parent;
@@ -19,23 +21,25 @@ public:
     }
 
     // Looks at the children behind the last one that was looked at.
-    void catchUp(const qx::XMLElement& parent) {
+    void catchUp(const XMLElement& parent) {
         const bool goesOn = _seen && _seen->parent() == &parent;
         if (!goesOn)
             _last.clear();
-        qx::XMLNode* child = goesOn ? _seen->nextSibling() : parent.firstChild();
+        XMLNode* child = goesOn ? _seen->nextSibling() : parent.firstChild();
         for (; child != nullptr; child = child->nextSibling())
             see(*child);
     }
 
     // The child was appended, after all others had been looked at.
-    void see(qx::XMLNode& child) {
+    void see(XMLNode& child) {
         if (child.isElement())
-            _last.insert_or_assign(child.name(), qx::Ref<qx::XMLNode>(&child));
-        _seen = qx::Ref<qx::XMLNode>(&child);
+            _last.insert_or_assign(child.name(), Ref<XMLNode>(&child));
+        _seen = Ref<XMLNode>(&child);
     }
 
 private:
-    qx::Ref<qx::XMLNode> _seen;
-    StringMap<qx::Ref<qx::XMLNode>> _last;
+    Ref<XMLNode> _seen;
+    StringMap<Ref<XMLNode>> _last;
 };
+
+} // namespace qx::detail
