@@ -31,14 +31,10 @@ class QX_API QXGenericRecord : public qx::Object {
 public:
     QXGenericRecord();
     static qx::Ref<QXGenericRecord> init();
-    static void* operator new(std::size_t size) { return qx::ObjectMemory::allocate(size); }
-    static void* operator new(std::size_t size, std::align_val_t alignment) {
-        return ::operator new(size, alignment);
-    }
-    static void operator delete(void* memory) noexcept { qx::ObjectMemory::release(memory); }
-    static void operator delete(void* memory, std::align_val_t alignment) noexcept {
-        ::operator delete(memory, alignment);
-    }
+    static void* operator new(std::size_t size);
+    static void* operator new(std::size_t size, std::align_val_t alignment);
+    static void operator delete(void* memory) noexcept;
+    static void operator delete(void* memory, std::align_val_t alignment) noexcept;
     // Removes the undo actions that target the record.
     ~QXGenericRecord() override;
     // The class as data, named "QXGenericRecord". Describing it registers the user default above.

@@ -1,5 +1,6 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "base/BulkObjects.h"
 #include "marshaller/Marshalling.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/LibraryClass.h"
@@ -69,7 +70,7 @@ Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* 
 // The group closes whatever happens: every call is one step to undo.
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
     const qx::UndoGroup group(undoManager());
-    const qx::ObjectMemory::Bulk bulk;
+    const qx::BulkObjects bulk;
     return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
 }
 

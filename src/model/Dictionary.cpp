@@ -14,6 +14,10 @@ namespace qx {
 
 Dictionary::~Dictionary() = default;
 
+void* Dictionary::operator new(std::size_t size) { return detail::ObjectMemory::allocate(size); }
+
+void Dictionary::operator delete(void* memory) noexcept { detail::ObjectMemory::release(memory); }
+
 void Dictionary::checkUnchanged(std::size_t changes) const {
     if (changes != _changes)
         throw Exception(Exception::generic, "a dictionary was changed while it was walked");
@@ -204,7 +208,7 @@ SetOutcome Dictionary::trySetValueForKey(const Value& value, Key key) {
 }
 
 const Class& Dictionary::describedClass() const {
-    using describe::memberProperty;
+    using detail::memberProperty;
     return libraryClass<Dictionary>(
         "qx::Dictionary", {memberProperty<Dictionary, &Dictionary::count>("count"),
                            memberProperty<Dictionary, &Dictionary::allKeys>("allKeys"),

@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Null.h>
@@ -26,6 +27,22 @@ QXGenericRecord::~QXGenericRecord() {
         manager->removeAllActionsWithTarget(this);
 }
 
+void* QXGenericRecord::operator new(std::size_t size) {
+    return qx::detail::ObjectMemory::allocate(size);
+}
+
+void* QXGenericRecord::operator new(std::size_t size, std::align_val_t alignment) {
+    return ::operator new(size, alignment);
+}
+
+void QXGenericRecord::operator delete(void* memory) noexcept {
+    qx::detail::ObjectMemory::release(memory);
+}
+
+void QXGenericRecord::operator delete(void* memory, std::align_val_t alignment) noexcept {
+    ::operator delete(memory, alignment);
+}
+
 namespace {
 
 // The zone is a relic that every caller passes and nobody looks at.
@@ -35,10 +52,10 @@ Ref<QXGenericRecord> copyInZone(const QXGenericRecord& record, const Value&) {
 
 const qx::Class& describe() {
     using Record = QXGenericRecord;
-    using namespace qx::describe;
+    using namespace qx::detail;
     qx::UserDefaults::standardUserDefaults()->registerDefault(
         "NO", AllowMethodForwardingInGenericRecords);
-    return qx::Class::publish(
+    return qx::detail::publish(
         {.name = "QXGenericRecord",
          .type = &typeid(Record),
          .superclass = &typeid(Object),
@@ -128,8 +145,8 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
 // The many first values of a record that is read from a document: nobody is told, and what there is
 // to remember, that the key had no value, can be told later from the contents.
 bool QXGenericRecord::addQuietly(Key key, Value&& value) {
-    const bool isQuiet = (_isFilledQuietly || !_contents) && _tracking.isIdle() && !hasCompany() &&
-                         &isa() == &described;
+    const bool isQuiet = (_isFilledQuietly || !_contents) && _tracking.isIdle() &&
+                         !hasObserversOrWeakRefs() && &isa() == &described;
     return isQuiet && !value.isNull() && !key.view().starts_with('@') &&
            filledContents()->add(key.string(), std::move(value));
 }

@@ -13,8 +13,8 @@ UndoableObject::~UndoableObject() {
 
 const Class& UndoableObject::classObject() {
     using Self = UndoableObject;
-    using describe::instanceOperation;
-    static const Class* const described = &Class::publish(
+    using detail::instanceOperation;
+    static const Class* const described = &detail::publish(
         {.name = "qx::UndoableObject",
          .type = &typeid(Self),
          .superclass = &typeid(Object),

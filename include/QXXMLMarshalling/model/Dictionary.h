@@ -6,7 +6,6 @@
 // while it is walked raises NSGenericException at the walk's next step. Small dictionaries are
 // scanned, larger ones carry an index.
 
-#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/detail/ShortVector.h>
 #include <QXXMLMarshalling/model/Value.h>
 
@@ -29,8 +28,8 @@ public:
     // NOLINTNEXTLINE(modernize-use-equals-default): the room inside would be set to zero first
     Dictionary() noexcept {}
     ~Dictionary() override;
-    static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
-    static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
+    static void* operator new(std::size_t size);
+    static void operator delete(void* memory) noexcept;
 
     class Iterator {
     public:
@@ -134,7 +133,7 @@ private:
     using Index = std::vector<std::uint32_t>; // see NameIndex.h
 
     bool _allInterned = true; // the keys, removed ones too
-    ShortVector<Entry, usualSize> _entries;
+    detail::ShortVector<Entry, usualSize> _entries;
     std::unique_ptr<Index> _index; // null while the entries are scanned
     std::uint32_t _count = 0;
     std::uint32_t _changes = 0;
