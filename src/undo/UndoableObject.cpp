@@ -6,9 +6,14 @@ namespace qx {
 
 UndoableObject::UndoableObject() : _tracking(*this) {}
 
-UndoableObject::~UndoableObject() {
-    if (const Ref<UndoManager>& manager = _tracking.undoManager())
-        manager->removeAllActionsWithTarget(this);
+UndoableObject::~UndoableObject() { endUndo(); }
+
+void UndoableObject::endUndo() noexcept {
+    const Ref<UndoManager> manager = undoManager();
+    if (!manager)
+        return;
+    manager->removeAllActionsWithTarget(this);
+    setUndoManager(nullptr);
 }
 
 const Class& UndoableObject::classObject() {
