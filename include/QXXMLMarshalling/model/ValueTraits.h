@@ -50,8 +50,8 @@ struct ValueTraits;
 // The names of an enumeration's values, for those that documents hold by name. Specialise it:
 //
 //     template <> struct qx::EnumNames<Fix> {
-//         static constexpr auto table = std::to_array<qx::EnumName<Fix>>({{Fix::none, "none"},
-//         {Fix::d2, "2d"}});
+//         static constexpr auto table =
+//             std::to_array<qx::EnumName<Fix>>({{Fix::none, "none"}, {Fix::d2, "2d"}});
 //     };
 //
 // Texts are compared exactly, the first of several names of one value is the one that is written;
