@@ -70,6 +70,20 @@ void Dictionary::set(const String& key, Value value) {
     append(key, std::move(value));
 }
 
+bool Dictionary::add(const String& key, Value&& value) {
+    // The first few keys of most dictionaries are names, which tell themselves apart.
+    const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
+    if (!isFew || value.isNull())
+        return addAny(key, std::move(value));
+    for (const Entry& entry : _entries)
+        if (entry.key.isSameAs(key))
+            return addAny(key, std::move(value));
+    changed();
+    _entries.emplace_back(key, std::move(value));
+    ++_count;
+    return true;
+}
+
 bool Dictionary::addAny(const String& key, Value&& value) {
     refuseNull(key, value);
     if (contains(key))

@@ -75,19 +75,7 @@ public:
     void set(const String& key, Value value);
     // Adds the value unless the key is there; false when it is, and then the value is left alone.
     // Neither may be null.
-    bool add(const String& key, Value&& value) {
-        // The first few keys of most dictionaries are names, which tell themselves apart.
-        const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
-        if (!isFew || value.isNull())
-            return addAny(key, std::move(value));
-        for (const Entry& entry : _entries)
-            if (entry.key.isSameAs(key))
-                return addAny(key, std::move(value));
-        changed();
-        _entries.emplace_back(key, std::move(value));
-        ++_count;
-        return true;
-    }
+    bool add(const String& key, Value&& value);
     // Nothing happens when the key is absent.
     void remove(const String& key);
     void removeAll();
