@@ -1,5 +1,6 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "base/BulkObjects.h"
 #include "model/LibraryClass.h"
 
 using qx::Error;
@@ -60,7 +61,7 @@ Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* 
 // The group closes whatever happens: every call is one step to undo.
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
     const qx::UndoGroup group(undoManager());
-    const qx::ObjectMemory::Bulk bulk;
+    const qx::BulkObjects bulk;
     return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
 }
 

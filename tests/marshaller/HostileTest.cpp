@@ -1,7 +1,7 @@
 // Mappings and documents that multiply: a reading makes, keeps and goes over as much as its limits
 // say, and ends in an error beyond, whatever made it.
 
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 

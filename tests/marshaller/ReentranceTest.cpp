@@ -1,7 +1,7 @@
 // Host objects that turn on the reading that makes them: whatever their setters do to the document,
 // the marshaller and its options, no freed memory is used and no list loses an item.
 
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>

@@ -7,7 +7,7 @@
 #include <functional>
 #include <gtest/gtest.h>
 
-#include "xml/ParseFailure.h"
+#include "support/ErrorRows.h"
 
 namespace {
 
@@ -19,11 +19,12 @@ using namespace std::string_literals;
 
 // The library's own texts; those of the C parser differ among its versions.
 bool isOurs(const qx::Error& error) {
-    const auto& texts = qx::parseErrors::table;
-    return std::any_of(texts.begin(), texts.end(), [&](const qx::ErrorText* text) {
-        const std::string_view message = text->message;
-        return error.code() == text->code && error.localizedDescription().view().starts_with(
-                                                 message.substr(0, message.find("%@")));
+    static const auto rows = support::errorRows(support::parserErrors);
+    return std::any_of(rows.begin(), rows.end(), [&](const auto& row) {
+        const auto& [code, message] = row;
+        return std::to_string(error.code()) == code &&
+               error.localizedDescription().view().starts_with(
+                   message.substr(0, message.find("%@")));
     });
 }
 

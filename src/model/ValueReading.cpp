@@ -1,11 +1,11 @@
-#include <QXXMLMarshalling/model/ValueTraits.h>
+#include <QXXMLMarshalling/detail/ValueReading.h>
 
 #include "base/Base64.h"
 
 #include <charconv>
 #include <cmath>
 
-namespace qx {
+namespace qx::detail {
 
 namespace {
 
@@ -124,4 +124,4 @@ String textOfBytes(const std::vector<std::byte>& bytes) {
     return encodeBase64({reinterpret_cast<const char*>(bytes.data()), bytes.size()});
 }
 
-} // namespace qx
+} // namespace qx::detail
