@@ -1,6 +1,6 @@
 #include "files/Files.h"
 
-#include "support/FileSandbox.h"
+#include "support/TemporaryFolder.h"
 
 #include <gtest/gtest.h>
 
@@ -20,7 +20,7 @@ namespace {
 
 class FilesTest : public ::testing::Test {
 protected:
-    FileSandbox sandbox;
+    TemporaryFolder sandbox;
     const std::string special = " (It is a pipe, a socket or a device.)";
 };
 

@@ -4,11 +4,7 @@
 #include <sstream>
 #include <thread>
 
-#include "support/FileSandbox.h"
-
-// What a sandbox looks at is made once.
-extern "C" void makeLastingObjects();
-extern "C" void makeLastingObjects() { FileSandbox::makeLastingObjects(); }
+#include "support/TemporaryFolder.h"
 
 namespace {
 
@@ -16,7 +12,7 @@ using qx::Ref;
 using qx::XMLDocument;
 
 TEST(XMLDocument, IsReadFromAFileByPathAndByURL) {
-    const FileSandbox files;
+    const TemporaryFolder files;
     const std::string path = files.write("a b.xml", "<a>\n<b/></a>");
     const std::string URL = "file://" + files.root() + "/a%20b.xml";
     EXPECT_EQ(XMLDocument::initWithContentsOfFile(path)->XMLString(), "<a><b></b></a>");
@@ -25,7 +21,7 @@ TEST(XMLDocument, IsReadFromAFileByPathAndByURL) {
 }
 
 TEST(XMLDocument, WhatCannotBeReadIsAnError) {
-    const FileSandbox files;
+    const TemporaryFolder files;
     const std::pair<std::string, int> cases[] = {
         {files.path("missing.xml"), 260}, {files.root(), 256}, {"http://localhost/a.xml", 256}};
     for (const auto& [URL, code] : cases) {
@@ -58,7 +54,7 @@ TEST(XMLDocument, GoesThroughStreams) {
 }
 
 TEST(XMLDocument, IsWrittenWhollyOrNotAtAll) {
-    const FileSandbox files;
+    const TemporaryFolder files;
     const std::string path = files.write("a.xml", "<old/>");
     const auto document = XMLDocument::initWithData("<a><b/></a>");
     EXPECT_TRUE(document->writeToFile(path, qx::XMLCompactEmptyElements));
