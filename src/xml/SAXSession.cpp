@@ -263,7 +263,12 @@ void SAXSession::startDocument() {
     const int standalone = _context->standalone;
     if (!_text.starts_with("<?xml") || _text.size() == 5 || !isWhite(_text[5]))
         return;
-    _document.setVersion(viewOf(_context->version));
+    const std::string_view version = viewOf(_context->version);
+    // The parser takes any version that begins with "1.".
+    if (!isXMLVersion(version))
+        throw ParseFailure(parseErrors::unknownVersion, {version},
+                           _text.find(version) + version.size() + 1);
+    _document.setVersion(version);
     if (standalone == 0 || standalone == 1)
         _document.setStandalone(standalone == 1 ? "yes" : "no");
 }

@@ -1,6 +1,6 @@
 #pragma once
 
-// Which characters XML 1.0 allows, and where.
+// Which characters XML 1.0 allows, and where; which texts are names and versions.
 
 #include <cstddef>
 #include <cstring>
@@ -41,5 +41,7 @@ bool isXMLCharacter(char32_t c) noexcept;
 bool isXMLText(std::string_view text) noexcept;
 // A name of an element, an attribute or a target, colons included.
 bool isXMLName(std::string_view text) noexcept;
+// A version of XML 1: "1." and digits.
+bool isXMLVersion(std::string_view text) noexcept;
 
 } // namespace qx
