@@ -2,8 +2,8 @@
 
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 
-#include "files/FileAccess.h"
 #include "files/Files.h"
+#include "files/Paths.h"
 #include "host/LoadedFile.h"
 #include "host/Localization.h"
 #include "host/PropertyList.h"

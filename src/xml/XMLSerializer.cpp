@@ -395,7 +395,7 @@ XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
     return level;
 }
 
-const XMLNode& XMLSerializer::Place::spelledOut() const {
+const XMLNode& XMLSerializer::Place::asNode() const {
     if (attributeName != nullptr)
         return *node.asElement()->attributeForName(*attributeName);
     return isItsText ? *node.firstChild() : node;
@@ -403,7 +403,7 @@ const XMLNode& XMLSerializer::Place::spelledOut() const {
 
 void XMLSerializer::refuse(std::string_view what, const Place& place) {
     throw Exception(Exception::invalidArgument,
-                    String::concat({what, " at ", placeOf(place.spelledOut())}));
+                    String::concat({what, " at ", placeOf(place.asNode())}));
 }
 
 void XMLSerializer::refuseBeyond(std::string_view what, std::size_t limit, const Place& place) {

@@ -43,7 +43,7 @@ private:
         const XMLNode& node;
         bool isItsText = false;
         const String* attributeName = nullptr; // of the node's attribute
-        const XMLNode& spelledOut() const;
+        const XMLNode& asNode() const;
     };
     enum class Where { text, attribute };
     // The namespace declarations of an open element that has some.

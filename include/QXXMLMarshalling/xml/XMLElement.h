@@ -29,7 +29,7 @@ public:
 
     XMLNode* firstChild() const override {
         if (holdsText())
-            spellTextOut();
+            makeTextNode();
         return _firstChild;
     }
     XMLNode* lastChild() const { return lastOf(firstChild()); }
@@ -47,7 +47,7 @@ public:
     // see XMLNode::children().
     XMLNodeRange attributes() const {
         if (_heldCount != 0)
-            spellAttributesOut();
+            makeAttributeNodes();
         return XMLNodeRange(_firstAttribute);
     }
     // Null when there is none.
@@ -133,7 +133,7 @@ private:
         std::destroy(held().begin(), held().end());
         _heldCount = 0;
     }
-    void spellAttributesOut() const;
+    void makeAttributeNodes() const;
 
     // Attributes and declarations beyond the first few are found by name through an index.
     struct Indexes;
@@ -153,7 +153,7 @@ private:
         _value = std::move(text);
         _childCount = 1;
     }
-    void spellTextOut() const;
+    void makeTextNode() const;
     // The first child that there is a node of.
     static const XMLNode* firstNodeOf(const XMLNode& node) noexcept;
     const XMLNode* following(const XMLNode* node) const noexcept;
