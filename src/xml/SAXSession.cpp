@@ -1,6 +1,6 @@
 #include "xml/SAXSession.h"
 
-#include "xml/ParserText.h"
+#include "xml/CParserText.h"
 #include "xml/XMLCharacters.h"
 #include "xml/XMLLimits.h"
 
@@ -20,9 +20,7 @@ std::uintptr_t addressOf(const void* place) { return reinterpret_cast<std::uintp
 
 // What the parser says, on one line.
 ParseFailure failureOf(const xmlError& error, std::size_t offset) {
-    std::string message = error.message != nullptr ? error.message : "";
-    while (!message.empty() && isWhite(message.back()))
-        message.pop_back();
+    std::string message(withoutTrailingWhite(error.message != nullptr ? error.message : ""));
     std::replace(message.begin(), message.end(), '\n', ' ');
     return {error.code, message, offset};
 }

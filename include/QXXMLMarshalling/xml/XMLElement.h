@@ -102,8 +102,16 @@ private:
     friend class XMLTreeBuilder;
     friend class XMLSerializer;
 
-    // Attributes are held behind the element, in memory that it is made with. They become nodes,
-    // all at once, when somebody asks for a node.
+    // Attributes are held behind the element, in memory that it is made with:
+    //
+    //     | XMLElement | name, value | name, value | (free) |
+    //                    <----- _heldCount ------>
+    //                    <------------ _heldRoom ----------->
+    //
+    // 1. An attribute is held or has a node, and while one is held none has a node: asking for a
+    //    node makes those of all, lazily.
+    // 2. The room is fixed when the element is made, and goes with it. What does not fit is a node.
+    // 3. The element owns them; like all of a document they belong to one thread at a time.
     struct HeldAttribute {
         String name;
         String value;
