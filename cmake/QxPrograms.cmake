@@ -1,5 +1,5 @@
-# The tool, the examples, the benchmarks and the fuzz programs: all of them use the shared library as
-# a host does.
+# The tool, the examples, the benchmarks and the fuzz programs. All but the fuzz programs of one folder
+# use the shared library as a host does.
 
 if(NOT TARGET QXXMLMarshalling)
     return()
@@ -63,14 +63,23 @@ if(QX_BUILD_BENCH AND sources AND CMAKE_BUILD_TYPE MATCHES "^Rel")
         QXXMLMarshalling qx_warnings benchmark::benchmark LibXml2::LibXml2)
 endif()
 
-# fuzz/*.cpp -> one program each
-file(GLOB sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/fuzz/*.cpp")
+# fuzz/*.cpp           -> one program each over the shared library
+# fuzz/<folder>/*.cpp  -> one program each that sees inside: it is linked with that folder of src/ and
+#                         those below it, as the folder's tests are
+file(GLOB sources RELATIVE "${PROJECT_SOURCE_DIR}/fuzz" CONFIGURE_DEPENDS
+    "${PROJECT_SOURCE_DIR}/fuzz/*.cpp" "${PROJECT_SOURCE_DIR}/fuzz/*/*.cpp")
 if(QX_FUZZ AND sources)
     foreach(source IN LISTS sources)
         cmake_path(GET source STEM name)
-        add_executable(fuzz_${name} "${source}")
+        cmake_path(GET source PARENT_PATH folder)
+        add_executable(fuzz_${name} "${PROJECT_SOURCE_DIR}/fuzz/${source}")
         target_compile_options(fuzz_${name} PRIVATE -fsanitize=fuzzer)
         target_link_options(fuzz_${name} PRIVATE -fsanitize=fuzzer)
-        target_link_libraries(fuzz_${name} PRIVATE QXXMLMarshalling qx_warnings)
+        target_link_libraries(fuzz_${name} PRIVATE qx_warnings)
+        if(folder)
+            qx_link_layers(fuzz_${name} ${folder} ${QX_BELOW_${folder}})
+        else()
+            target_link_libraries(fuzz_${name} PRIVATE QXXMLMarshalling)
+        endif()
     endforeach()
 endif()

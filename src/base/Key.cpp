@@ -1,5 +1,6 @@
 #include <QXXMLMarshalling/base/Key.h>
 
+#include "base/Immortal.h"
 #include "base/PropertyNames.h"
 
 #include <algorithm>
@@ -10,13 +11,8 @@
 
 namespace qx {
 
-// The interned names. Never destroyed: keys in static objects outlive every other static.
+// The interned names.
 struct NameTable {
-    static NameTable& shared() {
-        static auto* const table = new NameTable;
-        return *table;
-    }
-
     String::Rep* find(std::string_view name) {
         const std::shared_lock lock(mutex);
         const auto found = names.find(name);
@@ -46,18 +42,18 @@ struct NameTable {
     std::unordered_map<std::string_view, String::Rep*> names;
 };
 
-Key::Key(std::string_view name) : _rep(NameTable::shared().intern(name)) {}
+Key::Key(std::string_view name) : _rep(immortal<NameTable>().intern(name)) {}
 
 Key::Key(const String& name) {
     if (name.isInterned())
         _rep = name._rep;
     else if (!name.isNull())
-        _rep = NameTable::shared().intern(name.view());
+        _rep = immortal<NameTable>().intern(name.view());
 }
 
 Key Key::existing(std::string_view name) noexcept {
     Key key;
-    key._rep = NameTable::shared().find(name);
+    key._rep = immortal<NameTable>().find(name);
     return key;
 }
 

@@ -1,17 +1,31 @@
 #pragma once
 
-// Memory for things that are made in one go and mostly die together: the nodes of a document, its
-// texts, the objects that are read from it. They are cut from blocks, one after the other, and a
-// block is given back when the last thing in it is gone. So what is kept for long keeps its block:
-// some hundred nodes, some dozen objects, a kilobyte of texts. Each thread cuts from blocks of its
-// own; any thread may release anything.
+// An arena for what is made in one go and mostly dies together: the nodes of a document, its texts,
+// the objects that are read from it.
+//
+//              +-------+-------+---------+-------+---------+- - - - - - - - - - - - +
+//     a block  | live  | owner | thing 1 | owner | thing 2 |  not cut yet           |
+//              +-------+-------+---------+-------+---------+- - - - - - - - - - - - +
+//                          |                 |              ^ _next     _left bytes
+//                          +-----------------+---> the block; null: no block, memory of its own
+//
+// 1. Each thread cuts from blocks of its own, without a lock or an atomic operation. Any thread may
+//    release any thing.
+// 2. While a block is being cut, `live` is `reserve` minus the things that have died, so it cannot
+//    come to zero. Once the block is full, or its thread ends, the thread takes back what the
+//    reserve is more than the things that were cut: from then on `live` counts those alive.
+// 3. Whoever brings `live` to zero frees the block, be it a release or the retirement itself.
+// 4. One live thing keeps its whole block allocated: some hundred nodes, some dozen objects, a
+//    kilobyte of texts. So what lives differently long does not share blocks.
+// 5. What is made while a thread ends, after its blocks were retired, gets a block for itself.
+// 6. Under the address sanitizer each thing has memory of its own, without an owner in front: only
+//    then does it see the use of what is dead.
 
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <new>
 
-// The address sanitizer sees the use of what is dead only when each thing has memory of its own.
 #if defined(__SANITIZE_ADDRESS__)
 #define QX_MEMORY_APART 1
 #elif defined(__has_feature)
@@ -30,8 +44,7 @@ public:
     MemoryBlocks(const MemoryBlocks&) = delete;
     MemoryBlocks& operator=(const MemoryBlocks&) = delete;
 
-    // The calling thread's, good until the thread ends. What lives differently long does not share
-    // blocks.
+    // The calling thread's, good until the thread ends.
     static MemoryBlocks& ofNodes() noexcept;
     static MemoryBlocks& ofTexts() noexcept;
     static MemoryBlocks& ofObjects() noexcept;
@@ -59,9 +72,7 @@ public:
     static void release(void* memory) noexcept;
 
 private:
-    // In front of each thing stands the address of its block, null for one that has none.
     struct alignas(void*) Block {
-        // Things alive; while the block is being cut up, `reserve` minus those that died.
         std::atomic<std::uint32_t> live;
     };
     static constexpr std::uint32_t reserve = 1U << 30;

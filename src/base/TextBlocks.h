@@ -1,13 +1,22 @@
 #pragma once
 
-// Memory for the many short texts that reading a document makes.
+// Memory for the many short texts that reading a document makes: strings cut from the text blocks
+// of the thread (MemoryBlocks.h).
+//
+//     in a block   | owner | count | hash | isInBlock 1, size | bytes ... | 0 |
+//     alone                | count | hash | isInBlock 0, size | bytes ... | 0 |
+//
+// 1. The last count, on whatever thread, ends a string: isInBlock says whether its memory goes back
+// to
+//    its block or to the C library.
+// 2. One live text keeps its block allocated, about a kilobyte.
+// 3. A string in a block is never resized in place.
 
 #include <QXXMLMarshalling/base/String.h>
 
 namespace qx {
 
-// The text in a block of memory that it shares with others made on this thread: one live text keeps
-// its block. Long texts have memory of their own.
+// The text in a block; beyond 256 bytes, where a block would be of no use, alone.
 String textInBlock(std::string_view text);
 
 } // namespace qx

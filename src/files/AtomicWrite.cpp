@@ -1,7 +1,10 @@
-#include "files/Files.h"
+#include "files/AtomicWrite.h"
 
-#include "files/FileAccess.h"
+#include "files/Descriptor.h"
+#include "files/Paths.h"
+#include "files/SystemErrors.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <climits>
 #include <cstdio>
@@ -243,6 +246,17 @@ bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>*
     if (parent.isOpen())
         ::fsync(parent.number());
     return true;
+}
+
+bool checkLengthOfPath(const String& path, Ref<Error>* error) {
+    std::size_t longest = 0;
+    for (std::size_t start = 0; start < path.size();) {
+        const std::size_t end = std::min(path.view().find('/', start), path.size());
+        longest = std::max(longest, end - start);
+        start = end + 1;
+    }
+    return (longest <= NAME_MAX && path.size() < PATH_MAX) ||
+           failWriting(error, path, ENAMETOOLONG);
 }
 
 } // namespace qx

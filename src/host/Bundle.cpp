@@ -2,8 +2,9 @@
 
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 
-#include "files/FileAccess.h"
+#include "base/Immortal.h"
 #include "files/Files.h"
+#include "files/Paths.h"
 #include "host/LoadedFile.h"
 #include "host/Localization.h"
 #include "host/PropertyList.h"
@@ -17,12 +18,6 @@ namespace qx {
 namespace {
 
 struct OpenBundles {
-    // Lives for ever: code that runs while the program ends may still ask.
-    static OpenBundles& shared() {
-        static auto* const bundles = new OpenBundles;
-        return *bundles;
-    }
-
     std::mutex mutex;
     std::vector<Ref<Bundle>> bundles; // in the order in which they were opened
     Ref<Bundle> main;                 // set by the host
@@ -68,13 +63,14 @@ String findFrameworkFolder() {
     return folder;
 }
 
+// Looked for once: the library does not move.
+struct FrameworkFolder {
+    const String path = findFrameworkFolder();
+};
+
 } // namespace
 
-const String& frameworkFolder() {
-    // Looked for once: the library does not move.
-    static const String& folder = *new String(findFrameworkFolder());
-    return folder;
-}
+const String& frameworkFolder() { return immortal<FrameworkFolder>().path; }
 
 Bundle::Bundle(String path, Ref<Dictionary> info) noexcept
     : _path(std::move(path)), _info(std::move(info)) {}
@@ -87,7 +83,7 @@ Ref<Bundle> Bundle::bundleWithPath(const String& path) {
     String real = realPath(path);
     if (real.isNull())
         return nullptr;
-    OpenBundles& open = OpenBundles::shared();
+    OpenBundles& open = immortal<OpenBundles>();
     const auto find = [&]() -> Ref<Bundle> {
         for (const auto& bundle : open.bundles)
             if (bundle->bundlePath() == real)
@@ -114,7 +110,7 @@ Ref<Bundle> Bundle::bundleWithPath(const String& path) {
 
 Ref<Bundle> Bundle::mainBundle() {
     Ref<Bundle> bundle;
-    OpenBundles& open = OpenBundles::shared();
+    OpenBundles& open = immortal<OpenBundles>();
     {
         const std::lock_guard lock(open.mutex);
         bundle = open.main;
@@ -136,7 +132,7 @@ Ref<Bundle> Bundle::mainBundle() {
 }
 
 void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
-    OpenBundles& open = OpenBundles::shared();
+    OpenBundles& open = immortal<OpenBundles>();
     Ref<Bundle> former = bundle; // ends after the lock, as do objects that the host gave it
     const std::lock_guard lock(open.mutex);
     std::swap(open.main, former);
@@ -160,7 +156,7 @@ Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
 }
 
 void Bundle::forget(const Ref<Bundle>& bundle) {
-    OpenBundles& open = OpenBundles::shared();
+    OpenBundles& open = immortal<OpenBundles>();
     const std::lock_guard lock(open.mutex);
     std::erase(open.bundles, bundle);
 }
@@ -171,7 +167,7 @@ Ref<Bundle> Bundle::bundleWithIdentifier(const String& identifier) {
     for (const auto& bundle : {mainBundle(), frameworkBundle()})
         if (bundle && bundle->bundleIdentifier() == identifier)
             return bundle;
-    OpenBundles& open = OpenBundles::shared();
+    OpenBundles& open = immortal<OpenBundles>();
     const std::lock_guard lock(open.mutex);
     for (const auto& bundle : open.bundles)
         if (bundle->bundleIdentifier() == identifier)

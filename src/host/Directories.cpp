@@ -1,6 +1,6 @@
 #include "host/Directories.h"
 
-#include "files/Files.h"
+#include "files/Paths.h"
 
 #include <cerrno>
 #include <cstdlib>

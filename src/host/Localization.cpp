@@ -1,5 +1,6 @@
 #include "host/Localization.h"
 
+#include "base/Immortal.h"
 #include "files/Files.h"
 #include "host/LoadedFile.h"
 #include "host/Log.h"
@@ -78,11 +79,6 @@ std::unique_ptr<Language> readLanguage(const String& folder, std::string_view na
 // The texts of each folder and language that were asked for; they stay for ever.
 class Languages {
 public:
-    static Languages& shared() {
-        static auto* const languages = new Languages;
-        return *languages;
-    }
-
     const StringsFile::Texts& textsFor(const String& folder, std::string_view name) {
         {
             const std::lock_guard lock(_mutex);
@@ -122,7 +118,7 @@ String localizedString(const String& folder, std::string_view englishText) {
     const std::string_view language = languageOf(localeName());
     if (folder.isNull() || language.empty() || englishText.empty())
         return englishText;
-    const StringsFile::Texts& texts = Languages::shared().textsFor(folder, language);
+    const StringsFile::Texts& texts = immortal<Languages>().textsFor(folder, language);
     const auto found = texts.find(englishText);
     return found != texts.end() ? found->second : String(englishText);
 }

@@ -2,6 +2,8 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "base/Immortal.h"
+
 #include <cerrno>
 #include <mutex>
 #include <unistd.h>
@@ -11,11 +13,6 @@ namespace qx {
 namespace {
 
 struct State {
-    static State& shared() {
-        static auto* const state = new State;
-        return *state;
-    }
-
     std::mutex mutex;
     String name;
     String version;
@@ -31,7 +28,7 @@ bool isFileName(std::string_view name) {
 } // namespace
 
 String ProcessInfo::processName() {
-    State& state = State::shared();
+    State& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     if (state.name.isNull()) {
         state.name = program_invocation_short_name;
@@ -45,26 +42,26 @@ void ProcessInfo::setProcessName(const String& name) {
     if (!name.isNull() && !isFileName(name))
         throw Exception(Exception::invalidArgument,
                         String::concat({"a process name is a file name, not \"", name, "\""}));
-    State& state = State::shared();
+    State& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     state.name = name;
 }
 
 void ProcessInfo::setProcessVersion(const String& version, const String& build) {
-    State& state = State::shared();
+    State& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     state.version = version;
     state.build = build;
 }
 
 String ProcessInfo::processVersion() {
-    State& state = State::shared();
+    State& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     return state.version;
 }
 
 String ProcessInfo::processBuild() {
-    State& state = State::shared();
+    State& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     return state.build;
 }

@@ -2,7 +2,7 @@
 
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 
-#include "files/Files.h"
+#include "files/Paths.h"
 #include "host/Directories.h"
 #include "host/PropertyList.h"
 #include "model/LibraryClass.h"

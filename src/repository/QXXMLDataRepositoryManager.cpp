@@ -4,6 +4,8 @@
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "base/Immortal.h"
+
 #include <mutex>
 
 using namespace qx;
@@ -14,12 +16,6 @@ const char* const QXXMLDataRepositoryPersistentName = "QXXMLDataRepositoryPersis
 namespace {
 
 struct SharedManager {
-    // Lives for ever: code that runs while the program ends may still ask.
-    static SharedManager& instance() {
-        static auto* const shared = new SharedManager;
-        return *shared;
-    }
-
     std::mutex mutex;
     Ref<QXXMLDataRepositoryManager> manager;
 };
@@ -46,7 +42,7 @@ thread_local bool Making::_active = false;
 } // namespace
 
 Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::defaultManager() {
-    SharedManager& shared = SharedManager::instance();
+    SharedManager& shared = immortal<SharedManager>();
     {
         const std::lock_guard lock(shared.mutex);
         if (shared.manager)
@@ -61,7 +57,7 @@ Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::defaultManager() {
 }
 
 void QXXMLDataRepositoryManager::flushDefaultManager() {
-    SharedManager& shared = SharedManager::instance();
+    SharedManager& shared = immortal<SharedManager>();
     Ref<QXXMLDataRepositoryManager> dropped; // ends after the lock is gone
     const std::lock_guard lock(shared.mutex);
     dropped = std::exchange(shared.manager, nullptr);

@@ -4,8 +4,10 @@
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
 
-#include "files/FileAccess.h"
+#include "files/AtomicWrite.h"
 #include "files/Files.h"
+#include "files/Paths.h"
+#include "files/SystemErrors.h"
 #include "host/Directories.h"
 #include "host/Log.h"
 #include "model/Errors.h"
@@ -208,11 +210,8 @@ String QXXMLFileSystemDataRepository::writeFile(const Ref<Data>& data, const Str
         return nullptr;
     }
     // "maps/a.xml" stands in a folder of its own.
-    if (const std::size_t slash = relative.view().rfind('/'); slash != std::string_view::npos) {
-        const std::string_view folder = relative.view().substr(0, slash);
-        if (!createDirectoryWithParents(appendingPathComponent(directory, folder), error))
-            return nullptr;
-    }
+    if (!createDirectoryWithParents(directoryOf(target), error))
+        return nullptr;
     return writeFileAtomically(target, data->view(), error) ? target : String();
 }
 

@@ -1,8 +1,8 @@
 #include "xml/EntityTexts.h"
 
+#include "xml/AttributeCounts.h"
+#include "xml/CParserText.h"
 #include "xml/ParseFailure.h"
-#include "xml/ParserText.h"
-#include "xml/StartTags.h"
 
 #include <algorithm>
 #include <bitset>

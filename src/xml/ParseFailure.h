@@ -21,6 +21,8 @@ inline constexpr const char* notReadable = "The document's encoding cannot be re
 inline constexpr ErrorText empty{4, "The document is empty", notWellFormed};
 inline constexpr ErrorText noStartTag{3, "Start tag expected, '<' not found", notWellFormed};
 inline constexpr ErrorText zeroByte{9, "The document holds a zero byte", notWellFormed};
+inline constexpr ErrorText unknownVersion{108, "The version %@ is no version of XML",
+                                          notWellFormed};
 inline constexpr ErrorText externalEntity{
     29, "The entity %@ stands outside of the document and is not read", notWellFormed};
 inline constexpr ErrorText undeclaredEntity{26, "The entity %@ is not declared", notWellFormed};

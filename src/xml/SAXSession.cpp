@@ -1,6 +1,6 @@
 #include "xml/SAXSession.h"
 
-#include "xml/ParserText.h"
+#include "xml/CParserText.h"
 #include "xml/XMLCharacters.h"
 #include "xml/XMLLimits.h"
 
@@ -20,9 +20,7 @@ std::uintptr_t addressOf(const void* place) { return reinterpret_cast<std::uintp
 
 // What the parser says, on one line.
 ParseFailure failureOf(const xmlError& error, std::size_t offset) {
-    std::string message = error.message != nullptr ? error.message : "";
-    while (!message.empty() && isWhite(message.back()))
-        message.pop_back();
+    std::string message(withoutTrailingWhite(error.message != nullptr ? error.message : ""));
     std::replace(message.begin(), message.end(), '\n', ' ');
     return {error.code, message, offset};
 }
@@ -263,7 +261,12 @@ void SAXSession::startDocument() {
     const int standalone = _context->standalone;
     if (!_text.starts_with("<?xml") || _text.size() == 5 || !isWhite(_text[5]))
         return;
-    _document.setVersion(viewOf(_context->version));
+    const std::string_view version = viewOf(_context->version);
+    // The parser takes any version that begins with "1.".
+    if (!isXMLVersion(version))
+        throw ParseFailure(parseErrors::unknownVersion, {version},
+                           _text.find(version) + version.size() + 1);
+    _document.setVersion(version);
     if (standalone == 0 || standalone == 1)
         _document.setStandalone(standalone == 1 ? "yes" : "no");
 }

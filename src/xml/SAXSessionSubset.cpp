@@ -2,7 +2,7 @@
 
 #include "xml/SAXSession.h"
 
-#include "xml/ParserText.h"
+#include "xml/CParserText.h"
 
 #include <libxml/SAX2.h>
 #include <libxml/hash.h>

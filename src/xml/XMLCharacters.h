@@ -1,9 +1,10 @@
 #pragma once
 
-// Which characters XML 1.0 allows, and where.
+// Which characters XML 1.0 allows, and where; which texts are names and versions.
+
+#include "base/WhiteSpace.h"
 
 #include <cstddef>
-#include <cstring>
 #include <string>
 #include <string_view>
 
@@ -19,27 +20,12 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
 // Adds the code point in UTF-8.
 void appendCharacter(char32_t c, std::string& text);
 
-// Space, tab, line feed and carriage return.
-constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
-// Layout is blanks for the most part: those are looked at four at a time.
-inline bool isWhite(std::string_view text) noexcept {
-    const char* at = text.data();
-    const char* const end = at + text.size();
-    while (at != end) {
-        if (end - at >= 4 && std::memcmp(at, "    ", 4) == 0)
-            at += 4;
-        else if (isWhite(*at))
-            ++at;
-        else
-            return false;
-    }
-    return true;
-}
-
 bool isXMLCharacter(char32_t c) noexcept;
 // UTF-8 whose every character XML allows in some place of a document.
 bool isXMLText(std::string_view text) noexcept;
 // A name of an element, an attribute or a target, colons included.
 bool isXMLName(std::string_view text) noexcept;
+// A version of XML 1: "1." and digits.
+bool isXMLVersion(std::string_view text) noexcept;
 
 } // namespace qx

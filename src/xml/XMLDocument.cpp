@@ -2,12 +2,14 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "files/AtomicWrite.h"
 #include "files/Files.h"
+#include "files/Paths.h"
 #include "model/Errors.h"
 #include "xml/Encoding.h"
-#include "xml/Siblings.h"
 #include "xml/XMLParser.h"
 #include "xml/XMLSerializer.h"
+#include "xml/XMLSiblings.h"
 
 #include <istream>
 #include <ostream>

@@ -4,7 +4,7 @@
 
 #include "base/MemoryBlocks.h"
 #include "model/ObjectExtras.h"
-#include "xml/Siblings.h"
+#include "xml/XMLSiblings.h"
 
 #include <optional>
 #include <string>
@@ -157,7 +157,7 @@ std::vector<XMLElement*> XMLElement::elementsForName(const String& name) const {
     return found;
 }
 
-void XMLElement::spellTextOut() const {
+void XMLElement::makeTextNode() const {
     auto& self = const_cast<XMLElement&>(*this);
     auto* text = new XMLNode(XMLNodeKind::text, String(), _value);
     self._value = String();
@@ -176,7 +176,7 @@ void XMLElement::insertChild(Ref<XMLNode> child, XMLNode* before) {
     ++_childCount;
 }
 
-void XMLElement::spellAttributesOut() const {
+void XMLElement::makeAttributeNodes() const {
     auto& self = const_cast<XMLElement&>(*this);
     std::vector<Ref<XMLNode>> nodes;
     nodes.reserve(_heldCount);
@@ -192,7 +192,7 @@ XMLNode* XMLElement::attributeForName(const String& name) const {
     // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
     const String wanted = name;
     if (_heldCount != 0 && !attributeValue(wanted).isNull())
-        spellAttributesOut();
+        makeAttributeNodes();
     return findNode(_firstAttribute, wanted);
 }
 

@@ -95,11 +95,8 @@ std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
         return whole.substr(4, whole.size() - 7);
     if (entry.nodeKind() != XMLNodeKind::processingInstruction)
         return whole;
-    std::string_view data = whole.substr(2, whole.size() - 4);
-    data.remove_prefix(std::min(data.size(), name(entry).size()));
-    while (!data.empty() && isWhite(data.front()))
-        data.remove_prefix(1);
-    return data;
+    const std::string_view data = whole.substr(2, whole.size() - 4);
+    return withoutLeadingWhite(data.substr(name(entry).size()));
 }
 
 std::string_view XMLIndex::value(const XMLIndexEntry& entry, std::string& room) const {

@@ -1,22 +1,16 @@
 #include "xml/XMLInput.h"
 
+#include "xml/AttributeCounts.h"
 #include "xml/Encoding.h"
 #include "xml/ParseFailure.h"
-#include "xml/StartTags.h"
 #include "xml/XMLCharacters.h"
 #include "xml/XMLLimits.h"
-
-#include <algorithm>
 
 namespace qx {
 
 namespace {
 
 constexpr std::string_view declarationStart = "<?xml";
-
-void skipWhite(std::string_view& text) {
-    text.remove_prefix(std::min(text.find_first_not_of(" \t\r\n"), text.size()));
-}
 
 // The value of encoding="…" in the XML declaration; null where there is none. What is wrong with a
 // declaration is for the parser to say.
@@ -28,12 +22,10 @@ String encodingInDeclaration(std::string_view text) {
     const std::size_t at = text.find(name);
     if (at == std::string_view::npos || !isWhite(text[at - 1]))
         return nullptr;
-    text.remove_prefix(at + name.size());
-    skipWhite(text);
+    text = withoutLeadingWhite(text.substr(at + name.size()));
     if (!text.starts_with('='))
         return nullptr;
-    text.remove_prefix(1);
-    skipWhite(text);
+    text = withoutLeadingWhite(text.substr(1));
     if (!text.starts_with('"') && !text.starts_with('\''))
         return nullptr;
     const std::size_t end = text.find(text.front(), 1);

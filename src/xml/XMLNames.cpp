@@ -1,7 +1,7 @@
 #include "xml/XMLNames.h"
 
+#include "xml/CParserText.h"
 #include "xml/ParseFailure.h"
-#include "xml/ParserText.h"
 
 #include <new>
 

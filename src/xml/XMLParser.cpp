@@ -45,10 +45,11 @@ private:
     XMLIndex::Number readElement(XMLIndex::Number number) {
         const XMLIndexEntry& element = _index[number];
         XMLIndex::Number end = number + 1;
-        while (end < element.next && _index[end].isAttributeOrNamespace())
-            ++end;
+        std::size_t attributes = 0;
+        for (; end < element.next && _index[end].isAttributeOrNamespace(); ++end)
+            attributes += _index[end].nodeKind() == XMLNodeKind::attribute;
         _position.moveTo(element.begin);
-        _builder.startElement(_index.name(element), end - number - 1, _position.line(),
+        _builder.startElement(_index.name(element), attributes, _position.line(),
                               _position.column());
         for (++number; number < end; ++number) {
             const XMLIndexEntry& entry = _index[number];

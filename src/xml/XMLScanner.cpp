@@ -110,7 +110,7 @@ inline void XMLScanner::finish(XMLIndexEntry& entry, const char* end) {
 }
 
 void XMLScanner::scanDocument() {
-    if (startsWith("<?xml") && is(_text[5], whiteByte))
+    if (startsWith("<?xml") && is(_at[5], whiteByte))
         scanDeclaration();
     scanMisc();
     require(*_at == '<');

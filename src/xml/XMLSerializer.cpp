@@ -4,7 +4,6 @@
 
 #include "xml/Encoding.h"
 #include "xml/XMLCharacters.h"
-#include "xml/XMLLimits.h"
 
 #include <algorithm>
 #include <array>
@@ -15,12 +14,6 @@ namespace {
 
 bool holds(std::string_view text, std::string_view part) {
     return text.find(part) != std::string_view::npos;
-}
-
-// "1." and digits.
-bool isVersion(std::string_view text) {
-    return text.size() > 2 && text.starts_with("1.") &&
-           text.find_first_not_of("0123456789", 2) == std::string_view::npos;
 }
 
 // Bytes that can be copied from text as they are.
@@ -68,8 +61,7 @@ void XMLSerializer::writeDocument(const XMLDocument& document) {
         if (has(XMLPrettyPrint))
             _output += '\n';
     }
-    if (_reading != nullptr && _output.size() > xmlLimits::documentSize)
-        refuseBeyond("the document is larger than", xmlLimits::documentSize, {document});
+    _limits.requireDocument(_output.size(), document);
 }
 
 void XMLSerializer::writeDeclaration(const XMLDocument& document) {
@@ -78,7 +70,7 @@ void XMLSerializer::writeDeclaration(const XMLDocument& document) {
     const String& standalone = document.standalone();
     if (version.isEmpty() && encoding.isEmpty() && standalone.isEmpty())
         return;
-    if (isChecked() && !version.isEmpty() && !isVersion(version))
+    if (isChecked() && !version.isEmpty() && !isXMLVersion(version))
         refuse("the version is no XML version", {document});
     if (isChecked() && !standalone.isEmpty() && standalone != "yes" && standalone != "no")
         refuse("standalone is neither yes nor no", {document});
@@ -105,10 +97,10 @@ void XMLSerializer::writeTree(const XMLNode& top) {
         if (element != nullptr && element->holdsText()) {
             startTag(*element);
             const String text = element->_value;
-            requireSize(text.size(), "a text is larger than", {*element, true});
+            _limits.requireSize(text.size(), "a text is larger than", {*element, true});
             writeEscaped(text, Where::text, isWhite(text), {*element, true});
             endTag(*element);
-            leave();
+            _limits.leave();
         } else if (element != nullptr) {
             startElement(*element);
             if (const XMLNode* child = element->firstChild()) {
@@ -147,8 +139,7 @@ void XMLSerializer::startTag(const XMLElement& element) {
         ++attributes;
         declarations += isDeclaration(name) ? 1 : 0;
     });
-    if (_reading != nullptr)
-        enter(element, attributes, declarations);
+    _limits.enter(element, attributes, declarations);
     if (element.childCount() != 0 || !has(XMLCompactEmptyElements))
         _output += '>';
 }
@@ -160,7 +151,7 @@ void XMLSerializer::startElement(const XMLElement& element) {
 }
 
 void XMLSerializer::endElement(const XMLElement& element) {
-    leave();
+    _limits.leave();
     if (has(XMLPrettyPrint)) {
         const bool ownLine = element.firstChild() != nullptr && !_levels.back().isInline();
         _levels.pop_back();
@@ -183,7 +174,7 @@ void XMLSerializer::endTag(const XMLElement& element) {
 void XMLSerializer::writeLeaf(const XMLNode& node) {
     const String text = node.stringValue();
     if (node.kind() != XMLNodeKind::text)
-        _textSize = 0;
+        _limits.endText();
     switch (node.kind()) {
     case XMLNodeKind::attribute:
         writeAttribute(node.name(), text,
@@ -195,7 +186,7 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
     case XMLNodeKind::comment:
         if (isChecked() && (holds(text, "--") || text.view().ends_with('-')))
             refuse(R"(a comment holds "--" or ends in "-")", {node});
-        requireSize(text.size(), "a comment is larger than", {node});
+        _limits.requireSize(text.size(), "a comment is larger than", {node});
         _output += "<!--";
         writeLiteral(text, {node});
         _output += "-->";
@@ -204,7 +195,7 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
         if (isChecked() && (holds(text, "?>") || node.name().equalsIgnoringCase("xml") ||
                             (!text.isEmpty() && isWhite(text.view().front()))))
             refuse("a processing instruction would not be read back as it is", {node});
-        requireSize(text.size(), "a processing instruction is larger than", {node});
+        _limits.requireSize(text.size(), "a processing instruction is larger than", {node});
         _output += "<?";
         writeName(node.name(), {node});
         if (!text.isEmpty())
@@ -223,13 +214,13 @@ bool XMLSerializer::isDeclaration(const String& attribute) noexcept {
 }
 
 void XMLSerializer::writeAttribute(const String& name, const String& value,
-                                   const XMLElement* parent, const Place& place) {
-    requireSize(value.size(), "an attribute's value is larger than", place);
+                                   const XMLElement* parent, const XMLPlace& place) {
+    _limits.requireSize(value.size(), "an attribute's value is larger than", place);
     if (isChecked() && isDeclaration(name)) {
         const String prefix = name.view().substr(std::min<std::size_t>(name.size(), 6));
         if (parent != nullptr && parent->findNode(parent->_firstNamespace, prefix) != nullptr)
             refuse("a namespace is declared twice", place);
-        countURI(value, place);
+        _limits.countURI(value, place);
     }
     writeName(name, place);
     _output += "=\"";
@@ -244,8 +235,9 @@ void XMLSerializer::writeNamespace(const XMLNode& declaration) {
         writeName(declaration.name(), {declaration});
     }
     _output += "=\"";
-    requireSize(declaration._value.size(), "a namespace's URI is larger than", {declaration});
-    countURI(declaration._value, {declaration});
+    _limits.requireSize(declaration._value.size(), "a namespace's URI is larger than",
+                        {declaration});
+    _limits.countURI(declaration._value, {declaration});
     writeEscaped(declaration._value, Where::attribute, true, {declaration});
     _output += '"';
 }
@@ -253,13 +245,12 @@ void XMLSerializer::writeNamespace(const XMLNode& declaration) {
 // White space with a line break would be dropped as layout when the document is read again.
 void XMLSerializer::writeText(const XMLNode& text) {
     const String value = text.stringValue();
-    _textSize += value.size();
-    requireSize(_textSize, "a text is larger than", {text});
+    _limits.addText(value.size(), {text});
     writeEscaped(value, Where::text, !text._isLayout && isWhite(value), {text});
 }
 
 void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escapesBreaks,
-                                 const Place& place) {
+                                 const XMLPlace& place) {
     std::size_t written = 0;
     const auto replace = [&](std::size_t from, std::size_t to, std::string_view by) {
         _output += text.substr(written, from - written);
@@ -290,7 +281,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
     _output += text.substr(written);
 }
 
-void XMLSerializer::writeLiteral(std::string_view text, const Place& place) {
+void XMLSerializer::writeLiteral(std::string_view text, const XMLPlace& place) {
     if (isChecked() && !isXMLText(text))
         refuse("a text holds what is no XML character", place);
     if (_encoder != nullptr)
@@ -303,7 +294,7 @@ void XMLSerializer::writeLiteral(std::string_view text, const Place& place) {
     _output += text;
 }
 
-void XMLSerializer::writeName(const String& name, const Place& place) {
+void XMLSerializer::writeName(const String& name, const XMLPlace& place) {
     const char* const address = name.view().data();
     const char*& checked = _checked[reinterpret_cast<std::uintptr_t>(address) / 16 % nameSlots];
     if (isChecked() && (checked != address || address == nullptr)) {
@@ -315,59 +306,10 @@ void XMLSerializer::writeName(const String& name, const Place& place) {
     _output += name;
 }
 
-void XMLSerializer::checkName(const String& name, const Place& place) {
+void XMLSerializer::checkName(const String& name, const XMLPlace& place) {
     if (!isXMLName(name))
         refuse("a name is no XML name", place);
-    if (_reading != nullptr)
-        countName(name, place);
-}
-
-void XMLSerializer::enter(const XMLElement& element, std::size_t attributes,
-                          std::size_t declarations) {
-    if (++_depth > _reading->maximumDepth)
-        refuseBeyond("elements nest deeper than", _reading->maximumDepth, {element});
-    if (attributes > xmlLimits::attributes)
-        refuseBeyond("an element has more attributes than", xmlLimits::attributes, {element});
-    _textSize = 0;
-    if (declarations == 0)
-        return;
-    _declarations.push_back({_depth, declarations});
-    _namespaces += declarations;
-    if (_namespaces > xmlLimits::namespaces)
-        refuseBeyond("more namespace declarations are in force than", xmlLimits::namespaces,
-                     {element});
-}
-
-void XMLSerializer::leave() noexcept {
-    if (_reading == nullptr)
-        return;
-    if (!_declarations.empty() && _declarations.back().depth == _depth) {
-        _namespaces -= _declarations.back().count;
-        _declarations.pop_back();
-    }
-    --_depth;
-    _textSize = 0;
-}
-
-void XMLSerializer::requireSize(std::size_t size, std::string_view what, const Place& place) const {
-    if (_reading != nullptr && size > _reading->maximumTextSize)
-        refuseBeyond(what, _reading->maximumTextSize, place);
-}
-
-void XMLSerializer::countName(const String& name, const Place& place) {
-    requireSize(name.size(), "a name is larger than", place);
-    if (_names.insert(name).second)
-        requireFewNames(place);
-}
-
-void XMLSerializer::countURI(const String& URI, const Place& place) {
-    if (_reading != nullptr && _URIs.insert(URI).second)
-        requireFewNames(place);
-}
-
-void XMLSerializer::requireFewNames(const Place& place) const {
-    if (_names.size() + _URIs.size() > xmlLimits::names)
-        refuseBeyond("the document has more different names than", xmlLimits::names, place);
+    _limits.countName(name, place);
 }
 
 // Empty texts, which no line would show, may stand among nodes that have lines of their own.
@@ -399,69 +341,6 @@ XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
     }
     level.isMixed = level.isMixed || !hasMarkup;
     return level;
-}
-
-const XMLNode& XMLSerializer::Place::spelledOut() const {
-    if (attributeName != nullptr)
-        return *node.asElement()->attributeForName(*attributeName);
-    return isItsText ? *node.firstChild() : node;
-}
-
-void XMLSerializer::refuse(std::string_view what, const Place& place) {
-    throw Exception(Exception::invalidArgument,
-                    String::concat({what, " at ", placeOf(place.spelledOut())}));
-}
-
-void XMLSerializer::refuseBeyond(std::string_view what, std::size_t limit, const Place& place) {
-    refuse(std::string(what) + " the limit of " + std::to_string(limit), place);
-}
-
-std::string placeOf(const XMLNode& node) {
-    // How many levels are named; what stands above them is left out.
-    constexpr std::size_t namedLevels = 32;
-    std::string place;
-    std::size_t named = 0;
-    const XMLNode* at = &node;
-    for (; at != nullptr && at->kind() != XMLNodeKind::document && named < namedLevels;
-         at = at->parent(), ++named) {
-        std::size_t before = 0;
-        bool isAlone = true;
-        const auto isLike = [at](const XMLNode& other) {
-            return &other != at && other.kind() == at->kind() && other.name() == at->name();
-        };
-        for (const XMLNode* other = at->previousSibling(); other; other = other->previousSibling())
-            before += isLike(*other);
-        for (const XMLNode* other = at->nextSibling(); other && isAlone;
-             other = other->nextSibling())
-            isAlone = !isLike(*other);
-        std::string step = "/";
-        switch (at->kind()) {
-        case XMLNodeKind::attribute:
-            step += '@';
-            break;
-        case XMLNodeKind::namespaceDeclaration:
-            step += at->name().isEmpty() ? "@xmlns" : "@xmlns:";
-            break;
-        case XMLNodeKind::text:
-            step += "text()";
-            break;
-        case XMLNodeKind::comment:
-            step += "comment()";
-            break;
-        case XMLNodeKind::processingInstruction:
-            step += '?';
-            break;
-        default:
-            break;
-        }
-        step += at->name().view();
-        if (before != 0 || !isAlone)
-            step += "[" + std::to_string(before + 1) + "]";
-        place.insert(0, step);
-    }
-    if (at != nullptr && at->kind() != XMLNodeKind::document)
-        place.insert(0, "...");
-    return place.empty() ? "/" : place;
 }
 
 } // namespace qx

@@ -9,10 +9,10 @@
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include "base/TextBuffer.h"
+#include "xml/WritingLimits.h"
 
 #include <array>
 #include <string>
-#include <unordered_set>
 #include <vector>
 
 namespace qx {
@@ -26,8 +26,8 @@ public:
     // Characters that the encoder lacks, where one is given, become character references.
     XMLSerializer(TextBuffer& output, XMLOptions options, XMLChecks checks,
                   TextEncoder* encoder = nullptr, const XMLParseOptions* reading = nullptr)
-        : _output(output), _options(options), _checks(checks), _encoder(encoder),
-          _reading(reading) {}
+        : _output(output), _options(options), _checks(checks), _encoder(encoder), _limits(reading) {
+    }
 
     void write(const XMLNode& node);
 
@@ -38,22 +38,7 @@ private:
         bool isMixed;   // there is text here or around
         bool isInline() const noexcept { return preserves || isMixed; }
     };
-    // What is being written, for messages: a node, or what an element holds instead of one.
-    struct Place {
-        const XMLNode& node;
-        bool isItsText = false;
-        const String* attributeName = nullptr; // of the node's attribute
-        const XMLNode& spelledOut() const;
-    };
     enum class Where { text, attribute };
-    // The namespace declarations of an open element that has some.
-    struct Declarations {
-        std::size_t depth;
-        std::size_t count;
-    };
-    struct Hash {
-        std::size_t operator()(const String& text) const noexcept { return text.hash(); }
-    };
 
     void writeDocument(const XMLDocument& document);
     void writeDeclaration(const XMLDocument& document);
@@ -64,22 +49,17 @@ private:
     void startTag(const XMLElement& element);
     void endTag(const XMLElement& element);
     void writeAttribute(const String& name, const String& value, const XMLElement* parent,
-                        const Place& place);
+                        const XMLPlace& place);
     void writeNamespace(const XMLNode& declaration);
     void writeText(const XMLNode& text);
-    void writeEscaped(std::string_view text, Where where, bool escapesBreaks, const Place& place);
+    void writeEscaped(std::string_view text, Where where, bool escapesBreaks,
+                      const XMLPlace& place);
     // Text that nothing can be escaped in.
-    void writeLiteral(std::string_view text, const Place& place);
-    void writeName(const String& name, const Place& place);
-    void checkName(const String& name, const Place& place);
+    void writeLiteral(std::string_view text, const XMLPlace& place);
+    void writeName(const String& name, const XMLPlace& place);
+    void checkName(const String& name, const XMLPlace& place);
 
-    // The limits of reading.
-    void enter(const XMLElement& element, std::size_t attributes, std::size_t declarations);
-    void leave() noexcept;
-    void requireSize(std::size_t size, std::string_view what, const Place& place) const;
-    void countName(const String& name, const Place& place);
-    void countURI(const String& URI, const Place& place);
-    void requireFewNames(const Place& place) const;
+    // Of a pretty-printed document.
     void startLine(const XMLNode& child);
     void breakLine(std::size_t depth);
     Level levelOf(const XMLElement& element) const;
@@ -87,9 +67,6 @@ private:
     bool has(XMLOptions option) const noexcept { return (_options & option) != 0; }
     bool isChecked() const noexcept { return _checks == XMLChecks::on; }
     static bool isDeclaration(const String& attribute) noexcept;
-    [[noreturn]] static void refuse(std::string_view what, const Place& place);
-    [[noreturn]] static void refuseBeyond(std::string_view what, std::size_t limit,
-                                          const Place& place);
 
     TextBuffer& _output;
     XMLOptions _options;
@@ -103,17 +80,7 @@ private:
     static constexpr std::size_t nameSlots = 64;
     std::array<const char*, nameSlots> _checked{};
 
-    // Null: there are no limits, and what follows is not kept.
-    const XMLParseOptions* _reading;
-    std::size_t _depth = 0;
-    std::size_t _textSize = 0;   // of the text nodes that stand side by side
-    std::size_t _namespaces = 0; // in force
-    std::vector<Declarations> _declarations;
-    std::unordered_set<String, Hash> _names;
-    std::unordered_set<String, Hash> _URIs;
+    WritingLimits _limits;
 };
-
-// Where the node stands, such as /order/item[2]/@name.
-std::string placeOf(const XMLNode& node);
 
 } // namespace qx

@@ -2,9 +2,9 @@
 
 #include "base/TextBlocks.h"
 #include "xml/ParseFailure.h"
-#include "xml/Siblings.h"
 #include "xml/XMLCharacters.h"
 #include "xml/XMLLimits.h"
+#include "xml/XMLSiblings.h"
 
 #include <algorithm>
 #include <libxml/xmlerror.h>

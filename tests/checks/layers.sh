@@ -34,6 +34,7 @@ room_of() {
     local name=${1#include/QXXMLMarshalling/}
     case $1 in
     src/*) room=${1#src/} && room=${room%%/*} ;;
+    fuzz/*/*) room=${1#fuzz/} && room=${room%%/*} ;; # sees inside that folder, like its tests
     include/QXXMLMarshalling/QXXMLMarshalling.h) room=umbrella ;;
     include/QXXMLMarshalling/detail/* | include/QXXMLMarshalling/*.h)
         room=${name%%/*}
@@ -128,7 +129,7 @@ may_use() {
 # The check has to be able to fail: a small tree with one fault of each kind.
 self_test() {
     local tree=$1 expected actual
-    mkdir -p "$tree"/{cmake,src/{base,xml,mapping,record,marshaller},include/QXXMLMarshalling/{base,detail},tools/t}
+    mkdir -p "$tree"/{cmake,src/{base,xml,mapping,record,marshaller},include/QXXMLMarshalling/{base,detail},tools/t,fuzz/xml}
     put() { printf '%s\n' "${@:2}" >"$tree/$1"; }
     put cmake/layers.txt '# folders' 'base : : detail/Count' 'xml : base :' 'mapping : xml :' 'record : base :' \
         'marshaller : mapping record :'
@@ -143,8 +144,10 @@ self_test() {
     put src/record/QXRecord.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include <fstream>'
     put src/record/Table.h 'class Table {' '    friend class Table;' '    friend class Unknown;'
     put src/marshaller/way.cpp '#include "record/Table.h"' 'class Way {' '#include <QXXMLMarshalling/QXMapping.h>'
+    put fuzz/xml/node.cpp '#include "xml/Node.cpp"' '#include "record/Table.h"'
     put tools/t/main.cpp '#include <QXXMLMarshalling/QXRecord.h>' '#include "record/Table.h"' '#include <fstream>'
-    expected='include/QXXMLMarshalling/QXMapping.h:2: the operating system (<sys/stat.h>) in mapping
+    expected='fuzz/xml/node.cpp:2: xml includes "record/Table.h" of record
+include/QXXMLMarshalling/QXMapping.h:2: the operating system (<sys/stat.h>) in mapping
 include/QXXMLMarshalling/QXRecord.h:2: a public header includes "record/Table.h"
 include/QXXMLMarshalling/base/Value.h:1: base includes <QXXMLMarshalling/QXRecord.h> of record
 include/QXXMLMarshalling/base/Value.h:2: base befriends Way of marshaller

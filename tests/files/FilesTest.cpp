@@ -1,5 +1,8 @@
 #include "files/Files.h"
 
+#include "files/AtomicWrite.h"
+#include "files/Paths.h"
+
 #include "support/TemporaryFolder.h"
 
 #include <gtest/gtest.h>

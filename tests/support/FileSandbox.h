@@ -26,8 +26,6 @@ public:
             setVariable(name, std::nullopt);
         qx::ProcessInfo::setProcessName("Client");
     }
-    FileSandbox(const FileSandbox&) = delete;
-    FileSandbox& operator=(const FileSandbox&) = delete;
     ~FileSandbox() {
         qx::ProcessInfo::setProcessName(nullptr);
         qx::ProcessInfo::setProcessVersion(nullptr);

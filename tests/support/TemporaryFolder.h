@@ -1,13 +1,15 @@
 #pragma once
 
-// A folder that is gone with its object.
+// A folder of its own for a test that reads or writes files, gone with the object.
 
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <map>
 #include <sstream>
 #include <stdexcept>
 #include <string>
+#include <system_error>
 
 #include <unistd.h>
 
@@ -20,12 +22,12 @@ public:
         // Bundles tell their paths without symbolic links.
         _root = std::filesystem::canonical(pattern);
     }
+    TemporaryFolder(const TemporaryFolder&) = delete;
+    TemporaryFolder& operator=(const TemporaryFolder&) = delete;
     ~TemporaryFolder() {
         std::error_code ignored;
         std::filesystem::remove_all(_root, ignored);
     }
-    TemporaryFolder(const TemporaryFolder&) = delete;
-    TemporaryFolder& operator=(const TemporaryFolder&) = delete;
 
     std::string root() const { return _root; }
     std::string path(const std::string& relative) const { return _root + "/" + relative; }

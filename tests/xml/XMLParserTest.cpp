@@ -105,6 +105,8 @@ TEST(XMLParser, WhatIsNoXMLIsAnErrorWithItsPlace) {
         {"<a>\0</a>"s, "1:4 9 The document holds a zero byte"},
         {"<a/>\0"s, "1:5 9 The document holds a zero byte"},
         {"\xEF\xBB\xBF<a>\xC3\xA9<b</a>", "1:7 68"},
+        {"<?xml version='1.'?><a/>", "1:19 108 The version 1. is no version of XML"},
+        {"<?xml version='2.0'?><a/>", "1:20 108"},
         {"<!DOCTYPE a SYSTEM 'x'><a>&x;</a>", "1:30 26 The entity x is not declared"},
         {"<!DOCTYPE a SYSTEM 'x'><a b='&x;'/>", "1:33 26 The entity x is not declared"},
         {"<!DOCTYPE a [<!ENTITY e SYSTEM '/etc/passwd'>]><a>&e;</a>",

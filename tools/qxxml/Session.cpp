@@ -5,6 +5,7 @@
 
 #include "qxxml/Failure.h"
 
+#include <filesystem>
 #include <iostream>
 
 namespace qxxml {
@@ -21,22 +22,17 @@ void standFor(const std::string& application) {
         qx::ProcessInfo::setProcessVersion(application.substr(slash + 1), "");
 }
 
-std::string folderOf(const std::string& path) {
-    const std::size_t slash = path.rfind('/');
-    if (slash == std::string::npos)
-        return ".";
-    return path.substr(0, slash == 0 ? 1 : slash);
-}
-
 } // namespace
 
 Session::Session(const Options& options) : _options(options) {
     standFor(options.application);
-    _documents = QXXMLFileSystemDataRepository::init<Documents>();
-    _documents->searchFirst(options.searchPaths);
-    if (!options.mapping.empty())
-        _documents->searchFirst({folderOf(options.mapping)});
-    QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_documents);
+    _repository = QXXMLFileSystemDataRepository::init<ToolRepository>();
+    _repository->searchFirst(options.searchPaths);
+    if (!options.mapping.empty()) {
+        const auto folder = std::filesystem::path(options.mapping).parent_path();
+        _repository->searchFirst({folder.empty() ? "." : folder.string()});
+    }
+    QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_repository);
 }
 
 qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
@@ -46,7 +42,7 @@ qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
         throw Failure(error, _options.mapping);
     auto marshaller = QXXMLMarshaller::initWithMappingXML(mapping.get(), &error);
     if (!marshaller)
-        throw Failure(error, _documents->failedPath());
+        throw Failure(error, _repository->failedPath());
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);

@@ -3,8 +3,8 @@
 // One run of the tool: the application that it stands for, the places where documents are looked
 // for, and the marshaller that the options ask for. It sets up the process, so there is one.
 
-#include "qxxml/Documents.h"
 #include "qxxml/Options.h"
+#include "qxxml/ToolRepository.h"
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
@@ -15,7 +15,7 @@ public:
     // The options must outlive the session.
     explicit Session(const Options& options);
 
-    Documents& documents() const noexcept { return *_documents; }
+    ToolRepository& repository() const noexcept { return *_repository; }
     // Made from the mapping document, whose own folder is searched first for includes.
     qx::Ref<QXXMLMarshaller> makeMarshaller() const;
     // The object that the marshaller reads from the document; null where no class handles it.
@@ -23,7 +23,7 @@ public:
 
 private:
     const Options& _options;
-    qx::Ref<Documents> _documents;
+    qx::Ref<ToolRepository> _repository;
 };
 
 } // namespace qxxml

@@ -23,14 +23,14 @@ struct Search {
 };
 
 // Asks for the name in one place after the other, as the repository does.
-Search searchFor(const qx::String& name, Documents& documents) {
+Search searchFor(const qx::String& name, ToolRepository& repository) {
     Search search;
-    const auto directories = documents.searchPaths();
-    const auto bundles = documents.searchBundles();
-    documents.setSearchBundles(nullptr);
+    const auto directories = repository.searchPaths();
+    const auto bundles = repository.searchBundles();
+    repository.setSearchBundles(nullptr);
     for (const qx::Value& directory : *directories) {
-        documents.setSearchPaths(qx::make<qx::Array>(std::vector<qx::Value>{directory}));
-        search.lookIn(directory.string(), documents.pathForResourceNamed(name));
+        repository.setSearchPaths(qx::make<qx::Array>(std::vector<qx::Value>{directory}));
+        search.lookIn(directory.string(), repository.pathForResourceNamed(name));
     }
     for (const qx::Value& item : *bundles)
         if (const auto bundle = item.as<qx::Bundle>())
@@ -42,7 +42,7 @@ Search searchFor(const qx::String& name, Documents& documents) {
 
 std::string where(const Options& options) {
     const Session session(options);
-    const Search search = searchFor(options.name, session.documents());
+    const Search search = searchFor(options.name, session.repository());
     std::string looked;
     for (const std::string& place : search.places)
         looked += "looked in " + place + "\n";

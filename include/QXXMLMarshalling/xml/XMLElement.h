@@ -29,7 +29,7 @@ public:
 
     XMLNode* firstChild() const override {
         if (holdsText())
-            spellTextOut();
+            makeTextNode();
         return _firstChild;
     }
     XMLNode* lastChild() const { return lastOf(firstChild()); }
@@ -47,7 +47,7 @@ public:
     // see XMLNode::children().
     XMLNodeRange attributes() const {
         if (_heldCount != 0)
-            spellAttributesOut();
+            makeAttributeNodes();
         return XMLNodeRange(_firstAttribute);
     }
     // Null when there is none.
@@ -102,8 +102,16 @@ private:
     friend class XMLTreeBuilder;
     friend class XMLSerializer;
 
-    // Attributes are held behind the element, in memory that it is made with. They become nodes,
-    // all at once, when somebody asks for a node.
+    // Attributes are held behind the element, in memory that it is made with:
+    //
+    //     | XMLElement | name, value | name, value | (free) |
+    //                    <----- _heldCount ------>
+    //                    <------------ _heldRoom ----------->
+    //
+    // 1. An attribute is held or has a node, and while one is held none has a node: asking for a
+    //    node makes those of all, lazily.
+    // 2. The room is fixed when the element is made, and goes with it. What does not fit is a node.
+    // 3. The element owns them; like all of a document they belong to one thread at a time.
     struct HeldAttribute {
         String name;
         String value;
@@ -133,7 +141,7 @@ private:
         std::destroy(held().begin(), held().end());
         _heldCount = 0;
     }
-    void spellAttributesOut() const;
+    void makeAttributeNodes() const;
 
     // Attributes and declarations beyond the first few are found by name through an index.
     struct Indexes;
@@ -153,7 +161,7 @@ private:
         _value = std::move(text);
         _childCount = 1;
     }
-    void spellTextOut() const;
+    void makeTextNode() const;
     // The first child that there is a node of.
     static const XMLNode* firstNodeOf(const XMLNode& node) noexcept;
     const XMLNode* following(const XMLNode* node) const noexcept;

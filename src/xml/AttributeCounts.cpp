@@ -1,4 +1,4 @@
-#include "xml/StartTags.h"
+#include "xml/AttributeCounts.h"
 
 #include <algorithm>
 

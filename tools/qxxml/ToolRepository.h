@@ -10,7 +10,7 @@
 
 namespace qxxml {
 
-class Documents final : public QXXMLFileSystemDataRepository {
+class ToolRepository final : public QXXMLFileSystemDataRepository {
 public:
     void initializeSearchPaths() override;
     // Puts the folders before those that are there already; they keep their order.

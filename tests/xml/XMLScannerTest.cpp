@@ -1,0 +1,193 @@
+#include "xml/XMLScanner.h"
+
+#include <algorithm>
+#include <gtest/gtest.h>
+#include <random>
+
+#include "xml/XMLParser.h"
+
+namespace {
+
+using qx::XMLNode;
+using qx::XMLParseOptions;
+using qx::XMLParser;
+using qx::XMLScanner;
+using namespace std::string_literals;
+
+std::string placeIn(const XMLNode& node) {
+    return std::to_string(node.line()) + ":" + std::to_string(node.column());
+}
+
+// Every node on a line, children behind their parent.
+void print(const XMLNode& node, std::string& text) {
+    text += std::to_string(static_cast<int>(node.kind())) + node.name().str() + " " + placeIn(node);
+    if (const qx::XMLElement* const element = node.asElement()) {
+        for (const XMLNode& declaration : element->namespaces())
+            text += " ns " + declaration.name().str() + "=" + declaration.stringValue().str();
+        for (const XMLNode& attribute : element->attributes())
+            text += " " + attribute.name().str() + "=" + attribute.stringValue().str();
+    } else {
+        text += "[" + node.stringValue().str() + "]";
+    }
+    text += "\n";
+    for (const XMLNode& child : node.children())
+        print(child, text);
+    text += "\\";
+}
+
+// The whole tree, or the error.
+std::string outcome(std::string_view bytes, const XMLParseOptions& options, XMLParser::Way way) {
+    qx::Ref<qx::Error> error;
+    const auto document = XMLParser::parse(bytes, options, &error, way);
+    if (!document)
+        return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
+               std::to_string(error->code()) + " " + error->localizedDescription().str();
+    std::string text = document->version().str() + "|" + document->standalone().str() + "|" +
+                       document->characterEncoding().str() + "\n";
+    for (const XMLNode& child : document->children())
+        print(child, text);
+    return text;
+}
+
+// Held against each other with white space kept and dropped, and with low limits.
+void expectSame(const std::string& document) {
+    for (const XMLParseOptions& options :
+         {XMLParseOptions{}, XMLParseOptions{.keepWhiteSpace = true},
+          XMLParseOptions{.maximumDepth = 3, .maximumTextSize = 9}})
+        EXPECT_EQ(outcome(document, options, XMLParser::Way::fastest),
+                  outcome(document, options, XMLParser::Way::cParserOnly))
+            << document;
+}
+
+bool isScanned(const std::string& document) { return XMLScanner::scan(document, {}).has_value(); }
+
+const std::string sample =
+    "<?xml version='1.0' encoding=\"UTF-8\" standalone='no' ?>\r\n<!--c\r-->\n<?p d\r\n?>\n"
+    "<r xmlns='u' xmlns:p='v' p:x = \"1 &lt;&#x9;\r\n\t2\" y='\xC3\xA9\"'>\n  <p:e/>t&#65;&amp;\r\n"
+    "<![CDATA[<]]]]><![CDATA[]]>\xF0\x9F\x98\x80]] ><e xml:space='preserve'> \n</e "
+    ">\r</r><!---->\n";
+
+// Read without the C parser: were one of these refused, all comparisons would still hold.
+TEST(XMLScanner, TakesWhatMostDocumentsHold) {
+    for (const std::string& document :
+         {sample, "\n<a/>"s, "<a b='' c=''/><?p?>"s, "<a><![CDATA[]]>\n<![CDATA[]]></a>"s,
+          "<a> \r <b/>\n\r\n</a>"s, "<a>&#13;&#xA;<b/>&#32;\n</a>"s, "<a x='1' p:x='2'/>"s,
+          "<a xmlns=''><b xmlns='u'/></a>"s, "<a><?p  d ?><?q\n?><!-- - --></a>"s,
+          "<\xC3\xA9 \xC3\xA9='\xEF\xBF\xBD'>\x7F</\xC3\xA9>"s, "<a>\n<!--x-->\n<b/> <c/>\n</a>"s,
+          "<a><b>\n x</b>\n \n<b>\n</b></a>"s}) {
+        EXPECT_TRUE(isScanned(document)) << document;
+        expectSame(document);
+    }
+}
+
+TEST(XMLScanner, LeavesTheRestToTheCParser) {
+    for (const std::string& document : {"<!DOCTYPE a><a/>"s,
+                                        "<a>&e;</a>"s,
+                                        "<a>]]></a>"s,
+                                        "<a b='<'/>"s,
+                                        "<a b='1' b='2'/>"s,
+                                        "<a xmlns='' xmlns=''/>"s,
+                                        "<a p:b='1' q:b='2' xmlns:p='u' xmlns:q='u'/>"s,
+                                        "<a xmlns:p=''/>"s,
+                                        "<xmlns:a/>"s,
+                                        "<a xmlns:xml='u'/>"s,
+                                        "<a:b:c/>"s,
+                                        "<:a/>"s,
+                                        "<a>&#0;</a>"s,
+                                        "<a>&#x110000;</a>"s,
+                                        "<a>&#99999999999;</a>"s,
+                                        "<a>&#;</a>"s,
+                                        "<a>\xED\xA0\x80</a>"s,
+                                        "<a>\xC0\x80</a>"s,
+                                        "<a>\xEF\xBF\xBF</a>"s,
+                                        "<a>\xC3"s,
+                                        "<a></a"s,
+                                        "<a></ab>"s,
+                                        "<ab></a>"s,
+                                        "<a/><b/>"s,
+                                        "<a/>x"s,
+                                        "<a b='1'c='2'/>"s,
+                                        "<a b/>"s,
+                                        "<a><!--a--b--></a>"s,
+                                        "<a><!--a--->"s,
+                                        "<?xml version='1.1'?><a/>"s,
+                                        "<?xml version='1.'?><a/>"s,
+                                        "<?xml version='1.0' standalone='maybe'?><a/>"s,
+                                        "<?xml version='1.0'encoding='UTF-8'?><a/>"s,
+                                        "<?xml?><a/>"s,
+                                        "<a><?XML d?></a>"s,
+                                        "<a><?p:q d?></a>"s,
+                                        "<a><?p+?></a>"s,
+                                        "<?xml"s,
+                                        "<1/>"s,
+                                        "<a>\0</a>"s,
+                                        "<a xmlns:p='http://www.w3.org/XML/1998/namespace'/>"s,
+                                        "< a/>"s}) {
+        EXPECT_FALSE(isScanned(document)) << document;
+        expectSame(document);
+    }
+}
+
+TEST(XMLScanner, AgreesOnADocumentCutAnywhere) {
+    for (std::size_t size = 0; size < sample.size(); ++size)
+        expectSame(sample.substr(0, size));
+}
+
+TEST(XMLScanner, AgreesWhateverByteStandsAnywhere) {
+    for (std::size_t at = 0; at < sample.size(); ++at)
+        for (const char byte : "<>&;'\"/=!?-]:x0 \n\r\t\x01\x7F\x80\xC3"s) {
+            std::string document = sample;
+            document[at] = byte;
+            expectSame(document);
+        }
+}
+
+// At each limit, and one beyond.
+TEST(XMLScanner, AgreesOnLimits) {
+    const auto many = [](std::size_t count, std::string_view before, std::string_view behind) {
+        std::string text = "<a";
+        for (std::size_t i = 0; i < count; ++i)
+            text.append(before).append(std::to_string(i)).append(behind);
+        return text;
+    };
+    for (const std::size_t more : {0, 1}) {
+        EXPECT_EQ(isScanned(many(4096 + more, " b", "=''") + "/>"), more == 0);
+        expectSame(many(4096 + more, " b", "=''") + "/>");
+        EXPECT_EQ(isScanned(many(1000 + more, " xmlns:p", "='u'") + "/>"), more == 0);
+        expectSame(many(1000 + more, " xmlns:p", "='u'") + "/>");
+        EXPECT_EQ(isScanned(many(99'999 + more, "><b", "/") + "></a>"), more == 0);
+    }
+}
+
+TEST(XMLScanner, AgreesOnChangedDocuments) {
+    const std::string_view pieces[] = {
+        "<a>",      "</a>",     "<b/>",         "<a ",    " x='1'", " xmlns='u'", " xmlns:p='u'",
+        " p:x='1'", "/>",       "&amp;",        "&#10;",  "]]>",    "]]",         "<![CDATA[",
+        "<!--",     "-->",      "--",           "<?p ",   "?>",     "\r\n",       "\r",
+        "\n  ",     "\xC3\xA9", "\xEF\xBF\xBF", "</p:a>", "<p:a>",  "</r><r>\n",  "'",
+        "\"",       "=",        "<!DOCTYPE r>", "&e;"};
+    std::mt19937 random(7);
+    const auto below = [&](std::size_t limit) { return random() % limit; };
+    for (int round = 0; round < 2000; ++round) {
+        std::string document = sample;
+        for (std::size_t changes = 1 + below(3); changes > 0; --changes) {
+            const std::size_t at = below(document.size());
+            switch (below(4)) {
+            case 0:
+                document[at] = static_cast<char>(random());
+                break;
+            case 1:
+                document.erase(at, 1 + below(8));
+                break;
+            case 2:
+                document.insert(at, document.substr(below(document.size()), below(30)));
+                break;
+            default:
+                document.insert(at, pieces[below(std::size(pieces))]);
+            }
+        }
+        expectSame(document);
+    }
+}
+
+} // namespace
