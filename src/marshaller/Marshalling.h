@@ -1,6 +1,7 @@
 #pragma once
 
-// One call of the marshaller: objects become elements, driven by the mapping's plan.
+// One call of the marshaller: objects become elements, driven by the mapping's plan. It holds the
+// marshaller, which a getter of the host's may let go of.
 //
 //     marshal.cpp       object -> element, the chain of ancestors, kept unknown XML and namespaces
 //     mapFields.cpp     a field's value by node kind, arrays
@@ -46,7 +47,7 @@ private:
     static qx::XMLElement& arrayTarget(const FieldPlan& field, qx::XMLElement& element);
     bool isToBeWritten(const qx::Value& item);
 
-    const QXXMLMarshaller& _marshaller;
+    const qx::Ref<const QXXMLMarshaller> _marshaller;
     const MappingPlan& _plan;
     const bool _saveUnknownXML;
     const bool _usingNamespaceURIs;

@@ -16,7 +16,7 @@ using qx::XMLElement;
 using qx::XMLNode;
 
 Marshalling::Marshalling(QXXMLMarshaller& marshaller)
-    : _marshaller(marshaller), _plan(marshaller.plan()),
+    : _marshaller(&marshaller), _plan(marshaller.plan()),
       _saveUnknownXML(marshaller._saveUnknownXML),
       _usingNamespaceURIs(marshaller._usingNamespaceURIs) {}
 
@@ -54,9 +54,9 @@ Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, 
 // fields.
 bool Marshalling::bindFields(const ClassPlan& plan, XMLElement& element, qx::Object& object,
                              ErrorSlot error) {
-    if (_depth >= _marshaller._maximumDepth)
-        return qx::fail(error, qx::errors::nestedTooDeep, _marshaller._maximumDepth,
-                        plan.className.string());
+    const std::size_t deepest = _marshaller->_maximumDepth;
+    if (_depth >= deepest)
+        return qx::fail(error, qx::errors::nestedTooDeep, deepest, plan.className.string());
     struct Deeper {
         std::size_t& depth;
         explicit Deeper(std::size_t& counted) : depth(counted) { ++depth; }
