@@ -25,6 +25,8 @@ XMLNode& CopyScope::topOf(XMLNode& node) const {
 bool CopyScope::copyWhole(XMLNode& top, ReadingBudget& budget, ReadingBudget::ErrorSlot error) {
     XMLElement* element = top.asElement();
     if (element == nullptr) {
+        if (!budget.takeKept(1, _element, error))
+            return false;
         add(top, *top.copy());
         return true;
     }

@@ -145,7 +145,12 @@ void ElementSource::take(XMLElement& child) {
 
 Ref<XMLNode> ElementSource::keep(XMLNode& node, ReadingBudget& budget,
                                  ReadingBudget::ErrorSlot error) const {
-    if (!budget.takeKept(1, _element, error))
+    // Of an element's attributes the objects flattened into it keep the same copies: these count
+    // once, when they are made.
+    const bool isShared =
+        _scope != nullptr && (node.kind() == qx::XMLNodeKind::attribute ||
+                              node.kind() == qx::XMLNodeKind::namespaceDeclaration);
+    if (!isShared && !budget.takeKept(1, _element, error))
         return nullptr;
     return _scope != nullptr ? _scope->counterpart(node, budget, error) : Ref<XMLNode>(&node);
 }

@@ -70,10 +70,12 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const ElementSource& source,
         return qx::fail(error, qx::errors::noDefinitionForElement, &element);
     const std::size_t depth = _frame != nullptr ? _frame->depth : 0;
     const std::size_t deepest = _marshaller->maximumDepth();
-    if (depth >= deepest)
-        return qx::fail(error, qx::errors::nestedTooDeep, deepest, plan.className.string());
-    return _budget.takeObject(plan.className.string(), error) &&
-           _budget.takeVisits(element.childCount(), element, error);
+    // What is refused counts too: without a slot the reading goes on.
+    if (!_budget.takeObject(plan.className.string(), error))
+        return false;
+    if (depth < deepest)
+        return _budget.takeVisits(element.childCount(), element, error);
+    return qx::fail(error, qx::errors::nestedTooDeep, deepest, plan.className.string());
 }
 
 Ref<qx::Object> Unmarshalling::build(const ClassPlan& plan, ElementSource& source, bool isFlattened,
@@ -147,6 +149,8 @@ bool Unmarshalling::bindFields(const ClassPlan& plan, const Target& target, Erro
         bool copied = false;
         for (const FieldPlan& field : walk.current().fields) {
             if (!field.isContainer && !copied) {
+                if (!_budget.takeVisits(source->firstChildCount(), source->element(), error))
+                    return false;
                 copy = ElementSource::copyOf(*source);
                 source = copy.get();
                 copied = true;
