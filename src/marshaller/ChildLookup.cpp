@@ -142,7 +142,12 @@ void ChildLookup::take(XMLElement& child) {
 
 Ref<XMLNode> ChildLookup::keep(XMLNode& node, ReadingBudget& budget,
                                ReadingBudget::ErrorSlot error) const {
-    if (!budget.takeKept(1, _element, error))
+    // Of an element's attributes the objects flattened into it keep the same copies: these count
+    // once, when they are made.
+    const bool isShared =
+        _copies != nullptr && (node.kind() == XMLNodeKind::attribute ||
+                               node.kind() == XMLNodeKind::namespaceDeclaration);
+    if (!isShared && !budget.takeKept(1, _element, error))
         return nullptr;
     return _copies != nullptr ? _copies->counterpart(node, budget, error) : Ref<XMLNode>(&node);
 }

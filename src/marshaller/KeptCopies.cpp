@@ -23,6 +23,8 @@ XMLNode& KeptCopies::topOf(XMLNode& node) const {
 bool KeptCopies::copyWhole(XMLNode& top, ReadingBudget& budget, ReadingBudget::ErrorSlot error) {
     XMLElement* element = top.asElement();
     if (element == nullptr) {
+        if (!budget.takeKept(1, _element, error))
+            return false;
         add(top, *top.copy());
         return true;
     }

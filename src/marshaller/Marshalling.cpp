@@ -11,7 +11,7 @@
 namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller)
-    : _marshaller(marshaller), _plan(MappingPlan::of(marshaller.mapping())),
+    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())),
       _saveUnknownXML(marshaller.saveUnknownXML()),
       _usingNamespaceURIs(marshaller.isUsingNamespaceURIs()) {}
 
@@ -49,9 +49,9 @@ Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, 
 // fields.
 bool Marshalling::writeFields(const ClassPlan& plan, XMLElement& element, Object& object,
                               ErrorSlot error) {
-    if (_depth >= _marshaller.maximumDepth())
-        return fail(error, errors::nestedTooDeep, _marshaller.maximumDepth(),
-                    plan.className.string());
+    const std::size_t deepest = _marshaller->maximumDepth();
+    if (_depth >= deepest)
+        return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
     struct Deeper {
         std::size_t& depth;
         explicit Deeper(std::size_t& counted) : depth(counted) { ++depth; }

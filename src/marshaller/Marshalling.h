@@ -1,7 +1,8 @@
 #pragma once
 
 // One call of the marshaller: objects become elements, driven by the mapping's plan. How a field is
-// written is told by its kind of binding (FieldBinding.h).
+// written is told by its kind of binding (FieldBinding.h). It holds the marshaller, which a getter of
+// the host's may let go of.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
@@ -40,7 +41,7 @@ private:
     void restoreUnknownXML(XMLElement& element, const Object& object);
     void restoreNamespaces(XMLElement& element, const Object& object) const;
 
-    const QXXMLMarshaller& _marshaller;
+    const qx::Ref<const QXXMLMarshaller> _marshaller;
     const MappingPlan& _plan;
     const bool _saveUnknownXML;
     const bool _usingNamespaceURIs;

@@ -66,10 +66,12 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, E
         return fail(error, errors::noDefinitionForElement, &element);
     const std::size_t depth = _frame != nullptr ? _frame->depth : 0;
     const std::size_t deepest = _marshaller->maximumDepth();
-    if (depth >= deepest)
-        return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
-    return _budget.takeObject(plan.className.string(), error) &&
-           _budget.takeVisits(element.childCount(), element, error);
+    // What is refused counts too: without a slot the reading goes on.
+    if (!_budget.takeObject(plan.className.string(), error))
+        return false;
+    if (depth < deepest)
+        return _budget.takeVisits(element.childCount(), element, error);
+    return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
 }
 
 Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
@@ -143,6 +145,8 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
         bool copied = false;
         for (const FieldPlan& field : walk.current().fields) {
             if (!field.isContainer && !copied) {
+                if (!_budget.takeVisits(source->firstChildCount(), source->element(), error))
+                    return false;
                 copy = ChildLookup::copyOf(*source);
                 source = copy.get();
                 copied = true;

@@ -91,23 +91,27 @@ private:
 } // namespace
 
 Ref<XMLElement> QXXMLMarshaller::marshallObject(const qx::Value& object, Ref<Error>* error) {
-    return Marshalling(*this).marshallObject(object, error);
+    const qx::Value held = object; // whatever the getters do to the caller's
+    return Marshalling(*this).marshallObject(held, error);
 }
 
 Ref<XMLElement> QXXMLMarshaller::elementWithMapping(const QXXMLClassMapping& mapping,
                                                     Object& object, Ref<Error>* error) {
+    const Ref<Object> held(&object);
     const PlanOfClass plan(*this, mapping);
     return Marshalling(*this).element(*plan, (*plan).elementName, &object, error);
 }
 
 bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLElement& element,
                                         Object& object, Ref<Error>* error) {
+    const Ref<Object> held(&object);
     const PlanOfClass plan(*this, mapping);
     return Marshalling(*this).writeFields(*plan, element, object, error);
 }
 
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
                                Ref<Error>* error) {
+    const Ref<Object> held(&object);
     const PlanOfField plan(*this, field);
     return Marshalling(*this).writeField(*plan, element, object, error);
 }

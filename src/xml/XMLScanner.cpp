@@ -59,6 +59,11 @@ void skip(const char*& at, std::uint8_t kind) noexcept {
         ++at;
 }
 
+constexpr std::uint64_t mixed(std::uint64_t hash) noexcept {
+    hash *= 0x9E3779B97F4A7C15U;
+    return hash ^ hash >> 32U;
+}
+
 constexpr std::string_view xmlNamespace = "http://www.w3.org/XML/1998/namespace";
 constexpr std::string_view xmlnsNamespace = "http://www.w3.org/2000/xmlns/";
 
@@ -459,8 +464,9 @@ std::uint32_t XMLScanner::hashOf(const char* begin, std::size_t size) const noex
             std::memcpy(&word, begin, 8);
         else
             std::memcpy(&word, begin, size);
-        hash = (hash ^ word) * 0x9E3779B97F4A7C15U;
-        hash ^= hash >> 32U;
+        // Twice: once would leave the slot untouched by what only the last bytes differ in,
+        // whatever the seed, and a document could have all its names meet in one.
+        hash = mixed(mixed(hash ^ word));
         if (size <= 8)
             return static_cast<std::uint32_t>(hash);
         begin += 8;
