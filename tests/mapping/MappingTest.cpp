@@ -1,5 +1,7 @@
 // Mapping documents are read into nodes, refused with exact errors, and printed.
 
+#include "support/Texts.h"
+
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
@@ -12,13 +14,7 @@ namespace {
 using qx::Error;
 using qx::Ref;
 using qx::String;
-
-Ref<qx::XMLDocument> parsed(std::string_view xml) {
-    Ref<Error> error;
-    auto document = qx::XMLDocument::initWithData(xml, {}, &error);
-    EXPECT_TRUE(document) << error->description().view();
-    return document;
-}
+using support::parsed;
 
 Ref<QXXMLDocumentMapping> mapping(std::string_view content, Ref<Error>* error = nullptr) {
     const auto document = parsed("<mapping>" + std::string(content) + "</mapping>");

@@ -2,45 +2,29 @@
 // from there on. What comes out is std::bad_alloc or what came out with enough memory: the same
 // document, or the same error.
 
+#include "FailingMemory.h"
+
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
-#include <cstdlib>
 #include <cstring>
 #include <iostream>
 #include <libxml/parser.h>
-#include <new>
 #include <vector>
 
 namespace {
 
-std::size_t requests = 0;
-std::size_t firstFailing = 0; // 0: none fails
-std::size_t lastFailing = 0;
-
-bool mayServe() { return firstFailing == 0 || ++requests < firstFailing || requests > lastFailing; }
-
-void* allocate(std::size_t size) { return mayServe() ? std::malloc(size) : nullptr; }
+void* allocate(std::size_t size) { return failing::allocate(size); }
 void* reallocate(void* block, std::size_t size) {
-    return mayServe() ? std::realloc(block, size) : nullptr;
+#ifdef __clang__
+    if (failing::failsNow())
+        return nullptr;
+#endif
+    return std::realloc(block, size);
 }
 char* duplicate(const char* text) {
     void* const copy = allocate(std::strlen(text) + 1);
     return copy != nullptr ? std::strcpy(static_cast<char*>(copy), text) : nullptr;
 }
-
-} // namespace
-
-void* operator new(std::size_t size) {
-    if (void* const block = allocate(size != 0 ? size : 1))
-        return block;
-    throw std::bad_alloc();
-}
-void operator delete(void* block) noexcept { std::free(block); }
-void operator delete(void* block, std::size_t) noexcept { std::free(block); }
-
-namespace {
-
-constexpr std::size_t forEver = static_cast<std::size_t>(-1);
 
 std::string repeated(std::string_view text, int times) {
     std::string all;
@@ -98,38 +82,32 @@ std::string told(const qx::Ref<qx::XMLDocument>& document, const qx::Ref<qx::Err
            std::to_string(error->code()) + " " + error->localizedDescription().str();
 }
 
-std::string outcome(const std::string& text, std::size_t first, std::size_t last) {
-    qx::Ref<qx::XMLDocument> document;
-    qx::Ref<qx::Error> error;
-    requests = 0;
-    firstFailing = first;
-    lastFailing = last;
-    try {
-        document = qx::XMLDocument::initWithData(text, {}, &error);
-    } catch (const std::bad_alloc&) {
-        firstFailing = 0;
-        return "bad_alloc";
-    }
-    firstFailing = 0;
-    return told(document, error);
-}
+long attempts = 0;
 
 int faultsOf(const std::string& text) {
-    const std::string expected = outcome(text, 0, 0);
     int faults = 0;
-    for (const bool once : {true, false}) {
-        std::size_t n = 1;
-        for (; n == 1 || requests >= n - 1; ++n) {
-            const std::string said = outcome(text, n, once ? n : forEver);
-            if (said == expected || said == "bad_alloc")
-                continue;
-            ++faults;
-            std::cout << "request " << n << (once ? "" : " and all after it")
-                      << " failed: " << text.substr(0, 300) << "\n  instead of "
-                      << expected.substr(0, 300) << "\n  came       " << said.substr(0, 300)
-                      << '\n';
-        }
-    }
+    std::string expected;
+    const auto attempt = [&](long n) {
+        ++attempts;
+        qx::Ref<qx::XMLDocument> document;
+        qx::Ref<qx::Error> error;
+        const auto outcome =
+            failing::run(n, [&] { document = qx::XMLDocument::initWithData(text, {}, &error); });
+        if (outcome == failing::Outcome::failed)
+            return outcome;
+        const std::string said = told(document, error);
+        if (n == failing::never)
+            expected = said;
+        if (said == expected)
+            return outcome;
+        ++faults;
+        std::cout << "request " << n << (failing::allFollowing ? " and all after it" : "")
+                  << " failed: " << text.substr(0, 300) << "\n  instead of "
+                  << expected.substr(0, 300) << "\n  came       " << said.substr(0, 300) << '\n';
+        return outcome;
+    };
+    attempt(failing::never);
+    failing::eachAllocation(attempt);
     return faults;
 }
 
@@ -141,6 +119,6 @@ int main() {
     int faults = 0;
     for (const std::string& text : documents())
         faults += faultsOf(text);
-    std::cout << faults << " wrong\n";
+    std::cout << attempts << " attempts, " << faults << " wrong\n";
     return faults == 0 ? EXIT_SUCCESS : EXIT_FAILURE;
 }

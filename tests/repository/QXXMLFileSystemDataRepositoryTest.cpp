@@ -51,9 +51,6 @@ public:
 
 } // namespace
 
-extern "C" void makeLastingObjects();
-extern "C" void makeLastingObjects() { FileSandbox::makeLastingObjects(); }
-
 TEST_F(FileSystemRepositoryTest, ANameIsLookedForFromTheVersionedFolderToTheLibrarysBundle) {
     const auto repository = QXXMLFileSystemDataRepository::init();
     EXPECT_EQ(pathsOf(*repository), "/data/Client/2.1.57 /data/Client ");

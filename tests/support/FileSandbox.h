@@ -7,6 +7,7 @@
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Null.h>
 
 #include <cstdlib>
 #include <filesystem>
@@ -96,7 +97,8 @@ public:
     static void makeLastingObjects() {
         qx::Bundle::mainBundle();
         qx::Bundle::frameworkBundle();
-        qx::UserDefaults::standardUserDefaults();
+        qx::UserDefaults::standardUserDefaults()->boolForKey("");
+        qx::Null::marker();
     }
 
 private:

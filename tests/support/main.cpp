@@ -1,11 +1,13 @@
 // Runs the tests, and after each one checks that it has left no live object behind.
 
+#include "support/FileSandbox.h"
+
 #include <QXXMLMarshalling/model/Object.h>
 
 #include <gtest/gtest.h>
 
-// Objects that are made once and kept: a test program that uses such makes them here, so that they
-// count against no test.
+// Objects that are made once and kept: a test program that uses such of the folders above host/
+// makes them here, so that they count against no test.
 extern "C" __attribute__((weak)) void makeLastingObjects();
 
 namespace {
@@ -25,6 +27,7 @@ class LeakCheck : public testing::EmptyTestEventListener {
 
 int main(int argc, char** argv) {
     testing::InitGoogleTest(&argc, argv);
+    FileSandbox::makeLastingObjects();
     if (makeLastingObjects != nullptr)
         makeLastingObjects();
     testing::UnitTest::GetInstance()->listeners().Append(new LeakCheck);

@@ -6,10 +6,6 @@
 
 #include "support/FileSandbox.h"
 
-// What a sandbox looks at is made once.
-extern "C" void makeLastingObjects();
-extern "C" void makeLastingObjects() { FileSandbox::makeLastingObjects(); }
-
 namespace {
 
 using qx::Ref;
