@@ -7,7 +7,9 @@
 #include <QXXMLMarshalling/QXXMLMarshalling.h>
 
 #include <array>
+#include <fstream>
 #include <iostream>
+#include <sstream>
 #include <streambuf>
 
 namespace {
@@ -15,29 +17,16 @@ namespace {
 using qx::Error;
 using qx::Ref;
 
-constexpr const char* mappingText = R"(<mapping>
-    <class name="Order" extends="Base"><map-to xml="order" ns-uri="urn:o"/>
-        <field name="number" required="true"><bind-xml name="n" node="attribute"/></field>
-        <field name="day"><bind-xml name="on" node="attribute" location="received"/></field>
-        <field name="text"><bind-xml name="text" node="element"/></field>
-        <field name="any"><bind-xml name="any"/></field>
-        <field name="to" type="Address"><bind-xml name="to" node="element"/></field>
-        <field name="lines" type="Line" collection="array">
-            <bind-xml name="line" location="lines"/></field>
-        <field name="rest" collection="array"><bind-xml name="rest"/></field>
-        <field name="flat" type="Address" container="false"><bind-xml node="element"/></field>
-    </class>
-    <class name="Base"><field name="count" type="int"><bind-xml name="c" node="attribute"/></field>
-    </class>
-    <class name="Address"><field name="street"><bind-xml name="street" node="element"/></field>
-    </class>
-    <class name="Line"><field name="text"><bind-xml node="text"/></field></class>
-</mapping>)";
-constexpr const char* documentText =
-    "<order xmlns='urn:o' xmlns:p='urn:p' n='a number that is long' c='7' extra='1'>"
-    "<received on='today'/><text>a text that needs memory of its own</text><any>any</any>"
-    "<to><street>Quay</street><more/></to><lines><line>one</line><line>two</line></lines>"
-    "<rest><line>three</line></rest><street>Road</street><unknown a='1'>kept</unknown></order>";
+// Of a first input of the fuzz program: the mapping, and behind a line the document.
+std::string part(bool isDocument) {
+    std::ostringstream text;
+    text << std::ifstream(QX_SOURCE_DIR "/fuzz/seeds/pair/every-kind.xml").rdbuf();
+    const std::string both = text.str(), line = "<?document?>\n";
+    const std::size_t at = both.find(line);
+    return isDocument ? both.substr(at + line.size()) : both.substr(0, at);
+}
+const std::string mappingText = part(false);
+const std::string documentText = part(true);
 
 // What one operation works on; made anew for each run, without failures.
 struct Stage {
