@@ -59,7 +59,7 @@ std::vector<std::string> documents() {
 // What the last call left, told with enough memory.
 std::string told(const qx::Ref<qx::XMLDocument>& document, const qx::Ref<qx::Error>& error) {
     if (document)
-        return document->description().str(); // which is no XML where the version is none
+        return document->description().str();
     if (!error)
         return "neither a document nor an error";
     return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
