@@ -21,9 +21,7 @@ constexpr unsigned deepestRelease = 64;
 //
 //     0x00000001 and up     so many references
 //     about 0x40000000      the object ends: its destructor runs, or is about to
-//     about 0x80000000      it waits for its turn, has no extras, and _extras is the link to the
-//     next
-//                           object that waits
+//     about 0x80000000      it waits for its turn, without extras: _extras links to the next one
 constexpr std::uint32_t endingCount = 0x40000000U;
 constexpr std::uint32_t waitingCount = 2 * endingCount;
 

@@ -29,13 +29,13 @@ inline std::vector<std::pair<std::string, std::string>> matches(const char* head
 
 // The code and the message of each row. A row that shares the message of another is left out.
 inline std::vector<std::pair<std::string, std::string>> errorRows(const char* header) {
-    return matches(header, R"(ErrorText \w+\{\s*(-?\d+),\s*"([^"]*)\")");
+    return matches(header, R"x(ErrorText \w+\{\s*(-?\d+),\s*"([^"]*)")x");
 }
 
 // All messages and reasons.
 inline std::vector<std::string> errorTexts(const char* header) {
     std::vector<std::string> texts;
-    for (const auto& [before, text] : matches(header, R"(([,={]\s*)"([^"]+)\")"))
+    for (const auto& [before, text] : matches(header, R"x(([,={]\s*)"([^"]+)")x"))
         texts.push_back(text);
     return texts;
 }
