@@ -1,7 +1,7 @@
 // The samples of docs/host-classes.md, between "// sample: NAME" and "// end of sample", and what
 // the page says of them. tests/docs/SamplesTest.cpp compares them with the page.
 
-#include "marshaller/Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/base/Exception.h>

@@ -32,9 +32,10 @@ void giveUndoManager(const qx::Value& value, const qx::Ref<qx::UndoManager>& man
 qx::Value valueFrom(const std::string& text, const qx::Value& former) {
     std::int64_t number = 0;
     bool truth = false;
-    if (former.kind() == qx::Value::Kind::boolean && qx::readBoolean(text, truth))
+    if (former.kind() == qx::Value::Kind::boolean && qx::ValueTraits<bool>::fromValue(text, truth))
         return truth;
-    if (former.kind() == qx::Value::Kind::integer && qx::readInteger(text, number))
+    if (former.kind() == qx::Value::Kind::integer &&
+        qx::ValueTraits<std::int64_t>::fromValue(text, number))
         return number;
     return text;
 }

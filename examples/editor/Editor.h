@@ -3,12 +3,16 @@
 // A document that is being edited by commands, one a line:
 //
 //     show [PATH]            print what the document, or a part of it, holds
-//     set PATH VALUE         a number where the old value is one; else the text up to the line's
-//     end unset PATH             remove a value new PATH CLASS         put a new object there add
-//     PATH CLASS         append a new object to a list remove PATH            take an item out of
-//     its list finish PATH            have a task finish itself begin NAME … end       the commands
-//     between them are undone together undo, redo watch PATH             tell of changes of the
-//     value at the path, whichever object changed save FILE
+//     set PATH VALUE         a number where the old value is one; else text, to the end of the line
+//     unset PATH             remove a value
+//     new PATH CLASS         put a new object there
+//     add PATH CLASS         append a new object to a list
+//     remove PATH            take an item out of its list
+//     finish PATH            have a task finish itself
+//     begin NAME … end       the commands between them are undone together
+//     undo, redo
+//     watch PATH             tell of changes of the value at the path, whichever object changed
+//     save FILE
 //
 // Each change that the editor observes is printed, whoever makes it: commands, undo and redo alike.
 

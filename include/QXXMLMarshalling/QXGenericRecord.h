@@ -21,24 +21,24 @@
 #include <QXXMLMarshalling/model/CountedSet.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
-#include <QXXMLMarshalling/undo/ChangeTracking.h>
 #include <QXXMLMarshalling/undo/UndoManager.h>
+#include <QXXMLMarshalling/undo/UndoableObject.h>
+
+namespace qx::detail {
+class RecordFilling;
+}
 
 // The user default that lets records answer accessor messages; its registered value is "NO".
 extern QX_API const char* const AllowMethodForwardingInGenericRecords;
 
-class QX_API QXGenericRecord : public qx::Object {
+class QX_API QXGenericRecord : public qx::UndoableObject {
 public:
     QXGenericRecord();
     static qx::Ref<QXGenericRecord> init();
-    static void* operator new(std::size_t size) { return qx::ObjectMemory::allocate(size); }
-    static void* operator new(std::size_t size, std::align_val_t alignment) {
-        return ::operator new(size, alignment);
-    }
-    static void operator delete(void* memory) noexcept { qx::ObjectMemory::release(memory); }
-    static void operator delete(void* memory, std::align_val_t alignment) noexcept {
-        ::operator delete(memory, alignment);
-    }
+    static void* operator new(std::size_t size);
+    static void* operator new(std::size_t size, std::align_val_t alignment);
+    static void operator delete(void* memory) noexcept;
+    static void operator delete(void* memory, std::align_val_t alignment) noexcept;
     // Removes the undo actions that target the record.
     ~QXGenericRecord() override;
     // The class as data, named "QXGenericRecord". Describing it registers the user default above.
@@ -77,26 +77,19 @@ public:
     bool isRemovable() const { return false; }
 
     // Plain accessors of the properties: they keep what they are given and tell nobody.
-    bool notifyBindingsObservers() const noexcept { return _notifyBindingsObservers; }
-    void setNotifyBindingsObservers(bool notify) noexcept { _notifyBindingsObservers = notify; }
-    qx::Ref<qx::UndoManager> undoManager() const;
-    void setUndoManager(qx::Ref<qx::UndoManager> manager);
+    // So are undoManager() and setUndoManager(), which every UndoableObject has.
+    bool notifyBindingsObservers() const noexcept { return has(Flag::notifyBindingsObservers); }
+    void setNotifyBindingsObservers(bool notify) noexcept {
+        set(Flag::notifyBindingsObservers, notify);
+    }
     // The values as they stood before the last changes, by key; empty after construction.
-    qx::Ref<qx::Dictionary> changeCache() const;
-    void setChangeCache(qx::Ref<qx::Dictionary> cache);
+    qx::Ref<qx::Dictionary> changeCache() const override;
+    void setChangeCache(qx::Ref<qx::Dictionary> cache) override;
     const qx::String& className() const noexcept { return _className; }
     void setClassName(const qx::String& name) { _className = name; }
     // Null until the first value is set.
     const qx::Ref<qx::Dictionary>& contents() const noexcept { return _contents; }
     void setContents(qx::Ref<qx::Dictionary> contents);
-
-    // Remember the value before a change; register the change with the undo manager after it.
-    void willChangeValueForKey(qx::Key key) override;
-    void didChangeValueForKey(qx::Key key) override;
-    void willChange(qx::ChangeKind kind, std::span<const std::size_t> indexes,
-                    qx::Key key) override;
-    // False where the class or the record vetoes undo for the key; see ChangeTracking.h.
-    bool isUndoRegistrationEnabledForKey(qx::Key key) const;
 
     // Have the operation, which takes the change dictionary (Observation.h), called on this record
     // at each change of the value at the key path. The collection is an array or a dictionary,
@@ -126,22 +119,32 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
-    friend class ObjectDoor;
+    friend class qx::detail::RecordFilling;
 
     const qx::Ref<qx::Dictionary>& filledContents() {
         if (!_contents) {
             _contents = qx::make<qx::Dictionary>();
-            _isFilledQuietly = _tracking.isIdle();
+            set(Flag::filledQuietly, tracking().isIdle());
         }
         return _contents;
     }
     // False when the value has to be set the usual way; it is left alone then.
     bool addQuietly(qx::Key key, qx::Value&& value);
 
-    bool _notifyBindingsObservers = true;
-    // The change cache lacks the keys that were added quietly: each was null before.
-    mutable bool _isFilledQuietly = false;
-    qx::ChangeTracking _tracking;
+    enum class Flag : std::uint8_t {
+        notifyBindingsObservers = 1,
+        // The change cache lacks the keys that were added quietly: each was null before.
+        filledQuietly = 2
+    };
+    bool has(Flag flag) const noexcept {
+        return (_derivedFlags & static_cast<std::uint8_t>(flag)) != 0;
+    }
+    void set(Flag flag, bool isSet) const noexcept {
+        const unsigned others = _derivedFlags & ~static_cast<unsigned>(flag);
+        _derivedFlags =
+            static_cast<std::uint8_t>(isSet ? others | static_cast<unsigned>(flag) : others);
+    }
+
     qx::String _className;
     qx::Ref<qx::Dictionary> _contents;
 };

@@ -59,7 +59,7 @@ private:
     friend qx::Ref<QXXMLBindToMapping> qx::make<QXXMLBindToMapping>();
     friend qx::Ref<QXXMLBindToMapping> qx::make<QXXMLBindToMapping>(bool&&);
 
-    explicit QXXMLBindToMapping(bool minimal = false) noexcept : _minimal(minimal) {}
+    explicit QXXMLBindToMapping(bool minimal = false) noexcept;
 
     qx::String _bindTo;
     qx::String _type;

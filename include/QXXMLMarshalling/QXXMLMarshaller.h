@@ -15,7 +15,8 @@
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
 // setters of host classes throw passes through every operation here. They may use the marshaller,
 // the document and its nodes while they are called by a reading: what is changed then is found
-// changed by the fields that follow, but a list that is being filled stays as it was found.
+// changed by the fields that follow, but a list that is being filled stays as it was found. Getters
+// may let go of the marshaller and of the object that is being written.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/model/Array.h>
@@ -219,11 +220,6 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
-    friend class Marshalling;
-    friend class Unmarshalling;
-
-    const MappingPlan& plan() const;
-
     qx::Ref<QXXMLMarshallingMapping> _mapping;
     bool _saveUnknownXML = true;
     bool _lenient = true;

@@ -1,7 +1,13 @@
 #pragma once
 
 // The whole library: every public header. Programs that care for their compile times include those
-// of the classes that they use.
+// of the classes that they use; most start with three:
+//
+//     QXXMLMarshaller.h     reads and writes documents under a mapping
+//     QXGenericRecord.h     what is read where no class of yours is described
+//     model/Class.h         describes your own classes
+//
+// What stands in detail/ is for these headers alone: it may change with each version.
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/QXXMLBindToMapping.h>
@@ -20,10 +26,6 @@
 #include <QXXMLMarshalling/base/Key.h>
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/base/String.h>
-#include <QXXMLMarshalling/detail/ClassDescription.h>
-#include <QXXMLMarshalling/detail/Count.h>
-#include <QXXMLMarshalling/detail/ObjectMemory.h>
-#include <QXXMLMarshalling/detail/ShortVector.h>
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/Log.h>
 #include <QXXMLMarshalling/host/ProcessInfo.h>

@@ -11,8 +11,10 @@
 
 #include <memory>
 
+namespace qx::detail {
 class ClassPlan;
 class MappingPlan;
+} // namespace qx::detail
 
 class QX_API QXXMLMarshallingMapping final : public qx::Object {
 public:
@@ -49,20 +51,18 @@ public:
     bool loadIncludedDocuments(qx::Ref<qx::Error>* error = nullptr);
     bool populateLookupCaches(qx::Ref<qx::Error>* error = nullptr);
 
-    // What marshallers work from.
-    const MappingPlan& plan() const noexcept { return *_plan; }
-
 protected:
     const qx::Class& describedClass() const override;
 
 private:
+    friend class qx::detail::MappingPlan;
     friend qx::Ref<QXXMLMarshallingMapping> qx::make<QXXMLMarshallingMapping>();
 
     QXXMLMarshallingMapping();
     bool init(qx::XMLDocument* document, qx::Ref<qx::Error>* error);
-    QXXMLClassMapping* mappingOf(const ClassPlan* plan) const;
+    QXXMLClassMapping* mappingOf(const qx::detail::ClassPlan* plan) const;
 
     qx::Ref<QXXMLDocumentMapping> _mapping;
     qx::Ref<qx::XMLDocument> _document;
-    std::unique_ptr<MappingPlan> _plan;
+    std::unique_ptr<qx::detail::MappingPlan> _plan;
 };

@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/base/Key.h>
 
 #include "base/Immortal.h"
+#include "base/PropertyNames.h"
 
 #include <algorithm>
 #include <cstring>
@@ -54,6 +55,11 @@ Key Key::existing(std::string_view name) noexcept {
     Key key;
     key._rep = immortal<NameTable>().find(name);
     return key;
+}
+
+void detail::markAsProperty(Key key) noexcept {
+    if (key._rep != nullptr)
+        key._rep->count.fetch_or(Key::propertyBit, std::memory_order_relaxed);
 }
 
 std::size_t Selector::argumentCount() const noexcept {

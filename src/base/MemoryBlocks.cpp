@@ -26,7 +26,7 @@ MemoryBlocks& MemoryBlocks::ofTexts() noexcept { return textsOfThread; }
 MemoryBlocks& MemoryBlocks::ofObjects() noexcept { return objectsOfThread; }
 
 inline void MemoryBlocks::giveUp(Block* block, std::uint32_t things) noexcept {
-    if (count::decrease(block->live, things) == things)
+    if (detail::decreaseCount(block->live, things) == things)
         ::operator delete(block);
 }
 

@@ -1,5 +1,6 @@
 #include <QXXMLMarshalling/detail/ObjectMemory.h>
 
+#include "base/BulkObjects.h"
 #include "base/MemoryBlocks.h"
 
 namespace qx {
@@ -14,6 +15,11 @@ constexpr std::size_t largestShare = 1024;
 
 } // namespace
 
+BulkObjects::BulkObjects() noexcept { ++bulks; }
+BulkObjects::~BulkObjects() { --bulks; }
+
+namespace detail {
+
 void* ObjectMemory::allocate(std::size_t size) {
     return bulks != 0 && size <= largestShare
                ? MemoryBlocks::ofObjects().allocate<MemoryBlocks::anyScalar>(size)
@@ -22,7 +28,5 @@ void* ObjectMemory::allocate(std::size_t size) {
 
 void ObjectMemory::release(void* memory) noexcept { MemoryBlocks::release(memory); }
 
-ObjectMemory::Bulk::Bulk() noexcept { ++bulks; }
-ObjectMemory::Bulk::~Bulk() { --bulks; }
-
+} // namespace detail
 } // namespace qx

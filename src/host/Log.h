@@ -41,13 +41,6 @@ void logDebug(std::string_view format, const Arguments&... arguments) {
         detail::logThrough(function, format, arguments...);
 }
 
-// To the host's warning function; nothing without one.
-template <class... Arguments>
-void logWarning(std::string_view format, const Arguments&... arguments) {
-    if (const LogFunction function = hostLogWarning())
-        detail::logThrough(function, format, arguments...);
-}
-
 // To the host's warning function, else to standard error.
 template <class... Arguments>
 void logWarningOrLine(std::string_view format, const Arguments&... arguments) {

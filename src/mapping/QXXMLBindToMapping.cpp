@@ -11,6 +11,8 @@ using qx::Ref;
 using qx::String;
 using qx::XMLElement;
 
+QXXMLBindToMapping::QXXMLBindToMapping(bool minimal) noexcept : _minimal(minimal) {}
+
 QXXMLBindToMapping::~QXXMLBindToMapping() = default;
 
 Ref<QXXMLBindToMapping> QXXMLBindToMapping::initWithXML(XMLElement* element, Ref<Error>* error) {

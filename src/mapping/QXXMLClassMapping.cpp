@@ -78,7 +78,7 @@ String QXXMLClassMapping::descriptionWithLocale(const qx::Object* locale,
 Ref<QXXMLMapping> QXXMLClassMapping::newInstance() const { return qx::make<QXXMLClassMapping>(); }
 
 const qx::Class& QXXMLClassMapping::describedClass() const {
-    using qx::describe::accessorProperty;
+    using qx::detail::accessorProperty;
     return qx::libraryClass<QXXMLClassMapping, QXXMLMapping>(
         "QXXMLClassMapping", {accessorProperty<QXXMLClassMapping, &QXXMLClassMapping::mapTo,
                                                &QXXMLClassMapping::setMapTo>("mapTo")});

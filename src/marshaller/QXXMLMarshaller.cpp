@@ -1,7 +1,6 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include "marshaller/Marshalling.h"
-#include "marshaller/Unmarshalling.h"
+#include "base/BulkObjects.h"
 #include "model/LibraryClass.h"
 
 using qx::Error;
@@ -49,13 +48,6 @@ const Ref<qx::UndoManager>& QXXMLMarshaller::undoManager() {
     return _undoManager;
 }
 
-const MappingPlan& QXXMLMarshaller::plan() const {
-    if (_mapping)
-        return _mapping->plan();
-    static const MappingPlan none(*QXXMLDocumentMapping::initWithXML(nullptr));
-    return none;
-}
-
 Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* error) {
     auto root = marshallObject(object, error);
     if (!root || (error != nullptr && *error))
@@ -69,7 +61,7 @@ Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* 
 // The group closes whatever happens: every call is one step to undo.
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
     const qx::UndoGroup group(undoManager());
-    const qx::ObjectMemory::Bulk bulk;
+    const qx::BulkObjects bulk;
     return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
 }
 

@@ -4,6 +4,8 @@
 
 #include <limits>
 
+namespace qx::detail {
+
 namespace {
 
 constexpr std::size_t visitsPerObject = 16;
@@ -21,13 +23,13 @@ std::size_t total(std::size_t base, std::size_t each, std::size_t count) noexcep
     return count != 0 && each > (most - base) / count ? most : base + each * count;
 }
 
-std::size_t visitsFor(const qx::XMLExtent& extent) noexcept {
+std::size_t visitsFor(const XMLExtent& extent) noexcept {
     return extent.nodes + extent.textSize / bytesPerVisit;
 }
 
 } // namespace
 
-ReadingBudget::ReadingBudget(const QXXMLMarshaller& marshaller, const qx::XMLElement* root) noexcept
+ReadingBudget::ReadingBudget(const QXXMLMarshaller& marshaller, const XMLElement* root) noexcept
     : _marshaller(marshaller), _root(root) {
     setLimits();
 }
@@ -55,21 +57,20 @@ bool ReadingBudget::isWithin(const Count& count) noexcept {
     return !_isSpent;
 }
 
-bool ReadingBudget::mayMake(const qx::String& className, ErrorSlot error) {
-    return isWithin(_objects) ||
-           qx::fail(error, qx::errors::tooManyObjects, _objects.limit, className);
+bool ReadingBudget::mayMake(const String& className, ErrorSlot error) {
+    return isWithin(_objects) || fail(error, errors::tooManyObjects, _objects.limit, className);
 }
 
-bool ReadingBudget::mayKeep(const qx::XMLElement& element, ErrorSlot error) {
-    return isWithin(_kept) ||
-           qx::fail(error, qx::errors::tooManyKeptNodes, _kept.limit, element.name());
+bool ReadingBudget::mayKeep(const XMLElement& element, ErrorSlot error) {
+    return isWithin(_kept) || fail(error, errors::tooManyKeptNodes, _kept.limit, element.name());
 }
 
-bool ReadingBudget::mayVisit(const qx::XMLElement& element, ErrorSlot error) {
-    return isWithin(_visits) ||
-           qx::fail(error, qx::errors::tooManyVisits, _visits.limit, element.name());
+bool ReadingBudget::mayVisit(const XMLElement& element, ErrorSlot error) {
+    return isWithin(_visits) || fail(error, errors::tooManyVisits, _visits.limit, element.name());
 }
 
-bool ReadingBudget::mayJoin(const qx::XMLElement& element, ErrorSlot error) {
+bool ReadingBudget::mayJoin(const XMLElement& element, ErrorSlot error) {
     return takeVisits(visitsFor(element.extent()), element, error);
 }
+
+} // namespace qx::detail

@@ -7,27 +7,29 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+namespace qx::detail {
+
 class ReadingBudget {
 public:
-    using ErrorSlot = qx::Ref<qx::Error>*;
+    using ErrorSlot = Ref<Error>*;
 
     // `root` is the element that is read, null for none; both must outlive the budget.
-    ReadingBudget(const QXXMLMarshaller& marshaller, const qx::XMLElement* root) noexcept;
+    ReadingBudget(const QXXMLMarshaller& marshaller, const XMLElement* root) noexcept;
 
     // False with -224, when the limit is passed. An object of that class:
-    bool takeObject(const qx::String& className, ErrorSlot error) {
+    bool takeObject(const String& className, ErrorSlot error) {
         return ++_objects.taken <= _objects.limit || mayMake(className, error);
     }
     // Nodes that are kept or copied of the element:
-    bool takeKept(std::size_t nodes, const qx::XMLElement& element, ErrorSlot error) {
+    bool takeKept(std::size_t nodes, const XMLElement& element, ErrorSlot error) {
         return (_kept.taken += nodes) <= _kept.limit || mayKeep(element, error);
     }
     // Nodes of the element that are gone over:
-    bool takeVisits(std::size_t nodes, const qx::XMLElement& element, ErrorSlot error) {
+    bool takeVisits(std::size_t nodes, const XMLElement& element, ErrorSlot error) {
         return (_visits.taken += nodes) <= _visits.limit || mayVisit(element, error);
     }
     // The element's text, put together of what stands inside:
-    bool takeText(const qx::XMLElement& element, ErrorSlot error) {
+    bool takeText(const XMLElement& element, ErrorSlot error) {
         return element.holdsText() || element.childCount() == 0 || mayJoin(element, error);
     }
     bool isSpent() const noexcept { return _isSpent; }
@@ -41,17 +43,19 @@ private:
 
     void setLimits() noexcept;
     bool isWithin(const Count& count) noexcept;
-    bool mayMake(const qx::String& className, ErrorSlot error);
-    bool mayKeep(const qx::XMLElement& element, ErrorSlot error);
-    bool mayVisit(const qx::XMLElement& element, ErrorSlot error);
-    bool mayJoin(const qx::XMLElement& element, ErrorSlot error);
+    bool mayMake(const String& className, ErrorSlot error);
+    bool mayKeep(const XMLElement& element, ErrorSlot error);
+    bool mayVisit(const XMLElement& element, ErrorSlot error);
+    bool mayJoin(const XMLElement& element, ErrorSlot error);
 
     const QXXMLMarshaller& _marshaller;
-    const qx::XMLElement* _root;
+    const XMLElement* _root;
     Count _objects;
     Count _kept;
     Count _visits;
-    qx::XMLExtent _measured;
+    XMLExtent _measured;
     std::size_t _enough = 0; // nodes up to which the document was measured
     bool _isSpent = false;
 };
+
+} // namespace qx::detail

@@ -61,25 +61,24 @@ Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* er
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
+    const auto options = parseOptions(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     if (!document)
         return nullptr;
-    return written<String>([&] { return document->XMLString(layout, parseOptions(*this)); }, error);
+    return written<String>([&] { return document->XMLString(layout, options); }, error);
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
+    const auto options = parseOptions(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
-    const auto write = [&] {
-        return document->writeToFile(path, layout, error, parseOptions(*this));
-    };
+    const auto write = [&] { return document->writeToFile(path, layout, error, options); };
     return document && written<bool>(write, error);
 }
 
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
                                   Ref<Error>* error) {
+    const auto options = parseOptions(*this);
     const auto document = marshall(object, error);
-    const auto write = [&] {
-        return document->writeToStream(stream, layout, error, parseOptions(*this));
-    };
+    const auto write = [&] { return document->writeToStream(stream, layout, error, options); };
     return document && written<bool>(write, error);
 }

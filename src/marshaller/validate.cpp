@@ -6,13 +6,7 @@
 #include "host/Log.h"
 #include "model/Errors.h"
 
-using qx::CountedSet;
-using qx::Key;
-using qx::Ref;
-using qx::String;
-using qx::Value;
-using qx::XMLElement;
-using qx::XMLNode;
+namespace qx::detail {
 
 namespace {
 
@@ -20,19 +14,19 @@ namespace {
 // counts; null where no name is left.
 class Unknown {
 public:
-    explicit Unknown(NameCounts& bound) : _bound(bound) {}
+    explicit Unknown(ConsumedNames& bound) : _bound(bound) {}
 
     void see(const String& name) {
         if (name.isNull() || _bound.take(name))
             return;
         if (!_names)
-            _names = qx::make<CountedSet>();
+            _names = make<CountedSet>();
         _names->add(name);
     }
     const Ref<CountedSet>& names() const noexcept { return _names; }
 
 private:
-    NameCounts& _bound;
+    ConsumedNames& _bound;
     Ref<CountedSet> _names;
 };
 
@@ -45,8 +39,8 @@ bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorS
         const bool allBound = plan != nullptr && hasBoundAllChildren(*plan, target);
         return (allBound || validateChildren(target, error)) && validateAttributes(target, error);
     }
-    NameCounts fields = target.bound.fields;
-    NameCounts attributes = target.bound.attributes;
+    ConsumedNames fields = target.bound.fields;
+    ConsumedNames attributes = target.bound.attributes;
     const Target copied{target.object, target.source, {fields, attributes}, target.isFlattened};
     return validateChildren(copied, error) && validateAttributes(copied, error);
 }
@@ -64,23 +58,22 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML())
-        return qx::fail(error, qx::errors::unknownFields, unknown.names(),
-                        target.source.element().name());
+        return fail(error, errors::unknownFields, unknown.names(), target.source.element().name());
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
     // host's log at all is asked of the warnings.
-    if (qx::hostHasLogWarning())
-        qx::logDebug("*** Warning: Unbound fields: %@", unknown.names());
+    if (hostHasLogWarning())
+        logDebug("*** Warning: Unbound fields: %@", unknown.names());
     else
-        qx::log("Unbound fields: %@", unknown.names());
+        log("Unbound fields: %@", unknown.names());
     return keepChildren(target, *unknown.names(), error);
 }
 
 // A name that is left is kept with all its elements, those that were consumed included.
 bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, ErrorSlot error) {
     static const Key key("unboundChildren");
-    auto kept = qx::make<qx::Dictionary>();
+    auto kept = make<Dictionary>();
     for (const String& name : names.names())
-        kept->set(name, qx::make<qx::Array>());
+        kept->set(name, make<Array>());
     bool fits = true;
     target.source.forEachChild([&](XMLNode& child) {
         const Value* elements = fits && child.isElement() ? kept->find(child.name()) : nullptr;
@@ -89,14 +82,14 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, 
         const auto node = target.source.keep(child, _budget, error);
         fits = node.get() != nullptr;
         if (fits)
-            static_cast<qx::Array*>(elements->object())->add(node);
+            static_cast<Array*>(elements->object())->add(node);
     });
     // A processing instruction leaves a name alone.
     std::size_t lone = 0;
     for (const auto& entry : *kept)
-        lone += static_cast<const qx::Array*>(entry.value.object())->isEmpty() ? 1 : 0;
+        lone += static_cast<const Array*>(entry.value.object())->isEmpty() ? 1 : 0;
     return fits && _budget.takeKept(lone, target.source.element(), error) &&
-           ObjectDoor::set(target.object, key, kept, error);
+           ObjectAccess::set(target.object, key, kept, error);
 }
 
 bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
@@ -112,14 +105,14 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML())
-        return qx::fail(error, qx::errors::unknownAttributes, unknown.names(), element.name());
-    qx::logWarningOrLine("Unbound attributes: %@", unknown.names());
+        return fail(error, errors::unknownAttributes, unknown.names(), element.name());
+    logWarningOrLine("Unbound attributes: %@", unknown.names());
     return keepAttributes(target, *unknown.names(), error);
 }
 
 bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error) {
     static const Key key("unboundAttributes");
-    auto kept = qx::make<qx::Array>();
+    auto kept = make<Array>();
     for (XMLNode& attribute : target.source.element().attributes()) {
         if (!names.contains(attribute.name()))
             continue;
@@ -128,5 +121,7 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
             return false;
         kept->add(std::move(node));
     }
-    return ObjectDoor::set(target.object, key, kept, error);
+    return ObjectAccess::set(target.object, key, kept, error);
 }
+
+} // namespace qx::detail

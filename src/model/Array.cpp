@@ -18,6 +18,10 @@ Array::Array(std::vector<Value> items)
 
 Array::~Array() = default;
 
+void* Array::operator new(std::size_t size) { return detail::ObjectMemory::allocate(size); }
+
+void Array::operator delete(void* memory) noexcept { detail::ObjectMemory::release(memory); }
+
 namespace {
 
 [[noreturn]] void raiseRange(std::size_t index, std::size_t count) {

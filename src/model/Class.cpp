@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "base/PropertyNames.h"
 #include "model/Warning.h"
 
 #include <algorithm>
@@ -94,7 +95,7 @@ struct ClassRegistry {
         return *made;
     }
 
-    const Class& publish(Class::Draft draft, bool listed) {
+    const Class& publish(detail::ClassDraft draft, bool listed) {
         const Key name = draft.name;
         const std::type_index type(*draft.type);
         // Warnings are given with the lock released: a host's log may ask for classes.
@@ -171,12 +172,12 @@ const Operation* findOperation(const std::vector<Operation>& operations, Selecto
 
 } // namespace
 
-Class::Class(Draft draft)
+Class::Class(detail::ClassDraft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),
       _create(draft.create), _properties(std::move(draft.properties)),
       _operations(std::move(draft.operations)), _classOperations(std::move(draft.classOperations)) {
     for (const Property& property : _properties)
-        property.key.markAsProperty();
+        detail::markAsProperty(property.key);
 }
 
 const Class* Class::named(std::string_view name) {
@@ -191,10 +192,6 @@ const Class* Class::described(const std::type_info& type) {
 bool Class::forget(std::string_view name) {
     const Key key = Key::existing(name);
     return !key.isNull() && ClassRegistry::shared().forget(key);
-}
-
-const Class& Class::publish(Draft draft, bool listed) {
-    return ClassRegistry::shared().publish(std::move(draft), listed);
 }
 
 const Class& Class::ofObject(const Object& object) {
@@ -283,7 +280,11 @@ bool Class::automaticallyNotifiesObserversForKey(Key key) const {
     return operation->invoke(selector, *this, nullptr, {&argument, 1}).boolValue();
 }
 
-namespace describe {
+namespace detail {
+
+const Class& publish(ClassDraft draft, bool listed) {
+    return ClassRegistry::shared().publish(std::move(draft), listed);
+}
 
 void raiseArgumentCount(Selector selector, const Class& receiver, std::size_t given) {
     throw Exception(
@@ -299,5 +300,5 @@ void raiseArgument(Selector selector, const Class& receiver, const Value& value)
                         " does not take the argument ", value.description()}));
 }
 
-} // namespace describe
+} // namespace detail
 } // namespace qx

@@ -14,6 +14,10 @@ namespace qx {
 
 Dictionary::~Dictionary() = default;
 
+void* Dictionary::operator new(std::size_t size) { return detail::ObjectMemory::allocate(size); }
+
+void Dictionary::operator delete(void* memory) noexcept { detail::ObjectMemory::release(memory); }
+
 void Dictionary::checkUnchanged(std::size_t changes) const {
     if (changes != _changes)
         throw Exception(Exception::generic, "a dictionary was changed while it was walked");
@@ -64,6 +68,20 @@ void Dictionary::set(const String& key, Value value) {
         return;
     }
     append(key, std::move(value));
+}
+
+bool Dictionary::add(const String& key, Value&& value) {
+    // The first few keys of most dictionaries are names, which tell themselves apart.
+    const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
+    if (!isFew || value.isNull())
+        return addAny(key, std::move(value));
+    for (const Entry& entry : _entries)
+        if (entry.key.isSameAs(key))
+            return addAny(key, std::move(value));
+    changed();
+    _entries.emplace_back(key, std::move(value));
+    ++_count;
+    return true;
 }
 
 bool Dictionary::addAny(const String& key, Value&& value) {
@@ -204,7 +222,7 @@ SetOutcome Dictionary::trySetValueForKey(const Value& value, Key key) {
 }
 
 const Class& Dictionary::describedClass() const {
-    using describe::memberProperty;
+    using detail::memberProperty;
     return libraryClass<Dictionary>(
         "qx::Dictionary", {memberProperty<Dictionary, &Dictionary::count>("count"),
                            memberProperty<Dictionary, &Dictionary::allKeys>("allKeys"),

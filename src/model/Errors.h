@@ -12,7 +12,6 @@
 
 #include <QXXMLMarshalling/model/Error.h>
 
-#include <array>
 #include <concepts>
 
 namespace qx {
@@ -112,57 +111,6 @@ inline constexpr ErrorText invalidFileName{
 inline constexpr ErrorText diskFull{640, "The disk is too full to write: %@", ""};
 inline constexpr ErrorText textCannotBeWritten{517, "The text cannot be written: %@", ""};
 inline constexpr ErrorText readOnlyDisk{642, "The disk is read-only: %@", ""};
-
-inline constexpr std::array table{&tooManyDescriptions,
-                                  &tooManyMapToElements,
-                                  &requiredAttributeNotFound,
-                                  &requiredAttributeMissing,
-                                  &requiredTextMissing,
-                                  &requiredElementMissing,
-                                  &illegalBoolean,
-                                  &tooManyBindXMLElements,
-                                  &classRedefined,
-                                  &elementRedefined,
-                                  &noMappingForClass,
-                                  &noMappingForDeclaredClass,
-                                  &unknownCollectionClass,
-                                  &unknownFieldNodeType,
-                                  &tooManyChildren,
-                                  &tooManyChildElements,
-                                  &noClassName,
-                                  &noMappingDefinition,
-                                  &noExtendsWhenMarshalling,
-                                  &noExtends,
-                                  &noDefinitionForElement,
-                                  &requiredValueMissing,
-                                  &tooManyClassElements,
-                                  &unknownFields,
-                                  &unknownAttributes,
-                                  &unableToLoadInclude,
-                                  &alternativesWithoutBindXML,
-                                  &tooManyElementsForField,
-                                  &notAnInteger,
-                                  &unableToSetValue,
-                                  &nestedTooDeep,
-                                  &tooManyObjects,
-                                  &tooManyKeptNodes,
-                                  &tooManyVisits,
-                                  &areaIsNoDirectory,
-                                  &readFailed,
-                                  &noRegularFile,
-                                  &fileTooLarge,
-                                  &noLocalURL,
-                                  &streamNotRead,
-                                  &streamNotWritten,
-                                  &readNotPermitted,
-                                  &fileNotFound,
-                                  &writeFailed,
-                                  &noRegularTarget,
-                                  &writeNotPermitted,
-                                  &invalidFileName,
-                                  &textCannotBeWritten,
-                                  &diskFull,
-                                  &readOnlyDisk};
 
 } // namespace errors
 

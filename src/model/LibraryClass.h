@@ -11,11 +11,11 @@ template <class T, class Base = Object>
 const Class& libraryClass(const char* name, std::vector<Property> properties = {}) {
     // A pointer, here and wherever a description is kept: some compilers take a reference that came
     // of a call with temporaries for one to these.
-    static const Class* const described = &Class::publish({.name = name,
-                                                           .type = &typeid(T),
-                                                           .superclass = &typeid(Base),
-                                                           .properties = std::move(properties)},
-                                                          false);
+    static const Class* const described = &detail::publish({.name = name,
+                                                            .type = &typeid(T),
+                                                            .superclass = &typeid(Base),
+                                                            .properties = std::move(properties)},
+                                                           false);
     return *described;
 }
 

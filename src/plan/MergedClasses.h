@@ -12,6 +12,8 @@
 #include <utility>
 #include <vector>
 
+namespace qx::detail {
+
 class MergedClasses {
 public:
     std::size_t count() const noexcept { return _count; }
@@ -25,16 +27,16 @@ public:
     // the error for the first that has not:
     //   -205  "Class redefined: %@"
     //   -205  "Element redefined: %@ class: %@"
-    bool areDistinctFrom(std::size_t begin, qx::Ref<qx::Error>* error) const {
+    bool areDistinctFrom(std::size_t begin, Ref<Error>* error) const {
         if (_latestRepeated <= begin)
             return true;
         const auto isIn = [begin](const Repeated& repeated) { return repeated.latest() > begin; };
         const Repeated& first = *std::find_if(_repeated.begin(), _repeated.end(), isIn);
-        const qx::String& className = first.mapping->className();
+        const String& className = first.mapping->className();
         if (first.sameClass > begin)
-            return qx::fail(error, qx::errors::classRedefined, className);
-        return qx::fail(error, qx::errors::elementRedefined,
-                        MappingPlan::elementNameOf(*first.mapping), className);
+            return fail(error, errors::classRedefined, className);
+        return fail(error, errors::elementRedefined, MappingPlan::elementNameOf(*first.mapping),
+                    className);
     }
 
 private:
@@ -64,3 +66,5 @@ private:
     std::vector<Repeated> _repeated;
     std::size_t _latestRepeated = 0;
 };
+
+} // namespace qx::detail

@@ -6,6 +6,9 @@
 using qx::Error;
 using qx::Ref;
 using qx::String;
+using qx::detail::ClassPlan;
+using qx::detail::IncludeLoader;
+using qx::detail::MappingPlan;
 
 QXXMLMarshallingMapping::QXXMLMarshallingMapping() = default;
 QXXMLMarshallingMapping::~QXXMLMarshallingMapping() = default;

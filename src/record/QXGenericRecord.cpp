@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Null.h>
@@ -19,11 +20,25 @@ using qx::Value;
 
 const char* const AllowMethodForwardingInGenericRecords = "AllowMethodForwardingInGenericRecords";
 
-QXGenericRecord::QXGenericRecord() : _tracking(*this) {}
+QXGenericRecord::QXGenericRecord() { setNotifyBindingsObservers(true); }
 
-QXGenericRecord::~QXGenericRecord() {
-    if (const auto manager = undoManager())
-        manager->removeAllActionsWithTarget(this);
+// Before the contents end.
+QXGenericRecord::~QXGenericRecord() { endUndo(); }
+
+void* QXGenericRecord::operator new(std::size_t size) {
+    return qx::detail::ObjectMemory::allocate(size);
+}
+
+void* QXGenericRecord::operator new(std::size_t size, std::align_val_t alignment) {
+    return ::operator new(size, alignment);
+}
+
+void QXGenericRecord::operator delete(void* memory) noexcept {
+    qx::detail::ObjectMemory::release(memory);
+}
+
+void QXGenericRecord::operator delete(void* memory, std::align_val_t alignment) noexcept {
+    ::operator delete(memory, alignment);
 }
 
 namespace {
@@ -35,13 +50,13 @@ Ref<QXGenericRecord> copyInZone(const QXGenericRecord& record, const Value&) {
 
 const qx::Class& describe() {
     using Record = QXGenericRecord;
-    using namespace qx::describe;
+    using namespace qx::detail;
     qx::UserDefaults::standardUserDefaults()->registerDefault(
         "NO", AllowMethodForwardingInGenericRecords);
-    return qx::Class::publish(
+    return qx::detail::publish(
         {.name = "QXGenericRecord",
          .type = &typeid(Record),
-         .superclass = &typeid(Object),
+         .superclass = &typeid(qx::UndoableObject),
          .create = []() -> Ref<Object> { return qx::make<Record>(); },
          .properties =
              {accessorProperty<Record, &Record::notifyBindingsObservers,
@@ -57,12 +72,10 @@ const qx::Class& describe() {
                         instanceOperation<Record, &Record::setNotifyBindingsObservers>(
                             "setNotifyBindingsObservers:"),
                         instanceOperation<Record, &Record::isRemovable>("isRemovable"),
-                        instanceOperation<Record, &Record::setUndoManager>("setUndoManager:"),
                         instanceOperation<Record, &Record::classNameForMarshalling>(
                             "classNameForMarshalling"),
                         instanceOperation<Record, &Record::notifyBindingsObservers>(
                             "notifyBindingsObservers"),
-                        instanceOperation<Record, &Record::undoManager>("undoManager"),
                         instanceOperation<Record, &Record::changeCache>("changeCache"),
                         instanceOperation<Record, &Record::setChangeCache>("setChangeCache:"),
                         instanceOperation<Record, &Record::className>("className"),
@@ -107,7 +120,7 @@ Ref<QXGenericRecord> QXGenericRecord::copyWithZone() const {
         auto deep = Dictionary::deepCopyFunction();
         copy->setContents(deep != nullptr ? deep(*_contents) : _contents->mutableCopy());
     }
-    copy->setNotifyBindingsObservers(_notifyBindingsObservers);
+    copy->setNotifyBindingsObservers(notifyBindingsObservers());
     return copy;
 }
 
@@ -128,8 +141,8 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
 // The many first values of a record that is read from a document: nobody is told, and what there is
 // to remember, that the key had no value, can be told later from the contents.
 bool QXGenericRecord::addQuietly(Key key, Value&& value) {
-    const bool isQuiet = (_isFilledQuietly || !_contents) && _tracking.isIdle() && !hasCompany() &&
-                         &isa() == &described;
+    const bool isQuiet = (has(Flag::filledQuietly) || !_contents) && tracking().isIdle() &&
+                         !hasObserversOrWeakRefs() && &isa() == &described;
     return isQuiet && !value.isNull() && !key.view().starts_with('@') &&
            filledContents()->add(key.string(), std::move(value));
 }
@@ -148,66 +161,36 @@ void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
 
 Ref<QXGenericRecord> QXGenericRecord::init() { return qx::make<QXGenericRecord>(); }
 
-void QXGenericRecord::_cacheValueForKey(Key key) { _tracking.cacheValueForKey(key); }
+void QXGenericRecord::_cacheValueForKey(Key key) { tracking().cacheValueForKey(key); }
 
-void QXGenericRecord::_setValue(const Value& value, Key key) { _tracking.restoreValue(value, key); }
+void QXGenericRecord::_setValue(const Value& value, Key key) {
+    tracking().restoreValue(value, key);
+}
 
 String QXGenericRecord::classNameForMarshalling() const {
     return _className.isNull() ? Object::classNameForMarshalling() : _className;
 }
 
-Ref<qx::UndoManager> QXGenericRecord::undoManager() const { return _tracking.undoManager(); }
-
-void QXGenericRecord::setUndoManager(Ref<qx::UndoManager> manager) {
-    _tracking.setUndoManager(std::move(manager));
-}
-
 Ref<Dictionary> QXGenericRecord::changeCache() const {
-    const Ref<Dictionary> cache = _tracking.changeCache();
-    if (_isFilledQuietly)
+    const Ref<Dictionary> cache = UndoableObject::changeCache();
+    if (has(Flag::filledQuietly))
         for (const auto& entry : *_contents)
             cache->add(entry.key, Value(qx::Null::marker()));
-    _isFilledQuietly = false;
+    set(Flag::filledQuietly, false);
     return cache;
 }
 
 void QXGenericRecord::setChangeCache(Ref<Dictionary> cache) {
-    _tracking.setChangeCache(std::move(cache));
-    _isFilledQuietly = false;
+    UndoableObject::setChangeCache(std::move(cache));
+    set(Flag::filledQuietly, false);
 }
 
 // What the old contents tell of earlier changes is noted before they go.
 void QXGenericRecord::setContents(Ref<Dictionary> contents) {
-    if (_isFilledQuietly && !_contents->isEmpty())
+    if (has(Flag::filledQuietly) && !_contents->isEmpty())
         changeCache();
     _contents = std::move(contents);
-    _isFilledQuietly = false;
-}
-
-void QXGenericRecord::willChangeValueForKey(Key key) {
-    _tracking.willChangeValueForKey(key);
-    Object::willChangeValueForKey(key);
-}
-
-void QXGenericRecord::didChangeValueForKey(Key key) {
-    try {
-        _tracking.didChangeValueForKey(key);
-    } catch (...) {
-        // Observers hear of the end of every change that they heard the beginning of.
-        Object::didChangeValueForKey(key);
-        throw;
-    }
-    Object::didChangeValueForKey(key);
-}
-
-void QXGenericRecord::willChange(qx::ChangeKind kind, std::span<const std::size_t> indexes,
-                                 Key key) {
-    _tracking.willChangeValueForKey(key);
-    Object::willChange(kind, indexes, key);
-}
-
-bool QXGenericRecord::isUndoRegistrationEnabledForKey(Key key) const {
-    return _tracking.isUndoRegistrationEnabledForKey(key);
+    set(Flag::filledQuietly, false);
 }
 
 String QXGenericRecord::description() const { return descriptionWithLocale(nullptr, 0); }

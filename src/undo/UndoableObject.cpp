@@ -6,15 +6,20 @@ namespace qx {
 
 UndoableObject::UndoableObject() : _tracking(*this) {}
 
-UndoableObject::~UndoableObject() {
-    if (const Ref<UndoManager>& manager = _tracking.undoManager())
-        manager->removeAllActionsWithTarget(this);
+UndoableObject::~UndoableObject() { endUndo(); }
+
+void UndoableObject::endUndo() noexcept {
+    const Ref<UndoManager> manager = undoManager();
+    if (!manager)
+        return;
+    manager->removeAllActionsWithTarget(this);
+    setUndoManager(nullptr);
 }
 
 const Class& UndoableObject::classObject() {
     using Self = UndoableObject;
-    using describe::instanceOperation;
-    static const Class* const described = &Class::publish(
+    using detail::instanceOperation;
+    static const Class* const described = &detail::publish(
         {.name = "qx::UndoableObject",
          .type = &typeid(Self),
          .superclass = &typeid(Object),

@@ -9,8 +9,6 @@
 
 #include <QXXMLMarshalling/model/Error.h>
 
-#include <array>
-
 namespace qx {
 
 namespace parseErrors {
@@ -65,32 +63,6 @@ inline constexpr ErrorText tooManyNamespaces{
     1, "More namespace declarations are in force than the limit of %@", beyondLimit};
 inline constexpr ErrorText expansionTooLarge{
     89, "Entities and attribute defaults bring in more than the limit of %@ bytes", beyondLimit};
-
-inline constexpr std::array table{&empty,
-                                  &noStartTag,
-                                  &zeroByte,
-                                  &unknownVersion,
-                                  &externalEntity,
-                                  &undeclaredEntity,
-                                  &notationWithoutIdentifier,
-                                  &doctypeRefused,
-                                  &otherEncoding,
-                                  &unknownEncoding,
-                                  &malformedCharacter,
-                                  &documentTooLarge,
-                                  &tooDeep,
-                                  &nameTooLarge,
-                                  &valueTooLarge,
-                                  &textTooLarge,
-                                  &commentTooLarge,
-                                  &instructionTooLarge,
-                                  &tooManyNames,
-                                  &tooManyDefaults,
-                                  &tooManyAttributes,
-                                  &subsetTooLarge,
-                                  &entitiesTooDeep,
-                                  &tooManyNamespaces,
-                                  &expansionTooLarge};
 
 } // namespace parseErrors
 

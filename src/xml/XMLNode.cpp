@@ -91,7 +91,7 @@ String XMLNode::XMLString(XMLOptions options) const {
 String XMLNode::description() const { return written(*this, XMLNoOptions, XMLChecks::off); }
 
 const Class& XMLNode::describedClass() const {
-    static const Class* const described = &Class::publish(
+    static const Class* const described = &detail::publish(
         {.name = "qx::XMLNode", .type = &typeid(XMLNode), .superclass = &typeid(Object)}, false);
     return *described;
 }

@@ -19,7 +19,7 @@ TEST(ShortVector, GrowsWithACopyOfWhatItHoldsAndEndsItInOrder) {
     };
     std::string ended;
     {
-        qx::ShortVector<Item, 2> items;
+        qx::detail::ShortVector<Item, 2> items;
         items.emplace_back("a", &ended);
         items.emplace_back("b", &ended);
         items.emplace_back(items[0]);

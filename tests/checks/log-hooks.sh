@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# A host's log functions are found however host and library come together at run time. Hosts that link
-# the library are the programs log_*.cpp; here are those that load it.
+# What the library says goes to the host's log functions, and to standard error where there are none;
+# they are found however host and library come together at run time: linked (log-host.cpp) or loaded.
 #
 # usage: log-hooks.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
@@ -64,7 +64,48 @@ compile host.cpp -o host -ldl
 compile host.cpp hooks.cpp -o host-with-hooks -ldl -Wl,-rpath,"$build/lib"
 compile -rdynamic host.cpp hooks.cpp -o host-exporting-hooks -ldl
 
+# Standard error first, without the head of each line; then what the functions were told.
+saidWith() {
+    compile "$@" "$source/tests/checks/log-host.cpp" -o log-host "${library[@]}"
+    ./log-host 2>errors >told || echo "ended with $?"
+    sed -E 's/^[0-9-]+ [0-9:.]+ Client\[[0-9]+\] /line: /' errors told |
+        sed -E 's#/tmp/qx-log-[A-Za-z0-9]+#FOLDER#; s/0x[0-9a-f]+/ADDRESS/; s/(Premature end).*/\1/; s/(The class name Taken is taken).*/\1/'
+}
 status=0
+warnings='The class name Taken is taken
+Unable to read the property list FOLDER/Client.plist: Premature end
+Unable to read the property list FOLDER/Info.plist: Premature end'
+attributes='Unbound attributes: (number [1])'
+fields='Unbound fields: (note [1])'
+record='Set for key: title existing: untold value: Emma
+Set for key: pages existing: (null) value: 300
+<QXGenericRecord:ADDRESS: _setValue:forKey: pages, (null)
+Undo for key: pages existing: 300 value: (null)
+<QXGenericRecord:ADDRESS: _setValue:forKey: title, untold
+Undo for key: title existing: Emma value: untold
+<QXGenericRecord:ADDRESS: _setValue:forKey: title, Emma
+Redo for key: title existing: untold value: Emma
+<QXGenericRecord:ADDRESS: _setValue:forKey: pages, 300
+Redo for key: pages existing: (null) value: 300'
+as() { printf '%s\n' "${@:2}" | sed "s/^/$1: /"; }
+# A function that asks for the files hears of them first, from the last one on.
+nested=$(tac <<<"$warnings")
+lines=$(as line "$warnings" "$fields" "$attributes")
+for hooks in "" "-DWITH_DEBUG" "-DWITH_WARNING" "-DWITH_DEBUG -DWITH_WARNING"; do
+    case $hooks in
+    "") expected=$lines ;;
+    -DWITH_DEBUG) expected=$lines$'\n'$(as debug "$record") ;;
+    -DWITH_WARNING) expected=$(as warning "$nested" "$attributes") ;;
+    *)
+        expected=$(as warning "$nested"; as debug "*** Warning: $fields"
+            as warning "$attributes"; as debug "$record") ;;
+    esac
+    # shellcheck disable=SC2086 # the flags are words
+    if ! diff <(printf '%s\n' "$expected") <(saidWith $hooks); then
+        echo "a host with other words: ${hooks:-no functions}" >&2
+        status=1
+    fi
+done
 # expect "PLACE..." COMMAND...: where the warnings went, in order.
 expect() {
     local expected=$1 actual

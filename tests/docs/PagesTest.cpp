@@ -9,7 +9,7 @@
 //
 // Options are "strict", "discard" and "no-namespaces"; blocks with other words are left alone.
 
-#include "model/Errors.h"
+#include "support/ErrorRows.h"
 #include "support/Page.h"
 #include "support/Show.h"
 
@@ -123,8 +123,8 @@ TEST(Pages, ListEveryError) {
             listed.insert(line.substr(2, line.find(' ', 2) - 1) +
                           line.substr(start, line.find('`', start) - start));
         }
-    for (const qx::ErrorText* text : qx::errors::table)
-        if (text->code < 0 && text->code > -1000)
-            known.insert(std::to_string(text->code) + " " + text->message);
+    for (const auto& [code, message] : support::errorRows(support::libraryErrors))
+        if (std::stoi(code) < 0 && std::stoi(code) > -1000)
+            known.insert(code + " " + message);
     EXPECT_EQ(listed, known);
 }

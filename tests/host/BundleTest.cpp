@@ -30,10 +30,7 @@ const std::type_info& typeOfRunTime() {
 } // namespace
 
 extern "C" void makeLastingObjects();
-extern "C" void makeLastingObjects() {
-    FileSandbox::makeLastingObjects();
-    Bundle::bundleForClass(typeOfRunTime());
-}
+extern "C" void makeLastingObjects() { Bundle::bundleForClass(typeOfRunTime()); }
 
 TEST_F(BundleTest, TheInfoDictionaryHoldsEveryKindOfAPropertyList) {
     sandbox.write("app/Info.plist", R"(<?xml version="1.0" encoding="UTF-8"?>

@@ -1,7 +1,7 @@
 // Documents are read, edited and written: undoing all that was edited gives the text again that
 // they would have been written with.
 
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>

@@ -1,9 +1,11 @@
 // Mappings and documents that multiply: a reading makes, keeps and goes over as much as its limits
 // say, and ends in an error beyond, whatever made it.
 
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
+
+#include <ctime>
 
 namespace {
 
@@ -48,6 +50,15 @@ std::string flattenedTwice() {
     return mapping + "<class name='C30'/>";
 }
 
+// Each ancestor makes a private copy of its own.
+std::string flattenedByAncestors() {
+    std::string mapping;
+    for (int i = 0; i < 500; ++i)
+        mapping += "<class name='C" + std::to_string(i) + "' extends='C" + std::to_string(i + 1) +
+                   "'>" + field("x", "container='false'", "node='attribute'") + "</class>";
+    return mapping + "<class name='C500'/>";
+}
+
 } // namespace
 
 TEST(Hostile, ReadingsThatMultiplyEndInAnError) {
@@ -76,6 +87,9 @@ TEST(Hostile, ReadingsThatMultiplyEndInAnError) {
         {"many children that nobody wants", twice(), nested(20, repeated("<b/>", 2000)),
          scenario::discard,
          "-224: Reading goes over more nodes than the limit of 806400: a (Invalid Mapping)"},
+        {"copies for every ancestor", flattenedByAncestors(),
+         "<c0>" + repeated("<b/>", 2000) + "</c0>", scenario::discard,
+         "-224: Reading goes over more nodes than the limit of 800320: c0 (Invalid Mapping)"},
         {"text that is put together", twice(field("t", "", "node='text'")),
          nested(20, repeated("<b><c/>some text</b>", 2000)), scenario::discard,
          "-224: Reading goes over more nodes than the limit of 1646400: a (Invalid Mapping)"},
@@ -86,6 +100,18 @@ TEST(Hostile, ReadingsThatMultiplyEndInAnError) {
         EXPECT_EQ(scenario::read(*marshaller, document), expected);
         EXPECT_FALSE(marshaller->readString(document)) << "half an object, without a slot";
     }
+}
+
+// Each field would refuse every child, again and again.
+TEST(Hostile, ReadingsThatPassOverWhatIsRefusedEndSoon) {
+    std::string fields;
+    for (int i = 0; i < 1000; ++i)
+        fields += field("x" + std::to_string(i), "collection='array'", "name='a'");
+    const auto marshaller = scenario::marshaller("<class name='A'>" + fields + "</class>");
+    marshaller->setMaximumDepth(1);
+    const std::clock_t start = std::clock();
+    EXPECT_FALSE(marshaller->readString(nested(1, repeated("<a/>", 100'000))));
+    EXPECT_LT(std::clock() - start, 2 * CLOCKS_PER_SEC);
 }
 
 TEST(Hostile, SmallDocumentsPassHoweverTheyAreRead) {
@@ -101,6 +127,22 @@ TEST(Hostile, SmallDocumentsPassHoweverTheyAreRead) {
         Ref<qx::Error> error;
         EXPECT_TRUE(marshaller->readString(nested(depth), &error)) << scenario::show(error);
     }
+}
+
+TEST(Hostile, AttributesThatManyObjectsKeepCountOnce) {
+    std::string attributes;
+    for (int i = 0; i < 20; ++i)
+        attributes += " a" + std::to_string(i) + "=''";
+    std::string fields;
+    for (const char* name : {"u", "v", "w", "x", "y"})
+        fields += field(name, "type='Flat' container='false'", "node='element'");
+    const auto marshaller =
+        scenario::marshaller("<class name='Flat'/><class name='A'>" + fields + "</class><class " +
+                             "name='List'>" + field("all", "collection='array'", "") + "</class>");
+    Ref<qx::Error> error;
+    EXPECT_TRUE(marshaller->readString(
+        "<list>" + repeated("<a" + attributes + "/>", 1000) + "</list>", &error))
+        << scenario::show(error);
 }
 
 TEST(Hostile, LimitsAreTheHosts) {

@@ -1,7 +1,7 @@
 // Objects become XML: what each kind of field writes, and which values are left out or refused.
 
 #include "Host.h"
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/base/Exception.h>

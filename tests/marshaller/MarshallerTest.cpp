@@ -1,7 +1,7 @@
 // The marshaller itself: construction, options, what it asks of host objects, and its limits.
 
 #include "Host.h"
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/base/Exception.h>

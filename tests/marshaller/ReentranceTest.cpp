@@ -1,7 +1,7 @@
 // Host objects that turn on the reading that makes them: whatever their setters do to the document,
 // the marshaller and its options, no freed memory is used and no list loses an item.
 
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>
@@ -31,7 +31,10 @@ public:
     void setUndoManager(qx::UndoManager*) { Meddling::call(); }
     qx::Object* rootObject() { return this; }
     void setParent(qx::Object*) { Meddling::call(); }
-    bool isRemovable() const { return false; }
+    bool isRemovable() const {
+        Meddling::call();
+        return false;
+    }
 
     template <int Key>
     void set(const Value& value) {
@@ -224,4 +227,23 @@ TEST(Reentrance, OptionsHoldFromTheMomentTheyAreSet) {
     EXPECT_NE(kept.find("unboundAttributes: [b=\"2\"], unboundChildren: {x: [<x></x>]}"),
               std::string::npos)
         << kept;
+}
+
+TEST(Reentrance, AWritingHoldsWhatItsGettersLetGoOf) {
+    auto marshaller =
+        scenario::marshaller("<class name='ReentranceTest.Meddler'><map-to xml='one'/>"
+                             "<field name='all' collection='array'><bind-xml/></field>"
+                             "<field name='id'><bind-xml node='attribute'/></field></class>");
+    const auto item = qx::make<Meddler>();
+    item->set<0>("2");
+    const auto items = qx::make<qx::Array>();
+    items->add(item);
+    Value object = qx::make<Meddler>();
+    object.object()->setValueForKey(items, "all");
+    object.object()->setValueForKey("1", "id");
+    Meddling::act = [&] { object = marshaller = nullptr; };
+    Meddling::countdown = 0; // asked for the item
+    EXPECT_NE(marshaller->writeString(object).view().find("<one id=\"1\">\n    <one id=\"2\""),
+              std::string_view::npos);
+    Meddling::countdown = -1;
 }

@@ -1,7 +1,7 @@
 // Documents are read and written again: what comes back as it was, and what does not.
 
 #include "Host.h"
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 namespace {
 

@@ -1,7 +1,7 @@
 // Documents become objects: one table, run on records and on host classes.
 
 #include "Host.h"
-#include "Scenario.h"
+#include "support/Scenario.h"
 
 namespace {
 

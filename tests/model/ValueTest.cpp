@@ -48,7 +48,6 @@ public:
 };
 
 const bool described = [] {
-    Null::marker(); // lasts: made before a test counts it
     Class::define<Holder>("ValueTest.Holder")
         .property<&Holder::flag>("flag")
         .property<&Holder::small>("small")
@@ -140,13 +139,11 @@ TEST(ValueTest, EqualNumbersAreEqualWhateverTheirKindAndNoOthers) {
     EXPECT_NE(Value("3"), Value(3));
 }
 
+// Paths through nulls and to what is no object: ObjectTest.cpp.
 TEST(ValueTest, PathsLeadThroughObjectsAndLists) {
     const auto holder = make<Holder>();
     holder->next = make<Holder>();
     holder->setValueForKeyPath(7, "next.small");
-    EXPECT_EQ(holder->next->small, 7);
-    EXPECT_EQ(holder->valueForKeyPath("next.small"), Value(7));
-    holder->setValueForKeyPath(7, "next.next.small"); // leads nowhere
     const auto list = array({holder, holder->next, "text"});
     EXPECT_EQ(oneLine(list->valueForKey("small")), "( 0, 7, <null> )");
     EXPECT_EQ(list->valueForKey("@count"), Value(3));
@@ -160,12 +157,11 @@ TEST(ValueTest, PathsLeadThroughObjectsAndLists) {
 
 TEST(ValueTest, CollectionsRaiseForWhatTheyCannotDo) {
     const auto list = array({1});
-    EXPECT_EQ(raised([&] { list->at(1); }), "NSRangeException: index 1 in an array of 1 items");
-    EXPECT_EQ(raised([&] { list->insert(2, 0); }),
-              "NSRangeException: index 2 in an array of 1 items");
-    EXPECT_EQ(raised([&] { list->replace(1, 0); }),
-              "NSRangeException: index 1 in an array of 1 items");
-    EXPECT_EQ(raised([&] { list->remove(1); }), "NSRangeException: index 1 in an array of 1 items");
+    const std::string range = " in an array of 1 items";
+    EXPECT_EQ(raised([&] { list->at(1); }), "NSRangeException: index 1" + range);
+    EXPECT_EQ(raised([&] { list->insert(2, 0); }), "NSRangeException: index 2" + range);
+    EXPECT_EQ(raised([&] { list->replace(1, 0); }), "NSRangeException: index 1" + range);
+    EXPECT_EQ(raised([&] { list->remove(1); }), "NSRangeException: index 1" + range);
 }
 
 TEST(ValueTest, DictionariesAreEqualWhateverTheirOrder) {

@@ -91,16 +91,19 @@ struct ObservationTest : testing::Test {
         call();
         return notebook->notes;
     }
+    Texts afterSetting(Object& object, Key key, const Value& value) {
+        return notes([&] { object.setValueForKey(value, key); });
+    }
 };
 
 TEST_F(ObservationTest, EachChangeIsToldOnceWithOldAndNew) {
     const auto rome = place("Rome");
     rome->addObserver(notebook.get(), "city");
-    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
-    EXPECT_EQ(notes([&] { rome->setValueForKey(nullptr, "city"); }), Texts{"city: Roma > <null>"});
-    EXPECT_EQ(notes([&] { rome->setValueForKey("Italy", "country"); }), Texts{});
+    EXPECT_EQ(afterSetting(*rome, "city", "Roma"), Texts{"city: Rome > Roma"});
+    EXPECT_EQ(afterSetting(*rome, "city", nullptr), Texts{"city: Roma > <null>"});
+    EXPECT_EQ(afterSetting(*rome, "country", "Italy"), Texts{});
     rome->removeObserver(notebook.get(), "city");
-    EXPECT_EQ(notes([&] { rome->setValueForKey("Rome", "city"); }), Texts{});
+    EXPECT_EQ(afterSetting(*rome, "city", "Rome"), Texts{});
     EXPECT_THROW(rome->removeObserver(notebook.get(), "city"), Exception);
 }
 
@@ -130,20 +133,20 @@ TEST_F(ObservationTest, APathThroughThreeObjectsHearsOfEachOfThem) {
     const auto rome = place("Rome", italy);
     rome->addObserver(notebook.get(), "within.within.city",
                       Observing::newValue | Observing::oldValue, "far");
-    EXPECT_EQ(notes([&] { europe->setValueForKey("EU", "city"); }), Texts{"far: Europe > EU"});
-    EXPECT_EQ(notes([&] { italy->setValueForKey(asia, "within"); }), Texts{"far: EU > Asia"});
-    EXPECT_EQ(notes([&] { rome->setValueForKey(japan, "within"); }), Texts{"far: Asia > Asia"});
-    EXPECT_EQ(notes([&] { italy->setValueForKey(europe, "within"); }), Texts{});
-    EXPECT_EQ(notes([&] { rome->setValueForKey(nullptr, "within"); }), Texts{"far: Asia > <null>"});
-    EXPECT_EQ(notes([&] { asia->setValueForKey("A", "city"); }), Texts{});
+    EXPECT_EQ(afterSetting(*europe, "city", "EU"), Texts{"far: Europe > EU"});
+    EXPECT_EQ(afterSetting(*italy, "within", asia), Texts{"far: EU > Asia"});
+    EXPECT_EQ(afterSetting(*rome, "within", japan), Texts{"far: Asia > Asia"});
+    EXPECT_EQ(afterSetting(*italy, "within", europe), Texts{});
+    EXPECT_EQ(afterSetting(*rome, "within", nullptr), Texts{"far: Asia > <null>"});
+    EXPECT_EQ(afterSetting(*asia, "city", "A"), Texts{});
 }
 
 TEST_F(ObservationTest, DependentValuesAreToldOfWhatTheyDependOn) {
     const auto rome = place("Rome", place("Italy"));
     rome->addObserver(notebook.get(), "address");
-    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }),
+    EXPECT_EQ(afterSetting(*rome, "city", "Roma"),
               Texts{"address: Rome,  in Italy > Roma,  in Italy"});
-    EXPECT_EQ(notes([&] { rome->within->setValueForKey("Italia", "city"); }),
+    EXPECT_EQ(afterSetting(*rome->within, "city", "Italia"),
               Texts{"address: Roma,  in Italy > Roma,  in Italia"});
     rome->setValueForKey(place("EU"), "within");
     EXPECT_EQ(notes([&] {
@@ -159,17 +162,16 @@ TEST_F(ObservationTest, DependenciesReachAnyDistanceAndMayFormRings) {
     const auto two = place("Two", one);
     one->within = two;
     two->addObserver(notebook.get(), "ring", 0, "of two");
-    EXPECT_EQ(notes([&] { one->setValueForKey("one", "ring"); }), Texts{"of two: (null) > (null)"});
+    EXPECT_EQ(afterSetting(*one, "ring", "one"), Texts{"of two: (null) > (null)"});
     const auto end = place("end", one);
     auto chain = end;
     for (int i = 0; i < 20000; ++i)
         chain = place("link", chain);
     chain->addObserver(notebook.get(), "ring");
-    EXPECT_EQ(notes([&] { end->setValueForKey("new", "ring"); }), Texts{"ring: link > link"});
-    EXPECT_EQ(notes([&] { end->setValueForKey(place("other"), "within"); }),
-              Texts{"ring: link > link"});
-    EXPECT_EQ(notes([&] { one->setValueForKey("1", "ring"); }), Texts{"of two: (null) > (null)"});
-    EXPECT_EQ(notes([&] { end->within->setValueForKey("2", "ring"); }), Texts{"ring: link > link"});
+    EXPECT_EQ(afterSetting(*end, "ring", "new"), Texts{"ring: link > link"});
+    EXPECT_EQ(afterSetting(*end, "within", place("other")), Texts{"ring: link > link"});
+    EXPECT_EQ(afterSetting(*one, "ring", "1"), Texts{"of two: (null) > (null)"});
+    EXPECT_EQ(afterSetting(*end->within, "ring", "2"), Texts{"ring: link > link"});
     one->setValueForKey(nullptr, "within");
 }
 
@@ -178,12 +180,10 @@ TEST_F(ObservationTest, APathMayComeBackToWhereItBeganAndEndInADependentValue) {
     const auto rome = place("Rome", italy);
     italy->within = rome;
     rome->addObserver(notebook.get(), "within.within.address", 0, "back");
-    EXPECT_EQ(notes([&] { italy->setValueForKey("Italia", "city"); }),
-              Texts{"back: (null) > (null)"});
-    EXPECT_EQ(notes([&] { rome->setValueForKey("EU", "country"); }),
-              Texts{"back: (null) > (null)"});
+    EXPECT_EQ(afterSetting(*italy, "city", "Italia"), Texts{"back: (null) > (null)"});
+    EXPECT_EQ(afterSetting(*rome, "country", "EU"), Texts{"back: (null) > (null)"});
     italy->setValueForKey(nullptr, "within");
-    EXPECT_EQ(notes([&] { rome->setValueForKey("IT", "country"); }), Texts{});
+    EXPECT_EQ(afterSetting(*rome, "country", "IT"), Texts{});
 }
 
 TEST_F(ObservationTest, NestedChangesOfOneKeyAreToldWhenTheOutermostEnds) {
@@ -203,7 +203,7 @@ TEST_F(ObservationTest, NestedChangesOfOneKeyAreToldWhenTheOutermostEnds) {
 TEST_F(ObservationTest, KeysWithoutAutomaticNotificationAreAnnouncedByHand) {
     const auto rome = place("Rome");
     rome->addObserver(notebook.get(), "silent");
-    EXPECT_EQ(notes([&] { rome->setValueForKey("one", "silent"); }), Texts{});
+    EXPECT_EQ(afterSetting(*rome, "silent", "one"), Texts{});
     EXPECT_EQ(notes([&] {
                   rome->willChangeValueForKey("silent");
                   rome->setValueForKey("two", "silent");
@@ -242,7 +242,7 @@ TEST_F(ObservationTest, ObserversAreToldInTheirOrderAndRemovedLatestFirst) {
         rome->addObserver(notebook.get(), "city", 0, context);
     const auto told = [&] {
         std::string order;
-        for (const auto& note : notes([&] { rome->setValueForKey("Roma", "city"); }))
+        for (const auto& note : afterSetting(*rome, "city", "Roma"))
             order += note.front();
         return order;
     };
@@ -352,7 +352,7 @@ TEST_F(ObservationTest, WhatAnObserverThrowsComesOutWhenAllHaveBeenTold) {
     EXPECT_EQ(notes([&] { EXPECT_THROW(rome->setValueForKey("A", "city"), Exception); }),
               Texts{"city: Rome > A"});
     rome->removeObserver(deaf.get(), "city");
-    EXPECT_EQ(notes([&] { rome->setValueForKey("B", "city"); }), Texts{"city: A > B"});
+    EXPECT_EQ(afterSetting(*rome, "city", "B"), Texts{"city: A > B"});
 }
 
 TEST_F(ObservationTest, AChangeThatFailsInItsScopeIsStillTold) {
@@ -383,7 +383,7 @@ TEST_F(ObservationTest, AThrowingPriorObserverCancelsTheAnnouncement) {
     EXPECT_THROW(rome->setValueForKey("Roma", "city"), std::runtime_error);
     EXPECT_EQ(rome->city, "Rome");
     refuses = false;
-    EXPECT_EQ(notes([&] { rome->setValueForKey("Roma", "city"); }), Texts{"city: Rome > Roma"});
+    EXPECT_EQ(afterSetting(*rome, "city", "Roma"), Texts{"city: Rome > Roma"});
 }
 
 TEST_F(ObservationTest, ManyObservationsCostTheSameInAnyOrder) {
@@ -402,7 +402,7 @@ TEST_F(ObservationTest, ManyObservationsCostTheSameInAnyOrder) {
         shared->addObserver(notebook.get(), keys.back(), 0);
     }
     places.clear();
-    EXPECT_EQ(notes([&] { shared->setValueForKey("Italia", "city"); }), Texts{});
+    EXPECT_EQ(afterSetting(*shared, "city", "Italia"), Texts{});
     for (const Key key : keys)
         shared->willChangeValueForKey(key);
     EXPECT_EQ(notes([&] {
@@ -491,7 +491,7 @@ TEST_F(ObservationTest, ObserversMayDoAnythingWhileTheyAreTold) {
     // Whatever happened, what is observed now is told.
     const auto rome = place("Rome", chaos.places[0] ? chaos.places[0] : place("Italy"));
     rome->addObserver(notebook.get(), "within.city", 0);
-    EXPECT_EQ(notes([&] { rome->within->setValueForKey("Italia", "city"); }).size(), 1U);
+    EXPECT_EQ(afterSetting(*rome->within, "city", "Italia").size(), 1U);
 }
 
 } // namespace

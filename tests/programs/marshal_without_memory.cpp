@@ -2,88 +2,31 @@
 // once with all that follow. The operation then gives std::bad_alloc or what it gives otherwise,
 // and does its work on the same objects when it is called again.
 
+#include "FailingMemory.h"
+
 #include <QXXMLMarshalling/QXXMLMarshalling.h>
 
 #include <array>
-#include <cstdlib>
-#include <functional>
+#include <fstream>
 #include <iostream>
-#include <new>
+#include <sstream>
 #include <streambuf>
-
-#include <dlfcn.h>
-
-namespace {
-
-constexpr long never = -1;
-long countdown = never; // allocations until one fails
-bool allFollowing = false;
-long failures = 0;
-
-bool failsNow() {
-    if (countdown > 0)
-        --countdown;
-    else if (countdown == 0) {
-        ++failures;
-        countdown = allFollowing ? 0 : never;
-        return true;
-    }
-    return false;
-}
-
-void* allocated(std::size_t size) {
-    void* const memory = failsNow() ? nullptr : std::malloc(size);
-    if (memory == nullptr)
-        throw std::bad_alloc();
-    return memory;
-}
-
-} // namespace
-
-// The memory of texts. What Clang links into a program of its own for the sanitizers stays there.
-#ifndef __clang__
-extern "C" void* realloc(void* memory, std::size_t size) {
-    using Realloc = void* (*)(void*, std::size_t);
-    static const auto next = reinterpret_cast<Realloc>(::dlsym(RTLD_NEXT, "realloc"));
-    return failsNow() ? nullptr : next(memory, size);
-}
-#endif
-
-void* operator new(std::size_t size) { return allocated(size); }
-void* operator new[](std::size_t size) { return allocated(size); }
-void operator delete(void* memory) noexcept { std::free(memory); }
-void operator delete[](void* memory) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
-void operator delete[](void* memory, std::size_t) noexcept { std::free(memory); }
 
 namespace {
 
 using qx::Error;
 using qx::Ref;
 
-constexpr const char* mappingText = R"(<mapping>
-    <class name="Order" extends="Base"><map-to xml="order" ns-uri="urn:o"/>
-        <field name="number" required="true"><bind-xml name="n" node="attribute"/></field>
-        <field name="day"><bind-xml name="on" node="attribute" location="received"/></field>
-        <field name="text"><bind-xml name="text" node="element"/></field>
-        <field name="any"><bind-xml name="any"/></field>
-        <field name="to" type="Address"><bind-xml name="to" node="element"/></field>
-        <field name="lines" type="Line" collection="array">
-            <bind-xml name="line" location="lines"/></field>
-        <field name="rest" collection="array"><bind-xml name="rest"/></field>
-        <field name="flat" type="Address" container="false"><bind-xml node="element"/></field>
-    </class>
-    <class name="Base"><field name="count" type="int"><bind-xml name="c" node="attribute"/></field>
-    </class>
-    <class name="Address"><field name="street"><bind-xml name="street" node="element"/></field>
-    </class>
-    <class name="Line"><field name="text"><bind-xml node="text"/></field></class>
-</mapping>)";
-constexpr const char* documentText =
-    "<order xmlns='urn:o' xmlns:p='urn:p' n='a number that is long' c='7' extra='1'>"
-    "<received on='today'/><text>a text that needs memory of its own</text><any>any</any>"
-    "<to><street>Quay</street><more/></to><lines><line>one</line><line>two</line></lines>"
-    "<rest><line>three</line></rest><street>Road</street><unknown a='1'>kept</unknown></order>";
+// Of a first input of the fuzz program: the mapping, and behind a line the document.
+std::string part(bool isDocument) {
+    std::ostringstream text;
+    text << std::ifstream(QX_SOURCE_DIR "/fuzz/seeds/pair/every-kind.xml").rdbuf();
+    const std::string both = text.str(), line = "<?document?>\n";
+    const std::size_t at = both.find(line);
+    return isDocument ? both.substr(at + line.size()) : both.substr(0, at);
+}
+const std::string mappingText = part(false);
+const std::string documentText = part(true);
 
 // What one operation works on; made anew for each run, without failures.
 struct Stage {
@@ -224,30 +167,27 @@ std::vector<Named> readingOperations() {
     const std::size_t count = Stage().type().fields().size();
     for (std::size_t i = 0; i < count; ++i) {
         const std::string number = " " + std::to_string(i);
-        all.push_back(binding("bindField" + number, [i](Stage& s) {
-            return s.marshaller->bindField(s.field(i), *s.target, 0, *s.root, *s.fields,
-                                           *s.attributes, false, &s.error);
-        }));
-        all.push_back(binding("bindFieldAsAttribute" + number, [i](Stage& s) {
-            return s.marshaller->bindFieldAsAttribute(s.field(i), *s.target, 0, *s.root, *s.fields,
-                                                      *s.attributes, &s.error);
-        }));
-        all.push_back(binding("bindFieldAsText" + number, [i](Stage& s) {
-            return s.marshaller->bindFieldAsText(s.field(i), *s.target, 0, *s.root, *s.fields,
-                                                 *s.attributes, &s.error);
-        }));
-        all.push_back(binding("bindFieldAsElement" + number, [i](Stage& s) {
-            return s.marshaller->bindFieldAsElement(s.field(i), *s.target, 0, *s.root, *s.fields,
-                                                    *s.attributes, false, &s.error);
-        }));
-        all.push_back(binding("bindCollectionField" + number, [i](Stage& s) {
-            return s.marshaller->bindCollectionField(s.field(i), *s.target, *s.root, *s.fields,
-                                                     *s.attributes, &s.error);
-        }));
-        all.push_back(binding("bindArrayFieldByType" + number, [i](Stage& s) {
-            return s.marshaller->bindArrayFieldByType(s.field(i), *s.target, *s.root, *s.fields,
-                                                      *s.attributes, &s.error);
-        }));
+        using M = QXXMLMarshaller;
+        for (const auto& [name, bind] : {std::pair{"bindField", &M::bindField},
+                                         std::pair{"bindFieldAsElement", &M::bindFieldAsElement}})
+            all.push_back(binding(name + number, [i, step = bind](Stage& s) {
+                return (*s.marshaller.*step)(s.field(i), *s.target, 0, *s.root, *s.fields,
+                                             *s.attributes, false, &s.error);
+            }));
+        for (const auto& [name, bind] :
+             {std::pair{"bindFieldAsAttribute", &M::bindFieldAsAttribute},
+              std::pair{"bindFieldAsText", &M::bindFieldAsText}})
+            all.push_back(binding(name + number, [i, step = bind](Stage& s) {
+                return (*s.marshaller.*step)(s.field(i), *s.target, 0, *s.root, *s.fields,
+                                             *s.attributes, &s.error);
+            }));
+        for (const auto& [name, bind] :
+             {std::pair{"bindCollectionField", &M::bindCollectionField},
+              std::pair{"bindArrayFieldByType", &M::bindArrayFieldByType}})
+            all.push_back(binding(name + number, [i, step = bind](Stage& s) {
+                return (*s.marshaller.*step)(s.field(i), *s.target, *s.root, *s.fields,
+                                             *s.attributes, &s.error);
+            }));
     }
     return all;
 }
@@ -296,50 +236,36 @@ std::vector<Named> writingOperations() {
 
 std::string outcome(const Named& operation, Stage& stage) {
     const auto show = operation.run(stage);
-    countdown = never;
+    failing::countdown = failing::never;
     return show();
 }
 
-bool complain(const std::string& what, long n, const std::string& got,
-              const std::string& expected) {
-    std::cout << what << ", allocation " << n << ":\n  " << got << "\ninstead of\n  " << expected
-              << '\n';
-    return false;
-}
-
 bool survives(const Named& operation) {
-    std::string expected;
-    {
+    bool good = true;
+    const auto compare = [&](const char* when, long n, const std::string& got,
+                             const std::string& expected) {
+        if (got == expected)
+            return;
+        good = false;
+        std::cout << operation.name << when << ", allocation " << n << ":\n  " << got
+                  << "\ninstead of\n  " << expected << '\n';
+    };
+    Stage untouched;
+    const std::string expected = outcome(operation, untouched);
+    failing::eachAllocation([&](long n) {
         Stage stage;
-        expected = outcome(operation, stage);
-    }
-    for (allFollowing = false;; allFollowing = true) {
-        for (long n = 0;; ++n) {
-            Stage stage;
-            failures = 0;
-            bool threw = false;
-            countdown = n;
-            try {
-                const std::string got = outcome(operation, stage);
-                if (got != expected)
-                    return complain(operation.name, n, got, expected);
-            } catch (const std::bad_alloc&) {
-                threw = true;
-            }
-            countdown = never;
-            if (failures == 0)
-                break;
-            if (!threw)
-                continue;
-            operation.restore(stage);
-            stage.error = nullptr;
-            const std::string again = outcome(operation, stage);
-            if (again != expected)
-                return complain(operation.name + " called again", n, again, expected);
+        std::string got;
+        const auto end = failing::run(n, [&] { got = outcome(operation, stage); });
+        if (end != failing::Outcome::failed) {
+            compare("", n, got, expected);
+            return end;
         }
-        if (allFollowing)
-            return true;
-    }
+        operation.restore(stage);
+        stage.error = nullptr;
+        compare(" called again", n, outcome(operation, stage), expected);
+        return end;
+    });
+    return good;
 }
 
 } // namespace

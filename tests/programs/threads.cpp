@@ -21,6 +21,7 @@
 namespace {
 
 constexpr unsigned threadCount = 8;
+std::string appFolder; // of a bundle, made before any thread runs
 
 struct Line : qx::UndoableObject {
     qx::String text;
@@ -143,15 +144,34 @@ void useDefaults(unsigned thread, unsigned round) {
     check(defaults->stringForKey("InFile") == "a text of the file", "the user's file is read");
 }
 
-// Folders of the user's that are the program's own: one default is there, and no document.
+// Folders of the user's that are the program's own: one default is there, no document, and a
+// bundle.
 void makeUserFolders(const std::filesystem::path& folder) {
     std::ofstream(folder / "threads.plist")
         << "<plist><dict><key>InFile</key><string>a text of the file</string></dict></plist>";
+    appFolder = folder / "app";
+    std::filesystem::create_directories(folder / "app/de.lproj");
+    std::ofstream(folder / "app/Info.plist") << "<dict><key>CFBundleIdentifier</key>"
+                                                "<string>org.example.Threads</string></dict>";
+    std::ofstream(folder / "app/de.lproj/Localizable.strings") << "\"a\" = \"A\";\n\"b\";";
     // NOLINTBEGIN(concurrency-mt-unsafe): no other thread runs yet
     setenv("XDG_CONFIG_HOME", folder.c_str(), 1);
     setenv("XDG_DATA_HOME", folder.c_str(), 1);
+    setenv("LC_ALL", "de_DE", 1);
     // NOLINTEND(concurrency-mt-unsafe)
     qx::ProcessInfo::setProcessName("threads");
+}
+
+void useBundles(unsigned thread, unsigned round) {
+    const auto bundle = qx::Bundle::bundleWithPath(appFolder);
+    check(bundle == qx::Bundle::bundleWithIdentifier("org.example.Threads"),
+          "a bundle is opened once");
+    check(bundle->localizedString("a").view() == "A", "a text is translated");
+    if (round % 11 == 0)
+        qx::Bundle::setMainBundle(thread % 2 != 0 ? bundle : nullptr);
+    check(static_cast<bool>(qx::Bundle::mainBundle()), "there is a main bundle");
+    qx::Bundle::bundleForClass(typeid(*bundle));
+    qx::ProcessInfo::setProcessVersion("1", "2");
 }
 
 void useRepositories(unsigned thread, unsigned round) {
@@ -164,7 +184,17 @@ void useRepositories(unsigned thread, unsigned round) {
     const auto files = own->persistentRepository().as<QXXMLFileSystemDataRepository>();
     check(files && !files->containsDocument("no such document"), "what is not there is not found");
     check(static_cast<bool>(QXXMLDataRepositoryManager::defaultManager()), "there is a manager");
-    check(qx::Bundle::mainBundle() == qx::Bundle::mainBundle(), "a bundle is opened once");
+    if (round % 5 == 0)
+        QXXMLDataRepositoryManager::flushDefaultManager();
+    qx::Ref<qx::Error> error;
+    const auto data = qx::make<qx::Data>(std::to_string(thread));
+    check(!files->writeFileToUserOverrideArea(data, "shared.xml", &error).isNull() && !error,
+          "a file that others write too is written");
+    check(files->dataForName("shared.xml")->size() == 1, "and read as one of them wrote it");
+    check(files->writeFileToUserOverrideArea(data, "../x", &error).isNull() &&
+              !error->localizedDescription().isEmpty(),
+          "a file outside is refused, in words");
+    useBundles(thread, round);
     check(!qx::ProcessInfo::processName().isEmpty(), "the process has a name");
     if (round % 8 == 0)
         check(static_cast<bool>(resolve()), "a mapping resolves");
@@ -218,6 +248,7 @@ int main(int argc, char** argv) {
         });
     for (std::thread& thread : threads)
         thread.join();
+    qx::Bundle::setMainBundle(nullptr);
     std::filesystem::remove_all(folder);
     return failures == 0 ? 0 : 1;
 }

@@ -1,65 +1,14 @@
 // Each allocation in turn fails, alone or with all that follow, while values are set, undone and
 // redone: what fails has changed nothing, and what was told to observers is never left half said.
 
+#include "FailingMemory.h"
+
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/observe/Observation.h>
 #include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <cstdio>
-#include <cstdlib>
-#include <functional>
-#include <new>
-
-namespace {
-
-long untilFailure = -1; // counts down; negative: memory never fails
-bool failsForGood = false;
-
-bool failsNow() noexcept {
-    if (untilFailure < 0)
-        return false;
-    if (untilFailure > 0) {
-        --untilFailure;
-        return false;
-    }
-    if (!failsForGood)
-        untilFailure = -1;
-    return true;
-}
-
-void* allocate(std::size_t size, std::size_t alignment = alignof(std::max_align_t)) {
-    void* memory = failsNow()
-                       ? nullptr
-                       : std::aligned_alloc(alignment, (size + alignment) / alignment * alignment);
-    if (memory == nullptr)
-        throw std::bad_alloc();
-    return memory;
-}
-
-// Not inlined, where the compiler would miss its counterpart.
-[[gnu::noinline]] void release(void* memory) noexcept { std::free(memory); }
-
-} // namespace
-
-void* operator new(std::size_t size) { return allocate(size); }
-void* operator new[](std::size_t size) { return allocate(size); }
-void* operator new(std::size_t size, std::align_val_t alignment) {
-    return allocate(size, static_cast<std::size_t>(alignment));
-}
-void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-    try {
-        return allocate(size);
-    } catch (const std::bad_alloc&) {
-        return nullptr;
-    }
-}
-void operator delete(void* memory) noexcept { release(memory); }
-void operator delete[](void* memory) noexcept { release(memory); }
-void operator delete(void* memory, std::size_t) noexcept { release(memory); }
-void operator delete[](void* memory, std::size_t) noexcept { release(memory); }
-void operator delete(void* memory, std::align_val_t) noexcept { release(memory); }
-void operator delete(void* memory, std::size_t, std::align_val_t) noexcept { release(memory); }
 
 namespace {
 
@@ -161,39 +110,25 @@ void expect(bool holds, const char* what, const char* step, long allocation) {
     if (holds)
         return;
     ++failures;
-    std::printf("%s: %s, %s allocation %ld\n", step, what, failsForGood ? "from" : "at",
+    std::printf("%s: %s, %s allocation %ld\n", step, what, failing::allFollowing ? "from" : "at",
                 allocation);
-}
-
-enum class Outcome { failed, managed, undisturbed };
-
-Outcome outcome(const std::function<void()>& step, long allocation) {
-    untilFailure = allocation;
-    bool failed = false;
-    try {
-        step();
-    } catch (const std::bad_alloc&) {
-        failed = true;
-    }
-    const long left = std::exchange(untilFailure, -1);
-    return failed ? Outcome::failed : left > 0 ? Outcome::undisturbed : Outcome::managed;
 }
 
 // A step that is whole has happened or not.
 void tryEach(const char* name, bool isWhole, bool observed,
              const std::function<void(Scene&)>& before, const std::function<void(Scene&)>& step) {
-    for (long allocation = 0;; ++allocation) {
+    failing::eachAllocation([&](long allocation) {
         Scene scene(observed);
         const State first = scene.undone();
         before(scene);
         const State start = scene.state();
         const bool canUndo = scene.manager->canUndo();
         const bool canRedo = scene.manager->canRedo();
-        const Outcome end = outcome([&] { step(scene); }, allocation);
-        if (end == Outcome::undisturbed)
-            return;
+        const failing::Outcome end = failing::run(allocation, [&] { step(scene); });
+        if (end == failing::Outcome::undisturbed)
+            return end;
         // Without memory nobody can be told, and what nobody is told of stays as it is.
-        if (isWhole && end == Outcome::failed && !(observed && failsForGood)) {
+        if (isWhole && end == failing::Outcome::failed && !(observed && failing::allFollowing)) {
             expect(scene.state() == start, "other values", name, allocation);
             expect(scene.manager->canUndo() == canUndo, "other steps to undo", name, allocation);
             expect(scene.manager->canRedo() == canRedo, "other steps to redo", name, allocation);
@@ -207,7 +142,8 @@ void tryEach(const char* name, bool isWhole, bool observed,
         scene.told = 0;
         scene.record->setValueForKey("told?", "key3");
         expect(scene.told == (observed ? 1 : 0), "an observer is deaf", name, allocation);
-    }
+        return end;
+    });
 }
 
 } // namespace
@@ -216,22 +152,19 @@ int main() {
     qx::Class::define<Person, qx::UndoableObject>("Person")
         .property<&Person::name>("name")
         .property<&Person::partner, &Person::setPartner>("partner");
-    for (failsForGood = false;; failsForGood = true) {
-        for (const bool observed : {false, true}) {
-            tryEach(
-                "set", false, observed, [](Scene&) {}, [](Scene& scene) { scene.change(); });
-            tryEach(
-                "undo", true, observed, [](Scene& scene) { scene.change(); },
-                [](Scene& scene) { scene.manager->undo(); });
-            tryEach(
-                "redo", true, observed,
-                [](Scene& scene) {
-                    scene.change();
-                    scene.manager->undo();
-                },
-                [](Scene& scene) { scene.manager->redo(); });
-        }
-        if (failsForGood)
-            return failures == 0 ? 0 : 1;
+    for (const bool observed : {false, true}) {
+        tryEach(
+            "set", false, observed, [](Scene&) {}, [](Scene& scene) { scene.change(); });
+        tryEach(
+            "undo", true, observed, [](Scene& scene) { scene.change(); },
+            [](Scene& scene) { scene.manager->undo(); });
+        tryEach(
+            "redo", true, observed,
+            [](Scene& scene) {
+                scene.change();
+                scene.manager->undo();
+            },
+            [](Scene& scene) { scene.manager->redo(); });
     }
+    return failures == 0 ? 0 : 1;
 }

@@ -5,6 +5,8 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/observe/Observation.h>
 
+#include "base/BulkObjects.h"
+
 #include <gtest/gtest.h>
 
 #include <regex>
@@ -209,7 +211,7 @@ TEST(QXGenericRecordTest, RecordsOutliveTheThreadThatMadeThemTogetherAndEndElsew
     };
     std::vector<Ref<Record>> kept;
     std::thread([&] {
-        const ObjectMemory::Bulk bulk;
+        const BulkObjects bulk;
         for (int i = 0; i < 2000; ++i) {
             auto record = i % 10 == 0 ? Ref<Record>(make<Wide>()) : make<Record>();
             record->setValueForKey(i, "number");

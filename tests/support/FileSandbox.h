@@ -7,6 +7,7 @@
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/Null.h>
 
 #include "support/TemporaryFolder.h"
 
@@ -51,13 +52,6 @@ public:
             list += "<key>" + key + "</key><string>" + value + "</string>";
         write(relative + "/Info.plist", list + "</dict></plist>");
         return _bundles.emplace_back(qx::Bundle::bundleWithPath(path(relative)));
-    }
-
-    // What the library keeps for ever is no leak of the first test that needs it.
-    static void makeLastingObjects() {
-        qx::Bundle::mainBundle();
-        qx::Bundle::frameworkBundle();
-        qx::UserDefaults::standardUserDefaults();
     }
 
 private:

@@ -4,6 +4,9 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Value.h>
+#include <QXXMLMarshalling/xml/XMLDocument.h>
+
+#include <gtest/gtest.h>
 
 #include <regex>
 #include <string>
@@ -19,6 +22,15 @@ std::string raised(F call) {
         return exception.what();
     }
     return "nothing";
+}
+
+// The document that a text holds; a failure of the test that asks when it holds none.
+inline qx::Ref<qx::XMLDocument> parsed(std::string_view text,
+                                       const qx::XMLParseOptions& options = {}) {
+    qx::Ref<qx::Error> error;
+    auto document = qx::XMLDocument::initWithData(text, options, &error);
+    EXPECT_TRUE(document) << (error ? error->description().str() : "no error");
+    return document;
 }
 
 // The description of a value in one line.

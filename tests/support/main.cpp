@@ -1,12 +1,15 @@
 // Runs the tests, and after each one checks that it has left no live object behind.
 
+#include <QXXMLMarshalling/model/Null.h>
 #include <QXXMLMarshalling/model/Object.h>
 
 #include <gtest/gtest.h>
 
-// Objects that are made once and kept: a test program that uses such makes them here, so that they
-// count against no test.
+// Objects that are made once and kept: a test program that uses such of the folders above host/
+// makes them here, so that they count against no test.
 extern "C" __attribute__((weak)) void makeLastingObjects();
+// Those of the folders that a test of a low one is not linked with (lasting.cpp).
+extern "C" __attribute__((weak)) void makeHostObjects();
 
 namespace {
 
@@ -25,6 +28,9 @@ class LeakCheck : public testing::EmptyTestEventListener {
 
 int main(int argc, char** argv) {
     testing::InitGoogleTest(&argc, argv);
+    qx::Null::marker();
+    if (makeHostObjects != nullptr)
+        makeHostObjects();
     if (makeLastingObjects != nullptr)
         makeLastingObjects();
     testing::UnitTest::GetInstance()->listeners().Append(new LeakCheck);

@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 #include <sstream>
-#include <thread>
 
 #include "support/TemporaryFolder.h"
 
@@ -66,22 +65,6 @@ TEST(XMLDocument, IsWrittenWhollyOrNotAtAll) {
     EXPECT_ANY_THROW(document->writeToFile(path));
     EXPECT_EQ(files.read("a.xml"), "<a><b/></a>");
     EXPECT_EQ(files.list(""), "a.xml ");
-}
-
-TEST(XMLDocument, ThreadsParseAtTheSameTime) {
-    const std::string text = "<!DOCTYPE a [<!ENTITY e 'x'>]><a b='1'>&e;<c/></a>";
-    std::vector<std::thread> threads;
-    std::atomic<int> wrong = 0;
-    for (int i = 0; i < 4; ++i)
-        threads.emplace_back([&text, &wrong] {
-            for (int round = 0; round < 200; ++round) {
-                wrong += XMLDocument::initWithData("<a>").get() != nullptr;
-                wrong += XMLDocument::initWithData(text)->stringValue() != "x";
-            }
-        });
-    for (std::thread& thread : threads)
-        thread.join();
-    EXPECT_EQ(wrong, 0);
 }
 
 } // namespace

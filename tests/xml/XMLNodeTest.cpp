@@ -1,4 +1,5 @@
 #include "Text.h"
+#include "support/Texts.h"
 
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
@@ -14,23 +15,8 @@ using qx::Ref;
 using qx::XMLDocument;
 using qx::XMLElement;
 using qx::XMLNode;
+using support::parsed;
 using namespace std::string_literals;
-
-std::string thrownBy(const std::function<void()>& call) {
-    try {
-        call();
-    } catch (const qx::Exception& exception) {
-        return std::string(exception.reason());
-    }
-    return "nothing";
-}
-
-Ref<XMLDocument> parsed(std::string_view text, const qx::XMLParseOptions& options = {}) {
-    Ref<qx::Error> error;
-    auto document = XMLDocument::initWithData(text, options, &error);
-    EXPECT_TRUE(document) << (error ? error->description().str() : "no error");
-    return document;
-}
 
 TEST(XMLNode, AKeptNodeOutlivesItsDocument) {
     auto document = parsed("<a><b c='1'>text</b></a>");
@@ -185,8 +171,8 @@ TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
     EXPECT_EQ(element->description(), "<a b=\"1\" c=\"\" d=\"\x1F\"></a>");
     const auto refused = XMLElement::initForAttributes("a", 2);
     refused->addAttribute("b", "\x1F");
-    EXPECT_EQ(thrownBy([&] { static_cast<void>(refused->XMLString()); }),
-              "a text holds a control character at /a/@b");
+    EXPECT_EQ(support::raised([&] { static_cast<void>(refused->XMLString()); }),
+              "NSInvalidArgumentException: a text holds a control character at /a/@b");
     refused->removeAttributeForName("b");
     EXPECT_EQ(refused->XMLString(), "<a></a>");
 }

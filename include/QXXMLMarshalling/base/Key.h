@@ -11,6 +11,12 @@
 
 namespace qx {
 
+class Key;
+
+namespace detail {
+void markAsProperty(Key key) noexcept; // base/PropertyNames.h
+} // namespace detail
+
 // The name of a property. Made implicitly from text; keep one where a name is used often.
 class QX_API Key {
 public:
@@ -33,17 +39,16 @@ public:
     // Whether any class has been described with a property of that name: most keys of records have
     // not, and need no look-up.
     bool namesProperty() const noexcept {
-        return _rep != nullptr &&
-               (_rep->count.load(std::memory_order_relaxed) & String::propertyBit) != 0;
-    }
-    void markAsProperty() const noexcept {
-        if (_rep != nullptr)
-            _rep->count.fetch_or(String::propertyBit, std::memory_order_relaxed);
+        return _rep != nullptr && (_rep->count.load(std::memory_order_relaxed) & propertyBit) != 0;
     }
 
     friend bool operator==(Key a, Key b) noexcept { return a._rep == b._rep; }
 
 private:
+    friend void detail::markAsProperty(Key key) noexcept;
+
+    static constexpr std::uint32_t propertyBit = String::propertyBit;
+
     String::Rep* _rep = nullptr;
 };
 

@@ -114,12 +114,12 @@ private:
 
     void retain() const noexcept {
         if (_rep != nullptr && (_rep->count.load(std::memory_order_relaxed) & immortalBit) == 0)
-            count::increase(_rep->count);
+            detail::increaseCount(_rep->count);
     }
     void release() const noexcept {
         if (_rep == nullptr || (_rep->count.load(std::memory_order_relaxed) & immortalBit) != 0)
             return;
-        if (count::decrease(_rep->count) == 1)
+        if (detail::decreaseCount(_rep->count) == 1)
             destroy(_rep);
     }
 

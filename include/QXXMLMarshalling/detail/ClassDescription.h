@@ -10,6 +10,7 @@
 #include <functional>
 #include <tuple>
 #include <type_traits>
+#include <typeinfo>
 #include <utility>
 #include <vector>
 
@@ -39,7 +40,22 @@ struct Operation {
     bool (*takes)(std::span<const Value>) = nullptr;
 };
 
-namespace describe {
+namespace detail {
+
+// A class before it is published.
+struct ClassDraft {
+    Key name;
+    const std::type_info* type = nullptr;
+    const std::type_info* superclass = nullptr;
+    Ref<Object> (*create)() = nullptr; // null: not without arguments
+    std::vector<Property> properties{};
+    std::vector<Operation> operations{};
+    std::vector<Operation> classOperations{};
+};
+
+// Publishes the draft, under its name too unless `listed` is false (a class that no mapping may
+// name). The class that holds the type afterwards: the first one that was published for it.
+QX_API const Class& publish(ClassDraft draft, bool listed = true);
 
 // Raise NSInvalidArgumentException.
 [[noreturn]] QX_API void raiseArgumentCount(Selector selector, const Class& receiver,
@@ -237,5 +253,5 @@ Operation classOperation(std::string_view name) {
     return operation;
 }
 
-} // namespace describe
+} // namespace detail
 } // namespace qx

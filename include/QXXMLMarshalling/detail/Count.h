@@ -10,7 +10,7 @@
 #include <sys/single_threaded.h>
 #endif
 
-namespace qx::count {
+namespace qx::detail {
 
 inline bool isAlone() noexcept {
 #if __has_include(<sys/single_threaded.h>)
@@ -20,7 +20,7 @@ inline bool isAlone() noexcept {
 #endif
 }
 
-inline void increase(std::atomic<std::uint32_t>& count) noexcept {
+inline void increaseCount(std::atomic<std::uint32_t>& count) noexcept {
     if (isAlone())
         count.store(count.load(std::memory_order_relaxed) + 1, std::memory_order_relaxed);
     else
@@ -28,7 +28,8 @@ inline void increase(std::atomic<std::uint32_t>& count) noexcept {
 }
 
 // The count as it was.
-inline std::uint32_t decrease(std::atomic<std::uint32_t>& count, std::uint32_t by = 1) noexcept {
+inline std::uint32_t decreaseCount(std::atomic<std::uint32_t>& count,
+                                   std::uint32_t by = 1) noexcept {
     if (!isAlone())
         return count.fetch_sub(by, std::memory_order_acq_rel);
     const std::uint32_t before = count.load(std::memory_order_relaxed);
@@ -36,4 +37,4 @@ inline std::uint32_t decrease(std::atomic<std::uint32_t>& count, std::uint32_t b
     return before;
 }
 
-} // namespace qx::count
+} // namespace qx::detail

@@ -3,8 +3,8 @@
 // The name of a member as the source has it. No standard way leads to it, but GCC and Clang spell a
 // template's arguments out in the name of the function that is being compiled:
 //
-//     GCC     constexpr std::string_view qx::detail::memberName() [with auto Member = &Point::lat;
-//     …] Clang   std::string_view qx::detail::memberName() [Member = &Point::lat]
+//     GCC      … qx::detail::memberName() [with auto Member = &Point::lat; …]
+//     Clang    … qx::detail::memberName() [Member = &Point::lat]
 
 #include <string_view>
 

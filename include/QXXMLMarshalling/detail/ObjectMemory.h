@@ -1,31 +1,23 @@
 #pragma once
 
-// Memory of the objects that reading a document makes by the thousand. While the thread reads one,
-// they come out of shared blocks, which is fast and keeps them together; a block goes back when the
-// last object in it ends. At any other time each has memory of its own.
+// Memory of the objects that reading a document makes by the thousand, and of the buffers that they
+// hold. While the thread reads one (base/BulkObjects.h), it is cut from shared blocks; at any other
+// time each piece is allocated on its own. Any thread may release either.
 
 #include <QXXMLMarshalling/base/Export.h>
 
 #include <cstddef>
 #include <new>
 
-namespace qx {
+namespace qx::detail {
 
 struct QX_API ObjectMemory {
+    // Aligned for any scalar. Throws std::bad_alloc.
     static void* allocate(std::size_t size);
+    // What allocate returned, or null.
     static void release(void* memory) noexcept;
-
-    // While one lives, the objects of its thread come out of blocks.
-    class QX_API Bulk {
-    public:
-        Bulk() noexcept;
-        ~Bulk();
-        Bulk(const Bulk&) = delete;
-        Bulk& operator=(const Bulk&) = delete;
-    };
 };
 
-// For the buffers that such objects hold.
 template <class T>
 struct ObjectAllocator {
     using value_type = T;
@@ -44,4 +36,4 @@ struct ObjectAllocator {
     }
 };
 
-} // namespace qx
+} // namespace qx::detail

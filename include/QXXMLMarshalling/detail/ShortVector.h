@@ -12,7 +12,7 @@
 #include <type_traits>
 #include <utility>
 
-namespace qx {
+namespace qx::detail {
 
 template <class T, std::uint32_t Inside>
 class ShortVector {
@@ -91,4 +91,4 @@ private:
     alignas(T) unsigned char _inside[Inside * sizeof(T)];
 };
 
-} // namespace qx
+} // namespace qx::detail

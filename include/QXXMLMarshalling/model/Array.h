@@ -17,8 +17,8 @@ public:
     Array(std::initializer_list<Value> items);
     explicit Array(std::vector<Value> items);
     ~Array() override;
-    static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
-    static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
+    static void* operator new(std::size_t size);
+    static void operator delete(void* memory) noexcept;
 
     // Walks the items and notices changes.
     class Iterator {
@@ -77,7 +77,7 @@ private:
     void checkUnchanged(std::size_t changes) const;
     void changed() noexcept { ++_changes; }
 
-    std::vector<Value, ObjectAllocator<Value>> _items;
+    std::vector<Value, detail::ObjectAllocator<Value>> _items;
     std::size_t _changes = 0;
 };
 

@@ -73,20 +73,6 @@ public:
     // operation "automaticallyNotifiesObserversForKey:", else true.
     bool automaticallyNotifiesObserversForKey(Key key) const;
 
-    // Used by the library for its own classes and by ClassBuilder.
-    struct Draft {
-        Key name;
-        const std::type_info* type = nullptr;
-        const std::type_info* superclass = nullptr;
-        Ref<Object> (*create)() = nullptr;
-        std::vector<Property> properties{};
-        std::vector<Operation> operations{};
-        std::vector<Operation> classOperations{};
-    };
-    // Publishes the draft, under its name too unless `listed` is false (a class that no mapping may
-    // name). The class that holds the type afterwards.
-    static const Class& publish(Draft draft, bool listed = true);
-
     Class(const Class&) = delete;
     Class& operator=(const Class&) = delete;
 
@@ -94,7 +80,7 @@ private:
     friend class Object;
     friend struct ClassRegistry;
 
-    explicit Class(Draft draft);
+    explicit Class(detail::ClassDraft draft);
     // The class of the object's dynamic type; a stand-in when nobody described it.
     static const Class& ofObject(const Object& object);
 
@@ -112,57 +98,57 @@ private:
 template <class T>
 class ClassBuilder {
 public:
-    explicit ClassBuilder(Class::Draft draft) : _draft(std::move(draft)) {}
+    explicit ClassBuilder(detail::ClassDraft draft) : _draft(std::move(draft)) {}
     ClassBuilder(const ClassBuilder&) = delete;
     ClassBuilder& operator=(const ClassBuilder&) = delete;
-    ~ClassBuilder() { Class::publish(std::move(_draft)); }
+    ~ClassBuilder() { detail::publish(std::move(_draft)); }
 
     // A data member, or a getter without arguments (read-only).
     template <auto Member>
     ClassBuilder& property(std::string_view name) {
-        _draft.properties.push_back(describe::memberProperty<T, Member>(name));
+        _draft.properties.push_back(detail::memberProperty<T, Member>(name));
         return *this;
     }
     // A pair of accessors.
     template <auto Getter, auto Setter>
     ClassBuilder& property(std::string_view name) {
-        _draft.properties.push_back(describe::accessorProperty<T, Getter, Setter>(name));
+        _draft.properties.push_back(detail::accessorProperty<T, Getter, Setter>(name));
         return *this;
     }
     // Overloaded accessors of the value type V.
     template <class V>
     ClassBuilder& property(std::string_view name, V (T::*getter)() const, void (T::*setter)(V)) {
-        _draft.properties.push_back(describe::boundProperty<T, V, V>(name, getter, setter));
+        _draft.properties.push_back(detail::boundProperty<T, V, V>(name, getter, setter));
         return *this;
     }
     template <class V>
     ClassBuilder& property(std::string_view name, V (T::*getter)() const,
                            void (T::*setter)(const V&)) {
-        _draft.properties.push_back(describe::boundProperty<T, V, const V&>(name, getter, setter));
+        _draft.properties.push_back(detail::boundProperty<T, V, const V&>(name, getter, setter));
         return *this;
     }
     // A member function, or a free function that takes a T& first; one argument for each colon.
     template <auto Function>
     ClassBuilder& operation(std::string_view name) {
-        _draft.operations.push_back(describe::instanceOperation<T, Function>(name));
+        _draft.operations.push_back(detail::instanceOperation<T, Function>(name));
         return *this;
     }
     // A static or free function; it may take a `const qx::Class&` first, the receiver's class.
     template <auto Function>
     ClassBuilder& classOperation(std::string_view name) {
-        _draft.classOperations.push_back(describe::classOperation<Function>(name));
+        _draft.classOperations.push_back(detail::classOperation<Function>(name));
         return *this;
     }
 
 private:
-    Class::Draft _draft;
+    detail::ClassDraft _draft;
 };
 
 template <class T, class Base>
 ClassBuilder<T> Class::define(std::string_view name) {
     static_assert(std::derived_from<T, Object>, "described classes derive from qx::Object");
     static_assert(std::derived_from<T, Base>);
-    Draft draft;
+    detail::ClassDraft draft;
     draft.name = name;
     draft.type = &typeid(T);
     draft.superclass = &typeid(Base);

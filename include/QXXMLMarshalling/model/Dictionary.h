@@ -6,7 +6,6 @@
 // while it is walked raises NSGenericException at the walk's next step. Small dictionaries are
 // scanned, larger ones carry an index.
 
-#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/detail/ShortVector.h>
 #include <QXXMLMarshalling/model/Value.h>
 
@@ -29,8 +28,8 @@ public:
     // NOLINTNEXTLINE(modernize-use-equals-default): the room inside would be set to zero first
     Dictionary() noexcept {}
     ~Dictionary() override;
-    static void* operator new(std::size_t size) { return ObjectMemory::allocate(size); }
-    static void operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
+    static void* operator new(std::size_t size);
+    static void operator delete(void* memory) noexcept;
 
     class Iterator {
     public:
@@ -76,19 +75,7 @@ public:
     void set(const String& key, Value value);
     // Adds the value unless the key is there; false when it is, and then the value is left alone.
     // Neither may be null.
-    bool add(const String& key, Value&& value) {
-        // The first few keys of most dictionaries are names, which tell themselves apart.
-        const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
-        if (!isFew || value.isNull())
-            return addAny(key, std::move(value));
-        for (const Entry& entry : _entries)
-            if (entry.key.isSameAs(key))
-                return addAny(key, std::move(value));
-        changed();
-        _entries.emplace_back(key, std::move(value));
-        ++_count;
-        return true;
-    }
+    bool add(const String& key, Value&& value);
     // Nothing happens when the key is absent.
     void remove(const String& key);
     void removeAll();
@@ -134,7 +121,7 @@ private:
     using Index = std::vector<std::uint32_t>; // see NameIndex.h
 
     bool _allInterned = true; // the keys, removed ones too
-    ShortVector<Entry, usualSize> _entries;
+    detail::ShortVector<Entry, usualSize> _entries;
     std::unique_ptr<Index> _index; // null while the entries are scanned
     std::uint32_t _count = 0;
     std::uint32_t _changes = 0;

@@ -45,11 +45,11 @@ public:
     Object& operator=(const Object&) = delete;
     virtual ~Object();
 
-    void retain() const noexcept { count::increase(_count); }
+    void retain() const noexcept { detail::increaseCount(_count); }
     // Ends the object with its last count. However deep a graph hangs on it, its release needs no
     // more stack than a bounded number of levels.
     void release() const noexcept {
-        if (count::decrease(_count) == 1)
+        if (detail::decreaseCount(_count) == 1)
             destroy();
     }
 
@@ -135,7 +135,7 @@ protected:
     virtual const Class& describedClass() const;
 
     // False as long as nobody observes the object, waits for its end or refers to it weakly.
-    bool hasCompany() const noexcept { return _extras != nullptr; }
+    bool hasObserversOrWeakRefs() const noexcept { return _extras != nullptr; }
 
 private:
     struct Extras;

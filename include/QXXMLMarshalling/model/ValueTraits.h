@@ -27,6 +27,7 @@
 //
 // Dates, times and durations: DateTime.h.
 
+#include <QXXMLMarshalling/detail/ValueReading.h>
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Value.h>
 
@@ -49,8 +50,8 @@ struct ValueTraits;
 // The names of an enumeration's values, for those that documents hold by name. Specialise it:
 //
 //     template <> struct qx::EnumNames<Fix> {
-//         static constexpr auto table = std::to_array<qx::EnumName<Fix>>({{Fix::none, "none"},
-//         {Fix::d2, "2d"}});
+//         static constexpr auto table =
+//             std::to_array<qx::EnumName<Fix>>({{Fix::none, "none"}, {Fix::d2, "2d"}});
 //     };
 //
 // Texts are compared exactly, the first of several names of one value is the one that is written;
@@ -71,15 +72,6 @@ concept NamedEnumeration = Enumeration<T> && requires {
     EnumNames<T>::table;
 };
 
-// Strict readings of a value, false where it is none: no blanks are skipped but around a number.
-QX_API bool readBoolean(const Value& value, bool& result);
-QX_API bool readInteger(const Value& value, std::int64_t& result);
-QX_API bool readUnsigned(const Value& value, std::uint64_t& result);
-QX_API bool readReal(const Value& value, double& result);
-QX_API bool readText(const Value& value, String& result);
-QX_API bool readBytes(const Value& value, std::vector<std::byte>& result);
-QX_API String textOfBytes(const std::vector<std::byte>& bytes);
-
 template <>
 struct ValueTraits<Value> {
     static Value toValue(const Value& value) { return value; }
@@ -92,7 +84,9 @@ struct ValueTraits<Value> {
 template <>
 struct ValueTraits<bool> {
     static Value toValue(bool value) { return value; }
-    static bool fromValue(const Value& value, bool& result) { return readBoolean(value, result); }
+    static bool fromValue(const Value& value, bool& result) {
+        return detail::readBoolean(value, result);
+    }
 };
 
 template <>
@@ -100,7 +94,7 @@ struct ValueTraits<char> {
     static Value toValue(char value) { return std::string_view(&value, value != '\0' ? 1 : 0); }
     static bool fromValue(const Value& value, char& result) {
         String read;
-        if (!readText(value, read) || read.size() > 1)
+        if (!detail::readText(value, read) || read.size() > 1)
             return false;
         result = *read.c_str();
         return true;
@@ -112,7 +106,7 @@ struct ValueTraits<T> {
     static Value toValue(T value) { return value; }
     static bool fromValue(const Value& value, T& result) {
         std::int64_t read = 0;
-        if (!readInteger(value, read) || !std::in_range<T>(read))
+        if (!detail::readInteger(value, read) || !std::in_range<T>(read))
             return false;
         result = static_cast<T>(read);
         return true;
@@ -129,7 +123,7 @@ requires(!std::same_as<T, bool>) struct ValueTraits<T> {
     }
     static bool fromValue(const Value& value, T& result) {
         std::uint64_t read = 0;
-        if (!readUnsigned(value, read) || !std::in_range<T>(read))
+        if (!detail::readUnsigned(value, read) || !std::in_range<T>(read))
             return false;
         result = static_cast<T>(read);
         return true;
@@ -141,7 +135,7 @@ struct ValueTraits<T> {
     static Value toValue(T value) { return value; }
     static bool fromValue(const Value& value, T& result) {
         double read = 0;
-        if (!readReal(value, read))
+        if (!detail::readReal(value, read))
             return false;
         result = static_cast<T>(read);
         return true;
@@ -196,7 +190,7 @@ struct ValueTraits<String> {
             result = String();
             return true;
         }
-        return readText(value, result);
+        return detail::readText(value, result);
     }
 };
 
@@ -216,7 +210,7 @@ struct ValueTraits<std::string> {
     static Value toValue(const std::string& value) { return value; }
     static bool fromValue(const Value& value, std::string& result) {
         String read;
-        if (!readText(value, read))
+        if (!detail::readText(value, read))
             return false;
         result = read.str();
         return true;
@@ -353,9 +347,9 @@ struct ValueTraits<std::unordered_set<T, Hash, Equal>>
 
 template <>
 struct ValueTraits<std::vector<std::byte>> {
-    static Value toValue(const std::vector<std::byte>& bytes) { return textOfBytes(bytes); }
+    static Value toValue(const std::vector<std::byte>& bytes) { return detail::textOfBytes(bytes); }
     static bool fromValue(const Value& value, std::vector<std::byte>& result) {
-        return readBytes(value, result);
+        return detail::readBytes(value, result);
     }
 };
 

@@ -21,6 +21,8 @@
 
 #include <QXXMLMarshalling/undo/ChangeTracking.h>
 
+#include <cstdint>
+
 namespace qx {
 
 class QX_API UndoableObject : public Object {
@@ -30,12 +32,17 @@ public:
     ~UndoableObject() override;
     static const Class& classObject();
 
+    // Null, as from the start: nothing is registered.
     Ref<UndoManager> undoManager() const { return _tracking.undoManager(); }
     void setUndoManager(Ref<UndoManager> undoManager) {
         _tracking.setUndoManager(std::move(undoManager));
     }
-    Ref<Dictionary> changeCache() const { return _tracking.changeCache(); }
-    void setChangeCache(Ref<Dictionary> cache) { _tracking.setChangeCache(std::move(cache)); }
+    // The values before the latest changes, by key, the null marker for null; never null.
+    virtual Ref<Dictionary> changeCache() const { return _tracking.changeCache(); }
+    virtual void setChangeCache(Ref<Dictionary> cache) {
+        _tracking.setChangeCache(std::move(cache));
+    }
+    // False where the class, or the object, vetoes undo for the key.
     bool isUndoRegistrationEnabledForKey(Key key) const {
         return _tracking.isUndoRegistrationEnabledForKey(key);
     }
@@ -46,6 +53,16 @@ public:
 
 protected:
     const Class& describedClass() const override;
+
+    ChangeTracking& tracking() noexcept { return _tracking; }
+    const ChangeTracking& tracking() const noexcept { return _tracking; }
+    // Removes the undo actions that target the object and lets go of the manager. For a destructor
+    // whose members, as they end, may call code that undoes.
+    void endUndo() noexcept;
+
+    // Flags of the library's own classes that derive from this one. They fill a gap between the
+    // object's count and the tracking; in the derived class they would take eight bytes.
+    mutable std::uint8_t _derivedFlags = 0;
 
 private:
     void restoreValue(const Value& value, const String& key);

@@ -1,17 +1,8 @@
 #include "tools/qxxml/Shell.h"
 
-#include <QXXMLMarshalling/model/Null.h>
-
 #include <cstdlib>
 
 #include <sys/wait.h>
-
-extern "C" void makeLastingObjects();
-
-extern "C" void makeLastingObjects() {
-    FileSandbox::makeLastingObjects();
-    qx::Null::marker();
-}
 
 namespace {
 

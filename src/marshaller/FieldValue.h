@@ -1,0 +1,22 @@
+#pragma once
+
+// A field's value as text and back, by the field's type.
+
+#include <QXXMLMarshalling/model/Error.h>
+#include <QXXMLMarshalling/model/Object.h>
+
+#include "plan/FieldPlan.h"
+
+namespace qx::detail {
+
+// Converts a text by the field's type and sets it under the key; any other value is set as it is.
+// False with
+//   -221  "<%@>: Unable to convert value to integer: %@"            (logged as a warning, too)
+//   -222  "Unable to set value: %@ for key: %@ in class: %@"
+bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error);
+
+String textOf(const Value& value, ValueType type);
+// Whether an attribute with that text is left out: nothing requires it, and it is empty or zero.
+bool isLeftOut(const FieldPlan& field, const Value& value, const String& text);
+
+} // namespace qx::detail

@@ -1,0 +1,163 @@
+#include "marshaller/Marshalling.h"
+
+#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
+
+#include "model/Errors.h"
+
+#include <algorithm>
+
+namespace qx::detail {
+
+Marshalling::Marshalling(const QXXMLMarshaller& marshaller)
+    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())),
+      _saveUnknownXML(marshaller.saveUnknownXML()),
+      _usingNamespaceURIs(marshaller.isUsingNamespaceURIs()) {}
+
+const ClassPlan* Marshalling::classOf(const Value& value) const {
+    return value.isObject() ? _plan.classNamed(value.classNameForMarshalling()) : nullptr;
+}
+
+Ref<XMLElement> Marshalling::marshallObject(const Value& object, ErrorSlot error) {
+    const String className = object.classNameForMarshalling();
+    if (className.isNull())
+        return fail(error, errors::noClassName,
+                    object.isObject() ? object.object()->isa().name() : String());
+    const ClassPlan* plan = classOf(object);
+    if (plan == nullptr)
+        return fail(error, errors::noMappingDefinition, className);
+    return element(*plan, plan->elementName, object, error);
+}
+
+Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, const Value& object,
+                                     ErrorSlot error) {
+    if (!object.isObject())
+        return fail(error, errors::noMappingDefinition, object.classNameForMarshalling());
+    auto element = XMLElement::initForAttributes(name.isEmpty() ? plan.className.string() : name,
+                                                 plan.attributeCount);
+    const QXXMLClassMapping& mapping = *plan.mapping;
+    if (_usingNamespaceURIs && !mapping.nsURI().isEmpty()) {
+        const String prefix = mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix();
+        element->addNamespace(XMLNode::namespaceWithName(prefix, mapping.nsURI()));
+    }
+    return writeFields(plan, *element, *object.object(), error) ? element : nullptr;
+}
+
+// A class that is self-first writes its fields before its ancestors', any other after them. Kept
+// XML is put back at every level, the farthest ancestor's first, so that it ends up behind all
+// fields.
+bool Marshalling::writeFields(const ClassPlan& plan, XMLElement& element, Object& object,
+                              ErrorSlot error) {
+    const std::size_t deepest = _marshaller->maximumDepth();
+    if (_depth >= deepest)
+        return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
+    struct Deeper {
+        std::size_t& depth;
+        explicit Deeper(std::size_t& counted) : depth(counted) { ++depth; }
+        ~Deeper() { --depth; }
+    } const deeper(_depth);
+
+    std::vector<const ClassPlan*> levels;
+    ExtendsWalk walk(plan);
+    do {
+        levels.push_back(&walk.current());
+        if (walk.current().mapping->isSelfFirst() &&
+            !writeOwnFields(walk.current(), element, object, error))
+            return false;
+    } while (walk.next());
+    if (!walk.broken().isNull())
+        return fail(error, errors::noExtendsWhenMarshalling, walk.broken());
+    std::reverse(levels.begin(), levels.end());
+    for (const ClassPlan* level : levels) {
+        if (!level->mapping->isSelfFirst() && !writeOwnFields(*level, element, object, error))
+            return false;
+        if (_saveUnknownXML)
+            restoreUnknownXML(element, object);
+        restoreNamespaces(element, object);
+    }
+    return true;
+}
+
+bool Marshalling::writeOwnFields(const ClassPlan& plan, XMLElement& element, Object& object,
+                                 ErrorSlot error) {
+    for (const FieldPlan& field : plan.fields) {
+        Ref<Error> problem;
+        if (writeField(field, element, object, &problem))
+            continue;
+        if (error != nullptr)
+            *error = std::move(problem);
+        return false;
+    }
+    return true;
+}
+
+XMLElement* Marshalling::lastChildNamed(const XMLElement& element, const String& name) {
+    // Up to so many, looking through the children costs no more than an index of them.
+    constexpr std::size_t mostScanned = 64;
+    if (element.childCount() > mostScanned)
+        return _lastChildren[&element].named(element, name);
+    for (XMLNode* child = element.lastChild(); child != nullptr; child = child->previousSibling())
+        if (child->isElement() && child->name() == name)
+            return child->asElement();
+    return nullptr;
+}
+
+bool Marshalling::isToBeWritten(const Value& item) {
+    Object& object = *item.object();
+    const Operation* isRemovable = _access.hooksOf(object).isRemovable;
+    return isRemovable != nullptr && !ObjectAccess::send(object, *isRemovable).boolValue();
+}
+
+namespace {
+
+// Takes a kept node out of wherever it is; null for what is no such node.
+Ref<XMLNode> moved(const Value& kept, XMLNodeKind kind) {
+    auto node = kept.as<XMLNode>();
+    if (!node || node->kind() != kind)
+        return nullptr;
+    node->detach();
+    return node;
+}
+
+} // namespace
+
+void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
+    static const Key childrenKey("unboundChildren");
+    static const Key attributesKey("unboundAttributes");
+    if (const auto children = ObjectAccess::get(object, childrenKey).as<Dictionary>()) {
+        const auto known = _lastChildren.find(&element);
+        LastChildByName* const last = known != _lastChildren.end() ? &known->second : nullptr;
+        if (last != nullptr)
+            last->catchUp(element);
+        for (const auto& entry : *children)
+            if (const auto elements = entry.value.as<Array>())
+                for (const Value& kept : *elements)
+                    if (const auto child = moved(kept, XMLNodeKind::element)) {
+                        element.addChild(child);
+                        if (last != nullptr)
+                            last->see(*child);
+                    }
+    }
+    if (const auto attributes = ObjectAccess::get(object, attributesKey).as<Array>())
+        for (const Value& kept : *attributes)
+            if (auto attribute = moved(kept, XMLNodeKind::attribute))
+                element.addAttribute(std::move(attribute));
+}
+
+// The declarations that were read take the place of the class mapping's own.
+void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) const {
+    static const Key key("__namespaces");
+    const auto kept = ObjectAccess::get(object, key).as<Array>();
+    if (!kept || kept->isEmpty() || !_usingNamespaceURIs)
+        return;
+    std::vector<Ref<XMLNode>> copies;
+    for (const Value& value : *kept) {
+        const auto declaration = value.as<XMLNode>();
+        if (declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
+            copies.push_back(declaration->copy());
+    }
+    element.setNamespaces(copies);
+}
+
+} // namespace qx::detail

@@ -1,0 +1,55 @@
+#pragma once
+
+// How the marshaller reaches objects: their class, their values by key, the operations that it may
+// ask of them. What the objects of a class answer is looked up once per class and call of the
+// marshaller.
+
+#include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/Error.h>
+
+#include <unordered_map>
+
+namespace qx::detail {
+
+// The optional operations of one class, null where its objects do not answer.
+struct ObjectHooks {
+    const Class* type = nullptr;
+    const Operation* setClassNameForMarshalling = nullptr;
+    const Operation* setNotifyBindingsObservers = nullptr;
+    const Operation* setUndoManager = nullptr;
+    const Operation* rootObject = nullptr;
+    const Operation* setParent = nullptr;
+    const Operation* isRemovable = nullptr;
+
+    explicit ObjectHooks(const Class& describedType);
+};
+
+class ObjectAccess {
+public:
+    // The hooks of the object's class; they live as long as the ObjectAccess.
+    const ObjectHooks& hooksOf(const Object& object);
+
+    // The object as a record, null for one of any other class, a subclass of the record's too. What
+    // the hooks of most objects would do is done directly then.
+    static QXGenericRecord* plainRecord(Object& object) {
+        return &object.isa() == records ? static_cast<QXGenericRecord*>(&object) : nullptr;
+    }
+
+    // Calls one of the object's hooks.
+    static Value send(Object& object, const Operation& operation);
+    static Value send(Object& object, const Operation& operation, const Value& argument);
+
+    static Value get(const Object& object, Key key) { return object.valueForKey(key); }
+    // Sets and reports what the object does not take:
+    //   -222  "Unable to set value: %@ for key: %@ in class: %@"
+    static bool set(Object& object, Key key, Value value, Ref<Error>* error);
+
+private:
+    static const Class* const records;
+
+    std::unordered_map<const Class*, ObjectHooks> _known;
+    const ObjectHooks* _latest = nullptr;
+};
+
+} // namespace qx::detail

@@ -1,0 +1,62 @@
+// Fields bound to an attribute, of the element or of a wrapper in it.
+
+#include "marshaller/FieldBinding.h"
+#include "model/Errors.h"
+
+namespace qx::detail {
+
+namespace {
+
+// The wrapper of a location is not counted as consumed, and the attribute counts for the element
+// that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
+bool read(Unmarshalling&, const FieldPlan& field, const Unmarshalling::Target& target,
+          Ref<Error>* error) {
+    String value;
+    const BindingPlan* tried = nullptr;
+    for (const BindingPlan& binding : field.bindings) {
+        tried = &binding;
+        const XMLElement* holder = &target.source.element();
+        if (!binding.location.isEmpty()) {
+            const auto found = target.source.find(binding.location);
+            if (found.several)
+                return fail(error, errors::tooManyElementsForField, binding.name,
+                            &target.source.element());
+            holder = found.first;
+        }
+        if (holder != nullptr)
+            value = holder->attributeValue(binding.name);
+        if (!value.isNull())
+            break;
+    }
+    if (!value.isNull()) {
+        target.bound.attributes.add(tried->name);
+        return takeValue(target.object, field, field.key, std::move(value), error);
+    }
+    if (field.isRequired)
+        return fail(error, errors::requiredAttributeMissing,
+                    tried != nullptr ? tried->name : String(), &target.source.element());
+    return false;
+}
+
+bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
+           Ref<Error>*) {
+    const String text = textOf(value, field.valueType);
+    if (isLeftOut(field, value, text))
+        return true;
+    XMLElement* const target =
+        field.location().isEmpty() ? &element : writing.lastChildNamed(element, field.location());
+    if (target != nullptr) {
+        target->addAttribute(field.xmlName(), text);
+    } else {
+        auto wrapper = XMLElement::initForAttributes(field.location(), 1);
+        wrapper->addAttribute(field.xmlName(), text);
+        element.addChild(std::move(wrapper));
+    }
+    return true;
+}
+
+} // namespace
+
+const FieldBinding attributeBinding{&read, &write};
+
+} // namespace qx::detail

@@ -1,0 +1,46 @@
+// Fields that leave open what they are bound to: an attribute, or else an element.
+
+#include "marshaller/FieldBinding.h"
+
+namespace qx::detail {
+
+namespace {
+
+bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
+          Ref<Error>* error) {
+    const FieldBinding& otherwise = field.isContainer ? elementBinding : flattenedBinding;
+    return attributeBinding.read(reading, field, target, error) ||
+           otherwise.read(reading, field, target, error);
+}
+
+// An object of a class that the mapping has is an element under that class's name. Without a
+// container only what is inside of it is written.
+bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
+           Ref<Error>* error) {
+    const ClassPlan* plan = writing.classOf(value);
+    if (plan == nullptr) {
+        const String text = textOf(value, field.valueType);
+        if (!isLeftOut(field, value, text))
+            element.addAttribute(field.xmlName(), text);
+        return true;
+    }
+    const auto child = writing.element(*plan, plan->elementName, value, error);
+    if (!child)
+        return false;
+    if (field.isContainer) {
+        element.addChild(child);
+        return true;
+    }
+    while (XMLNode* first = child->firstChild()) {
+        Ref<XMLNode> node(first);
+        node->detach();
+        element.addChild(std::move(node));
+    }
+    return true;
+}
+
+} // namespace
+
+const FieldBinding automaticBinding{&read, &write};
+
+} // namespace qx::detail

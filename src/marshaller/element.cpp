@@ -1,0 +1,109 @@
+// Fields bound to a child element: an object of its own, or the text in it.
+
+#include "marshaller/FieldBinding.h"
+#include "model/Errors.h"
+
+namespace qx::detail {
+
+namespace {
+
+// The child that the field takes, null where there is none; `binding` is the last one tried. An
+// object that is flattened takes the first of several, out of the copy it is bound from, so that
+// the next one finds the next.
+bool findElement(const FieldPlan& field, const Unmarshalling::Target& target, XMLElement*& child,
+                 const BindingPlan*& binding, Ref<Error>* error) {
+    for (const BindingPlan& candidate : field.bindings) {
+        binding = &candidate;
+        const auto found = target.source.find(candidate.name);
+        if (found.several && !target.isFlattened)
+            return fail(error, errors::tooManyChildElements, candidate.name,
+                        &target.source.element());
+        if (found.first == nullptr)
+            continue;
+        child = found.first;
+        target.bound.fields.add(candidate.name);
+        return true;
+    }
+    return true;
+}
+
+// An object where a class is known for the field or for the child's name, else the child's text.
+Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
+              XMLElement& child, const ClassPlan* classOfElement, Ref<Error>* error) {
+    const ClassPlan* plan = field.typeClass != nullptr ? field.typeClass : classOfElement;
+    if (plan != nullptr) {
+        const Ref<XMLElement> held(&child);
+        return reading.build(*plan, child, target.source.copies(), error);
+    }
+    return reading.budget().takeText(child, error) ? Value(child.stringValue()) : Value();
+}
+
+bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
+          Ref<Error>* error) {
+    XMLElement* child = nullptr;
+    const BindingPlan* binding = nullptr;
+    if (!findElement(field, target, child, binding, error))
+        return false;
+    Value value;
+    Ref<Error> problem;
+    if (child != nullptr) {
+        Ref<XMLElement> taken;
+        if (target.isFlattened) {
+            taken = Ref<XMLElement>(child);
+            target.source.take(*child);
+        }
+        value = valueOf(reading, field, target, *child, binding->classOfName, &problem);
+    }
+    return setElementValue(reading, field, target, std::move(value), std::move(problem),
+                           binding != nullptr ? binding->name : String(), error);
+}
+
+// A declared class gives the element the field's name, a class found by the value its own.
+bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
+           Ref<Error>* error) {
+    const ClassPlan* plan = nullptr;
+    if (!findClassToWrite(writing, field, value, plan, error))
+        return false;
+    if (plan != nullptr) {
+        const bool isDeclared = field.valueType == ValueType::other;
+        auto child =
+            writing.element(*plan, isDeclared ? field.xmlName() : plan->elementName, value, error);
+        if (child)
+            element.addChild(child);
+        return child.get() != nullptr;
+    }
+    if (field.isRequired || !value.isNullOrMarker())
+        element.addChild(XMLElement::initWithName(field.xmlName(), textOf(value, field.valueType)));
+    return true;
+}
+
+} // namespace
+
+const FieldBinding elementBinding{&read, &write};
+
+bool setElementValue(Unmarshalling& reading, const FieldPlan& field,
+                     const Unmarshalling::Target& target, Value value, Ref<Error> problem,
+                     const String& name, Ref<Error>* error) {
+    if (!value.isNull()) {
+        if (Object* object = value.object();
+            object != nullptr && !reading.adopt(*object, target.object, error))
+            return false;
+        return takeValue(target.object, field, field.key, std::move(value), error);
+    }
+    if (error == nullptr || (!problem && !field.isRequired))
+        return true;
+    if (!problem)
+        return fail(error, errors::requiredElementMissing, name, &target.source.element());
+    *error = std::move(problem);
+    return false;
+}
+
+bool findClassToWrite(const Marshalling& writing, const FieldPlan& field, const Value& value,
+                      const ClassPlan*& plan, Ref<Error>* error) {
+    const bool isDeclared = field.valueType == ValueType::other;
+    plan = isDeclared ? field.typeClass : writing.classOf(value);
+    return !isDeclared || plan != nullptr ||
+           fail(error, errors::noMappingForClass, field.mapping->type());
+}
+
+} // namespace qx::detail

@@ -1,0 +1,42 @@
+// Fields whose object has no element of its own: its fields stand in that of the object around it.
+
+#include "marshaller/FieldBinding.h"
+
+namespace qx::detail {
+
+namespace {
+
+Value valueOf(Unmarshalling& reading, const FieldPlan& field, ChildLookup& source,
+              Ref<Error>* error) {
+    if (field.typeClass != nullptr)
+        return reading.build(*field.typeClass, source, true, error);
+    const ClassPlan* plan = reading.plan().classForElement(source.element().name());
+    if (plan != nullptr)
+        return reading.build(*plan, source, false, error);
+    return reading.budget().takeText(source.element(), error) ? Value(source.stringValue())
+                                                              : Value();
+}
+
+bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
+          Ref<Error>* error) {
+    Ref<Error> problem;
+    Value value = valueOf(reading, field, target.source, &problem);
+    return setElementValue(reading, field, target, std::move(value), std::move(problem), {}, error);
+}
+
+// What is no object has an element of its own all the same.
+bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
+           Ref<Error>* error) {
+    const ClassPlan* plan = nullptr;
+    if (!findClassToWrite(writing, field, value, plan, error))
+        return false;
+    if (plan == nullptr || !value.isObject())
+        return elementBinding.write(writing, field, element, value, error);
+    return writing.writeFields(*plan, element, *value.object(), error);
+}
+
+} // namespace
+
+const FieldBinding flattenedBinding{&read, &write};
+
+} // namespace qx::detail

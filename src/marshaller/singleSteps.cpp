@@ -1,0 +1,249 @@
+// The single steps of marshalling and unmarshalling as operations of their own: each finds the plan
+// of the class or field it is given and hands over. A mapping that stands outside the marshaller's
+// own, a copy for instance, gets a plan for the time of the call.
+
+#include "marshaller/FieldBinding.h"
+
+using qx::CountedSet;
+using qx::Error;
+using qx::Object;
+using qx::Ref;
+using qx::XMLElement;
+using namespace qx::detail;
+
+namespace {
+
+class PlanOfClass {
+public:
+    PlanOfClass(const QXXMLMarshaller& marshaller, const QXXMLClassMapping& mapping)
+        : PlanOfClass(MappingPlan::of(marshaller.mapping()), mapping) {}
+    const ClassPlan& operator*() const noexcept { return _plan; }
+
+private:
+    PlanOfClass(const MappingPlan& plan, const QXXMLClassMapping& mapping)
+        : _own(plan.classOf(mapping) == nullptr ? plan.planFor(mapping) : nullptr),
+          _plan(_own ? *_own : *plan.classOf(mapping)) {}
+
+    std::unique_ptr<ClassPlan> _own;
+    const ClassPlan& _plan;
+};
+
+class PlanOfField {
+public:
+    PlanOfField(const QXXMLMarshaller& marshaller, const QXXMLFieldMapping& mapping)
+        : PlanOfField(MappingPlan::of(marshaller.mapping()), mapping) {}
+    const FieldPlan& operator*() const noexcept { return _plan; }
+
+private:
+    PlanOfField(const MappingPlan& plan, const QXXMLFieldMapping& mapping)
+        : _own(plan.fieldOf(mapping) == nullptr ? plan.planFor(mapping) : FieldPlan()),
+          _plan(plan.fieldOf(mapping) == nullptr ? _own : *plan.fieldOf(mapping)) {}
+
+    FieldPlan _own;
+    const FieldPlan& _plan;
+};
+
+// What a step of its own binds from, and what it counts as consumed on top of the caller's sets.
+class Step {
+public:
+    Step(QXXMLMarshaller& marshaller, XMLElement& element, std::size_t lookups, CountedSet& fields,
+         CountedSet& attributes)
+        : _unmarshalling(marshaller, &element, Unmarshalling::Use::steps),
+          _source(element, nullptr, lookups), _fieldSet(fields), _attributeSet(attributes),
+          _fields(fields), _attributes(attributes) {}
+
+    // Calls bind(Unmarshalling&, const Unmarshalling::Target&).
+    template <class Bind>
+    bool run(Object& object, bool isFlattened, Bind bind) {
+        const Ref<Object> held(&object);
+        const Unmarshalling::Target target{object, _source, {_fields, _attributes}, isFlattened};
+        bool bound = false;
+        try {
+            bound = bind(_unmarshalling, target);
+        } catch (...) { // what a host's setter throws
+            count();
+            throw;
+        }
+        count();
+        return bound;
+    }
+
+private:
+    // In both sets, or in none where memory fails.
+    void count() {
+        _fields.addTo(_fieldSet);
+        try {
+            _attributes.addTo(_attributeSet);
+        } catch (...) {
+            _fields.takeFrom(_fieldSet);
+            throw;
+        }
+    }
+
+    Unmarshalling _unmarshalling;
+    ChildLookup _source;
+    CountedSet& _fieldSet;
+    CountedSet& _attributeSet;
+    ConsumedNames _fields;
+    ConsumedNames _attributes;
+};
+
+} // namespace
+
+Ref<XMLElement> QXXMLMarshaller::marshallObject(const qx::Value& object, Ref<Error>* error) {
+    const qx::Value held = object; // whatever the getters do to the caller's
+    return Marshalling(*this).marshallObject(held, error);
+}
+
+Ref<XMLElement> QXXMLMarshaller::elementWithMapping(const QXXMLClassMapping& mapping,
+                                                    Object& object, Ref<Error>* error) {
+    const Ref<Object> held(&object);
+    const PlanOfClass plan(*this, mapping);
+    return Marshalling(*this).element(*plan, (*plan).elementName, &object, error);
+}
+
+bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLElement& element,
+                                        Object& object, Ref<Error>* error) {
+    const Ref<Object> held(&object);
+    const PlanOfClass plan(*this, mapping);
+    return Marshalling(*this).writeFields(*plan, element, object, error);
+}
+
+bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
+                               Ref<Error>* error) {
+    const Ref<Object> held(&object);
+    const PlanOfField plan(*this, field);
+    return Marshalling(*this).writeField(*plan, element, object, error);
+}
+
+bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
+                               const QXXMLFieldMapping& field, Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    Marshalling writing(*this);
+    return writeCollection(writing, *plan, element, array, error);
+}
+
+Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>* error) {
+    return Unmarshalling(*this, element != nullptr ? element->asElement() : nullptr)
+        .unmarshallNode(element, nullptr, error);
+}
+
+Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapping,
+                                                   XMLElement* element, bool isFlattened,
+                                                   Ref<Error>* error) {
+    if (element == nullptr)
+        return nullptr;
+    const PlanOfClass plan(*this, mapping);
+    ChildLookup source(*element, nullptr, (*plan).bindingCount);
+    return Unmarshalling(*this, element, Unmarshalling::Use::steps)
+        .build(*plan, source, isFlattened, error);
+}
+
+Ref<Object> QXXMLMarshaller::allocateClassWithMapping(const QXXMLClassMapping& mapping,
+                                                      Ref<Error>*) {
+    const PlanOfClass plan(*this, mapping);
+    return Unmarshalling(*this, nullptr, Unmarshalling::Use::steps).allocate(*plan);
+}
+
+bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Object& object,
+                                            XMLElement& element, bool isFlattened,
+                                            Ref<Error>* error) {
+    const auto boundFields = qx::make<CountedSet>();
+    const auto boundAttributes = qx::make<CountedSet>();
+    return bindFieldsWithMapping(mapping, object, element, *boundFields, *boundAttributes,
+                                 isFlattened, error);
+}
+
+bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Object& object,
+                                            XMLElement& element, CountedSet& boundFields,
+                                            CountedSet& boundAttributes, bool isFlattened,
+                                            Ref<Error>* error) {
+    const PlanOfClass plan(*this, mapping);
+    return Step(*this, element, (*plan).bindingCount, boundFields, boundAttributes)
+        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+            return step.readFields(*plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::bindField(const QXXMLFieldMapping& field, Object& object, std::size_t,
+                                XMLElement& element, CountedSet& boundFields,
+                                CountedSet& boundAttributes, bool isFlattened, Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+            return step.readField(*plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Object& object,
+                                           std::size_t, XMLElement& element,
+                                           CountedSet& boundFields, CountedSet& boundAttributes,
+                                           Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return attributeBinding.read(step, *plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::bindFieldAsText(const QXXMLFieldMapping& field, Object& object, std::size_t,
+                                      XMLElement& element, CountedSet& boundFields,
+                                      CountedSet& boundAttributes, Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return textBinding.read(step, *plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object& object,
+                                         std::size_t, XMLElement& element, CountedSet& boundFields,
+                                         CountedSet& boundAttributes, bool isFlattened,
+                                         Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    const FieldBinding& binding = (*plan).isContainer ? elementBinding : flattenedBinding;
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+            return binding.read(step, *plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::bindCollectionField(const QXXMLFieldMapping& field, Object& object,
+                                          XMLElement& element, CountedSet& boundFields,
+                                          CountedSet& boundAttributes, Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return readCollection(step, *plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::bindArrayFieldByType(const QXXMLFieldMapping& field, Object& object,
+                                           XMLElement& element, CountedSet& boundFields,
+                                           CountedSet& boundAttributes, Ref<Error>* error) {
+    const PlanOfField plan(*this, field);
+    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
+        .run(object, false, [&](Unmarshalling& step, const auto& target) {
+            return readCollectionByType(step, *plan, target, error);
+        });
+}
+
+bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
+                                          const CountedSet& boundAttributes, XMLElement& element,
+                                          Object& object, Ref<Error>* error) {
+    ConsumedNames fields(boundFields);
+    ConsumedNames attributes(boundAttributes);
+    ChildLookup source(element, nullptr, 0);
+    const Ref<Object> held(&object);
+    return Unmarshalling(*this, &element, Unmarshalling::Use::steps)
+        .validate(nullptr, {object, source, {fields, attributes}, false}, error);
+}
+
+bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,
+                     const QXXMLFieldMapping& field, Ref<Error>* error) {
+    return takeValue(object, FieldPlan::withoutClasses(field), key, value, error);
+}
+
+qx::String StringValueOfObjectWithMapping(const qx::Value& value, const QXXMLFieldMapping& field) {
+    return textOf(value, FieldPlan::withoutClasses(field).valueType);
+}

@@ -1,0 +1,50 @@
+// Fields bound to text: that of a child element, or of the element itself.
+
+#include "marshaller/FieldBinding.h"
+#include "model/Errors.h"
+
+namespace qx::detail {
+
+namespace {
+
+// A child of one of the bind names gives its text, the element itself where there is none.
+bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
+          Ref<Error>* error) {
+    const XMLElement* holder = &target.source.element();
+    bool isChild = false;
+    for (const BindingPlan& binding : field.bindings) {
+        if (binding.bindTo.isEmpty())
+            continue;
+        const auto found = target.source.find(binding.bindTo);
+        if (found.several)
+            return fail(error, errors::tooManyChildren, binding.bindTo, &target.source.element());
+        if (found.first != nullptr) {
+            target.bound.fields.add(binding.bindTo);
+            holder = found.first;
+            isChild = true;
+            break;
+        }
+    }
+    if (!reading.budget().takeText(*holder, error))
+        return false;
+    const String text = isChild ? holder->stringValue() : target.source.stringValue();
+    if (!text.isEmpty())
+        return takeValue(target.object, field, field.key, text, error);
+    if (field.isRequired)
+        return fail(error, errors::requiredTextMissing, field.key.string(),
+                    &target.source.element());
+    return false;
+}
+
+// Whatever stood in the element before goes: earlier children too.
+bool write(Marshalling&, const FieldPlan& field, XMLElement& element, const Value& value,
+           Ref<Error>*) {
+    element.setStringValue(textOf(value, field.valueType));
+    return true;
+}
+
+} // namespace
+
+const FieldBinding textBinding{&read, &write};
+
+} // namespace qx::detail

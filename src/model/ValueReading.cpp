@@ -1,0 +1,127 @@
+#include <QXXMLMarshalling/detail/ValueReading.h>
+
+#include "base/Base64.h"
+
+#include <charconv>
+#include <cmath>
+
+namespace qx::detail {
+
+namespace {
+
+std::string_view trimmed(std::string_view text) {
+    constexpr std::string_view blanks = " \t\n\r";
+    const std::size_t start = text.find_first_not_of(blanks);
+    if (start == std::string_view::npos)
+        return {};
+    return text.substr(start, text.find_last_not_of(blanks) - start + 1);
+}
+
+template <class T>
+bool readWhole(std::string_view text, T& result) {
+    text = trimmed(text);
+    if (text.size() > 1 && text.front() == '+' && text[1] != '-')
+        text.remove_prefix(1);
+    const auto read = std::from_chars(text.data(), text.data() + text.size(), result);
+    return read.ec == std::errc() && read.ptr == text.data() + text.size();
+}
+
+constexpr double twoTo63 = 9223372036854775808.0;
+constexpr double twoTo64 = 18446744073709551616.0;
+
+} // namespace
+
+bool readBoolean(const Value& value, bool& result) {
+    if (value.isNumber()) {
+        result = value.boolValue();
+        return true;
+    }
+    const String text = value.string();
+    for (const auto* yes : {"true", "yes", "1"})
+        if (text.equalsIgnoringCase(yes))
+            return result = true;
+    for (const auto* no : {"false", "no", "0"}) {
+        if (text.equalsIgnoringCase(no)) {
+            result = false;
+            return true;
+        }
+    }
+    return false;
+}
+
+bool readInteger(const Value& value, std::int64_t& result) {
+    if (value.isString())
+        return readWhole(value.string(), result);
+    if (!value.isNumber())
+        return false;
+    if (value.kind() == Value::Kind::real) {
+        const double real = value.doubleValue();
+        if (std::trunc(real) != real || real < -twoTo63 || real >= twoTo63)
+            return false;
+    }
+    result = value.intValue();
+    return true;
+}
+
+bool readUnsigned(const Value& value, std::uint64_t& result) {
+    if (value.isString())
+        return readWhole(value.string(), result);
+    if (!value.isNumber())
+        return false;
+    if (value.kind() == Value::Kind::real) {
+        const double real = value.doubleValue();
+        if (std::trunc(real) != real || real < 0 || real >= twoTo64)
+            return false;
+        result = static_cast<std::uint64_t>(real);
+        return true;
+    }
+    if (value.intValue() < 0)
+        return false;
+    result = static_cast<std::uint64_t>(value.intValue());
+    return true;
+}
+
+// XML Schema's words for what is no finite number; std::from_chars has others.
+bool readReal(const Value& value, double& result) {
+    if (value.isString()) {
+        const String held = value.string();
+        const std::string_view text = trimmed(held);
+        double read = 0;
+        if (text == "NaN")
+            read = std::numeric_limits<double>::quiet_NaN();
+        else if (text == "INF" || text == "-INF")
+            read = text.front() == '-' ? -HUGE_VAL : HUGE_VAL;
+        else if (!readWhole(text, read) || !std::isfinite(read))
+            return false;
+        result = read;
+        return true;
+    }
+    if (!value.isNumber())
+        return false;
+    result = value.doubleValue();
+    return true;
+}
+
+bool readText(const Value& value, String& result) {
+    if (!value.isString() && !value.isNumber())
+        return false;
+    result = value.description();
+    return true;
+}
+
+bool readBytes(const Value& value, std::vector<std::byte>& result) {
+    if (!value.isString())
+        return false;
+    const auto bytes = decodeBase64(value.string());
+    if (!bytes)
+        return false;
+    const auto* first = reinterpret_cast<const std::byte*>(bytes->data());
+    result.assign(first, first + bytes->size());
+    return true;
+}
+
+String textOfBytes(const std::vector<std::byte>& bytes) {
+    return encodeBase64({reinterpret_cast<const char*>(bytes.data()), bytes.size()});
+}
+
+} // namespace qx::detail

@@ -1,0 +1,67 @@
+#include "plan/FieldPlan.h"
+
+#include <algorithm>
+
+namespace qx::detail {
+
+namespace {
+
+ValueType valueTypeOf(const String& type) {
+    if (type.isEmpty())
+        return ValueType::none;
+    if (type.equalsIgnoringCase("boolean"))
+        return ValueType::boolean;
+    const bool integer = type.equalsIgnoringCase("integer") || type.equalsIgnoringCase("int");
+    return integer ? ValueType::integer : ValueType::other;
+}
+
+CollectionKind collectionKindOf(const String& collection) {
+    if (collection.isEmpty())
+        return CollectionKind::none;
+    constexpr const char* kinds[] = {"array", "vector", "collection", "set"};
+    const bool known = std::any_of(std::begin(kinds), std::end(kinds), [&](const char* kind) {
+        return collection.equalsIgnoringCase(kind);
+    });
+    return known ? CollectionKind::array : CollectionKind::unknown;
+}
+
+BindingKind bindingKindOf(const QXXMLFieldMapping& mapping) {
+    switch (mapping.nodeType()) {
+    case QXXMLNodeTypeAttribute:
+        return BindingKind::attribute;
+    case QXXMLNodeTypeText:
+        return BindingKind::text;
+    case QXXMLNodeTypeElement:
+        return mapping.isContainer() ? BindingKind::element : BindingKind::flattened;
+    case QXXMLNodeTypeUnknown:
+        break;
+    }
+    return BindingKind::automatic;
+}
+
+} // namespace
+
+FieldPlan FieldPlan::withoutClasses(const QXXMLFieldMapping& mapping) {
+    FieldPlan plan;
+    plan.mapping = &mapping;
+    plan.key = mapping.name();
+    plan.kind = bindingKindOf(mapping);
+    plan.collection = collectionKindOf(mapping.collection());
+    plan.valueType = valueTypeOf(mapping.type());
+    plan.isRequired = mapping.isRequired();
+    plan.isContainer = mapping.isContainer();
+    for (const auto& binding : mapping.bindToMappings()) {
+        const String& bindTo = binding->bindTo();
+        plan.bindings.push_back({.bindTo = bindTo,
+                                 .name = bindTo.isEmpty() ? mapping.name() : bindTo,
+                                 .location = binding->location()});
+    }
+    return plan;
+}
+
+const BindingPlan& FieldPlan::primaryBinding() const {
+    static const BindingPlan none;
+    return bindings.empty() ? none : bindings.front();
+}
+
+} // namespace qx::detail
