@@ -144,9 +144,8 @@ Ref<XMLNode> ChildLookup::keep(XMLNode& node, ReadingBudget& budget,
                                ReadingBudget::ErrorSlot error) const {
     // Of an element's attributes the objects flattened into it keep the same copies: these count
     // once, when they are made.
-    const bool isShared =
-        _copies != nullptr && (node.kind() == XMLNodeKind::attribute ||
-                               node.kind() == XMLNodeKind::namespaceDeclaration);
+    const bool isShared = _copies != nullptr && (node.kind() == XMLNodeKind::attribute ||
+                                                 node.kind() == XMLNodeKind::namespaceDeclaration);
     if (!isShared && !budget.takeKept(1, _element, error))
         return nullptr;
     return _copies != nullptr ? _copies->counterpart(node, budget, error) : Ref<XMLNode>(&node);

@@ -29,15 +29,4 @@ bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref
     return fail(error, errors::notAnInteger, field.xmlName(), text);
 }
 
-String textOf(const Value& value, ValueType type) {
-    if (type == ValueType::boolean)
-        return value.boolValue() ? "true" : "false";
-    return value.description();
-}
-
-// Numbers are cut to integers first.
-bool isLeftOut(const FieldPlan& field, const Value& value, const String& text) {
-    return !field.isRequired && ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
-}
-
 } // namespace qx::detail

@@ -15,8 +15,16 @@ namespace qx::detail {
 //   -222  "Unable to set value: %@ for key: %@ in class: %@"
 bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error);
 
-String textOf(const Value& value, ValueType type);
+inline String textOf(const Value& value, ValueType type) {
+    if (type == ValueType::boolean)
+        return value.boolValue() ? "true" : "false";
+    return value.description();
+}
+
 // Whether an attribute with that text is left out: nothing requires it, and it is empty or zero.
-bool isLeftOut(const FieldPlan& field, const Value& value, const String& text);
+// Numbers are cut to integers first.
+inline bool isLeftOut(const FieldPlan& field, const Value& value, const String& text) {
+    return !field.isRequired && ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
+}
 
 } // namespace qx::detail

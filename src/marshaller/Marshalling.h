@@ -1,8 +1,8 @@
 #pragma once
 
 // One call of the marshaller: objects become elements, driven by the mapping's plan. How a field is
-// written is told by its kind of binding (FieldBinding.h). It holds the marshaller, which a getter of
-// the host's may let go of.
+// written is told by its kind of binding (FieldBinding.h). It holds the marshaller, which a getter
+// of the host's may let go of.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 

@@ -58,9 +58,32 @@ Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* 
     return document;
 }
 
-// The group closes whatever happens: every call is one step to undo.
+namespace {
+
+// One group for what a reading registers. It closes however the reading ends, with the groups that
+// a host left open inside it. The group of the event around the reading stays as it is.
+class ReadingGroup {
+public:
+    explicit ReadingGroup(Ref<qx::UndoManager> manager)
+        : _manager(std::move(manager)), _level(_manager->groupingLevel()) {
+        _manager->beginUndoGrouping();
+    }
+    ~ReadingGroup() {
+        while (_manager->groupingLevel() > _level)
+            _manager->endUndoGrouping();
+    }
+    ReadingGroup(const ReadingGroup&) = delete;
+    ReadingGroup& operator=(const ReadingGroup&) = delete;
+
+private:
+    const Ref<qx::UndoManager> _manager;
+    const std::size_t _level;
+};
+
+} // namespace
+
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
-    const qx::UndoGroup group(undoManager());
+    const ReadingGroup group(undoManager());
     const qx::BulkObjects bulk;
     return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
 }

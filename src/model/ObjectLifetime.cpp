@@ -16,12 +16,13 @@ std::atomic<std::int64_t> liveObjects{0};
 // Objects that end while this many others are ending above them on the stack wait for their turn.
 constexpr unsigned deepestRelease = 64;
 
-// What an object's count says. A destructor may make and drop references to it: none of these brings
-// the count from one range into another.
+// What an object's count says. A destructor may make and drop references to it: none of these
+// brings the count from one range into another.
 //
 //     0x00000001 and up     so many references
 //     about 0x40000000      the object ends: its destructor runs, or is about to
-//     about 0x80000000      it waits for its turn, has no extras, and _extras is the link to the next
+//     about 0x80000000      it waits for its turn, has no extras, and _extras is the link to the
+//     next
 //                           object that waits
 constexpr std::uint32_t endingCount = 0x40000000U;
 constexpr std::uint32_t waitingCount = 2 * endingCount;

@@ -41,6 +41,8 @@ BindingKind bindingKindOf(const QXXMLFieldMapping& mapping) {
 
 } // namespace
 
+const BindingPlan FieldPlan::noBinding;
+
 FieldPlan FieldPlan::withoutClasses(const QXXMLFieldMapping& mapping) {
     FieldPlan plan;
     plan.mapping = &mapping;
@@ -57,11 +59,6 @@ FieldPlan FieldPlan::withoutClasses(const QXXMLFieldMapping& mapping) {
                                  .location = binding->location()});
     }
     return plan;
-}
-
-const BindingPlan& FieldPlan::primaryBinding() const {
-    static const BindingPlan none;
-    return bindings.empty() ? none : bindings.front();
 }
 
 } // namespace qx::detail

@@ -69,7 +69,11 @@ struct FieldPlan {
     }
 
 private:
-    const BindingPlan& primaryBinding() const;
+    static const BindingPlan noBinding;
+
+    const BindingPlan& primaryBinding() const {
+        return bindings.empty() ? noBinding : bindings.front();
+    }
 };
 
 } // namespace qx::detail

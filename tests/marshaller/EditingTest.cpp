@@ -4,6 +4,7 @@
 #include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/undo/UndoableObject.h>
 
@@ -172,6 +173,27 @@ TEST(EditingTest, OneReadingIsOneStepToUndo) {
     EXPECT_FALSE(marshaller->readString("<page title='t'/>"));
     EXPECT_EQ(manager->groupingLevel(), 0U);
     EXPECT_FALSE(manager->canUndo()); // with the page, which was dropped
+}
+
+// A host that reads between two changes of one event undoes both at once, and the reading with
+// them.
+TEST(EditingTest, AReadingStaysInTheGroupOfTheEventAroundIt) {
+    const auto marshaller = scenario::marshaller(mapping);
+    const Ref<UndoManager>& manager = marshaller->undoManager();
+    const auto count = qx::make<qx::Array>();
+    const auto change = [&] {
+        manager->registerUndo(*count, [](qx::Array& undone) { undone.add(1); });
+    };
+    change();
+    const auto page = marshaller->readString("<page title='t'><text>x</text></page>").as<Page>();
+    EXPECT_EQ(manager->groupingLevel(), 1U);
+    EXPECT_FALSE(marshaller->readString("<page title='t'/>"));
+    EXPECT_EQ(manager->groupingLevel(), 1U);
+    change();
+    manager->undo();
+    EXPECT_EQ(count->count(), 2U);
+    EXPECT_TRUE(page->title.isNull() && page->text.isNull());
+    EXPECT_FALSE(manager->canUndo());
 }
 
 TEST(EditingTest, RecordsAreNotHandedTheMarshallersUndoManager) {
