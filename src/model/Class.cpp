@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "base/Immortal.h"
 #include "base/PropertyNames.h"
 #include "model/Warning.h"
 
@@ -44,13 +45,8 @@ void addBases(const std::type_info& type, std::vector<const std::type_info*>& ty
 
 } // namespace
 
-// Classes by name and by C++ type. Never destroyed: static objects may ask while they end.
+// Classes by name and by C++ type.
 struct ClassRegistry {
-    static ClassRegistry& shared() {
-        static auto* const registry = new ClassRegistry;
-        return *registry;
-    }
-
     const Class* named(Key name) {
         const std::shared_lock lock(mutex);
         const auto found = byName.find(name);
@@ -182,21 +178,21 @@ Class::Class(detail::ClassDraft draft)
 
 const Class* Class::named(std::string_view name) {
     const Key key = Key::existing(name);
-    return key.isNull() ? nullptr : ClassRegistry::shared().named(key);
+    return key.isNull() ? nullptr : immortal<ClassRegistry>().named(key);
 }
 
 const Class* Class::described(const std::type_info& type) {
-    return ClassRegistry::shared().described(type);
+    return immortal<ClassRegistry>().described(type);
 }
 
 bool Class::forget(std::string_view name) {
     const Key key = Key::existing(name);
-    return !key.isNull() && ClassRegistry::shared().forget(key);
+    return !key.isNull() && immortal<ClassRegistry>().forget(key);
 }
 
 const Class& Class::ofObject(const Object& object) {
     const std::type_info& type = typeid(object);
-    ClassRegistry& registry = ClassRegistry::shared();
+    ClassRegistry& registry = immortal<ClassRegistry>();
     if (const Class* known = registry.known(type))
         return *known;
     // Describes the library's class among the bases, unless that was done.
@@ -212,7 +208,7 @@ const Class* Class::superclass() const {
     const Class* known = _superclass.load(std::memory_order_acquire);
     if (known != nullptr)
         return known;
-    known = ClassRegistry::shared().nearest(*_superclassType);
+    known = immortal<ClassRegistry>().nearest(*_superclassType);
     if (known != nullptr) {
         if (*known->_type == *_superclassType)
             _superclass.store(known, std::memory_order_release);
@@ -283,7 +279,7 @@ bool Class::automaticallyNotifiesObserversForKey(Key key) const {
 namespace detail {
 
 const Class& publish(ClassDraft draft, bool listed) {
-    return ClassRegistry::shared().publish(std::move(draft), listed);
+    return immortal<ClassRegistry>().publish(std::move(draft), listed);
 }
 
 void raiseArgumentCount(Selector selector, const Class& receiver, std::size_t given) {

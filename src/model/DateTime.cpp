@@ -1,5 +1,7 @@
 #include <QXXMLMarshalling/model/DateTime.h>
 
+#include "base/WhiteSpace.h"
+
 #include <algorithm>
 #include <array>
 #include <cstdlib>
@@ -22,11 +24,7 @@ bool isDigit(char c) { return c >= '0' && c <= '9'; }
 // Reads a text from its start. What is not there leaves it where it is.
 class Cursor {
 public:
-    explicit Cursor(std::string_view text) : _rest(text) {
-        constexpr std::string_view blanks = " \t\n\r";
-        _rest.remove_prefix(std::min(_rest.find_first_not_of(blanks), _rest.size()));
-        _rest = _rest.substr(0, _rest.find_last_not_of(blanks) + 1);
-    }
+    explicit Cursor(std::string_view text) : _rest(trimmed(text)) {}
 
     bool isAtEnd() const { return _rest.empty(); }
     bool take(char c) {

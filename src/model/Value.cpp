@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/model/Null.h>
 
 #include "base/Scan.h"
+#include "base/WhiteSpace.h"
 
 #include <algorithm>
 #include <cmath>
@@ -45,11 +46,8 @@ namespace {
 
 // What a text says as a yes or no: blanks, a sign and zeros are passed over.
 bool textIsTrue(std::string_view text) {
-    const std::size_t start = text.find_first_not_of(" \t\r\n");
-    if (start == std::string_view::npos)
-        return false;
-    text.remove_prefix(start);
-    if (text.front() == '+' || text.front() == '-')
+    text = withoutLeadingWhite(text);
+    if (text.starts_with('+') || text.starts_with('-'))
         text.remove_prefix(1);
     text.remove_prefix(std::min(text.find_first_not_of('0'), text.size()));
     return !text.empty() &&

@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/detail/ValueReading.h>
 
 #include "base/Base64.h"
+#include "base/WhiteSpace.h"
 
 #include <charconv>
 #include <cmath>
@@ -8,14 +9,6 @@
 namespace qx::detail {
 
 namespace {
-
-std::string_view trimmed(std::string_view text) {
-    constexpr std::string_view blanks = " \t\n\r";
-    const std::size_t start = text.find_first_not_of(blanks);
-    if (start == std::string_view::npos)
-        return {};
-    return text.substr(start, text.find_last_not_of(blanks) - start + 1);
-}
 
 template <class T>
 bool readWhole(std::string_view text, T& result) {

@@ -3,8 +3,6 @@
 #include "xml/XMLCharacters.h"
 #include "xml/XMLLimits.h"
 
-#include <QXXMLMarshalling/base/Key.h>
-
 #include <algorithm>
 #include <cstring>
 
@@ -59,11 +57,6 @@ void skip(const char*& at, std::uint8_t kind) noexcept {
         ++at;
 }
 
-constexpr std::uint64_t mixed(std::uint64_t hash) noexcept {
-    hash *= 0x9E3779B97F4A7C15U;
-    return hash ^ hash >> 32U;
-}
-
 constexpr std::string_view xmlNamespace = "http://www.w3.org/XML/1998/namespace";
 constexpr std::string_view xmlnsNamespace = "http://www.w3.org/2000/xmlns/";
 
@@ -89,7 +82,7 @@ XMLScanner::XMLScanner(std::string_view text, const XMLParseOptions& options, XM
     : _text(text), _at(text.data()), _end(text.data() + text.size()),
       _maximumDepth(options.maximumDepth),
       _maximumSize(std::min(options.maximumTextSize, largestPiece)), _index(index),
-      _entries(index._entries), _slots(256), _seed(String::hashOf("names of a document")) {
+      _entries(index._entries), _names(text, std::min(longestName, _maximumSize), index._names) {
     // Most entries stand for more bytes than this; what is too much goes back at the end.
     constexpr std::size_t bytesOfEntry = 16;
     _entries.reserve(text.size() / bytesOfEntry + 16);
@@ -233,7 +226,7 @@ void XMLScanner::scanAttribute() {
     Name& name = _names[number];
     require(name.usedAt != _element);
     name.usedAt = _element;
-    if (name.local != none) {
+    if (name.local != ScannedNames::none) {
         Name& local = _names[name.local];
         require(local.localUsedAt != _element);
         local.localUsedAt = _element;
@@ -268,13 +261,13 @@ void XMLScanner::takeDeclaration(XMLIndexEntry& entry, const Name& name) {
     const std::string_view URI = _text.substr(entry.begin, entry.end - entry.begin);
     require(!_needsWork && URI != xmlNamespace && URI != xmlnsNamespace);
     require(++_open.back().namespaces <= xmlLimits::namespaces);
-    require(++_declarations + _names.size() <= xmlLimits::names);
+    _names.countURI();
     entry.kind = static_cast<std::uint32_t>(XMLNodeKind::namespaceDeclaration) & 0xFU;
     if (name.meaning == Meaning::prefixNamespace) {
         require(!URI.empty());
         entry.name = name.local & 0xFFFFFU;
     } else {
-        entry.name = numberOf(_end, 0) & 0xFFFFFU;
+        entry.name = _names.numberOfNoPrefix() & 0xFFFFFU;
     }
 }
 
@@ -453,84 +446,7 @@ XMLScanner::Number XMLScanner::scanName() {
     const char* const begin = _at;
     skip(_at, nameByte);
     require(_at != begin);
-    return numberOf(begin, static_cast<std::size_t>(_at - begin));
-}
-
-std::uint32_t XMLScanner::hashOf(const char* begin, std::size_t size) const noexcept {
-    std::uint64_t hash = _seed + size;
-    while (true) {
-        std::uint64_t word = 0;
-        if (size >= 8)
-            std::memcpy(&word, begin, 8);
-        else
-            std::memcpy(&word, begin, size);
-        // Twice: once would leave the slot untouched by what only the last bytes differ in,
-        // whatever the seed, and a document could have all its names meet in one.
-        hash = mixed(mixed(hash ^ word));
-        if (size <= 8)
-            return static_cast<std::uint32_t>(hash);
-        begin += 8;
-        size -= 8;
-    }
-}
-
-XMLScanner::Number XMLScanner::numberOf(const char* begin, std::size_t size) {
-    const std::uint32_t hash = hashOf(begin, size);
-    const std::size_t mask = _slots.size() - 1;
-    for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
-        const Name& name = _names[_slots[slot] - 1];
-        if (name.hash == hash && name.size == size &&
-            std::memcmp(_text.data() + name.begin, begin, size) == 0)
-            return _slots[slot] - 1;
-    }
-    return addName(begin, size, hash);
-}
-
-// A new name: looked at in full, and taken apart at its colon.
-XMLScanner::Number XMLScanner::addName(const char* begin, std::size_t size, std::uint32_t hash) {
-    const std::string_view text(begin, size);
-    require(size <= std::min(longestName, _maximumSize) &&
-            _declarations + _names.size() < xmlLimits::names);
-    Name name{offset(begin), static_cast<std::uint32_t>(size), hash};
-    if (begin != _end) {
-        require(isXMLName(text));
-        const std::size_t colon = text.find(':');
-        const std::string_view prefix = text.substr(0, std::min(colon, text.size()));
-        if (text == "xmlns") {
-            name.meaning = Meaning::defaultNamespace;
-        } else if (colon != std::string_view::npos) {
-            const std::string_view local = text.substr(colon + 1);
-            require(colon != 0 && isXMLName(local) && local.find(':') == std::string_view::npos);
-            const bool isDeclaration = prefix == "xmlns";
-            require(!isDeclaration || (local != "xml" && local != "xmlns"));
-            name.meaning = isDeclaration ? Meaning::prefixNamespace : Meaning::plain;
-            name.local = numberOf(local.data(), local.size());
-        }
-    }
-    if ((_names.size() + 1) * 2 > _slots.size())
-        growNames();
-    const Key known = Key::existing(text);
-    _index._names.push_back(known.isNull() ? String(text) : known.string());
-    const auto number = static_cast<Number>(_names.size());
-    _names.push_back(name);
-    const std::size_t mask = _slots.size() - 1;
-    std::size_t slot = hash & mask;
-    while (_slots[slot] != 0)
-        slot = (slot + 1) & mask;
-    _slots[slot] = number + 1;
-    return number;
-}
-
-void XMLScanner::growNames() {
-    std::vector<Number> larger(_slots.size() * 2);
-    const std::size_t mask = larger.size() - 1;
-    for (std::size_t i = 0; i < _names.size(); ++i) {
-        std::size_t slot = _names[i].hash & mask;
-        while (larger[slot] != 0)
-            slot = (slot + 1) & mask;
-        larger[slot] = static_cast<Number>(i + 1);
-    }
-    _slots.swap(larger);
+    return _names.numberOf(begin, static_cast<std::size_t>(_at - begin));
 }
 
 } // namespace qx

@@ -1,0 +1,73 @@
+#include "xml/ScannedNames.h"
+
+#include <QXXMLMarshalling/base/Key.h>
+
+#include "xml/XMLCharacters.h"
+
+#include <algorithm>
+
+namespace qx {
+
+namespace {
+
+void require(bool condition) {
+    if (!condition)
+        throw ScannedNames::Refused();
+}
+
+} // namespace
+
+ScannedNames::ScannedNames(std::string_view text, std::size_t longest, std::vector<String>& texts)
+    : _text(text), _longest(longest), _seed(String::hashOf("names of a document")), _slots(256),
+      _texts(texts) {}
+
+ScannedNames::Number ScannedNames::add(std::string_view text, std::uint32_t hash) {
+    require(text.size() <= _longest && _URIs + _names.size() < xmlLimits::names);
+    Name name{static_cast<std::uint32_t>(text.data() - _text.data()),
+              static_cast<std::uint32_t>(text.size()), hash};
+    if (!text.empty())
+        takeApart(name, text);
+    if ((_names.size() + 1) * 2 > _slots.size())
+        grow();
+    const Key known = Key::existing(text);
+    _texts.push_back(known.isNull() ? String(text) : known.string());
+    const auto number = static_cast<Number>(_names.size());
+    _names.push_back(name);
+    fill(number);
+    return number;
+}
+
+// What stands behind its colon is a name of its own.
+void ScannedNames::takeApart(Name& name, std::string_view text) {
+    require(isXMLName(text));
+    if (text == "xmlns")
+        name.meaning = Meaning::defaultNamespace;
+    const std::size_t colon = text.find(':');
+    if (colon == std::string_view::npos)
+        return;
+    const std::string_view local = text.substr(colon + 1);
+    require(colon != 0 && isXMLName(local) && local.find(':') == std::string_view::npos);
+    if (text.substr(0, colon) == "xmlns") {
+        require(local != "xml" && local != "xmlns");
+        name.meaning = Meaning::prefixNamespace;
+    }
+    name.local = numberOf(local.data(), local.size());
+}
+
+void ScannedNames::countURI() { require(++_URIs + _names.size() <= xmlLimits::names); }
+
+void ScannedNames::fill(Number number) {
+    const std::size_t mask = _slots.size() - 1;
+    std::size_t slot = _names[number].hash & mask;
+    while (_slots[slot] != 0)
+        slot = (slot + 1) & mask;
+    _slots[slot] = number + 1;
+}
+
+void ScannedNames::grow() {
+    _slots.assign(_slots.size() * 2, 0);
+    for (Number number = 0; number < _names.size(); ++number)
+        fill(number);
+}
+
+} // namespace qx

@@ -1,0 +1,109 @@
+#pragma once
+
+// The names of a document that is scanned, each known by a number: a hash table over the document's
+// own bytes.
+//
+//     _slots  | 0 | 2 | 0 | 1 | ...   by hash: a number plus one, 0 where free; open addressing, at
+//                                     most half full
+//     _names  | "b" | "a:b" | ...     place in the text and last use as an attribute; the local
+//     name
+//                                     of a prefixed one has an entry, too
+//     _texts  | "b" | "a:b" | ...     the index's, interned where some code knows them
+//
+// 1. Numbers stay. A reference to a Name is good until the next name is looked up.
+// 2. The hash's seed differs from process to process, so no document is known to fill one slot.
+// 3. There are at most xmlLimits::names of them: a number fits into the 20 bits of an entry.
+
+#include <QXXMLMarshalling/base/String.h>
+
+#include "xml/XMLLimits.h"
+
+#include <cstdint>
+#include <cstring>
+#include <vector>
+
+namespace qx {
+
+class ScannedNames {
+public:
+    using Number = std::uint32_t;
+    static constexpr Number none = UINT32_MAX;
+    static constexpr std::uint32_t numberBits = 20;
+    static_assert(xmlLimits::names < (1U << numberBits));
+
+    // Thrown for what is left to the C parser.
+    struct Refused {};
+
+    // What a name means as an attribute's.
+    enum class Meaning : std::uint8_t { plain, defaultNamespace, prefixNamespace };
+    struct Name {
+        std::uint32_t begin;
+        std::uint32_t size;
+        std::uint32_t hash;
+        std::uint32_t usedAt = 0;      // the element that had it last as an attribute
+        Number local = none;           // with a prefix: the number of the name behind the colon
+        std::uint32_t localUsedAt = 0; // the element that had an attribute of this local name last
+        Meaning meaning = Meaning::plain;
+    };
+
+    // Both outlive this. No name is longer than the limit.
+    ScannedNames(std::string_view text, std::size_t longest, std::vector<String>& texts);
+
+    Name& operator[](Number number) noexcept { return _names[number]; }
+
+    // The number of the name at that place of the text. A new name is looked at in full: throws
+    // Refused for what is none, and beyond a limit.
+    Number numberOf(const char* begin, std::size_t size) {
+        const std::uint32_t hash = hashOf(begin, size);
+        const std::size_t mask = _slots.size() - 1;
+        for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
+            const Name& name = _names[_slots[slot] - 1];
+            if (name.hash == hash && name.size == size &&
+                std::memcmp(_text.data() + name.begin, begin, size) == 0)
+                return _slots[slot] - 1;
+        }
+        return add({begin, size}, hash);
+    }
+    // The empty prefix, that of a default namespace.
+    Number numberOfNoPrefix() { return numberOf(_text.data() + _text.size(), 0); }
+
+    // The URI of each declaration counts as one more name. Throws Refused beyond the limit.
+    void countURI();
+
+private:
+    static constexpr std::uint64_t mixed(std::uint64_t hash) noexcept {
+        hash *= 0x9E3779B97F4A7C15U;
+        return hash ^ hash >> 32U;
+    }
+    std::uint32_t hashOf(const char* begin, std::size_t size) const noexcept {
+        std::uint64_t hash = _seed + size;
+        while (true) {
+            std::uint64_t word = 0;
+            if (size >= 8)
+                std::memcpy(&word, begin, 8);
+            else
+                std::memcpy(&word, begin, size);
+            // Twice: once would leave the slot untouched by what only the last bytes differ in,
+            // whatever the seed, and a document could have all its names meet in one.
+            hash = mixed(mixed(hash ^ word));
+            if (size <= 8)
+                return static_cast<std::uint32_t>(hash);
+            begin += 8;
+            size -= 8;
+        }
+    }
+    Number add(std::string_view text, std::uint32_t hash);
+    void takeApart(Name& name, std::string_view text);
+    void fill(Number number);
+    void grow();
+
+    const std::string_view _text;
+    const std::size_t _longest;
+    const std::uint32_t _seed;
+    std::vector<Name> _names;
+    std::vector<Number> _slots;
+    std::vector<String>& _texts;
+    std::size_t _URIs = 0;
+};
+
+} // namespace qx
