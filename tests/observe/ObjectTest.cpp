@@ -1,4 +1,4 @@
-// Objects as such: how they end, which class they are of, key paths.
+// Objects as such: how they end, observed or not, which class they are of, key paths.
 
 #include "support/Texts.h"
 
