@@ -139,7 +139,7 @@ TEST(ValueTest, EqualNumbersAreEqualWhateverTheirKindAndNoOthers) {
     EXPECT_NE(Value("3"), Value(3));
 }
 
-// Paths through nulls and to what is no object: ObjectTest.cpp.
+// Paths through nulls and to what is no object: tests/observe/ObjectTest.cpp.
 TEST(ValueTest, PathsLeadThroughObjectsAndLists) {
     const auto holder = make<Holder>();
     holder->next = make<Holder>();

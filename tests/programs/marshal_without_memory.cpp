@@ -16,6 +16,7 @@ namespace {
 
 using qx::Error;
 using qx::Ref;
+using M = QXXMLMarshaller;
 
 // Of a first input of the fuzz program: the mapping, and behind a line the document.
 std::string part(bool isDocument) {
@@ -94,7 +95,7 @@ void startAgain(Stage& stage) {
 template <class Make>
 Named making(const char* name, Make make) {
     return {name, [make](Stage& stage) {
-                const auto made = make(stage);
+                const auto made = make(*stage.marshaller, stage);
                 return [&stage, made] { return stage.shown(made); };
             }};
 }
@@ -103,7 +104,7 @@ template <class Bind>
 Named binding(const std::string& name, Bind bind) {
     return {name,
             [bind](Stage& stage) {
-                const bool result = bind(stage);
+                const bool result = bind(*stage.marshaller, stage);
                 return [&stage, result] { return stage.bound(result); };
             },
             startAgain};
@@ -113,7 +114,7 @@ template <class Write>
 Named writing(const std::string& name, Write write) {
     return {name,
             [write](Stage& stage) {
-                const bool result = write(stage);
+                const bool result = write(*stage.marshaller, stage);
                 return [&stage, result] {
                     return (result ? "true " : "false ") + stage.shown(stage.written);
                 };
@@ -132,61 +133,57 @@ std::vector<Named> readingOperations() {
                                             : 0);
              };
          }},
-        making("unmarshall",
-               [](Stage& s) { return s.marshaller->unmarshall(s.document, &s.error); }),
+        making("unmarshall", [](M& m, Stage& s) { return m.unmarshall(s.document, &s.error); }),
         making("unmarshallElement",
-               [](Stage& s) { return s.marshaller->unmarshallElement(s.root.get(), &s.error); }),
+               [](M& m, Stage& s) { return m.unmarshallElement(s.root.get(), &s.error); }),
         making("buildClassWithMapping",
-               [](Stage& s) {
-                   return s.marshaller->buildClassWithMapping(s.type(), s.root.get(), false,
-                                                              &s.error);
+               [](M& m, Stage& s) {
+                   return m.buildClassWithMapping(s.type(), s.root.get(), false, &s.error);
                }),
         making("allocateClassWithMapping",
-               [](Stage& s) {
-                   auto made = s.marshaller->allocateClassWithMapping(s.type(), &s.error);
+               [](M& m, Stage& s) {
+                   auto made = m.allocateClassWithMapping(s.type(), &s.error);
                    made->setValueForKey("n", "number");
                    made->setValueForKey(s.order, "flat");
                    return made;
                }),
-        making("readString",
-               [](Stage& s) { return s.marshaller->readString(documentText, &s.error); }),
+        making("readString", [](M& m, Stage& s) { return m.readString(documentText, &s.error); }),
         binding("bindFieldsWithMapping",
-                [](Stage& s) {
-                    return s.marshaller->bindFieldsWithMapping(
-                        s.type(), *s.target, *s.root, *s.fields, *s.attributes, false, &s.error);
+                [](M& m, Stage& s) {
+                    return m.bindFieldsWithMapping(s.type(), *s.target, *s.root, *s.fields,
+                                                   *s.attributes, false, &s.error);
                 }),
         binding("validateBoundFields",
-                [](Stage& s) {
-                    return s.marshaller->validateBoundFields(*s.fields, *s.attributes, *s.root,
-                                                             *s.target, &s.error);
+                [](M& m, Stage& s) {
+                    return m.validateBoundFields(*s.fields, *s.attributes, *s.root, *s.target,
+                                                 &s.error);
                 }),
-        binding("TakeValueForKey", [](Stage& s) {
+        binding("TakeValueForKey", [](M&, Stage& s) {
             return TakeValueForKey(*s.target, "text", "a text of some length", s.field(2),
                                    &s.error);
         })};
     const std::size_t count = Stage().type().fields().size();
     for (std::size_t i = 0; i < count; ++i) {
         const std::string number = " " + std::to_string(i);
-        using M = QXXMLMarshaller;
         for (const auto& [name, bind] : {std::pair{"bindField", &M::bindField},
                                          std::pair{"bindFieldAsElement", &M::bindFieldAsElement}})
-            all.push_back(binding(name + number, [i, step = bind](Stage& s) {
-                return (*s.marshaller.*step)(s.field(i), *s.target, 0, *s.root, *s.fields,
-                                             *s.attributes, false, &s.error);
+            all.push_back(binding(name + number, [i, step = bind](M& m, Stage& s) {
+                return (m.*step)(s.field(i), *s.target, 0, *s.root, *s.fields, *s.attributes, false,
+                                 &s.error);
             }));
         for (const auto& [name, bind] :
              {std::pair{"bindFieldAsAttribute", &M::bindFieldAsAttribute},
               std::pair{"bindFieldAsText", &M::bindFieldAsText}})
-            all.push_back(binding(name + number, [i, step = bind](Stage& s) {
-                return (*s.marshaller.*step)(s.field(i), *s.target, 0, *s.root, *s.fields,
-                                             *s.attributes, &s.error);
+            all.push_back(binding(name + number, [i, step = bind](M& m, Stage& s) {
+                return (m.*step)(s.field(i), *s.target, 0, *s.root, *s.fields, *s.attributes,
+                                 &s.error);
             }));
         for (const auto& [name, bind] :
              {std::pair{"bindCollectionField", &M::bindCollectionField},
               std::pair{"bindArrayFieldByType", &M::bindArrayFieldByType}})
-            all.push_back(binding(name + number, [i, step = bind](Stage& s) {
-                return (*s.marshaller.*step)(s.field(i), *s.target, *s.root, *s.fields,
-                                             *s.attributes, &s.error);
+            all.push_back(binding(name + number, [i, step = bind](M& m, Stage& s) {
+                return (m.*step)(s.field(i), *s.target, *s.root, *s.fields, *s.attributes,
+                                 &s.error);
             }));
     }
     return all;
@@ -195,14 +192,12 @@ std::vector<Named> readingOperations() {
 std::vector<Named> writingOperations() {
     std::vector<Named> all{
         making("marshallObject",
-               [](Stage& s) { return s.marshaller->marshallObject(s.order, &s.error); }),
+               [](M& m, Stage& s) { return m.marshallObject(s.order, &s.error); }),
         making("elementWithMapping",
-               [](Stage& s) {
-                   return s.marshaller->elementWithMapping(s.type(), *s.order, &s.error);
-               }),
+               [](M& m, Stage& s) { return m.elementWithMapping(s.type(), *s.order, &s.error); }),
         making("marshall",
-               [](Stage& s) {
-                   const auto document = s.marshaller->marshall(s.order, &s.error);
+               [](M& m, Stage& s) {
+                   const auto document = m.marshall(s.order, &s.error);
                    return Ref<qx::XMLElement>(document ? document->rootElement() : nullptr);
                }),
         {"writeString",
@@ -217,19 +212,19 @@ std::vector<Named> writingOperations() {
              const bool result = s.marshaller->writeStream(s.order, out, &s.error);
              return [buffer, result] { return (result ? "true " : "false ") + buffer->text(); };
          }},
-        writing("bindFieldMappings", [](Stage& s) {
-            return s.marshaller->bindFieldMappings(s.type(), *s.written, *s.order, &s.error);
+        writing("bindFieldMappings", [](M& m, Stage& s) {
+            return m.bindFieldMappings(s.type(), *s.written, *s.order, &s.error);
         })};
     const std::size_t count = Stage().type().fields().size();
     for (std::size_t i = 0; i < count; ++i) {
         const std::string number = " " + std::to_string(i);
-        all.push_back(writing("mapField" + number, [i](Stage& s) {
-            return s.marshaller->mapField(s.field(i), *s.written, *s.order, &s.error);
+        all.push_back(writing("mapField" + number, [i](M& m, Stage& s) {
+            return m.mapField(s.field(i), *s.written, *s.order, &s.error);
         }));
     }
-    all.push_back(writing("mapArray", [](Stage& s) {
+    all.push_back(writing("mapArray", [](M& m, Stage& s) {
         const auto lines = s.order->valueForKey("lines").as<qx::Array>();
-        return s.marshaller->mapArray(*lines, *s.written, s.field(5), &s.error);
+        return m.mapArray(*lines, *s.written, s.field(5), &s.error);
     }));
     return all;
 }

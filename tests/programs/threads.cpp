@@ -170,7 +170,8 @@ void useBundles(unsigned thread, unsigned round) {
     if (round % 11 == 0)
         qx::Bundle::setMainBundle(thread % 2 != 0 ? bundle : nullptr);
     check(static_cast<bool>(qx::Bundle::mainBundle()), "there is a main bundle");
-    qx::Bundle::bundleForClass(typeid(*bundle));
+    const qx::Object& object = *bundle;
+    check(static_cast<bool>(qx::Bundle::bundleForClass(typeid(object))), "a class has a bundle");
     qx::ProcessInfo::setProcessVersion("1", "2");
 }
 

@@ -283,21 +283,17 @@ TEST_F(QXGenericRecordUndoTest, TheClassOrTheRecordMayKeepKeysOutOfUndo) {
     }
 }
 
-TEST_F(QXGenericRecordUndoTest, ItemsOfACollectionAreRememberedButOnlyANewCollectionIsRegistered) {
-    const auto before = make<Array>(std::initializer_list<Value>{"one"});
+// That a new collection is: docs/records.md.
+TEST_F(QXGenericRecordUndoTest, ItemsOfACollectionAreRememberedButNotRegistered) {
+    const auto chapters = make<Array>(std::initializer_list<Value>{"one"});
     book->setContents(make<Dictionary>());
-    book->contents()->set("chapters", before);
+    book->contents()->set("chapters", chapters);
     const std::size_t indexes[] = {1};
     book->willChange(ChangeKind::insertion, indexes, "chapters");
-    before->add("two");
+    chapters->add("two");
     book->didChange(ChangeKind::insertion, indexes, "chapters");
-    EXPECT_EQ(book->changeCache()->get("chapters").object(), before.get());
+    EXPECT_EQ(book->changeCache()->get("chapters").object(), chapters.get());
     EXPECT_FALSE(manager->canUndo());
-    const auto after = before->mutableCopy();
-    after->remove(0);
-    book->setValueForKey(after, "chapters");
-    manager->undo();
-    EXPECT_EQ(book->valueForKey("chapters").object(), before.get());
 }
 
 TEST_F(QXGenericRecordUndoTest, FillingAFreshRecordMakesNothingButItsContents) {

@@ -143,8 +143,18 @@ TEST_F(RepositoryManagerTest, TheSharedManagerIsMadeOnceUntilItIsFlushedAndNotWh
     Manager::flushDefaultManager();
 }
 
-TEST_F(RepositoryManagerTest, TheDescriptionShowsTheRepositories) {
-    const std::string text = manager->description().str();
-    EXPECT_EQ(text.find(manager->Object::description().str() + " repositories: {"), 0U) << text;
-    EXPECT_NE(text.find("QXXMLDataRepositoryPersistentName = "), std::string::npos) << text;
+TEST_F(RepositoryManagerTest, TheDescriptionShowsTheRepositoriesAndTheirDocumentsButNoData) {
+    const auto memory = holding("doc");
+    memory->setData(make<Data>(), "data");
+    manager->addRepository(memory, "memory");
+    std::string text = manager->description().str();
+    for (const auto& part :
+         {manager->Object::description(), String(" repositories: {"),
+          String("QXXMLDataRepositoryPersistentName = "), String("memory = "),
+          memory->Object::description(), String(" documents: {"), String("doc = ")}) {
+        const std::size_t at = text.find(part.view());
+        ASSERT_NE(at, std::string::npos) << part.view() << " in " << text;
+        text.erase(0, at + part.size());
+    }
+    EXPECT_EQ(text.find("data = "), std::string::npos) << text;
 }

@@ -39,14 +39,3 @@ TEST(VolatileRepositoryTest, NullIsNotStored) {
     EXPECT_THROW(repository->setDocument(XMLDocument::initWithData("<a/>"), nullptr), Exception);
     EXPECT_FALSE(repository->containsDocument("name"));
 }
-
-TEST(VolatileRepositoryTest, TheDescriptionShowsDocumentsOnly) {
-    const auto repository = QXXMLVolatileDataRepository::init();
-    const String plain = repository->Object::description();
-    repository->setData(make<Data>(), "data");
-    EXPECT_EQ(repository->description(), plain);
-    repository->setDocument(XMLDocument::initWithData("<a/>"), "doc");
-    const std::string text = repository->description().str();
-    EXPECT_EQ(text.find(plain.str() + " documents: {"), 0U) << text;
-    EXPECT_NE(text.find("doc = "), std::string::npos) << text;
-}
