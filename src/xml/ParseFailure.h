@@ -28,6 +28,7 @@ inline constexpr ErrorText externalEntity{
 inline constexpr ErrorText undeclaredEntity{26, "The entity %@ is not declared", notWellFormed};
 inline constexpr ErrorText notationWithoutIdentifier{105, "The notation %@ has no identifier",
                                                      notWellFormed};
+inline constexpr ErrorText unknownVersion{108, "The XML version %@ is not known", notWellFormed};
 inline constexpr ErrorText doctypeRefused{
     1, "The document has a DOCTYPE, which is not allowed here", notAllowed};
 
@@ -70,6 +71,7 @@ inline constexpr std::array table{&empty,
                                   &externalEntity,
                                   &undeclaredEntity,
                                   &notationWithoutIdentifier,
+                                  &unknownVersion,
                                   &doctypeRefused,
                                   &otherEncoding,
                                   &unknownEncoding,

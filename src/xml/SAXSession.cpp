@@ -263,7 +263,10 @@ void SAXSession::startDocument() {
     const int standalone = _context->standalone;
     if (!_text.starts_with("<?xml") || _text.size() == 5 || !isWhite(_text[5]))
         return;
-    _document.setVersion(viewOf(_context->version));
+    const std::string_view version = viewOf(_context->version);
+    if (!isXMLVersion(version)) // the parser takes "1." for one
+        throw ParseFailure(parseErrors::unknownVersion, {version});
+    _document.setVersion(version);
     if (standalone == 0 || standalone == 1)
         _document.setStandalone(standalone == 1 ? "yes" : "no");
 }

@@ -105,4 +105,9 @@ bool isXMLName(std::string_view text) noexcept {
     return true;
 }
 
+bool isXMLVersion(std::string_view text) noexcept {
+    return text.size() > 2 && text.starts_with("1.") &&
+           text.find_first_not_of("0123456789", 2) == std::string_view::npos;
+}
+
 } // namespace qx

@@ -41,5 +41,7 @@ bool isXMLCharacter(char32_t c) noexcept;
 bool isXMLText(std::string_view text) noexcept;
 // A name of an element, an attribute or a target, colons included.
 bool isXMLName(std::string_view text) noexcept;
+// "1." and digits.
+bool isXMLVersion(std::string_view text) noexcept;
 
 } // namespace qx

@@ -18,11 +18,6 @@ bool holds(std::string_view text, std::string_view part) {
 }
 
 // "1." and digits.
-bool isVersion(std::string_view text) {
-    return text.size() > 2 && text.starts_with("1.") &&
-           text.find_first_not_of("0123456789", 2) == std::string_view::npos;
-}
-
 // Bytes that can be copied from text as they are.
 constexpr std::array<bool, 256> plainBytes = [] {
     std::array<bool, 256> plain{};
@@ -78,7 +73,7 @@ void XMLSerializer::writeDeclaration(const XMLDocument& document) {
     const String& standalone = document.standalone();
     if (version.isEmpty() && encoding.isEmpty() && standalone.isEmpty())
         return;
-    if (isChecked() && !version.isEmpty() && !isVersion(version))
+    if (isChecked() && !version.isEmpty() && !isXMLVersion(version))
         refuse("the version is no XML version", {document});
     if (isChecked() && !standalone.isEmpty() && standalone != "yes" && standalone != "no")
         refuse("standalone is neither yes nor no", {document});

@@ -112,6 +112,7 @@ TEST(XMLParser, WhatIsNoXMLIsAnErrorWithItsPlace) {
          "1:68 29 The entity e stands outside of the document and is not read"},
         {"<!DOCTYPE a [<!ENTITY e '&e;'>]><a>&e;</a>",
          "1:39 89 Entities refer to themselves, or nest deeper than the limit of 32"},
+        {"<?xml version='1.'?><a/>", "1:21 108 The XML version 1. is not known"},
         {"<!DOCTYPE a [<!NOTATION n >]><a/>", "1:28 105 The notation n has no identifier"},
         {"<!DOCTYPE a [<!ENTITY % e SYSTEM 'x'>%e;<!ENTITY f 'y'>]><a>&f;</a>",
          "1:64 26 The entity f is not declared"},
