@@ -70,6 +70,7 @@ private:
     void writeEscaped(std::string_view text, Where where, bool escapesBreaks, const Place& place);
     // Text that nothing can be escaped in.
     void writeLiteral(std::string_view text, const Place& place);
+    bool isEncodable(char32_t c, std::string_view character) const;
     void writeName(const String& name, const Place& place);
     void checkName(const String& name, const Place& place);
 
