@@ -109,44 +109,55 @@ DecodeResult decode(std::string_view bytes, const String& encoding, std::string&
     return run(converter, bytes, text) ? DecodeResult::decoded : DecodeResult::malformed;
 }
 
-TextEncoder::TextEncoder(const String& encoding)
-    : _converter(openConverter(encoding.c_str(), "UTF-8", encoding)), _name(encoding) {
-    if (_converter == noConverter())
+TextEncoder::TextEncoder(const String& encoding) : _name(encoding) {
+    const iconv_t converter = openConverter(encoding.c_str(), "UTF-8", encoding);
+    if (converter == noConverter())
         throw Exception(Exception::invalidArgument,
                         String::concat({"the encoding ", encoding, " is not known"}));
+    _converter.reset(converter);
     // A reader must find the declaration: it looks for "<?xml" as it is, or for a signature.
     std::string start;
     constexpr std::string_view declaration = "<?xml";
-    if (convert(declaration, start) &&
-        (start == declaration || encodingSignature(start).encoding != nullptr))
-        return;
-    ::iconv_close(_converter);
-    throw Exception(Exception::invalidArgument,
-                    String::concat({"no document can be written in the encoding ", encoding}));
+    if (!convert(declaration, start) ||
+        (start != declaration && encodingSignature(start).encoding == nullptr))
+        throw Exception(Exception::invalidArgument,
+                        String::concat({"no document can be written in the encoding ", encoding}));
+    std::string ascii;
+    for (char c = ' '; c < 0x7F; ++c)
+        ascii += c;
+    _lacksASCII = !comesBack(ascii += '\x7F');
 }
 
-TextEncoder::~TextEncoder() { ::iconv_close(_converter); }
+void TextEncoder::Closer::operator()(void* converter) const noexcept { ::iconv_close(converter); }
 
 bool TextEncoder::convert(std::string_view text, std::string& bytes) {
-    ::iconv(_converter, nullptr, nullptr, nullptr, nullptr);
-    return run(_converter, text, bytes);
+    ::iconv(_converter.get(), nullptr, nullptr, nullptr, nullptr);
+    return run(_converter.get(), text, bytes);
+}
+
+bool TextEncoder::comesBack(std::string_view text) {
+    std::string bytes;
+    std::string back;
+    return convert(text, bytes) && decode(bytes, _name, back) == DecodeResult::decoded &&
+           back == text;
 }
 
 bool TextEncoder::canEncode(char32_t c, std::string_view character) {
     const auto known = _known.find(c);
     if (known != _known.end())
         return known->second;
-    std::string bytes;
-    const bool can = convert(character, bytes);
+    const bool can = comesBack(character);
     _known.emplace(c, can);
     return can;
 }
 
 std::string TextEncoder::encoded(std::string_view text) {
     std::string bytes;
-    if (!convert(text, bytes))
-        throw Exception(Exception::internalInconsistency,
-                        String::concat({"the encoding ", _name, " lacks a character"}));
+    std::string back;
+    if (!convert(text, bytes) || decode(bytes, _name, back) != DecodeResult::decoded ||
+        back != text)
+        throw Exception(Exception::invalidArgument,
+                        String::concat({"the text does not come back from the encoding ", _name}));
     return bytes;
 }
 

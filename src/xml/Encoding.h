@@ -5,6 +5,7 @@
 
 #include <QXXMLMarshalling/base/String.h>
 
+#include <memory>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -33,20 +34,26 @@ class TextEncoder {
 public:
     // Raises NSInvalidArgumentException for an encoding that is unknown or could not be read back.
     explicit TextEncoder(const String& encoding);
-    ~TextEncoder();
-    TextEncoder(const TextEncoder&) = delete;
-    TextEncoder& operator=(const TextEncoder&) = delete;
 
-    // False for a character that the encoding lacks; it is given by its UTF-8 text too.
+    // False for a character that the encoding lacks, or that would be read back as another; it is
+    // given by its UTF-8 text too.
     bool canEncode(char32_t c, std::string_view character);
-    // Text whose every character can be encoded.
+    // Whether that may be one of ASCII: some encodings have other signs in a few of its places.
+    bool lacksASCII() const noexcept { return _lacksASCII; }
+    // Text whose every character can be encoded. Raises NSInvalidArgumentException where it would
+    // not be read back as it is: some encodings join characters.
     std::string encoded(std::string_view text);
 
 private:
     bool convert(std::string_view text, std::string& bytes);
+    bool comesBack(std::string_view text);
 
-    void* _converter;
+    struct Closer {
+        void operator()(void* converter) const noexcept;
+    };
+    std::unique_ptr<void, Closer> _converter;
     String _name;
+    bool _lacksASCII = false;
     std::unordered_map<char32_t, bool> _known;
 };
 

@@ -251,6 +251,9 @@ void XMLSerializer::writeText(const XMLNode& text) {
 
 void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escapesBreaks,
                                  const XMLPlace& place) {
+    static constexpr std::array<bool, 256> none{};
+    const bool lacksASCII = _encoder != nullptr && _encoder->lacksASCII();
+    const auto& plain = lacksASCII ? none : plainBytes;
     std::size_t written = 0;
     const auto replace = [&](std::size_t from, std::size_t to, std::string_view by) {
         _output += text.substr(written, from - written);
@@ -259,26 +262,28 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
     };
     for (std::size_t at = 0; at < text.size();) {
         const char byte = text[at];
-        if (plainBytes[static_cast<unsigned char>(byte)]) {
+        if (plain[static_cast<unsigned char>(byte)]) {
             ++at;
             continue;
         }
         const std::size_t start = at;
         const char32_t c = decodeCharacter(text, at);
-        if (c >= 0x80) {
-            if (isChecked() && !isXMLCharacter(c))
-                refuse("a text holds what is no XML character", place);
-            if (_encoder != nullptr && !_encoder->canEncode(c, text.substr(start, at - start)))
-                replace(start, at, "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";");
-        } else if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
-                   (c == '"' && where == Where::attribute) ||
-                   (c == '\t' && where == Where::attribute) || (c == '\n' && escapesBreaks)) {
+        if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
+            (c == '"' && where == Where::attribute) || (c == '\t' && where == Where::attribute) ||
+            (c == '\n' && escapesBreaks))
             replace(start, at, reference(byte));
-        } else if (isChecked() && !isXMLCharacter(c)) {
-            refuse("a text holds a control character", place);
-        }
+        else if (isChecked() && !isXMLCharacter(c))
+            refuse(c < 0x80 ? "a text holds a control character"
+                            : "a text holds what is no XML character",
+                   place);
+        else if ((c >= 0x80 || lacksASCII) && !isEncodable(c, text.substr(start, at - start)))
+            replace(start, at, "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";");
     }
     _output += text.substr(written);
+}
+
+bool XMLSerializer::isEncodable(char32_t c, std::string_view character) const {
+    return _encoder == nullptr || _encoder->canEncode(c, character);
 }
 
 void XMLSerializer::writeLiteral(std::string_view text, const XMLPlace& place) {
@@ -288,7 +293,8 @@ void XMLSerializer::writeLiteral(std::string_view text, const XMLPlace& place) {
         for (std::size_t at = 0; at < text.size();) {
             const std::size_t start = at;
             const char32_t c = decodeCharacter(text, at);
-            if (c >= 0x80 && !_encoder->canEncode(c, text.substr(start, at - start)))
+            if ((c >= 0x80 || _encoder->lacksASCII()) &&
+                !isEncodable(c, text.substr(start, at - start)))
                 refuse("the encoding lacks a character that cannot be referred to", place);
         }
     _output += text;

@@ -56,6 +56,7 @@ private:
                       const XMLPlace& place);
     // Text that nothing can be escaped in.
     void writeLiteral(std::string_view text, const XMLPlace& place);
+    bool isEncodable(char32_t c, std::string_view character) const;
     void writeName(const String& name, const XMLPlace& place);
     void checkName(const String& name, const XMLPlace& place);
 

@@ -270,6 +270,15 @@ TEST(XMLSerializer, EncodingsHoldWhatTheyCanAndReferToTheRest) {
         expectReadBack(text, document->XMLData());
         expectReadBack(text, document->XMLData(qx::XMLPrettyPrint));
     }
+    const std::string others = "a\\~\xC2\xA5"; // have each other's places in some encodings
+    for (const char* encoding : {"Shift_JIS", "EUC-JP", "CP932"}) {
+        const auto other = holding(others);
+        other->setCharacterEncoding(encoding);
+        expectReadBack(others, other->XMLData());
+    }
+    const auto joined = holding("e\xCC\x81");
+    joined->setCharacterEncoding("windows-1258");
+    EXPECT_THROW(joined->XMLData(), qx::Exception);
     document->setCharacterEncoding("ISO-8859-1");
     document->rootElement()->removeAttributeForName("b");
     EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"ISO-8859-1\"?>"

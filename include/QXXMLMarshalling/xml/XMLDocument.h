@@ -110,7 +110,8 @@ public:
     void setStandalone(const String& standalone) { _standalone = standalone; }
 
     // The document as bytes, with an XML declaration when a version or an encoding is set, in that
-    // encoding (UTF-8 without one); characters that the encoding lacks go as character references.
+    // encoding (UTF-8 without one); characters that the encoding lacks, or that would be read back
+    // as others, go as character references.
     // Raises NSInvalidArgumentException as XMLString does, for an unknown encoding, and for what
     // could not be read again with the options `reading`: a document that was read with higher
     // limits than the default ones is written with the same.
