@@ -46,8 +46,10 @@ const Value& Array::at(std::size_t index) const {
 Value Array::lastObject() const { return _items.empty() ? Value() : _items.back(); }
 
 bool Array::contains(const Value& value) const {
-    return std::any_of(_items.begin(), _items.end(),
-                       [&](const Value& item) { return item.isEqual(value); });
+    for (std::size_t i = 0; i < _items.size(); ++i) // an item may change the array meanwhile
+        if (Value(_items[i]).isEqual(value))
+            return true;
+    return false;
 }
 
 void Array::add(Value value) {
@@ -96,7 +98,8 @@ String Array::descriptionWithLocale(const Object* locale, std::size_t indent) co
         return Printing::cutShort;
     std::string text = indentation(indent) + "(";
     const char* separator = "\n";
-    for (const Value& item : _items) {
+    for (std::size_t i = 0; i < _items.size(); ++i) { // an item may change the array meanwhile
+        const Value item = _items[i]; // NOLINT(performance-unnecessary-copy-initialization)
         text += separator;
         // A nested list brings its own indentation along.
         if (!item.as<Array>())
@@ -109,7 +112,12 @@ String Array::descriptionWithLocale(const Object* locale, std::size_t indent) co
 
 bool Array::isEqual(const Object& other) const {
     const auto* array = dynamic_cast<const Array*>(&other);
-    return array != nullptr && array->_items == _items;
+    if (array == nullptr || array->count() != count())
+        return false;
+    for (std::size_t i = 0; i < std::min(count(), array->count()); ++i)
+        if (!Value(_items[i]).isEqual(Value(array->_items[i])))
+            return false;
+    return true;
 }
 
 Value Array::valueForKey(Key key) const {

@@ -179,7 +179,9 @@ String Dictionary::descriptionWithLocale(const Object* locale, std::size_t inden
     if (!printing.mayDescend())
         return Printing::cutShort;
     std::string text = indentation(indent) + "{\n";
-    for (const Entry& entry : _entries) {
+    for (std::size_t i = 0; i < _entries.size();
+         ++i) {                          // a value may change the dictionary meanwhile
+        const Entry entry = _entries[i]; // NOLINT(performance-unnecessary-copy-initialization)
         if (entry.value.isNull())
             continue;
         text += indentation(indent + 1);
@@ -199,12 +201,12 @@ bool Dictionary::isEqual(const Object& other) const {
     const auto* dictionary = dynamic_cast<const Dictionary*>(&other);
     if (dictionary == nullptr || dictionary->_count != _count)
         return false;
-    return std::all_of(_entries.begin(), _entries.end(), [&](const Entry& entry) {
-        if (entry.value.isNull())
-            return true;
-        const Value* value = dictionary->find(entry.key);
-        return value != nullptr && value->isEqual(entry.value);
-    });
+    for (std::size_t i = 0; i < _entries.size(); ++i) {
+        const Entry entry = _entries[i]; // NOLINT(performance-unnecessary-copy-initialization)
+        if (!entry.value.isNull() && !dictionary->get(entry.key).isEqual(entry.value))
+            return false;
+    }
+    return true;
 }
 
 Value Dictionary::valueForKey(Key key) const {

@@ -180,6 +180,39 @@ TEST(ValueTest, DictionariesAreEqualWhateverTheirOrder) {
               "NSGenericException: a dictionary was changed while it was walked");
 }
 
+// Empties the collections that it stands in when it is looked at.
+struct Emptying : Object {
+    Ref<Array> list = make<Array>();
+    Ref<Dictionary> map = make<Dictionary>();
+    String empty() const {
+        list->removeAll();
+        map->removeAll();
+        return "gone";
+    }
+    String description() const override { return empty(); }
+    bool isEqual(const Object&) const override { return empty().isNull(); }
+};
+
+TEST(ValueTest, CollectionsMayChangeWhileTheirItemsAreAsked) {
+    const auto filled = [] {
+        auto item = make<Emptying>();
+        for (const char* key : {"a", "b", "c"}) {
+            item->list->add(item);
+            item->map->set(key, item);
+        }
+        return item;
+    };
+    const auto printed = filled();
+    EXPECT_EQ(oneLine(printed->list), "( gone )");
+    EXPECT_EQ(oneLine(filled()->map), "{ a = gone; }");
+    const auto one = filled(), two = filled(), other = filled();
+    EXPECT_NE(Value(one->list), Value(other->list));
+    EXPECT_NE(Value(two->map), Value(other->map));
+    EXPECT_FALSE(filled()->list->contains(other));
+    for (const auto& item : {one, two, other})
+        item->empty();
+}
+
 TEST(ValueTest, FormatsTakeTheirArgumentsInOrderOrByPosition) {
     const Value arguments[] = {"a", -2, 255};
     const std::pair<const char*, const char*> cases[] = {
