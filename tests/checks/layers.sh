@@ -78,8 +78,8 @@ complaints() {
         sed -E 's/:(class|struct)( QX_API)? ([A-Za-z_:]+).*/:\3/')
     while IFS=: read -r path number kind name; do
         check_friend
-    done < <(grep -HnorE '^[[:space:]]*friend (class|struct) [A-Za-z_]+' include src --include='*.h' |
-        sed -E 's/[[:space:]]*friend (class|struct) /\1:/' | LC_ALL=C sort)
+    done < <(grep -HnorE '^[[:space:]]*friend (class|struct) [A-Za-z_]+(::[A-Za-z_]+)*' include src --include='*.h' |
+        sed -E 's/[[:space:]]*friend (class|struct) ([A-Za-z_]+::)*/\1:/' | LC_ALL=C sort)
 }
 
 # One include: `target` in line `number` of `path`, which belongs to `here`.
@@ -135,7 +135,7 @@ self_test() {
         'marshaller : mapping record :'
     put include/QXXMLMarshalling/detail/Count.h '#pragma once' '#include <sys/stat.h>'
     put include/QXXMLMarshalling/detail/Lost.h '#include <string>'
-    put include/QXXMLMarshalling/base/Value.h '#include <QXXMLMarshalling/QXRecord.h>' '    friend class Way;'
+    put include/QXXMLMarshalling/base/Value.h '#include <QXXMLMarshalling/QXRecord.h>' '    friend class qx::Way;'
     put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/base/Value.h>' '#include "record/Table.h"'
     put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/detail/Count.h>' '#include <sys/stat.h>'
     put src/base/Value.cpp '#include <unistd.h>' '#  include <libxml/tree.h>'
