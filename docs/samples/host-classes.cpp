@@ -6,6 +6,7 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Class.h>
+#include <QXXMLMarshalling/model/DateTime.h>
 #include <QXXMLMarshalling/undo/UndoableObject.h>
 
 #include <cstdio>
@@ -56,6 +57,34 @@ void describeInvoice() {
         .property<double>("net", &Invoice::net, &Invoice::net)
         .property<&Invoice::gross>("gross")
         .property<&Invoice::currency>("currency");
+}
+// end of sample
+
+} // namespace
+
+// sample: enumeration
+enum class Fix { none, flat, full };
+
+template <>
+struct qx::EnumNames<Fix> {
+    static constexpr auto table = std::to_array<qx::EnumName<Fix>>(
+        {{Fix::none, "none"}, {Fix::flat, "2d"}, {Fix::full, "3d"}});
+};
+// end of sample
+
+namespace {
+
+// sample: waypoint
+class Waypoint : public qx::Object {
+public:
+    Fix fix = Fix::none;
+    std::chrono::sys_seconds time{};
+};
+
+void describeWaypoint() {
+    qx::Class::define<Waypoint>("Waypoint")
+        .property<&Waypoint::fix>("fix")
+        .property<&Waypoint::time>("time");
 }
 // end of sample
 
@@ -191,7 +220,7 @@ class HostClasses : public testing::Test {
 protected:
     void TearDown() override {
         for (const char* name : {"Product", "Invoice", "Delivery", "Model", "Fruit", "Basket",
-                                 "Task", "Note", "Ticket"})
+                                 "Task", "Note", "Ticket", "Waypoint"})
             qx::Class::forget(name);
     }
 };
@@ -262,6 +291,23 @@ TEST_F(HostClasses, HavePropertiesOfFourKinds) {
     EXPECT_EQ(invoice->trySetValueForKey(1, "gross"), qx::SetOutcome::refused);
     EXPECT_EQ(invoice->trySetValueForKey("USD", "currency"), qx::SetOutcome::refused);
     EXPECT_EQ(invoice->trySetValueForKey(1, "tax"), qx::SetOutcome::unknownKey);
+}
+
+TEST_F(HostClasses, HaveNamedValuesAndTimes) {
+    describeWaypoint();
+    const auto marshaller =
+        scenario::marshaller("<class name='Waypoint'><map-to xml='wpt'/>"
+                             "<field name='fix'><bind-xml name='fix' node='element'/></field>"
+                             "<field name='time'><bind-xml name='time' node='element'/></field>"
+                             "</class>");
+    const auto waypoint =
+        marshaller->readString("<wpt><fix>2d</fix><time>2026-03-01T10:30:00+01:00</time></wpt>")
+            .as<Waypoint>();
+    ASSERT_TRUE(waypoint);
+    EXPECT_EQ(waypoint->fix, Fix::flat);
+    EXPECT_EQ(waypoint->valueForKey("time"), "2026-03-01T09:30:00Z");
+    EXPECT_EQ(scenario::read(*marshaller, "<wpt><fix>4d</fix></wpt>"),
+              "-222: Unable to set value: 4d for key: fix in class: Waypoint (Invalid Value)");
 }
 
 TEST_F(HostClasses, HaveTypesOfTheirOwn) {
