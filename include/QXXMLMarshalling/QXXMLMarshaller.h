@@ -166,7 +166,6 @@ public:
                                qx::CountedSet& boundAttributes, bool isFlattened,
                                qx::Ref<qx::Error>* error = nullptr);
     // True unless it failed: also when there was nothing to bind.
-    //   -209  "Unknown field node type: %@ - %@"
     bool bindField(const QXXMLFieldMapping& field, qx::Object& object, std::size_t index,
                    qx::XMLElement& element, qx::CountedSet& boundFields,
                    qx::CountedSet& boundAttributes, bool isFlattened,

@@ -43,6 +43,7 @@
 #include <QXXMLMarshalling/model/MethodSignature.h>
 #include <QXXMLMarshalling/model/Null.h>
 #include <QXXMLMarshalling/model/Object.h>
+#include <QXXMLMarshalling/model/Property.h>
 #include <QXXMLMarshalling/model/Value.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/model/WeakRef.h>

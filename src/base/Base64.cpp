@@ -1,5 +1,7 @@
 #include "base/Base64.h"
 
+#include "base/WhiteSpace.h"
+
 #include <array>
 #include <cstdint>
 
@@ -19,8 +21,6 @@ constexpr std::array<std::uint8_t, 256> digitsByCharacter() {
     return digits;
 }
 constexpr auto digitOf = digitsByCharacter();
-
-bool isSpace(char c) { return c == ' ' || c == '\t' || c == '\n' || c == '\r'; }
 
 } // namespace
 
@@ -47,7 +47,7 @@ std::optional<std::string> decodeBase64(std::string_view text) {
     std::size_t digits = 0;
     std::size_t padding = 0;
     for (const char c : text) {
-        if (isSpace(c))
+        if (isWhite(c))
             continue;
         if (c == '=') {
             ++padding;

@@ -6,9 +6,8 @@
 //     in a block   | owner | count | hash | isInBlock 1, size | bytes ... | 0 |
 //     alone                | count | hash | isInBlock 0, size | bytes ... | 0 |
 //
-// 1. The last count, on whatever thread, ends a string: isInBlock says whether its memory goes back
-// to
-//    its block or to the C library.
+// 1. The last count, on whatever thread, ends a string: isInBlock says whether its memory goes
+//    back to its block or to the C library.
 // 2. One live text keeps its block allocated, about a kilobyte.
 // 3. A string in a block is never resized in place.
 

@@ -8,6 +8,8 @@
 
 namespace qx {
 
+constexpr std::string_view whiteSpace = " \t\r\n";
+
 constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
 
 // Whether nothing else is there. Layout is blanks for the most part: those are looked at four at a
@@ -27,11 +29,11 @@ inline bool isWhite(std::string_view text) noexcept {
 }
 
 constexpr std::string_view withoutLeadingWhite(std::string_view text) noexcept {
-    text.remove_prefix(std::min(text.find_first_not_of(" \t\r\n"), text.size()));
+    text.remove_prefix(std::min(text.find_first_not_of(whiteSpace), text.size()));
     return text;
 }
 constexpr std::string_view withoutTrailingWhite(std::string_view text) noexcept {
-    return text.substr(0, text.find_last_not_of(" \t\r\n") + 1);
+    return text.substr(0, text.find_last_not_of(whiteSpace) + 1);
 }
 constexpr std::string_view trimmed(std::string_view text) noexcept {
     return withoutTrailingWhite(withoutLeadingWhite(text));

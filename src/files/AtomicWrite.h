@@ -8,8 +8,9 @@ namespace qx {
 
 // Writes a temporary file beside the target, flushes it to disk and renames it over the target: at
 // every moment, a power failure included, the path names the old bytes or the new ones, whole.
-// False with an error; the old file is then untouched and the temporary one gone. Of a file that is
-// replaced
+// False with an error; the old file is then untouched and the temporary one gone.
+//
+// Of a file that is replaced:
 // - the permissions, group, owner and access list are kept as far as the system lets this process.
 //   Where the group cannot be, its rights go to no other, and where the permissions cannot be told,
 //   the new file is the owner's alone. The folder has to be writable, the file has not;

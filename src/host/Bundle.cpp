@@ -123,12 +123,12 @@ Ref<Bundle> Bundle::mainBundle() {
     if (bundle)
         return bundle;
     // The program's folder was removed while it runs, or cannot be told. Nothing lies below this.
-    static Bundle* const nowhere = [] {
+    struct Nowhere {
         String path = "/dev/null";
-        const auto info = make<Dictionary>();
-        return make<Bundle>(path, info).detach();
-    }();
-    return Ref<Bundle>(nowhere);
+        const Ref<Dictionary> info = make<Dictionary>();
+        Ref<Bundle> bundle = make<Bundle>(path, info);
+    };
+    return immortal<Nowhere>().bundle;
 }
 
 void Bundle::setMainBundle(const Ref<Bundle>& bundle) {

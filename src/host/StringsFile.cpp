@@ -1,6 +1,7 @@
 #include "host/StringsFile.h"
 
 #include "base/Unicode.h"
+#include "base/WhiteSpace.h"
 
 #include <algorithm>
 #include <charconv>
@@ -8,8 +9,6 @@
 namespace qx {
 
 namespace {
-
-constexpr std::string_view blanks = " \t\r\n";
 
 // Reads tokens. One that fails leaves the place where it was given up; no place is looked at by
 // more than a few entries, however many are faulty.
@@ -23,7 +22,7 @@ public:
     // White space and comments. One that does not end is none: it would hide all that follows.
     void skipLayout() noexcept {
         do
-            _at = std::min(_text.find_first_not_of(blanks, _at), _text.size());
+            _at = std::min(_text.find_first_not_of(whiteSpace, _at), _text.size());
         while (skipComment());
     }
 

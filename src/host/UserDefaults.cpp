@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 
+#include "base/Immortal.h"
 #include "files/Paths.h"
 #include "host/Directories.h"
 #include "host/PropertyList.h"
@@ -14,10 +15,11 @@ UserDefaults::UserDefaults()
 
 UserDefaults::~UserDefaults() = default;
 
-// Lives for ever: code that runs while the program ends may still ask.
 Ref<UserDefaults> UserDefaults::standardUserDefaults() {
-    static UserDefaults* const shared = make<UserDefaults>().detach();
-    return Ref<UserDefaults>(shared);
+    struct Standard {
+        Ref<UserDefaults> defaults = make<UserDefaults>();
+    };
+    return immortal<Standard>().defaults;
 }
 
 Ref<Dictionary> UserDefaults::userFile() {

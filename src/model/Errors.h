@@ -45,6 +45,7 @@ inline constexpr ErrorText noMappingForDeclaredClass{-207, "No mapping for decla
                                                      invalidXML};
 inline constexpr ErrorText unknownCollectionClass{-208, "Unable to process collection class: %@",
                                                   invalidXML};
+// Nothing causes it: a word that "node" does not know counts as none. Its code stays taken.
 inline constexpr ErrorText unknownFieldNodeType{-209, "Unknown field node type: %@ - %@",
                                                 invalidXML};
 inline constexpr ErrorText tooManyChildren{-210, "Too many children with name: %@ in element: %@",

@@ -1,6 +1,6 @@
 #pragma once
 
-// The texts of errors in the user's language. This room has no translations: whoever has them
+// The texts of errors in the user's language. This folder has no translations: whoever has them
 // installs a look-up here.
 
 #include <QXXMLMarshalling/base/String.h>

@@ -39,7 +39,7 @@ struct Object::Extras {
     std::unique_ptr<ObjectAttachment> attachment;
 };
 
-// The extras for the rest of this room.
+// The extras for the rest of this folder, and for those above it.
 struct ObjectInternals {
     static Object::Extras& extras(const Object& object) { return object.extras(); }
     // Null when the object has none.

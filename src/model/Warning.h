@@ -1,6 +1,6 @@
 #pragma once
 
-// Messages of this room, which knows no log of its own: whoever has one installs it here.
+// Messages of this folder, which knows no log of its own: whoever has one installs it here.
 
 #include <QXXMLMarshalling/model/Value.h>
 

@@ -2,6 +2,8 @@
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 
+#include "base/Immortal.h"
+
 #include <algorithm>
 
 namespace qx::detail {
@@ -9,8 +11,10 @@ namespace qx::detail {
 const MappingPlan& MappingPlan::of(const QXXMLMarshallingMapping* mapping) {
     if (mapping != nullptr)
         return *mapping->_plan;
-    static const MappingPlan none(*QXXMLDocumentMapping::initWithXML(nullptr));
-    return none;
+    struct None {
+        MappingPlan plan{*QXXMLDocumentMapping::initWithXML(nullptr)};
+    };
+    return immortal<None>().plan;
 }
 
 String MappingPlan::elementNameOf(const QXXMLClassMapping& mapping) {

@@ -3,9 +3,9 @@
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
+#include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Null.h>
-#include <QXXMLMarshalling/observe/Observation.h>
 
 #include "model/NameList.h"
 

@@ -5,9 +5,8 @@
 //
 //     _slots  | 0 | 2 | 0 | 1 | ...   by hash: a number plus one, 0 where free; open addressing, at
 //                                     most half full
-//     _names  | "b" | "a:b" | ...     place in the text and last use as an attribute; the local
-//     name
-//                                     of a prefixed one has an entry, too
+//     _names  | "b" | "a:b" | ...     place in the text, last use as an attribute; of a prefixed
+//                                     one the local name has an entry, too
 //     _texts  | "b" | "a:b" | ...     the index's, interned where some code knows them
 //
 // 1. Numbers stay. A reference to a Name is good until the next name is looked up.

@@ -9,9 +9,8 @@
 // 2. It is strict: each name, character, reference and limit is checked. It may refuse what the C
 //    parser takes, but what both take, they read alike (fuzz/xml/scanner.cpp holds them together).
 // 3. It knows no errors: any doubt ends it (Refused). So every error is the C parser's.
-// 4. Work and memory grow with the text alone: a repeated attribute is found by the element that
-// had
-//    its name last (ScannedNames.h).
+// 4. Work and memory grow with the text alone: a repeated attribute is found by the element
+//    that had its name last (ScannedNames.h).
 // 5. A scanner lives for one call, on one thread. The index that it fills borrows the text.
 
 #include "xml/ScannedNames.h"

@@ -74,12 +74,12 @@ complaints() {
     while IFS=: read -r path name; do
         name=${name##* }
         defined[$name]+="$path "
-    done < <(grep -HorE '^(class|struct)( QX_API)? [A-Za-z_]+(::[A-Za-z_]+)*[^;]*$' include src --include='*.h' --include='*.cpp' |
-        sed -E 's/:(class|struct)( QX_API)? ([A-Za-z_:]+).*/:\3/')
+    done < <(grep -HorE '^(class|struct)( QX_API)? [A-Za-z0-9_]+(::[A-Za-z0-9_]+)*[^;]*$' include src --include='*.h' --include='*.cpp' |
+        sed -E 's/:(class|struct)( QX_API)? ([A-Za-z0-9_:]+).*/:\3/')
     while IFS=: read -r path number kind name; do
         check_friend
-    done < <(grep -HnorE '^[[:space:]]*friend (class|struct) [A-Za-z_]+(::[A-Za-z_]+)*' include src --include='*.h' |
-        sed -E 's/[[:space:]]*friend (class|struct) ([A-Za-z_]+::)*/\1:/' | LC_ALL=C sort)
+    done < <(grep -HnorE '^[[:space:]]*friend (class|struct) [A-Za-z0-9_]+(::[A-Za-z0-9_]+)*' include src --include='*.h' --include='*.cpp' |
+        sed -E 's/[[:space:]]*friend (class|struct) ([A-Za-z0-9_]+::)*/\1:/' | LC_ALL=C sort)
 }
 
 # One include: `target` in line `number` of `path`, which belongs to `here`.

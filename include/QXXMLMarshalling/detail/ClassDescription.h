@@ -1,9 +1,9 @@
 #pragma once
 
-// The parts of a class description and how they are made from members: each accessor becomes a
+// How the parts of a class description (Property.h) are made from members: each accessor becomes a
 // captureless function pointer. Hosts use them through Class::define (Class.h).
 
-#include <QXXMLMarshalling/model/Object.h>
+#include <QXXMLMarshalling/model/Property.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
 #include <cstring>
@@ -15,30 +15,6 @@
 #include <vector>
 
 namespace qx {
-
-// A property of instances. `get` and `set` are handed the property, for the members it stores.
-struct Property {
-    static constexpr std::size_t memberSize = 16;
-    using Member = std::array<std::byte, memberSize>;
-
-    Key key;
-    Value (*get)(const Property&, const Object&) = nullptr;
-    // False when the value is refused; null for a read-only property.
-    bool (*set)(const Property&, Object&, const Value&) = nullptr;
-    // Member function pointers that were only known at run time.
-    Member getter{};
-    Member setter{};
-};
-
-// An operation of instances (receiver: the object) or of the class object (receiver: null).
-struct Operation {
-    Selector selector;
-    bool returnsValue = false;
-    // Raises NSInvalidArgumentException for arguments that the function does not take.
-    Value (*invoke)(Selector, const Class&, Object*, std::span<const Value>) = nullptr;
-    // Whether the function takes these arguments: their number, and each as the type it wants.
-    bool (*takes)(std::span<const Value>) = nullptr;
-};
 
 namespace detail {
 

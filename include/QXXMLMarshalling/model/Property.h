@@ -1,0 +1,39 @@
+#pragma once
+
+// The parts of a class description, as Class hands them out: a program that shows or edits objects
+// of any class walks over them. They are made by Class::define.
+
+#include <QXXMLMarshalling/model/Object.h>
+#include <QXXMLMarshalling/model/Value.h>
+
+#include <array>
+#include <cstddef>
+#include <span>
+
+namespace qx {
+
+// A property of instances. `get` and `set` are handed the property, for the members it stores.
+struct Property {
+    static constexpr std::size_t memberSize = 16;
+    using Member = std::array<std::byte, memberSize>;
+
+    Key key;
+    Value (*get)(const Property&, const Object&) = nullptr;
+    // False when the value is refused; null for a read-only property.
+    bool (*set)(const Property&, Object&, const Value&) = nullptr;
+    // Member function pointers that were only known at run time.
+    Member getter{};
+    Member setter{};
+};
+
+// An operation of instances (receiver: the object) or of the class object (receiver: null).
+struct Operation {
+    Selector selector;
+    bool returnsValue = false;
+    // Raises NSInvalidArgumentException for arguments that the function does not take.
+    Value (*invoke)(Selector, const Class&, Object*, std::span<const Value>) = nullptr;
+    // Whether the function takes these arguments: their number, and each as the type it wants.
+    bool (*takes)(std::span<const Value>) = nullptr;
+};
+
+} // namespace qx
