@@ -14,9 +14,9 @@
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
 // setters of host classes throw passes through every operation here. They may use the marshaller,
-// the document and its nodes while they are called by a reading: what is changed then is found
-// changed by the fields that follow, but a list that is being filled stays as it was found. Getters
-// may let go of the marshaller and of the object that is being written.
+// the document and its nodes while they are called by a reading. Whether the fields that follow
+// find what was taken out of the document or added to it is not said, and a list that is being
+// filled stays as it was found. Getters may let go of the marshaller and of what is being written.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/model/Array.h>
@@ -43,7 +43,8 @@ public:
 
     // Null when made with a null mapping.
     QXXMLMarshallingMapping* mapping() const noexcept { return _mapping.get(); }
-    // Groups what one unmarshall() registers; made on the first call, then always the same.
+    // Groups what one unmarshall() registers, in a group of its own or as part of the one that is
+    // open; made on the first call, then always the same.
     const qx::Ref<qx::UndoManager>& undoManager();
 
     // Options, all true at first; each operation reads them when it runs.

@@ -105,6 +105,7 @@ Ref<XMLElement> QXXMLMarshaller::elementWithMapping(const QXXMLClassMapping& map
 bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLElement& element,
                                         Object& object, Ref<Error>* error) {
     const Ref<Object> held(&object);
+    const Ref<XMLElement> target(&element);
     const PlanOfClass plan(*this, mapping);
     return Marshalling(*this).writeFields(*plan, element, object, error);
 }
@@ -112,12 +113,15 @@ bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLEle
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
                                Ref<Error>* error) {
     const Ref<Object> held(&object);
+    const Ref<XMLElement> target(&element);
     const PlanOfField plan(*this, field);
     return Marshalling(*this).writeField(*plan, element, object, error);
 }
 
 bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
                                const QXXMLFieldMapping& field, Ref<Error>* error) {
+    const Ref<const qx::Array> held(&array);
+    const Ref<XMLElement> target(&element);
     const PlanOfField plan(*this, field);
     Marshalling writing(*this);
     return writeCollection(writing, *plan, element, array, error);

@@ -126,7 +126,8 @@ Value Array::valueForKey(Key key) const {
         return count();
     auto values = make<Array>();
     values->reserve(count());
-    for (const Value& item : *this) {
+    for (const Value& each : *this) {
+        const Value item(each); // its getter may take it out
         const Object* object = item.isNullOrMarker() ? nullptr : item.object();
         const Value value = object != nullptr ? object->valueForKey(key) : Value();
         values->add(value.isNull() ? Value(Null::marker()) : value);
@@ -135,7 +136,8 @@ Value Array::valueForKey(Key key) const {
 }
 
 SetOutcome Array::trySetValueForKey(const Value& value, Key key) {
-    for (const Value& item : *this) {
+    for (const Value& each : *this) {
+        const Value item(each); // its setter may take it out
         if (item.isNullOrMarker())
             continue;
         Object* object = item.object();

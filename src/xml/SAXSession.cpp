@@ -185,6 +185,9 @@ void SAXSession::ContextDeleter::operator()(xmlParserCtxt* context) const noexce
 }
 
 SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
+    // Before anything else: what each thread has in the parser takes locks that this makes.
+    static std::once_flag initialized;
+    std::call_once(initialized, xmlInitParser);
     requireThreadState();
     _function = xmlStructuredError;
     _user = xmlStructuredErrorContext;
@@ -193,8 +196,6 @@ SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
         if (error != nullptr)
             Callbacks::guarded(user, [&](SAXSession& self) { self.report(*error); });
     });
-    static std::once_flag initialized;
-    std::call_once(initialized, xmlInitParser);
 }
 
 SAXSession::ErrorChannel::~ErrorChannel() { xmlSetStructuredErrorFunc(_user, _function); }

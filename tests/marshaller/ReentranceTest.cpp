@@ -4,6 +4,7 @@
 #include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Class.h>
 
 #include <functional>
@@ -246,4 +247,14 @@ TEST(Reentrance, AWritingHoldsWhatItsGettersLetGoOf) {
     EXPECT_NE(marshaller->writeString(object).view().find("<one id=\"1\">\n    <one id=\"2\""),
               std::string_view::npos);
     Meddling::countdown = -1;
+}
+
+TEST(Reentrance, AnItemMayTakeItselfOutOfTheListThatItIsSetThrough) {
+    const auto items = qx::make<qx::Array>();
+    items->add(qx::make<Meddler>());
+    Meddling::act = [&] { items->removeAll(); };
+    Meddling::countdown = 0;
+    EXPECT_THROW(items->trySetValueForKey("1", "id"), qx::Exception); // it changed while walked
+    Meddling::countdown = -1;
+    EXPECT_EQ(items->count(), 0U);
 }

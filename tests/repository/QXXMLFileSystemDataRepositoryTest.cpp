@@ -152,7 +152,7 @@ TEST_F(FileSystemRepositoryTest, DocumentsAndDataAreReadFromTheFileFound) {
         std::string error;
     } rows[] = {{"maps/a.xml", "<a></a>", 4, ""},
                 {"none.xml", "", 0, ""}, // a missing document is no failure
-                {"broken.xml", "", 3, "Premature end of data in tag a line 1"},
+                {"broken.xml", "", 3, "Premature end"},
                 {"folder.xml", "", 0, "The file cannot be read: " + folder},
                 {"pipe.xml", "", 0, "The file cannot be read: " + pipe}};
     for (const auto& row : rows) {
@@ -161,7 +161,10 @@ TEST_F(FileSystemRepositoryTest, DocumentsAndDataAreReadFromTheFileFound) {
         const auto document = repository->documentNamed(row.name, &size, &error);
         EXPECT_EQ(document ? document->XMLString() : "", row.text) << row.name;
         EXPECT_EQ(size, row.size) << row.name;
-        EXPECT_EQ(error ? error->localizedDescription().str() : "", row.error) << row.name;
+        // What stands behind the beginning of a parser's text differs with its version.
+        const std::string told = error ? error->localizedDescription().str() : "";
+        EXPECT_EQ(told.substr(0, row.error.size()), row.error) << row.name;
+        EXPECT_EQ(told.empty(), row.error.empty()) << row.name;
     }
     EXPECT_EQ(repository->dataForName("maps/a.xml", &error)->view(), "<a/>");
 }

@@ -12,15 +12,16 @@
 // is left out; unless the document says standalone="yes", what is declared behind it is left out
 // too. Limits bound depth, text size, what is declared, what entities bring in (1 MB and five times
 // the document), an element's attributes and declarations (4,096), the declarations in force
-// (1,000), different names (100,000), and the whole (2 GB). Beyond one, and for anything that is no
-// well-formed XML, the result is null and the error says what, where: domain
-// qx::Error::parserDomain, the parser's code and text, line() and column(). Where memory lacks,
-// std::bad_alloc comes out. Any number of threads may parse at the same time.
+// (1,000), different names (100,000), and the whole (2 GB); in a DOCTYPE, attribute defaults
+// (2,000), the depth of entities (32) and the attributes of a tag inside one (512). Beyond one, and
+// for anything that is no well-formed XML, the result is null and the error says what, where:
+// domain qx::Error::parserDomain, the parser's code and text, line() and column(). Where memory
+// lacks, std::bad_alloc comes out. Any number of threads may parse at the same time.
 //
 // Codes, texts in English and the last few columns of what is no well-formed XML are those of the
-// libxml2 in use, and differ among its versions; limits and all else do not, with one exception:
-// from 2.12 on elements never nest deeper than 2,048, whatever the host says. In no version a
-// value or a comment is larger than 1 GB.
+// libxml2 in use, and differ among its versions; limits and all else do not, with one exception: in
+// documents with a DOCTYPE, and in those that are no UTF-8, elements never nest deeper than 2,048
+// from 2.12 on, whatever the host says. In no version a value or a comment is larger than 1 GB.
 //
 // A document's short texts share memory, a kilobyte each time: whoever keeps single ones of very
 // many documents saves memory with copies, qx::String(text.view()).
