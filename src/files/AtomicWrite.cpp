@@ -145,19 +145,21 @@ bool writeAll(int descriptor, std::string_view bytes) {
 //   1. Only who has the lock removes or renames the file.
 //   2. A writer that finds its file locked or without a name after making it has lost it to one who
 //      sweeps, and takes the next name.
-//   3. Where there are no locks nothing is swept.
+//   3. The first few names are swept, and those after them up to the first that is free.
+//   4. Where there are no locks nothing is swept.
 class TemporaryFile {
 public:
     // `mode` as for open. Errors are in errno.
     TemporaryFile(const std::string& directory, mode_t mode) {
-        constexpr unsigned sweptNames = 4;
+        constexpr unsigned leastSwept = 4;
         constexpr unsigned mostNames = 1000;
         const auto take = [&](unsigned n) {
             _path = directory + "/.~qx-save-" + std::to_string(n) + ".tmp";
         };
-        for (unsigned n = 0; n < sweptNames; ++n) {
+        bool isThere = true;
+        for (unsigned n = 0; n < leastSwept || (isThere && n < mostNames); ++n) {
             take(n);
-            sweep(_path.c_str());
+            isThere = sweep(_path.c_str());
         }
         for (unsigned n = 0; n < mostNames && _descriptor < 0; ++n) {
             take(n);
@@ -199,7 +201,8 @@ private:
         return true;
     }
 
-    static void sweep(const char* path) {
+    // Whether there was a file of that name.
+    static bool sweep(const char* path) {
         // For writing, because some file systems lock nothing else.
         const Descriptor left(::open(path, O_WRONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
         struct stat own {};
@@ -208,6 +211,7 @@ private:
             ::fstat(left.number(), &own) == 0 && S_ISREG(own.st_mode) &&
             ::lstat(path, &named) == 0 && isSameFile(own, named))
             ::unlink(path);
+        return left.isOpen();
     }
 
     std::string _path;

@@ -213,7 +213,8 @@ TEST_F(FilesTest, AnAccessListIsKeptAndNoneIsInherited) {
 
 TEST_F(FilesTest, WhatAKilledWriterLeftIsSweptAndWhatALiveOneWritesIsNot) {
     const std::string live = sandbox.write("area/.~qx-save-0.tmp", "being written");
-    sandbox.write("area/.~qx-save-1.tmp", "left");
+    for (int n = 1; n < 7; ++n)
+        sandbox.write("area/.~qx-save-" + std::to_string(n) + ".tmp", "left");
     const int descriptor = ::open(live.c_str(), O_RDONLY | O_CLOEXEC);
     ASSERT_EQ(::flock(descriptor, LOCK_EX), 0);
     EXPECT_TRUE(writeFileAtomically(sandbox.path("area/a.xml"), "new"));
