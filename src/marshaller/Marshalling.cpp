@@ -11,9 +11,7 @@
 namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller)
-    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())),
-      _saveUnknownXML(marshaller.saveUnknownXML()),
-      _usingNamespaceURIs(marshaller.isUsingNamespaceURIs()) {}
+    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())) {}
 
 const ClassPlan* Marshalling::classOf(const Value& value) const {
     return value.isObject() ? _plan.classNamed(value.classNameForMarshalling()) : nullptr;
@@ -37,7 +35,7 @@ Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, 
     auto element = XMLElement::initForAttributes(name.isEmpty() ? plan.className.string() : name,
                                                  plan.attributeCount);
     const QXXMLClassMapping& mapping = *plan.mapping;
-    if (_usingNamespaceURIs && !mapping.nsURI().isEmpty()) {
+    if (_marshaller->isUsingNamespaceURIs() && !mapping.nsURI().isEmpty()) {
         const String prefix = mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix();
         element->addNamespace(XMLNode::namespaceWithName(prefix, mapping.nsURI()));
     }
@@ -72,7 +70,7 @@ bool Marshalling::writeFields(const ClassPlan& plan, XMLElement& element, Object
     for (const ClassPlan* level : levels) {
         if (!level->mapping->isSelfFirst() && !writeOwnFields(*level, element, object, error))
             return false;
-        if (_saveUnknownXML)
+        if (_marshaller->saveUnknownXML())
             restoreUnknownXML(element, object);
         restoreNamespaces(element, object);
     }
@@ -149,7 +147,7 @@ void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
 void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) const {
     static const Key key("__namespaces");
     const auto kept = ObjectAccess::get(object, key).as<Array>();
-    if (!kept || kept->isEmpty() || !_usingNamespaceURIs)
+    if (!kept || kept->isEmpty() || !_marshaller->isUsingNamespaceURIs())
         return;
     std::vector<Ref<XMLNode>> copies;
     for (const Value& value : *kept) {

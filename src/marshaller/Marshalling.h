@@ -43,8 +43,6 @@ private:
 
     const qx::Ref<const QXXMLMarshaller> _marshaller;
     const MappingPlan& _plan;
-    const bool _saveUnknownXML;
-    const bool _usingNamespaceURIs;
     ObjectAccess _access;
     std::size_t _depth = 0;
     // Of the elements in which names were looked up among many children.
