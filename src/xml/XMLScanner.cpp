@@ -333,31 +333,11 @@ void XMLScanner::scanText() {
     finish(entry, _at);
 }
 
-// Whether it is empty.
-bool XMLScanner::scanCData() {
-    _needsWork = true;
-    _at += 9;
-    const char* const begin = _at;
+// The characters up to the closing mark, and behind it.
+void XMLScanner::scanUpTo(std::string_view closing) {
     while (true) {
         skip(_at, markupByte);
-        if (*_at == ']' && startsWith("]]>"))
-            break;
-        if (is(*_at, textByte | attributeByte) || *_at == '\r')
-            ++_at;
-        else
-            scanBeyondASCII();
-    }
-    _at += 3;
-    return _at - begin == 3;
-}
-
-void XMLScanner::scanComment() {
-    const char* const begin = _at;
-    _needsWork = false;
-    _at += 4;
-    while (true) {
-        skip(_at, markupByte);
-        if (*_at == '-' && startsWith("--"))
+        if (*_at == closing.front() && startsWith(closing))
             break;
         if (*_at == '\r')
             _needsWork = true;
@@ -366,7 +346,23 @@ void XMLScanner::scanComment() {
         else
             scanBeyondASCII();
     }
-    _at += 2;
+    _at += closing.size();
+}
+
+// Whether it is empty.
+bool XMLScanner::scanCData() {
+    _needsWork = true;
+    _at += 9;
+    const char* const begin = _at;
+    scanUpTo("]]>");
+    return _at - begin == 3;
+}
+
+void XMLScanner::scanComment() {
+    const char* const begin = _at;
+    _needsWork = false;
+    _at += 4;
+    scanUpTo("--");
     expect('>');
     finish(add(XMLNodeKind::comment, begin, 0), _at);
 }
@@ -382,18 +378,7 @@ void XMLScanner::scanInstruction() {
     require(text.size() != 3 || (text[0] | 0x20) != 'x' || (text[1] | 0x20) != 'm' ||
             (text[2] | 0x20) != 'l');
     require(startsWith("?>") || is(*_at, whiteByte));
-    while (true) {
-        skip(_at, markupByte);
-        if (*_at == '?' && startsWith("?>"))
-            break;
-        if (*_at == '\r')
-            _needsWork = true;
-        if (is(*_at, textByte | attributeByte) || *_at == '\r')
-            ++_at;
-        else
-            scanBeyondASCII();
-    }
-    _at += 2;
+    scanUpTo("?>");
     finish(add(XMLNodeKind::processingInstruction, begin, name), _at);
 }
 

@@ -52,6 +52,7 @@ private:
     void endElement();
     void scanText();
     void scanBlanks(bool& hasLineEnd);
+    void scanUpTo(std::string_view closing);
     bool scanCData();
     void scanMarkup();
     void scanComment();
