@@ -42,6 +42,8 @@ void ScannedNames::takeApart(Name& name, std::string_view text) {
     require(isXMLName(text));
     if (text == "xmlns")
         name.meaning = Meaning::defaultNamespace;
+    else if (text == "xml:space")
+        name.meaning = Meaning::space;
     const std::size_t colon = text.find(':');
     if (colon == std::string_view::npos)
         return;

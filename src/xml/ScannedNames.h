@@ -11,7 +11,7 @@
 //
 // 1. Numbers stay. A reference to a Name is good until the next name is looked up.
 // 2. The hash's seed differs from process to process, so no document is known to fill one slot.
-// 3. There are at most xmlLimits::names of them: a number fits into the 20 bits of an entry.
+// 3. There are at most xmlLimits::names of them: a number fits into an entry.
 
 #include <QXXMLMarshalling/base/String.h>
 
@@ -27,14 +27,13 @@ class ScannedNames {
 public:
     using Number = std::uint32_t;
     static constexpr Number none = UINT32_MAX;
-    static constexpr std::uint32_t numberBits = 20;
-    static_assert(xmlLimits::names < (1U << numberBits));
+    static_assert(xmlLimits::names < (1U << 24U));
 
     // Thrown for what is left to the C parser.
     struct Refused {};
 
     // What a name means as an attribute's.
-    enum class Meaning : std::uint8_t { plain, defaultNamespace, prefixNamespace };
+    enum class Meaning : std::uint8_t { plain, space, defaultNamespace, prefixNamespace };
     struct Name {
         std::uint32_t begin;
         std::uint32_t size;

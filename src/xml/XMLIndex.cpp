@@ -90,7 +90,10 @@ void appendAttributeValue(std::string_view text, std::string& result) {
 } // namespace
 
 std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
-    const std::string_view whole = _text.substr(entry.begin, entry.end - entry.begin);
+    const std::string_view source = entry.isAside != 0 ? _aside : _text;
+    const std::string_view whole = source.substr(entry.begin, entry.end - entry.begin);
+    if (entry.isAside != 0)
+        return whole;
     if (entry.nodeKind() == XMLNodeKind::comment)
         return whole.substr(4, whole.size() - 7);
     if (entry.nodeKind() != XMLNodeKind::processingInstruction)

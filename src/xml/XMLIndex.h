@@ -17,7 +17,12 @@
 //
 // `next` is the entry after everything inside; that of an element's last descendant is the
 // element's own. An entry holds no value: most are the span's bytes as they stand, the rest is
-// worked out when somebody asks. The index lends its text and never changes once it stands.
+// worked out when somebody asks. What has no span of its own (what an entity or an attribute's
+// default brings) lies aside, in a buffer of the index. The index lends its text and never changes
+// once it stands: any number of threads may read it.
+//
+// White space between elements is layout, which is no content. That shows when the element around
+// it ends, so the texts stay: a blank one counts only where its element keeps layout.
 
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/xml/XMLNode.h>
@@ -31,13 +36,22 @@ struct XMLIndexEntry {
     std::uint32_t begin;
     std::uint32_t end;
     std::uint32_t next;
-    std::uint32_t name : 20; // see XMLIndex::name; of texts and comments nothing
-    std::uint32_t kind : 4;  // an XMLNodeKind
+    std::uint32_t name : 24; // see XMLIndex::name; of texts and comments nothing
+    std::uint32_t kind : 3;  // an XMLNodeKind
     // The value is not the span as it stands: references, line ends to be normalised, CDATA.
     std::uint32_t needsWork : 1;
+    // Begin and end are places in the buffer beside the text.
+    std::uint32_t isAside : 1;
     // A text of white space with a line break, and nothing but the document's own characters.
     std::uint32_t isBlank : 1;
+    // An element in which blank texts are content: other text stands beside them, xml:space says
+    // so, or the caller.
+    std::uint32_t keepsLayout : 1;
 
+    static XMLIndexEntry of(XMLNodeKind kind, std::uint32_t name, std::uint32_t begin) noexcept {
+        return {begin, begin, 0, name & 0xFFFFFFU, static_cast<std::uint32_t>(kind) & 0x7U, 0,
+                0,     0,     0};
+    }
     XMLNodeKind nodeKind() const noexcept { return static_cast<XMLNodeKind>(kind); }
     bool isAttributeOrNamespace() const noexcept {
         return nodeKind() == XMLNodeKind::attribute ||
@@ -56,10 +70,18 @@ public:
     std::span<const XMLIndexEntry> entries() const noexcept { return _entries; }
     const XMLIndexEntry& operator[](Number number) const noexcept { return _entries[number]; }
 
-    // Whether the text begins with an XML declaration, and what that says of "standalone": "yes",
-    // "no" or nothing.
-    bool hasDeclaration() const noexcept { return _hasDeclaration; }
-    std::string_view standalone() const noexcept { return _standalone; }
+    // The entry behind the attributes and declarations of an element: its first child, or what
+    // follows the element where it has none.
+    Number firstChild(Number element) const noexcept {
+        Number at = element + 1;
+        while (at < _entries[element].next && _entries[at].isAttributeOrNamespace())
+            ++at;
+        return at;
+    }
+
+    // As the XML declaration says; null where it doesn't.
+    const String& version() const noexcept { return _version; }
+    const String& standalone() const noexcept { return _standalone; }
 
     // The qualified name of an element or attribute, the target of an instruction, the prefix of a
     // declaration.
@@ -68,15 +90,21 @@ public:
     std::string_view span(const XMLIndexEntry& entry) const noexcept;
     // The value: the span, or, where that needs work, `room` filled with what it stands for.
     std::string_view value(const XMLIndexEntry& entry, std::string& room) const;
+    // Whether the entry, inside the element, is layout and no content.
+    static bool isLayout(const XMLIndexEntry& entry, const XMLIndexEntry& element) noexcept {
+        return entry.isBlank != 0 && element.keepsLayout == 0;
+    }
 
 private:
     friend class XMLScanner;
+    friend class XMLIndexBuilder;
 
     std::string_view _text;
     std::vector<XMLIndexEntry> _entries;
     std::vector<String> _names;
-    bool _hasDeclaration = false;
-    std::string_view _standalone;
+    std::string _aside;
+    String _version;
+    String _standalone;
 };
 
 } // namespace qx

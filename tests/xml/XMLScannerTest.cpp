@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <random>
 
+#include "xml/XMLDocumentContent.h"
 #include "xml/XMLParser.h"
 
 namespace {
@@ -38,7 +39,8 @@ void print(const XMLNode& node, std::string& text) {
 // The whole tree, or the error.
 std::string outcome(std::string_view bytes, const XMLParseOptions& options, XMLParser::Way way) {
     qx::Ref<qx::Error> error;
-    const auto document = XMLParser::parse(bytes, options, &error, way);
+    const auto document =
+        qx::XMLDocumentContent::document(XMLParser::parseCopy(bytes, options, &error, way));
     if (!document)
         return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
                std::to_string(error->code()) + " " + error->localizedDescription().str();
@@ -59,7 +61,10 @@ void expectSame(const std::string& document) {
             << document;
 }
 
-bool isScanned(const std::string& document) { return XMLScanner::scan(document, {}).has_value(); }
+bool isScanned(const std::string& document) {
+    qx::XMLIndex index(document);
+    return XMLScanner::scan(index, {});
+}
 
 const std::string sample =
     "<?xml version='1.0' encoding=\"UTF-8\" standalone='no' ?>\r\n<!--c\r-->\n<?p d\r\n?>\n"

@@ -147,7 +147,7 @@ public:
 protected:
     friend class XMLElement;
     friend class XMLDocument;
-    friend class XMLTreeBuilder;
+    friend class XMLNodeMaker;
     friend class XMLSerializer;
     friend struct XMLSiblings;
 
