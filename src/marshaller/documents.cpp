@@ -3,7 +3,10 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "files/Files.h"
+#include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
+#include "xml/XMLParser.h"
 
 #include <algorithm>
 
@@ -26,11 +29,16 @@ qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
 
 // A lenient marshaller gives no object for a root that no class maps to, and no error either:
 // whoever reads in one step is told.
-Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, XMLDocument& document, Ref<Error>* error) {
-    auto object = marshaller.unmarshall(&document, error);
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parsed& parsed,
+                         Ref<Error>* error) {
+    if (!parsed)
+        return nullptr;
+    qx::IndexedXML document(*parsed);
+    auto object = qx::detail::readDocument(marshaller, document, error);
     if (object || (error != nullptr && *error))
         return object;
-    return qx::fail(error, qx::errors::noDefinitionForElement, document.rootElement());
+    return qx::fail(error, qx::errors::noDefinitionForElement,
+                    [&] { return document.quoted(document.root()); });
 }
 
 // What no XML document can hold, or none that could be read again, raises while it is written.
@@ -46,18 +54,23 @@ Result written(Write write, Ref<Error>* error) {
 } // namespace
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithData(xml, parseOptions(*this), error);
-    return document ? objectOf(*this, *document, error) : nullptr;
+    return objectOf(*this, qx::XMLParser::parseLent(xml, parseOptions(*this), error), error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithContentsOfFile(path, parseOptions(*this), error);
-    return document ? objectOf(*this, *document, error) : nullptr;
+    auto data = qx::readFile(path, error);
+    if (!data)
+        return nullptr;
+    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error),
+                    error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithStream(stream, parseOptions(*this), error);
-    return document ? objectOf(*this, *document, error) : nullptr;
+    auto data = qx::readStream(stream, error);
+    if (!data)
+        return nullptr;
+    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error),
+                    error);
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {

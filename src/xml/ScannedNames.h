@@ -15,6 +15,7 @@
 
 #include <QXXMLMarshalling/base/String.h>
 
+#include "xml/XMLIndex.h"
 #include "xml/XMLLimits.h"
 
 #include <cstdint>
@@ -27,7 +28,7 @@ class ScannedNames {
 public:
     using Number = std::uint32_t;
     static constexpr Number none = UINT32_MAX;
-    static_assert(xmlLimits::names < (1U << 24U));
+    static_assert(xmlLimits::names < XMLIndex::mostNames);
 
     // Thrown for what is left to the C parser.
     struct Refused {};

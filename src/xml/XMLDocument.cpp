@@ -12,7 +12,6 @@
 #include "xml/XMLSerializer.h"
 #include "xml/XMLSiblings.h"
 
-#include <istream>
 #include <ostream>
 
 namespace qx {
@@ -48,13 +47,7 @@ Ref<XMLDocument> XMLDocument::initWithData(XMLBytes bytes, const XMLParseOptions
 
 Ref<XMLDocument> XMLDocument::initWithStream(std::istream& stream, const XMLParseOptions& options,
                                              Ref<Error>* error) {
-    std::string bytes;
-    char block[16 * 1024];
-    while (stream.read(block, sizeof block) || stream.gcount() > 0)
-        bytes.append(block, static_cast<std::size_t>(stream.gcount()));
-    if (stream.eof() && !stream.bad())
-        return documentOf(make<Data>(std::move(bytes)), options, error);
-    return fail(error, errors::streamNotRead);
+    return documentOf(readStream(stream, error), options, error);
 }
 
 Ref<XMLDocument> XMLDocument::initWithRootElement(Ref<XMLElement> root) {

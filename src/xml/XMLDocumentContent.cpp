@@ -11,16 +11,16 @@ namespace qx {
 namespace {
 
 // The elements of a whole document, by the numbers of their entries.
-class AllElements final : public XMLElementTable {
+class AllElements final : public XMLNodeTable {
 public:
     explicit AllElements(std::size_t entries) : _elements(entries) {}
-    Ref<XMLElement> find(XMLIndex::Number number) const override { return _elements[number]; }
+    Ref<XMLNode> find(XMLIndex::Number number) const override { return _elements[number]; }
     void add(XMLIndex::Number number, XMLElement& element) override {
-        _elements[number] = Ref<XMLElement>(&element);
+        _elements[number] = Ref<XMLNode>(&element);
     }
 
 private:
-    std::vector<Ref<XMLElement>> _elements;
+    std::vector<Ref<XMLNode>> _elements;
 };
 
 } // namespace
@@ -90,7 +90,7 @@ XMLDocumentContent::Reader::~Reader() {
         unused = std::move(_document->_pending->elements);
 }
 
-Ref<XMLElement> XMLDocumentContent::Reader::element(XMLIndex::Number number) const {
+Ref<XMLNode> XMLDocumentContent::Reader::element(XMLIndex::Number number) const {
     _document->makeNodes();
     return _document->_pending->elements->find(number);
 }

@@ -25,7 +25,7 @@ struct XMLDocumentContent {
         // Null where the document has its nodes already.
         const ParsedDocument* parsed() const noexcept { return _parsed.get(); }
         // The element that was made of the entry, wherever the host has put it since.
-        Ref<XMLElement> element(XMLIndex::Number number) const;
+        Ref<XMLNode> element(XMLIndex::Number number) const;
 
     private:
         const Ref<const XMLDocument> _document;

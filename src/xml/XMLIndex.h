@@ -21,6 +21,10 @@
 // default brings) lies aside, in a buffer of the index. The index lends its text and never changes
 // once it stands: any number of threads may read it.
 //
+// The index of a tree (XMLTreeIndexer.h) has the same entries, but level by level: an element's
+// begin and end are those of the run of entries that are its content, `next` is the next sibling's,
+// and all values lie aside.
+//
 // White space between elements is layout, which is no content. That shows when the element around
 // it ends, so the texts stay: a blank one counts only where its element keeps layout.
 
@@ -63,6 +67,7 @@ static_assert(sizeof(XMLIndexEntry) == 16);
 class XMLIndex {
 public:
     using Number = std::uint32_t; // of an entry
+    static constexpr std::uint32_t mostNames = 1U << 24U;
 
     explicit XMLIndex(std::string_view text) noexcept : _text(text) {}
 
@@ -70,14 +75,22 @@ public:
     std::span<const XMLIndexEntry> entries() const noexcept { return _entries; }
     const XMLIndexEntry& operator[](Number number) const noexcept { return _entries[number]; }
 
-    // The entry behind the attributes and declarations of an element: its first child, or what
-    // follows the element where it has none.
+    // The entries inside an element: attributes and declarations, then, from firstChild on, its
+    // children, which siblingOf leads through. Empty runs end where they begin.
+    Number content(Number element) const noexcept {
+        return _isLevelled ? _entries[element].begin : element + 1;
+    }
+    Number contentEnd(Number element) const noexcept {
+        return _isLevelled ? _entries[element].end : _entries[element].next;
+    }
     Number firstChild(Number element) const noexcept {
-        Number at = element + 1;
-        while (at < _entries[element].next && _entries[at].isAttributeOrNamespace())
+        Number at = content(element);
+        for (const Number end = contentEnd(element);
+             at < end && _entries[at].isAttributeOrNamespace();)
             ++at;
         return at;
     }
+    Number siblingOf(Number number) const noexcept { return _entries[number].next; }
 
     // As the XML declaration says; null where it doesn't.
     const String& version() const noexcept { return _version; }
@@ -86,6 +99,7 @@ public:
     // The qualified name of an element or attribute, the target of an instruction, the prefix of a
     // declaration.
     const String& name(const XMLIndexEntry& entry) const noexcept { return _names[entry.name]; }
+    std::span<const String> names() const noexcept { return _names; }
     // The span of a text, attribute or declaration; the inside of a comment; an instruction's data.
     std::string_view span(const XMLIndexEntry& entry) const noexcept;
     // The value: the span, or, where that needs work, `room` filled with what it stands for.
@@ -98,11 +112,13 @@ public:
 private:
     friend class XMLScanner;
     friend class XMLIndexBuilder;
+    friend class XMLTreeIndexer;
 
     std::string_view _text;
     std::vector<XMLIndexEntry> _entries;
     std::vector<String> _names;
     std::string _aside;
+    bool _isLevelled = false;
     String _version;
     String _standalone;
 };

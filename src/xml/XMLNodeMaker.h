@@ -6,18 +6,20 @@
 
 #include "base/MemoryBlocks.h"
 #include "xml/TextPosition.h"
-#include "xml/XMLIndex.h"
+#include "xml/XMLTreeIndexer.h"
 
 #include <vector>
 
 namespace qx {
 
-// The elements that have been made of an index, by the numbers of their entries.
-class XMLElementTable {
+// The nodes that have been made of an index, by the numbers of their entries: elements, and perhaps
+// attributes and declarations.
+class XMLNodeTable {
 public:
-    virtual ~XMLElementTable() = default;
+    virtual ~XMLNodeTable() = default;
     // Null where there is none. One that has been made is put to use, not made again.
-    virtual Ref<XMLElement> find(XMLIndex::Number number) const = 0;
+    virtual Ref<XMLNode> find(XMLIndex::Number number) const = 0;
+    // An element that was made.
     virtual void add(XMLIndex::Number number, XMLElement& element) = 0;
 };
 
@@ -25,30 +27,42 @@ class XMLNodeMaker {
 public:
     using Number = XMLIndex::Number;
 
-    // Used on the thread that makes it; the index and the table, if any, must outlive it.
-    explicit XMLNodeMaker(const XMLIndex& index, XMLElementTable* table = nullptr)
-        : _index(index), _table(table), _position(index.text()), _blocks(MemoryBlocks::ofNodes()) {}
+    // Used on the thread that makes it; the index must outlive it, as must the table and the tree
+    // that the index shows, if any.
+    explicit XMLNodeMaker(const XMLIndex& index, XMLNodeTable* table = nullptr,
+                          const XMLTreeIndexer* tree = nullptr)
+        : _index(index), _table(table), _tree(tree), _position(index.text()),
+          _blocks(MemoryBlocks::ofNodes()) {}
 
     // All nodes of the document, which has none.
     void fill(XMLDocument& document);
     // The element of an entry with all that is inside. It stands alone.
     Ref<XMLElement> element(Number number);
 
+    // The node of an entry of any other kind.
+    Ref<XMLNode> node(Number number);
+
 private:
-    // An element that is being filled.
+    // An element whose children are being made: those from `at` to `end` are left.
     struct Open {
         XMLElement* element;
-        const XMLIndexEntry* entry;
+        Number number;
+        Number at;
+        Number end;
     };
 
-    void fill(std::vector<Open>& open, Number from, Number end);
+    Open opened(XMLElement& element, Number number) const noexcept;
     Ref<XMLElement> start(Number number);
-    void addContent(XMLElement& element, const XMLIndexEntry& entry, Number number);
-    void addAttribute(XMLElement& element, const XMLIndexEntry& entry);
-    XMLNode* newNode(XMLNodeKind kind, const XMLIndexEntry& entry);
+    void addAttribute(XMLElement& element, Number number);
+    // The element that is to be filled; null where there is nothing to do.
+    XMLElement* addElement(XMLElement& parent, Number number);
+    void addContent(const Open& parent, Number number);
+    XMLNode* newNode(const XMLIndexEntry& entry);
+    void place(XMLElement& element, Number number);
 
     const XMLIndex& _index;
-    XMLElementTable* const _table;
+    XMLNodeTable* const _table;
+    const XMLTreeIndexer* const _tree;
     TextPosition _position;
     MemoryBlocks& _blocks;
     std::string _room;

@@ -148,6 +148,7 @@ protected:
     friend class XMLElement;
     friend class XMLDocument;
     friend class XMLNodeMaker;
+    friend class XMLTreeIndexer;
     friend class XMLSerializer;
     friend struct XMLSiblings;
 
