@@ -1,14 +1,8 @@
 #include "record/RecordFilling.h"
 
-#include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 namespace qx::detail {
-
-bool RecordFilling::add(QXGenericRecord& record, Key key, Value&& value) {
-    const bool isContent = !key.namesProperty() || record.isa().property(key) == nullptr;
-    return isContent && addContent(record, key, std::move(value));
-}
 
 bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) {
     const bool isUnheard = (record._isCacheBehind || !record._contents) &&

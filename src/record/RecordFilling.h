@@ -18,13 +18,17 @@
 // Without it, reading orders takes 40 % more instructions (bench/orders_bench.cpp, read).
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 namespace qx::detail {
 
 class RecordFilling {
 public:
     // False when the value has to be set by key-value access; it is left alone then.
-    static bool add(QXGenericRecord& record, Key key, Value&& value);
+    static bool add(QXGenericRecord& record, Key key, Value&& value) {
+        const bool isContent = !key.namesProperty() || record.isa().property(key) == nullptr;
+        return isContent && addContent(record, key, std::move(value));
+    }
     // The same for a key that is known to be no property of the record.
     static bool addContent(QXGenericRecord& record, Key key, Value&& value);
     // Made when there are none.
