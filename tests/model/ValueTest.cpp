@@ -180,6 +180,18 @@ TEST(ValueTest, DictionariesAreEqualWhateverTheirOrder) {
               "NSGenericException: a dictionary was changed while it was walked");
 }
 
+// In quadratic time this would take longer than a test may.
+TEST(ValueTest, ADictionaryIsEmptiedFromTheFrontInLinearTime) {
+    const auto map = make<Dictionary>();
+    for (int i = 0; i < 500'000; ++i)
+        map->set(std::to_string(i), i);
+    while (map->count() > 1)
+        map->remove((*map->begin()).key);
+    EXPECT_EQ(oneLine(map), "{ 499999 = 499999; }");
+    map->set("7", "again");
+    EXPECT_EQ(oneLine(map->allKeys()), "( 7, 499999 )");
+}
+
 // Empties the collections that it stands in when it is looked at.
 struct Emptying : Object {
     Ref<Array> list = make<Array>();

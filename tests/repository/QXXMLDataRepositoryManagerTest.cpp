@@ -44,6 +44,15 @@ public:
     }
 };
 
+class Searching : public QXXMLFileSystemDataRepository {
+public:
+    std::size_t searches = 0;
+    String pathForResourceNamed(const String& name) override {
+        ++searches;
+        return QXXMLFileSystemDataRepository::pathForResourceNamed(name);
+    }
+};
+
 } // namespace
 
 TEST_F(RepositoryManagerTest, AFreshManagerAsksTheFileSystemAlone) {
@@ -93,6 +102,20 @@ TEST_F(RepositoryManagerTest, NoOtherRepositoryIsAskedWhenTheFirstFails) {
     error.reset();
     EXPECT_FALSE(manager->dataForName("b", &error));
     EXPECT_EQ(error->localizedDescription().str(), "The file cannot be read: " + folder);
+}
+
+TEST_F(RepositoryManagerTest, ANameIsSearchedOnceForEachLookUpAndNoneIsKept) {
+    sandbox.write("app/a.xml", "<shipped/>");
+    const auto files = QXXMLFileSystemDataRepository::init<Searching>();
+    manager->setPersistentRepository(files);
+    EXPECT_EQ(manager->documentNamed("a.xml")->rootElement()->name(), "shipped");
+    EXPECT_TRUE(manager->dataForName("a.xml"));
+    EXPECT_EQ(files->searches, 2U);
+
+    EXPECT_TRUE(manager->repositoryForDocumentNamed("a.xml"));
+    sandbox.write("data/Client/a.xml", "<own/>");
+    EXPECT_EQ(files->documentNamed("a.xml")->rootElement()->name(), "own");
+    EXPECT_EQ(manager->documentNamed("a.xml")->rootElement()->name(), "own");
 }
 
 TEST_F(RepositoryManagerTest, ARepositoryUnderAKnownNameKeepsItsPlace) {

@@ -15,6 +15,7 @@
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/model/Object.h>
 
+#include <array>
 #include <concepts>
 #include <cstdint>
 
