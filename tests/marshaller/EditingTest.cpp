@@ -8,6 +8,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/undo/UndoableObject.h>
 
+#include <functional>
 #include <random>
 
 namespace {
@@ -61,90 +62,73 @@ constexpr const char* document =
     "</owner><lines><line count='1' id='a'>one</line><line count='2'>two</line></lines>"
     "<note>n</note><extra><deep/></extra></order>";
 
-class Editing {
-public:
-    explicit Editing(unsigned seed) : _random(seed) {
-        const auto object = [&](const Value& value) {
-            value.object()->perform("setUndoManager:", _manager);
-            return value.as<qx::Object>();
-        };
-        const auto owner = object(_order->valueForKey("owner"));
-        const auto lines = _order->valueForKey("lines").as<qx::Array>();
-        const auto note = object(_order->valueForKey("notes").as<qx::Array>()->at(0));
-        const auto first = object(lines->at(0)), last = object(lines->at(1));
-        object(_order);
-        _texts = {{_order, "title"}, {_order, "novel"}, {owner, "name"},
-                  {first, "text"},   {last, "text"},    {note, "text"}};
-        _numbers = {{owner, "count"}, {first, "count"}, {last, "count"}};
-        // Those are added once more that have no unknown XML, which can stand in one place only.
-        _lists = {{last, "lines"}, {note, "notes"}};
-    }
-    ~Editing() { _manager->removeAllActions(); }
-
-    std::string text() { return scenario::write(*_marshaller, _order); }
-    UndoManager& manager() { return *_manager; }
-
-    void changeSomething() {
-        switch (below(3)) {
-        case 0: {
-            const auto& [object, key] = _texts[below(_texts.size())];
-            object->setValueForKey(below(3) == 0 ? Value() : Value(word()), key);
-            break;
-        }
-        case 1: {
-            const auto& [object, key] = _numbers[below(_numbers.size())];
-            object->setValueForKey(below(100), key);
-            break;
-        }
-        default: {
-            const auto& [item, key] = _lists[below(_lists.size())];
-            _order->setValueForKey(
-                below(4) == 0 ? Value() : changed(_order->valueForKey(key).as<qx::Array>(), item),
-                key);
-        }
-        }
-        if (below(3) == 0)
-            _manager->endEventGroup();
-    }
-
-private:
-    using Keys = std::vector<std::pair<Ref<qx::Object>, const char*>>;
-
-    std::size_t below(std::size_t limit) { return _random() % limit; }
-    std::string word() { return std::string(1 + below(3), static_cast<char>('a' + below(26))); }
-
-    Value changed(const Ref<qx::Array>& former, const Ref<qx::Object>& item) {
-        const auto list = former ? former->mutableCopy() : qx::make<qx::Array>();
-        if (!list->isEmpty() && below(2) == 0)
-            list->remove(below(list->count()));
-        else
-            list->insert(below(list->count() + 1), item);
-        return list;
-    }
-
-    std::mt19937 _random;
-    Ref<QXXMLMarshaller> _marshaller = scenario::marshaller(mapping);
-    Ref<UndoManager> _manager = qx::make<UndoManager>();
-    Ref<qx::Object> _order = _marshaller->readString(document);
-    Keys _texts, _numbers, _lists;
-};
-
 TEST(EditingTest, UndoneToTheStartADocumentIsWrittenAsBeforeAndRedoneAsAfter) {
+    const auto marshaller = scenario::marshaller(mapping);
     const unsigned first = std::random_device()();
     for (unsigned seed = first; seed != first + 200; ++seed) {
         SCOPED_TRACE("seed " + std::to_string(seed));
-        Editing editing(seed);
-        const std::string before = editing.text();
+        std::mt19937 random(seed);
+        const auto below = [&](std::size_t limit) { return random() % limit; };
+        const auto manager = qx::make<UndoManager>();
+        const auto order = marshaller->readString(document);
+        const auto item = [&](const char* list, std::size_t index) {
+            return order->valueForKey(list).as<qx::Array>()->at(index);
+        };
+        const Value owner = order->valueForKey("owner"), note = item("notes", 0);
+        const Value lines[] = {item("lines", 0), item("lines", 1)};
+        for (const Value& object : {Value(order), owner, note, lines[0], lines[1]})
+            object.object()->perform("setUndoManager:", manager);
+
+        const auto word = [&]() -> Value {
+            if (below(3) == 0)
+                return nullptr;
+            return std::string(1 + below(3), static_cast<char>('a' + below(26)));
+        };
+        const auto number = [&]() -> Value { return below(100); };
+        // What has no unknown XML may stand in several places.
+        const auto list = [&](const Value& head, const Value& repeated) {
+            return [&]() -> Value {
+                if (below(4) == 0)
+                    return nullptr;
+                std::vector<Value> items(below(3), repeated);
+                items.insert(items.begin() + below(items.size() + 1), below(2), head);
+                return qx::make<qx::Array>(items);
+            };
+        };
+        const struct {
+            Value object;
+            const char* key;
+            std::function<Value()> value;
+        } edits[] = {
+            {order, "title", word},
+            {order, "novel", word},
+            {owner, "name", word},
+            {owner, "count", number},
+            {lines[0], "text", word},
+            {lines[0], "count", number},
+            {lines[1], "text", word},
+            {lines[1], "count", number},
+            {note, "text", word},
+            {order, "lines", list(lines[0], lines[1])},
+            {order, "notes", list(note, note)},
+        };
+        const auto text = [&] { return scenario::write(*marshaller, order); };
+        const std::string before = text();
         ASSERT_EQ(before.find("<order"), 0U) << before;
-        for (int i = 0; i < 40; ++i)
-            editing.changeSomething();
-        const std::string after = editing.text();
-        while (editing.manager().canUndo())
-            editing.manager().undo();
-        ASSERT_EQ(editing.text(), before);
-        while (editing.manager().canRedo())
-            editing.manager().redo();
-        ASSERT_EQ(editing.text(), after);
+        for (int i = 0; i < 40; ++i) {
+            const auto& [object, key, value] = edits[below(std::size(edits))];
+            object.object()->setValueForKey(value(), key);
+            if (below(3) == 0)
+                manager->endEventGroup();
+        }
+        const std::string after = text();
+        while (manager->canUndo())
+            manager->undo();
+        ASSERT_EQ(text(), before);
+        while (manager->canRedo())
+            manager->redo();
+        ASSERT_EQ(text(), after);
+        manager->removeAllActions();
     }
 }
 

@@ -105,7 +105,7 @@ TEST(Hostile, SmallDocumentsPassHoweverTheyAreRead) {
     for (const auto& [mapping, depth] : cases) {
         const auto marshaller = scenario::marshaller(mapping);
         Ref<qx::Error> error;
-        EXPECT_TRUE(marshaller->readString(nested("a", depth), &error)) << scenario::show(error);
+        EXPECT_TRUE(marshaller->readString(nested("a", depth), &error)) << scenario::told(error);
     }
 }
 
@@ -121,7 +121,7 @@ TEST(Hostile, AttributesThatManyObjectsKeepCountOnce) {
     Ref<qx::Error> error;
     EXPECT_TRUE(
         marshaller->readString(nested("list", 1, repeated("<a" + attributes + "/>", 1000)), &error))
-        << scenario::show(error);
+        << scenario::told(error);
 }
 
 TEST(Hostile, LimitsAreTheHosts) {

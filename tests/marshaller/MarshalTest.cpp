@@ -1,7 +1,6 @@
 // Objects become XML: what each kind of field writes, and which values are left out or refused.
 
 #include "support/Scenario.h"
-#include "support/Texts.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Array.h>

@@ -75,7 +75,7 @@ TEST(Marshaller, HoldsNoClassWithoutAMapping) {
                   "-211: No definition to handle element: <a></a> (Invalid Mapping)");
     }
     EXPECT_FALSE(marshaller->unmarshall(nullptr, &error));
-    EXPECT_EQ(scenario::show(error),
+    EXPECT_EQ(scenario::told(error),
               "-211: No definition to handle element: (null) (Invalid Mapping)");
 }
 
@@ -204,7 +204,7 @@ TEST(Marshaller, WritesNothingThatItCouldNotRead) {
     std::ostringstream out;
     Ref<Error> error;
     EXPECT_FALSE(marshaller->writeStream(order, out, &error) || !out.str().empty());
-    EXPECT_EQ(scenario::show(error), "517: The text cannot be written: an element has more "
+    EXPECT_EQ(scenario::told(error), "517: The text cannot be written: an element has more "
                                      "attributes than the limit of 4096 at /Order ()");
 }
 
@@ -357,7 +357,7 @@ TEST(Marshaller, EndsDeepNestingInAnErrorInBothDirections) {
     const auto source = qx::XMLDocument::initWithData(scenario::nested("node", 1000), options);
     error = nullptr;
     EXPECT_FALSE(marshaller->unmarshall(source, &error));
-    EXPECT_EQ(scenario::show(error), tooDeep);
+    EXPECT_EQ(scenario::told(error), tooDeep);
 }
 
 TEST(Marshaller, FindsManyNamesAmongManyChildrenInAnIndex) {

@@ -15,6 +15,7 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
 #include "support/Show.h"
+#include "support/Texts.h"
 
 #include <gtest/gtest.h>
 
@@ -63,18 +64,14 @@ inline qx::Ref<QXXMLMarshaller> marshaller(std::string_view mapping, unsigned op
     return made;
 }
 
-// "-202: message (reason)".
-inline std::string show(const qx::Ref<qx::Error>& error) {
-    return std::to_string(error->code()) + ": " + error->localizedDescription().str() + " (" +
-           error->localizedFailureReason().str() + ")";
-}
+using support::told;
 
 // The object that the document gives, or the error.
 inline std::string read(QXXMLMarshaller& marshaller, std::string_view document) {
     qx::Ref<qx::Error> error;
     const auto object = marshaller.readString(document, &error);
     EXPECT_FALSE(object && error) << "both an object and an error";
-    return error ? show(error) : support::show(object);
+    return error ? told(error) : support::show(object);
 }
 
 // The object's root element, or the error.
@@ -82,7 +79,7 @@ inline std::string write(QXXMLMarshaller& marshaller, const qx::Value& object) {
     qx::Ref<qx::Error> error;
     const auto element = marshaller.marshallObject(object, &error);
     EXPECT_FALSE(element && error) << "both an element and an error";
-    return error ? show(error) : element ? element->XMLString().str() : "null";
+    return error ? told(error) : element ? element->XMLString().str() : "null";
 }
 
 inline std::string repeated(std::string_view text, std::size_t times) {
