@@ -4,7 +4,6 @@
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Array.h>
-#include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 namespace {
@@ -210,14 +209,4 @@ TEST(Marshal, GivesADocumentOfVersionOneInUTF8) {
     EXPECT_EQ(document->version(), "1.0");
     EXPECT_EQ(document->characterEncoding(), "UTF-8");
     EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"UTF-8\"?><A></A>");
-}
-
-TEST(Marshal, RaisesForHostClassesWithoutTheReservedKeys) {
-    struct Bare : qx::Object {
-        qx::String classNameForMarshalling() const override { return "Bare"; }
-    };
-    qx::Class::define<Bare>("MarshalTest.Bare");
-    const auto marshaller = scenario::marshaller("<Bare/>");
-    EXPECT_EQ(support::raised([&] { marshaller->marshallObject(qx::make<Bare>()); }),
-              "NSUndefinedKeyException: class MarshalTest.Bare has no key unboundChildren to read");
 }
