@@ -202,11 +202,3 @@ TEST(Marshal, DeclaresNamespacesUnlessToldNotTo) {
     const auto without = scenario::marshaller(mapping, scenario::noNamespaces);
     EXPECT_EQ(scenario::write(*without, record("A")), "<a></a>");
 }
-
-TEST(Marshal, GivesADocumentOfVersionOneInUTF8) {
-    const auto marshaller = scenario::marshaller("<A/>");
-    const auto document = marshaller->marshall(record("A"));
-    EXPECT_EQ(document->version(), "1.0");
-    EXPECT_EQ(document->characterEncoding(), "UTF-8");
-    EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"UTF-8\"?><A></A>");
-}

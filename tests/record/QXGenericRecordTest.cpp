@@ -42,11 +42,11 @@ const bool described = [] {
 }();
 
 TEST(QXGenericRecordTest, AnyKeyIsContentAndNullRemovesIt) {
-    const auto record = make<Record>();
+    const auto fresh = make<Record>(), record = make<Record>();
     int told = 0;
-    const auto token = record->observe("title", [&](const ValueChange&) { ++told; });
-    record->setValueForKey(nullptr, "title"); // makes the contents, and is told
-    EXPECT_TRUE(record->contents()->isEmpty());
+    const auto token = fresh->observe("title", [&](const ValueChange&) { ++told; });
+    fresh->setValueForKey(nullptr, "title"); // makes the contents, and is told
+    EXPECT_TRUE(fresh->contents()->isEmpty());
     EXPECT_EQ(told, 1);
     for (const char* key : {"title", "description", "", "@count", "@foo", "a.b", "isRemovable"}) {
         EXPECT_TRUE(record->valueForKey(key).isNull()) << key;

@@ -154,12 +154,13 @@ struct QXGenericRecordUndoTest : testing::Test {
 };
 
 TEST_F(QXGenericRecordUndoTest, WhatWasNotAnnouncedIsNoChangeAndWhatWasDroppedStaysSo) {
-    book->setValueForKey(1, "a");
-    book->setContents(book->contents()->mutableCopy());
-    book->contents()->set("b", 2);
-    EXPECT_EQ(book->changeCache()->allKeys()->count(), 1U);
-    book->setChangeCache(nullptr);
-    EXPECT_TRUE(book->changeCache()->isEmpty());
+    const auto record = make<Record>();
+    record->setValueForKey(1, "a");
+    record->setContents(record->contents()->mutableCopy());
+    record->contents()->set("b", 2);
+    EXPECT_EQ(record->changeCache()->allKeys()->count(), 1U);
+    record->setChangeCache(nullptr);
+    EXPECT_TRUE(record->changeCache()->isEmpty());
 }
 
 TEST_F(QXGenericRecordUndoTest, AKeyThatComesBackHasItsPlaceAgain) {
