@@ -142,6 +142,10 @@ TEST_F(ObservationTest, APathThroughThreeObjectsHearsOfEachOfThem) {
 }
 
 TEST_F(ObservationTest, DependentValuesAreToldOfWhatTheyDependOn) {
+    int prior = 0;
+    const auto token = rome->observe(
+        "address", [&](const ValueChange& change) { prior += change.isPrior ? 1 : 0; },
+        Observing::prior);
     observe("address");
     EXPECT_EQ(afterSetting(*rome, "city", "Roma"),
               Texts{"address: Rome,  in Italy > Roma,  in Italy"});
@@ -154,6 +158,7 @@ TEST_F(ObservationTest, DependentValuesAreToldOfWhatTheyDependOn) {
                   rome->setValueForKey("EU", "country");
               }),
               Texts{"address: Roma,  in EU > Roma, EU in Europe"});
+    EXPECT_EQ(prior, 4) << "once for a change, however it is nested";
 }
 
 TEST_F(ObservationTest, DependenciesReachAnyDistanceAndMayFormRings) {
