@@ -33,6 +33,14 @@ inline qx::Ref<qx::XMLDocument> parsed(std::string_view text,
     return document;
 }
 
+// "-202: message (reason)", or "no error".
+inline std::string told(const qx::Ref<qx::Error>& error) {
+    if (!error)
+        return "no error";
+    return std::to_string(error->code()) + ": " + error->localizedDescription().str() + " (" +
+           error->localizedFailureReason().str() + ")";
+}
+
 // The description of a value in one line.
 inline std::string oneLine(const qx::Value& value) {
     static const std::regex layout("\\s+");

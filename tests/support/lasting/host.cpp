@@ -1,0 +1,19 @@
+// What host/ keeps for ever is no leak of the first test that needs it.
+
+#include <QXXMLMarshalling/host/Bundle.h>
+#include <QXXMLMarshalling/host/UserDefaults.h>
+
+#include <gtest/gtest.h>
+
+namespace {
+
+struct HostObjects : testing::Environment {
+    void SetUp() override {
+        qx::Bundle::mainBundle();
+        qx::Bundle::frameworkBundle();
+        qx::UserDefaults::standardUserDefaults()->boolForKey("");
+    }
+};
+const auto* const added = testing::AddGlobalTestEnvironment(new HostObjects);
+
+} // namespace
