@@ -12,18 +12,22 @@ constexpr std::size_t scanLimit = 256;
 ChildLookup::ChildLookup(IndexedXML& document, Number element, Nodes nodes, std::size_t lookups)
     : _document(document), _element(element), _nodes(nodes), _lookups(lookups) {
     document.forEachChild(element, [&](Number child) {
-        const bool isElement = document.isElement(child);
-        _children.push_back({isElement ? identity(document.name(child)) : nullptr, child});
+        add(document.isElement(child) ? identity(document.name(child)) : nullptr, child);
     });
 }
 
 ChildLookup::ChildLookup(const ChildLookup& other, Nodes nodes)
     : _document(other._document), _element(other._element), _nodes(nodes), _isCopy(true),
       _lookups(other._lookups) {
-    _children.reserve(other._children.size());
-    for (const Child& child : other._children)
+    for (const Child& child : other.children())
         if (child.number != none)
-            _children.push_back({child.name, child.number});
+            add(child.name, child.number);
+}
+
+void ChildLookup::addToMany(const Child& child) {
+    if (_many.empty())
+        _many.assign(_few.begin(), _few.end());
+    _many.push_back(child);
 }
 
 std::unique_ptr<ChildLookup> ChildLookup::copyOf(const ChildLookup& other) {
@@ -31,18 +35,19 @@ std::unique_ptr<ChildLookup> ChildLookup::copyOf(const ChildLookup& other) {
 }
 
 void ChildLookup::indexIfWorthIt() {
-    if (_isIndexed || _lookups * _children.size() <= scanLimit || _lookups < 2)
+    if (_isIndexed || _lookups * children().size() <= scanLimit || _lookups < 2)
         return;
     _isIndexed = true;
-    for (std::uint32_t i = 0; i < _children.size(); ++i) {
-        const Child& child = _children[i];
+    const auto all = children();
+    for (std::uint32_t i = 0; i < all.size(); ++i) {
+        const Child& child = all[i];
         if (child.number == none || child.name == nullptr)
             continue;
         Run& run = _runs[child.name];
         if (run.first == none)
             run.first = i;
         else
-            _children[run.last].next = i;
+            all[run.last].next = i;
         run.last = i;
     }
 }
@@ -54,11 +59,11 @@ void ChildLookup::forEachNamed(const String& name, Visit visit) {
     if (_isIndexed) {
         const auto run = _runs.find(wanted);
         std::uint32_t at = run != _runs.end() ? run->second.first : none;
-        while (at != none && visit(_children[at].number))
-            at = _children[at].next;
+        while (at != none && visit(children()[at].number))
+            at = children()[at].next;
         return;
     }
-    for (const Child& child : _children)
+    for (const Child& child : children())
         if (child.name == wanted && child.number != none && !visit(child.number))
             return;
 }
@@ -91,7 +96,7 @@ std::vector<ChildLookup::Number> ChildLookup::all(const String& name) {
 
 std::vector<ChildLookup::Number> ChildLookup::all() const {
     std::vector<Number> numbers;
-    numbers.reserve(_children.size());
+    numbers.reserve(children().size());
     forEachChild([&](Number child) { numbers.push_back(child); });
     return numbers;
 }
@@ -114,14 +119,14 @@ void ChildLookup::take(Number child) {
         _document.detach(child);
     if (_isIndexed) {
         const auto run = _runs.find(identity(_document.name(child)));
-        Child& first = _children[run->second.first];
+        Child& first = children()[run->second.first];
         first.number = none;
         run->second.first = first.next;
         if (first.next == none)
             _runs.erase(run);
         return;
     }
-    for (Child& listed : _children)
+    for (Child& listed : children())
         if (listed.number == child)
             listed.number = none;
 }

@@ -14,7 +14,9 @@
 #include "marshaller/ReadingBudget.h"
 #include "plan/MappingPlan.h"
 
+#include <array>
 #include <memory>
+#include <span>
 #include <vector>
 
 namespace qx::detail {
@@ -37,7 +39,7 @@ public:
     Nodes nodes() const noexcept { return _nodes; }
     bool isCopy() const noexcept { return _isCopy; }
     // How many children the element has.
-    std::size_t childCount() const noexcept { return _children.size(); }
+    std::size_t childCount() const noexcept { return children().size(); }
     // Says that another object will look that many names up, too.
     void expectLookups(std::size_t lookups) noexcept { _lookups += lookups; }
 
@@ -55,7 +57,7 @@ public:
     // Calls visit(Number) for each child in document order.
     template <class Visit>
     void forEachChild(Visit visit) const {
-        for (const Child& child : _children)
+        for (const Child& child : children())
             if (child.number != none)
                 visit(child.number);
     }
@@ -86,6 +88,19 @@ private:
         std::uint32_t last = none;
     };
 
+    std::span<Child> children() noexcept {
+        return _many.empty() ? std::span(_few.data(), _count) : std::span(_many);
+    }
+    std::span<const Child> children() const noexcept {
+        return const_cast<ChildLookup*>(this)->children();
+    }
+    void add(Name name, Number number) {
+        if (_many.empty() && _count < _few.size())
+            _few[_count++] = {name, number};
+        else
+            addToMany({name, number});
+    }
+    void addToMany(const Child& child);
     void indexIfWorthIt();
     // Calls visit(Number) for each child element of that name until it says false.
     template <class Visit>
@@ -97,7 +112,10 @@ private:
     const bool _isCopy = false;
     bool _isIndexed = false;
     std::size_t _lookups;
-    std::vector<Child> _children;
+    // The children: most elements have few, which take no memory of their own.
+    std::size_t _count = 0;
+    std::array<Child, 8> _few;
+    std::vector<Child> _many; // all, where they are more
     std::unordered_map<Name, Run> _runs; // where it is indexed
 
     ChildLookup(const ChildLookup& other, Nodes nodes);

@@ -62,27 +62,27 @@ Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number numbe
     return node;
 }
 
-IndexedXML::IndexedXML(const ParsedDocument& parsed) : _parsed(&parsed.index()) { findRoot(); }
+IndexedXML::IndexedXML(const ParsedDocument& parsed) : _index(&parsed.index()) { findRoot(); }
 
 IndexedXML::IndexedXML(XMLDocument& document) {
     _reader.emplace(document);
     if (_reader->parsed() != nullptr) {
-        _parsed = &_reader->parsed()->index();
+        _index = &_reader->parsed()->index();
         findRoot();
         internNames();
         return;
     }
     _reader.reset();
-    if (XMLElement* const root = document.rootElement()) {
-        _tree.emplace(*root);
-        _tree->expandAll(_root = 0);
-    }
+    readTree(document.rootElement(), Content::atOnce);
 }
 
-IndexedXML::IndexedXML(XMLElement* element, Content content) {
+IndexedXML::IndexedXML(XMLElement* element, Content content) { readTree(element, content); }
+
+void IndexedXML::readTree(XMLElement* element, Content content) {
     if (element == nullptr)
         return;
     _tree.emplace(*element);
+    _index = &_tree->index();
     _root = 0;
     if (content == Content::atOnce)
         _tree->expandAll(_root);
@@ -91,15 +91,15 @@ IndexedXML::IndexedXML(XMLElement* element, Content content) {
 IndexedXML::~IndexedXML() = default;
 
 void IndexedXML::findRoot() noexcept {
-    const auto count = static_cast<Number>(_parsed->entries().size());
-    for (Number at = 0; at < count && _root == none; at = _parsed->siblingOf(at))
-        if ((*_parsed)[at].nodeKind() == XMLNodeKind::element)
+    const auto count = static_cast<Number>(_index->entries().size());
+    for (Number at = 0; at < count && _root == none; at = _index->siblingOf(at))
+        if ((*_index)[at].nodeKind() == XMLNodeKind::element)
             _root = at;
 }
 
 // A mapping may have come since the document was parsed.
 void IndexedXML::internNames() {
-    const auto names = _parsed->names();
+    const auto names = _index->names();
     for (std::size_t i = 0; i < names.size(); ++i) {
         const Key known = names[i].isInterned() ? Key() : Key::existing(names[i]);
         if (known.isNull())
@@ -108,14 +108,6 @@ void IndexedXML::internNames() {
             _interned.assign(names.begin(), names.end());
         _interned[i] = known.string();
     }
-}
-
-const String& IndexedXML::name(Number number) const noexcept {
-    static const String noName;
-    const XMLIndexEntry& entry = index()[number];
-    if (entry.nodeKind() == XMLNodeKind::text || entry.nodeKind() == XMLNodeKind::comment)
-        return noName;
-    return _interned.empty() ? index().name(entry) : _interned[entry.name];
 }
 
 String IndexedXML::value(Number number) {

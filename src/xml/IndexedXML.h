@@ -37,7 +37,12 @@ public:
     XMLNodeKind kind(Number number) const noexcept { return index()[number].nodeKind(); }
     bool isElement(Number number) const noexcept { return kind(number) == XMLNodeKind::element; }
     // Null of texts and comments. A name that a mapping knows is the interned one.
-    const String& name(Number number) const noexcept;
+    const String& name(Number number) const noexcept {
+        const XMLIndexEntry& entry = index()[number];
+        const bool hasNone =
+            entry.nodeKind() == XMLNodeKind::text || entry.nodeKind() == XMLNodeKind::comment;
+        return hasNone ? _noName : _interned.empty() ? index().name(entry) : _interned[entry.name];
+    }
     // The number of an element's name among those of the document.
     std::uint32_t nameNumber(Number element) const noexcept { return index()[element].name; }
 
@@ -90,7 +95,7 @@ public:
     void detach(Number element);
 
 private:
-    const XMLIndex& index() const noexcept { return _tree ? _tree->index() : *_parsed; }
+    const XMLIndex& index() const noexcept { return *_index; }
     void expand(Number element) {
         if (_tree)
             _tree->expand(element);
@@ -99,6 +104,7 @@ private:
         if (_tree)
             _tree->expandAll(element);
     }
+    void readTree(XMLElement* element, Content content);
     void findRoot() noexcept;
     void internNames();
     void appendText(Number element, std::string& text);
@@ -106,7 +112,8 @@ private:
 
     std::optional<XMLDocumentContent::Reader> _reader;
     std::optional<XMLTreeIndexer> _tree;
-    const XMLIndex* _parsed = nullptr;
+    const XMLIndex* _index = nullptr; // what was parsed, or the tree's; null where there is nothing
+    const String _noName;
     Number _root = none;
     std::vector<String> _interned; // the names, where the index has not all that are known by now
     std::string _room;

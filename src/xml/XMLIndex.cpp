@@ -102,7 +102,7 @@ std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
     return withoutLeadingWhite(data.substr(name(entry).size()));
 }
 
-std::string_view XMLIndex::value(const XMLIndexEntry& entry, std::string& room) const {
+std::string_view XMLIndex::workedOut(const XMLIndexEntry& entry, std::string& room) const {
     const std::string_view raw = span(entry);
     if (entry.needsWork == 0)
         return raw;

@@ -103,7 +103,13 @@ public:
     // The span of a text, attribute or declaration; the inside of a comment; an instruction's data.
     std::string_view span(const XMLIndexEntry& entry) const noexcept;
     // The value: the span, or, where that needs work, `room` filled with what it stands for.
-    std::string_view value(const XMLIndexEntry& entry, std::string& room) const;
+    std::string_view value(const XMLIndexEntry& entry, std::string& room) const {
+        const XMLNodeKind kind = entry.nodeKind();
+        const bool isPlain = kind == XMLNodeKind::attribute || kind == XMLNodeKind::text;
+        if (isPlain && entry.needsWork == 0 && entry.isAside == 0)
+            return {_text.data() + entry.begin, entry.end - entry.begin};
+        return workedOut(entry, room);
+    }
     // Whether the entry, inside the element, is layout and no content.
     static bool isLayout(const XMLIndexEntry& entry, const XMLIndexEntry& element) noexcept {
         return entry.isBlank != 0 && element.keepsLayout == 0;
@@ -113,6 +119,8 @@ private:
     friend class XMLScanner;
     friend class XMLIndexBuilder;
     friend class XMLTreeIndexer;
+
+    std::string_view workedOut(const XMLIndexEntry& entry, std::string& room) const;
 
     std::string_view _text;
     std::vector<XMLIndexEntry> _entries;
