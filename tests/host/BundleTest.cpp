@@ -29,9 +29,6 @@ const std::type_info& typeOfRunTime() {
 
 } // namespace
 
-extern "C" void makeLastingObjects();
-extern "C" void makeLastingObjects() { Bundle::bundleForClass(typeOfRunTime()); }
-
 TEST_F(BundleTest, TheInfoDictionaryHoldsEveryKindOfAPropertyList) {
     sandbox.write("app/Info.plist", R"(<?xml version="1.0" encoding="UTF-8"?>
         <!DOCTYPE plist SYSTEM "file:///does/not/exist.dtd">

@@ -89,12 +89,11 @@ std::string document() {
             items += "<" + name + " id='" + id + "' more='m'>x<u/></" + name + ">";
         return items;
     };
-    std::string padding; // so many children that an index is built of them
-    for (int i = 0; i < 30; ++i)
-        padding += "<p/>";
     return "<order xmlns:n='urn:n' spare='s'><head id='h'/><one id='1'/><word>w</word><w>f</w>" +
            two("t") + "<box>" + two("l") + "</box>" + two("item") + "<wrap>" + two("item") +
-           "</wrap><unknown><deep/></unknown>" + padding + "</order>";
+           "</wrap><unknown><deep/></unknown>" +
+           // So many children that they are looked up in an index.
+           scenario::repeated("<p/>", 30) + "</order>";
 }
 
 void takeApart(qx::XMLElement& element) {

@@ -5,12 +5,17 @@
 
 #include <gtest/gtest.h>
 
+#include <system_error>
+#include <typeinfo>
+
 namespace {
 
 struct HostObjects : testing::Environment {
     void SetUp() override {
         qx::Bundle::mainBundle();
         qx::Bundle::frameworkBundle();
+        const std::error_category& ofRunTime = std::generic_category();
+        qx::Bundle::bundleForClass(typeid(ofRunTime));
         qx::UserDefaults::standardUserDefaults()->boolForKey("");
     }
 };
