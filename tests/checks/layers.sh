@@ -17,10 +17,11 @@ read_layers() {
     local folder uses headers used header
     while IFS=: read -r folder uses headers; do
         folder=${folder// /}
-        below[$folder]=" $folder "
+        below[$folder]=" $folder"
         for used in $uses; do
-            below[$folder]+=${below[$used]}
+            below[$folder]+=${below[$used]% }
         done
+        below[$folder]+=" "
         for header in $headers; do
             listed[$header]=$folder
         done
@@ -118,7 +119,7 @@ check_include() {
 definitions_of() {
     local type='(class|struct|union|enum)( [A-Za-z_]+)* ' function='[A-Za-z_][A-Za-z0-9_:<>,&* ]*[ &*]'
     local rest='([^;{]*\{|[^;]*$)' qualified="([A-Za-z0-9_]+::)*$1"
-    grep -rE "^[[:space:]]*(($type)$qualified([^A-Za-z0-9_]$rest|$)|$function$qualified\($rest)" include src \
+    grep -rE "^[[:space:]]*(($type)$qualified([^A-Za-z0-9_;]$rest|$)|$function$qualified\($rest)" include src \
         --include='*.h' --include='*.cpp' | grep -vE '^[^:]*:[[:space:]]*friend [^{]*$' | cut -d: -f1 | sort -u
 }
 
@@ -153,7 +154,7 @@ self_test() {
     put include/QXXMLMarshalling/detail/Lost.h '#include <string>'
     put include/QXXMLMarshalling/base/Value.h '#include <QXXMLMarshalling/QXRecord.h>' '    friend class qx::Way;' \
         '    friend Deep;' '    friend qx::Ref<Value>' '    qx::make<Value>(int&&);' '    friend void qx::walk(Value&);' \
-        '    friend bool operator==(Value, Value) = default;'
+        '    friend bool operator==(Value, Value) = default;' 'class Way;' 'void walk(Value& value);'
     put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/base/Value.h>' '#include "record/Table.h"'
     put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/detail/Count.h>' '#include <sys/stat.h>'
     put src/base/Value.cpp '#include <unistd.h>' '#  include <libxml/tree.h>' 'Ref<T> make(Args&&... arguments) {'
