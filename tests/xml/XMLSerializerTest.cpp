@@ -176,17 +176,17 @@ TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
         std::function<void(XMLElement& a, std::size_t extra)> fill;
     } rows[] = {
         {"elements nest deeper than the limit of 256", usual,
-         [&](XMLElement& a, std::size_t extra) { nested(a, 256 + extra); }},
+         [&](auto& a, auto extra) { nested(a, 256 + extra); }},
         {"elements nest deeper than the limit of 1000", deep,
-         [&](XMLElement& a, std::size_t extra) { nested(a, 1000 + extra); }},
+         [&](auto& a, auto extra) { nested(a, 1000 + extra); }},
         {"an element has more attributes than the limit of 4096", usual,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              declared(a, 0, 96);
              for (std::size_t i = 0; i < 4000 + extra; ++i)
                  a.addAttribute(number(i), "value");
          }},
         {"more namespace declarations are in force than the limit of 1000", usual,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              declared(a, 0, 600);
              a.addAttribute("xmlns:p", "u");
              for (int i = 0; i < 3; ++i) { // one beside the other
@@ -196,30 +196,30 @@ TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
              }
          }},
         {"a text is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              for (const std::size_t size : {60 + extra, std::size_t{0}, std::size_t{40}})
                  a.addChild(XMLNode::initTextWithStringValue(x(size)));
              a.addChild(XMLElement::initWithName("b"));
              a.addChild(XMLNode::initTextWithStringValue(x(100)));
          }},
         {"an attribute's value is larger than the limit of 10000000", usual,
-         [&](XMLElement& a, std::size_t extra) { a.addAttribute("b", x(10'000'000 + extra)); }},
+         [&](auto& a, auto extra) { a.addAttribute("b", x(10'000'000 + extra)); }},
         {"a namespace's URI is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addNamespace(XMLNode::namespaceWithName("", x(100 + extra)));
          }},
         {"a comment is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addChild(XMLNode::initCommentWithStringValue(x(100 + extra)));
          }},
         {"a processing instruction is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addChild(XMLNode::initProcessingInstructionWithName("p", x(100 + extra)));
          }},
         {"a name is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) { a.addAttribute(x(100 + extra), ""); }},
+         [&](auto& a, auto extra) { a.addAttribute(x(100 + extra), ""); }},
         {"the document has more different names than the limit of 100000", usual,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addNamespace(XMLNode::namespaceWithName("p", "u"));
              for (std::size_t i = 0; i < 100'000 - 3 + extra; ++i)
                  a.addChild(XMLElement::initWithName(number(i)));
