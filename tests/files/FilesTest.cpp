@@ -21,8 +21,7 @@ using namespace qx;
 
 namespace {
 
-class FilesTest : public ::testing::Test {
-protected:
+struct FilesTest : ::testing::Test {
     TemporaryFolder sandbox;
     const std::string special = " (It is a pipe, a socket or a device.)";
 };

@@ -18,8 +18,7 @@ using namespace qx;
 
 namespace {
 
-class UserDefaultsTest : public ::testing::Test {
-protected:
+struct UserDefaultsTest : ::testing::Test {
     ~UserDefaultsTest() override {
         defaults->setArguments({});
         defaults->removeObjectForKey("Key");
