@@ -43,7 +43,7 @@ TEST(ValueTest, APropertyTakesWhatLosesNothing) {
         {taken<bool>, {{"YES", "1"}, {"no", "0"}, {0.5, "1"}}, {"maybe", object}},
         {taken<signed char>,
          {{" +127 ", "127"}, {-3.0, "-3"}},
-         {128, "7 pieces", "", 2.5, nullptr}},
+         {128, "7 pieces", "", "+-3", 2.5, nullptr}},
         {taken<std::uint64_t>,
          {{1e19, "10000000000000000000"}, {most, most}},
          {"18446744073709551616", -1, -1.0, object}},
