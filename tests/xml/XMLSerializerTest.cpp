@@ -226,20 +226,20 @@ TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
              a.addChild(XMLElement::initWithName(number(7)));
          }},
     };
-    for (const auto& [reason, reading, fill] : rows)
+    for (const auto& row : rows)
         for (const std::size_t extra : {0, 1}) {
             const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
-            fill(*document->rootElement(), extra);
+            row.fill(*document->rootElement(), extra);
             Ref<qx::Error> error;
             const auto read = XMLDocument::initWithData(
-                document->XMLString(qx::XMLCompactEmptyElements), reading, &error);
+                document->XMLString(qx::XMLCompactEmptyElements), row.reading, &error);
             EXPECT_EQ(read.get() != nullptr, extra == 0)
-                << reason << (error ? error->localizedDescription().str() : "");
+                << row.reason << (error ? error->localizedDescription().str() : "");
             const std::string outcome = support::raised([&] {
-                static_cast<void>(document->XMLData(qx::XMLPrettyPrint, reading));
-                static_cast<void>(document->XMLString(qx::XMLNoOptions, reading));
+                static_cast<void>(document->XMLData(qx::XMLPrettyPrint, row.reading));
+                static_cast<void>(document->XMLString(qx::XMLNoOptions, row.reading));
             });
-            const std::string refusal = "NSInvalidArgumentException: "s + reason + " at ";
+            const std::string refusal = "NSInvalidArgumentException: "s + row.reason + " at ";
             EXPECT_EQ(outcome.substr(0, refusal.size()), extra == 0 ? "nothing" : refusal);
         }
 }
