@@ -100,7 +100,7 @@ if(TARGET QXXMLMarshalling)
         add_dependencies(tests program_${name})
     endforeach()
     # It takes the parser's memory away.
-    target_link_libraries(program_parse_without_memory PRIVATE LibXml2::LibXml2)
+    target_link_libraries(program_without_memory PRIVATE LibXml2::LibXml2)
 
     if(QX_BUILD_EXAMPLES)
         file(GLOB demos CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/examples/*/demo")

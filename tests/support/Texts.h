@@ -3,7 +3,7 @@
 // What tests compare, as one text.
 
 #include <QXXMLMarshalling/base/Exception.h>
-#include <QXXMLMarshalling/model/Value.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <gtest/gtest.h>
@@ -45,6 +45,16 @@ inline std::string told(const qx::Ref<qx::Error>& error) {
 inline std::string oneLine(const qx::Value& value) {
     static const std::regex layout("\\s+");
     return std::regex_replace(value.description().str(), layout, " ");
+}
+
+// What a property of the type holds when it is set to the value; "refused" when it stays as it is.
+template <class T>
+std::string taken(const qx::Value& value) {
+    T held{};
+    const std::string before = oneLine(qx::ValueTraits<T>::toValue(held));
+    const bool isTaken = qx::ValueTraits<T>::fromValue(value, held);
+    const std::string after = oneLine(qx::ValueTraits<T>::toValue(held));
+    return isTaken ? after : after == before ? "refused" : "refused, but changed to " + after;
 }
 
 } // namespace support
