@@ -41,10 +41,10 @@ public:
         const XMLIndexEntry& entry = index()[number];
         const bool hasNone =
             entry.nodeKind() == XMLNodeKind::text || entry.nodeKind() == XMLNodeKind::comment;
-        return hasNone ? _noName : _interned.empty() ? index().name(entry) : _interned[entry.name];
+        return hasNone ? _noName : _interned.empty() ? index().name(entry) : _interned[entry.name()];
     }
     // The number of an element's name among those of the document.
-    std::uint32_t nameNumber(Number element) const noexcept { return index()[element].name; }
+    std::uint32_t nameNumber(Number element) const noexcept { return index()[element].name(); }
 
     // Calls visit(Number) for each child, attribute or declaration of an element.
     template <class Visit>

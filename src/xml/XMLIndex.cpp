@@ -90,9 +90,9 @@ void appendAttributeValue(std::string_view text, std::string& result) {
 } // namespace
 
 std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
-    const std::string_view source = entry.isAside != 0 ? _aside : _text;
+    const std::string_view source = entry.has(XMLIndexEntry::isAside) ? _aside : _text;
     const std::string_view whole = source.substr(entry.begin, entry.end - entry.begin);
-    if (entry.isAside != 0)
+    if (entry.has(XMLIndexEntry::isAside))
         return whole;
     if (entry.nodeKind() == XMLNodeKind::comment)
         return whole.substr(4, whole.size() - 7);
@@ -104,7 +104,7 @@ std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
 
 std::string_view XMLIndex::workedOut(const XMLIndexEntry& entry, std::string& room) const {
     const std::string_view raw = span(entry);
-    if (entry.needsWork == 0)
+    if (!entry.has(XMLIndexEntry::needsWork))
         return raw;
     room.clear();
     switch (entry.nodeKind()) {

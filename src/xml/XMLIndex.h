@@ -40,23 +40,31 @@ struct XMLIndexEntry {
     std::uint32_t begin;
     std::uint32_t end;
     std::uint32_t next;
-    std::uint32_t name : 24; // see XMLIndex::name; of texts and comments nothing
-    std::uint32_t kind : 3;  // an XMLNodeKind
-    // The value is not the span as it stands: references, line ends to be normalised, CDATA.
-    std::uint32_t needsWork : 1;
-    // Begin and end are places in the buffer beside the text.
-    std::uint32_t isAside : 1;
-    // A text of white space with a line break, and nothing but the document's own characters.
-    std::uint32_t isBlank : 1;
-    // An element in which blank texts are content: other text stands beside them, xml:space says
-    // so, or the caller.
-    std::uint32_t keepsLayout : 1;
+    // The name (see XMLIndex::name; of texts and comments nothing) above the flags and the kind: one
+    // word, which is written at once. Bit fields are written one by one, and the next read waits.
+    std::uint32_t bits;
+
+    enum Flag : std::uint32_t {
+        // The value is not the span as it stands: references, line ends to be normalised, CDATA.
+        needsWork = 1U << 3U,
+        // Begin and end are places in the buffer beside the text.
+        isAside = 1U << 4U,
+        // A text of white space with a line break, and nothing but the document's own characters.
+        isBlank = 1U << 5U,
+        // An element in which blank texts are content: other text stands beside them, xml:space says
+        // so, or the caller.
+        keepsLayout = 1U << 6U,
+    };
+    static constexpr std::uint32_t kindMask = 7;
+    static constexpr std::uint32_t nameShift = 8;
 
     static XMLIndexEntry of(XMLNodeKind kind, std::uint32_t name, std::uint32_t begin) noexcept {
-        return {begin, begin, 0, name & 0xFFFFFFU, static_cast<std::uint32_t>(kind) & 0x7U, 0,
-                0,     0,     0};
+        return {begin, begin, 0, name << nameShift | static_cast<std::uint32_t>(kind)};
     }
-    XMLNodeKind nodeKind() const noexcept { return static_cast<XMLNodeKind>(kind); }
+    XMLNodeKind nodeKind() const noexcept { return static_cast<XMLNodeKind>(bits & kindMask); }
+    std::uint32_t name() const noexcept { return bits >> nameShift; }
+    bool has(Flag flag) const noexcept { return (bits & flag) != 0; }
+    void setIf(bool condition, Flag flag) noexcept { bits |= condition ? flag : 0U; }
     bool isAttributeOrNamespace() const noexcept {
         return nodeKind() == XMLNodeKind::attribute ||
                nodeKind() == XMLNodeKind::namespaceDeclaration;
@@ -98,7 +106,7 @@ public:
 
     // The qualified name of an element or attribute, the target of an instruction, the prefix of a
     // declaration.
-    const String& name(const XMLIndexEntry& entry) const noexcept { return _names[entry.name]; }
+    const String& name(const XMLIndexEntry& entry) const noexcept { return _names[entry.name()]; }
     std::span<const String> names() const noexcept { return _names; }
     // The span of a text, attribute or declaration; the inside of a comment; an instruction's data.
     std::string_view span(const XMLIndexEntry& entry) const noexcept;
@@ -106,13 +114,13 @@ public:
     std::string_view value(const XMLIndexEntry& entry, std::string& room) const {
         const XMLNodeKind kind = entry.nodeKind();
         const bool isPlain = kind == XMLNodeKind::attribute || kind == XMLNodeKind::text;
-        if (isPlain && entry.needsWork == 0 && entry.isAside == 0)
+        if (isPlain && (entry.bits & (XMLIndexEntry::needsWork | XMLIndexEntry::isAside)) == 0)
             return {_text.data() + entry.begin, entry.end - entry.begin};
         return workedOut(entry, room);
     }
     // Whether the entry, inside the element, is layout and no content.
     static bool isLayout(const XMLIndexEntry& entry, const XMLIndexEntry& element) noexcept {
-        return entry.isBlank != 0 && element.keepsLayout == 0;
+        return entry.has(XMLIndexEntry::isBlank) && !element.has(XMLIndexEntry::keepsLayout);
     }
 
 private:

@@ -24,7 +24,7 @@ void XMLIndexBuilder::add(XMLNodeKind kind, Number name, std::string_view value)
     const bool isAside = !isOwn(value);
     if (isAside && _index._aside.size() + value.size() > UINT32_MAX)
         throw ParseFailure(parseErrors::documentTooLarge);
-    entry.isAside = isAside ? 1 : 0;
+    entry.setIf(isAside, XMLIndexEntry::isAside);
     entry.begin = static_cast<std::uint32_t>(
         isAside ? _index._aside.size()
                 : static_cast<std::size_t>(value.data() - _index._text.data()));
@@ -71,7 +71,7 @@ void XMLIndexBuilder::endElement() {
     finishText();
     XMLIndexEntry& element = _index._entries[_open.back().number];
     element.next = static_cast<Number>(_index._entries.size());
-    element.keepsLayout = _open.back().keepsLayout ? 1 : 0;
+    element.setIf(_open.back().keepsLayout, XMLIndexEntry::keepsLayout);
     _open.pop_back();
 }
 
@@ -96,10 +96,9 @@ void XMLIndexBuilder::finishText() {
     if (text.empty())
         return;
     add(XMLNodeKind::text, 0, text);
-    if (isLayout(text))
-        _index._entries.back().isBlank = 1;
-    else
-        _open.back().keepsLayout = true;
+    const bool isBlank = isLayout(text);
+    _index._entries.back().setIf(isBlank, XMLIndexEntry::isBlank);
+    _open.back().keepsLayout |= !isBlank;
     _piece = {};
     _joined.clear();
 }

@@ -92,11 +92,11 @@ void XMLNodeMaker::addContent(const Open& parent, Number number) {
     XMLElement& element = *parent.element;
     if (XMLIndex::isLayout(content, _index[parent.number]))
         return;
-    if (content.nodeKind() == XMLNodeKind::text && content.isBlank == 0 &&
+    if (content.nodeKind() == XMLNodeKind::text && !content.has(XMLIndexEntry::isBlank) &&
         element._childCount == 0 && parent.at == parent.end)
         return element.holdText(textInBlock(_index.value(content, _room)));
     XMLNode* const made = newNode(content);
-    made->_isLayout = content.isBlank != 0;
+    made->_isLayout = content.has(XMLIndexEntry::isBlank);
     XMLSiblings::append(element, element._firstChild, made);
     ++element._childCount;
 }

@@ -115,7 +115,7 @@ void XMLScanner::makeRoom() {
 inline void XMLScanner::finish(XMLIndexEntry& entry, const char* end) {
     entry.end = offset(end);
     entry.next = static_cast<std::uint32_t>(_entries.size());
-    entry.needsWork = _needsWork ? 1 : 0;
+    entry.setIf(_needsWork, XMLIndexEntry::needsWork);
     require(entry.end - entry.begin <= _maximumSize);
 }
 
@@ -286,17 +286,14 @@ void XMLScanner::takeDeclaration(XMLIndexEntry& entry, const Name& name) {
     require(!_needsWork && URI != xmlNamespace && URI != xmlnsNamespace);
     require(++_open.back().namespaces <= xmlLimits::namespaces);
     _names.countURI();
-    entry.kind = static_cast<std::uint32_t>(XMLNodeKind::namespaceDeclaration) & 0x7U;
-    if (name.meaning == Meaning::prefixNamespace) {
-        require(!URI.empty());
-        entry.name = name.local & 0xFFFFFFU;
-    } else {
-        entry.name = _names.numberOfNoPrefix() & 0xFFFFFFU;
-    }
+    const bool hasPrefix = name.meaning == Meaning::prefixNamespace;
+    require(!hasPrefix || !URI.empty());
+    const Number prefix = hasPrefix ? name.local : _names.numberOfNoPrefix();
+    entry.bits = XMLIndexEntry::of(XMLNodeKind::namespaceDeclaration, prefix, 0).bits;
 }
 
 void XMLScanner::scanEndTag() {
-    const Name& name = _names[_entries[_open.back().number].name];
+    const Name& name = _names[_entries[_open.back().number].name()];
     _at += 2;
     require(static_cast<std::size_t>(_end - _at) > name.size &&
             std::memcmp(_at, _text.data() + name.begin, name.size) == 0);
@@ -311,7 +308,7 @@ inline void XMLScanner::endElement() {
     XMLIndexEntry& element = _entries[_open.back().number];
     element.end = offset(_at);
     element.next = static_cast<std::uint32_t>(_entries.size());
-    element.keepsLayout = _open.back().keepsLayout ? 1 : 0;
+    element.setIf(_open.back().keepsLayout, XMLIndexEntry::keepsLayout);
     _open.pop_back();
 }
 
@@ -354,10 +351,8 @@ void XMLScanner::scanText() {
         }
     }
     XMLIndexEntry& entry = add(XMLNodeKind::text, begin, 0);
-    if (isBlank)
-        entry.isBlank = 1;
-    else
-        _open.back().keepsLayout = true;
+    entry.setIf(isBlank, XMLIndexEntry::isBlank);
+    _open.back().keepsLayout |= !isBlank;
     finish(entry, _at);
 }
 

@@ -39,8 +39,7 @@ void XMLTreeIndexer::add(XMLNodeKind kind, const String& name, std::string_view 
     _index._aside += value;
     entry.end = static_cast<std::uint32_t>(_index._aside.size());
     entry.next = static_cast<Number>(_index._entries.size()) + 1;
-    entry.isAside = 1;
-    entry.keepsLayout = 1;
+    entry.bits |= XMLIndexEntry::isAside | XMLIndexEntry::keepsLayout;
     _index._entries.push_back(entry);
     _elements.emplace_back();
     _isExpanded.push_back(0);
@@ -50,7 +49,7 @@ void XMLTreeIndexer::addChild(XMLNode& child) {
     XMLElement* const element = child.asElement();
     if (element == nullptr) {
         add(child.kind(), child.name(), child._value.view());
-        _index._entries.back().isBlank = child._isLayout ? 1 : 0;
+        _index._entries.back().setIf(child._isLayout, XMLIndexEntry::isBlank);
         return;
     }
     add(XMLNodeKind::element, element->name(), {});
