@@ -2,8 +2,11 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 #include "model/Errors.h"
+#include "model/TypeNames.h"
+#include "plan/MappingPlan.h"
 
 #include <algorithm>
 
@@ -11,10 +14,17 @@ using qx::Error;
 using qx::Ref;
 using qx::String;
 using qx::XMLDocument;
+using qx::detail::ClassPlan;
+using qx::detail::MappingPlan;
 
 namespace {
 
 constexpr qx::XMLOptions layout = qx::XMLPrettyPrint;
+
+void reset(Ref<Error>* error) {
+    if (error != nullptr)
+        error->reset();
+}
 
 // What is written is meant to be read by such a marshaller, too.
 qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
@@ -24,13 +34,19 @@ qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
     return options;
 }
 
-// A lenient marshaller gives no object for a root that no class maps to, and no error either:
-// whoever reads in one step is told.
-Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, XMLDocument& document, Ref<Error>* error) {
-    auto object = marshaller.unmarshall(&document, error);
-    if (object || (error != nullptr && *error))
-        return object;
-    return qx::fail(error, qx::errors::noDefinitionForElement, document.rootElement());
+// Whether objects of the class may be of the C++ type, as far as that is known beforehand: a type
+// that nobody described may be a base of theirs.
+bool mayBe(const ClassPlan& plan, const std::type_info& type) {
+    const qx::Class* const wanted = qx::Class::described(type);
+    const qx::Class* const made = qx::Class::named(plan.classNameToInstantiate.view());
+    if (wanted == nullptr || made == nullptr)
+        return true;
+    return wanted->isStruct() ? made == wanted : made->isSubclassOf(*wanted);
+}
+
+String nameOf(const std::type_info& type) {
+    const qx::Class* const described = qx::Class::described(type);
+    return described != nullptr ? described->name() : String(qx::readableName(type));
 }
 
 // What no XML document can hold, or none that could be read again, raises while it is written.
@@ -45,22 +61,65 @@ Result written(Write write, Ref<Error>* error) {
 
 } // namespace
 
-Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
+// A lenient marshaller gives no object for a root that no class maps to, and no error either:
+// whoever reads in one step is told. So is who asks for a class, before anything is read.
+Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, const std::type_info& type,
+                                            Ref<Error>* error) {
+    auto* const root = document != nullptr ? document->rootElement() : nullptr;
+    const ClassPlan* const plan =
+        root != nullptr ? MappingPlan::of(mapping()).classForElement(root->name()) : nullptr;
+    if (plan == nullptr)
+        return qx::fail(error, qx::errors::noDefinitionForElement, root);
+    if (!mayBe(*plan, type))
+        return qx::fail(error, qx::errors::rootOfOtherClass, plan->className.string(),
+                        nameOf(type));
+    auto object = unmarshall(document, error);
+    if (!object && error != nullptr && !*error)
+        return qx::fail(error, qx::errors::noDefinitionForElement, root);
+    return object;
+}
+
+Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type_info& type) {
+    Ref<Error> error;
+    qx::fail(&error, qx::errors::rootOfOtherClass, object.classNameForMarshalling(), nameOf(type));
+    return error;
+}
+
+Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
+                                            Ref<Error>* error) {
+    reset(error);
     const auto document = XMLDocument::initWithData(xml, parseOptions(*this), error);
-    return document ? objectOf(*this, *document, error) : nullptr;
+    return document ? unmarshall(document.get(), type, error) : nullptr;
+}
+
+Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
+                                          Ref<Error>* error) {
+    reset(error);
+    const auto document = XMLDocument::initWithContentsOfFile(path, parseOptions(*this), error);
+    return document ? unmarshall(document.get(), type, error) : nullptr;
+}
+
+Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
+                                            Ref<Error>* error) {
+    reset(error);
+    const auto document = XMLDocument::initWithStream(stream, parseOptions(*this), error);
+    return document ? unmarshall(document.get(), type, error) : nullptr;
+}
+
+Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
+    return readString(xml, typeid(qx::Object), error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithContentsOfFile(path, parseOptions(*this), error);
-    return document ? objectOf(*this, *document, error) : nullptr;
+    return readFile(path, typeid(qx::Object), error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithStream(stream, parseOptions(*this), error);
-    return document ? objectOf(*this, *document, error) : nullptr;
+    return readStream(stream, typeid(qx::Object), error);
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
+    reset(error);
     const auto options = parseOptions(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     if (!document)
@@ -69,6 +128,7 @@ String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) 
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
+    reset(error);
     const auto options = parseOptions(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     const auto write = [&] { return document->writeToFile(path, layout, error, options); };
@@ -77,6 +137,7 @@ bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref
 
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
                                   Ref<Error>* error) {
+    reset(error);
     const auto options = parseOptions(*this);
     const auto document = marshall(object, error);
     const auto write = [&] { return document->writeToStream(stream, layout, error, options); };
