@@ -21,9 +21,12 @@
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/CountedSet.h>
+#include <QXXMLMarshalling/model/Result.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/undo/UndoManager.h>
 
 #include <iosfwd>
+#include <typeinfo>
 
 class QX_API QXXMLMarshaller : public qx::Object {
 public:
@@ -62,6 +65,11 @@ public:
     // object keeps under the key "__namespaces".
     bool isUsingNamespaceURIs() const noexcept { return _usingNamespaceURIs; }
     void setUsingNamespaceURIs(bool use) noexcept { _usingNamespaceURIs = use; }
+    // Marshalling leaves out attributes that are not required and whose value is zero, false or
+    // empty; numbers are cut to integers first. Members of plain structs and std::optional members
+    // that hold a value are always written.
+    bool omitsZeroAttributes() const noexcept { return _omitsZeroAttributes; }
+    void setOmitsZeroAttributes(bool omit) noexcept { _omitsZeroAttributes = omit; }
     // How deep objects may nest, in both directions; 256 at first, 2,048 at most (more counts as
     // that many). A level takes about a kilobyte of the thread's stack. Deeper objects end in
     //   -223  "Objects nest deeper than the limit of %@: %@"   (the limit, the class)
@@ -94,19 +102,47 @@ public:
     // The object built from the document's root element; null on failure, and without an error when
     // a lenient marshaller finds no class for the root element. See unmarshallElement.
     qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, qx::Ref<qx::Error>* error = nullptr);
-    template <class T>
-    qx::Ref<qx::Object> unmarshall(const qx::Ref<T>& document,
+    template <std::derived_from<qx::XMLDocument> D>
+    qx::Ref<qx::Object> unmarshall(const qx::Ref<D>& document,
                                    qx::Ref<qx::Error>* error = nullptr) {
         return unmarshall(document.get(), error);
     }
 
-    // Parse and unmarshall in one step: the object, or null with an error. Besides those of
-    // unmarshall() and of the parser, whether the marshaller is lenient or not:
+    // Parse and unmarshall in one step: the object, or null with an error. The slot is set to null
+    // first, so that one serves many calls. Besides the errors of unmarshall() and of the parser,
+    // whether the marshaller is lenient or not:
     //   -211  "No definition to handle element: %@"   (the root)
     qx::Ref<qx::Object> readString(qx::XMLBytes xml, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readFile(const qx::String& path, qx::Ref<qx::Error>* error = nullptr);
     qx::Ref<qx::Object> readStream(std::istream& stream, qx::Ref<qx::Error>* error = nullptr);
-    // Marshall and serialise in one step, one element a line. The string is null on failure; a file
+
+    // The same for a document whose root is a T: a plain struct that was described gives a
+    // qx::Result<T>, a class that derives from qx::Object a qx::Result<qx::Ref<T>>. Besides the
+    // errors above:
+    //   -211  "The root is of class: %@, not of class: %@"   (the root's, the T's)
+    template <class T>
+    [[nodiscard]] qx::ResultOf<T> readString(qx::XMLBytes xml) {
+        return resultOf<T>([&](auto* error) { return readString(xml, typeid(T), error); });
+    }
+    template <class T>
+    [[nodiscard]] qx::ResultOf<T> readFile(const qx::String& path) {
+        return resultOf<T>([&](auto* error) { return readFile(path, typeid(T), error); });
+    }
+    template <class T>
+    [[nodiscard]] qx::ResultOf<T> readStream(std::istream& stream) {
+        return resultOf<T>([&](auto* error) { return readStream(stream, typeid(T), error); });
+    }
+    template <class T>
+    [[nodiscard]] qx::ResultOf<T> unmarshall(qx::XMLDocument* document) {
+        return resultOf<T>([&](auto* error) { return unmarshall(document, typeid(T), error); });
+    }
+    template <class T, std::derived_from<qx::XMLDocument> D>
+    [[nodiscard]] qx::ResultOf<T> unmarshall(const qx::Ref<D>& document) {
+        return unmarshall<T>(document.get());
+    }
+
+    // Marshall and serialise in one step, one element a line. The slot is set to null first. The
+    // string is null on failure; a file
     // is replaced atomically, and untouched on failure. Besides the errors of marshall() and of
     // writing:
     //   517  "The text cannot be written: %@"   (a character or a name that XML has no place for,
@@ -116,6 +152,25 @@ public:
                    qx::Ref<qx::Error>* error = nullptr);
     bool writeStream(const qx::Value& object, std::ostream& stream,
                      qx::Ref<qx::Error>* error = nullptr);
+
+    // The same for a plain struct, or what owns one (std::unique_ptr, std::variant and the like).
+    // It is read where it is and not copied: nothing may change it meanwhile.
+    template <qx::WritableStruct T>
+    qx::Ref<qx::XMLDocument> marshall(const T& object, qx::Ref<qx::Error>* error = nullptr) {
+        return marshall(qx::detail::lend(object), error);
+    }
+    template <qx::WritableStruct T>
+    qx::String writeString(const T& object, qx::Ref<qx::Error>* error = nullptr) {
+        return writeString(qx::detail::lend(object), error);
+    }
+    template <qx::WritableStruct T>
+    bool writeFile(const T& object, const qx::String& path, qx::Ref<qx::Error>* error = nullptr) {
+        return writeFile(qx::detail::lend(object), path, error);
+    }
+    template <qx::WritableStruct T>
+    bool writeStream(const T& object, std::ostream& stream, qx::Ref<qx::Error>* error = nullptr) {
+        return writeStream(qx::detail::lend(object), stream, error);
+    }
 
     // The steps of marshalling, for hosts that build trees of their own.
     //
@@ -220,10 +275,38 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
+    // The object of a document whose root is to be of that C++ type.
+    qx::Ref<qx::Object> readString(qx::XMLBytes xml, const std::type_info& type,
+                                   qx::Ref<qx::Error>* error);
+    qx::Ref<qx::Object> readFile(const qx::String& path, const std::type_info& type,
+                                 qx::Ref<qx::Error>* error);
+    qx::Ref<qx::Object> readStream(std::istream& stream, const std::type_info& type,
+                                   qx::Ref<qx::Error>* error);
+    qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, const std::type_info& type,
+                                   qx::Ref<qx::Error>* error);
+    // -211 for an object that is not of that type.
+    static qx::Ref<qx::Error> wrongClass(const qx::Object& object, const std::type_info& type);
+
+    template <class T, class Read>
+    static qx::ResultOf<T> resultOf(Read read) {
+        qx::Ref<qx::Error> error;
+        const qx::Ref<qx::Object> object = read(&error);
+        if (!object)
+            return error;
+        if constexpr (std::derived_from<T, qx::Object>) {
+            if (auto cast = object.template as<T>())
+                return cast;
+        } else if (auto box = object.template as<qx::Boxed<T>>()) {
+            return std::move(**box);
+        }
+        return wrongClass(*object, typeid(T));
+    }
+
     qx::Ref<QXXMLMarshallingMapping> _mapping;
     bool _saveUnknownXML = true;
     bool _lenient = true;
     bool _usingNamespaceURIs = true;
+    bool _omitsZeroAttributes = true;
     qx::Ref<qx::UndoManager> _undoManager;
     std::size_t _maximumDepth = 256;
     Limit _maximumObjects{10'000, 16};

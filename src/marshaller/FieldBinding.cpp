@@ -32,7 +32,8 @@ bool Unmarshalling::readField(const FieldPlan& field, const Target& target, Erro
 
 bool Marshalling::writeField(const FieldPlan& field, XMLElement& element, Object& object,
                              ErrorSlot error) {
-    Value value = ObjectAccess::get(object, field.key);
+    ObjectAccess::Held held = ObjectAccess::get(object, field.key);
+    Value& value = held.value;
     if (value.isNull() && field.isContainer) {
         if (!field.isRequired)
             return true;
@@ -44,6 +45,7 @@ bool Marshalling::writeField(const FieldPlan& field, XMLElement& element, Object
         return writeCollection(*this, field, element, *array, error);
     if (value.classNameForMarshalling().isNull())
         return fail(error, errors::noClassName, object.isa().name());
+    _omitsZero = _marshaller->omitsZeroAttributes() && !held.keepsZero;
     return bindingOf(field).write(*this, field, element, value, error);
 }
 

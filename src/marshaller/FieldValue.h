@@ -21,10 +21,4 @@ inline String textOf(const Value& value, ValueType type) {
     return value.description();
 }
 
-// Whether an attribute with that text is left out: nothing requires it, and it is empty or zero.
-// Numbers are cut to integers first.
-inline bool isLeftOut(const FieldPlan& field, const Value& value, const String& text) {
-    return !field.isRequired && ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
-}
-
 } // namespace qx::detail

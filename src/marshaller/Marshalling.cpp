@@ -101,11 +101,7 @@ XMLElement* Marshalling::lastChildNamed(const XMLElement& element, const String&
     return nullptr;
 }
 
-bool Marshalling::isToBeWritten(const Value& item) {
-    Object& object = *item.object();
-    const Operation* isRemovable = _access.hooksOf(object).isRemovable;
-    return isRemovable != nullptr && !ObjectAccess::send(object, *isRemovable).boolValue();
-}
+bool Marshalling::isToBeWritten(const Value& item) { return _access.isToBeWritten(*item.object()); }
 
 namespace {
 
@@ -123,7 +119,7 @@ Ref<XMLNode> moved(const Value& kept, XMLNodeKind kind) {
 void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
     static const Key childrenKey("unboundChildren");
     static const Key attributesKey("unboundAttributes");
-    if (const auto children = ObjectAccess::get(object, childrenKey).as<Dictionary>()) {
+    if (const auto children = ObjectAccess::getKept(object, childrenKey).as<Dictionary>()) {
         const auto known = _lastChildren.find(&element);
         LastChildByName* const last = known != _lastChildren.end() ? &known->second : nullptr;
         if (last != nullptr)
@@ -137,7 +133,7 @@ void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
                             last->see(*child);
                     }
     }
-    if (const auto attributes = ObjectAccess::get(object, attributesKey).as<Array>())
+    if (const auto attributes = ObjectAccess::getKept(object, attributesKey).as<Array>())
         for (const Value& kept : *attributes)
             if (auto attribute = moved(kept, XMLNodeKind::attribute))
                 element.addAttribute(std::move(attribute));
@@ -146,7 +142,7 @@ void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
 // The declarations that were read take the place of the class mapping's own.
 void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) const {
     static const Key key("__namespaces");
-    const auto kept = ObjectAccess::get(object, key).as<Array>();
+    const auto kept = ObjectAccess::getKept(object, key).as<Array>();
     if (!kept || kept->isEmpty() || !_marshaller->isUsingNamespaceURIs())
         return;
     std::vector<Ref<XMLNode>> copies;

@@ -31,9 +31,14 @@ public:
     const ClassPlan* classOf(const Value& value) const;
     // Null when no child has that name.
     XMLElement* lastChildNamed(const XMLElement& element, const String& name);
-    // Whether an item of a collection is written: when it says that it cannot be removed, as
-    // records do. One that says nothing is not.
+    // Whether an item of a collection is written (ObjectAccess.h).
     bool isToBeWritten(const Value& item);
+    // Whether the field that is being written is left out as an attribute: nothing requires it, and
+    // it is empty or zero. Numbers are cut to integers first.
+    bool isLeftOut(const FieldPlan& field, const Value& value, const String& text) const noexcept {
+        return _omitsZero && !field.isRequired &&
+               ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
+    }
 
 private:
     bool writeOwnFields(const ClassPlan& plan, XMLElement& element, Object& object,
@@ -45,6 +50,7 @@ private:
     const MappingPlan& _plan;
     ObjectAccess _access;
     std::size_t _depth = 0;
+    bool _omitsZero = true; // of the field that is being written
     // Of the elements in which names were looked up among many children.
     std::unordered_map<const XMLElement*, LastChildByName> _lastChildren;
 };

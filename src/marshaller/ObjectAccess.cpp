@@ -1,7 +1,13 @@
 #include "marshaller/ObjectAccess.h"
 
+#include "base/Immortal.h"
+#include "host/Log.h"
 #include "model/Errors.h"
 #include "record/RecordFilling.h"
+
+#include <mutex>
+#include <set>
+#include <utility>
 
 namespace qx::detail {
 
@@ -31,13 +37,88 @@ Value ObjectAccess::send(Object& object, const Operation& operation, const Value
 
 const Class* const ObjectAccess::records = &QXGenericRecord::classObject();
 
+ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
+    const Class& type = object.isa();
+    if (&type == records)
+        return {object.valueForKey(key), false};
+    const Property* property = type.property(key);
+    if (property == nullptr)
+        return {object.valueForKey(key), false};
+    return {property->lend != nullptr ? property->lend(*property, object) : object.valueForKey(key),
+            property->keepsZero};
+}
+
+Value ObjectAccess::getKept(const Object& object, Key key) {
+    if (object.isa().isStruct() && object.isa().property(key) == nullptr)
+        return {};
+    return object.valueForKey(key);
+}
+
 bool ObjectAccess::set(Object& object, Key key, Value value, Ref<Error>* error) {
     QXGenericRecord* record = plainRecord(object);
     if (record != nullptr && RecordFilling::add(*record, key, std::move(value)))
         return true;
     // NOLINTNEXTLINE(bugprone-use-after-move): it was left alone
-    return object.trySetValueForKey(value, key) == SetOutcome::set ||
+    return setProperty(object, key, value) == SetOutcome::set ||
            fail(error, errors::unableToSetValue, value, key.string(), object.isa().name());
+}
+
+// Nobody observes a struct.
+SetOutcome ObjectAccess::setProperty(Object& object, Key key, const Value& value) {
+    const Class& type = object.isa();
+    if (!type.isStruct())
+        return object.trySetValueForKey(value, key);
+    const Property* property = type.property(key);
+    if (property == nullptr)
+        return SetOutcome::unknownKey;
+    return property->set != nullptr && property->set(*property, object, value)
+               ? SetOutcome::set
+               : SetOutcome::refused;
+}
+
+namespace {
+
+// Whether it is the first time in the process that this is said of the class.
+bool isFirst(const Class& type, const char* message) {
+    struct Said {
+        std::mutex mutex;
+        std::set<std::pair<const Class*, const char*>> all;
+    };
+    auto& said = immortal<Said>();
+    const std::lock_guard lock(said.mutex);
+    return said.all.emplace(&type, message).second;
+}
+
+void warnOnce(const Class& type, const char* message) {
+    if (isFirst(type, message))
+        logWarningOrLine(message, type.name());
+}
+
+constexpr const char* unknownXMLIsDropped =
+    "Structs of class %@ keep no unknown XML: what was read into one is gone";
+constexpr const char* itemsAreLeftOut =
+    "Items of class %@ are not written: the class does not answer isRemovable";
+
+} // namespace
+
+bool ObjectAccess::setKept(Object& object, Key key, Value value, Ref<Error>* error) {
+    const Class& type = object.isa();
+    if (!type.isStruct() || type.property(key) != nullptr)
+        return set(object, key, std::move(value), error);
+    if (!std::exchange(hooksOf(object).hasDroppedXML, true))
+        warnOnce(type, unknownXMLIsDropped);
+    return true;
+}
+
+bool ObjectAccess::isToBeWritten(Object& item) {
+    const ObjectHooks& hooks = hooksOf(item);
+    if (hooks.isRemovable != nullptr)
+        return !send(item, *hooks.isRemovable).boolValue();
+    if (hooks.type->isStruct())
+        return true;
+    if (!std::exchange(hooks.hasLeftOutItems, true))
+        warnOnce(*hooks.type, itemsAreLeftOut);
+    return false;
 }
 
 } // namespace qx::detail

@@ -21,6 +21,8 @@ struct ObjectHooks {
     const Operation* rootObject = nullptr;
     const Operation* setParent = nullptr;
     const Operation* isRemovable = nullptr;
+    mutable bool hasDroppedXML = false; // its objects had nowhere to keep unknown XML
+    mutable bool hasLeftOutItems = false;
 
     explicit ObjectHooks(const Class& describedType);
 };
@@ -40,12 +42,27 @@ public:
     static Value send(Object& object, const Operation& operation);
     static Value send(Object& object, const Operation& operation, const Value& argument);
 
-    static Value get(const Object& object, Key key) { return object.valueForKey(key); }
+    // A value that is to be written. Structs in it stay where they are, in their owner.
+    struct Held {
+        Value value;
+        bool keepsZero; // see Property
+    };
+    static Held get(const Object& object, Key key);
+    // The value of one of the keys for unknown XML; null where the object has no such key.
+    static Value getKept(const Object& object, Key key);
     // Sets and reports what the object does not take:
     //   -222  "Unable to set value: %@ for key: %@ in class: %@"
     static bool set(Object& object, Key key, Value value, Ref<Error>* error);
+    // The same for one of the keys for unknown XML; a struct without such a key drops the value.
+    bool setKept(Object& object, Key key, Value value, Ref<Error>* error);
+
+    // Whether an item of a collection is written: when it says that it cannot be removed, as
+    // records and structs do. One that says nothing is not.
+    bool isToBeWritten(Object& item);
 
 private:
+    static SetOutcome setProperty(Object& object, Key key, const Value& value);
+
     static const Class* const records;
 
     std::unordered_map<const Class*, ObjectHooks> _known;

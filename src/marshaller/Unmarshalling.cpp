@@ -190,11 +190,13 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
     _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, target.source.element(), keep);
     if (!kept || !fits)
         return fits;
-    return ObjectAccess::set(target.object, key, kept, error);
+    return _access.setKept(target.object, key, kept, error);
 }
 
 bool Unmarshalling::adopt(Object& item, Object& parent, ErrorSlot error) {
-    if (ObjectAccess::plainRecord(item) != nullptr)
+    // A struct moves to where it is held: there is no parent to tell it, and none that it could be.
+    if (ObjectAccess::plainRecord(item) != nullptr || item.isa().isStruct() ||
+        parent.isa().isStruct())
         return true;
     const Operation* setParent = _access.hooksOf(item).setParent;
     if (setParent == nullptr)

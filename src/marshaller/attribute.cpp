@@ -40,7 +40,7 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
            Ref<Error>*) {
     const String text = textOf(value, field.valueType);
-    if (isLeftOut(field, value, text))
+    if (writing.isLeftOut(field, value, text))
         return true;
     XMLElement* const target =
         field.location().isEmpty() ? &element : writing.lastChildNamed(element, field.location());

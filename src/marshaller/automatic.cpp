@@ -20,7 +20,7 @@ bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, co
     const ClassPlan* plan = writing.classOf(value);
     if (plan == nullptr) {
         const String text = textOf(value, field.valueType);
-        if (!isLeftOut(field, value, text))
+        if (!writing.isLeftOut(field, value, text))
             element.addAttribute(field.xmlName(), text);
         return true;
     }

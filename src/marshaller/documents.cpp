@@ -2,10 +2,12 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 #include "files/Files.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
+#include "model/TypeNames.h"
 #include "xml/XMLParser.h"
 
 #include <algorithm>
@@ -14,10 +16,17 @@ using qx::Error;
 using qx::Ref;
 using qx::String;
 using qx::XMLDocument;
+using qx::detail::ClassPlan;
+using qx::detail::MappingPlan;
 
 namespace {
 
 constexpr qx::XMLOptions layout = qx::XMLPrettyPrint;
+
+void reset(Ref<Error>* error) {
+    if (error != nullptr)
+        error->reset();
+}
 
 // What is written is meant to be read by such a marshaller, too.
 qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
@@ -27,18 +36,51 @@ qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
     return options;
 }
 
+// Whether objects of the class may be of the C++ type, as far as that is known beforehand: a type
+// that nobody described may be a base of theirs.
+bool mayBe(const ClassPlan& plan, const std::type_info& type) {
+    const qx::Class* const wanted = qx::Class::described(type);
+    const qx::Class* const made = qx::Class::named(plan.classNameToInstantiate.view());
+    if (wanted == nullptr || made == nullptr)
+        return true;
+    return wanted->isStruct() ? made == wanted : made->isSubclassOf(*wanted);
+}
+
+String nameOf(const std::type_info& type) {
+    const qx::Class* const described = qx::Class::described(type);
+    return described != nullptr ? described->name() : String(qx::readableName(type));
+}
+
 // A lenient marshaller gives no object for a root that no class maps to, and no error either:
-// whoever reads in one step is told.
+// whoever reads in one step is told. So is who asks for a class, before anything is read.
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, qx::IndexedXML& document,
+                         const std::type_info& type, Ref<Error>* error) {
+    const auto root = document.root();
+    const auto noDefinition = [&] {
+        return qx::fail(error, qx::errors::noDefinitionForElement,
+                        [&] { return document.quoted(root); });
+    };
+    const ClassPlan* const plan =
+        root != qx::IndexedXML::none
+            ? MappingPlan::of(marshaller.mapping()).classForElement(document.name(root))
+            : nullptr;
+    if (plan == nullptr)
+        return noDefinition();
+    if (!mayBe(*plan, type))
+        return qx::fail(error, qx::errors::rootOfOtherClass, plan->className.string(),
+                        nameOf(type));
+    auto object = qx::detail::readDocument(marshaller, document, error);
+    if (!object && error != nullptr && !*error)
+        return noDefinition();
+    return object;
+}
+
 Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parsed& parsed,
-                         Ref<Error>* error) {
+                         const std::type_info& type, Ref<Error>* error) {
     if (!parsed)
         return nullptr;
     qx::IndexedXML document(*parsed);
-    auto object = qx::detail::readDocument(marshaller, document, error);
-    if (object || (error != nullptr && *error))
-        return object;
-    return qx::fail(error, qx::errors::noDefinitionForElement,
-                    [&] { return document.quoted(document.root()); });
+    return objectOf(marshaller, document, type, error);
 }
 
 // What no XML document can hold, or none that could be read again, raises while it is written.
@@ -53,27 +95,60 @@ Result written(Write write, Ref<Error>* error) {
 
 } // namespace
 
-Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
-    return objectOf(*this, qx::XMLParser::parseLent(xml, parseOptions(*this), error), error);
+Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, const std::type_info& type,
+                                             Ref<Error>* error) {
+    if (document == nullptr)
+        return qx::fail(error, qx::errors::noDefinitionForElement, document);
+    qx::IndexedXML read(*document);
+    return objectOf(*this, read, type, error);
 }
 
-Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error) {
+Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type_info& type) {
+    Ref<Error> error;
+    qx::fail(&error, qx::errors::rootOfOtherClass, object.classNameForMarshalling(), nameOf(type));
+    return error;
+}
+
+Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
+                                             Ref<Error>* error) {
+    reset(error);
+    return objectOf(*this, qx::XMLParser::parseLent(xml, parseOptions(*this), error), type, error);
+}
+
+Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
+                                           Ref<Error>* error) {
+    reset(error);
     auto data = qx::readFile(path, error);
     if (!data)
         return nullptr;
-    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error),
+    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error), type,
                     error);
 }
 
-Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
+Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
+                                             Ref<Error>* error) {
+    reset(error);
     auto data = qx::readStream(stream, error);
     if (!data)
         return nullptr;
-    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error),
+    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error), type,
                     error);
 }
 
+Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
+    return readString(xml, typeid(qx::Object), error);
+}
+
+Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error) {
+    return readFile(path, typeid(qx::Object), error);
+}
+
+Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
+    return readStream(stream, typeid(qx::Object), error);
+}
+
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
+    reset(error);
     const auto options = parseOptions(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     if (!document)
@@ -82,6 +157,7 @@ String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) 
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
+    reset(error);
     const auto options = parseOptions(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     const auto write = [&] { return document->writeToFile(path, layout, error, options); };
@@ -90,6 +166,7 @@ bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref
 
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
                                   Ref<Error>* error) {
+    reset(error);
     const auto options = parseOptions(*this);
     const auto document = marshall(object, error);
     const auto write = [&] { return document->writeToStream(stream, layout, error, options); };

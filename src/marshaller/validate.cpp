@@ -89,7 +89,7 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, 
     for (const auto& entry : *kept)
         lone += static_cast<const Array*>(entry.value.object())->isEmpty() ? 1 : 0;
     return fits && _budget.takeKept(lone, target.source.element(), error) &&
-           ObjectAccess::set(target.object, key, kept, error);
+           _access.setKept(target.object, key, kept, error);
 }
 
 bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
@@ -123,7 +123,7 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
             kept->add(std::move(node));
     };
     _document.forEachOfKind(XMLNodeKind::attribute, target.source.element(), keep);
-    return fits && ObjectAccess::set(target.object, key, kept, error);
+    return fits && _access.setKept(target.object, key, kept, error);
 }
 
 } // namespace qx::detail

@@ -4,6 +4,7 @@
 
 #include "base/Immortal.h"
 #include "base/PropertyNames.h"
+#include "model/TypeNames.h"
 #include "model/Warning.h"
 
 #include <algorithm>
@@ -16,8 +17,6 @@
 
 namespace qx {
 
-namespace {
-
 std::string readableName(const std::type_info& type) {
     int status = 0;
     char* demangled = abi::__cxa_demangle(type.name(), nullptr, nullptr, &status);
@@ -25,6 +24,8 @@ std::string readableName(const std::type_info& type) {
     std::free(demangled);
     return name;
 }
+
+namespace {
 
 // Adds the public bases of a class, as far as they are not among the types yet.
 void addBases(const std::type_info& type, std::vector<const std::type_info*>& types) {
@@ -86,7 +87,9 @@ struct ClassRegistry {
         auto* made =
             new Class({.name = readableName(type), .type = &type, .superclass = &typeid(Object)});
         retired.push_back(made);
-        made->_superclass.store(base, std::memory_order_relaxed);
+        // A struct cannot be cast to a base that it was not described with.
+        if (base != nullptr && !base->isStruct())
+            made->_superclass.store(base, std::memory_order_relaxed);
         standIns[&type] = {type.name(), made};
         return *made;
     }
@@ -170,8 +173,9 @@ const Operation* findOperation(const std::vector<Operation>& operations, Selecto
 
 Class::Class(detail::ClassDraft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),
-      _create(draft.create), _properties(std::move(draft.properties)),
-      _operations(std::move(draft.operations)), _classOperations(std::move(draft.classOperations)) {
+      _structType(draft.structType), _create(draft.create),
+      _properties(std::move(draft.properties)), _operations(std::move(draft.operations)),
+      _classOperations(std::move(draft.classOperations)) {
     for (const Property& property : _properties)
         detail::markAsProperty(property.key);
 }
@@ -191,7 +195,8 @@ bool Class::forget(std::string_view name) {
 }
 
 const Class& Class::ofObject(const Object& object) {
-    const std::type_info& type = typeid(object);
+    const auto* held = dynamic_cast<const detail::StructObject*>(&object);
+    const std::type_info& type = held != nullptr ? held->type() : typeid(object);
     ClassRegistry& registry = immortal<ClassRegistry>();
     if (const Class* known = registry.known(type))
         return *known;
@@ -209,11 +214,12 @@ const Class* Class::superclass() const {
     if (known != nullptr)
         return known;
     known = immortal<ClassRegistry>().nearest(*_superclassType);
-    if (known != nullptr) {
-        if (*known->_type == *_superclassType)
-            _superclass.store(known, std::memory_order_release);
+    const bool isItself = known != nullptr && *known->_type == *_superclassType;
+    if (isItself)
+        _superclass.store(known, std::memory_order_release);
+    // A struct can be cast to the base it was described with, not to that one's own.
+    if (known != nullptr && (isItself || !isStruct()))
         return known;
-    }
     static const Class* const root = &Object().isa();
     return this == root ? nullptr : root;
 }
@@ -230,10 +236,15 @@ Ref<Object> Class::create() const {
     Ref<Object> object = _create != nullptr ? _create() : Ref<Object>();
     if (object) {
         const Object& created = *object;
-        if (typeid(created) == *_type)
+        if (isStruct() || typeid(created) == *_type)
             created._isa.store(this, std::memory_order_release);
     }
     return object;
+}
+
+void Class::assignTo(const detail::StructObject& object) const noexcept {
+    const Object& held = object;
+    held._isa.store(this, std::memory_order_release);
 }
 
 const Property* Class::property(Key key) const {
@@ -287,6 +298,13 @@ void raiseArgumentCount(Selector selector, const Class& receiver, std::size_t gi
         Exception::invalidArgument,
         String::concat({"the operation ", selector.name(), " of class ", receiver.name(),
                         " does not take ", std::to_string(given), " arguments"}));
+}
+
+void raiseNoInstance(Selector selector, const Class& receiver) {
+    throw Exception(
+        Exception::invalidArgument,
+        String::concat({"the struct of class ", receiver.name(),
+                        " that is to answer the operation ", selector.name(), " was moved away"}));
 }
 
 void raiseArgument(Selector selector, const Class& receiver, const Value& value) {

@@ -61,6 +61,8 @@ inline constexpr ErrorText noExtendsWhenMarshalling{
 inline constexpr ErrorText noExtends{-211, "No extends definition for class: %@", invalidXML};
 inline constexpr ErrorText noDefinitionForElement{-211, "No definition to handle element: %@",
                                                   "Invalid Mapping"};
+inline constexpr ErrorText rootOfOtherClass{-211, "The root is of class: %@, not of class: %@",
+                                            "Invalid Mapping"};
 inline constexpr ErrorText requiredValueMissing{
     -212, "Required value missing for field: %@ in object: %@", invalidValue};
 inline constexpr ErrorText tooManyClassElements{-213, "Too many class elements in element: %@",

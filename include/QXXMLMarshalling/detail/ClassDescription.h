@@ -23,7 +23,8 @@ struct ClassDraft {
     Key name;
     const std::type_info* type = nullptr;
     const std::type_info* superclass = nullptr;
-    Ref<Object> (*create)() = nullptr; // null: not without arguments
+    const StructType* structType = nullptr; // null: of a class that derives from Object
+    Ref<Object> (*create)() = nullptr;      // null: not without arguments
     std::vector<Property> properties{};
     std::vector<Operation> operations{};
     std::vector<Operation> classOperations{};
@@ -36,6 +37,7 @@ QX_API const Class& publish(ClassDraft draft, bool listed = true);
 // Raise NSInvalidArgumentException.
 [[noreturn]] QX_API void raiseArgumentCount(Selector selector, const Class& receiver,
                                             std::size_t given);
+[[noreturn]] QX_API void raiseNoInstance(Selector selector, const Class& receiver);
 [[noreturn]] QX_API void raiseArgument(Selector selector, const Class& receiver,
                                        const Value& value);
 
@@ -64,36 +66,69 @@ template <class T>
 using Stored = std::remove_cvref_t<T>;
 
 template <class T>
-Value toValue(const T& value) {
-    return ValueTraits<Stored<T>>::toValue(value);
+Value toValue(T&& value) {
+    return ValueTraits<Stored<T>>::toValue(std::forward<T>(value));
+}
+
+// The object as a T, or the T that it holds; null where the struct was moved out.
+template <class T>
+const T* instanceIn(const Object& object) {
+    if constexpr (std::derived_from<T, Object>)
+        return static_cast<const T*>(&object);
+    else
+        return static_cast<const T*>(static_cast<const StructObject&>(object).as(typeid(T)));
+}
+template <class T>
+T* instanceIn(Object& object) {
+    return const_cast<T*>(instanceIn<T>(std::as_const(object)));
 }
 
 template <class T, auto Member>
+using Gotten = decltype(std::invoke(Member, std::declval<const T&>()));
+
+template <class T, auto Member>
 Value getMember(const Property&, const Object& object) {
-    return toValue(std::invoke(Member, static_cast<const T&>(object)));
+    const T* instance = instanceIn<T>(object);
+    return instance != nullptr ? toValue(std::invoke(Member, *instance)) : Value();
+}
+
+template <class T, auto Member>
+Value lendMember(const Property&, const Object& object) {
+    const T* instance = instanceIn<T>(object);
+    return instance != nullptr ? lend(std::invoke(Member, *instance)) : Value();
 }
 
 template <class T, auto Member>
 bool setMember(const Property&, Object& object, const Value& value) {
     using V = Stored<decltype(std::declval<T&>().*Member)>;
-    return ValueTraits<V>::fromValue(value, static_cast<T&>(object).*Member);
+    T* instance = instanceIn<T>(object);
+    return instance != nullptr && ValueTraits<V>::fromValue(value, instance->*Member);
 }
 
 template <class T, auto Setter>
 bool callSetter(const Property&, Object& object, const Value& value) {
     using V = Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
-    V converted{};
-    if (!ValueTraits<V>::fromValue(value, converted))
-        return false;
-    std::invoke(Setter, static_cast<T&>(object), std::move(converted));
-    return true;
+    T* instance = instanceIn<T>(object);
+    return instance != nullptr && convert<V>(value, [&](V&& converted) {
+               std::invoke(Setter, *instance, std::move(converted));
+           });
+}
+
+// What is known of a property by the type that its getter or member has.
+template <class T, auto Member>
+void describeGetter(Property& property) {
+    using V = Stored<Gotten<T, Member>>;
+    property.get = &getMember<T, Member>;
+    if constexpr (Lendable<V> && std::is_lvalue_reference_v<Gotten<T, Member>>)
+        property.lend = &lendMember<T, Member>;
+    property.keepsZero = isOptional<V> || !std::derived_from<T, Object>;
 }
 
 template <class T, auto Member>
 Property memberProperty(std::string_view name) {
     Property property;
     property.key = name;
-    property.get = &getMember<T, Member>;
+    describeGetter<T, Member>(property);
     if constexpr (std::is_member_object_pointer_v<decltype(Member)>) {
         using M = std::remove_reference_t<decltype(std::declval<T&>().*Member)>;
         if constexpr (!std::is_const_v<M>)
@@ -106,7 +141,7 @@ template <class T, auto Getter, auto Setter>
 Property accessorProperty(std::string_view name) {
     Property property;
     property.key = name;
-    property.get = &getMember<T, Getter>;
+    describeGetter<T, Getter>(property);
     property.set = &callSetter<T, Setter>;
     return property;
 }
@@ -133,15 +168,16 @@ Property boundProperty(std::string_view name, V (T::*getter)() const, void (T::*
     store(getter, property.getter);
     store(setter, property.setter);
     property.get = [](const Property& self, const Object& object) -> Value {
-        return toValue((static_cast<const T&>(object).*load<Getter>(self.getter))());
+        const T* instance = instanceIn<T>(object);
+        return instance != nullptr ? toValue((instance->*load<Getter>(self.getter))()) : Value();
     };
     property.set = [](const Property& self, Object& object, const Value& value) {
-        Stored<V> converted{};
-        if (!ValueTraits<Stored<V>>::fromValue(value, converted))
-            return false;
-        (static_cast<T&>(object).*load<Setter>(self.setter))(std::move(converted));
-        return true;
+        T* instance = instanceIn<T>(object);
+        return instance != nullptr && convert<Stored<V>>(value, [&](Stored<V>&& converted) {
+                   (instance->*load<Setter>(self.setter))(std::move(converted));
+               });
     };
+    property.keepsZero = isOptional<Stored<V>> || !std::derived_from<T, Object>;
     return property;
 }
 
@@ -198,7 +234,10 @@ Operation instanceOperation(std::string_view name) {
     operation.takes = &takes<first, Function>;
     operation.invoke = [](Selector selector, const Class& receiver, Object* object,
                           std::span<const Value> arguments) {
-        return call<first, Function>(selector, receiver, arguments, static_cast<T&>(*object));
+        T* instance = instanceIn<T>(*object);
+        if (instance == nullptr)
+            raiseNoInstance(selector, receiver);
+        return call<first, Function>(selector, receiver, arguments, *instance);
     };
     return operation;
 }

@@ -1,10 +1,12 @@
 #pragma once
 
-// The name of a member as the source has it. No standard way leads to it, but GCC and Clang spell a
+// The name of a member as the source has it, and where a type comes from. No standard way leads to it, but GCC and Clang spell a
 // template's arguments out in the name of the function that is being compiled:
 //
 //     GCC      … qx::detail::memberName() [with auto Member = &Point::lat; …]
 //     Clang    … qx::detail::memberName() [Member = &Point::lat]
+//
+// A type is spelt with its namespaces, "T = std::chrono::year" in both.
 
 #include <string_view>
 
@@ -19,6 +21,12 @@ constexpr std::string_view memberName() noexcept {
     name = name.substr(0, name.find_first_of(";]"));
     name = name.substr(0, name.find_last_not_of(") ") + 1);
     return name.substr(name.find_last_of(": &") + 1);
+}
+
+template <class T>
+constexpr bool isOfStandardLibrary() noexcept {
+    const std::string_view name = __PRETTY_FUNCTION__;
+    return name.find("T = std::") != std::string_view::npos;
 }
 
 } // namespace qx::detail

@@ -12,6 +12,17 @@
 //         .operation<&Invoice::setParent>("setParent:");
 //     qx::Class::define<CreditNote, Invoice>("CreditNote");         // with its base class
 //
+// A plain struct, which derives from nothing of the library's, is described in the same way. What
+// its members may be stands in ValueTraits.h; their own names are the keys unless others are given:
+//
+//     qx::Class::define<Point>("Point")
+//         .members<&Point::lat, &Point::lon, &Point::time>()
+//         .member<&Point::kind>("type")
+//         .names({{Kind::peak, "peak"}, {Kind::hut, "hut"}});
+//
+// Structs are members of others by value, and objects only while they are handled as such
+// (Boxed.h): they have no parent and no observers.
+//
 // The registry of classes is the list of what a document can bring to life: a mapping creates only
 // classes that were described. It may be read and written from any thread. A description is
 // published whole when its builder ends; a name that is taken stays with the first, and a warning
@@ -22,7 +33,9 @@
 // asked for their class from then on.
 
 #include <QXXMLMarshalling/detail/ClassDescription.h>
+#include <QXXMLMarshalling/model/Boxed.h>
 
+#include <initializer_list>
 #include <memory>
 #include <typeindex>
 
@@ -49,8 +62,12 @@ public:
     const Class* superclass() const;
     bool isSubclassOf(const Class& other) const;
 
-    // A new instance; null where the class cannot be created without arguments.
+    // A new instance, of a plain struct in a box (Boxed.h); null where the class cannot be created
+    // without arguments.
     Ref<Object> create() const;
+    // Whether it describes a plain struct, and of which type.
+    bool isStruct() const noexcept { return _structType != nullptr; }
+    const std::type_info& type() const noexcept { return *_type; }
 
     // The property of that name, inherited ones included; null when there is none.
     const Property* property(Key key) const;
@@ -68,6 +85,11 @@ public:
         const std::array<Value, sizeof...(Arguments)> values{Value(arguments)...};
         return performWithArguments(selector, values);
     }
+
+    // For the library: how structs of the class are moved, null for objects; makes an object that
+    // holds one know its class at once.
+    const detail::StructType* structType() const noexcept { return _structType; }
+    void assignTo(const detail::StructObject& object) const noexcept;
 
     // Whether setValueForKey tells observers of the property by itself: the answer of the class
     // operation "automaticallyNotifiesObserversForKey:", else true.
@@ -87,6 +109,7 @@ private:
     Key _name;
     const std::type_info* _type;
     const std::type_info* _superclassType;
+    const detail::StructType* _structType;
     mutable std::atomic<const Class*> _superclass{nullptr};
     Ref<Object> (*_create)();
     std::vector<Property> _properties;
@@ -102,6 +125,26 @@ public:
     ClassBuilder(const ClassBuilder&) = delete;
     ClassBuilder& operator=(const ClassBuilder&) = delete;
     ~ClassBuilder() { detail::publish(std::move(_draft)); }
+
+    // Data members, under their own names.
+    template <auto... Members>
+    ClassBuilder& members() {
+        (member<Members>(detail::memberName<Members>()), ...);
+        return *this;
+    }
+    // A data member under a key of its own.
+    template <auto Member>
+    ClassBuilder& member(std::string_view key) {
+        static_assert(std::is_member_object_pointer_v<decltype(Member)>, "no data member");
+        return property<Member>(key);
+    }
+    // The names of an enumeration, as EnumNames (ValueTraits.h) gives them, for every class that
+    // has members of it; of two such lists the later one holds. They are of one enumeration, else
+    // it raises NSInvalidArgumentException.
+    ClassBuilder& names(std::initializer_list<detail::NamedNumber> names) {
+        detail::nameNumbers(names);
+        return *this;
+    }
 
     // A data member, or a getter without arguments (read-only).
     template <auto Member>
@@ -146,14 +189,25 @@ private:
 
 template <class T, class Base>
 ClassBuilder<T> Class::define(std::string_view name) {
-    static_assert(std::derived_from<T, Object>, "described classes derive from qx::Object");
-    static_assert(std::derived_from<T, Base>);
     detail::ClassDraft draft;
     draft.name = name;
     draft.type = &typeid(T);
     draft.superclass = &typeid(Base);
-    if constexpr (std::is_default_constructible_v<T>)
-        draft.create = []() -> Ref<Object> { return make<T>(); };
+    if constexpr (std::derived_from<T, Object>) {
+        static_assert(std::derived_from<T, Base>);
+        if constexpr (std::is_default_constructible_v<T>)
+            draft.create = []() -> Ref<Object> { return make<T>(); };
+    } else {
+        static_assert(std::is_class_v<T>);
+        if constexpr (std::same_as<Base, Object>) {
+            draft.structType = &detail::structTypeOf<T, void>;
+        } else {
+            static_assert(std::derived_from<T, Base> && !std::derived_from<Base, Object>);
+            draft.structType = &detail::structTypeOf<T, Base>;
+        }
+        if constexpr (std::is_default_constructible_v<T> && std::move_constructible<T>)
+            draft.create = []() -> Ref<Object> { return make<Boxed<T>>(); };
+    }
     return ClassBuilder<T>(std::move(draft));
 }
 

@@ -10,7 +10,8 @@
 //
 // An error that a slot holds already counts as one of the operation that looks at the slot: it
 // stays there and the result is null, although nothing was wrong. So a slot is used for one
-// operation, or set to null before the next. Without a slot a failing operation answers the same,
+// operation, or set to null before the next; what reads or writes in one step (readFile and the
+// like) sets it to null itself. Without a slot a failing operation answers the same,
 // but for the steps of reading that say otherwise (QXXMLMarshaller.h): a collection leaves out the
 // items that fail.
 

@@ -136,6 +136,9 @@ protected:
     // False as long as nobody observes the object, waits for its end or refers to it weakly.
     bool hasObserversOrWeakRefs() const noexcept { return _extras != nullptr; }
 
+    // Whether more than one reference holds the object.
+    bool isShared() const noexcept { return _count.load(std::memory_order_acquire) != 1; }
+
 private:
     struct Extras;
     friend class Class;

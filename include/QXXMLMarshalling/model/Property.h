@@ -21,6 +21,11 @@ struct Property {
     Value (*get)(const Property&, const Object&) = nullptr;
     // False when the value is refused; null for a read-only property.
     bool (*set)(const Property&, Object&, const Value&) = nullptr;
+    // What `get` answers, but that it refers to structs instead of copying them, for as long as
+    // nobody changes the object. Null for a property without any.
+    Value (*lend)(const Property&, const Object&) = nullptr;
+    // Whether zero, false and empty text are values like any other when the object is written.
+    bool keepsZero = false;
     // Member function pointers that were only known at run time.
     Member getter{};
     Member setter{};

@@ -23,29 +23,59 @@
 //   std::vector<T>, std::set<T>, std::unordered_set<T>
 //                       arrays whose items T takes; null is refused
 //   std::array<T, N>    arrays of N such items
+//   std::unique_ptr<T>, std::shared_ptr<T>
+//                       null, and what T takes
+//   std::variant<T...>  what one of the types takes, which are tried in order; null makes it
+//                       std::monostate
+//   plain structs       structs of that class (Boxed.h); by pointer, of derived classes too
 //   Value               everything
+//
+// A type that has no traits and is a class counts as a plain struct: Class::define describes it.
 //
 // Dates, times and durations: DateTime.h.
 
+#include <QXXMLMarshalling/detail/EnumNameTable.h>
+#include <QXXMLMarshalling/detail/MemberName.h>
 #include <QXXMLMarshalling/detail/ValueReading.h>
-#include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Boxed.h>
 #include <QXXMLMarshalling/model/Value.h>
 
 #include <array>
 #include <concepts>
 #include <cstddef>
 #include <limits>
-#include <optional>
-#include <set>
 #include <string>
 #include <type_traits>
-#include <unordered_set>
 #include <vector>
 
 namespace qx {
 
+namespace detail {
 template <class T>
-struct ValueTraits;
+inline constexpr bool mayBeStruct =
+    std::is_class_v<T> && !std::derived_from<T, Object> && !isOfStandardLibrary<T>();
+} // namespace detail
+
+// A plain struct, in place of traits of its own.
+template <class T>
+struct ValueTraits {
+    static_assert(detail::mayBeStruct<T>,
+                  "this type has no qx::ValueTraits and is no plain struct (those of dates and times "
+                  "stand in model/DateTime.h)");
+
+    // A box with a copy; see detail::copyOf.
+    static Value toValue(const T& value) { return detail::copyInBox(typeid(T), &value); }
+    static Value toValue(T&& value) { return make<Boxed<T>>(std::move(value)); }
+    // Refers to the struct, for as long as it lies there.
+    static Value lend(const T& value) {
+        const Class* known = nullptr;
+        return detail::lentStruct(detail::wholeOf(value), {&typeid(T), &value}, known);
+    }
+    static bool fromValue(const Value& value, T& result) {
+        return detail::takeStruct<T>(value, [&](T&& read) { result = std::move(read); });
+    }
+    struct IsStruct;
+};
 
 // The names of an enumeration's values, for those that documents hold by name. Specialise it:
 //
@@ -142,19 +172,33 @@ struct ValueTraits<T> {
     }
 };
 
+// By name where the class that has it was given names (ClassBuilder::names), else by number.
 template <Enumeration T>
 struct ValueTraits<T> {
     using Underlying = std::underlying_type_t<T>;
     static Value toValue(T value) {
+        const auto* names = detail::namesOf<T>.load(std::memory_order_acquire);
+        if (const Key name = detail::nameOf(names, toNumber(value)); !name.isNull())
+            return name.string();
         return ValueTraits<Underlying>::toValue(static_cast<Underlying>(value));
     }
     static bool fromValue(const Value& value, T& result) {
+        if (const auto* names = detail::namesOf<T>.load(std::memory_order_acquire)) {
+            std::int64_t number = 0;
+            if (!detail::findNumber(*names, value, number))
+                return false;
+            result = static_cast<T>(number);
+            return true;
+        }
         Underlying read{};
         if (!ValueTraits<Underlying>::fromValue(value, read))
             return false;
         result = static_cast<T>(read);
         return true;
     }
+
+private:
+    static std::int64_t toNumber(T value) { return static_cast<std::int64_t>(value); }
 };
 
 template <NamedEnumeration T>
@@ -251,100 +295,6 @@ struct ValueTraits<T*> {
     }
 };
 
-template <class T>
-struct ValueTraits<std::optional<T>> {
-    static Value toValue(const std::optional<T>& value) {
-        return value ? ValueTraits<T>::toValue(*value) : Value();
-    }
-    static bool fromValue(const Value& value, std::optional<T>& result) {
-        if (value.isNull()) {
-            result.reset();
-            return true;
-        }
-        T read{};
-        if (!ValueTraits<T>::fromValue(value, read))
-            return false;
-        result = std::move(read);
-        return true;
-    }
-};
-
-namespace detail {
-
-template <class Container>
-Value arrayOf(const Container& values) {
-    auto array = make<Array>();
-    array->reserve(values.size());
-    for (const auto& value : values)
-        array->add(ValueTraits<typename Container::value_type>::toValue(value));
-    return array;
-}
-
-// Hands each item to `take`; false where one is refused.
-template <class T, class Take>
-bool readItems(const Array& array, Take take) {
-    for (const Value& item : array) {
-        T element{};
-        if (!ValueTraits<T>::fromValue(item, element))
-            return false;
-        take(std::move(element));
-    }
-    return true;
-}
-
-template <class Set>
-struct SetTraits {
-    static Value toValue(const Set& values) { return arrayOf(values); }
-    static bool fromValue(const Value& value, Set& result) {
-        const auto array = value.as<Array>();
-        Set read;
-        if (!array || !readItems<typename Set::value_type>(
-                          *array, [&](auto&& element) { read.insert(std::move(element)); }))
-            return false;
-        result = std::move(read);
-        return true;
-    }
-};
-
-} // namespace detail
-
-template <class T>
-struct ValueTraits<std::vector<T>> {
-    static Value toValue(const std::vector<T>& values) { return detail::arrayOf(values); }
-    static bool fromValue(const Value& value, std::vector<T>& result) {
-        const auto array = value.as<Array>();
-        if (!array)
-            return false;
-        std::vector<T> read;
-        read.reserve(array->count());
-        if (!detail::readItems<T>(*array, [&](T&& element) { read.push_back(std::move(element)); }))
-            return false;
-        result = std::move(read);
-        return true;
-    }
-};
-
-template <class T, std::size_t N>
-struct ValueTraits<std::array<T, N>> {
-    static Value toValue(const std::array<T, N>& values) { return detail::arrayOf(values); }
-    static bool fromValue(const Value& value, std::array<T, N>& result) {
-        const auto array = value.as<Array>();
-        std::array<T, N> read{};
-        std::size_t count = 0;
-        if (!array || array->count() != N ||
-            !detail::readItems<T>(*array, [&](T&& element) { read[count++] = std::move(element); }))
-            return false;
-        result = std::move(read);
-        return true;
-    }
-};
-
-template <class T, class Less>
-struct ValueTraits<std::set<T, Less>> : detail::SetTraits<std::set<T, Less>> {};
-template <class T, class Hash, class Equal>
-struct ValueTraits<std::unordered_set<T, Hash, Equal>>
-    : detail::SetTraits<std::unordered_set<T, Hash, Equal>> {};
-
 template <>
 struct ValueTraits<std::vector<std::byte>> {
     static Value toValue(const std::vector<std::byte>& bytes) { return detail::textOfBytes(bytes); }
@@ -354,3 +304,6 @@ struct ValueTraits<std::vector<std::byte>> {
 };
 
 } // namespace qx
+
+// Types that are made of others.
+#include <QXXMLMarshalling/detail/ContainerTraits.h>

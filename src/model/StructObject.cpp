@@ -1,0 +1,121 @@
+#include <QXXMLMarshalling/detail/StructObject.h>
+
+#include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Class.h>
+
+#include "model/TypeNames.h"
+
+namespace qx::detail {
+
+void* StructObject::upcast(void* place, const std::type_info& type) const {
+    const Class* from = &isa();
+    while (place != nullptr && from != nullptr && from->isStruct()) {
+        if (from->type() == type)
+            return place;
+        const auto toBase = from->structType()->toBase;
+        place = toBase != nullptr ? toBase(place) : nullptr;
+        from = from->superclass();
+    }
+    return nullptr;
+}
+
+StructObject* structIn(const Value& value) {
+    Object* const object = value.object();
+    if (object == nullptr || !object->isa().isStruct())
+        return nullptr;
+    auto* const held = static_cast<StructObject*>(object);
+    return held->as(held->type()) != nullptr ? held : nullptr;
+}
+
+StructObject* structIn(const Value& value, const std::type_info& type) {
+    StructObject* const held = structIn(value);
+    return held != nullptr && held->as(type) != nullptr ? held : nullptr;
+}
+
+namespace {
+
+template <class Taken>
+Taken takeWhole(StructObject& held, Taken (*StructType::*function)(void*)) {
+    const auto move = held.isa().structType()->*function;
+    if (move == nullptr)
+        return nullptr;
+    const auto source = held.isMovable() ? Ref<StructObject>(&held) : copyOf(held);
+    if (!source)
+        return nullptr;
+    Taken taken = move(source->as(source->type()));
+    source->clear();
+    return taken;
+}
+
+bool copyMembers(const StructObject& from, StructObject& to) {
+    for (const Class* type = &from.isa(); type->isStruct(); type = type->superclass())
+        for (const Property& property : type->ownProperties())
+            if (property.set != nullptr &&
+                !property.set(property, to, property.get(property, from)))
+                return false;
+    return true;
+}
+
+[[noreturn]] void raiseNoCopy(const std::type_info& type) {
+    throw Exception(Exception::invalidArgument,
+                    String::concat({"a value of type ", readableName(type),
+                                    " cannot be copied: it is not described in full"}));
+}
+
+} // namespace
+
+void* takeOnHeap(StructObject& held) { return takeWhole(held, &StructType::onHeap); }
+
+std::shared_ptr<void> takeShared(StructObject& held) {
+    auto owner = held.sharedOwner();
+    return owner ? owner : takeWhole(held, &StructType::shared);
+}
+
+Ref<StructObject> copyOf(const StructObject& held) {
+    auto copy = held.isa().create().as<StructObject>();
+    return copy && copyMembers(held, *copy) ? copy : nullptr;
+}
+
+Value copyInBox(const std::type_info& type, const void* place) {
+    const StructObject lent(type, place);
+    if (lent.isa().isStruct())
+        if (auto copy = copyOf(lent))
+            return copy;
+    raiseNoCopy(type);
+}
+
+namespace {
+
+// The class of the place that can be handled as an object: the whole struct, or else its base.
+StructPlace describedPlace(StructPlace whole, StructPlace base, const Class*& known) {
+    if (known != nullptr && known->type() == *whole.type)
+        return whole;
+    known = Class::described(*whole.type);
+    if (known != nullptr || *whole.type == *base.type)
+        return whole;
+    known = Class::described(*base.type);
+    return base;
+}
+
+Value withClass(Ref<StructObject> object, const Class* known) {
+    if (known != nullptr)
+        known->assignTo(*object);
+    return object;
+}
+
+} // namespace
+
+Value lentStruct(StructPlace whole, StructPlace base, const Class*& known) {
+    const StructPlace lent = describedPlace(whole, base, known);
+    return withClass(make<StructObject>(*lent.type, lent.place), known);
+}
+
+Value sharedStruct(StructPlace whole, StructPlace base, const std::shared_ptr<const void>& owner) {
+    const Class* known = nullptr;
+    const StructPlace shared = describedPlace(whole, base, known);
+    std::shared_ptr<void> place(std::const_pointer_cast<void>(owner),
+                                const_cast<void*>(shared.place));
+    return withClass(make<SharedStruct>(*shared.type, std::move(place)), known);
+}
+
+} // namespace qx::detail
