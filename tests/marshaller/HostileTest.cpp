@@ -59,11 +59,6 @@ TEST(Hostile, ReadingsThatMultiplyEndInAnError) {
          "makes more objects than the limit of 10016: C29"},
         {"many unknown children", twice(), nested("a", 14, repeated("<b/>", 2000)), usual,
          "keeps more nodes than the limit of 138896: a"},
-        {"copies of copies",
-         "<A><x type='Flat' container='false' node='element'/><y name='a' node='element'/></A>"
-         "<Flat/>",
-         nested("a", 120, repeated("<b/>", 2000)), usual,
-         "keeps more nodes than the limit of 145680: a"},
         {"many children that nobody wants", twice(), nested("a", 20, repeated("<b/>", 2000)),
          discard, "goes over more nodes than the limit of 806400: a"},
         {"copies for every ancestor", flattenedByAncestors(),

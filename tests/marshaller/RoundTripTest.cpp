@@ -77,6 +77,17 @@ TEST(RoundTrip, LeavesTheDocumentAloneWhereObjectsAreFlattened) {
               "<order><street>s</street><note><deep></deep></note></order>");
 }
 
+// Objects flattened by a class, by one that it extends and by one inside of it keep the same node.
+TEST(RoundTrip, WritesOnceWhatSeveralFlattenedObjectsKeep) {
+    const std::string flat = " type='Flat' container='false' node='element'";
+    const auto marshaller = scenario::marshaller(
+        "<Order xml='order' extends='Base'><a" + flat + "/></Order><Base><b" + flat +
+        "/><inner type='Inner' node='element'/></Base><Inner><c" + flat + "/></Inner><Flat/>");
+    const auto object = marshaller->readString("<order><x/><inner><y/></inner></order>");
+    EXPECT_EQ(scenario::write(*marshaller, object),
+              "<order><inner><y></y></inner><inner></inner><x></x></order>");
+}
+
 TEST(RoundTrip, WritesUnknownXMLInsideWhatAFlattenedObjectKeepsOnce) {
     const auto marshaller = scenario::marshaller(
         "<Order xml='order'><item node='element'/><before type='Flat' container='false' "
