@@ -279,17 +279,3 @@ TEST(Marshal, GivesADocumentOfVersionOneInUTF8) {
     EXPECT_EQ(document->characterEncoding(), "UTF-8");
     EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"UTF-8\"?><A></A>");
 }
-
-TEST(Marshal, RaisesForHostClassesWithoutTheReservedKeys) {
-    struct Bare : qx::Object {
-        qx::String classNameForMarshalling() const override { return "Bare"; }
-    };
-    const auto marshaller = scenario::marshaller("<class name='Bare'/>");
-    try {
-        marshaller->marshallObject(qx::make<Bare>());
-        FAIL() << "nothing was raised";
-    } catch (const qx::Exception& exception) {
-        EXPECT_STREQ(exception.name(), qx::Exception::undefinedKey);
-        EXPECT_NE(exception.reason().find("unboundChildren"), std::string_view::npos);
-    }
-}

@@ -68,6 +68,9 @@ public:
     // Whether it describes a plain struct, and of which type.
     bool isStruct() const noexcept { return _structType != nullptr; }
     const std::type_info& type() const noexcept { return *_type; }
+    // Whether it describes structs of data members only: no function of the host's fills them but
+    // constructors and ValueTraits, which must leave alone what is being read.
+    bool isPassive() const noexcept { return _isPassive; }
 
     // The property of that name, inherited ones included; null when there is none.
     const Property* property(Key key) const;
@@ -115,6 +118,7 @@ private:
     std::vector<Property> _properties;
     std::vector<Operation> _operations;
     std::vector<Operation> _classOperations;
+    bool _isPassive;
 };
 
 // Collects the description of T and publishes it when it ends, at the end of the statement.
@@ -149,7 +153,10 @@ public:
     // A data member, or a getter without arguments (read-only).
     template <auto Member>
     ClassBuilder& property(std::string_view name) {
-        _draft.properties.push_back(detail::memberProperty<T, Member>(name));
+        if constexpr (detail::HasKeys<T, Member>)
+            detail::addParts<T, Member>(_draft.properties);
+        else
+            _draft.properties.push_back(detail::memberProperty<T, Member>(name));
         return *this;
     }
     // A pair of accessors.
