@@ -29,6 +29,21 @@ const char* const orderMapping = R"(<mapping>
   </class>
 </mapping>)";
 
+Described::Described() {
+    qx::Class::define<Line>("Line")
+        .members<&Line::quantity, &Line::article, &Line::title, &Line::price>();
+    qx::Class::define<Address>("Address")
+        .members<&Address::name, &Address::street, &Address::city, &Address::country>();
+    qx::Class::define<Order>("Order")
+        .members<&Order::number, &Order::date, &Order::remark, &Order::shipTo, &Order::lines>();
+    qx::Class::define<Orders>("Orders").members<&Orders::orders>();
+}
+
+Described::~Described() {
+    for (const char* name : {"Line", "Address", "Order", "Orders"})
+        qx::Class::forget(name);
+}
+
 std::string orders(std::size_t bytes) {
     std::string xml = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<orders>\n";
     for (std::size_t i = 0; xml.size() < bytes; ++i) {

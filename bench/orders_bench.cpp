@@ -58,6 +58,21 @@ void write(benchmark::State& state) {
     besideUnit(state, xml, [&] { return !writer->writeString(object).isNull(); });
 }
 
+void readStructs(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const bench::Described described;
+    const auto reader = marshaller();
+    besideUnit(state, xml, [&] { return reader->readString<bench::Orders>(xml).hasValue(); });
+}
+
+void writeStructs(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const bench::Described described;
+    const auto writer = marshaller();
+    const auto orders = writer->readString<bench::Orders>(xml);
+    besideUnit(state, xml, [&] { return !writer->writeString(*orders).isNull(); });
+}
+
 void sizes(benchmark::internal::Benchmark* benchmark) {
     benchmark->Arg(1)
         ->Arg(10)
@@ -70,5 +85,7 @@ void sizes(benchmark::internal::Benchmark* benchmark) {
 BENCHMARK(parse)->Apply(sizes);
 BENCHMARK(read)->Apply(sizes);
 BENCHMARK(write)->Apply(sizes);
+BENCHMARK(readStructs)->Apply(sizes);
+BENCHMARK(writeStructs)->Apply(sizes);
 
 } // namespace

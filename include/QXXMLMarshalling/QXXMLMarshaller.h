@@ -56,9 +56,8 @@ public:
     bool isLenient() const noexcept { return _lenient; }
     void setLenient(bool lenient) noexcept { _lenient = lenient; }
     // Unmarshalling keeps on its object what no field consumed, under the keys "unboundChildren"
-    // and "unboundAttributes"; marshalling writes it back. An object of a host's class has to have
-    // these two keys, and "__namespaces" (below), or unmarshalling ends in -222 and marshalling in
-    // the exception of its key-value access.
+    // and "unboundAttributes"; marshalling writes it back. A class of a host's without these keys
+    // (QXUnknownXML.h brings them) keeps nothing of it, and the log says so, once for each class.
     bool saveUnknownXML() const noexcept { return _saveUnknownXML; }
     void setSaveUnknownXML(bool save) noexcept { _saveUnknownXML = save; }
     // Marshalling declares the namespaces of class mappings, and those that were read, which an

@@ -10,6 +10,8 @@
 // What stands in detail/ is for these headers alone: it may change with each version.
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/QXMappedObject.h>
+#include <QXXMLMarshalling/QXUnknownXML.h>
 #include <QXXMLMarshalling/QXXMLBindToMapping.h>
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
@@ -31,6 +33,7 @@
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
 #include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Boxed.h>
 #include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/CountedSet.h>
@@ -44,6 +47,7 @@
 #include <QXXMLMarshalling/model/Null.h>
 #include <QXXMLMarshalling/model/Object.h>
 #include <QXXMLMarshalling/model/Property.h>
+#include <QXXMLMarshalling/model/Result.h>
 #include <QXXMLMarshalling/model/Value.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/model/WeakRef.h>

@@ -117,9 +117,7 @@ Ref<XMLNode> moved(const Value& kept, XMLNodeKind kind) {
 } // namespace
 
 void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
-    static const Key childrenKey("unboundChildren");
-    static const Key attributesKey("unboundAttributes");
-    if (const auto children = ObjectAccess::getKept(object, childrenKey).as<Dictionary>()) {
+    if (const auto children = _access.getKept(object, KeptXML::children).as<Dictionary>()) {
         const auto known = _lastChildren.find(&element);
         LastChildByName* const last = known != _lastChildren.end() ? &known->second : nullptr;
         if (last != nullptr)
@@ -133,16 +131,15 @@ void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
                             last->see(*child);
                     }
     }
-    if (const auto attributes = ObjectAccess::getKept(object, attributesKey).as<Array>())
+    if (const auto attributes = _access.getKept(object, KeptXML::attributes).as<Array>())
         for (const Value& kept : *attributes)
             if (auto attribute = moved(kept, XMLNodeKind::attribute))
                 element.addAttribute(std::move(attribute));
 }
 
 // The declarations that were read take the place of the class mapping's own.
-void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) const {
-    static const Key key("__namespaces");
-    const auto kept = ObjectAccess::getKept(object, key).as<Array>();
+void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) {
+    const auto kept = _access.getKept(object, KeptXML::namespaces).as<Array>();
     if (!kept || kept->isEmpty() || !_marshaller->isUsingNamespaceURIs())
         return;
     std::vector<Ref<XMLNode>> copies;

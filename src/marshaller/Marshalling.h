@@ -44,7 +44,7 @@ private:
     bool writeOwnFields(const ClassPlan& plan, XMLElement& element, Object& object,
                         ErrorSlot error);
     void restoreUnknownXML(XMLElement& element, const Object& object);
-    void restoreNamespaces(XMLElement& element, const Object& object) const;
+    void restoreNamespaces(XMLElement& element, const Object& object);
 
     const qx::Ref<const QXXMLMarshaller> _marshaller;
     const MappingPlan& _plan;

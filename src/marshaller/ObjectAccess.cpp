@@ -1,5 +1,7 @@
 #include "marshaller/ObjectAccess.h"
 
+#include <QXXMLMarshalling/base/Exception.h>
+
 #include "base/Immortal.h"
 #include "host/Log.h"
 #include "model/Errors.h"
@@ -48,12 +50,6 @@ ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
             property->keepsZero};
 }
 
-Value ObjectAccess::getKept(const Object& object, Key key) {
-    if (object.isa().isStruct() && object.isa().property(key) == nullptr)
-        return {};
-    return object.valueForKey(key);
-}
-
 bool ObjectAccess::set(Object& object, Key key, Value value, Ref<Error>* error) {
     QXGenericRecord* record = plainRecord(object);
     if (record != nullptr && RecordFilling::add(*record, key, std::move(value)))
@@ -78,6 +74,11 @@ SetOutcome ObjectAccess::setProperty(Object& object, Key key, const Value& value
 
 namespace {
 
+Key keyOf(KeptXML what) {
+    static const Key keys[] = {"unboundChildren", "unboundAttributes", "__namespaces"};
+    return keys[static_cast<std::size_t>(what)];
+}
+
 // Whether it is the first time in the process that this is said of the class.
 bool isFirst(const Class& type, const char* message) {
     struct Said {
@@ -95,18 +96,40 @@ void warnOnce(const Class& type, const char* message) {
 }
 
 constexpr const char* unknownXMLIsDropped =
-    "Structs of class %@ keep no unknown XML: what was read into one is gone";
+    "Objects of class %@ keep no unknown XML: what their elements held of it is dropped";
 constexpr const char* itemsAreLeftOut =
     "Items of class %@ are not written: the class does not answer isRemovable";
 
 } // namespace
 
-bool ObjectAccess::setKept(Object& object, Key key, Value value, Ref<Error>* error) {
-    const Class& type = object.isa();
-    if (!type.isStruct() || type.property(key) != nullptr)
+// A class that lacks a key raises when it is read by a key that it does not take; so it is asked
+// once. A struct has the keys that it was described with, and no others.
+Value ObjectAccess::getKept(const Object& object, KeptXML what) {
+    if (&object.isa() == records)
+        return object.valueForKey(keyOf(what));
+    bool& isLacking = hooksOf(object).lacks[static_cast<std::size_t>(what)];
+    if (isLacking)
+        return {};
+    try {
+        return object.valueForKey(keyOf(what));
+    } catch (const UndefinedKeyException& exception) {
+        if (!exception.concerns(&object, keyOf(what)))
+            throw;
+        isLacking = true;
+        return {};
+    }
+}
+
+bool ObjectAccess::setKept(Object& object, KeptXML what, Value value, Ref<Error>* error) {
+    const Key key = keyOf(what);
+    if (plainRecord(object) != nullptr)
         return set(object, key, std::move(value), error);
-    if (!std::exchange(hooksOf(object).hasDroppedXML, true))
-        warnOnce(type, unknownXMLIsDropped);
+    bool& isLacking = hooksOf(object).lacks[static_cast<std::size_t>(what)];
+    const SetOutcome outcome = isLacking ? SetOutcome::unknownKey : setProperty(object, key, value);
+    if (outcome == SetOutcome::refused)
+        return fail(error, errors::unableToSetValue, value, key.string(), object.isa().name());
+    if (outcome == SetOutcome::unknownKey && !std::exchange(isLacking, true))
+        warnOnce(object.isa(), unknownXMLIsDropped);
     return true;
 }
 

@@ -21,11 +21,15 @@ struct ObjectHooks {
     const Operation* rootObject = nullptr;
     const Operation* setParent = nullptr;
     const Operation* isRemovable = nullptr;
-    mutable bool hasDroppedXML = false; // its objects had nowhere to keep unknown XML
+    // What was found out meanwhile of its objects: by KeptXML, a key that they do not have.
+    mutable bool lacks[3] = {};
     mutable bool hasLeftOutItems = false;
 
     explicit ObjectHooks(const Class& describedType);
 };
+
+// What an object keeps of its element beside its fields.
+enum class KeptXML : std::uint8_t { children, attributes, namespaces };
 
 class ObjectAccess {
 public:
@@ -48,13 +52,14 @@ public:
         bool keepsZero; // see Property
     };
     static Held get(const Object& object, Key key);
-    // The value of one of the keys for unknown XML; null where the object has no such key.
-    static Value getKept(const Object& object, Key key);
+    // Null where the object has no such key.
+    Value getKept(const Object& object, KeptXML what);
     // Sets and reports what the object does not take:
     //   -222  "Unable to set value: %@ for key: %@ in class: %@"
     static bool set(Object& object, Key key, Value value, Ref<Error>* error);
-    // The same for one of the keys for unknown XML; a struct without such a key drops the value.
-    bool setKept(Object& object, Key key, Value value, Ref<Error>* error);
+    // The same, but that an object without such a key drops the value: the log says so, once for
+    // each class.
+    bool setKept(Object& object, KeptXML what, Value value, Ref<Error>* error);
 
     // Whether an item of a collection is written: when it says that it cannot be removed, as
     // records and structs do. One that says nothing is not.

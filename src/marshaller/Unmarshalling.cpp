@@ -95,7 +95,9 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
     if (error != nullptr && *error)
         return nullptr;
     QXGenericRecord* const record = ObjectAccess::plainRecord(*object);
-    const ObjectHooks* const hooks = record == nullptr ? &_access.hooksOf(*object) : nullptr;
+    // A struct is asked for nothing: it moves on once it is bound.
+    const bool isAsked = record == nullptr && !object->isa().isStruct();
+    const ObjectHooks* const hooks = isAsked ? &_access.hooksOf(*object) : nullptr;
     if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
         ObjectAccess::send(*object, *hooks->setUndoManager, _marshaller->undoManager());
 
@@ -112,7 +114,7 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
         return nullptr;
     if (record != nullptr)
         record->setNotifyBindingsObservers(true);
-    else if (hooks->setNotifyBindingsObservers != nullptr)
+    else if (isAsked && hooks->setNotifyBindingsObservers != nullptr)
         ObjectAccess::send(*object, *hooks->setNotifyBindingsObservers, true);
     return object;
 }
@@ -136,6 +138,8 @@ Ref<Object> Unmarshalling::allocate(const ClassPlan& plan) {
         record->setNotifyBindingsObservers(false);
         return object;
     }
+    if (object->isa().isStruct())
+        return object;
     const ObjectHooks& hooks = _access.hooksOf(*object);
     if (hooks.setClassNameForMarshalling != nullptr)
         ObjectAccess::send(*object, *hooks.setClassNameForMarshalling, plan.className.string());
@@ -176,7 +180,6 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
 }
 
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
-    static const Key key("__namespaces");
     Ref<Array> kept;
     bool fits = true;
     const auto keep = [&](Number declaration) {
@@ -190,7 +193,7 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
     _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, target.source.element(), keep);
     if (!kept || !fits)
         return fits;
-    return _access.setKept(target.object, key, kept, error);
+    return _access.setKept(target.object, KeptXML::namespaces, kept, error);
 }
 
 bool Unmarshalling::adopt(Object& item, Object& parent, ErrorSlot error) {

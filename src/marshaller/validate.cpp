@@ -69,7 +69,6 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
 
 // A name that is left is kept with all its elements, those that were consumed included.
 bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, ErrorSlot error) {
-    static const Key key("unboundChildren");
     auto kept = make<Dictionary>();
     for (const String& name : names.names())
         kept->set(name, make<Array>());
@@ -89,7 +88,7 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, 
     for (const auto& entry : *kept)
         lone += static_cast<const Array*>(entry.value.object())->isEmpty() ? 1 : 0;
     return fits && _budget.takeKept(lone, target.source.element(), error) &&
-           _access.setKept(target.object, key, kept, error);
+           _access.setKept(target.object, KeptXML::children, kept, error);
 }
 
 bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
@@ -111,7 +110,6 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
 }
 
 bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error) {
-    static const Key key("unboundAttributes");
     auto kept = make<Array>();
     bool fits = true;
     const auto keep = [&](Number attribute) {
@@ -123,7 +121,7 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
             kept->add(std::move(node));
     };
     _document.forEachOfKind(XMLNodeKind::attribute, target.source.element(), keep);
-    return fits && _access.setKept(target.object, key, kept, error);
+    return fits && _access.setKept(target.object, KeptXML::attributes, kept, error);
 }
 
 } // namespace qx::detail

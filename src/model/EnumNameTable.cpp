@@ -47,7 +47,7 @@ Key nameOf(const EnumNameTable* names, std::int64_t number) {
 
 bool findNumber(const EnumNameTable& names, const Value& value, std::int64_t& number) {
     for (const auto& [known, name] : names) {
-        if (value.isString() ? name.string() == value.string() : value == Value(known)) {
+        if (value.isString() ? name.view() == value.view() : value == Value(known)) {
             number = known;
             return true;
         }

@@ -44,7 +44,7 @@ bool readBoolean(const Value& value, bool& result) {
 
 bool readInteger(const Value& value, std::int64_t& result) {
     if (value.isString())
-        return readWhole(value.string(), result);
+        return readWhole(value.view(), result);
     if (!value.isNumber())
         return false;
     if (value.kind() == Value::Kind::real) {
@@ -58,7 +58,7 @@ bool readInteger(const Value& value, std::int64_t& result) {
 
 bool readUnsigned(const Value& value, std::uint64_t& result) {
     if (value.isString())
-        return readWhole(value.string(), result);
+        return readWhole(value.view(), result);
     if (!value.isNumber())
         return false;
     if (value.kind() == Value::Kind::real) {
@@ -77,8 +77,7 @@ bool readUnsigned(const Value& value, std::uint64_t& result) {
 // XML Schema's words for what is no finite number; std::from_chars has others.
 bool readReal(const Value& value, double& result) {
     if (value.isString()) {
-        const String held = value.string();
-        const std::string_view text = trimmed(held);
+        const std::string_view text = trimmed(value.view());
         double read = 0;
         if (text == "NaN")
             read = std::numeric_limits<double>::quiet_NaN();

@@ -47,7 +47,7 @@ class Owner : public qx::Object {
 public:
     std::string name;
     bool isRemovable() const { return false; }
-    qx::Value unboundChildren, unboundAttributes, namespaces;
+    QXUnknownXML unknown;
 };
 
 } // namespace
@@ -201,7 +201,7 @@ public:
     std::optional<double> cut;
     int plain = 0;
     Place place;
-    qx::Value unboundChildren, unboundAttributes, namespaces;
+    QXUnknownXML unknown;
 };
 
 class Structs : public testing::Test {
@@ -213,13 +213,11 @@ protected:
         qx::Class::define<Circle, Shape>("Circle").members<&Circle::radius>();
         qx::Class::define<Tree>("Tree").members<&Tree::name, &Tree::branches, &Tree::graft>();
         qx::Class::define<Owner>("Owner")
-            .members<&Owner::name, &Owner::unboundChildren, &Owner::unboundAttributes>()
-            .member<&Owner::namespaces>("__namespaces")
+            .members<&Owner::name, &Owner::unknown>()
             .operation<&Owner::isRemovable>("isRemovable");
         qx::Class::define<Counted>("Counted")
             .members<&Counted::zero, &Counted::cut, &Counted::plain, &Counted::place,
-                     &Counted::unboundChildren, &Counted::unboundAttributes>()
-            .member<&Counted::namespaces>("__namespaces");
+                     &Counted::unknown>();
         qx::Class::define<E>("Everything")
             .members<&E::i8, &E::i16, &E::i32, &E::i64, &E::u8, &E::u16, &E::u32, &E::u64,
                      &E::letter, &E::single, &E::real, &E::flag, &E::text, &E::shared>()
@@ -384,7 +382,7 @@ TEST_F(Structs, KeepNoUnknownXMLAndSaySoOnce) {
     for (int i = 0; i < 2; ++i)
         EXPECT_EQ(marshaller->readString<Place>(document)->zip, 1);
     const std::string log = testing::internal::GetCapturedStderr();
-    const std::string message = "Structs of class Place keep no unknown XML";
+    const std::string message = "Objects of class Place keep no unknown XML";
     const auto said = log.find(message);
     EXPECT_NE(said, std::string::npos) << log;
     EXPECT_EQ(log.find(message, said + 1), std::string::npos) << log;
@@ -487,21 +485,18 @@ TEST_F(Structs, ArePartOfRecordsAndHostClasses) {
 
 namespace {
 
-class Mute : public qx::Object {
-public:
-    qx::Value unboundChildren, unboundAttributes, namespaces;
-};
+// Answers nothing and keeps nothing.
+class Mute : public qx::Object {};
 
 } // namespace
 
 TEST_F(Structs, AreWrittenAsItemsWhereMuteClassesAreLeftOutAloud) {
-    qx::Class::define<Mute>("Mute")
-        .members<&Mute::unboundChildren, &Mute::unboundAttributes>()
-        .member<&Mute::namespaces>("__namespaces");
+    qx::Class::define<Mute>("Mute");
     const auto list = scenario::marshaller("<class name='List'><field name='all' "
                                            "collection='array'><bind-xml/></field></class>"
                                            "<class name='Mute'/><class name='Place'/>");
-    const auto read = list->readString("<list><mute/><place/><mute/></list>");
+    const auto read =
+        list->readString("<list><mute a='1' xmlns:x='urn:x'/><place/><mute><b/></mute></list>");
     testing::internal::CaptureStderr();
     EXPECT_EQ(scenario::write(*list, read), "<List><Place></Place></List>");
     EXPECT_EQ(scenario::write(*list, read), "<List><Place></Place></List>");
@@ -512,4 +507,52 @@ TEST_F(Structs, AreWrittenAsItemsWhereMuteClassesAreLeftOutAloud) {
     EXPECT_NE(said, std::string::npos) << log;
     EXPECT_EQ(log.find(message, said + 1), std::string::npos) << log;
     qx::Class::forget("Mute");
+}
+
+namespace {
+
+struct Page {
+    std::string title;
+    QXUnknownXML unknown;
+    std::vector<Page> pages;
+};
+class Leaf : public QXMappedObject {
+public:
+    std::string name;
+    std::vector<qx::Ref<Leaf>> leaves;
+};
+
+} // namespace
+
+TEST(UnknownXML, IsKeptInAMemberAndByTheBaseClass) {
+    qx::Class::define<Page>("Page").members<&Page::title, &Page::unknown, &Page::pages>();
+    qx::Class::define<Leaf, QXMappedObject>("Leaf").members<&Leaf::name, &Leaf::leaves>();
+    const auto marshaller = scenario::marshaller(
+        "<class name='Page'><map-to xml='page'/><field name='title'><bind-xml node='attribute'/>"
+        "</field><field name='pages' type='Page' collection='array'><bind-xml name='p'/></field>"
+        "</class><class name='Leaf'><map-to xml='leaf'/><field name='name'>"
+        "<bind-xml node='attribute'/></field><field name='leaves' type='Leaf' collection='array'>"
+        "<bind-xml name='leaf'/></field></class>");
+    const std::string document = R"(<page xmlns:x="urn:x" title="t" a="1"><p title="u" x:b="2">)"
+                                 R"(<c>d</c></p><e></e><e></e></page>)";
+    const auto page = marshaller->readString<Page>(document);
+    ASSERT_TRUE(page) << errorOf(page);
+    EXPECT_EQ(page->unknown.children()->count(), 1U);
+    EXPECT_TRUE(page->pages.at(0).unknown.namespaces() == nullptr);
+    const Page copy = *page;
+    EXPECT_EQ(marshaller->marshall(*page)->rootElement()->XMLString().view(), document);
+    EXPECT_EQ(marshaller->marshall(copy)->rootElement()->XMLString().view(), document)
+        << "with nodes of its own";
+
+    const std::string tree = R"(<leaf name="a" b="1"><leaf name="c"><d></d></leaf></leaf>)";
+    const auto leaf = marshaller->readString<Leaf>(tree);
+    ASSERT_TRUE(leaf) << errorOf(leaf);
+    EXPECT_EQ((*leaf)->leaves.at(0)->parent<Leaf>(), *leaf);
+    EXPECT_EQ((*leaf)->parent(), nullptr);
+    EXPECT_EQ(scenario::write(*marshaller, *leaf), tree);
+    const auto orphan = (*leaf)->leaves.at(0);
+    (*leaf)->leaves.clear();
+    EXPECT_EQ(scenario::write(*marshaller, orphan), R"(<leaf name="c"><d></d></leaf>)");
+    qx::Class::forget("Page");
+    qx::Class::forget("Leaf");
 }

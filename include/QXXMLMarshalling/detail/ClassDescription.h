@@ -16,6 +16,12 @@
 
 namespace qx {
 
+// A type of member that stands for several keys, whatever the key is that it is described with:
+// `count`, `keys[count]`, and static functions get<I>(const T&), a value, and set<I>(T&, value),
+// false where it is refused.
+template <class T>
+struct MemberKeys;
+
 namespace detail {
 
 // A class before it is published.
@@ -131,10 +137,46 @@ Property memberProperty(std::string_view name) {
     describeGetter<T, Member>(property);
     if constexpr (std::is_member_object_pointer_v<decltype(Member)>) {
         using M = std::remove_reference_t<decltype(std::declval<T&>().*Member)>;
+        property.isMember = true;
         if constexpr (!std::is_const_v<M>)
             property.set = &setMember<T, Member>;
     }
     return property;
+}
+
+// Part of a member that has keys of its own (MemberKeys).
+template <class T, auto Member, auto Get, auto Set>
+Property partProperty(Key key) {
+    Property property;
+    property.key = key;
+    property.get = [](const Property&, const Object& object) -> Value {
+        const T* instance = instanceIn<T>(object);
+        return instance != nullptr ? Value(std::invoke(Get, instance->*Member)) : Value();
+    };
+    property.set = [](const Property&, Object& object, const Value& value) {
+        T* instance = instanceIn<T>(object);
+        return instance != nullptr && std::invoke(Set, instance->*Member, value);
+    };
+    property.isMember = true;
+    return property;
+}
+
+template <class T, auto Member>
+concept HasKeys = std::is_member_object_pointer_v<decltype(Member)> && requires {
+    MemberKeys<Stored<decltype(std::declval<T&>().*Member)>>::count;
+};
+
+// The properties of a member with keys of its own.
+template <class T, auto Member>
+void addParts(std::vector<Property>& properties) {
+    using Keys = MemberKeys<Stored<decltype(std::declval<T&>().*Member)>>;
+    [&]<std::size_t... I>(std::index_sequence<I...>) {
+        (properties.push_back(
+             partProperty<T, Member, &Keys::template get<I>, &Keys::template set<I>>(
+                 Keys::keys[I])),
+         ...);
+    }
+    (std::make_index_sequence<Keys::count>{});
 }
 
 template <class T, auto Getter, auto Setter>

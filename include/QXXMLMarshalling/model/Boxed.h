@@ -11,7 +11,6 @@
 // for a key of type T gives its struct away when nobody else holds the box, and is empty then: keys
 // of an empty box read as null and take nothing.
 
-#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/detail/StructObject.h>
 
 namespace qx {
@@ -28,16 +27,6 @@ public:
     const T& operator*() const noexcept { return _value; }
     T* operator->() noexcept { return &_value; }
     const T* operator->() const noexcept { return &_value; }
-
-    static void* operator new(std::size_t size) { return detail::ObjectMemory::allocate(size); }
-    static void operator delete(void* memory) noexcept { detail::ObjectMemory::release(memory); }
-    // Of types that need more than the usual alignment.
-    static void* operator new(std::size_t size, std::align_val_t alignment) {
-        return ::operator new(size, alignment);
-    }
-    static void operator delete(void* memory, std::align_val_t alignment) noexcept {
-        ::operator delete(memory, alignment);
-    }
 
 private:
     T _value;

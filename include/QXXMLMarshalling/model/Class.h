@@ -149,7 +149,10 @@ public:
     // A data member, or a getter without arguments (read-only).
     template <auto Member>
     ClassBuilder& property(std::string_view name) {
-        _draft.properties.push_back(detail::memberProperty<T, Member>(name));
+        if constexpr (detail::HasKeys<T, Member>)
+            detail::addParts<T, Member>(_draft.properties);
+        else
+            _draft.properties.push_back(detail::memberProperty<T, Member>(name));
         return *this;
     }
     // A pair of accessors.

@@ -10,6 +10,7 @@
 //                  start, else 0. Everything else: 0.
 //   doubleValue()  likewise.
 //   string()       the text of a string; the null string for every other kind.
+//   view()         the same without a count of its own, as long as the value lives and keeps it.
 //   object()       the object; null for every other kind.
 
 #include <QXXMLMarshalling/base/String.h>
@@ -88,6 +89,9 @@ public:
     std::int64_t intValue() const noexcept;
     double doubleValue() const noexcept;
     String string() const noexcept;
+    std::string_view view() const noexcept {
+        return isString() ? _payload.text->view() : std::string_view();
+    }
     Object* object() const noexcept { return isObject() ? _payload.object : nullptr; }
     // The object as class T, or null where the value is no object of that class.
     template <class T>

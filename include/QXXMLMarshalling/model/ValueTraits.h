@@ -59,9 +59,10 @@ inline constexpr bool mayBeStruct =
 // A plain struct, in place of traits of its own.
 template <class T>
 struct ValueTraits {
-    static_assert(detail::mayBeStruct<T>,
-                  "this type has no qx::ValueTraits and is no plain struct (those of dates and times "
-                  "stand in model/DateTime.h)");
+    static_assert(
+        detail::mayBeStruct<T>,
+        "this type has no qx::ValueTraits and is no plain struct (those of dates and times "
+        "stand in model/DateTime.h)");
 
     // A box with a copy; see detail::copyOf.
     static Value toValue(const T& value) { return detail::copyInBox(typeid(T), &value); }
@@ -212,7 +213,7 @@ struct ValueTraits<T> {
     }
     static bool fromValue(const Value& value, T& result) {
         for (const EnumName<T>& known : EnumNames<T>::table) {
-            if (value.isString() ? value.string() == known.name : value == toNumber(known.value)) {
+            if (value.isString() ? value.view() == known.name : value == toNumber(known.value)) {
                 result = known.value;
                 return true;
             }
@@ -253,6 +254,10 @@ template <>
 struct ValueTraits<std::string> {
     static Value toValue(const std::string& value) { return value; }
     static bool fromValue(const Value& value, std::string& result) {
+        if (value.isString()) {
+            result.assign(value.view());
+            return true;
+        }
         String read;
         if (!detail::readText(value, read))
             return false;
