@@ -1,5 +1,6 @@
 # tests/<folder>/*.cpp    -> one GoogleTest program per folder, test_<folder>
 # tests/support/*.cpp     -> helpers, linked into those; main.cpp there replaces gtest_main
+# tests/support/lasting/*.cpp -> linked into those that are linked with the folder of that name
 # docs/samples/*.cpp      -> the samples of the pages in docs/, in test_docs too
 # tests/programs/*.cpp    -> one small program each over the shared library, program_<name>
 # tests/checks/*.sh       -> scripts, called with the build folder and the source folder
@@ -25,9 +26,7 @@ set(QX_TEST_DEFINITIONS
 file(GLOB_RECURSE support_sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/tests/support/*.cpp")
 set(main ${support_sources})
 list(FILTER main INCLUDE REGEX "/main\\.cpp$")
-set(lasting ${support_sources})
-list(FILTER lasting INCLUDE REGEX "/lasting\\.cpp$")
-list(FILTER support_sources EXCLUDE REGEX "/(main|lasting)\\.cpp$")
+list(FILTER support_sources EXCLUDE REGEX "/main\\.cpp$|/lasting/")
 
 add_library(test_support STATIC ${support} ${support_sources})
 target_precompile_headers(test_support PRIVATE
@@ -62,9 +61,12 @@ foreach(source IN LISTS sources)
             set(linked ${QX_BUILT_LAYERS})
         endif()
         qx_link_layers(${name} ${linked})
-        if(host IN_LIST linked)
-            target_sources(${name} PRIVATE ${lasting})
-        endif()
+        foreach(layer IN ITEMS host repository)
+            if(layer IN_LIST linked)
+                target_sources(${name} PRIVATE
+                    "${PROJECT_SOURCE_DIR}/tests/support/lasting/${layer}.cpp")
+            endif()
+        endforeach()
         if(folder MATCHES "^tools" AND TARGET qx_tool)
             target_link_libraries(${name} PRIVATE qx_tool)
             add_dependencies(${name} qxxml)
@@ -98,7 +100,7 @@ if(TARGET QXXMLMarshalling)
         add_dependencies(tests program_${name})
     endforeach()
     # It takes the parser's memory away.
-    target_link_libraries(program_parse_without_memory PRIVATE LibXml2::LibXml2)
+    target_link_libraries(program_without_memory PRIVATE LibXml2::LibXml2)
 
     if(QX_BUILD_EXAMPLES)
         file(GLOB demos CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/examples/*/demo")

@@ -445,7 +445,10 @@ TEST_F(HostClasses, ThatCannotBeMadeBecomeRecords) {
         scenario::marshaller("<class name='Ticket'><map-to xml='ticket'/>"
                              "<field name='purpose'><bind-xml node='attribute'/>"
                              "</field></class>");
+    testing::internal::CaptureStderr();
     EXPECT_TRUE(marshaller->readString("<ticket/>").as<QXGenericRecord>());
+    EXPECT_NE(testing::internal::GetCapturedStderr().find("Class Ticket cannot be made"),
+              std::string::npos);
     EXPECT_EQ(scenario::write(*marshaller, qx::make<Ticket>("tea")),
               R"(<ticket purpose="tea"></ticket>)");
 }

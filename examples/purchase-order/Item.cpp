@@ -12,7 +12,7 @@ std::string Money::text() const {
 
 bool Money::parse(std::string_view text, Money& result) {
     const std::size_t point = text.find('.');
-    if (point == text.npos || text.size() - point != 3)
+    if (point == std::string_view::npos || text.size() - point != 3)
         return false;
     std::string digits(text);
     digits.erase(point, 1);

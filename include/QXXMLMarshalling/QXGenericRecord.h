@@ -78,10 +78,8 @@ public:
 
     // Plain accessors of the properties: they keep what they are given and tell nobody.
     // So are undoManager() and setUndoManager(), which every UndoableObject has.
-    bool notifyBindingsObservers() const noexcept { return has(Flag::notifyBindingsObservers); }
-    void setNotifyBindingsObservers(bool notify) noexcept {
-        set(Flag::notifyBindingsObservers, notify);
-    }
+    bool notifyBindingsObservers() const noexcept { return _notifyBindingsObservers; }
+    void setNotifyBindingsObservers(bool notify) noexcept { _notifyBindingsObservers = notify; }
     // The values as they stood before the last changes, by key; empty after construction.
     qx::Ref<qx::Dictionary> changeCache() const override;
     void setChangeCache(qx::Ref<qx::Dictionary> cache) override;
@@ -121,30 +119,9 @@ protected:
 private:
     friend class qx::detail::RecordFilling;
 
-    const qx::Ref<qx::Dictionary>& filledContents() {
-        if (!_contents) {
-            _contents = qx::make<qx::Dictionary>();
-            set(Flag::filledQuietly, tracking().isIdle());
-        }
-        return _contents;
-    }
-    // False when the value has to be set the usual way; it is left alone then.
-    bool addQuietly(qx::Key key, qx::Value&& value);
-
-    enum class Flag : std::uint8_t {
-        notifyBindingsObservers = 1,
-        // The change cache lacks the keys that were added quietly: each was null before.
-        filledQuietly = 2
-    };
-    bool has(Flag flag) const noexcept {
-        return (_derivedFlags & static_cast<std::uint8_t>(flag)) != 0;
-    }
-    void set(Flag flag, bool isSet) const noexcept {
-        const unsigned others = _derivedFlags & ~static_cast<unsigned>(flag);
-        _derivedFlags =
-            static_cast<std::uint8_t>(isSet ? others | static_cast<unsigned>(flag) : others);
-    }
-
     qx::String _className;
     qx::Ref<qx::Dictionary> _contents;
+    bool _notifyBindingsObservers = true;
+    // Whether the change cache may lack keys of the contents, which were null before.
+    mutable bool _isCacheBehind = false;
 };

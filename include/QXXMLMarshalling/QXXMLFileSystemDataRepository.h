@@ -16,8 +16,6 @@
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/model/Array.h>
 
-#include <vector>
-
 class QX_API QXXMLFileSystemDataRepository : public QXXMLPersistentRepository {
 public:
     // The user default that names the bundle of the client application, whose version counts;

@@ -82,7 +82,6 @@ String String::concat(std::initializer_list<std::string_view> parts) {
     return String(rep);
 }
 
-// FNV-1a; 0 is kept free for "not worked out yet".
 namespace {
 
 // Differs from process to process, so that no document can be written whose names all meet in one
@@ -98,6 +97,7 @@ std::uint64_t hashSeed() noexcept {
 
 } // namespace
 
+// FNV-1a; 0 is kept free for "not worked out yet".
 std::uint32_t String::hashOf(std::string_view text) noexcept {
     static const std::uint64_t seed = hashSeed();
     std::uint64_t hash = seed ^ 0xcbf29ce484222325U;

@@ -10,12 +10,13 @@
 //    back to its block or to the C library.
 // 2. One live text keeps its block allocated, about a kilobyte.
 // 3. A string in a block is never resized in place.
+// 4. Texts beyond 256 bytes stand alone: they would leave much of a block unused.
 
 #include <QXXMLMarshalling/base/String.h>
 
 namespace qx {
 
-// The text in a block; beyond 256 bytes, where a block would be of no use, alone.
+// The text in a block, or alone where it is too long for one.
 String textInBlock(std::string_view text);
 
 } // namespace qx

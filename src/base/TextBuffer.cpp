@@ -1,7 +1,6 @@
 #include "base/TextBuffer.h"
 
 #include <algorithm>
-#include <new>
 
 namespace qx {
 

@@ -1,5 +1,7 @@
 #include "files/Files.h"
 
+#include <istream>
+
 #include "files/Descriptor.h"
 #include "files/Paths.h"
 #include "files/SystemErrors.h"
@@ -60,6 +62,16 @@ Ref<Data> readFile(const String& path, Ref<Error>* error, ReadableFiles readable
     if (const int errorNumber = readToEnd(file.number(), size, maximumSize, bytes))
         return failReading(error, path, errorNumber);
     return make<Data>(std::move(bytes));
+}
+
+Ref<Data> readStream(std::istream& stream, Ref<Error>* error) {
+    std::string bytes;
+    char block[16 * 1024];
+    while (stream.read(block, sizeof block) || stream.gcount() > 0)
+        bytes.append(block, static_cast<std::size_t>(stream.gcount()));
+    if (stream.eof() && !stream.bad())
+        return make<Data>(std::move(bytes));
+    return fail(error, errors::streamNotRead);
 }
 
 bool fileExists(const String& path) {

@@ -10,6 +10,8 @@
 #include <QXXMLMarshalling/model/Data.h>
 #include <QXXMLMarshalling/model/Error.h>
 
+#include <iosfwd>
+
 namespace qx {
 
 // What a document may hold at most, and what a property list or a file of texts may.
@@ -23,6 +25,9 @@ enum class ReadableFiles : std::uint8_t { all, regular };
 Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr,
                    ReadableFiles readable = ReadableFiles::all,
                    std::size_t maximumSize = largestFile);
+
+// What a stream has left; null with error 256 when it fails.
+Ref<Data> readStream(std::istream& stream, Ref<Error>* error = nullptr);
 
 // Whether anything is there, symbolic links followed.
 bool fileExists(const String& path);

@@ -24,7 +24,7 @@ String appendingPathComponent(std::string_view directory, std::string_view compo
 }
 
 String relativePath(std::string_view name) {
-    if (name.starts_with('/') || name.find('\0') != std::string_view::npos)
+    if (name.starts_with('/') || holdsZeroByte(name))
         return nullptr;
     std::string path;
     while (!name.empty()) {

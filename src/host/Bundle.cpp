@@ -33,7 +33,7 @@ String sharedFolder(const String& folder, std::string_view name) {
     return isDirectory(path) ? path : String();
 }
 
-// Null where nobody knows.
+// Null where the program's file cannot be told.
 String folderOfProgram() {
     const String program = ProcessInfo::executablePath();
     return program.isNull() ? String() : String(directoryOf(program));
@@ -83,7 +83,7 @@ Ref<Bundle> Bundle::bundleWithPath(const String& path) {
     String real = realPath(path);
     if (real.isNull())
         return nullptr;
-    OpenBundles& open = immortal<OpenBundles>();
+    auto& open = immortal<OpenBundles>();
     const auto find = [&]() -> Ref<Bundle> {
         for (const auto& bundle : open.bundles)
             if (bundle->bundlePath() == real)
@@ -110,7 +110,7 @@ Ref<Bundle> Bundle::bundleWithPath(const String& path) {
 
 Ref<Bundle> Bundle::mainBundle() {
     Ref<Bundle> bundle;
-    OpenBundles& open = immortal<OpenBundles>();
+    auto& open = immortal<OpenBundles>();
     {
         const std::lock_guard lock(open.mutex);
         bundle = open.main;
@@ -132,7 +132,7 @@ Ref<Bundle> Bundle::mainBundle() {
 }
 
 void Bundle::setMainBundle(const Ref<Bundle>& bundle) {
-    OpenBundles& open = immortal<OpenBundles>();
+    auto& open = immortal<OpenBundles>();
     Ref<Bundle> former = bundle; // ends after the lock, as do objects that the host gave it
     const std::lock_guard lock(open.mutex);
     std::swap(open.main, former);
@@ -156,7 +156,7 @@ Ref<Bundle> Bundle::bundleForClass(const std::type_info& type) {
 }
 
 void Bundle::forget(const Ref<Bundle>& bundle) {
-    OpenBundles& open = immortal<OpenBundles>();
+    auto& open = immortal<OpenBundles>();
     const std::lock_guard lock(open.mutex);
     std::erase(open.bundles, bundle);
 }
@@ -167,7 +167,7 @@ Ref<Bundle> Bundle::bundleWithIdentifier(const String& identifier) {
     for (const auto& bundle : {mainBundle(), frameworkBundle()})
         if (bundle && bundle->bundleIdentifier() == identifier)
             return bundle;
-    OpenBundles& open = immortal<OpenBundles>();
+    auto& open = immortal<OpenBundles>();
     const std::lock_guard lock(open.mutex);
     for (const auto& bundle : open.bundles)
         if (bundle->bundleIdentifier() == identifier)

@@ -53,14 +53,14 @@ void readStrings(std::string_view name, Language& language) {
     Ref<Error> error;
     const Ref<Data> data = readFile(path, &error, ReadableFiles::regular, largestResource);
     if (!data) {
-        language.problems.push_back(error);
+        language.problems.emplace_back(error);
         return;
     }
     StringsFile file = parseStrings(data->view());
     file.texts.merge(language.texts);
     std::swap(file.texts, language.texts);
     for (const std::size_t line : file.faultyLines)
-        language.problems.push_back(String::concat(
+        language.problems.emplace_back(String::concat(
             {"Unable to read the text in line ", std::to_string(line), " of ", path}));
 }
 

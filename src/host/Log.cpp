@@ -5,7 +5,6 @@
 
 #include "model/Warning.h"
 
-#include <algorithm>
 #include <ctime>
 #include <dlfcn.h>
 #include <link.h>

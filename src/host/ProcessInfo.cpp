@@ -28,7 +28,7 @@ bool isFileName(std::string_view name) {
 } // namespace
 
 String ProcessInfo::processName() {
-    State& state = immortal<State>();
+    auto& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     if (state.name.isNull()) {
         state.name = program_invocation_short_name;
@@ -42,26 +42,26 @@ void ProcessInfo::setProcessName(const String& name) {
     if (!name.isNull() && !isFileName(name))
         throw Exception(Exception::invalidArgument,
                         String::concat({"a process name is a file name, not \"", name, "\""}));
-    State& state = immortal<State>();
+    auto& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     state.name = name;
 }
 
 void ProcessInfo::setProcessVersion(const String& version, const String& build) {
-    State& state = immortal<State>();
+    auto& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     state.version = version;
     state.build = build;
 }
 
 String ProcessInfo::processVersion() {
-    State& state = immortal<State>();
+    auto& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     return state.version;
 }
 
 String ProcessInfo::processBuild() {
-    State& state = immortal<State>();
+    auto& state = immortal<State>();
     const std::lock_guard lock(state.mutex);
     return state.build;
 }

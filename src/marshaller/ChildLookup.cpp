@@ -9,146 +9,144 @@ constexpr std::size_t scanLimit = 256;
 
 } // namespace
 
+ChildLookup::ChildLookup(IndexedXML& document, Number element, Nodes nodes, std::size_t lookups)
+    : _document(document), _element(element), _nodes(nodes), _lookups(lookups) {
+    document.forEachChild(element, [&](Number child) {
+        add(document.isElement(child) ? identity(document.name(child)) : nullptr, child);
+    });
+}
+
+ChildLookup::ChildLookup(const ChildLookup& other, Nodes nodes)
+    : _document(other._document), _element(other._element), _nodes(nodes), _isCopy(true),
+      _lookups(other._lookups) {
+    for (const Child& child : other.children())
+        if (child.number != none)
+            add(child.name, child.number);
+}
+
+void ChildLookup::addToMany(const Child& child) {
+    if (_many.empty())
+        _many.assign(_few.begin(), _few.end());
+    _many.push_back(child);
+}
+
 std::unique_ptr<ChildLookup> ChildLookup::copyOf(const ChildLookup& other) {
-    auto copy = std::make_unique<ChildLookup>(other._element, nullptr, other._lookups);
-    copy->_ownCopies = std::make_unique<KeptCopies>(other._element);
-    copy->_copies = copy->_ownCopies.get();
-    copy->_children = std::make_unique<Children>();
-    copy->_children->list.reserve(other._element.childCount());
-    other.forEachChild(
-        [&](XMLNode& child) { copy->_children->list.push_back({Ref<XMLNode>(&child)}); });
-    return copy;
-}
-
-void ChildLookup::list() {
-    _children = std::make_unique<Children>();
-    _children->list.reserve(_element.childCount());
-    for (XMLNode& child : _element.children())
-        _children->list.push_back({Ref<XMLNode>(&child)});
-}
-
-void ChildLookup::index() {
-    _children->indexed = true;
-    auto& list = _children->list;
-    for (std::uint32_t i = 0; i < list.size(); ++i) {
-        if (list[i].taken || !list[i].node->isElement())
-            continue;
-        Run& run = _children->runs[list[i].node->name()];
-        if (run.first == none)
-            run.first = i;
-        else
-            list[run.last].next = i;
-        run.last = i;
-    }
+    return std::unique_ptr<ChildLookup>(new ChildLookup(other, Nodes::copied));
 }
 
 void ChildLookup::indexIfWorthIt() {
-    if (_children && _children->indexed)
+    if (_isIndexed || _lookups * children().size() <= scanLimit || _lookups < 2)
         return;
-    const std::size_t children = _children ? _children->list.size() : _element.childCount();
-    if (_lookups * children <= scanLimit || _lookups < 2)
-        return;
-    if (!_children)
-        list();
-    index();
+    _isIndexed = true;
+    const auto all = children();
+    for (std::uint32_t i = 0; i < all.size(); ++i) {
+        const Child& child = all[i];
+        if (child.number == none || child.name == nullptr)
+            continue;
+        Run& run = _runs[child.name];
+        if (run.first == none)
+            run.first = i;
+        else
+            all[run.last].next = i;
+        run.last = i;
+    }
 }
 
 template <class Visit>
 void ChildLookup::forEachNamed(const String& name, Visit visit) {
     indexIfWorthIt();
-    const auto isOne = [&](const XMLNode& node) { return node.isElement() && node.name() == name; };
-    if (!_children) {
-        for (XMLNode& child : _element.children())
-            if (isOne(child) && !visit(static_cast<XMLElement&>(child)))
-                return;
+    const Name wanted = identity(name);
+    if (_isIndexed) {
+        const auto run = _runs.find(wanted);
+        std::uint32_t at = run != _runs.end() ? run->second.first : none;
+        while (at != none && visit(children()[at].number))
+            at = children()[at].next;
         return;
     }
-    const auto& list = _children->list;
-    if (_children->indexed) {
-        const auto run = _children->runs.find(name);
-        std::uint32_t at = run != _children->runs.end() ? run->second.first : none;
-        while (at != none && visit(static_cast<XMLElement&>(*list[at].node)))
-            at = list[at].next;
-        return;
-    }
-    for (const Child& child : list)
-        if (!child.taken && isOne(*child.node) && !visit(static_cast<XMLElement&>(*child.node)))
+    for (const Child& child : children())
+        if (child.name == wanted && child.number != none && !visit(child.number))
             return;
 }
 
 ChildLookup::Found ChildLookup::find(const String& name) {
     Found found;
-    forEachNamed(name, [&](XMLElement& child) {
-        found.several = found.first != nullptr;
+    forEachNamed(name, [&](Number child) {
+        found.several = found.first != none;
         if (!found.several)
-            found.first = &child;
+            found.first = child;
         return !found.several;
     });
     return found;
 }
 
-XMLElement* ChildLookup::last(const String& name) {
-    XMLElement* last = nullptr;
-    forEachNamed(name, [&](XMLElement& child) { return (last = &child) != nullptr; });
+ChildLookup::Number ChildLookup::last(const String& name) {
+    Number last = none;
+    forEachNamed(name, [&](Number child) { return (last = child) != none; });
     return last;
 }
 
-ChildLookup::Nodes ChildLookup::all(const String& name) {
-    Nodes nodes;
-    forEachNamed(name, [&](XMLElement& child) {
-        nodes.emplace_back(&child);
+std::vector<ChildLookup::Number> ChildLookup::all(const String& name) {
+    std::vector<Number> numbers;
+    forEachNamed(name, [&](Number child) {
+        numbers.push_back(child);
         return true;
     });
-    return nodes;
+    return numbers;
 }
 
-ChildLookup::Nodes ChildLookup::all() const {
-    Nodes nodes;
-    forEachChild([&](XMLNode& child) { nodes.emplace_back(&child); });
-    return nodes;
+std::vector<ChildLookup::Number> ChildLookup::all() const {
+    std::vector<Number> numbers;
+    numbers.reserve(children().size());
+    forEachChild([&](Number child) { numbers.push_back(child); });
+    return numbers;
 }
 
 String ChildLookup::stringValue() const {
-    if (!_ownCopies)
-        return _element.stringValue();
+    if (!_isCopy)
+        return _document.text(_element);
     std::string text;
-    forEachChild([&](const XMLNode& child) {
-        if (child.isElement() || child.kind() == XMLNodeKind::text)
-            text += child.stringValue().view();
+    forEachChild([&](Number child) {
+        if (_document.isElement(child))
+            text += _document.text(child).view();
+        else if (_document.kind(child) == XMLNodeKind::text)
+            text += _document.value(child).view();
     });
     return text;
 }
 
-// An index is dropped with a child of the element itself, which it lists no longer truly.
-void ChildLookup::take(XMLElement& child) {
-    if (!_ownCopies) {
-        _children.reset();
-        child.detach();
-        return;
-    }
-    if (_children->indexed) {
-        const auto run = _children->runs.find(child.name());
-        Child& first = _children->list[run->second.first];
-        first.taken = true;
+void ChildLookup::take(Number child) {
+    if (!_isCopy)
+        _document.detach(child);
+    if (_isIndexed) {
+        const auto run = _runs.find(identity(_document.name(child)));
+        Child& first = children()[run->second.first];
+        first.number = none;
         run->second.first = first.next;
         if (first.next == none)
-            _children->runs.erase(run);
+            _runs.erase(run);
         return;
     }
-    for (Child& listed : _children->list)
-        if (listed.node.get() == &child)
-            listed.taken = true;
+    for (Child& listed : children())
+        if (listed.number == child)
+            listed.number = none;
 }
 
-Ref<XMLNode> ChildLookup::keep(XMLNode& node, ReadingBudget& budget,
-                               ReadingBudget::ErrorSlot error) const {
-    // Of an element's attributes the objects flattened into it keep the same copies: these count
-    // once, when they are made.
-    const bool isShared = _copies != nullptr && (node.kind() == XMLNodeKind::attribute ||
-                                                 node.kind() == XMLNodeKind::namespaceDeclaration);
-    if (!isShared && !budget.takeKept(1, _element, error))
-        return nullptr;
-    return _copies != nullptr ? _copies->counterpart(node, budget, error) : Ref<XMLNode>(&node);
+Ref<XMLNode> ChildLookup::keepElement(Number child, ReadingBudget& budget,
+                                      ReadingBudget::ErrorSlot error) const {
+    std::size_t nodes = 1;
+    if (_nodes == Nodes::copied && !_document.isMade(_nodes, child))
+        nodes += _document.extent(child).nodes;
+    return budget.takeKept(nodes, _element, error) ? _document.element(_nodes, child) : nullptr;
+}
+
+// Of an element's attributes the objects flattened into it keep the same copies: these count once,
+// when they are made.
+Ref<XMLNode> ChildLookup::keepAttribute(Number attribute, ReadingBudget& budget,
+                                        ReadingBudget::ErrorSlot error) const {
+    const bool counts = _nodes == Nodes::own || !_document.isMade(_nodes, attribute);
+    return budget.takeKept(counts ? 1 : 0, _element, error)
+               ? _document.attribute(_nodes, _element, attribute)
+               : nullptr;
 }
 
 } // namespace qx::detail

@@ -1,6 +1,6 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include "base/BulkObjects.h"
+#include "marshaller/Unmarshalling.h"
 #include "model/LibraryClass.h"
 
 using qx::Error;
@@ -58,34 +58,10 @@ Ref<XMLDocument> QXXMLMarshaller::marshall(const qx::Value& object, Ref<Error>* 
     return document;
 }
 
-namespace {
-
-// One group for what a reading registers. It closes however the reading ends, with the groups that
-// a host left open inside it. The group of the event around the reading stays as it is.
-class ReadingGroup {
-public:
-    explicit ReadingGroup(Ref<qx::UndoManager> manager)
-        : _manager(std::move(manager)), _level(_manager->groupingLevel()) {
-        _manager->beginUndoGrouping();
-    }
-    ~ReadingGroup() {
-        while (_manager->groupingLevel() > _level)
-            _manager->endUndoGrouping();
-    }
-    ReadingGroup(const ReadingGroup&) = delete;
-    ReadingGroup& operator=(const ReadingGroup&) = delete;
-
-private:
-    const Ref<qx::UndoManager> _manager;
-    const std::size_t _level;
-};
-
-} // namespace
-
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, Ref<Error>* error) {
-    const ReadingGroup group(undoManager());
-    const qx::BulkObjects bulk;
-    return unmarshallElement(document != nullptr ? document->rootElement() : nullptr, error);
+    auto read = document != nullptr ? qx::IndexedXML(*document)
+                                    : qx::IndexedXML(nullptr, qx::IndexedXML::Content::atOnce);
+    return qx::detail::readDocument(*this, read, error);
 }
 
 const qx::Class& QXXMLMarshaller::describedClass() const {

@@ -23,14 +23,14 @@ std::size_t total(std::size_t base, std::size_t each, std::size_t count) noexcep
     return count != 0 && each > (most - base) / count ? most : base + each * count;
 }
 
-std::size_t visitsFor(const XMLExtent& extent) noexcept {
+std::size_t visitsFor(const IndexedXML::Extent& extent) noexcept {
     return extent.nodes + extent.textSize / bytesPerVisit;
 }
 
 } // namespace
 
-ReadingBudget::ReadingBudget(const QXXMLMarshaller& marshaller, const XMLElement* root) noexcept
-    : _marshaller(marshaller), _root(root) {
+ReadingBudget::ReadingBudget(const QXXMLMarshaller& marshaller, IndexedXML& document) noexcept
+    : _marshaller(marshaller), _document(document) {
     setLimits();
 }
 
@@ -45,13 +45,13 @@ void ReadingBudget::setLimits() noexcept {
 }
 
 // Measures the document until it gives what was taken, or there is no more of it.
-bool ReadingBudget::isWithin(const Count& count) noexcept {
+bool ReadingBudget::isWithin(const Count& count) {
     while (!_isSpent && count.taken > count.limit) {
-        _isSpent = _root == nullptr || _measured.nodes < _enough;
+        _isSpent = _document.root() == IndexedXML::none || _measured.nodes < _enough;
         if (_isSpent)
             break;
         _enough = total(measuredFirst, measuredNext, _enough);
-        _measured = _root->extent(_enough);
+        _measured = _document.extent(_document.root(), _enough);
         setLimits();
     }
     return !_isSpent;
@@ -61,16 +61,18 @@ bool ReadingBudget::mayMake(const String& className, ErrorSlot error) {
     return isWithin(_objects) || fail(error, errors::tooManyObjects, _objects.limit, className);
 }
 
-bool ReadingBudget::mayKeep(const XMLElement& element, ErrorSlot error) {
-    return isWithin(_kept) || fail(error, errors::tooManyKeptNodes, _kept.limit, element.name());
+bool ReadingBudget::mayKeep(Number element, ErrorSlot error) {
+    return isWithin(_kept) ||
+           fail(error, errors::tooManyKeptNodes, _kept.limit, _document.name(element));
 }
 
-bool ReadingBudget::mayVisit(const XMLElement& element, ErrorSlot error) {
-    return isWithin(_visits) || fail(error, errors::tooManyVisits, _visits.limit, element.name());
+bool ReadingBudget::mayVisit(Number element, ErrorSlot error) {
+    return isWithin(_visits) ||
+           fail(error, errors::tooManyVisits, _visits.limit, _document.name(element));
 }
 
-bool ReadingBudget::mayJoin(const XMLElement& element, ErrorSlot error) {
-    return takeVisits(visitsFor(element.extent()), element, error);
+bool ReadingBudget::mayJoin(Number element, ErrorSlot error) {
+    return takeVisits(visitsFor(_document.extent(element)), element, error);
 }
 
 } // namespace qx::detail

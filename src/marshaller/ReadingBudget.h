@@ -7,30 +7,34 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "xml/IndexedXML.h"
+
 namespace qx::detail {
 
 class ReadingBudget {
 public:
     using ErrorSlot = Ref<Error>*;
 
-    // `root` is the element that is read, null for none; both must outlive the budget.
-    ReadingBudget(const QXXMLMarshaller& marshaller, const XMLElement* root) noexcept;
+    using Number = IndexedXML::Number;
+
+    // Both must outlive the budget.
+    ReadingBudget(const QXXMLMarshaller& marshaller, IndexedXML& document) noexcept;
 
     // False with -224, when the limit is passed. An object of that class:
     bool takeObject(const String& className, ErrorSlot error) {
         return ++_objects.taken <= _objects.limit || mayMake(className, error);
     }
     // Nodes that are kept or copied of the element:
-    bool takeKept(std::size_t nodes, const XMLElement& element, ErrorSlot error) {
+    bool takeKept(std::size_t nodes, Number element, ErrorSlot error) {
         return (_kept.taken += nodes) <= _kept.limit || mayKeep(element, error);
     }
     // Nodes of the element that are gone over:
-    bool takeVisits(std::size_t nodes, const XMLElement& element, ErrorSlot error) {
+    bool takeVisits(std::size_t nodes, Number element, ErrorSlot error) {
         return (_visits.taken += nodes) <= _visits.limit || mayVisit(element, error);
     }
     // The element's text, put together of what stands inside:
-    bool takeText(const XMLElement& element, ErrorSlot error) {
-        return element.holdsText() || element.childCount() == 0 || mayJoin(element, error);
+    bool takeText(Number element, ErrorSlot error) {
+        return _document.hasPlainText(element) || mayJoin(element, error);
     }
     bool isSpent() const noexcept { return _isSpent; }
 
@@ -42,18 +46,18 @@ private:
     };
 
     void setLimits() noexcept;
-    bool isWithin(const Count& count) noexcept;
+    bool isWithin(const Count& count);
     bool mayMake(const String& className, ErrorSlot error);
-    bool mayKeep(const XMLElement& element, ErrorSlot error);
-    bool mayVisit(const XMLElement& element, ErrorSlot error);
-    bool mayJoin(const XMLElement& element, ErrorSlot error);
+    bool mayKeep(Number element, ErrorSlot error);
+    bool mayVisit(Number element, ErrorSlot error);
+    bool mayJoin(Number element, ErrorSlot error);
 
     const QXXMLMarshaller& _marshaller;
-    const XMLElement* _root;
+    IndexedXML& _document;
     Count _objects;
     Count _kept;
     Count _visits;
-    XMLExtent _measured;
+    IndexedXML::Extent _measured;
     std::size_t _enough = 0; // nodes up to which the document was measured
     bool _isSpent = false;
 };

@@ -2,16 +2,18 @@
 
 #include <QXXMLMarshalling/model/Array.h>
 
+#include "base/BulkObjects.h"
 #include "host/Log.h"
 #include "model/Errors.h"
 
+#include <algorithm>
+
 namespace qx::detail {
 
-Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, XMLElement* root, Use use)
-    : _marshaller(&marshaller), _root(root), _plan(MappingPlan::of(marshaller.mapping())),
-      _use(use), _budget(marshaller, root), _classes(_plan.classCount() + 1),
-      _classKnown(_plan.classCount() + 1),
-      _collections(use == Use::steps || hostHasLogDebug() || hostHasLogWarning()) {}
+Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use)
+    : _marshaller(&marshaller), _document(document), _plan(MappingPlan::of(marshaller.mapping())),
+      _use(use), _budget(marshaller, document), _classes(_plan.classCount() + 1),
+      _classKnown(_plan.classCount() + 1) {}
 
 // Lends consumed names for the time of one object's binding.
 class Unmarshalling::LentNames {
@@ -35,25 +37,35 @@ private:
     ConsumedNames* _names;
 };
 
-Ref<Object> Unmarshalling::unmarshallNode(XMLNode* node, KeptCopies* copies, ErrorSlot error) {
-    XMLElement* element = node != nullptr ? node->asElement() : nullptr;
-    const ClassPlan* plan = element != nullptr ? _plan.classForElement(element->name()) : nullptr;
-    if (plan != nullptr)
-        return build(*plan, *element, copies, error);
-    if (_marshaller->isLenient())
-        return nullptr;
-    return fail(error, errors::noDefinitionForElement, node);
+const ClassPlan* Unmarshalling::classForElement(Number element) {
+    const std::uint32_t name = _document.nameNumber(element);
+    if (name >= _classOfName.size())
+        _classOfName.resize(std::max<std::size_t>(name + 1, _classOfName.size() * 2));
+    KnownClass& known = _classOfName[name];
+    if (!known.isKnown)
+        known = {true, _plan.classForElement(_document.name(element))};
+    return known.plan;
 }
 
-Ref<Object> Unmarshalling::build(const ClassPlan& plan, XMLElement& element, KeptCopies* copies,
+Ref<Object> Unmarshalling::unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error) {
+    const bool isElement = node != none && _document.isElement(node);
+    const ClassPlan* plan = isElement ? classForElement(node) : nullptr;
+    if (plan != nullptr)
+        return build(*plan, node, nodes, error);
+    if (_marshaller->isLenient())
+        return nullptr;
+    return fail(error, errors::noDefinitionForElement, quoted(node));
+}
+
+Ref<Object> Unmarshalling::build(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
                                  ErrorSlot error) {
-    ChildLookup source(element, copies, plan.bindingCount);
+    ChildLookup source(_document, element, nodes, plan.bindingCount);
     return build(plan, source, false, error);
 }
 
 // A class that is flattened into itself, over whatever other classes, would never end.
-bool Unmarshalling::isBeingBound(const ClassPlan& plan, const XMLElement& element) const {
-    for (const Frame* frame = _frame; frame != nullptr && frame->element == &element;
+bool Unmarshalling::isBeingBound(const ClassPlan& plan, Number element) const {
+    for (const Frame* frame = _frame; frame != nullptr && frame->element == element;
          frame = frame->parent)
         if (frame->plan->className == plan.className)
             return true;
@@ -61,16 +73,16 @@ bool Unmarshalling::isBeingBound(const ClassPlan& plan, const XMLElement& elemen
 }
 
 bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error) {
-    const XMLElement& element = source.element();
+    const Number element = source.element();
     if (isBeingBound(plan, element))
-        return fail(error, errors::noDefinitionForElement, &element);
+        return fail(error, errors::noDefinitionForElement, quoted(element));
     const std::size_t depth = _frame != nullptr ? _frame->depth : 0;
     const std::size_t deepest = _marshaller->maximumDepth();
     // What is refused counts too: without a slot the reading goes on.
     if (!_budget.takeObject(plan.className.string(), error))
         return false;
     if (depth < deepest)
-        return _budget.takeVisits(element.childCount(), element, error);
+        return _budget.takeVisits(source.childCount(), element, error);
     return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
 }
 
@@ -89,7 +101,7 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
     if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
         ObjectAccess::send(*object, *hooks->setUndoManager, _marshaller->undoManager());
 
-    const Frame frame{&plan, &source.element(), _frame, _frame != nullptr ? _frame->depth + 1 : 1};
+    const Frame frame{&plan, source.element(), _frame, _frame != nullptr ? _frame->depth + 1 : 1};
     struct Restore {
         const Frame*& current;
         const Frame* outer;
@@ -113,8 +125,6 @@ Ref<Object> Unmarshalling::allocate(const ClassPlan& plan) {
         _classes[plan.index] = Class::named(plan.classNameToInstantiate.view());
     }
     const Class* type = _classes[plan.index];
-    if (type != nullptr && !type->isPassive())
-        _collections.hostActs();
     Ref<Object> object = type != nullptr ? type->create() : nullptr;
     if (type != nullptr && !object) {
         logWarningOrLine("Class %@ cannot be made without arguments, records stand in for it",
@@ -149,7 +159,7 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
         bool copied = false;
         for (const FieldPlan& field : walk.current().fields) {
             if (!field.isContainer && !copied) {
-                if (!_budget.takeVisits(source->firstChildCount(), source->element(), error))
+                if (!_budget.takeVisits(source->childCount(), source->element(), error))
                     return false;
                 copy = ChildLookup::copyOf(*source);
                 source = copy.get();
@@ -170,16 +180,19 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
 }
 
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
-    const auto namespaces = target.source.element().namespaces();
-    if (namespaces.empty())
-        return true;
-    auto kept = make<Array>();
-    for (XMLNode& declaration : namespaces) {
-        auto node = target.source.keep(declaration, _budget, error);
-        if (!node)
-            return false;
-        kept->add(std::move(node));
-    }
+    Ref<Array> kept;
+    bool fits = true;
+    const auto keep = [&](Number declaration) {
+        auto node = fits ? target.source.keepAttribute(declaration, _budget, error) : nullptr;
+        fits = node.get() != nullptr;
+        if (!kept)
+            kept = make<Array>();
+        if (fits)
+            kept->add(std::move(node));
+    };
+    _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, target.source.element(), keep);
+    if (!kept || !fits)
+        return fits;
     return _access.setKept(target.object, KeptXML::namespaces, kept, error);
 }
 
@@ -196,6 +209,37 @@ bool Unmarshalling::adopt(Object& item, Object& parent, ErrorSlot error) {
         return fail(error, errors::unableToSetValue, argument, "parent", item.isa().name());
     ObjectAccess::send(item, *setParent, argument);
     return true;
+}
+
+namespace {
+
+// One group for what a reading registers. It closes however the reading ends, with the groups that
+// a host left open inside it. The group of the event around the reading stays as it is.
+class ReadingGroup {
+public:
+    explicit ReadingGroup(Ref<UndoManager> manager)
+        : _manager(std::move(manager)), _level(_manager->groupingLevel()) {
+        _manager->beginUndoGrouping();
+    }
+    ~ReadingGroup() {
+        while (_manager->groupingLevel() > _level)
+            _manager->endUndoGrouping();
+    }
+    ReadingGroup(const ReadingGroup&) = delete;
+    ReadingGroup& operator=(const ReadingGroup&) = delete;
+
+private:
+    const Ref<UndoManager> _manager;
+    const std::size_t _level;
+};
+
+} // namespace
+
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
+    const ReadingGroup group(marshaller.undoManager());
+    const BulkObjects bulk;
+    return Unmarshalling(marshaller, document)
+        .unmarshallNode(document.root(), IndexedXML::Nodes::own, error);
 }
 
 } // namespace qx::detail

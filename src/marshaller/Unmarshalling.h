@@ -8,13 +8,12 @@
 // collections behave differently without.
 //
 // Between any two steps stands the code of host classes, which may change the document and the
-// marshaller, or let go of them. So the call holds both, whoever binds an element holds it (or sees
-// to it in OpenCollections), and the options are read where they count.
+// marshaller, or let go of them. So the call holds the marshaller, reads an index, which shows the
+// document as it stood at the start, and reads the options where they count.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
 #include "marshaller/ChildLookup.h"
-#include "marshaller/CollectionItems.h"
 #include "marshaller/ConsumedNames.h"
 #include "marshaller/ObjectAccess.h"
 #include "plan/MappingPlan.h"
@@ -24,6 +23,8 @@ namespace qx::detail {
 class Unmarshalling {
 public:
     using ErrorSlot = Ref<Error>*;
+    using Number = IndexedXML::Number;
+    static constexpr Number none = IndexedXML::none;
 
     // What the fields of one element consumed.
     struct Bound {
@@ -41,15 +42,15 @@ public:
     // Of a whole document's unmarshalling the counts of consumed names are its own affair; in
     // single steps they are the caller's, and left as they are by the validation.
     enum class Use : std::uint8_t { document, steps };
-    // `root` is the element that all is read from; null for none.
-    Unmarshalling(QXXMLMarshaller& marshaller, XMLElement* root, Use use = Use::document);
+    // The document must outlive the call.
+    Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
-    // `copies` are those of the lookup in which the node was found.
-    Ref<Object> unmarshallNode(XMLNode* node, KeptCopies* copies, ErrorSlot error);
+    // `nodes` are those that are kept of the element.
+    Ref<Object> unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error);
     // `source` may be shared with the object that this one is flattened into.
     Ref<Object> build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
                       ErrorSlot error);
-    Ref<Object> build(const ClassPlan& plan, XMLElement& element, KeptCopies* copies,
+    Ref<Object> build(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
                       ErrorSlot error);
     Ref<Object> allocate(const ClassPlan& plan);
     // The fields of the class and its ancestors, and what no field consumed.
@@ -62,7 +63,13 @@ public:
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
-    OpenCollections& openCollections() noexcept { return _collections; }
+    IndexedXML& document() noexcept { return _document; }
+    // The class that maps to an element of that name; null where none does.
+    const ClassPlan* classForElement(Number element);
+    // An argument of an error: the node as it is quoted.
+    auto quoted(Number node) {
+        return [this, node] { return _document.quoted(node); };
+    }
     // Tells the item of the object that is to hold it, which comes before that one gets it. False
     // when the item does not take such a parent.
     bool adopt(Object& item, Object& parent, ErrorSlot error);
@@ -71,13 +78,13 @@ private:
     // An object that is being bound, and those whose binding led to it.
     struct Frame {
         const ClassPlan* plan;
-        const XMLElement* element;
+        Number element;
         const Frame* parent;
         std::size_t depth;
     };
     class LentNames;
 
-    bool isBeingBound(const ClassPlan& plan, const XMLElement& element) const;
+    bool isBeingBound(const ClassPlan& plan, Number element) const;
     bool mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
@@ -87,7 +94,7 @@ private:
     bool keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error);
 
     const Ref<QXXMLMarshaller> _marshaller;
-    const Ref<XMLElement> _root;
+    IndexedXML& _document;
     const MappingPlan& _plan;
     const Use _use;
     ReadingBudget _budget;
@@ -95,10 +102,18 @@ private:
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
-    OpenCollections _collections;
+    // The classes behind the names of elements, by the numbers of these, looked up once.
+    struct KnownClass {
+        bool isKnown = false;
+        const ClassPlan* plan = nullptr;
+    };
+    std::vector<KnownClass> _classOfName;
     // A pool of consumed names; the first few are lent to the objects that are being bound.
     std::vector<std::unique_ptr<ConsumedNames>> _names;
     std::size_t _namesLent = 0;
 };
+
+// A whole document, in one undo group.
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error);
 
 } // namespace qx::detail

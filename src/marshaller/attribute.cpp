@@ -9,32 +9,31 @@ namespace {
 
 // The wrapper of a location is not counted as consumed, and the attribute counts for the element
 // that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
-bool read(Unmarshalling&, const FieldPlan& field, const Unmarshalling::Target& target,
+bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
-    String value;
-    const BindingPlan* tried = nullptr;
+    ChildLookup& source = target.source;
     for (const BindingPlan& binding : field.bindings) {
-        tried = &binding;
-        const XMLElement* holder = &target.source.element();
+        auto holder = source.element();
         if (!binding.location.isEmpty()) {
-            const auto found = target.source.find(binding.location);
+            const auto found = source.find(binding.location);
             if (found.several)
                 return fail(error, errors::tooManyElementsForField, binding.name,
-                            &target.source.element());
+                            reading.quoted(source.element()));
             holder = found.first;
         }
-        if (holder != nullptr)
-            value = holder->attributeValue(binding.name);
-        if (!value.isNull())
-            break;
-    }
-    if (!value.isNull()) {
-        target.bound.attributes.add(tried->name);
-        return takeValue(target.object, field, field.key, std::move(value), error);
+        const auto attribute = holder != Unmarshalling::none
+                                   ? reading.document().attribute(holder, binding.name)
+                                   : Unmarshalling::none;
+        if (attribute == Unmarshalling::none)
+            continue;
+        target.bound.attributes.add(binding.name);
+        return takeValue(target.object, field, field.key, reading.document().value(attribute),
+                         error);
     }
     if (field.isRequired)
         return fail(error, errors::requiredAttributeMissing,
-                    tried != nullptr ? tried->name : String(), &target.source.element());
+                    field.bindings.empty() ? String() : field.bindings.back().name,
+                    reading.quoted(source.element()));
     return false;
 }
 

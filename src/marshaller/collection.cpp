@@ -2,11 +2,11 @@
 
 #include <QXXMLMarshalling/model/Array.h>
 
-#include "marshaller/CollectionItems.h"
 #include "marshaller/FieldBinding.h"
 #include "model/Errors.h"
 
 #include <algorithm>
+#include <optional>
 
 namespace qx::detail {
 
@@ -14,81 +14,92 @@ namespace {
 
 using Target = Unmarshalling::Target;
 
+// What the items are made from: fixed before the first is.
+struct Items {
+    std::vector<Unmarshalling::Number> nodes;
+    bool areCounted = false; // as a whole, by their bind name or their wrapper's
+};
+
+// The wrapper's children. False where they are more than may be gone over.
+bool takeChildren(Unmarshalling& reading, Unmarshalling::Number wrapper, Items& items,
+                  Ref<Error>* error) {
+    reading.document().forEachChild(
+        wrapper, [&](Unmarshalling::Number child) { items.nodes.push_back(child); });
+    return reading.budget().takeVisits(items.nodes.size(), wrapper, error);
+}
+
 // Elements of a bind name that a class maps to are the items; of any other bind name the last
 // element is a wrapper around them. Without either, all children of the element are.
-bool findItems(Unmarshalling& reading, const FieldPlan& field, const Target& target,
-               CollectionItems& items, Ref<Error>* error) {
+bool findItems(Unmarshalling& reading, const FieldPlan& field, const Target& target, Items& items,
+               Ref<Error>* error) {
+    ChildLookup& source = target.source;
     for (const BindingPlan& binding : field.bindings) {
         if (binding.bindTo.isEmpty())
             continue;
         if (binding.classOfBindTo != nullptr) {
-            items.setNamed(target.source, binding.bindTo);
-        } else if (const XMLElement* wrapper = target.source.last(binding.bindTo)) {
-            if (!reading.budget().takeVisits(wrapper->childCount(), *wrapper, error))
+            items.nodes = source.all(binding.bindTo);
+        } else if (const auto wrapper = source.last(binding.bindTo);
+                   wrapper != Unmarshalling::none) {
+            if (!takeChildren(reading, wrapper, items, error))
                 return false;
-            items.setChildren(*wrapper);
         }
-        if (!items.isEmpty()) {
+        if (!items.nodes.empty()) {
             target.bound.fields.add(binding.bindTo);
             items.areCounted = true;
             return true;
         }
     }
-    const XMLElement& element = target.source.element();
-    if (!reading.budget().takeVisits(element.childCount(), element, error))
-        return false;
-    items.setChildren(target.source);
-    return true;
+    items.nodes = source.all();
+    return reading.budget().takeVisits(source.childCount(), source.element(), error);
 }
 
 // Items are the elements of a bind name, whatever class their own name maps to, in the element or
 // in the one wrapper that a location names. A wrapper counts instead of its items, and once found
 // it is searched by the later bindings too.
 bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Target& target,
-                     CollectionItems& items, Ref<Error>* error) {
-    std::unique_ptr<ChildLookup> wrapper;
-    ChildLookup* root = &target.source;
+                     Items& items, Ref<Error>* error) {
+    std::optional<ChildLookup> wrapper;
     for (const BindingPlan& binding : field.bindings) {
+        ChildLookup& root = wrapper ? *wrapper : target.source;
         if (!binding.location.isEmpty()) {
-            const auto found = root->find(binding.location);
-            if (found.first == nullptr)
+            const auto found = root.find(binding.location);
+            if (found.first == Unmarshalling::none)
                 continue;
             if (!found.several) {
-                if (!reading.budget().takeVisits(found.first->childCount(), *found.first, error))
+                wrapper.emplace(reading.document(), found.first, target.source.nodes(),
+                                field.bindings.size());
+                if (!reading.budget().takeVisits(wrapper->childCount(), found.first, error))
                     return false;
-                wrapper = std::make_unique<ChildLookup>(*found.first, target.source.copies(),
-                                                        field.bindings.size());
-                root = wrapper.get();
                 items.areCounted = true;
                 target.bound.fields.add(binding.location);
             }
         }
         if (!binding.bindTo.isEmpty())
-            items.setNamed(*root, binding.bindTo);
-        if (!items.isEmpty() || wrapper)
+            items.nodes = (wrapper ? *wrapper : target.source).all(binding.bindTo);
+        if (!items.nodes.empty() || wrapper)
             break;
     }
     return true;
 }
 
-// Calls make(XMLNode&) for each item, and sets the list of those that were made.
+// Calls make(Number) for each item, and sets the list of those that were made.
 template <class Make>
 bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& target,
-               CollectionItems& items, Ref<Error>* error, Make make) {
-    if (items.isEmpty())
+               const Items& items, Ref<Error>* error, Make make) {
+    if (items.nodes.empty())
         return true;
-    // Most collections are short, and alone in their element.
+    // Few may be made of very many.
     constexpr std::size_t usualSize = 16;
     auto array = qx::make<Array>();
-    array->reserve(std::min(target.source.element().childCount(), usualSize));
-    while (XMLNode* node = items.next()) {
-        const auto item = make(*node);
+    array->reserve(std::min(items.nodes.size(), usualSize));
+    for (const auto node : items.nodes) {
+        const auto item = make(node);
         if ((error != nullptr && *error) || reading.budget().isSpent())
             return false;
         if (!item)
             continue;
         if (!items.areCounted)
-            target.bound.fields.add(node->name());
+            target.bound.fields.add(reading.document().name(node));
         if (!reading.adopt(*item, target.object, error))
             return false;
         array->add(item);
@@ -104,11 +115,11 @@ bool readCollection(Unmarshalling& reading, const FieldPlan& field, const Target
         return fail(error, errors::unknownCollectionClass, field.mapping->collection());
     if (field.hasType())
         return readCollectionByType(reading, field, target, error);
-    CollectionItems items(reading.openCollections());
+    Items items;
     if (!findItems(reading, field, target, items, error))
         return false;
-    return readItems(reading, field, target, items, error, [&](XMLNode& node) {
-        return reading.unmarshallNode(&node, target.source.copies(), error);
+    return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
+        return reading.unmarshallNode(node, target.source.nodes(), error);
     });
 }
 
@@ -116,12 +127,11 @@ bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const 
                           Ref<Error>* error) {
     if (field.typeClass == nullptr)
         return fail(error, errors::noMappingForClass, field.mapping->type());
-    CollectionItems items(reading.openCollections());
+    Items items;
     if (!findItemsByType(reading, field, target, items, error))
         return false;
-    return readItems(reading, field, target, items, error, [&](XMLNode& node) {
-        return reading.build(*field.typeClass, static_cast<XMLElement&>(node),
-                             target.source.copies(), error);
+    return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
+        return reading.build(*field.typeClass, node, target.source.nodes(), error);
     });
 }
 

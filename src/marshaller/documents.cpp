@@ -4,9 +4,11 @@
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "files/Files.h"
+#include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
 #include "model/TypeNames.h"
-#include "plan/MappingPlan.h"
+#include "xml/XMLParser.h"
 
 #include <algorithm>
 
@@ -49,6 +51,38 @@ String nameOf(const std::type_info& type) {
     return described != nullptr ? described->name() : String(qx::readableName(type));
 }
 
+// A lenient marshaller gives no object for a root that no class maps to, and no error either:
+// whoever reads in one step is told. So is who asks for a class, before anything is read.
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, qx::IndexedXML& document,
+                         const std::type_info& type, Ref<Error>* error) {
+    const auto root = document.root();
+    const auto noDefinition = [&] {
+        return qx::fail(error, qx::errors::noDefinitionForElement,
+                        [&] { return document.quoted(root); });
+    };
+    const ClassPlan* const plan =
+        root != qx::IndexedXML::none
+            ? MappingPlan::of(marshaller.mapping()).classForElement(document.name(root))
+            : nullptr;
+    if (plan == nullptr)
+        return noDefinition();
+    if (!mayBe(*plan, type))
+        return qx::fail(error, qx::errors::rootOfOtherClass, plan->className.string(),
+                        nameOf(type));
+    auto object = qx::detail::readDocument(marshaller, document, error);
+    if (!object && error != nullptr && !*error)
+        return noDefinition();
+    return object;
+}
+
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parsed& parsed,
+                         const std::type_info& type, Ref<Error>* error) {
+    if (!parsed)
+        return nullptr;
+    qx::IndexedXML document(*parsed);
+    return objectOf(marshaller, document, type, error);
+}
+
 // What no XML document can hold, or none that could be read again, raises while it is written.
 template <class Result, class Write>
 Result written(Write write, Ref<Error>* error) {
@@ -61,22 +95,12 @@ Result written(Write write, Ref<Error>* error) {
 
 } // namespace
 
-// A lenient marshaller gives no object for a root that no class maps to, and no error either:
-// whoever reads in one step is told. So is who asks for a class, before anything is read.
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, const std::type_info& type,
-                                            Ref<Error>* error) {
-    auto* const root = document != nullptr ? document->rootElement() : nullptr;
-    const ClassPlan* const plan =
-        root != nullptr ? MappingPlan::of(mapping()).classForElement(root->name()) : nullptr;
-    if (plan == nullptr)
-        return qx::fail(error, qx::errors::noDefinitionForElement, root);
-    if (!mayBe(*plan, type))
-        return qx::fail(error, qx::errors::rootOfOtherClass, plan->className.string(),
-                        nameOf(type));
-    auto object = unmarshall(document, error);
-    if (!object && error != nullptr && !*error)
-        return qx::fail(error, qx::errors::noDefinitionForElement, root);
-    return object;
+                                             Ref<Error>* error) {
+    if (document == nullptr)
+        return qx::fail(error, qx::errors::noDefinitionForElement, document);
+    qx::IndexedXML read(*document);
+    return objectOf(*this, read, type, error);
 }
 
 Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type_info& type) {
@@ -86,24 +110,29 @@ Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type
 }
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
-                                            Ref<Error>* error) {
+                                             Ref<Error>* error) {
     reset(error);
-    const auto document = XMLDocument::initWithData(xml, parseOptions(*this), error);
-    return document ? unmarshall(document.get(), type, error) : nullptr;
+    return objectOf(*this, qx::XMLParser::parseLent(xml, parseOptions(*this), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
-                                          Ref<Error>* error) {
+                                           Ref<Error>* error) {
     reset(error);
-    const auto document = XMLDocument::initWithContentsOfFile(path, parseOptions(*this), error);
-    return document ? unmarshall(document.get(), type, error) : nullptr;
+    auto data = qx::readFile(path, error);
+    if (!data)
+        return nullptr;
+    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error), type,
+                    error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
-                                            Ref<Error>* error) {
+                                             Ref<Error>* error) {
     reset(error);
-    const auto document = XMLDocument::initWithStream(stream, parseOptions(*this), error);
-    return document ? unmarshall(document.get(), type, error) : nullptr;
+    auto data = qx::readStream(stream, error);
+    if (!data)
+        return nullptr;
+    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error), type,
+                    error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {

@@ -10,15 +10,16 @@ namespace {
 // The child that the field takes, null where there is none; `binding` is the last one tried. An
 // object that is flattened takes the first of several, out of the copy it is bound from, so that
 // the next one finds the next.
-bool findElement(const FieldPlan& field, const Unmarshalling::Target& target, XMLElement*& child,
+bool findElement(Unmarshalling& reading, const FieldPlan& field,
+                 const Unmarshalling::Target& target, Unmarshalling::Number& child,
                  const BindingPlan*& binding, Ref<Error>* error) {
     for (const BindingPlan& candidate : field.bindings) {
         binding = &candidate;
         const auto found = target.source.find(candidate.name);
         if (found.several && !target.isFlattened)
             return fail(error, errors::tooManyChildElements, candidate.name,
-                        &target.source.element());
-        if (found.first == nullptr)
+                        reading.quoted(target.source.element()));
+        if (found.first == Unmarshalling::none)
             continue;
         child = found.first;
         target.bound.fields.add(candidate.name);
@@ -29,30 +30,26 @@ bool findElement(const FieldPlan& field, const Unmarshalling::Target& target, XM
 
 // An object where a class is known for the field or for the child's name, else the child's text.
 Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
-              XMLElement& child, const ClassPlan* classOfElement, Ref<Error>* error) {
+              Unmarshalling::Number child, const ClassPlan* classOfElement, Ref<Error>* error) {
     const ClassPlan* plan = field.typeClass != nullptr ? field.typeClass : classOfElement;
-    if (plan != nullptr) {
-        const Ref<XMLElement> held(&child);
-        return reading.build(*plan, child, target.source.copies(), error);
-    }
-    return reading.budget().takeText(child, error) ? Value(child.stringValue()) : Value();
+    if (plan != nullptr)
+        return reading.build(*plan, child, target.source.nodes(), error);
+    return reading.budget().takeText(child, error) ? Value(reading.document().text(child))
+                                                   : Value();
 }
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
-    XMLElement* child = nullptr;
+    auto child = Unmarshalling::none;
     const BindingPlan* binding = nullptr;
-    if (!findElement(field, target, child, binding, error))
+    if (!findElement(reading, field, target, child, binding, error))
         return false;
     Value value;
     Ref<Error> problem;
-    if (child != nullptr) {
-        Ref<XMLElement> taken;
-        if (target.isFlattened) {
-            taken = Ref<XMLElement>(child);
-            target.source.take(*child);
-        }
-        value = valueOf(reading, field, target, *child, binding->classOfName, &problem);
+    if (child != Unmarshalling::none) {
+        if (target.isFlattened)
+            target.source.take(child);
+        value = valueOf(reading, field, target, child, binding->classOfName, &problem);
     }
     return setElementValue(reading, field, target, std::move(value), std::move(problem),
                            binding != nullptr ? binding->name : String(), error);
@@ -93,7 +90,8 @@ bool setElementValue(Unmarshalling& reading, const FieldPlan& field,
     if (error == nullptr || (!problem && !field.isRequired))
         return true;
     if (!problem)
-        return fail(error, errors::requiredElementMissing, name, &target.source.element());
+        return fail(error, errors::requiredElementMissing, name,
+                    reading.quoted(target.source.element()));
     *error = std::move(problem);
     return false;
 }

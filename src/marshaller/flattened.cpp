@@ -10,7 +10,7 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, ChildLookup& sourc
               Ref<Error>* error) {
     if (field.typeClass != nullptr)
         return reading.build(*field.typeClass, source, true, error);
-    const ClassPlan* plan = reading.plan().classForElement(source.element().name());
+    const ClassPlan* plan = reading.classForElement(source.element());
     if (plan != nullptr)
         return reading.build(*plan, source, false, error);
     return reading.budget().takeText(source.element(), error) ? Value(source.stringValue())

@@ -3,9 +3,11 @@
 // own, a copy for instance, gets a plan for the time of the call.
 
 #include "marshaller/FieldBinding.h"
+#include "model/Errors.h"
 
 using qx::CountedSet;
 using qx::Error;
+using qx::IndexedXML;
 using qx::Object;
 using qx::Ref;
 using qx::XMLElement;
@@ -48,9 +50,10 @@ class Step {
 public:
     Step(QXXMLMarshaller& marshaller, XMLElement& element, std::size_t lookups, CountedSet& fields,
          CountedSet& attributes)
-        : _unmarshalling(marshaller, &element, Unmarshalling::Use::steps),
-          _source(element, nullptr, lookups), _fieldSet(fields), _attributeSet(attributes),
-          _fields(fields), _attributes(attributes) {}
+        : _document(&element, IndexedXML::Content::asNeeded),
+          _unmarshalling(marshaller, _document, Unmarshalling::Use::steps),
+          _source(_document, _document.root(), IndexedXML::Nodes::own, lookups), _fieldSet(fields),
+          _attributeSet(attributes), _fields(fields), _attributes(attributes) {}
 
     // Calls bind(Unmarshalling&, const Unmarshalling::Target&).
     template <class Bind>
@@ -80,6 +83,7 @@ private:
         }
     }
 
+    IndexedXML _document;
     Unmarshalling _unmarshalling;
     ChildLookup _source;
     CountedSet& _fieldSet;
@@ -128,8 +132,12 @@ bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
 }
 
 Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>* error) {
-    return Unmarshalling(*this, element != nullptr ? element->asElement() : nullptr)
-        .unmarshallNode(element, nullptr, error);
+    if (element != nullptr && !element->isElement() && !isLenient())
+        return qx::fail(error, qx::errors::noDefinitionForElement, element);
+    IndexedXML document(element != nullptr ? element->asElement() : nullptr,
+                        IndexedXML::Content::atOnce);
+    return Unmarshalling(*this, document)
+        .unmarshallNode(document.root(), IndexedXML::Nodes::own, error);
 }
 
 Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapping,
@@ -138,15 +146,17 @@ Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapp
     if (element == nullptr)
         return nullptr;
     const PlanOfClass plan(*this, mapping);
-    ChildLookup source(*element, nullptr, (*plan).bindingCount);
-    return Unmarshalling(*this, element, Unmarshalling::Use::steps)
+    IndexedXML document(element, IndexedXML::Content::asNeeded);
+    ChildLookup source(document, document.root(), IndexedXML::Nodes::own, (*plan).bindingCount);
+    return Unmarshalling(*this, document, Unmarshalling::Use::steps)
         .build(*plan, source, isFlattened, error);
 }
 
 Ref<Object> QXXMLMarshaller::allocateClassWithMapping(const QXXMLClassMapping& mapping,
                                                       Ref<Error>*) {
     const PlanOfClass plan(*this, mapping);
-    return Unmarshalling(*this, nullptr, Unmarshalling::Use::steps).allocate(*plan);
+    IndexedXML nothing(nullptr, IndexedXML::Content::asNeeded);
+    return Unmarshalling(*this, nothing, Unmarshalling::Use::steps).allocate(*plan);
 }
 
 bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Object& object,
@@ -237,9 +247,10 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
                                           Object& object, Ref<Error>* error) {
     ConsumedNames fields(boundFields);
     ConsumedNames attributes(boundAttributes);
-    ChildLookup source(element, nullptr, 0);
+    IndexedXML document(&element, IndexedXML::Content::asNeeded);
+    ChildLookup source(document, document.root(), IndexedXML::Nodes::own, 0);
     const Ref<Object> held(&object);
-    return Unmarshalling(*this, &element, Unmarshalling::Use::steps)
+    return Unmarshalling(*this, document, Unmarshalling::Use::steps)
         .validate(nullptr, {object, source, {fields, attributes}, false}, error);
 }
 

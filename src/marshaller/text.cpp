@@ -10,29 +10,30 @@ namespace {
 // A child of one of the bind names gives its text, the element itself where there is none.
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
-    const XMLElement* holder = &target.source.element();
-    bool isChild = false;
+    ChildLookup& source = target.source;
+    auto holder = source.element();
     for (const BindingPlan& binding : field.bindings) {
         if (binding.bindTo.isEmpty())
             continue;
-        const auto found = target.source.find(binding.bindTo);
+        const auto found = source.find(binding.bindTo);
         if (found.several)
-            return fail(error, errors::tooManyChildren, binding.bindTo, &target.source.element());
-        if (found.first != nullptr) {
+            return fail(error, errors::tooManyChildren, binding.bindTo,
+                        reading.quoted(source.element()));
+        if (found.first != Unmarshalling::none) {
             target.bound.fields.add(binding.bindTo);
             holder = found.first;
-            isChild = true;
             break;
         }
     }
-    if (!reading.budget().takeText(*holder, error))
+    if (!reading.budget().takeText(holder, error))
         return false;
-    const String text = isChild ? holder->stringValue() : target.source.stringValue();
+    const bool isChild = holder != source.element();
+    const String text = isChild ? reading.document().text(holder) : source.stringValue();
     if (!text.isEmpty())
         return takeValue(target.object, field, field.key, text, error);
     if (field.isRequired)
         return fail(error, errors::requiredTextMissing, field.key.string(),
-                    &target.source.element());
+                    reading.quoted(source.element()));
     return false;
 }
 

@@ -48,17 +48,16 @@ bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorS
 // Told without a look at the children, which may be many and far away.
 bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& target) {
     return plan.bindsChildrenOnce && !target.isFlattened && !target.source.isCopy() &&
-           target.bound.fields.size() == target.source.firstChildCount() &&
-           target.bound.fields.size() == target.source.element().childCount();
+           target.bound.fields.size() == target.source.childCount();
 }
 
 bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     Unknown unknown(target.bound.fields);
-    target.source.forEachChild([&](const XMLNode& child) { unknown.see(child.name()); });
+    target.source.forEachChild([&](Number child) { unknown.see(_document.name(child)); });
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML())
-        return fail(error, errors::unknownFields, unknown.names(), target.source.element().name());
+        return fail(error, errors::unknownFields, unknown.names(), target.source.elementName());
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
     // host's log at all is asked of the warnings.
     if (hostHasLogWarning())
@@ -74,11 +73,12 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, 
     for (const String& name : names.names())
         kept->set(name, make<Array>());
     bool fits = true;
-    target.source.forEachChild([&](XMLNode& child) {
-        const Value* elements = fits && child.isElement() ? kept->find(child.name()) : nullptr;
+    target.source.forEachChild([&](Number child) {
+        const bool mayFit = fits && _document.isElement(child);
+        const Value* elements = mayFit ? kept->find(_document.name(child)) : nullptr;
         if (elements == nullptr)
             return;
-        const auto node = target.source.keep(child, _budget, error);
+        const auto node = target.source.keepElement(child, _budget, error);
         fits = node.get() != nullptr;
         if (fits)
             static_cast<Array*>(elements->object())->add(node);
@@ -92,11 +92,11 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, 
 }
 
 bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
-    const XMLElement& element = target.source.element();
+    const Number element = target.source.element();
     Unknown unknown(target.bound.attributes);
     std::size_t seen = 0;
-    element.forEachAttribute([&](const String& name, const String&) {
-        unknown.see(name);
+    _document.forEachOfKind(XMLNodeKind::attribute, element, [&](Number attribute) {
+        unknown.see(_document.name(attribute));
         ++seen;
     });
     if (!_budget.takeVisits(seen, element, error))
@@ -104,22 +104,24 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML())
-        return fail(error, errors::unknownAttributes, unknown.names(), element.name());
+        return fail(error, errors::unknownAttributes, unknown.names(), target.source.elementName());
     logWarningOrLine("Unbound attributes: %@", unknown.names());
     return keepAttributes(target, *unknown.names(), error);
 }
 
 bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error) {
     auto kept = make<Array>();
-    for (XMLNode& attribute : target.source.element().attributes()) {
-        if (!names.contains(attribute.name()))
-            continue;
-        auto node = target.source.keep(attribute, _budget, error);
-        if (!node)
-            return false;
-        kept->add(std::move(node));
-    }
-    return _access.setKept(target.object, KeptXML::attributes, kept, error);
+    bool fits = true;
+    const auto keep = [&](Number attribute) {
+        if (!fits || !names.contains(_document.name(attribute)))
+            return;
+        auto node = target.source.keepAttribute(attribute, _budget, error);
+        fits = node.get() != nullptr;
+        if (fits)
+            kept->add(std::move(node));
+    };
+    _document.forEachOfKind(XMLNodeKind::attribute, target.source.element(), keep);
+    return fits && _access.setKept(target.object, KeptXML::attributes, kept, error);
 }
 
 } // namespace qx::detail

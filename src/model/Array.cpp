@@ -46,7 +46,8 @@ const Value& Array::at(std::size_t index) const {
 Value Array::lastObject() const { return _items.empty() ? Value() : _items.back(); }
 
 bool Array::contains(const Value& value) const {
-    for (std::size_t i = 0; i < _items.size(); ++i) // an item may change the array meanwhile
+    // NOLINTNEXTLINE(modernize-loop-convert): an item may change the array meanwhile
+    for (std::size_t i = 0; i < _items.size(); ++i)
         if (Value(_items[i]).isEqual(value))
             return true;
     return false;
@@ -98,7 +99,8 @@ String Array::descriptionWithLocale(const Object* locale, std::size_t indent) co
         return Printing::cutShort;
     std::string text = indentation(indent) + "(";
     const char* separator = "\n";
-    for (std::size_t i = 0; i < _items.size(); ++i) { // an item may change the array meanwhile
+    // NOLINTNEXTLINE(modernize-loop-convert): an item may change the array meanwhile
+    for (std::size_t i = 0; i < _items.size(); ++i) {
         const Value item = _items[i]; // NOLINT(performance-unnecessary-copy-initialization)
         text += separator;
         // A nested list brings its own indentation along.
@@ -127,7 +129,8 @@ Value Array::valueForKey(Key key) const {
     auto values = make<Array>();
     values->reserve(count());
     for (const Value& each : *this) {
-        const Value item(each); // its getter may take it out
+        // NOLINTNEXTLINE(performance-unnecessary-copy-initialization): its getter may take it out
+        const Value item(each);
         const Object* object = item.isNullOrMarker() ? nullptr : item.object();
         const Value value = object != nullptr ? object->valueForKey(key) : Value();
         values->add(value.isNull() ? Value(Null::marker()) : value);
@@ -137,7 +140,8 @@ Value Array::valueForKey(Key key) const {
 
 SetOutcome Array::trySetValueForKey(const Value& value, Key key) {
     for (const Value& each : *this) {
-        const Value item(each); // its setter may take it out
+        // NOLINTNEXTLINE(performance-unnecessary-copy-initialization): its setter may take it out
+        const Value item(each);
         if (item.isNullOrMarker())
             continue;
         Object* object = item.object();

@@ -175,9 +175,7 @@ Class::Class(detail::ClassDraft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),
       _structType(draft.structType), _create(draft.create),
       _properties(std::move(draft.properties)), _operations(std::move(draft.operations)),
-      _classOperations(std::move(draft.classOperations)),
-      _isPassive(isStruct() && std::all_of(_properties.begin(), _properties.end(),
-                                           [](const Property& one) { return one.isMember; })) {
+      _classOperations(std::move(draft.classOperations)) {
     for (const Property& property : _properties)
         detail::markAsProperty(property.key);
 }

@@ -16,7 +16,7 @@ CountedSet::~CountedSet() = default;
 
 std::size_t CountedSet::positionOf(const String& name) const noexcept {
     const auto nameOf = [this](std::size_t i) -> const String& { return _entries[i].name; };
-    return _index.empty() ? nameindex::scan(_entries.size(), name, _allInterned, nameOf)
+    return _index.empty() ? nameindex::scan(_entries.size(), name, nameOf)
                           : nameindex::lookUp(_index, name, nameOf);
 }
 
@@ -29,7 +29,6 @@ void CountedSet::add(const String& name, std::size_t times) {
             makeRoom();
         position = _entries.size();
         _entries.push_back({name, 0});
-        _allInterned = _allInterned && name.isInterned();
         if (!_index.empty())
             nameindex::add(_index, name, position);
     }
@@ -73,7 +72,6 @@ bool CountedSet::take(const String& name) {
 void CountedSet::removeAll() noexcept {
     _entries.clear();
     _index.clear();
-    _allInterned = true;
     _count = 0;
 }
 

@@ -11,7 +11,6 @@ namespace qx {
 namespace {
 
 namespace chrono = std::chrono;
-using detail::nanosecondsOfSecond;
 using detail::Seconds;
 
 constexpr std::int64_t secondsOfMinute = 60;

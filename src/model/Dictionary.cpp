@@ -8,11 +8,12 @@
 #include "model/Printing.h"
 
 #include <algorithm>
-#include <iterator>
+#include <atomic>
+#include <utility>
 
 namespace qx {
 
-Dictionary::~Dictionary() = default;
+Dictionary::~Dictionary() { removeAll(); }
 
 void* Dictionary::operator new(std::size_t size) { return detail::ObjectMemory::allocate(size); }
 
@@ -28,7 +29,7 @@ inline std::size_t Dictionary::positionOf(const String& key) const noexcept {
         return nameindex::none;
     const auto keyOf = [this](std::size_t i) -> const String& { return _entries[i].key; };
     return _index ? nameindex::lookUp(*_index, key, keyOf)
-                  : nameindex::scan(_entries.size(), key, _allInterned, keyOf);
+                  : nameindex::scan(_entries.size(), key, keyOf);
 }
 
 const Value* Dictionary::find(const String& key) const noexcept {
@@ -63,41 +64,39 @@ void Dictionary::set(const String& key, Value value) {
     if (const std::size_t position = positionOf(key); position != nameindex::none) {
         // The replaced value ends last: it may lead back to this dictionary.
         const Value replaced = std::exchange(_entries[position].value, std::move(value));
-        if (replaced.isNull())
+        if (replaced.isNull()) {
             ++_count;
+            _firstLive = std::min(_firstLive, static_cast<std::uint32_t>(position));
+        }
         return;
     }
     append(key, std::move(value));
 }
 
 bool Dictionary::add(const String& key, Value&& value) {
-    // The first few keys of most dictionaries are names, which tell themselves apart.
-    const bool isFew = _allInterned && key.isInterned() && _entries.size() < fewKeys;
-    if (!isFew || value.isNull())
-        return addAny(key, std::move(value));
-    for (const Entry& entry : _entries)
-        if (entry.key.isSameAs(key))
-            return addAny(key, std::move(value));
-    changed();
-    _entries.emplace_back(key, std::move(value));
-    ++_count;
-    return true;
-}
-
-bool Dictionary::addAny(const String& key, Value&& value) {
     refuseNull(key, value);
-    if (contains(key))
+    const std::size_t position = positionOf(key);
+    if (position == nameindex::none) {
+        changed();
+        append(key, std::move(value));
+        return true;
+    }
+    if (!_entries[position].value.isNull())
         return false;
     set(key, std::move(value));
     return true;
 }
 
+// Most records hold no more keys.
+constexpr std::size_t usualSize = 4;
+
 inline void Dictionary::append(const String& key, Value&& value) {
-    static_assert(fewKeys == nameindex::scanLimit);
-    if (_index ? nameindex::isFull(*_index, _entries.size()) : _entries.size() >= fewKeys)
+    if (_index ? nameindex::isFull(*_index, _entries.size())
+               : _entries.size() >= nameindex::scanLimit)
         makeRoom();
+    if (_entries.empty())
+        _entries.reserve(usualSize);
     _entries.emplace_back(key, std::move(value));
-    _allInterned = _allInterned && key.isInterned();
     if (_index)
         nameindex::add(*_index, key, _entries.size() - 1);
     ++_count;
@@ -105,11 +104,15 @@ inline void Dictionary::append(const String& key, Value&& value) {
 
 // Gives the index twice the room, and drops the places of removed keys where they are too many.
 void Dictionary::makeRoom() {
+    // How many more keys than there are keep their places after their removal.
+    constexpr std::size_t emptyPlaces = 1000;
     const bool drops = _entries.size() - _count > _count + emptyPlaces;
     Index index = nameindex::tableFor((drops ? _count : _entries.size()) + 1);
     auto room = index.empty() ? nullptr : std::make_unique<Index>(std::move(index));
-    if (drops)
-        _entries.eraseIf([](const Entry& entry) { return entry.value.isNull(); });
+    if (drops) {
+        std::erase_if(_entries, [](const Entry& entry) { return entry.value.isNull(); });
+        _firstLive = 0;
+    }
     _index = std::move(room);
     if (!_index)
         return;
@@ -124,17 +127,22 @@ void Dictionary::remove(const String& key) {
     changed();
     --_count;
     const Value removed = std::exchange(_entries[position].value, {});
+    passRemoved();
 }
 
+// Each removed entry is passed over once, so that removing the first key again and again is linear.
+void Dictionary::passRemoved() noexcept {
+    while (_firstLive < _entries.size() && _entries[_firstLive].value.isNull())
+        ++_firstLive;
+}
+
+// What ends with its last count may lead back to this dictionary, and finds it empty.
 void Dictionary::removeAll() {
-    // What ends with its last count may lead back to this dictionary.
-    const std::vector<Entry> removed(std::make_move_iterator(_entries.begin()),
-                                     std::make_move_iterator(_entries.end()));
+    const Entries removed = std::exchange(_entries, {});
     changed();
     _count = 0;
+    _firstLive = 0;
     _index.reset();
-    _allInterned = true;
-    _entries.clear();
 }
 
 Ref<Array> Dictionary::allKeys() const {
@@ -179,8 +187,8 @@ String Dictionary::descriptionWithLocale(const Object* locale, std::size_t inden
     if (!printing.mayDescend())
         return Printing::cutShort;
     std::string text = indentation(indent) + "{\n";
-    for (std::size_t i = 0; i < _entries.size();
-         ++i) {                          // a value may change the dictionary meanwhile
+    // NOLINTNEXTLINE(modernize-loop-convert): a value may change the dictionary meanwhile
+    for (std::size_t i = 0; i < _entries.size(); ++i) {
         const Entry entry = _entries[i]; // NOLINT(performance-unnecessary-copy-initialization)
         if (entry.value.isNull())
             continue;
@@ -201,6 +209,7 @@ bool Dictionary::isEqual(const Object& other) const {
     const auto* dictionary = dynamic_cast<const Dictionary*>(&other);
     if (dictionary == nullptr || dictionary->_count != _count)
         return false;
+    // NOLINTNEXTLINE(modernize-loop-convert): as above
     for (std::size_t i = 0; i < _entries.size(); ++i) {
         const Entry entry = _entries[i]; // NOLINT(performance-unnecessary-copy-initialization)
         if (!entry.value.isNull() && !dictionary->get(entry.key).isEqual(entry.value))

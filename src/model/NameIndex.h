@@ -1,7 +1,19 @@
 #pragma once
 
-// The search that Dictionary and CountedSet share: entries stand in a vector in order; up to a
-// limit they are scanned, beyond it an open-addressing table of positions leads to them.
+// The search that Dictionary and CountedSet share: an open-addressing hash table of positions
+// beside the entries, which stand in a vector in order.
+//
+//     entries   | a | b | c | d | …
+//     index     | 0 | 3 | 0 | 1 | 2 | 0 | 4 | 0 | …     position + 1; 0 is a free slot
+//
+// 1. Up to `scanLimit` entries there is no index, and they are scanned.
+// 2. The index has a power of two of slots and is at most half full, so a search ends.
+// 3. A name stands at the slot of its hash or, where that is taken, behind it without a gap.
+// 4. No position is taken out: a removed entry keeps its place until its owner makes room, drops
+//    such entries and builds the index anew.
+//
+// With an index from the first entry on, reading orders takes 15 % more instructions
+// (bench/orders_bench.cpp, read).
 
 #include <QXXMLMarshalling/base/String.h>
 
@@ -12,17 +24,9 @@ namespace qx::nameindex {
 constexpr std::size_t scanLimit = 8;
 constexpr std::size_t none = static_cast<std::size_t>(-1);
 
-// Position of the live entry with that name; `nameOf(position)` gives each one's name. Where all
-// names are interned, `allInterned`, an interned one is told from them without a look at its text.
+// The position of the entry with that name; `nameOf(position)` gives each one's name.
 template <class NameOf>
-std::size_t scan(std::size_t entries, const String& name, bool allInterned,
-                 NameOf nameOf) noexcept {
-    // Most names are the very ones that were put in.
-    for (std::size_t i = 0; i < entries; ++i)
-        if (nameOf(i).isSameAs(name))
-            return i;
-    if (allInterned && name.isInterned())
-        return none;
+std::size_t scan(std::size_t entries, const String& name, NameOf nameOf) noexcept {
     for (std::size_t i = 0; i < entries; ++i)
         if (nameOf(i) == name)
             return i;

@@ -1,7 +1,9 @@
 #include "observe/ObservationInfo.h"
 
 #include <algorithm>
+#include <exception>
 #include <limits>
+#include <memory>
 
 namespace qx {
 

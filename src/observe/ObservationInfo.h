@@ -18,11 +18,9 @@
 #include "model/ObjectExtras.h"
 #include "observe/ObservationPath.h"
 
-#include <exception>
 #include <functional>
 #include <list>
 #include <map>
-#include <memory>
 #include <optional>
 #include <span>
 #include <tuple>

@@ -33,7 +33,7 @@ bool addChildren(const FieldPlan& field, std::vector<String>& names) {
 } // namespace
 
 void ClassPlan::summarise() {
-    // Of larger classes less is worked out.
+    // Larger classes are taken to bind children to several fields, which is always safe.
     constexpr std::size_t mostNames = 64;
     constexpr std::size_t mostLevels = 16;
     std::vector<String> children;

@@ -39,6 +39,9 @@ BindingKind bindingKindOf(const QXXMLFieldMapping& mapping) {
     return BindingKind::automatic;
 }
 
+// Names of documents that a mapping knows are interned: two that are equal are one.
+String interned(const String& name) { return Key(name).string(); }
+
 } // namespace
 
 const BindingPlan FieldPlan::noBinding;
@@ -53,10 +56,10 @@ FieldPlan FieldPlan::withoutClasses(const QXXMLFieldMapping& mapping) {
     plan.isRequired = mapping.isRequired();
     plan.isContainer = mapping.isContainer();
     for (const auto& binding : mapping.bindToMappings()) {
-        const String& bindTo = binding->bindTo();
+        const String bindTo = interned(binding->bindTo());
         plan.bindings.push_back({.bindTo = bindTo,
-                                 .name = bindTo.isEmpty() ? mapping.name() : bindTo,
-                                 .location = binding->location()});
+                                 .name = bindTo.isEmpty() ? plan.key.string() : bindTo,
+                                 .location = interned(binding->location())});
     }
     return plan;
 }

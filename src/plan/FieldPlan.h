@@ -28,7 +28,7 @@ enum class CollectionKind : std::uint8_t { none, array, unknown };
 // What a field's "type" makes of text.
 enum class ValueType : std::uint8_t { none, boolean, integer, other };
 
-// One place where a field's value may stand.
+// One place where a field's value may stand. The names are interned.
 struct BindingPlan {
     String bindTo;   // as written, null or empty where absent
     String name;     // bindTo, or the field's name where that is empty

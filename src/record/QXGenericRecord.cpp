@@ -5,9 +5,9 @@
 #include <QXXMLMarshalling/host/UserDefaults.h>
 #include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Class.h>
-#include <QXXMLMarshalling/model/Null.h>
 
 #include "model/NameList.h"
+#include "record/RecordFilling.h"
 
 #include <typeinfo>
 
@@ -17,10 +17,11 @@ using qx::Object;
 using qx::Ref;
 using qx::String;
 using qx::Value;
+using qx::detail::RecordFilling;
 
 const char* const AllowMethodForwardingInGenericRecords = "AllowMethodForwardingInGenericRecords";
 
-QXGenericRecord::QXGenericRecord() { setNotifyBindingsObservers(true); }
+QXGenericRecord::QXGenericRecord() = default;
 
 // Before the contents end.
 QXGenericRecord::~QXGenericRecord() { endUndo(); }
@@ -106,7 +107,7 @@ const qx::Class& QXGenericRecord::classObject() {
 const qx::Class& QXGenericRecord::describedClass() const { return classObject(); }
 
 Ref<QXGenericRecord> QXGenericRecord::copyWithZone() const {
-    const auto copy = isa().create().as<QXGenericRecord>();
+    auto copy = isa().create().as<QXGenericRecord>();
     const auto typeOf = [](const Object& object) -> const std::type_info& {
         return typeid(object);
     };
@@ -138,22 +139,13 @@ Value QXGenericRecord::valueForUndefinedKey(Key key) const {
     return _contents ? _contents->get(key.string()) : Value();
 }
 
-// The many first values of a record that is read from a document: nobody is told, and what there is
-// to remember, that the key had no value, can be told later from the contents.
-bool QXGenericRecord::addQuietly(Key key, Value&& value) {
-    const bool isQuiet = (has(Flag::filledQuietly) || !_contents) && tracking().isIdle() &&
-                         !hasObserversOrWeakRefs() && &isa() == &described;
-    return isQuiet && !value.isNull() && !key.view().starts_with('@') &&
-           filledContents()->add(key.string(), std::move(value));
-}
-
 void QXGenericRecord::setValueForUndefinedKey(const Value& value, Key key) {
-    filledContents();
-    if (addQuietly(key, Value(value)))
+    RecordFilling::contents(*this);
+    if (RecordFilling::addContent(*this, key, Value(value)))
         return;
     const qx::ChangeScope scope(*this, key);
     // Whoever was told may have given the record other contents.
-    if (const Ref<Dictionary> contents = filledContents(); value.isNull())
+    if (const Ref<Dictionary> contents = RecordFilling::contents(*this); value.isNull())
         contents->remove(key.string());
     else
         contents->set(key.string(), value);
@@ -172,25 +164,22 @@ String QXGenericRecord::classNameForMarshalling() const {
 }
 
 Ref<Dictionary> QXGenericRecord::changeCache() const {
-    const Ref<Dictionary> cache = UndoableObject::changeCache();
-    if (has(Flag::filledQuietly))
-        for (const auto& entry : *_contents)
-            cache->add(entry.key, Value(qx::Null::marker()));
-    set(Flag::filledQuietly, false);
+    Ref<Dictionary> cache = UndoableObject::changeCache();
+    RecordFilling::completeCache(*this, *cache);
     return cache;
 }
 
 void QXGenericRecord::setChangeCache(Ref<Dictionary> cache) {
     UndoableObject::setChangeCache(std::move(cache));
-    set(Flag::filledQuietly, false);
+    _isCacheBehind = false;
 }
 
 // What the old contents tell of earlier changes is noted before they go.
 void QXGenericRecord::setContents(Ref<Dictionary> contents) {
-    if (has(Flag::filledQuietly) && !_contents->isEmpty())
+    if (_isCacheBehind && !_contents->isEmpty())
         changeCache();
     _contents = std::move(contents);
-    set(Flag::filledQuietly, false);
+    _isCacheBehind = false;
 }
 
 String QXGenericRecord::description() const { return descriptionWithLocale(nullptr, 0); }

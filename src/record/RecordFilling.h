@@ -1,7 +1,21 @@
 #pragma once
 
-// Sets values of a record that is being read: it is new, and mostly nobody hears of it yet. Then no
-// change is announced and the value is not copied.
+// Puts values straight into the contents of a record that is being read: it is new, and mostly
+// nobody could hear of a change. Then none is announced and no value is copied.
+//
+//     record        | … tracking: no undo manager, no cache | contents | _isCacheBehind |
+//                                                                |
+//     contents      | key 1, value 1 | key 2, value 2 | …  <-----+
+//     change cache  made when it is asked for: | key 1, null | key 2, null | …
+//
+// 1. Only where the record has no undo manager and no change cache, nobody observes it or refers
+//    to it weakly, and its class is QXGenericRecord itself.
+// 2. An announced change notes the former value of its key in the change cache. While
+//    `_isCacheBehind` is set, keys of the contents may lack that note: their former value is null.
+// 3. It is set when the contents are made under condition 1. It is taken back when the cache is
+//    asked for, which receives what it lacks, and when the contents or the cache are replaced.
+//
+// Without it, reading orders takes 40 % more instructions (bench/orders_bench.cpp, read).
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>
@@ -13,8 +27,14 @@ public:
     // False when the value has to be set by key-value access; it is left alone then.
     static bool add(QXGenericRecord& record, Key key, Value&& value) {
         const bool isContent = !key.namesProperty() || record.isa().property(key) == nullptr;
-        return isContent && record.addQuietly(key, std::move(value));
+        return isContent && addContent(record, key, std::move(value));
     }
+    // The same for a key that is known to be no property of the record.
+    static bool addContent(QXGenericRecord& record, Key key, Value&& value);
+    // Made when there are none.
+    static const Ref<Dictionary>& contents(QXGenericRecord& record);
+    // Gives the change cache the notes that it lacks.
+    static void completeCache(const QXGenericRecord& record, Dictionary& cache);
 };
 
 } // namespace qx::detail

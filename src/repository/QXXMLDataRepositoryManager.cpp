@@ -5,8 +5,10 @@
 #include <QXXMLMarshalling/base/Exception.h>
 
 #include "base/Immortal.h"
+#include "repository/NameLookUp.h"
 
 #include <mutex>
+#include <utility>
 
 using namespace qx;
 
@@ -42,7 +44,7 @@ thread_local bool Making::_active = false;
 } // namespace
 
 Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::defaultManager() {
-    SharedManager& shared = immortal<SharedManager>();
+    auto& shared = immortal<SharedManager>();
     {
         const std::lock_guard lock(shared.mutex);
         if (shared.manager)
@@ -57,7 +59,7 @@ Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::defaultManager() {
 }
 
 void QXXMLDataRepositoryManager::flushDefaultManager() {
-    SharedManager& shared = immortal<SharedManager>();
+    auto& shared = immortal<SharedManager>();
     Ref<QXXMLDataRepositoryManager> dropped; // ends after the lock is gone
     const std::lock_guard lock(shared.mutex);
     dropped = std::exchange(shared.manager, nullptr);
@@ -148,11 +150,13 @@ QXXMLDataRepositoryManager::repositoryForDataNamed(const String& name) const {
 
 Ref<XMLDocument> QXXMLDataRepositoryManager::documentNamed(const String& name, std::uint64_t* size,
                                                            Ref<Error>* error) const {
+    const detail::NameLookUp lookUp;
     const auto repository = repositoryForDocumentNamed(name);
     return repository ? repository->documentNamed(name, size, error) : nullptr;
 }
 
 Ref<Data> QXXMLDataRepositoryManager::dataForName(const String& name, Ref<Error>* error) const {
+    const detail::NameLookUp lookUp;
     const auto repository = repositoryForDataNamed(name);
     return repository ? repository->dataForName(name, error) : nullptr;
 }

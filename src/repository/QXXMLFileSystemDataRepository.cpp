@@ -11,6 +11,7 @@
 #include "host/Directories.h"
 #include "host/Log.h"
 #include "model/Errors.h"
+#include "repository/NameLookUp.h"
 
 #include <atomic>
 #include <cerrno>
@@ -155,15 +156,21 @@ String QXXMLFileSystemDataRepository::pathForResourceInBundlesNamed(const String
 }
 
 bool QXXMLFileSystemDataRepository::containsDocument(const String& name) {
-    return !pathForResourceNamed(name).isNull();
+    const String path = pathForResourceNamed(name);
+    detail::NameLookUp::leave(*this, name, path);
+    return !path.isNull();
 }
 
 bool QXXMLFileSystemDataRepository::containsData(const String& name) {
-    return !pathForResourceNamed(name).isNull();
+    const String path = pathForResourceNamed(name);
+    detail::NameLookUp::leave(*this, name, path);
+    return !path.isNull();
 }
 
 Ref<Data> QXXMLFileSystemDataRepository::dataForName(const String& name, Ref<Error>* error) {
-    const String path = pathForResourceNamed(name);
+    String path = detail::NameLookUp::take(*this, name);
+    if (path.isNull())
+        path = pathForResourceNamed(name);
     return path.isNull() ? Ref<Data>() : readFile(path, error, ReadableFiles::regular);
 }
 

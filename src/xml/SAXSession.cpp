@@ -150,7 +150,7 @@ struct SAXSession::Callbacks {
     static void processingInstruction(void* user, const xmlChar* target, const xmlChar* data) {
         guarded(user, [&](SAXSession& self) {
             if (self._context->inSubset == 0)
-                self._builder.addProcessingInstruction(self._names.named(target, nullptr),
+                self._builder.addProcessingInstruction(self._names.numberOf(target, nullptr),
                                                        viewOf(data));
         });
     }
@@ -200,10 +200,9 @@ SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
 
 SAXSession::ErrorChannel::~ErrorChannel() { xmlSetStructuredErrorFunc(_user, _function); }
 
-SAXSession::SAXSession(std::string_view text, XMLDocument& document, const XMLParseOptions& options)
-    : _text(text), _refusesDoctype(options.refuseDoctype), _document(document),
-      _builder(document, options), _position(text), _subset(options.maximumSubsetSize),
-      _texts(text), _channel(*this) {
+SAXSession::SAXSession(XMLIndex& index, const XMLParseOptions& options)
+    : _text(index.text()), _refusesDoctype(options.refuseDoctype), _builder(index, options),
+      _names(_builder.names()), _subset(options.maximumSubsetSize), _texts(_text), _channel(*this) {
     _context.reset(xmlNewParserCtxt());
     if (_context == nullptr || _lacksMemory)
         throw std::bad_alloc();
@@ -267,9 +266,8 @@ void SAXSession::startDocument() {
     if (!isXMLVersion(version))
         throw ParseFailure(parseErrors::unknownVersion, {version},
                            _text.find(version) + version.size() + 1);
-    _document.setVersion(version);
-    if (standalone == 0 || standalone == 1)
-        _document.setStandalone(standalone == 1 ? "yes" : "no");
+    const bool isGiven = standalone == 0 || standalone == 1;
+    _builder.setDeclaration(version, isGiven ? (standalone == 1 ? "yes" : "no") : nullptr);
 }
 
 // The parser stands behind the tag's last attribute. Inside a tag there is no other "<"; where the
@@ -279,28 +277,28 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
                               const xmlChar** attributes) {
     const void* start = ::memrchr(_text.data(), isInsideReference() ? '&' : '<', offset());
     _tagOffset = start != nullptr ? static_cast<const char*>(start) - _text.data() : 0;
-    _position.moveTo(_tagOffset);
     if (_attributeDefaults != 0)
         countDefaulted(namespaceCount, namespaces, defaultedCount,
                        attributes + 5 * (attributeCount - defaultedCount));
-    _builder.startElement(_names.named(local, prefix), static_cast<std::size_t>(attributeCount),
-                          _position.line(), _position.column());
+    _builder.startElement(_names.numberOf(local, prefix), _tagOffset);
     for (int i = 0; i < namespaceCount; ++i) {
         const xmlChar* declared = namespaces[2 * i];
-        const String name = declared != nullptr ? _names.named(declared, nullptr) : String("");
-        _builder.addNamespace(name, _names.named(namespaces[2 * i + 1], nullptr));
+        const auto name =
+            declared != nullptr ? _names.numberOf(declared, nullptr) : _names.numberOfNoPrefix();
+        _names.numberOf(namespaces[2 * i + 1], nullptr); // it counts as a name
+        _builder.addNamespace(name, viewOf(namespaces[2 * i + 1]));
     }
     for (int i = 0; i < attributeCount; ++i) {
         const xmlChar** const attribute = attributes + 5 * i;
         const std::string_view value = viewOf(attribute[3], attribute[4]);
         if (_texts.isMarked(value)) {
-            _builder.addAttribute(_names.named(attribute[0], attribute[1]),
+            _builder.addAttribute(_names.numberOf(attribute[0], attribute[1]),
                                   _texts.unmarked(value, ' '));
             continue;
         }
         if (attribute[0] == _space && attribute[1] == _xml)
             _builder.setPreservesSpace(value == "preserve");
-        _builder.addAttribute(_names.named(attribute[0], attribute[1]), value);
+        _builder.addAttribute(_names.numberOf(attribute[0], attribute[1]), value);
     }
     _tagOffset = ParseFailure::here;
 }
@@ -310,10 +308,10 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
 // stands behind them, or behind the reference.
 void SAXSession::addText(std::string_view piece) {
     if (_texts.isMarked(piece))
-        return _builder.addText(_texts.unmarked(piece, '\r'), false, false);
-    const bool isOwn = addressOf(piece.data()) - addressOf(_text.data()) < _text.size();
+        return _builder.addText(_texts.unmarked(piece, '\r'), false);
+    const bool isOwn = _builder.isOwn(piece);
     try {
-        _builder.addText(piece, isOwn || !isInsideReference(), isOwn);
+        _builder.addText(piece, isOwn || !isInsideReference());
     } catch (ParseFailure& failure) {
         // Versions of the parser differ in where they stand meanwhile.
         if (isOwn)
@@ -323,9 +321,7 @@ void SAXSession::addText(std::string_view piece) {
 }
 
 void SAXSession::addCDATA(std::string_view piece) {
-    if (_texts.isMarked(piece))
-        return _builder.addText(_texts.unmarked(piece, '\r'), false, false);
-    _builder.addText(piece, false, false);
+    _builder.addText(_texts.isMarked(piece) ? _texts.unmarked(piece, '\r') : piece, false);
 }
 
 // Undeclared prefixes and the like are errors too, but leave the document well-formed. An error has

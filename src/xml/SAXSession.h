@@ -1,16 +1,14 @@
 #pragma once
 
 // One run of the C parser over one document's text, from its first callback to its last. It
-// translates callbacks for the tree builder and keeps the first failure: with that one the parser
+// translates callbacks for the index builder and keeps the first failure: with that one the parser
 // is stopped, and what still comes is ignored. The parser's own limits, which differ among its
 // versions, are off; those of the builder, of EntityTexts and of InternalSubset hold instead.
 
 #include "xml/EntityTexts.h"
 #include "xml/InternalSubset.h"
 #include "xml/ParseFailure.h"
-#include "xml/TextPosition.h"
-#include "xml/XMLNames.h"
-#include "xml/XMLTreeBuilder.h"
+#include "xml/XMLIndexBuilder.h"
 
 #include <exception>
 #include <libxml/parser.h>
@@ -22,8 +20,8 @@ namespace qx {
 
 class SAXSession {
 public:
-    // The text must outlive the session; a zero byte follows it.
-    SAXSession(std::string_view text, XMLDocument& document, const XMLParseOptions& options);
+    // Fills the index, which is empty, from its text; a zero byte follows that.
+    SAXSession(XMLIndex& index, const XMLParseOptions& options);
     ~SAXSession();
     SAXSession(const SAXSession&) = delete;
     SAXSession& operator=(const SAXSession&) = delete;
@@ -89,10 +87,8 @@ private:
 
     std::string_view _text;
     const bool _refusesDoctype;
-    XMLDocument& _document;
-    XMLTreeBuilder _builder;
-    XMLNames _names;
-    TextPosition _position;
+    XMLIndexBuilder _builder;
+    XMLNames& _names;
     InternalSubset _subset;
     EntityTexts _texts;
     std::unique_ptr<xmlParserCtxt, ContextDeleter> _context;

@@ -11,12 +11,14 @@
 //
 // 1. Numbers stay. A reference to a Name is good until the next name is looked up.
 // 2. The hash's seed differs from process to process, so no document is known to fill one slot.
-// 3. There are at most xmlLimits::names of them: a number fits into the 20 bits of an entry.
+// 3. There are at most xmlLimits::names of them: a number fits into an entry.
 
 #include <QXXMLMarshalling/base/String.h>
 
+#include "xml/XMLIndex.h"
 #include "xml/XMLLimits.h"
 
+#include <bit>
 #include <cstdint>
 #include <cstring>
 #include <vector>
@@ -27,15 +29,15 @@ class ScannedNames {
 public:
     using Number = std::uint32_t;
     static constexpr Number none = UINT32_MAX;
-    static constexpr std::uint32_t numberBits = 20;
-    static_assert(xmlLimits::names < (1U << numberBits));
+    static_assert(xmlLimits::names < XMLIndex::mostNames);
 
     // Thrown for what is left to the C parser.
     struct Refused {};
 
     // What a name means as an attribute's.
-    enum class Meaning : std::uint8_t { plain, defaultNamespace, prefixNamespace };
+    enum class Meaning : std::uint8_t { plain, space, defaultNamespace, prefixNamespace };
     struct Name {
+        std::uint64_t start; // the first eight bytes, as far as it has them
         std::uint32_t begin;
         std::uint32_t size;
         std::uint32_t hash;
@@ -53,15 +55,16 @@ public:
     // The number of the name at that place of the text. A new name is looked at in full: throws
     // Refused for what is none, and beyond a limit.
     Number numberOf(const char* begin, std::size_t size) {
-        const std::uint32_t hash = hashOf(begin, size);
+        const std::uint64_t start = startOf(begin, size);
+        const std::uint32_t hash = hashOf(start, begin, size);
         const std::size_t mask = _slots.size() - 1;
         for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
             const Name& name = _names[_slots[slot] - 1];
-            if (name.hash == hash && name.size == size &&
-                std::memcmp(_text.data() + name.begin, begin, size) == 0)
+            if (name.start == start && name.size == size &&
+                (size <= 8 || std::memcmp(_text.data() + name.begin, begin, size) == 0))
                 return _slots[slot] - 1;
         }
-        return add({begin, size}, hash);
+        return add({begin, size}, start, hash);
     }
     // The empty prefix, that of a default namespace.
     Number numberOfNoPrefix() { return numberOf(_text.data() + _text.size(), 0); }
@@ -70,28 +73,45 @@ public:
     void countURI();
 
 private:
+    static constexpr bool isLittleEndian = std::endian::native == std::endian::little;
+
     static constexpr std::uint64_t mixed(std::uint64_t hash) noexcept {
         hash *= 0x9E3779B97F4A7C15U;
         return hash ^ hash >> 32U;
     }
-    std::uint32_t hashOf(const char* begin, std::size_t size) const noexcept {
-        std::uint64_t hash = _seed + size;
-        while (true) {
-            std::uint64_t word = 0;
-            if (size >= 8)
-                std::memcpy(&word, begin, 8);
-            else
-                std::memcpy(&word, begin, size);
-            // Twice: once would leave the slot untouched by what only the last bytes differ in,
-            // whatever the seed, and a document could have all its names meet in one.
-            hash = mixed(mixed(hash ^ word));
-            if (size <= 8)
-                return static_cast<std::uint32_t>(hash);
-            begin += 8;
-            size -= 8;
-        }
+    static std::uint64_t wordAt(const char* place) noexcept {
+        std::uint64_t word = 0;
+        std::memcpy(&word, place, sizeof word);
+        return word;
     }
-    Number add(std::string_view text, std::uint32_t hash);
+    // Most names are shorter than a word, and are compared as one. It is read whole where the text
+    // goes on that far: a copy of a few bytes, read as a word, would have to wait for them.
+    std::uint64_t startOf(const char* begin, std::size_t size) const noexcept {
+        if (size >= 8)
+            return wordAt(begin);
+        if (_text.data() + _text.size() - begin >= 8) {
+            const std::uint64_t kept = (std::uint64_t(1) << (8 * size)) - 1;
+            return wordAt(begin) & (isLittleEndian ? kept : ~(~std::uint64_t(0) >> (8 * size)));
+        }
+        std::uint64_t word = 0;
+        std::memcpy(&word, begin, size);
+        return word;
+    }
+    std::uint32_t hashOf(std::uint64_t start, const char* begin, std::size_t size) const noexcept {
+        // Twice: once would leave the slot untouched by what only the last bytes differ in,
+        // whatever the seed, and a document could have all its names meet in one.
+        const auto add = [](std::uint64_t hash, std::uint64_t word) {
+            return mixed(mixed(hash ^ word));
+        };
+        std::uint64_t hash = add(_seed + size, start);
+        if (size > 8) {
+            for (std::size_t at = 8; at + 8 < size; at += 8)
+                hash = add(hash, wordAt(begin + at));
+            hash = add(hash, wordAt(begin + size - 8));
+        }
+        return static_cast<std::uint32_t>(hash);
+    }
+    Number add(std::string_view text, std::uint64_t start, std::uint32_t hash);
     void takeApart(Name& name, std::string_view text);
     void fill(Number number);
     void grow();

@@ -33,23 +33,34 @@ const char* skipBlanks(const char* from, const char* to) noexcept {
 
 } // namespace
 
-void TextPosition::moveTo(std::size_t offset) noexcept {
+void TextPosition::moveTo(std::size_t offset) {
     offset = std::min(offset, _text.size());
-    if (offset < _offset)
-        *this = TextPosition(_text);
-    const char* from = _text.data() + _offset;
+    if (offset < _at.offset) {
+        const std::size_t passed = offset / blockSize;
+        _at = passed != 0 ? _passed[passed - 1] : Place();
+    }
+    for (std::size_t end = 0; (end = (_at.offset / blockSize + 1) * blockSize) <= offset;) {
+        advance(end);
+        if (_passed.size() < end / blockSize)
+            _passed.push_back(_at);
+    }
+    advance(offset);
+}
+
+void TextPosition::advance(std::size_t offset) noexcept {
+    const char* from = _text.data() + _at.offset;
     const char* const to = _text.data() + offset;
-    _offset = offset;
+    _at.offset = offset;
     while (from != to) {
         const void* lineEnd = std::memchr(from, '\n', static_cast<std::size_t>(to - from));
         if (lineEnd == nullptr)
             break;
-        ++_line;
+        ++_at.line;
         const char* const start = static_cast<const char*>(lineEnd) + 1;
         from = skipBlanks(start, to);
-        _column = static_cast<std::size_t>(from - start) + 1;
+        _at.column = static_cast<std::size_t>(from - start) + 1;
     }
-    _column += countCodePoints(from, to);
+    _at.column += countCodePoints(from, to);
 }
 
 } // namespace qx

@@ -7,18 +7,23 @@
 #include "files/Paths.h"
 #include "model/Errors.h"
 #include "xml/Encoding.h"
+#include "xml/XMLDocumentContent.h"
 #include "xml/XMLParser.h"
 #include "xml/XMLSerializer.h"
 #include "xml/XMLSiblings.h"
 
-#include <istream>
 #include <ostream>
 
 namespace qx {
 
-XMLDocument::XMLDocument() noexcept : XMLNode(XMLNodeKind::document, String(), String()) {}
+namespace {
 
-XMLDocument::~XMLDocument() { XMLSiblings::releaseAll(_firstChild); }
+Ref<XMLDocument> documentOf(Ref<Data> data, const XMLParseOptions& options, Ref<Error>* error) {
+    return data ? XMLDocumentContent::document(XMLParser::parse(std::move(data), options, error))
+                : nullptr;
+}
+
+} // namespace
 
 Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
                                                     const XMLParseOptions& options,
@@ -32,24 +37,17 @@ Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
 Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
                                                      const XMLParseOptions& options,
                                                      Ref<Error>* error) {
-    const Ref<Data> data = readFile(path, error);
-    return data ? initWithData(*data, options, error) : nullptr;
+    return documentOf(readFile(path, error), options, error);
 }
 
 Ref<XMLDocument> XMLDocument::initWithData(XMLBytes bytes, const XMLParseOptions& options,
                                            Ref<Error>* error) {
-    return XMLParser::parse(bytes, options, error);
+    return XMLDocumentContent::document(XMLParser::parseCopy(bytes, options, error));
 }
 
 Ref<XMLDocument> XMLDocument::initWithStream(std::istream& stream, const XMLParseOptions& options,
                                              Ref<Error>* error) {
-    std::string bytes;
-    char block[16 * 1024];
-    while (stream.read(block, sizeof block) || stream.gcount() > 0)
-        bytes.append(block, static_cast<std::size_t>(stream.gcount()));
-    if (stream.eof() && !stream.bad())
-        return XMLParser::parse(bytes, options, error);
-    return fail(error, errors::streamNotRead);
+    return documentOf(readStream(stream, error), options, error);
 }
 
 Ref<XMLDocument> XMLDocument::initWithRootElement(Ref<XMLElement> root) {
@@ -59,7 +57,12 @@ Ref<XMLDocument> XMLDocument::initWithRootElement(Ref<XMLElement> root) {
     return document;
 }
 
-XMLElement* XMLDocument::rootElement() const noexcept {
+XMLNode* XMLDocument::firstChild() const {
+    makeNodes();
+    return _firstChild;
+}
+
+XMLElement* XMLDocument::rootElement() const {
     for (XMLNode& node : children())
         if (node.isElement())
             return node.asElement();
@@ -85,6 +88,7 @@ void XMLDocument::addChild(Ref<XMLNode> child) {
     default:
         refuse("a document holds an element, comments and processing instructions only");
     }
+    makeNodes();
     XMLSiblings::append(*this, _firstChild, child.detach());
 }
 

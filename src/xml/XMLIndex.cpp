@@ -90,7 +90,10 @@ void appendAttributeValue(std::string_view text, std::string& result) {
 } // namespace
 
 std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
-    const std::string_view whole = _text.substr(entry.begin, entry.end - entry.begin);
+    const std::string_view source = entry.has(XMLIndexEntry::isAside) ? _aside : _text;
+    const std::string_view whole = source.substr(entry.begin, entry.end - entry.begin);
+    if (entry.has(XMLIndexEntry::isAside))
+        return whole;
     if (entry.nodeKind() == XMLNodeKind::comment)
         return whole.substr(4, whole.size() - 7);
     if (entry.nodeKind() != XMLNodeKind::processingInstruction)
@@ -99,9 +102,9 @@ std::string_view XMLIndex::span(const XMLIndexEntry& entry) const noexcept {
     return withoutLeadingWhite(data.substr(name(entry).size()));
 }
 
-std::string_view XMLIndex::value(const XMLIndexEntry& entry, std::string& room) const {
+std::string_view XMLIndex::workedOut(const XMLIndexEntry& entry, std::string& room) const {
     const std::string_view raw = span(entry);
-    if (entry.needsWork == 0)
+    if (!entry.has(XMLIndexEntry::needsWork))
         return raw;
     room.clear();
     switch (entry.nodeKind()) {

@@ -36,11 +36,11 @@ String encodingInDeclaration(std::string_view text) {
 
 } // namespace
 
-void XMLInput::read(XMLBytes bytes) {
+void XMLInput::read(XMLBytes bytes, bool copies) {
     const bool isConverted = decodeBytes(bytes.view());
     checkStart();
-    if (!isConverted && !bytes.isTerminated())
-        _text = _converted = _text;
+    if (!isConverted && (copies || !bytes.isTerminated()))
+        _text = _own = _text;
     const std::size_t tag = findTagBeyond(_text, xmlLimits::attributes);
     if (tag != std::string_view::npos)
         throw ParseFailure(parseErrors::tooManyAttributes, {xmlLimits::attributes}, tag);
@@ -70,8 +70,8 @@ bool XMLInput::decodeBytes(std::string_view bytes) {
 }
 
 void XMLInput::convert(std::string_view bytes, const String& encoding) {
-    const DecodeResult result = decode(bytes, encoding, _converted);
-    _text = _converted;
+    const DecodeResult result = decode(bytes, encoding, _own);
+    _text = _own;
     if (result == DecodeResult::unknownEncoding)
         throw ParseFailure(parseErrors::unknownEncoding, {encoding}, 0);
     if (result == DecodeResult::malformed)

@@ -1,8 +1,8 @@
 #pragma once
 
 // A document's bytes made ready for the parser: as UTF-8 without a byte-order mark, with nothing in
-// them that the parser would take unlimited time for. UTF-8 that a zero byte follows stays where it
-// is and is not copied.
+// them that the parser would take unlimited time for. Lent UTF-8 that a zero byte follows stays
+// where it is and is not copied.
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
@@ -17,8 +17,9 @@ public:
     XMLInput(const XMLInput&) = delete;
     XMLInput& operator=(const XMLInput&) = delete;
 
-    // Lends the bytes. Throws ParseFailure; text() is then what could be read up to its place.
-    void read(XMLBytes bytes);
+    // With a copy where the bytes go with the call. Throws ParseFailure; text() is then what could
+    // be read up to its place.
+    void read(XMLBytes bytes, bool copies);
 
     // A zero byte follows it.
     std::string_view text() const noexcept { return _text; }
@@ -32,7 +33,7 @@ private:
     void checkStart() const;
 
     std::string_view _text;
-    std::string _converted;
+    std::string _own;
     String _declaredEncoding;
 };
 

@@ -7,7 +7,7 @@
 
 namespace qx {
 
-const String& XMLNames::add(Name local, Name prefix) {
+XMLNames::Number XMLNames::add(Name local, Name prefix) {
     if (local == nullptr) // the parser had no memory for it
         throw std::bad_alloc();
     if (_count >= maximumNames)
@@ -22,12 +22,21 @@ const String& XMLNames::add(Name local, Name prefix) {
         old.swap(_entries);
         for (Entry& entry : old)
             if (entry.local != nullptr)
-                freeEntry(entry.local, entry.prefix).name = std::move(entry.name);
+                freeEntry(entry.local, entry.prefix).number = entry.number;
     }
-    Entry& entry = freeEntry(local, prefix);
-    entry.name = std::move(name);
+    const auto number = static_cast<Number>(_names.size());
+    _names.push_back(std::move(name));
+    freeEntry(local, prefix).number = number;
     ++_count;
-    return entry.name;
+    return number;
+}
+
+XMLNames::Number XMLNames::numberOfNoPrefix() {
+    if (!_noPrefix) {
+        _names.emplace_back("");
+        _noPrefix = static_cast<Number>(_names.size() - 1);
+    }
+    return *_noPrefix;
 }
 
 XMLNames::Entry& XMLNames::freeEntry(Name local, Name prefix) noexcept {

@@ -1,14 +1,15 @@
 #pragma once
 
 // The names of one document. The parser keeps each name once, so its pointers stand for the names;
-// from a pair of them (local name and prefix) this finds the qualified name as a String. A name
-// that a mapping or code uses comes out interned, so that comparing with it compares pointers.
+// from a pair of them (local name and prefix) this finds the number of the qualified name. A name
+// that a mapping or code uses is interned, so that comparing with it compares pointers.
 
 #include <QXXMLMarshalling/base/Key.h>
 
 #include "xml/XMLLimits.h"
 
 #include <bit>
+#include <optional>
 #include <vector>
 
 namespace qx {
@@ -16,27 +17,30 @@ namespace qx {
 class XMLNames {
 public:
     using Name = const unsigned char*;
+    using Number = std::uint32_t;
 
-    XMLNames() : _entries(initialSize) {}
+    // The qualified names go into the list, which must outlive this, each where its number says.
+    explicit XMLNames(std::vector<String>& names) : _names(names), _entries(initialSize) {}
 
-    // The qualified name; the prefix is null where there is none. Good until the next call. Throws
-    // ParseFailure when the document has too many different names: the parser's own table of names
-    // gets slow with them.
-    const String& named(Name local, Name prefix) {
+    // Of the qualified name; the prefix is null where there is none. Throws ParseFailure when the
+    // document has too many different names: the parser's own table of names gets slow with them.
+    Number numberOf(Name local, Name prefix) {
         std::size_t at = slot(local, prefix);
         while (_entries[at].local != nullptr) {
             if (_entries[at].local == local && _entries[at].prefix == prefix)
-                return _entries[at].name;
+                return _entries[at].number;
             at = (at + 1) & (_entries.size() - 1);
         }
         return add(local, prefix);
     }
+    // The empty prefix, that of a default namespace.
+    Number numberOfNoPrefix();
 
 private:
     struct Entry {
         Name local = nullptr;
         Name prefix = nullptr;
-        String name;
+        Number number = 0;
     };
     static constexpr std::size_t initialSize = 256; // a power of two
     static constexpr std::size_t maximumNames = xmlLimits::names;
@@ -47,11 +51,13 @@ private:
                            0x9E3779B97F4A7C15U;
         return (mixed >> 32) & (_entries.size() - 1);
     }
-    const String& add(Name local, Name prefix);
+    Number add(Name local, Name prefix);
     Entry& freeEntry(Name local, Name prefix) noexcept;
 
+    std::vector<String>& _names;
     std::vector<Entry> _entries;
     std::size_t _count = 0;
+    std::optional<Number> _noPrefix;
 };
 
 } // namespace qx

@@ -1,26 +1,33 @@
 #pragma once
 
-// Parses a document into a tree. Most documents are read by the scanner (XMLScanner.h); whatever it
-// refuses, faults included, is read by the C parser (SAXSession.h), so every error is that one's.
-// Any thread may parse; nothing is shared.
+// Parses a document into its text and an index over it. Most documents are read by the scanner
+// (XMLScanner.h); whatever it refuses, faults included, is read by the C parser (SAXSession.h), so
+// every error is that one's. Any thread may parse; nothing is shared.
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
-namespace qx {
+#include "xml/ParsedDocument.h"
 
-class XMLIndex;
+namespace qx {
 
 class XMLParser {
 public:
     // For tests that hold the two ways against each other.
     enum class Way : std::uint8_t { fastest, cParserOnly };
+    using Parsed = std::shared_ptr<const ParsedDocument>;
 
-    // Null with an error for what is no well-formed XML, cannot be decoded, or exceeds a limit.
-    static Ref<XMLDocument> parse(XMLBytes bytes, const XMLParseOptions& options, Ref<Error>* error,
-                                  Way way = Way::fastest);
+    // All give null with an error for what is no well-formed XML, cannot be decoded, or exceeds a
+    // limit. Lent bytes must outlive what was parsed of them.
+    static Parsed parseLent(XMLBytes bytes, const XMLParseOptions& options, Ref<Error>* error);
+    static Parsed parse(Ref<const Data> data, const XMLParseOptions& options, Ref<Error>* error);
+    // Has a text of its own.
+    static Parsed parseCopy(XMLBytes bytes, const XMLParseOptions& options, Ref<Error>* error,
+                            Way way = Way::fastest);
 
 private:
-    static void build(const XMLIndex& index, XMLDocument& document, const XMLParseOptions& options);
+    enum class Text : std::uint8_t { lent, copied };
+    static std::shared_ptr<ParsedDocument>
+    run(XMLBytes bytes, Text text, const XMLParseOptions& options, Ref<Error>* error, Way way);
 };
 
 } // namespace qx

@@ -66,26 +66,27 @@ constexpr std::size_t largestPiece = 10'000'000;
 
 } // namespace
 
-std::optional<XMLIndex> XMLScanner::scan(std::string_view text, const XMLParseOptions& options) {
-    if (text.size() >= UINT32_MAX)
-        return std::nullopt;
-    XMLIndex index(text);
+bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options) {
+    if (index.text().size() >= UINT32_MAX)
+        return false;
     try {
-        XMLScanner(text, options, index).scanDocument();
+        XMLScanner(index, options).scanDocument();
+        return true;
     } catch (const Refused&) {
-        return std::nullopt;
+        index = XMLIndex(index.text());
+        return false;
     }
-    return index;
 }
 
-XMLScanner::XMLScanner(std::string_view text, const XMLParseOptions& options, XMLIndex& index)
-    : _text(text), _at(text.data()), _end(text.data() + text.size()),
+XMLScanner::XMLScanner(XMLIndex& index, const XMLParseOptions& options)
+    : _text(index.text()), _at(_text.data()), _end(_text.data() + _text.size()),
       _maximumDepth(options.maximumDepth),
-      _maximumSize(std::min(options.maximumTextSize, largestPiece)), _index(index),
-      _entries(index._entries), _names(text, std::min(longestName, _maximumSize), index._names) {
-    // Most entries stand for more bytes than this; what is too much goes back at the end.
+      _maximumSize(std::min(options.maximumTextSize, largestPiece)),
+      _keepsWhiteSpace(options.keepWhiteSpace), _index(index), _entries(index._entries),
+      _names(_text, std::min(longestName, _maximumSize), index._names) {
+    // Most entries stand for more bytes than this.
     constexpr std::size_t bytesOfEntry = 16;
-    _entries.reserve(text.size() / bytesOfEntry + 16);
+    _entries.reserve(_text.size() / bytesOfEntry + 16);
 }
 
 bool XMLScanner::skipWhite() noexcept {
@@ -95,15 +96,26 @@ bool XMLScanner::skipWhite() noexcept {
 }
 
 inline XMLIndexEntry& XMLScanner::add(XMLNodeKind kind, const char* begin, Number name) {
-    const std::uint32_t start = offset(begin);
-    return _entries.emplace_back(XMLIndexEntry{start, start, 0, name & 0xFFFFFU,
-                                               static_cast<std::uint32_t>(kind) & 0xFU, 0, 0});
+    if (_entries.size() == _entries.capacity()) [[unlikely]]
+        makeRoom();
+    return _entries.emplace_back(XMLIndexEntry::of(kind, name, offset(begin)));
+}
+
+// For the rest of the text, taken to be like what has been read, and a bit more: doubling would
+// double what a dense document takes.
+void XMLScanner::makeRoom() {
+    const double read = static_cast<double>(offset(_at)) + 1;
+    const double expected =
+        static_cast<double>(_entries.size()) * (static_cast<double>(_text.size()) / read);
+    const std::size_t least = _entries.size() + _entries.size() / 8;
+    _entries.reserve(
+        std::clamp(static_cast<std::size_t>(expected * 1.05), least, _text.size() + 16));
 }
 
 inline void XMLScanner::finish(XMLIndexEntry& entry, const char* end) {
     entry.end = offset(end);
     entry.next = static_cast<std::uint32_t>(_entries.size());
-    entry.needsWork = _needsWork ? 1 : 0;
+    entry.setIf(_needsWork, XMLIndexEntry::needsWork);
     require(entry.end - entry.begin <= _maximumSize);
 }
 
@@ -150,8 +162,9 @@ void XMLScanner::scanDeclaration() {
     skipWhite();
     expect('?');
     expect('>');
-    _index._hasDeclaration = true;
-    _index._standalone = standalone;
+    _index._version = "1.0";
+    if (!standalone.empty())
+        _index._standalone = standalone;
 }
 
 // Comments, instructions and white space around the root.
@@ -197,9 +210,11 @@ void XMLScanner::scanElementStart() {
     const char* const begin = _at++;
     const auto number = static_cast<Number>(_entries.size());
     const Number name = scanName();
-    require(_names[name].meaning == Meaning::plain);
+    require(_names[name].meaning == Meaning::plain || _names[name].meaning == Meaning::space);
     add(XMLNodeKind::element, begin, name);
-    _open.push_back({number, _open.empty() ? 0 : _open.back().namespaces});
+    const Open outer =
+        _open.empty() ? Open{0, 0, _keepsWhiteSpace, _keepsWhiteSpace} : _open.back();
+    _open.push_back({number, outer.namespaces, outer.preservesSpace, outer.preservesSpace});
     ++_element;
     if (*_at != '>')
         scanAttributes();
@@ -253,7 +268,16 @@ void XMLScanner::scanAttribute() {
     }
     finish(entry, _at++);
     if (name.meaning != Meaning::plain)
-        takeDeclaration(entry, name);
+        takeMeaning(entry, name);
+}
+
+void XMLScanner::takeMeaning(XMLIndexEntry& entry, const Name& name) {
+    if (name.meaning != Meaning::space)
+        return takeDeclaration(entry, name);
+    std::string room;
+    Open& element = _open.back();
+    element.preservesSpace = _keepsWhiteSpace || _index.value(entry, room) == "preserve";
+    element.keepsLayout = element.preservesSpace;
 }
 
 // Declarations with rules of their own are left to the C parser.
@@ -262,17 +286,14 @@ void XMLScanner::takeDeclaration(XMLIndexEntry& entry, const Name& name) {
     require(!_needsWork && URI != xmlNamespace && URI != xmlnsNamespace);
     require(++_open.back().namespaces <= xmlLimits::namespaces);
     _names.countURI();
-    entry.kind = static_cast<std::uint32_t>(XMLNodeKind::namespaceDeclaration) & 0xFU;
-    if (name.meaning == Meaning::prefixNamespace) {
-        require(!URI.empty());
-        entry.name = name.local & 0xFFFFFU;
-    } else {
-        entry.name = _names.numberOfNoPrefix() & 0xFFFFFU;
-    }
+    const bool hasPrefix = name.meaning == Meaning::prefixNamespace;
+    require(!hasPrefix || !URI.empty());
+    const Number prefix = hasPrefix ? name.local : _names.numberOfNoPrefix();
+    entry.bits = XMLIndexEntry::of(XMLNodeKind::namespaceDeclaration, prefix, 0).bits;
 }
 
 void XMLScanner::scanEndTag() {
-    const Name& name = _names[_entries[_open.back().number].name];
+    const Name& name = _names[_entries[_open.back().number].name()];
     _at += 2;
     require(static_cast<std::size_t>(_end - _at) > name.size &&
             std::memcmp(_at, _text.data() + name.begin, name.size) == 0);
@@ -287,6 +308,7 @@ inline void XMLScanner::endElement() {
     XMLIndexEntry& element = _entries[_open.back().number];
     element.end = offset(_at);
     element.next = static_cast<std::uint32_t>(_entries.size());
+    element.setIf(_open.back().keepsLayout, XMLIndexEntry::keepsLayout);
     _open.pop_back();
 }
 
@@ -329,7 +351,8 @@ void XMLScanner::scanText() {
         }
     }
     XMLIndexEntry& entry = add(XMLNodeKind::text, begin, 0);
-    entry.isBlank = isBlank ? 1 : 0;
+    entry.setIf(isBlank, XMLIndexEntry::isBlank);
+    _open.back().keepsLayout |= !isBlank;
     finish(entry, _at);
 }
 

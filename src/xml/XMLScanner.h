@@ -25,8 +25,9 @@ namespace qx {
 
 class XMLScanner {
 public:
-    // None where the text is refused. A zero byte follows the text, which must outlive the index.
-    static std::optional<XMLIndex> scan(std::string_view text, const XMLParseOptions& options);
+    // Fills the index, which is empty, from its text; a zero byte follows that. False where the
+    // text is refused: the index is empty then.
+    static bool scan(XMLIndex& index, const XMLParseOptions& options);
 
 private:
     using Number = XMLIndex::Number;
@@ -36,9 +37,11 @@ private:
     struct Open {
         Number number;
         std::uint32_t namespaces; // how many declarations are in force
+        bool keepsLayout;         // so far; see XMLIndexEntry
+        bool preservesSpace;      // so do the elements inside
     };
 
-    XMLScanner(std::string_view text, const XMLParseOptions& options, XMLIndex& index);
+    XMLScanner(XMLIndex& index, const XMLParseOptions& options);
 
     void scanDocument();
     void scanDeclaration();
@@ -47,6 +50,7 @@ private:
     void scanElementStart();
     void scanAttributes();
     void scanAttribute();
+    void takeMeaning(XMLIndexEntry& entry, const Name& name);
     void takeDeclaration(XMLIndexEntry& entry, const Name& name);
     void scanEndTag();
     void endElement();
@@ -64,6 +68,7 @@ private:
     Number scanName();
 
     XMLIndexEntry& add(XMLNodeKind kind, const char* begin, Number name);
+    void makeRoom();
     void finish(XMLIndexEntry& entry, const char* end);
     std::uint32_t offset(const char* at) const noexcept {
         return static_cast<std::uint32_t>(at - _text.data());
@@ -88,6 +93,7 @@ private:
     const char* const _end; // a zero byte stands there
     const std::size_t _maximumDepth;
     const std::size_t _maximumSize;
+    const bool _keepsWhiteSpace;
     XMLIndex& _index;
     std::vector<XMLIndexEntry>& _entries;
     std::vector<Open> _open;

@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Every installed header compiles alone, and a program may have names of its own beside all of them.
-# With the build's compiler, and with GCC and Clang where they are there.
+# With the build's compiler, and with GCC and Clang: without one of them the check ends as skipped,
+# once the other has compiled everything.
 #
 # usage: headers.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
@@ -14,9 +15,13 @@ warnings=(-Wall -Wextra -Wconversion -Wshadow -pedantic)
 ! grep -q '^QX_WARNINGS_AS_ERRORS:BOOL=ON' "$1/CMakeCache.txt" || warnings+=(-Werror)
 compilers=("$(sed -n 's/^CMAKE_CXX_COMPILER:[A-Z]*=//p' "$1/CMakeCache.txt")")
 family() { "$1" --version | grep -qi clang && echo clang++ || echo g++; }
+missing=
 for other in g++ clang++; do
-    if [[ $(family "${compilers[0]}") != "$other" ]] && command -v "$other" >/dev/null; then
+    [[ $(family "${compilers[0]}") != "$other" ]] || continue
+    if command -v "$other" >/dev/null; then
         compilers+=("$other")
+    else
+        missing=$other
     fi
 done
 
@@ -47,4 +52,8 @@ for compiler in "${compilers[@]}"; do
     find programs -name '*.cpp' -print0 | xargs -0 -P "$(nproc)" -I {} \
         bash -c 'compiles "$@"' - "$compiler" {} "${warnings[@]}" >&2 || status=1
 done
+if [[ $status == 0 && -n $missing ]]; then
+    echo "$missing is not installed: only ${compilers[*]} compiled the headers" >&2
+    exit 77
+fi
 exit "$status"

@@ -17,10 +17,11 @@ read_layers() {
     local folder uses headers used header
     while IFS=: read -r folder uses headers; do
         folder=${folder// /}
-        below[$folder]=" $folder "
+        below[$folder]=" $folder"
         for used in $uses; do
-            below[$folder]+=${below[$used]}
+            below[$folder]+=${below[$used]% }
         done
+        below[$folder]+=" "
         for header in $headers; do
             listed[$header]=$folder
         done
@@ -70,16 +71,20 @@ complaints() {
     done < <(grep -HnorE '^[[:space:]]*#[[:space:]]*include[[:space:]]*[<"][^>"]+[>"]' "${roots[@]}" \
         --include='*.h' --include='*.cpp' | sed -E 's/:[[:space:]]*#[[:space:]]*include[[:space:]]*/:/' | LC_ALL=C sort)
 
-    declare -A defined=()
-    while IFS=: read -r path name; do
-        name=${name##* }
-        defined[$name]+="$path "
-    done < <(grep -HorE '^(class|struct)( QX_API)? [A-Za-z0-9_]+(::[A-Za-z0-9_]+)*[^;]*$' include src --include='*.h' --include='*.cpp' |
-        sed -E 's/:(class|struct)( QX_API)? ([A-Za-z0-9_:]+).*/:\3/')
-    while IFS=: read -r path number kind name; do
+    # Each friend by its statement, which may stand on several lines; operators are defined in place.
+    while IFS=$'\t' read -r path number name; do
         check_friend
-    done < <(grep -HnorE '^[[:space:]]*friend (class|struct) [A-Za-z0-9_]+(::[A-Za-z0-9_]+)*' include src --include='*.h' --include='*.cpp' |
-        sed -E 's/[[:space:]]*friend (class|struct) ([A-Za-z0-9_]+::)*/\1:/' | LC_ALL=C sort)
+    done < <(find include src -name '*.h' -print0 -o -name '*.cpp' -print0 | LC_ALL=C sort -z | xargs -0r awk '
+        /^[[:space:]]*friend([[:space:]]|$)/ {
+            line = FNR
+            statement = $0
+            while (statement !~ /[;{]/ && (getline following) > 0) statement = statement " " following
+            if (statement ~ /operator/) next
+            sub(/[(;{].*/, "", statement) # leaves the name at the end
+            while (sub(/[[:space:]]*<[^<>]*>[[:space:]]*$/, "", statement)) {}
+            sub(/.*[^A-Za-z0-9_]/, "", statement)
+            printf "%s\t%d\t%s\n", FILENAME, line, statement
+        }')
 }
 
 # One include: `target` in line `number` of `path`, which belongs to `here`.
@@ -110,16 +115,28 @@ check_include() {
     fi
 }
 
+# definitions_of NAME: the files that define a class, an enumeration or a function of that name.
+definitions_of() {
+    local type='(class|struct|union|enum)( [A-Za-z_]+)* ' function='[A-Za-z_][A-Za-z0-9_:<>,&* ]*[ &*]'
+    local rest='([^;{]*\{|[^;]*$)' qualified="([A-Za-z0-9_]+::)*$1"
+    grep -rE "^[[:space:]]*(($type)$qualified([^A-Za-z0-9_;]$rest|$)|$function$qualified\($rest)" include src \
+        --include='*.h' --include='*.cpp' | grep -vE '^[^:]*:[[:space:]]*friend [^{]*$' | cut -d: -f1 | sort -u
+}
+
 # One friend: `name` in line `number` of `path`. A name that several folders define may be any of them.
 check_friend() {
     local where="$path:$number" here definition
     room_of "$path"
     here=$room
-    for definition in ${defined[$name]:-}; do
+    for definition in $(definitions_of "$name"); do
         room_of "$definition"
         [[ ${below[$here]:-} != *" $room "* ]] || return 0
     done
-    [[ -z ${defined[$name]:-} ]] || echo "$where: $here befriends $name of $room"
+    if [[ -n ${definition:-} ]]; then
+        echo "$where: $here befriends $name of $room"
+    else
+        echo "$where: $here befriends $name, which nobody defines"
+    fi
 }
 
 may_use() {
@@ -135,15 +152,18 @@ self_test() {
         'marshaller : mapping record :'
     put include/QXXMLMarshalling/detail/Count.h '#pragma once' '#include <sys/stat.h>'
     put include/QXXMLMarshalling/detail/Lost.h '#include <string>'
-    put include/QXXMLMarshalling/base/Value.h '#include <QXXMLMarshalling/QXRecord.h>' '    friend class qx::Way;'
+    put include/QXXMLMarshalling/base/Value.h '#include <QXXMLMarshalling/QXRecord.h>' '    friend class qx::Way;' \
+        '    friend Deep;' '    friend qx::Ref<Value>' '    qx::make<Value>(int&&);' '    friend void qx::walk(Value&);' \
+        '    friend bool operator==(Value, Value) = default;' 'class Way;' 'void walk(Value& value);'
     put include/QXXMLMarshalling/QXRecord.h '#include <QXXMLMarshalling/base/Value.h>' '#include "record/Table.h"'
     put include/QXXMLMarshalling/QXMapping.h '#include <QXXMLMarshalling/detail/Count.h>' '#include <sys/stat.h>'
-    put src/base/Value.cpp '#include <unistd.h>' '#  include <libxml/tree.h>'
+    put src/base/Value.cpp '#include <unistd.h>' '#  include <libxml/tree.h>' 'Ref<T> make(Args&&... arguments) {'
     put src/xml/Node.cpp '#include <QXXMLMarshalling/base/Value.h>' '#include <libxml/tree.h>' '#include <unicode/uchar.h>'
     put src/mapping/QXMapping.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include "record/Table.h"' '#include "Key.h"'
     put src/record/QXRecord.cpp '#include <QXXMLMarshalling/QXMapping.h>' '#include <fstream>'
     put src/record/Table.h 'class Table {' '    friend class Table;' '    friend class Unknown;'
-    put src/marshaller/way.cpp '#include "record/Table.h"' 'class Way {' '#include <QXXMLMarshalling/QXMapping.h>'
+    put src/marshaller/way.cpp '#include "record/Table.h"' 'class Way {' '    struct Deep final : Base { int a; };' \
+        'void walk(Value& value) {' '#include <QXXMLMarshalling/QXMapping.h>'
     put fuzz/xml/node.cpp '#include "xml/Node.cpp"' '#include "record/Table.h"'
     put tools/t/main.cpp '#include <QXXMLMarshalling/QXRecord.h>' '#include "record/Table.h"' '#include <fstream>'
     expected='fuzz/xml/node.cpp:2: xml includes "record/Table.h" of record
@@ -151,12 +171,15 @@ include/QXXMLMarshalling/QXMapping.h:2: the operating system (<sys/stat.h>) in m
 include/QXXMLMarshalling/QXRecord.h:2: a public header includes "record/Table.h"
 include/QXXMLMarshalling/base/Value.h:1: base includes <QXXMLMarshalling/QXRecord.h> of record
 include/QXXMLMarshalling/base/Value.h:2: base befriends Way of marshaller
+include/QXXMLMarshalling/base/Value.h:3: base befriends Deep of marshaller
+include/QXXMLMarshalling/base/Value.h:6: base befriends walk of marshaller
 include/QXXMLMarshalling/detail/Lost.h:1: belongs to no folder: enter it in cmake/layers.txt
 src/base/Value.cpp:2: libxml2 outside xml
 src/mapping/QXMapping.cpp:2: mapping includes "record/Table.h" of record
 src/mapping/QXMapping.cpp:3: "Key.h" is not named from src/
 src/record/QXRecord.cpp:1: record includes <QXXMLMarshalling/QXMapping.h> of mapping
 src/record/QXRecord.cpp:2: the operating system (<fstream>) in record
+src/record/Table.h:3: record befriends Unknown, which nobody defines
 src/xml/Node.cpp:3: ICU outside base
 tools/t/main.cpp:2: a program includes the private header "record/Table.h"'
     actual=$(complaints "$tree" | LC_ALL=C sort)

@@ -38,70 +38,53 @@ std::string withoutLayout(const std::string& text) {
     return result;
 }
 
-// What the blocks up to here have set up, and what it does.
-class Sample {
-public:
-    void setMapping(const std::string& text) {
-        const bool isWhole = text.rfind("<mapping", 0) == 0;
-        _mapping = isWhole ? text : "<mapping>" + text + "</mapping>";
-    }
-    void setDocument(const std::string& text) { _document = text; }
+// What reading a document gives, what is written of it again, and the error of either.
+struct Result {
+    std::string object, written, error = "no error\n";
+};
 
-    void run(const Options& options) {
-        _error.reset();
-        _object.reset();
-        _written = qx::String();
-        const auto mapping = qx::XMLDocument::initWithData(_mapping, {}, &_error);
-        const auto marshaller = QXXMLMarshaller::initWithMappingXML(mapping.get(), &_error);
-        if (!marshaller)
-            return;
+Result run(const std::string& mapping, const std::string& document, const Options& options) {
+    Result result;
+    qx::Ref<qx::Error> error;
+    const auto source = qx::XMLDocument::initWithData(
+        mapping.starts_with("<mapping") ? mapping : "<mapping>" + mapping + "</mapping>", {},
+        &error);
+    if (const auto marshaller = QXXMLMarshaller::initWithMappingXML(source.get(), &error)) {
         marshaller->setLenient(!options.contains("strict"));
         marshaller->setSaveUnknownXML(!options.contains("discard"));
         marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
-        _object = marshaller->readString(_document, &_error);
-        _shown = support::show(_object);
-        if (!_object)
-            return;
-        if (const auto element = marshaller->marshallObject(_object, &_error))
-            _written = element->XMLString(qx::XMLPrettyPrint);
+        const auto object = marshaller->readString(document, &error);
+        result.object = support::show(object);
+        const auto element = object ? marshaller->marshallObject(object, &error) : nullptr;
+        result.written = element ? element->XMLString(qx::XMLPrettyPrint).str() + "\n" : "";
     }
-
-    const std::string& shown() const { return _shown; }
-    std::string written() const { return _written.str() + "\n"; }
-    std::string error() const {
-        if (!_error)
-            return "no error\n";
-        return std::to_string(_error->code()) + ": " + _error->localizedDescription().str() + "\n";
-    }
-
-private:
-    std::string _mapping, _document;
-    qx::Ref<qx::Error> _error;
-    qx::Ref<qx::Object> _object;
-    std::string _shown;
-    qx::String _written;
-};
+    if (error)
+        result.error =
+            std::to_string(error->code()) + ": " + error->localizedDescription().str() + "\n";
+    return result;
+}
 
 // How many blocks were compared.
 std::size_t runPage(const std::string& page) {
     std::size_t compared = 0;
-    Sample sample;
+    std::string mapping, document;
     for (const auto& block : support::blocksOf(QX_SOURCE_DIR "/docs/" + page)) {
         SCOPED_TRACE(page + ":" + std::to_string(block.line));
         std::istringstream words(block.heading);
         std::string language, kind;
         words >> language >> kind;
         if (kind == "mapping")
-            sample.setMapping(block.text);
+            mapping = block.text;
         if (kind == "document")
-            sample.setDocument(block.text);
+            document = block.text;
         if (kind != "object" && kind != "written" && kind != "error")
             continue;
-        sample.run({std::istream_iterator<std::string>(words), {}});
+        const Result result =
+            run(mapping, document, {std::istream_iterator<std::string>(words), {}});
         if (kind == "object")
-            EXPECT_EQ(withoutLayout(sample.shown()), withoutLayout(block.text)) << sample.error();
+            EXPECT_EQ(withoutLayout(result.object), withoutLayout(block.text)) << result.error;
         else
-            EXPECT_EQ(kind == "error" ? sample.error() : sample.written(), block.text);
+            EXPECT_EQ(kind == "error" ? result.error : result.written, block.text);
         ++compared;
     }
     return compared;

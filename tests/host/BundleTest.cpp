@@ -1,10 +1,10 @@
 #include <QXXMLMarshalling/host/Bundle.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
-#include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Data.h>
 
 #include "support/FileSandbox.h"
+#include "support/Show.h"
 
 #include <gtest/gtest.h>
 
@@ -14,8 +14,7 @@ using namespace qx;
 
 namespace {
 
-class BundleTest : public ::testing::Test {
-protected:
+struct BundleTest : ::testing::Test {
     FileSandbox sandbox;
 };
 
@@ -28,9 +27,6 @@ const std::type_info& typeOfRunTime() {
 }
 
 } // namespace
-
-extern "C" void makeLastingObjects();
-extern "C" void makeLastingObjects() { Bundle::bundleForClass(typeOfRunTime()); }
 
 TEST_F(BundleTest, TheInfoDictionaryHoldsEveryKindOfAPropertyList) {
     sandbox.write("app/Info.plist", R"(<?xml version="1.0" encoding="UTF-8"?>
@@ -46,14 +42,10 @@ TEST_F(BundleTest, TheInfoDictionaryHoldsEveryKindOfAPropertyList) {
     const auto bundle = Bundle::bundleWithPath(sandbox.path("app"));
     const auto info = bundle->infoDictionary();
     Bundle::forget(bundle);
-    EXPECT_EQ(info->count(), 6U);
-    EXPECT_EQ(info->get("text"), Value("a & b"));
-    EXPECT_EQ(info->get("blank"), Value(" "));
-    EXPECT_EQ(info->get("none"), Value(""));
-    EXPECT_EQ(info->get("when"), Value("2020-01-02T03:04:05Z"));
-    const auto expected = make<Array>(std::initializer_list<Value>{1, true, make<Dictionary>()});
-    EXPECT_EQ(info->get("list"), Value(expected));
     EXPECT_EQ(info->get("bytes").as<Data>()->view(), "hello");
+    info->remove("bytes");
+    EXPECT_EQ(support::show(info), "{blank: \" \", list: [1, true, {}], none: \"\", "
+                                   "text: \"a & b\", when: \"2020-01-02T03:04:05Z\"}");
 }
 
 TEST_F(BundleTest, ResourcesAreFoundInsideTheBundleOnly) {

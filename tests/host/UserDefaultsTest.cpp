@@ -11,15 +11,13 @@
 #include <sys/stat.h>
 
 #include <atomic>
-#include <functional>
 #include <thread>
 
 using namespace qx;
 
 namespace {
 
-class UserDefaultsTest : public ::testing::Test {
-protected:
+struct UserDefaultsTest : ::testing::Test {
     ~UserDefaultsTest() override {
         defaults->setArguments({});
         defaults->removeObjectForKey("Key");
@@ -129,36 +127,27 @@ TEST_F(UserDefaultsTest, WhatOneThreadReadsStaysWhileAnotherForgetsTheFile) {
 
 TEST_F(UserDefaultsTest, AnUnusableFileIsWarnedAboutOnceAndHoldsNothing) {
     const std::string path = sandbox.write("config/Client.plist", "");
-    const auto text = [&](const char* bytes) {
-        return [this, bytes] { sandbox.write("config/Client.plist", bytes); };
-    };
-    const auto link = [&](const char* target) {
-        return [&path, target] {
-            std::filesystem::remove(path);
-            std::filesystem::create_symlink(target, path);
-        };
-    };
-    const std::function<void()> layouts[]{
-        text("<plist><dict>"),
-        text(""),
-        text("<plist><string>x</string></plist>"),
-        text("<plist/>"),
-        [&] { std::filesystem::resize_file(path, std::uintmax_t{1} << 40U); },
-        link("/dev/zero"),
-        link("/"),
-        [&] {
-            std::filesystem::remove(path);
-            ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
-        }};
-    for (const auto& lay : layouts) {
-        lay();
+    const std::string huge = sandbox.write("huge", ""), pipe = sandbox.path("pipe");
+    std::filesystem::resize_file(huge, std::uintmax_t{1} << 40U);
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    const auto expectOneWarning = [&](const std::string& content) {
         defaults->synchronize();
         ::testing::internal::CaptureStderr();
         EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
         EXPECT_TRUE(defaults->objectForKey("Absent").isNull());
         const std::string warning = ::testing::internal::GetCapturedStderr();
-        EXPECT_NE(warning.find(path), std::string::npos) << warning;
-        EXPECT_EQ(std::count(warning.begin(), warning.end(), '\n'), 1) << warning;
+        EXPECT_NE(warning.find(path), std::string::npos) << content << ": " << warning;
+        EXPECT_EQ(std::count(warning.begin(), warning.end(), '\n'), 1) << content << warning;
+    };
+    for (const char* text :
+         {"<plist><dict>", "", "<plist><string>x</string></plist>", "<plist/>"}) {
+        sandbox.write("config/Client.plist", text);
+        expectOneWarning(text);
+    }
+    for (const std::string& target : {std::string("/dev/zero"), std::string("/"), huge, pipe}) {
+        std::filesystem::remove(path);
+        std::filesystem::create_symlink(target, path);
+        expectOneWarning(target);
     }
 }
 

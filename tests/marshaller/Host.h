@@ -6,60 +6,86 @@
 
 #include <QXXMLMarshalling/model/Class.h>
 
+#include <gtest/gtest.h>
+
+#include <array>
+
 namespace host {
 
-template <int Number>
+constexpr std::array keys{
+    "title",        "count",   "flag",  "text",  "note", "lines",           "address",
+    "street",       "city",    "owner", "extra", "base", "unboundChildren", "unboundAttributes",
+    "__namespaces", "id",      "child", "word",  "flat", "typed",           "located",
+    "named",        "wrapped", "all"};
+
+// `wasSet` is called after each setting.
 class Host : public qx::Object {
 public:
-    qx::Value title, number, count, flag, text, note, lang;
-    qx::Value lines, line, address, street, city, owner, extra, base;
-    qx::Value unboundChildren, unboundAttributes, namespaces;
-    bool isRemovable() const { return false; }
+    template <std::size_t Key>
+    void set(const qx::Value& value) {
+        _values[Key] = value;
+        wasSet();
+    }
+    template <std::size_t Key>
+    qx::Value get() const {
+        return _values[Key];
+    }
+    virtual bool isRemovable() const { return false; }
+
+protected:
+    virtual void wasSet() {}
+
+private:
+    qx::Value _values[keys.size()];
 };
 
-template <int Number>
-void defineHost(const char* name) {
-    using H = Host<Number>;
-    qx::Class::define<H>(name)
-        .template property<&H::title>("title")
-        .template property<&H::number>("number")
-        .template property<&H::count>("count")
-        .template property<&H::flag>("flag")
-        .template property<&H::text>("text")
-        .template property<&H::note>("note")
-        .template property<&H::lang>("lang")
-        .template property<&H::lines>("lines")
-        .template property<&H::line>("line")
-        .template property<&H::address>("address")
-        .template property<&H::street>("street")
-        .template property<&H::city>("city")
-        .template property<&H::owner>("owner")
-        .template property<&H::extra>("extra")
-        .template property<&H::base>("base")
-        .template property<&H::unboundChildren>("unboundChildren")
-        .template property<&H::unboundAttributes>("unboundAttributes")
-        .template property<&H::namespaces>("__namespaces")
-        .template operation<&H::isRemovable>("isRemovable");
+template <class Builder, std::size_t... Key>
+void describe(Builder& builder, std::index_sequence<Key...>) {
+    (builder.template property<&Host::get<Key>, &Host::set<Key>>(keys[Key]), ...);
+    builder.template operation<&Host::isRemovable>("isRemovable");
+}
+template <class Builder>
+void describe(Builder&& builder) {
+    describe(builder, std::make_index_sequence<keys.size()>());
 }
 
-constexpr const char* names[] = {"Order", "Line", "Address", "Owner", "Base"};
-
-// Describes the classes for the time of a scope.
+// Describes a class of its own for each name, for the time of a scope.
 class Defined {
 public:
     Defined() {
-        defineHost<0>(names[0]);
-        defineHost<1>(names[1]);
-        defineHost<2>(names[2]);
-        defineHost<3>(names[3]);
-        defineHost<4>(names[4]);
+        define<0>();
+        define<1>();
+        define<2>();
+        define<3>();
+        define<4>();
     }
     ~Defined() {
         for (const char* name : names)
             qx::Class::forget(name);
     }
-    Defined(const Defined&) = delete;
-    Defined& operator=(const Defined&) = delete;
+
+private:
+    static constexpr const char* names[] = {"Order", "Line", "Address", "Owner", "Base"};
+
+    template <int Number>
+    static void define() {
+        struct Numbered : Host {};
+        describe(qx::Class::define<Numbered>(names[Number]));
+    }
 };
+
+// Runs each row of a table on records, then on host classes.
+template <class Table, class Run>
+void forRecordsAndHosts(const Table& table, Run run) {
+    const auto runAll = [&](const char* kind) {
+        for (const auto& row : table) {
+            SCOPED_TRACE(row.question + std::string(kind));
+            run(row);
+        }
+    };
+    runAll(", on records");
+    const Defined defined;
+    runAll(", on host classes");
+}
 
 } // namespace host

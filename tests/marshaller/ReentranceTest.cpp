@@ -1,6 +1,7 @@
 // Host objects that turn on the reading that makes them: whatever their setters do to the document,
 // the marshaller and its options, no freed memory is used and no list loses an item.
 
+#include "Host.h"
 #include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
@@ -8,6 +9,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 
 #include <functional>
+#include <utility>
 
 namespace {
 
@@ -22,9 +24,17 @@ struct Meddling {
         if (countdown-- == 0)
             act();
     }
+    // Whether there were as many calls in the course of it.
+    template <class Course>
+    static bool during(int call, std::function<void()> what, Course course) {
+        act = std::move(what);
+        countdown = call;
+        course();
+        return std::exchange(countdown, -1) < 0;
+    }
 };
 
-class Meddler : public qx::Object {
+class Meddler : public host::Host {
 public:
     Meddler() { Meddling::call(); }
     void setClassName(const qx::String&) { Meddling::call(); }
@@ -32,49 +42,22 @@ public:
     void setUndoManager(qx::UndoManager*) { Meddling::call(); }
     qx::Object* rootObject() { return this; }
     void setParent(qx::Object*) { Meddling::call(); }
-    bool isRemovable() const {
+    bool isRemovable() const override {
         Meddling::call();
-        return false;
+        return Host::isRemovable();
     }
 
-    template <int Key>
-    void set(const Value& value) {
-        values[Key] = value;
-        Meddling::call();
-    }
-    template <int Key>
-    Value get() const {
-        return values[Key];
-    }
-    Value values[13];
+protected:
+    void wasSet() override { Meddling::call(); }
 };
 
-template <int Key>
-void describe(qx::ClassBuilder<Meddler>& builder, const char* key) {
-    builder.property<&Meddler::get<Key>, &Meddler::set<Key>>(key);
-}
-
 const bool described = [] {
-    auto builder = qx::Class::define<Meddler>("ReentranceTest.Meddler");
-    describe<0>(builder, "id");
-    describe<1>(builder, "text");
-    describe<2>(builder, "child");
-    describe<3>(builder, "word");
-    describe<4>(builder, "flat");
-    describe<5>(builder, "typed");
-    describe<6>(builder, "located");
-    describe<7>(builder, "named");
-    describe<8>(builder, "wrapped");
-    describe<9>(builder, "all");
-    describe<10>(builder, "unboundChildren");
-    describe<11>(builder, "unboundAttributes");
-    describe<12>(builder, "__namespaces");
-    builder.operation<&Meddler::setClassName>("setClassNameForMarshalling:")
-        .operation<&Meddler::setNotify>("setNotifyBindingsObservers:")
-        .operation<&Meddler::setUndoManager>("setUndoManager:")
-        .operation<&Meddler::rootObject>("rootObject")
-        .operation<&Meddler::setParent>("setParent:")
-        .operation<&Meddler::isRemovable>("isRemovable");
+    host::describe(qx::Class::define<Meddler>("ReentranceTest.Meddler")
+                       .operation<&Meddler::setClassName>("setClassNameForMarshalling:")
+                       .operation<&Meddler::setNotify>("setNotifyBindingsObservers:")
+                       .operation<&Meddler::setUndoManager>("setUndoManager:")
+                       .operation<&Meddler::rootObject>("rootObject")
+                       .operation<&Meddler::setParent>("setParent:"));
     return true;
 }();
 
@@ -84,33 +67,19 @@ enum class Order { host, flatFirst, record };
 
 // Every kind of field, before and after a flattened one has made its private copy.
 std::string mapping(Order order) {
-    const bool flatFirst = order == Order::flatFirst;
     const std::string type = "type='ReentranceTest.Meddler'";
-    const std::string flat = "<field name='flat' type='Flat' container='false'>"
-                             "<bind-xml node='element'/></field>";
-    return "<class name='Order' " + (order == Order::record ? "" : type) +
-           "><map-to xml='order'/>" + (flatFirst ? flat : "") +
-           "<field name='id'><bind-xml node='attribute' location='head'/></field>"
-           "<field name='located' collection='array' type='Item'>"
-           "<bind-xml name='l' location='box'/></field>"
-           "<field name='typed' collection='array' type='Item'><bind-xml name='t'/></field>"
-           "<field name='named' collection='array'><bind-xml name='item'/></field>"
-           "<field name='wrapped' collection='array'><bind-xml name='wrap'/></field>"
-           "<field name='child'><bind-xml name='one' node='element'/></field>"
-           "<field name='word'><bind-xml node='element'/></field>"
-           "<field name='all' collection='array'><bind-xml/></field>" +
-           (flatFirst ? "" : flat) +
-           "<field name='text'><bind-xml node='text'/></field></class>"
-           "<class name='Flat' " +
-           type +
-           "><field name='word'><bind-xml name='w' node='element'/></field></class>"
-           "<class name='Item' " +
-           type +
-           "><map-to xml='item'/><field name='id'><bind-xml node='attribute'/></field>"
-           "<field name='text'><bind-xml node='text'/></field></class>"
-           "<class name='One' " +
-           type +
-           "><map-to xml='one'/><field name='id'><bind-xml node='attribute'/></field></class>";
+    const std::string flat = "<flat type='Flat' container='false' node='element'/>";
+    const std::string others =
+        "<id node='attribute' location='head'/>"
+        "<located collection='array' type='Item' name='l' location='box'/>"
+        "<typed collection='array' type='Item' name='t'/><named collection='array' name='item'/>"
+        "<wrapped collection='array' name='wrap'/><child name='one' node='element'/>"
+        "<word node='element'/><all collection='array'/>";
+    return "<Order xml='order' " + (order == Order::record ? "" : type) + ">" +
+           (order == Order::flatFirst ? flat + others : others + flat) +
+           "<text node='text'/></Order><Flat " + type + "><word name='w' node='element'/></Flat>" +
+           "<Item xml='item' " + type + "><id node='attribute'/><text node='text'/></Item>" +
+           "<One xml='one' " + type + "><id node='attribute'/></One>";
 }
 
 std::string document() {
@@ -120,12 +89,11 @@ std::string document() {
             items += "<" + name + " id='" + id + "' more='m'>x<u/></" + name + ">";
         return items;
     };
-    std::string padding; // so many children that an index is built of them
-    for (int i = 0; i < 30; ++i)
-        padding += "<p/>";
     return "<order xmlns:n='urn:n' spare='s'><head id='h'/><one id='1'/><word>w</word><w>f</w>" +
            two("t") + "<box>" + two("l") + "</box>" + two("item") + "<wrap>" + two("item") +
-           "</wrap><unknown><deep/></unknown>" + padding + "</order>";
+           "</wrap><unknown><deep/></unknown>" +
+           // So many children that they are looked up in an index.
+           scenario::repeated("<p/>", 30) + "</order>";
 }
 
 void takeApart(qx::XMLElement& element) {
@@ -142,23 +110,13 @@ struct Reading {
     Ref<qx::XMLDocument> source;
 };
 
-struct Act {
-    const char* name;
-    void (*act)(Reading&);
-};
-
-constexpr Act acts[] = {
+const std::pair<const char*, void (*)(Reading&)> acts[] = {
     {"takes the document apart",
      [](Reading& reading) { takeApart(*reading.source->rootElement()); }},
-    {"lets go of everything",
-     [](Reading& reading) {
-         reading.source = nullptr;
-         reading.marshaller = nullptr;
-     }},
+    {"lets go of everything", [](Reading& reading) { reading = {}; }},
     {"moves the document's nodes into another",
      [](Reading& reading) {
-         const auto other =
-             scenario::marshaller("<class name='Order'><map-to xml='order'/></class>");
+         const auto other = scenario::marshaller("<Order xml='order'/>");
          other->marshall(other->unmarshall(reading.source));
      }},
     {"reads the same once more",
@@ -171,54 +129,48 @@ constexpr Act acts[] = {
      }},
 };
 
-void checkAndWrite(const Ref<qx::Object>& order, const std::string& mappingXML) {
+// Reads, acts at that call of the host, and writes what came. False when there were fewer calls.
+bool actsAt(int call, void (*act)(Reading&), const std::string& mapping) {
+    Reading reading{scenario::marshaller(mapping), qx::XMLDocument::initWithData(document())};
+    QXXMLMarshaller& marshaller = *reading.marshaller;
+    Ref<qx::Error> error;
+    Ref<qx::Object> order;
+    const bool hasActed = Meddling::during(
+        call, [&] { act(reading); },
+        [&] { order = marshaller.unmarshall(reading.source, &error); });
+    EXPECT_NE(!order, !error);
+    if (!order)
+        return hasActed;
     for (const char* key : {"typed", "located", "named", "wrapped"}) {
         const auto list = order->valueForKey(key).as<qx::Array>();
         EXPECT_TRUE(!list || list->isEmpty() || list->count() == 2) << key << list->count();
     }
-    scenario::marshaller(mappingXML)->marshall(order);
+    scenario::marshaller(mapping)->marshall(order);
+    return hasActed;
 }
 
 } // namespace
 
 TEST(Reentrance, WhateverHostObjectsDoMeanwhileListsComeWhole) {
-    const std::string xml = document();
-    for (const Act& act : acts) {
+    for (const auto& [name, act] : acts) {
         for (const Order kind : {Order::host, Order::flatFirst, Order::record}) {
-            const auto mappingXML = mapping(kind);
-            for (int call = 0;; ++call) {
-                SCOPED_TRACE(std::string(act.name) + " at call " + std::to_string(call));
-                Reading reading{scenario::marshaller(mappingXML),
-                                qx::XMLDocument::initWithData(xml)};
-                Meddling::act = [&] { act.act(reading); };
-                Meddling::countdown = call;
-                QXXMLMarshaller& marshaller = *reading.marshaller;
-                Ref<qx::Error> error;
-                const auto order = marshaller.unmarshall(reading.source, &error);
-                const bool hasActed = Meddling::countdown < 0;
-                Meddling::countdown = -1;
-                EXPECT_NE(!order, !error);
-                if (order)
-                    checkAndWrite(order, mappingXML);
-                if (!hasActed)
-                    break;
-            }
+            SCOPED_TRACE(name);
+            for (int call = 0; actsAt(call, act, mapping(kind)); ++call)
+                ASSERT_FALSE(testing::Test::HasFailure()) << "at call " << call;
         }
     }
 }
 
 TEST(Reentrance, OptionsHoldFromTheMomentTheyAreSet) {
     const auto marshaller =
-        scenario::marshaller("<class name='One' type='ReentranceTest.Meddler'><map-to xml='one'/>"
-                             "<field name='word'><bind-xml node='element'/></field>"
-                             "<field name='id'><bind-xml node='attribute'/></field></class>",
+        scenario::marshaller("<One type='ReentranceTest.Meddler' xml='one'><word "
+                             "node='element'/><id node='attribute'/></One>",
                              scenario::discard);
     const auto read = [&](std::function<void()> act) {
-        Meddling::act = std::move(act);
-        Meddling::countdown = 4; // the setter of the first field
-        const std::string shown =
-            scenario::read(*marshaller, "<one id='1' b='2'><word>w</word><x/></one>");
-        Meddling::countdown = -1;
+        std::string shown;
+        Meddling::during(4, std::move(act), [&] { // in the setter of the first field
+            shown = scenario::read(*marshaller, "<one id='1' b='2'><word>w</word><x/></one>");
+        });
         return shown;
     };
     EXPECT_EQ(read([&] { marshaller->setLenient(false); }),
@@ -232,29 +184,24 @@ TEST(Reentrance, OptionsHoldFromTheMomentTheyAreSet) {
 
 TEST(Reentrance, AWritingHoldsWhatItsGettersLetGoOf) {
     auto marshaller =
-        scenario::marshaller("<class name='ReentranceTest.Meddler'><map-to xml='one'/>"
-                             "<field name='all' collection='array'><bind-xml/></field>"
-                             "<field name='id'><bind-xml node='attribute'/></field></class>");
+        scenario::marshaller("<ReentranceTest.Meddler xml='one'><all collection='array'/><id "
+                             "node='attribute'/></ReentranceTest.Meddler>");
     const auto item = qx::make<Meddler>();
-    item->set<0>("2");
-    const auto items = qx::make<qx::Array>();
-    items->add(item);
+    item->setValueForKey("2", "id");
     Value object = qx::make<Meddler>();
-    object.object()->setValueForKey(items, "all");
+    object.object()->setValueForKey(qx::make<qx::Array>(std::vector<Value>{item}), "all");
     object.object()->setValueForKey("1", "id");
-    Meddling::act = [&] { object = marshaller = nullptr; };
-    Meddling::countdown = 0; // asked for the item
-    EXPECT_NE(marshaller->writeString(object).view().find("<one id=\"1\">\n    <one id=\"2\""),
-              std::string_view::npos);
-    Meddling::countdown = -1;
+    qx::String text;
+    Meddling::during(
+        0, [&] { object = marshaller = nullptr; }, // asked for the item
+        [&] { text = marshaller->writeString(object); });
+    EXPECT_NE(text.view().find("<one id=\"1\">\n    <one id=\"2\""), std::string_view::npos);
 }
 
 TEST(Reentrance, AnItemMayTakeItselfOutOfTheListThatItIsSetThrough) {
-    const auto items = qx::make<qx::Array>();
-    items->add(qx::make<Meddler>());
-    Meddling::act = [&] { items->removeAll(); };
-    Meddling::countdown = 0;
-    EXPECT_THROW(items->trySetValueForKey("1", "id"), qx::Exception); // it changed while walked
-    Meddling::countdown = -1;
+    const auto items = qx::make<qx::Array>(std::vector<Value>{qx::make<Meddler>()});
+    Meddling::during(
+        0, [&] { items->removeAll(); },
+        [&] { EXPECT_THROW(items->trySetValueForKey("1", "id"), qx::Exception); });
     EXPECT_EQ(items->count(), 0U);
 }

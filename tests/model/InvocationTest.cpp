@@ -12,16 +12,14 @@ namespace {
 using namespace qx;
 using support::raised;
 
-class Singer : public Object {
-public:
+struct Singer : Object {
     String sing(const String& what) const { return String::concat({"la ", what}); }
     void setLoud(bool value) { loud = value; }
     bool loud = false;
 };
 
 // Hands what it does not answer itself to its friend.
-class Proxy : public Object {
-public:
+struct Proxy : Object {
     explicit Proxy(Ref<Object> other) : friendly(std::move(other)) {}
     Ref<MethodSignature> methodSignatureForSelector(Selector selector) const override {
         Ref<MethodSignature> own = Object::methodSignatureForSelector(selector);
@@ -54,7 +52,7 @@ TEST(InvocationTest, AClassMayForwardWhatItDoesNotAnswer) {
 }
 
 TEST(InvocationTest, AnUnansweredOperationRaisesWithClassAndNameThoughItWerePromised) {
-    class Promising : public Object {
+    struct Promising : Object {
         Ref<MethodSignature> methodSignatureForSelector(Selector) const override {
             return make<MethodSignature>(0, true);
         }

@@ -17,8 +17,8 @@ using support::raised;
 class Wagon : public Object {
 public:
     Ref<Wagon> next;
-    Ref<Wagon> engine;
     Value load;
+    signed char seats = 0;
 };
 
 // Nobody describes these two.
@@ -29,22 +29,20 @@ struct Painted {
 };
 class DiningCar : public Painted, public Coach {};
 
-class Sleeper : public DiningCar {
-public:
+struct Sleeper : DiningCar {
     int beds = 0;
 };
-class Siding : public Object {
-public:
+struct Siding : Object {
     int length = 0;
 };
-class LongSiding : public Siding {};
+struct LongSiding : Siding {};
 
 const bool described = [] {
     Class::define<Sleeper, DiningCar>("ObjectTest.Sleeper").property<&Sleeper::beds>("beds");
     Class::define<Wagon>("ObjectTest.Wagon")
         .property<&Wagon::next>("next")
-        .property<&Wagon::engine>("engine")
-        .property<&Wagon::load>("load");
+        .property<&Wagon::load>("load")
+        .property<&Wagon::seats>("seats");
     return true;
 }();
 
@@ -84,6 +82,9 @@ TEST(ObjectTest, KeyPathsPassOverNullAndRaiseAtWhatIsNoObject) {
     station->load = train;
     EXPECT_EQ(support::oneLine(station->valueForKeyPath("load.next.load")),
               "( tea, <null>, <null> )");
+    EXPECT_EQ(train->valueForKey("@count"), Value(3));
+    const auto mixed = make<Array>(std::initializer_list<Value>{wagon, "text"});
+    EXPECT_EQ(mixed->trySetValueForKey(1, "seats"), SetOutcome::unknownKey);
     station->setValueForKeyPath("milk", "load.next.load");
     EXPECT_EQ(wagon->next->load, "milk");
     for (const Value& missing : {Value(), Value(Null::marker())}) {
@@ -96,6 +97,11 @@ TEST(ObjectTest, KeyPathsPassOverNullAndRaiseAtWhatIsNoObject) {
               "NSUndefinedKeyException: class <string> has no key next to set");
     EXPECT_EQ(raised([&] { station->valueForKeyPath("load.next.load"); }),
               "NSUndefinedKeyException: class <string> has no key next.load to read");
+    EXPECT_EQ(raised([&] { wagon->valueForKeyPath("next.nothing"); }),
+              "NSUndefinedKeyException: class ObjectTest.Wagon has no key nothing to read");
+    EXPECT_EQ(raised([&] { wagon->setValueForKey("x", "seats"); }),
+              "NSInvalidArgumentException: class ObjectTest.Wagon does not take the value x for "
+              "its key seats");
 }
 
 } // namespace

@@ -1,7 +1,7 @@
 #pragma once
 
-// Memory that fails when a test says so, for the programs *_without_memory.cpp: it replaces
-// operator new and, where that can be done, realloc, and belongs in one source of a program.
+// Memory that fails when a test says so: it replaces operator new, what the C parser allocates with
+// and, where that can be done, realloc, and belongs in one source of a program.
 //
 //     failing::eachAllocation([](long n) {
 //         return failing::run(n, [] { … }); // the n-th allocation fails in there
@@ -9,10 +9,12 @@
 
 #include <cstddef>
 #include <cstdlib>
+#include <cstring>
 #include <functional>
 #include <new>
 
 #include <dlfcn.h>
+#include <libxml/parser.h>
 
 namespace failing {
 
@@ -75,6 +77,24 @@ inline void eachAllocation(const std::function<Outcome(long)>& attempt) {
         for (long n = 0; attempt(n) != Outcome::undisturbed;)
             ++n;
     }
+}
+
+// To be called before anything is parsed.
+inline void replaceParserMemory() {
+    const auto reallocate = [](void* block, std::size_t size) {
+#ifdef __clang__
+        if (failsNow())
+            return static_cast<void*>(nullptr);
+#endif
+        return std::realloc(block, size);
+    };
+    const auto duplicate = [](const char* text) {
+        void* const copy = allocate(std::strlen(text) + 1);
+        return copy != nullptr ? std::strcpy(static_cast<char*>(copy), text) : nullptr;
+    };
+    const auto take = [](std::size_t size) { return allocate(size); };
+    if (::xmlMemSetup(std::free, take, reallocate, duplicate) != 0)
+        std::abort();
 }
 
 } // namespace failing

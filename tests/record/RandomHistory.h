@@ -3,9 +3,10 @@
 // Objects changed at random under one undo manager, beside a plain list of the states that they
 // went through. Undoing and redoing must walk that list, whatever the objects are.
 //
-//     ASSERT_TRUE(RandomHistory(seed, objects, rename).agreesFor(30)) << "seed " << seed;
+//     ASSERT_TRUE(RandomHistory(seed, objects).agreesFor(30)) << "seed " << seed;
 
 #include <QXXMLMarshalling/model/Value.h>
+#include <QXXMLMarshalling/observe/Observation.h>
 #include <QXXMLMarshalling/undo/UndoManager.h>
 
 #include <optional>
@@ -15,13 +16,10 @@
 
 class RandomHistory {
 public:
-    // Changes "name" without setValueForKey.
-    using Rename = void (*)(qx::Object&, const qx::String&);
-
     // The objects answer "setUndoManager:", take texts and null for "name", numbers for "age" and
     // each other and null for "partner".
-    RandomHistory(unsigned seed, std::vector<qx::Ref<qx::Object>> objects, Rename rename)
-        : _random(seed), _objects(std::move(objects)), _rename(rename) {
+    RandomHistory(unsigned seed, std::vector<qx::Ref<qx::Object>> objects)
+        : _random(seed), _objects(std::move(objects)) {
         for (const auto& object : _objects)
             object->perform("setUndoManager:", _manager);
         _states.push_back(state());
@@ -34,8 +32,6 @@ public:
         }
         _manager->removeAllActions();
     }
-    RandomHistory(const RandomHistory&) = delete;
-    RandomHistory& operator=(const RandomHistory&) = delete;
 
     // Makes so many steps, then undoes and redoes all. False as soon as objects and list disagree.
     bool agreesFor(int steps) {
@@ -43,20 +39,12 @@ public:
             const unsigned choice = below(6);
             if (choice > 1)
                 change();
-            else if (!(choice == 0 ? undo() : redo()))
-                return false;
+            else
+                walk(choice == 0 ? -1 : 1);
             if (!agrees())
                 return false;
         }
-        while (_manager->canUndo())
-            if (!undo())
-                return false;
-        if (_position != 0)
-            return false;
-        while (_manager->canRedo())
-            if (!redo())
-                return false;
-        return _position + 1 == _states.size();
+        return walksAllTheWay(-1) && walksAllTheWay(1);
     }
 
 private:
@@ -75,17 +63,19 @@ private:
         return state() == _states[_position] && _manager->canUndo() == (_position > 0) &&
                _manager->canRedo() == (_position + 1 < _states.size());
     }
-    bool undo() {
-        _manager->undo();
-        if (_position > 0)
-            --_position;
-        return agrees();
+    // One undo or redo, if there is one.
+    void walk(int direction) {
+        direction < 0 ? _manager->undo() : _manager->redo();
+        if (_position + direction < _states.size())
+            _position += direction;
     }
-    bool redo() {
-        _manager->redo();
-        if (_position + 1 < _states.size())
-            ++_position;
-        return agrees();
+    bool walksAllTheWay(int direction) {
+        while (direction < 0 ? _manager->canUndo() : _manager->canRedo()) {
+            walk(direction);
+            if (!agrees())
+                return false;
+        }
+        return true;
     }
     void setSomething() {
         qx::Object& object = *_objects[below(size())];
@@ -93,8 +83,10 @@ private:
         switch (below(4)) {
         case 0:
             return object.setValueForKey(number, "age");
-        case 1:
-            return _rename(object, std::to_string(number));
+        case 1: {
+            const qx::ChangeScope scope(object, "name");
+            return object.setValueForKey(std::to_string(number), "name");
+        }
         case 2:
             return object.setValueForKey(nullptr, below(2) == 0 ? "name" : "partner");
         default:
@@ -129,7 +121,6 @@ private:
     std::mt19937 _random;
     qx::Ref<qx::UndoManager> _manager = qx::make<qx::UndoManager>();
     std::vector<qx::Ref<qx::Object>> _objects;
-    Rename _rename;
     std::vector<State> _states;
     std::size_t _position = 0;
 };

@@ -3,8 +3,11 @@
 #include <QXXMLMarshalling/base/Exception.h>
 
 #include "support/FileSandbox.h"
+#include "support/Texts.h"
 
 #include <gtest/gtest.h>
+
+#include <utility>
 
 #include <sys/stat.h>
 
@@ -169,41 +172,31 @@ TEST_F(FileSystemRepositoryTest, DocumentsAndDataAreReadFromTheFileFound) {
     EXPECT_EQ(repository->dataForName("maps/a.xml", &error)->view(), "<a/>");
 }
 
-TEST_F(FileSystemRepositoryTest, ANameThatLeavesItsDirectoryFindsNothingAndIsNotWritten) {
+TEST_F(FileSystemRepositoryTest, ANameOrVersionThatLeavesItsDirectoryFindsNothingAndIsNotWritten) {
     const std::string outside = sandbox.write("data/outside.xml", "<out/>");
     std::filesystem::create_directories(sandbox.path("data/Client"));
+    const auto refuses = [&](const String& written) {
+        EXPECT_TRUE(written.isNull());
+        EXPECT_TRUE(support::told(std::exchange(error, {})).starts_with("514: The file name is"));
+    };
     const auto repository = QXXMLFileSystemDataRepository::init();
-    for (const std::string& name : {std::string(), std::string("../outside.xml"), outside,
-                                    std::string("."), std::string("x/../../outside.xml")}) {
-        error.reset();
-        EXPECT_FALSE(repository->containsDocument(name)) << name;
-        EXPECT_FALSE(repository->dataForName(name, &error)) << name;
+    for (const char* name : {"", "../outside.xml", outside.c_str(), ".", "x/../../outside.xml"}) {
+        SCOPED_TRACE(name);
+        EXPECT_FALSE(repository->containsDocument(name) || repository->dataForName(name, &error));
         EXPECT_FALSE(error);
-        EXPECT_TRUE(repository->writeFileToUserOverrideArea(data("new"), name, &error).isNull());
-        ASSERT_TRUE(error) << name;
-        EXPECT_EQ(error->code(), 514);
-        EXPECT_EQ(error->localizedDescription(), "The file name is invalid.");
+        refuses(repository->writeFileToUserOverrideArea(data("new"), name, &error));
     }
     EXPECT_FALSE(repository->containsDocument(nullptr));
-    EXPECT_EQ(sandbox.read("data/outside.xml"), "<out/>");
-    EXPECT_EQ(sandbox.list("data/Client"), "");
-}
-
-TEST_F(FileSystemRepositoryTest, AVersionThatLeavesTheProgramsDirectoryHasNone) {
-    sandbox.write("data/a.xml", "<out/>");
     for (const char* version : {"((", "..", "."}) {
+        SCOPED_TRACE(version);
         ProcessInfo::setProcessVersion(version, "");
-        const auto repository = QXXMLFileSystemDataRepository::init();
-        EXPECT_EQ(pathsOf(*repository), "/data/Client ") << version;
-        EXPECT_FALSE(repository->containsData("a.xml"));
-        error.reset();
-        EXPECT_TRUE(
-            repository->writeFileToVersionedUserOverrideArea(data("x"), "a.xml", &error).isNull());
-        ASSERT_TRUE(error) << version;
-        EXPECT_EQ(error->code(), 514);
+        const auto versioned = QXXMLFileSystemDataRepository::init();
+        EXPECT_EQ(pathsOf(*versioned), "/data/Client ");
+        EXPECT_FALSE(versioned->containsData("outside.xml"));
+        refuses(versioned->writeFileToVersionedUserOverrideArea(data("x"), "a.xml", &error));
     }
-    EXPECT_EQ(sandbox.list("data"), "a.xml ");
-    EXPECT_EQ(sandbox.read("data/a.xml"), "<out/>");
+    EXPECT_EQ(sandbox.read("data/outside.xml"), "<out/>");
+    EXPECT_EQ(sandbox.list("data") + sandbox.list("data/Client"), "Client outside.xml ");
 }
 
 TEST_F(FileSystemRepositoryTest, WhatIsWrittenShadowsWhatShips) {
@@ -227,24 +220,22 @@ TEST_F(FileSystemRepositoryTest, WhatIsWrittenShadowsWhatShips) {
 
 TEST_F(FileSystemRepositoryTest, WhatCannotBeWrittenIsToldAndChangesNothing) {
     const auto repository = QXXMLFileSystemDataRepository::init();
-    EXPECT_TRUE(repository->writeFileToUserOverrideArea(nullptr, "a.xml", &error).isNull());
-    EXPECT_TRUE(repository->writeDocumentToUserOverrideArea(nullptr, "a.xml", &error).isNull());
-    EXPECT_EQ(error->code(), 512);
+    const auto refuses = [&](const String& written, const std::string& expected) {
+        EXPECT_TRUE(written.isNull());
+        EXPECT_TRUE(support::told(std::exchange(error, {})).starts_with(expected));
+    };
     const auto unwritable = XMLDocument::initWithData("<a/>");
     unwritable->setStringValue("\x01");
-    EXPECT_TRUE(repository->writeDocumentToUserOverrideArea(unwritable, "a.xml", &error).isNull());
-    EXPECT_EQ(error->code(), 517);
+    refuses(repository->writeFileToUserOverrideArea(nullptr, "a.xml", &error), "512: ");
+    refuses(repository->writeDocumentToUserOverrideArea(nullptr, "a.xml", &error), "512: ");
+    refuses(repository->writeDocumentToUserOverrideArea(unwritable, "a.xml", &error), "517: ");
     EXPECT_FALSE(std::filesystem::exists(sandbox.path("data")));
-
     const std::string area = sandbox.write("data/Client", "a plain file");
-    EXPECT_TRUE(repository->writeFileToUserOverrideArea(data("x"), "a.xml", &error).isNull());
-    EXPECT_EQ(error->description().str(),
-              "NSCocoaErrorDomain -2000: Application support area is not a directory: " + area +
-                  " (Unable to write XML to user area)");
-    EXPECT_TRUE(
-        repository->writeFileToVersionedUserOverrideArea(data("x"), "a.xml", &error).isNull());
-    EXPECT_EQ(error->description().str(),
-              "NSCocoaErrorDomain 512: The file cannot be written: " + area + " (Not a directory)");
+    refuses(repository->writeFileToUserOverrideArea(data("x"), "a.xml", &error),
+            "-2000: Application support area is not a directory: " + area +
+                " (Unable to write XML to user area)");
+    refuses(repository->writeFileToVersionedUserOverrideArea(data("x"), "a.xml", &error),
+            "512: The file cannot be written: " + area + " (Not a directory)");
     EXPECT_EQ(sandbox.read("data/Client"), "a plain file");
 }
 

@@ -3,7 +3,7 @@
 // What tests compare, as one text.
 
 #include <QXXMLMarshalling/base/Exception.h>
-#include <QXXMLMarshalling/model/Value.h>
+#include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <gtest/gtest.h>
@@ -33,10 +33,28 @@ inline qx::Ref<qx::XMLDocument> parsed(std::string_view text,
     return document;
 }
 
+// "-202: message (reason)", or "no error".
+inline std::string told(const qx::Ref<qx::Error>& error) {
+    if (!error)
+        return "no error";
+    return std::to_string(error->code()) + ": " + error->localizedDescription().str() + " (" +
+           error->localizedFailureReason().str() + ")";
+}
+
 // The description of a value in one line.
 inline std::string oneLine(const qx::Value& value) {
     static const std::regex layout("\\s+");
     return std::regex_replace(value.description().str(), layout, " ");
+}
+
+// What a property of the type holds when it is set to the value; "refused" when it stays as it is.
+template <class T>
+std::string taken(const qx::Value& value) {
+    T held{};
+    const std::string before = oneLine(qx::ValueTraits<T>::toValue(held));
+    const bool isTaken = qx::ValueTraits<T>::fromValue(value, held);
+    const std::string after = oneLine(qx::ValueTraits<T>::toValue(held));
+    return isTaken ? after : after == before ? "refused" : "refused, but changed to " + after;
 }
 
 } // namespace support

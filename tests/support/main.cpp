@@ -5,12 +5,6 @@
 
 #include <gtest/gtest.h>
 
-// Objects that are made once and kept: a test program that uses such of the folders above host/
-// makes them here, so that they count against no test.
-extern "C" __attribute__((weak)) void makeLastingObjects();
-// Those of the folders that a test of a low one is not linked with (lasting.cpp).
-extern "C" __attribute__((weak)) void makeHostObjects();
-
 namespace {
 
 class LeakCheck : public testing::EmptyTestEventListener {
@@ -29,10 +23,6 @@ class LeakCheck : public testing::EmptyTestEventListener {
 int main(int argc, char** argv) {
     testing::InitGoogleTest(&argc, argv);
     qx::Null::marker();
-    if (makeHostObjects != nullptr)
-        makeHostObjects();
-    if (makeLastingObjects != nullptr)
-        makeLastingObjects();
     testing::UnitTest::GetInstance()->listeners().Append(new LeakCheck);
     return RUN_ALL_TESTS();
 }

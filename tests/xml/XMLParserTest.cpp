@@ -2,12 +2,9 @@
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
-#include <algorithm>
 #include <ctime>
 #include <functional>
 #include <gtest/gtest.h>
-
-#include "support/ErrorRows.h"
 
 namespace {
 
@@ -17,18 +14,7 @@ using qx::XMLElement;
 using qx::XMLNode;
 using namespace std::string_literals;
 
-// The library's own texts; those of the C parser differ among its versions.
-bool isOurs(const qx::Error& error) {
-    static const auto rows = support::errorRows(support::parserErrors);
-    return std::any_of(rows.begin(), rows.end(), [&](const auto& row) {
-        const auto& [code, message] = row;
-        return std::to_string(error.code()) == code &&
-               error.localizedDescription().view().starts_with(
-                   message.substr(0, message.find("%@")));
-    });
-}
-
-// The document as XML, or its error as "line:column code", with the message when it is ours.
+// The document as XML, or its error as "line:column code message".
 std::string outcome(qx::XMLBytes bytes, const qx::XMLParseOptions& options = {}) {
     Ref<qx::Error> error;
     const auto document = XMLDocument::initWithData(bytes, options, &error);
@@ -37,8 +23,7 @@ std::string outcome(qx::XMLBytes bytes, const qx::XMLParseOptions& options = {})
     EXPECT_EQ(error->domain(), qx::Error::parserDomain);
     EXPECT_FALSE(error->localizedDescription().isEmpty());
     return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
-           std::to_string(error->code()) +
-           (isOurs(*error) ? " " + error->localizedDescription().str() : "");
+           std::to_string(error->code()) + " " + error->localizedDescription().str();
 }
 
 struct Case {
@@ -46,12 +31,17 @@ struct Case {
     std::string expected;
 };
 
+// An error may be expected without its message: those of the C parser differ among its versions.
 void run(const std::vector<Case>& cases, const qx::XMLParseOptions& options = {}) {
     for (const auto& [document, expected] : cases) {
-        EXPECT_EQ(outcome(document, options), expected) << document.substr(0, 200);
-        // Bytes that nothing follows.
+        // Once with a zero byte behind it, as the scanner likes it, once with nothing.
         const std::vector<char> bare(document.begin(), document.end());
-        EXPECT_EQ(outcome(std::string_view(bare.data(), bare.size()), options), expected);
+        for (std::string came : {outcome(document, options),
+                                 outcome(std::string_view(bare.data(), bare.size()), options)}) {
+            if (expected.front() != '<' && came.starts_with(expected + " "))
+                came = expected;
+            EXPECT_EQ(came, expected) << document.substr(0, 200);
+        }
     }
 }
 

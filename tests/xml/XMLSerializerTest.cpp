@@ -176,17 +176,17 @@ TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
         std::function<void(XMLElement& a, std::size_t extra)> fill;
     } rows[] = {
         {"elements nest deeper than the limit of 256", usual,
-         [&](XMLElement& a, std::size_t extra) { nested(a, 256 + extra); }},
+         [&](auto& a, auto extra) { nested(a, 256 + extra); }},
         {"elements nest deeper than the limit of 1000", deep,
-         [&](XMLElement& a, std::size_t extra) { nested(a, 1000 + extra); }},
+         [&](auto& a, auto extra) { nested(a, 1000 + extra); }},
         {"an element has more attributes than the limit of 4096", usual,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              declared(a, 0, 96);
              for (std::size_t i = 0; i < 4000 + extra; ++i)
                  a.addAttribute(number(i), "value");
          }},
         {"more namespace declarations are in force than the limit of 1000", usual,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              declared(a, 0, 600);
              a.addAttribute("xmlns:p", "u");
              for (int i = 0; i < 3; ++i) { // one beside the other
@@ -196,50 +196,50 @@ TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
              }
          }},
         {"a text is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              for (const std::size_t size : {60 + extra, std::size_t{0}, std::size_t{40}})
                  a.addChild(XMLNode::initTextWithStringValue(x(size)));
              a.addChild(XMLElement::initWithName("b"));
              a.addChild(XMLNode::initTextWithStringValue(x(100)));
          }},
         {"an attribute's value is larger than the limit of 10000000", usual,
-         [&](XMLElement& a, std::size_t extra) { a.addAttribute("b", x(10'000'000 + extra)); }},
+         [&](auto& a, auto extra) { a.addAttribute("b", x(10'000'000 + extra)); }},
         {"a namespace's URI is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addNamespace(XMLNode::namespaceWithName("", x(100 + extra)));
          }},
         {"a comment is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addChild(XMLNode::initCommentWithStringValue(x(100 + extra)));
          }},
         {"a processing instruction is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addChild(XMLNode::initProcessingInstructionWithName("p", x(100 + extra)));
          }},
         {"a name is larger than the limit of 100", small,
-         [&](XMLElement& a, std::size_t extra) { a.addAttribute(x(100 + extra), ""); }},
+         [&](auto& a, auto extra) { a.addAttribute(x(100 + extra), ""); }},
         {"the document has more different names than the limit of 100000", usual,
-         [&](XMLElement& a, std::size_t extra) {
+         [&](auto& a, auto extra) {
              a.addNamespace(XMLNode::namespaceWithName("p", "u"));
              for (std::size_t i = 0; i < 100'000 - 3 + extra; ++i)
                  a.addChild(XMLElement::initWithName(number(i)));
              a.addChild(XMLElement::initWithName(number(7)));
          }},
     };
-    for (const auto& [reason, reading, fill] : rows)
+    for (const auto& row : rows)
         for (const std::size_t extra : {0, 1}) {
             const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
-            fill(*document->rootElement(), extra);
+            row.fill(*document->rootElement(), extra);
             Ref<qx::Error> error;
             const auto read = XMLDocument::initWithData(
-                document->XMLString(qx::XMLCompactEmptyElements), reading, &error);
+                document->XMLString(qx::XMLCompactEmptyElements), row.reading, &error);
             EXPECT_EQ(read.get() != nullptr, extra == 0)
-                << reason << (error ? error->localizedDescription().str() : "");
+                << row.reason << (error ? error->localizedDescription().str() : "");
             const std::string outcome = support::raised([&] {
-                static_cast<void>(document->XMLData(qx::XMLPrettyPrint, reading));
-                static_cast<void>(document->XMLString(qx::XMLNoOptions, reading));
+                static_cast<void>(document->XMLData(qx::XMLPrettyPrint, row.reading));
+                static_cast<void>(document->XMLString(qx::XMLNoOptions, row.reading));
             });
-            const std::string refusal = "NSInvalidArgumentException: "s + reason + " at ";
+            const std::string refusal = "NSInvalidArgumentException: "s + row.reason + " at ";
             EXPECT_EQ(outcome.substr(0, refusal.size()), extra == 0 ? "nothing" : refusal);
         }
 }

@@ -9,7 +9,6 @@
 
 #include <concepts>
 #include <cstddef>
-#include <type_traits>
 #include <utility>
 
 namespace qx {

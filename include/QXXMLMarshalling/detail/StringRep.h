@@ -1,6 +1,18 @@
 #pragma once
 
 // A text in memory: this head, its bytes, a zero byte.
+//
+//     | count 32 | hash 32 | isInBlock 1 | size 63 | bytes … | 0 |
+//
+//     count   | immortal 1 | interned 1 | property 1 | references 29 |
+//
+// 1. An immortal text is never freed, and copying it changes no count: threads that share names
+//    share no counter.
+// 2. An interned text is immortal, and the only interned one with its bytes: two interned texts are
+//    equal exactly when they are the same.
+// 3. `property` is set once, when a class is described with a property of that name, and never
+//    taken back. A key without it needs no look-up in a class, which would make reading orders take
+//    5 % more instructions (bench/orders_bench.cpp, read).
 
 #include <atomic>
 #include <cstddef>

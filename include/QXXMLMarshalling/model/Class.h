@@ -68,9 +68,6 @@ public:
     // Whether it describes a plain struct, and of which type.
     bool isStruct() const noexcept { return _structType != nullptr; }
     const std::type_info& type() const noexcept { return *_type; }
-    // Whether it describes structs of data members only: no function of the host's fills them but
-    // constructors and ValueTraits, which must leave alone what is being read.
-    bool isPassive() const noexcept { return _isPassive; }
 
     // The property of that name, inherited ones included; null when there is none.
     const Property* property(Key key) const;
@@ -118,7 +115,6 @@ private:
     std::vector<Property> _properties;
     std::vector<Operation> _operations;
     std::vector<Operation> _classOperations;
-    bool _isPassive;
 };
 
 // Collects the description of T and publishes it when it ends, at the end of the statement.

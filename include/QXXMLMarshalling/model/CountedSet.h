@@ -4,7 +4,6 @@
 
 #include <QXXMLMarshalling/model/Value.h>
 
-#include <utility>
 #include <vector>
 
 namespace qx {
@@ -49,9 +48,8 @@ private:
     void makeRoom();
 
     std::vector<Entry> _entries;
-    std::vector<std::uint32_t> _index;
+    std::vector<std::uint32_t> _index; // empty while there are few entries
     std::size_t _count = 0;
-    bool _allInterned = true; // the names, removed ones too
 };
 
 } // namespace qx

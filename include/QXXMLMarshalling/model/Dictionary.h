@@ -6,9 +6,10 @@
 // while it is walked raises NSGenericException at the walk's next step. Small dictionaries are
 // scanned, larger ones carry an index.
 
-#include <QXXMLMarshalling/detail/ShortVector.h>
+#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/model/Value.h>
 
+#include <memory>
 #include <vector>
 
 namespace qx {
@@ -25,8 +26,7 @@ public:
             : key(std::move(aKey)), value(std::move(aValue)) {}
     };
 
-    // NOLINTNEXTLINE(modernize-use-equals-default): the room inside would be set to zero first
-    Dictionary() noexcept {}
+    Dictionary() noexcept = default;
     ~Dictionary() override;
     static void* operator new(std::size_t size);
     static void operator delete(void* memory) noexcept;
@@ -60,7 +60,7 @@ public:
         std::size_t _index;
         std::size_t _changes;
     };
-    Iterator begin() const { return {*this, 0}; }
+    Iterator begin() const { return {*this, _firstLive}; }
     Iterator end() const { return {*this, _entries.size()}; }
 
     std::size_t count() const noexcept { return _count; }
@@ -104,25 +104,19 @@ protected:
     const Class& describedClass() const override;
 
 private:
-    // Most records hold no more keys.
-    static constexpr std::uint32_t usualSize = 4;
-    // Up to that many are scanned.
-    static constexpr std::size_t fewKeys = 8;
-    // How many more keys than there are keep their places after their removal.
-    static constexpr std::size_t emptyPlaces = 1000;
-
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
-    bool addAny(const String& key, Value&& value);
     void append(const String& key, Value&& value);
     void makeRoom();
+    void passRemoved() noexcept;
     void changed() noexcept { ++_changes; }
 
+    using Entries = std::vector<Entry, detail::ObjectAllocator<Entry>>;
     using Index = std::vector<std::uint32_t>; // see NameIndex.h
 
-    bool _allInterned = true; // the keys, removed ones too
-    detail::ShortVector<Entry, usualSize> _entries;
-    std::unique_ptr<Index> _index; // null while the entries are scanned
+    std::uint32_t _firstLive = 0; // the entries before it are removed ones
+    Entries _entries;
+    std::unique_ptr<Index> _index; // null while there are few entries
     std::uint32_t _count = 0;
     std::uint32_t _changes = 0;
 };

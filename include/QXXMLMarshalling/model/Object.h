@@ -15,7 +15,6 @@
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/detail/Count.h>
 
-#include <array>
 #include <atomic>
 #include <cstddef>
 #include <cstdint>

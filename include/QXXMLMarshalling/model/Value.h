@@ -16,6 +16,7 @@
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/model/Object.h>
 
+#include <array>
 #include <concepts>
 #include <cstdint>
 

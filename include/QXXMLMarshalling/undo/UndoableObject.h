@@ -21,8 +21,6 @@
 
 #include <QXXMLMarshalling/undo/ChangeTracking.h>
 
-#include <cstdint>
-
 namespace qx {
 
 class QX_API UndoableObject : public Object {
@@ -59,10 +57,6 @@ protected:
     // Removes the undo actions that target the object and lets go of the manager. For a destructor
     // whose members, as they end, may call code that undoes.
     void endUndo() noexcept;
-
-    // Flags of the library's own classes that derive from this one. They fill a gap between the
-    // object's count and the tracking; in the derived class they would take eight bytes.
-    mutable std::uint8_t _derivedFlags = 0;
 
 private:
     void restoreValue(const Value& value, const String& key);

@@ -23,6 +23,9 @@
 // documents with a DOCTYPE, and in those that are no UTF-8, elements never nest deeper than 2,048
 // from 2.12 on, whatever the host says. In no version a value or a comment is larger than 1 GB.
 //
+// What is parsed is kept as text, with an index of a few bytes for each node; the nodes are made
+// when the first one is asked for, by whatever thread, and the text goes then.
+//
 // A document's short texts share memory, a kilobyte each time: whoever keeps single ones of very
 // many documents saves memory with copies, qx::String(text.view()).
 
@@ -32,6 +35,7 @@
 
 #include <concepts>
 #include <iosfwd>
+#include <memory>
 
 namespace qx {
 
@@ -52,7 +56,7 @@ struct XMLParseOptions {
 };
 
 // The bytes of a document, lent for the time of a call. Those that a zero byte follows, as in a
-// std::string, are parsed where they stand; of others the parser makes a copy.
+// std::string, can be read where they stand; others have to be copied.
 class XMLBytes {
 public:
     XMLBytes(std::string_view bytes) noexcept : _view(bytes) {}
@@ -97,8 +101,8 @@ public:
     ~XMLDocument() override;
 
     // Null in a document that holds no element.
-    XMLElement* rootElement() const noexcept;
-    XMLNode* firstChild() const noexcept override { return _firstChild; }
+    XMLElement* rootElement() const;
+    XMLNode* firstChild() const override;
     // Appends an element (only one), a comment or a processing instruction.
     void addChild(Ref<XMLNode> child);
 
@@ -137,14 +141,17 @@ public:
 
 private:
     friend class XMLNode;
-    friend class XMLTreeBuilder;
-    friend class XMLParser;
+    friend class XMLNodeMaker;
+    friend struct XMLDocumentContent;
 
     XMLDocument() noexcept;
     template <class Use>
     auto withBytes(XMLOptions options, const XMLParseOptions& reading, Use use) const;
     void unlink(XMLNode& node) noexcept;
+    void makeNodes() const;
 
+    struct Pending;
+    std::unique_ptr<Pending> _pending; // of a document that was parsed
     XMLNode* _firstChild = nullptr;
     String _version;
     String _encoding;

@@ -99,7 +99,7 @@ public:
 
 private:
     friend class XMLNode;
-    friend class XMLTreeBuilder;
+    friend class XMLNodeMaker;
     friend class XMLSerializer;
 
     // Attributes are held behind the element, in memory that it is made with:

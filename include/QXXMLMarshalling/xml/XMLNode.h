@@ -147,7 +147,8 @@ public:
 protected:
     friend class XMLElement;
     friend class XMLDocument;
-    friend class XMLTreeBuilder;
+    friend class XMLNodeMaker;
+    friend class XMLTreeIndexer;
     friend class XMLSerializer;
     friend struct XMLSiblings;
 

@@ -9,20 +9,12 @@
 
 #include "support/FileSandbox.h"
 
-#include <ostream>
 #include <string>
 
 struct Outcome {
     int status;
     std::string output;
     std::string errors;
-
-    friend bool operator==(const Outcome&, const Outcome&) = default;
-    friend std::ostream& operator<<(std::ostream& stream, const Outcome& outcome) {
-        return stream << "status " << outcome.status << "\n--- output\n"
-                      << outcome.output << "--- errors\n"
-                      << outcome.errors;
-    }
 };
 
 class Shell {

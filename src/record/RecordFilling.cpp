@@ -1,0 +1,30 @@
+#include "record/RecordFilling.h"
+
+#include <QXXMLMarshalling/model/Null.h>
+
+namespace qx::detail {
+
+bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) {
+    const bool isUnheard = (record._isCacheBehind || !record._contents) &&
+                           record.tracking().isIdle() && !record.hasObserversOrWeakRefs() &&
+                           &record.isa() == &QXGenericRecord::classObject();
+    return isUnheard && !value.isNull() && !key.view().starts_with('@') &&
+           contents(record)->add(key.string(), std::move(value));
+}
+
+const Ref<Dictionary>& RecordFilling::contents(QXGenericRecord& record) {
+    if (!record._contents) {
+        record._contents = make<Dictionary>();
+        record._isCacheBehind = record.tracking().isIdle();
+    }
+    return record._contents;
+}
+
+void RecordFilling::completeCache(const QXGenericRecord& record, Dictionary& cache) {
+    if (record._isCacheBehind)
+        for (const auto& entry : *record._contents)
+            cache.add(entry.key, Value(Null::marker()));
+    record._isCacheBehind = false;
+}
+
+} // namespace qx::detail

@@ -1,0 +1,251 @@
+#include "xml/IndexedXML.h"
+
+#include <QXXMLMarshalling/base/Key.h>
+
+#include "base/TextBlocks.h"
+#include "xml/XMLNodeMaker.h"
+
+#include <algorithm>
+
+namespace qx {
+
+// The nodes that were made of a reading's entries for their own sake.
+class NodePool final : public XMLNodeTable {
+public:
+    NodePool(const XMLIndex& index, const XMLTreeIndexer* tree)
+        : _index(index), _maker(index, this, tree) {}
+
+    Ref<XMLNode> find(XMLIndex::Number number) const override {
+        const auto found = _nodes.find(number);
+        return found != _nodes.end() ? found->second : nullptr;
+    }
+    void add(XMLIndex::Number number, XMLElement& element) override {
+        _nodes.try_emplace(number, &element);
+    }
+
+    Ref<XMLNode> element(XMLIndex::Number number) {
+        auto known = find(number);
+        return known ? known : Ref<XMLNode>(_maker.element(number));
+    }
+    Ref<XMLNode> attribute(XMLIndex::Number holder, XMLIndex::Number number);
+
+private:
+    const XMLIndex& _index;
+    XMLNodeMaker _maker;
+    std::unordered_map<XMLIndex::Number, Ref<XMLNode>> _nodes;
+};
+
+namespace {
+
+// The attribute or declaration of that name; null where it is there no more.
+Ref<XMLNode> attributeOf(XMLElement& element, XMLNodeKind kind, const String& name) {
+    if (kind == XMLNodeKind::attribute)
+        return Ref<XMLNode>(element.attributeForName(name));
+    for (XMLNode& declaration : element.namespaces())
+        if (declaration.name() == name)
+            return Ref<XMLNode>(&declaration);
+    return nullptr;
+}
+
+} // namespace
+
+Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number number) {
+    if (auto known = find(number))
+        return known;
+    const XMLIndexEntry& entry = _index[number];
+    const auto element = find(holder);
+    auto node = element ? attributeOf(*element->asElement(), entry.nodeKind(), _index.name(entry))
+                        : nullptr;
+    if (!node)
+        node = _maker.node(number);
+    _nodes.try_emplace(number, node);
+    return node;
+}
+
+IndexedXML::IndexedXML(const ParsedDocument& parsed) : _index(&parsed.index()) { findRoot(); }
+
+IndexedXML::IndexedXML(XMLDocument& document) {
+    _reader.emplace(document);
+    if (_reader->parsed() != nullptr) {
+        _index = &_reader->parsed()->index();
+        findRoot();
+        internNames();
+        return;
+    }
+    _reader.reset();
+    readTree(document.rootElement(), Content::atOnce);
+}
+
+IndexedXML::IndexedXML(XMLElement* element, Content content) { readTree(element, content); }
+
+void IndexedXML::readTree(XMLElement* element, Content content) {
+    if (element == nullptr)
+        return;
+    _tree.emplace(*element);
+    _index = &_tree->index();
+    _root = 0;
+    if (content == Content::atOnce)
+        _tree->expandAll(_root);
+}
+
+IndexedXML::~IndexedXML() = default;
+
+void IndexedXML::findRoot() noexcept {
+    const auto count = static_cast<Number>(_index->entries().size());
+    for (Number at = 0; at < count && _root == none; at = _index->siblingOf(at))
+        if ((*_index)[at].nodeKind() == XMLNodeKind::element)
+            _root = at;
+}
+
+// A mapping may have come since the document was parsed.
+void IndexedXML::internNames() {
+    const auto names = _index->names();
+    for (std::size_t i = 0; i < names.size(); ++i) {
+        const Key known = names[i].isInterned() ? Key() : Key::existing(names[i]);
+        if (known.isNull())
+            continue;
+        if (_interned.empty())
+            _interned.assign(names.begin(), names.end());
+        _interned[i] = known.string();
+    }
+}
+
+String IndexedXML::value(Number number) {
+    return textInBlock(index().value(index()[number], _room));
+}
+
+bool IndexedXML::hasPlainText(Number element) {
+    expand(element);
+    const Number first = index().firstChild(element);
+    const Number end = index().contentEnd(element);
+    return first == end || (index().siblingOf(first) == end && !isElement(first));
+}
+
+String IndexedXML::text(Number element) {
+    expand(element);
+    const Number first = index().firstChild(element);
+    const Number end = index().contentEnd(element);
+    if (first == end)
+        return "";
+    const XMLIndexEntry& only = index()[first];
+    if (only.next == end && only.nodeKind() == XMLNodeKind::text &&
+        !XMLIndex::isLayout(only, index()[element]))
+        return value(first);
+    std::string text;
+    appendText(element, text);
+    return text;
+}
+
+void IndexedXML::appendText(Number element, std::string& text) {
+    struct Open {
+        Number element;
+        Number at;
+        Number end;
+    };
+    const auto opened = [this](Number number) {
+        expand(number);
+        return Open{number, index().firstChild(number), index().contentEnd(number)};
+    };
+    std::vector<Open> open{opened(element)};
+    while (!open.empty()) {
+        Open& inner = open.back();
+        if (inner.at == inner.end) {
+            open.pop_back();
+            continue;
+        }
+        const Number at = std::exchange(inner.at, index().siblingOf(inner.at));
+        const XMLIndexEntry& entry = index()[at];
+        if (entry.nodeKind() == XMLNodeKind::element)
+            open.push_back(opened(at));
+        else if (entry.nodeKind() == XMLNodeKind::text &&
+                 !XMLIndex::isLayout(entry, index()[inner.element]))
+            text += index().value(entry, _room);
+    }
+}
+
+IndexedXML::Number IndexedXML::attribute(Number element, const String& name) {
+    constexpr Number mostScanned = 64;
+    expand(element);
+    const Number begin = index().content(element);
+    const Number end = index().firstChild(element);
+    const auto isAttribute = [this](Number at) { return kind(at) == XMLNodeKind::attribute; };
+    if (end - begin <= mostScanned) {
+        for (Number at = begin; at < end; ++at)
+            if (this->name(at).isSameAs(name) && isAttribute(at))
+                return at;
+        return none;
+    }
+    const auto [known, isNew] = _attributes.try_emplace(element);
+    for (Number at = begin; isNew && at < end; ++at)
+        if (isAttribute(at))
+            known->second.try_emplace(this->name(at).view().data(), at);
+    const auto found = known->second.find(name.view().data());
+    return found != known->second.end() ? found->second : none;
+}
+
+IndexedXML::Extent IndexedXML::extent(Number element, std::size_t enough) {
+    Extent extent{.elements = 1, .nodes = 1};
+    std::vector<Number> open{element};
+    while (!open.empty() && extent.nodes < enough) {
+        const Number inner = open.back();
+        open.pop_back();
+        expand(inner);
+        const Number end = index().contentEnd(inner);
+        for (Number at = index().content(inner); at < end; at = index().siblingOf(at)) {
+            const XMLIndexEntry& entry = index()[at];
+            if (XMLIndex::isLayout(entry, index()[inner]))
+                continue;
+            ++extent.nodes;
+            if (entry.nodeKind() == XMLNodeKind::element) {
+                ++extent.elements;
+                open.push_back(at);
+            } else {
+                extent.textSize += entry.end - entry.begin;
+            }
+        }
+    }
+    return extent;
+}
+
+NodePool& IndexedXML::pool(Nodes nodes) {
+    auto& pool = nodes == Nodes::own ? _own : _copies;
+    if (!pool)
+        pool = std::make_unique<NodePool>(index(), _tree ? &*_tree : nullptr);
+    return *pool;
+}
+
+bool IndexedXML::isMade(Nodes nodes, Number number) const {
+    const auto& pool = nodes == Nodes::own ? _own : _copies;
+    return pool && pool->find(number);
+}
+
+Ref<XMLNode> IndexedXML::element(Nodes nodes, Number number) {
+    if (nodes == Nodes::own && _reader)
+        return _reader->element(number);
+    if (nodes == Nodes::own && _tree)
+        return Ref<XMLNode>(&_tree->element(number));
+    expandAll(number);
+    return pool(nodes).element(number);
+}
+
+Ref<XMLNode> IndexedXML::attribute(Nodes nodes, Number holder, Number number) {
+    if (nodes == Nodes::copied || (!_reader && !_tree))
+        return pool(nodes).attribute(holder, number);
+    const XMLIndexEntry& entry = index()[number];
+    const auto element = this->element(Nodes::own, holder);
+    auto node = attributeOf(*element->asElement(), entry.nodeKind(), index().name(entry));
+    return node ? node : XMLNodeMaker(index()).node(number);
+}
+
+Ref<XMLNode> IndexedXML::quoted(Number number) {
+    if (number == none)
+        return nullptr;
+    return isElement(number) ? element(Nodes::own, number) : XMLNodeMaker(index()).node(number);
+}
+
+void IndexedXML::detach(Number element) {
+    if (_reader || _tree)
+        this->element(Nodes::own, element)->detach();
+}
+
+} // namespace qx

@@ -1,0 +1,126 @@
+#pragma once
+
+// A document, or an element, as one reading sees it: an index, whatever it came from, which shows
+// everything as it stood at the start, and the nodes behind its entries where somebody needs one.
+// Used by one thread at a time.
+
+#include "xml/XMLDocumentContent.h"
+#include "xml/XMLTreeIndexer.h"
+
+#include <optional>
+#include <unordered_map>
+
+namespace qx {
+
+class NodePool;
+
+class IndexedXML {
+public:
+    using Number = XMLIndex::Number;
+    static constexpr Number none = UINT32_MAX;
+
+    // Borrows what was parsed, of nobody's document.
+    explicit IndexedXML(const ParsedDocument& parsed);
+    // The document's own, without making its nodes, if it has none.
+    explicit IndexedXML(XMLDocument& document);
+    // Of an element the content is read at once, or, where only some of it may be needed, as it is
+    // asked for.
+    enum class Content : std::uint8_t { atOnce, asNeeded };
+    IndexedXML(XMLElement* element, Content content);
+    ~IndexedXML();
+    IndexedXML(const IndexedXML&) = delete;
+    IndexedXML& operator=(const IndexedXML&) = delete;
+
+    // The element that is read; none where there is none.
+    Number root() const noexcept { return _root; }
+
+    XMLNodeKind kind(Number number) const noexcept { return index()[number].nodeKind(); }
+    bool isElement(Number number) const noexcept { return kind(number) == XMLNodeKind::element; }
+    // Null of texts and comments. A name that a mapping knows is the interned one.
+    const String& name(Number number) const noexcept {
+        const XMLIndexEntry& entry = index()[number];
+        const bool hasNone =
+            entry.nodeKind() == XMLNodeKind::text || entry.nodeKind() == XMLNodeKind::comment;
+        return hasNone ? _noName : _interned.empty() ? index().name(entry) : _interned[entry.name()];
+    }
+    // The number of an element's name among those of the document.
+    std::uint32_t nameNumber(Number element) const noexcept { return index()[element].name(); }
+
+    // Calls visit(Number) for each child, attribute or declaration of an element.
+    template <class Visit>
+    void forEachChild(Number element, Visit visit) {
+        expand(element);
+        const Number end = index().contentEnd(element);
+        for (Number at = index().firstChild(element); at < end; at = index().siblingOf(at))
+            if (!XMLIndex::isLayout(index()[at], index()[element]))
+                visit(at);
+    }
+    template <class Visit>
+    void forEachOfKind(XMLNodeKind kind, Number element, Visit visit) {
+        expand(element);
+        const Number end = index().firstChild(element);
+        for (Number at = index().content(element); at < end; ++at)
+            if (index()[at].nodeKind() == kind)
+                visit(at);
+    }
+    // Of a text, attribute or declaration.
+    String value(Number number);
+    // All text inside an element, concatenated.
+    String text(Number element);
+    // The attribute of that name, which is interned; none where there is none.
+    Number attribute(Number element, const String& name);
+    // Whether text() finds at most one text without going far.
+    bool hasPlainText(Number element);
+
+    // How much an element holds, itself included. The count ends early once there are `enough`
+    // nodes in it.
+    struct Extent {
+        std::size_t elements = 0;
+        std::size_t nodes = 0;    // of all kinds, attributes and declarations too
+        std::size_t textSize = 0; // the bytes of texts, comments, instructions, attributes
+    };
+    Extent extent(Number element, std::size_t enough = SIZE_MAX);
+
+    // The nodes of an entry: the document's own, or those of a private copy of it. In a copy
+    // each node stands once, inside the copy of whatever else of it is kept. `holder` is the
+    // element that has the attribute or declaration.
+    enum class Nodes : std::uint8_t { own, copied };
+    Ref<XMLNode> element(Nodes nodes, Number number);
+    Ref<XMLNode> attribute(Nodes nodes, Number holder, Number number);
+    // Any child, to be quoted.
+    Ref<XMLNode> quoted(Number number);
+    // Whether the host has the nodes of what is read, or can ask for them.
+    bool isMade(Nodes nodes, Number number) const;
+    // Takes the element out of the host's tree; nothing where the host has none.
+    void detach(Number element);
+
+private:
+    const XMLIndex& index() const noexcept { return *_index; }
+    void expand(Number element) {
+        if (_tree)
+            _tree->expand(element);
+    }
+    void expandAll(Number element) {
+        if (_tree)
+            _tree->expandAll(element);
+    }
+    void readTree(XMLElement* element, Content content);
+    void findRoot() noexcept;
+    void internNames();
+    void appendText(Number element, std::string& text);
+    NodePool& pool(Nodes nodes);
+
+    std::optional<XMLDocumentContent::Reader> _reader;
+    std::optional<XMLTreeIndexer> _tree;
+    const XMLIndex* _index = nullptr; // what was parsed, or the tree's; null where there is nothing
+    const String _noName;
+    Number _root = none;
+    std::vector<String> _interned; // the names, where the index has not all that are known by now
+    std::string _room;
+    // Of elements with many attributes, by name.
+    std::unordered_map<Number, std::unordered_map<const void*, Number>> _attributes;
+    std::unique_ptr<NodePool> _own;
+    std::unique_ptr<NodePool> _copies;
+};
+
+} // namespace qx

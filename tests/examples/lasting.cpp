@@ -1,1 +1,0 @@
-#include "marshaller/lasting.cpp" // the marshaller keeps the same here

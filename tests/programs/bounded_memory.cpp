@@ -1,0 +1,109 @@
+// What hostile documents cost at most, counted by every allocation: parsing one takes 64 MiB and
+// eight times its size, and binding one is bounded by what a reading may make and keep.
+
+#include <QXXMLMarshalling/QXXMLMarshalling.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <malloc.h>
+#include <new>
+#include <string>
+
+namespace {
+
+std::size_t inUse = 0;
+std::size_t peak = 0;
+bool isFailed = false;
+
+void* counted(void* memory) {
+    if (memory == nullptr)
+        throw std::bad_alloc();
+    inUse += ::malloc_usable_size(memory);
+    peak = std::max(peak, inUse);
+    return memory;
+}
+
+std::string repeated(std::string_view piece, std::size_t size) {
+    std::string text;
+    while (text.size() < size)
+        text += piece;
+    return text;
+}
+
+// Beyond what was in use before.
+template <class Step>
+std::size_t peakOf(Step step) {
+    const std::size_t before = peak = inUse;
+    step();
+    return peak - before;
+}
+
+void expectWithin(std::size_t limit, std::size_t taken, std::string_view what) {
+    if (taken <= limit)
+        return;
+    isFailed = true;
+    std::fprintf(stderr, "%.*s: %zu bytes, not %zu\n", static_cast<int>(what.size()), what.data(),
+                 taken, limit);
+}
+
+constexpr std::size_t documentSize = 16'000'000;
+constexpr std::size_t free = 64U << 20U;
+
+// Of every shape that has many nodes in few bytes.
+void parse() {
+    for (const std::string_view piece :
+         {"<a/>", "<a></a>", "x<a/>", "<a b='1'/>", "<a b='' c='' d=''/>", "<!---->", "<?p?>",
+          "<a>x</a>", "<a>&lt;</a>", "<![CDATA[]]>x<a/>", "\n<a/>", "<a xmlns='u'/>"}) {
+        std::string document = "<r>" + repeated(piece, documentSize) + "</r>";
+        expectWithin(free + 8 * document.size(), peakOf([&] {
+                         if (!qx::XMLDocument::initWithData(document))
+                             isFailed = true;
+                     }),
+                     piece);
+    }
+}
+
+// Unknown XML around a flattened object at each of 200 levels: everything is kept, once.
+void bind() {
+    constexpr std::size_t nodeSize = 256;
+    const auto mapping = qx::XMLDocument::initWithData(
+        "<mapping><class name='A'><map-to xml='a'/>"
+        "<field name='flat' type='Flat' container='false'><bind-xml node='element'/></field>"
+        "<field name='a'><bind-xml name='a' node='element'/></field></class>"
+        "<class name='Flat'/></mapping>");
+    const auto marshaller = QXXMLMarshaller::initWithMappingXML(mapping.get());
+    constexpr std::size_t children = 100'000;
+    std::string document;
+    for (int level = 0; level < 200; ++level)
+        document += "<a>";
+    document += repeated("<b/>", 4 * children);
+    for (int level = 0; level < 200; ++level)
+        document += "</a>";
+    expectWithin(free + 2 * nodeSize * children,
+                 peakOf([&] { marshaller->readString(document); }), "what is kept");
+}
+
+} // namespace
+
+void* operator new(std::size_t size) { return counted(std::malloc(size)); }
+void* operator new(std::size_t size, std::align_val_t alignment) {
+    const auto unit = static_cast<std::size_t>(alignment);
+    return counted(std::aligned_alloc(unit, (size + unit - 1) / unit * unit));
+}
+void operator delete(void* memory) noexcept {
+    inUse -= ::malloc_usable_size(memory);
+    std::free(memory);
+}
+void operator delete(void* memory, std::size_t) noexcept { ::operator delete(memory); }
+void operator delete(void* memory, std::align_val_t) noexcept { ::operator delete(memory); }
+void operator delete(void* memory, std::size_t, std::align_val_t) noexcept {
+    ::operator delete(memory);
+}
+
+int main() {
+    qx::setLogSink == nullptr;
+    parse();
+    bind();
+    return isFailed ? 1 : 0;
+}

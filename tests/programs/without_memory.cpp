@@ -1,0 +1,435 @@
+// Each allocation of each operation fails, one run after the other: once alone, once with all that
+// follow. The operation then ends in std::bad_alloc or does what it does otherwise, and one that
+// ended does its work on the same objects when it is called again. Documents are parsed, a
+// marshaller reads and writes, and changes are undone and redone, with observers and without.
+
+#include "FailingMemory.h"
+
+#include <QXXMLMarshalling/QXXMLMarshalling.h>
+
+#include <array>
+#include <filesystem>
+#include <fstream>
+#include <iostream>
+#include <sstream>
+#include <streambuf>
+
+namespace {
+
+using qx::Ref;
+using M = QXXMLMarshaller;
+
+// An operation of whose allocations one fails, and what it works on: made anew for each run.
+struct Trial {
+    std::function<void()> operation;
+    // What the operation gave and changed.
+    std::function<std::string()> outcome;
+    // What a failure must leave as it was.
+    std::function<std::string()> kept = [] { return std::string(); };
+    // Makes up for what a failure may leave changed, before the operation is called again.
+    std::function<void()> restore = [] {};
+};
+
+int faults = 0;
+
+void tryEach(const std::string& name, const std::function<Trial()>& make) {
+    const auto run = [](const Trial& trial) {
+        trial.operation();
+        return trial.outcome();
+    };
+    const std::string expected = run(make());
+    failing::eachAllocation([&](long n) {
+        const auto compare = [&](const char* when, const std::string& got,
+                                 const std::string& wanted) {
+            if (got != wanted && ++faults < 20)
+                std::cout << name << when << (failing::allFollowing ? ", from" : ", at")
+                          << " allocation " << n << ":\n  " << got << "\ninstead of\n  " << wanted
+                          << '\n';
+        };
+        const Trial trial = make();
+        const std::string before = trial.kept();
+        const failing::Outcome end = failing::run(n, trial.operation);
+        if (end == failing::Outcome::failed) {
+            compare(" changed something", trial.kept(), before);
+            // The first trial ends as it is: what a failure left in it must end with it.
+            const Trial again = make();
+            failing::run(n, again.operation);
+            again.restore();
+            compare(" called again", run(again), expected);
+        } else {
+            compare("", trial.outcome(), expected);
+        }
+        return end;
+    });
+}
+
+std::string contentOf(const std::filesystem::path& path) {
+    std::ostringstream text;
+    text << std::ifstream(path, std::ios::binary).rdbuf();
+    return text.str();
+}
+
+std::string repeated(std::string_view text, int times) {
+    std::string all;
+    while (times-- > 0)
+        all += text;
+    return all;
+}
+
+void parsing() {
+    // Texts that outgrow their first memory, and the first inputs of the fuzz program, without the
+    // digit for its options.
+    std::vector<std::string> documents{
+        "<p:a xmlns:p='u' q:b='1' xmlns='v'><c xmlns:q='w' q:b='" + repeated("&lt;&#10;", 400) +
+            "'/><![CDATA[<>]]><!--c--><?p d?><r:s/></p:a>",
+        "<\xC3\xA9 \xC3\xA8='" + repeated("\xC3\xA9", 700) + "'>" + repeated("\xE2\x82\xAC", 700) +
+            "<" + repeated("n", 5000) + "/></\xC3\xA9>",
+        "<!--" + repeated("\xC3\xA9 - ", 900) + "--><a><![CDATA[" + repeated("\xC3\xA9]", 900) +
+            "]]><?p " + repeated("\xC3\xA9?", 900) + "?></a>",
+        repeated("<a xmlns:p='u' b='c'>", 60) + repeated("</a>", 60)};
+    for (const auto& seed : std::filesystem::directory_iterator(QX_SOURCE_DIR "/fuzz/seeds/parse"))
+        documents.push_back(contentOf(seed.path()).substr(1));
+    struct Stage {
+        Ref<qx::XMLDocument> document;
+        Ref<qx::Error> error;
+    };
+    for (const std::string& text : documents)
+        tryEach("parsing " + text.substr(0, 300), [&text] {
+            const auto stage = std::make_shared<Stage>();
+            Trial trial;
+            trial.operation = [&text, stage] {
+                stage->document = qx::XMLDocument::initWithData(text, {}, &stage->error);
+            };
+            trial.outcome = [stage] {
+                return stage->document ? stage->document->description().str()
+                       : stage->error  ? std::to_string(stage->error->line()) + ":" +
+                                            std::to_string(stage->error->column()) + " " +
+                                            stage->error->description().str()
+                                      : "neither a document nor an error";
+            };
+            return trial;
+        });
+}
+
+// Of a first input of the fuzz program: the mapping, and behind a line the document.
+const std::string pairText = contentOf(QX_SOURCE_DIR "/fuzz/seeds/pair/every-kind.xml");
+const std::string separator = "<?document?>\n";
+const std::string mappingText = pairText.substr(0, pairText.find(separator));
+const std::string documentText = pairText.substr(mappingText.size() + separator.size());
+
+// What an operation of a marshaller works on, and what it gives.
+struct Stage {
+    Ref<M> marshaller = M::initWithMappingXML(qx::XMLDocument::initWithData(mappingText).get());
+    Ref<qx::XMLDocument> document = qx::XMLDocument::initWithData(documentText);
+    Ref<qx::XMLElement> root{document->rootElement()};
+    Ref<qx::Object> order = marshaller->readString(documentText);
+    Ref<QXGenericRecord> target = qx::make<QXGenericRecord>();
+    Ref<qx::XMLElement> written = qx::XMLElement::initWithName("order");
+    Ref<qx::CountedSet> fields = qx::make<qx::CountedSet>();
+    Ref<qx::CountedSet> attributes = qx::make<qx::CountedSet>();
+    Ref<qx::Error> error;
+    Ref<qx::Object> made;
+    bool result = false;
+    std::string text;
+
+    Stage() { target->setClassNameForMarshalling("Order"); }
+    const QXXMLClassMapping& type() const {
+        return *marshaller->mapping()->mappingForClassName("Order");
+    }
+    const QXXMLFieldMapping& field(std::size_t i) const { return *type().fields()[i]; }
+    // As XML. Moves kept XML, as writing does.
+    std::string shown(const Ref<qx::Object>& object) {
+        auto element = object.as<qx::XMLElement>();
+        if (object && !element)
+            element = marshaller->marshallObject(object, error ? nullptr : &error);
+        return element ? element->XMLString().str() : "none";
+    }
+    std::string outcome() {
+        return text + (result ? " true " : " false ") + shown(made) + shown(target) +
+               shown(written) + fields->description().str() + attributes->description().str() +
+               (error ? error->description().str() : " no error");
+    }
+    // What a flattened object took out of its element before memory failed stays out, and what was
+    // written stays in.
+    void startAgain() {
+        document = qx::XMLDocument::initWithData(documentText);
+        root = Ref<qx::XMLElement>(document->rootElement());
+        written = qx::XMLElement::initWithName("order");
+        fields->removeAll();
+        attributes->removeAll();
+    }
+};
+
+// A stream's memory: what failed here would be the stream's failure, which it keeps to itself.
+class Buffer : public std::streambuf {
+public:
+    Buffer() { setp(_room.data(), _room.data() + _room.size()); }
+    std::string_view text() const { return {pbase(), pptr()}; }
+
+private:
+    std::array<char, 4096> _room;
+};
+
+void tryMarshaller(const std::string& name, bool changesArguments,
+                   const std::function<void(M&, Stage&)>& operation) {
+    tryEach(name, [&] {
+        const auto stage = std::make_shared<Stage>();
+        Trial trial;
+        trial.operation = [stage, &operation] { operation(*stage->marshaller, *stage); };
+        trial.outcome = [stage] { return stage->outcome(); };
+        trial.restore = [stage, changesArguments] {
+            stage->error = nullptr;
+            if (changesArguments)
+                stage->startAgain();
+        };
+        return trial;
+    });
+}
+
+void marshalling() {
+    const std::pair<const char*, std::function<void(M&, Stage&)>> making[] = {
+        {"initWithMappingXML",
+         [](M& m, Stage& s) {
+             const auto made = M::initWithMappingXML(m.mapping()->document(), &s.error);
+             s.text =
+                 made ? std::to_string(made->mapping()->mapping()->classMappings().size()) : "";
+         }},
+        {"unmarshall", [](M& m, Stage& s) { s.made = m.unmarshall(s.document, &s.error); }},
+        {"unmarshallElement",
+         [](M& m, Stage& s) { s.made = m.unmarshallElement(s.root.get(), &s.error); }},
+        {"buildClassWithMapping",
+         [](M& m, Stage& s) {
+             s.made = m.buildClassWithMapping(s.type(), s.root.get(), false, &s.error);
+         }},
+        {"allocateClassWithMapping",
+         [](M& m, Stage& s) {
+             s.made = m.allocateClassWithMapping(s.type(), &s.error);
+             s.made->setValueForKey("n", "number");
+             s.made->setValueForKey(s.order, "flat");
+         }},
+        {"readString", [](M& m, Stage& s) { s.made = m.readString(documentText, &s.error); }},
+        {"marshallObject", [](M& m, Stage& s) { s.made = m.marshallObject(s.order, &s.error); }},
+        {"elementWithMapping",
+         [](M& m, Stage& s) { s.made = m.elementWithMapping(s.type(), *s.order, &s.error); }},
+        {"marshall",
+         [](M& m, Stage& s) {
+             const auto document = m.marshall(s.order, &s.error);
+             s.made = Ref<qx::Object>(document ? document->rootElement() : nullptr);
+         }},
+        {"writeString", [](M& m, Stage& s) { s.text = m.writeString(s.order, &s.error).str(); }},
+        {"writeStream", [](M& m, Stage& s) {
+             Buffer buffer;
+             std::ostream out(&buffer);
+             s.result = m.writeStream(s.order, out, &s.error);
+             s.text = buffer.text();
+         }}};
+    for (const auto& [name, operation] : making)
+        tryMarshaller(name, false, operation);
+
+    const std::pair<const char*, std::function<bool(M&, Stage&)>> binding[] = {
+        {"bindFieldsWithMapping",
+         [](M& m, Stage& s) {
+             return m.bindFieldsWithMapping(s.type(), *s.target, *s.root, *s.fields, *s.attributes,
+                                            false, &s.error);
+         }},
+        {"validateBoundFields",
+         [](M& m, Stage& s) {
+             return m.validateBoundFields(*s.fields, *s.attributes, *s.root, *s.target, &s.error);
+         }},
+        {"TakeValueForKey",
+         [](M&, Stage& s) {
+             return TakeValueForKey(*s.target, "text", "a text of some length", s.field(2),
+                                    &s.error);
+         }},
+        {"bindFieldMappings",
+         [](M& m, Stage& s) {
+             return m.bindFieldMappings(s.type(), *s.written, *s.order, &s.error);
+         }},
+        {"mapArray", [](M& m, Stage& s) {
+             const auto lines = s.order->valueForKey("lines").as<qx::Array>();
+             return m.mapArray(*lines, *s.written, s.field(5), &s.error);
+         }}};
+    for (const auto& [name, bind] : binding)
+        tryMarshaller(name, true, [&bind = bind](M& m, Stage& s) { s.result = bind(m, s); });
+
+    // Steps for one field come with an index and a flag, with an index, or with neither.
+    using Bind = std::function<bool(M&, Stage&, const QXXMLFieldMapping&)>;
+    const auto flagged = [](auto step) {
+        return [step](M& m, Stage& s, const QXXMLFieldMapping& field) {
+            return (m.*step)(field, *s.target, 0, *s.root, *s.fields, *s.attributes, false,
+                             &s.error);
+        };
+    };
+    const auto indexed = [](auto step) {
+        return [step](M& m, Stage& s, const QXXMLFieldMapping& field) {
+            return (m.*step)(field, *s.target, 0, *s.root, *s.fields, *s.attributes, &s.error);
+        };
+    };
+    const auto plain = [](auto step) {
+        return [step](M& m, Stage& s, const QXXMLFieldMapping& field) {
+            return (m.*step)(field, *s.target, *s.root, *s.fields, *s.attributes, &s.error);
+        };
+    };
+    const std::pair<const char*, Bind> eachField[] = {
+        {"bindField", flagged(&M::bindField)},
+        {"bindFieldAsElement", flagged(&M::bindFieldAsElement)},
+        {"bindFieldAsAttribute", indexed(&M::bindFieldAsAttribute)},
+        {"bindFieldAsText", indexed(&M::bindFieldAsText)},
+        {"bindCollectionField", plain(&M::bindCollectionField)},
+        {"bindArrayFieldByType", plain(&M::bindArrayFieldByType)},
+        {"mapField", [](M& m, Stage& s, const QXXMLFieldMapping& field) {
+             return m.mapField(field, *s.written, *s.order, &s.error);
+         }}};
+    const std::size_t count = Stage().type().fields().size();
+    for (const auto& [name, bind] : eachField)
+        for (std::size_t i = 0; i < count; ++i)
+            tryMarshaller(name + (" " + std::to_string(i)), true,
+                          [bind = bind, i](M& m, Stage& s) { s.result = bind(m, s, s.field(i)); });
+}
+
+// Both sides of a pair change in one setter.
+class Person : public qx::UndoableObject {
+public:
+    qx::Value partner() const { return _partner; }
+    void setPartner(qx::Value partner) {
+        if (partner.isSameAs(_partner))
+            return;
+        const auto former = _partner.as<Person>();
+        const auto next = partner.as<Person>();
+        {
+            const qx::ChangeScope scope(*this, "partner");
+            _partner = std::move(partner);
+        }
+        if (former)
+            former->setValueForKey(nullptr, "partner");
+        if (next)
+            next->setValueForKey(this, "partner");
+    }
+    qx::String name;
+
+private:
+    qx::Value _partner;
+};
+
+// A few objects with all that can be changed about them.
+struct Scene {
+    explicit Scene(bool isObserved) : observed(isObserved) {
+        for (int i = 0; i < 12; ++i)
+            record->setValueForKey(i, "key" + std::to_string(i));
+        record->setUndoManager(manager);
+        one->setUndoManager(manager);
+        other->setUndoManager(manager);
+        if (observed)
+            for (qx::Object* object :
+                 {static_cast<qx::Object*>(record.get()), static_cast<qx::Object*>(one.get())})
+                for (const char* key : {"key3", "new", "partner", "partner.name"})
+                    tokens.push_back(
+                        object->observe(key, [this](const qx::ValueChange&) { ++told; }));
+    }
+    ~Scene() {
+        manager->removeAllActions();
+        one->setUndoManager(nullptr);
+        one->setValueForKey(nullptr, "partner");
+        one->setChangeCache(nullptr);
+        other->setChangeCache(nullptr);
+    }
+    Scene(const Scene&) = delete;
+    Scene& operator=(const Scene&) = delete;
+
+    void change() const {
+        const qx::UndoGroup group(manager);
+        record->setValueForKey("three", "key3");
+        record->setValueForKey(nullptr, "key0");
+        record->setValueForKey(nullptr, "key3");
+        record->setValueForKey("new", "new");
+        one->setValueForKey("One", "name");
+        one->setValueForKey(other, "partner");
+        other->setValueForKey("Other", "name");
+    }
+    std::string state() const {
+        std::string text;
+        for (const qx::String& key : record->keys())
+            text += key.str() + "=" + record->valueForKey(key).description().str() + " ";
+        for (const auto& [person, partner] : {std::pair{one, other}, std::pair{other, one}})
+            text += person->name.str() +
+                    (person->partner().isNull()            ? " alone"
+                     : person->partner().isSameAs(partner) ? " paired"
+                                                           : " lost") +
+                    " ";
+        return text + std::to_string(manager->groupingLevel()) +
+               (manager->canUndo() ? " can undo" : "") + (manager->canRedo() ? " can redo" : "");
+    }
+    void undoAll() const {
+        while (manager->canUndo())
+            manager->undo();
+    }
+    // All that can still be undone and redone, and whether observers still hear.
+    std::string outcome() {
+        std::string text = state();
+        undoAll();
+        text += "\n  undone " + state();
+        while (manager->canRedo())
+            manager->redo();
+        text += "\n  redone " + state();
+        told = 0;
+        record->setValueForKey("told?", "key3");
+        return text + "\n  told " + std::to_string(told);
+    }
+
+    bool observed;
+    int told = 0;
+    Ref<qx::UndoManager> manager = qx::make<qx::UndoManager>();
+    Ref<QXGenericRecord> record = qx::make<QXGenericRecord>();
+    Ref<Person> one = qx::make<Person>();
+    Ref<Person> other = qx::make<Person>();
+    std::vector<qx::ObservationToken> tokens;
+};
+
+void undoing() {
+    qx::Class::define<Person, qx::UndoableObject>("Person")
+        .property<&Person::name>("name")
+        .property<&Person::partner, &Person::setPartner>("partner");
+    using Step = void (*)(Scene&);
+    const Step change = [](Scene& scene) { scene.change(); };
+    const Step undo = [](Scene& scene) { scene.manager->undo(); };
+    const Step redo = [](Scene& scene) { scene.manager->redo(); };
+    const struct {
+        std::string name;
+        std::vector<Step> before;
+        Step operation;
+        bool isWhole; // has happened or not
+    } rows[] = {{"setting", {}, change, false},
+                {"undoing", {change}, undo, true},
+                {"redoing", {change, undo}, redo, true}};
+    for (const bool observed : {false, true})
+        for (const auto& row : rows)
+            tryEach(row.name + (observed ? ", observed" : ""), [&row, observed] {
+                const auto scene = std::make_shared<Scene>(observed);
+                for (const Step step : row.before)
+                    step(*scene);
+                Trial trial;
+                trial.operation = [&row, scene] { row.operation(*scene); };
+                trial.outcome = [scene] { return scene->outcome(); };
+                // Of several changes some may have happened. Without memory nobody can be told, and
+                // what nobody is told of stays as it is.
+                if (!row.isWhole)
+                    trial.restore = [scene] { scene->undoAll(); };
+                else if (!observed || !failing::allFollowing)
+                    trial.kept = [scene] { return scene->state(); };
+                return trial;
+            });
+}
+
+} // namespace
+
+extern "C" void QXLogWarning(std::string_view, std::span<const qx::Value>) {}
+extern "C" void QXLogDebug(std::string_view, std::span<const qx::Value>) {}
+
+int main() {
+    failing::replaceParserMemory();
+    parsing();
+    marshalling();
+    undoing();
+    std::cout << faults << " faults\n";
+    return faults == 0 ? 0 : 1;
+}
