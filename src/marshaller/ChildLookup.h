@@ -115,7 +115,7 @@ private:
     // The children: most elements have few, which take no memory of their own.
     std::size_t _count = 0;
     std::array<Child, 8> _few;
-    std::vector<Child> _many; // all, where they are more
+    std::vector<Child> _many;            // all, where they are more
     std::unordered_map<Name, Run> _runs; // where it is indexed
 
     ChildLookup(const ChildLookup& other, Nodes nodes);

@@ -96,7 +96,7 @@ Result written(Write write, Ref<Error>* error) {
 } // namespace
 
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, const std::type_info& type,
-                                             Ref<Error>* error) {
+                                            Ref<Error>* error) {
     if (document == nullptr)
         return qx::fail(error, qx::errors::noDefinitionForElement, document);
     qx::IndexedXML read(*document);
@@ -110,13 +110,13 @@ Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type
 }
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
-                                             Ref<Error>* error) {
+                                            Ref<Error>* error) {
     reset(error);
     return objectOf(*this, qx::XMLParser::parseLent(xml, parseOptions(*this), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
-                                           Ref<Error>* error) {
+                                          Ref<Error>* error) {
     reset(error);
     auto data = qx::readFile(path, error);
     if (!data)
@@ -126,7 +126,7 @@ Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_in
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
-                                             Ref<Error>* error) {
+                                            Ref<Error>* error) {
     reset(error);
     auto data = qx::readStream(stream, error);
     if (!data)

@@ -41,7 +41,9 @@ public:
         const XMLIndexEntry& entry = index()[number];
         const bool hasNone =
             entry.nodeKind() == XMLNodeKind::text || entry.nodeKind() == XMLNodeKind::comment;
-        return hasNone ? _noName : _interned.empty() ? index().name(entry) : _interned[entry.name()];
+        return hasNone             ? _noName
+               : _interned.empty() ? index().name(entry)
+                                   : _interned[entry.name()];
     }
     // The number of an element's name among those of the document.
     std::uint32_t nameNumber(Number element) const noexcept { return index()[element].name(); }

@@ -40,8 +40,9 @@ struct XMLIndexEntry {
     std::uint32_t begin;
     std::uint32_t end;
     std::uint32_t next;
-    // The name (see XMLIndex::name; of texts and comments nothing) above the flags and the kind: one
-    // word, which is written at once. Bit fields are written one by one, and the next read waits.
+    // The name (see XMLIndex::name; of texts and comments nothing) above the flags and the kind:
+    // one word, which is written at once. Bit fields are written one by one, and the next read
+    // waits.
     std::uint32_t bits;
 
     enum Flag : std::uint32_t {
@@ -51,7 +52,8 @@ struct XMLIndexEntry {
         isAside = 1U << 4U,
         // A text of white space with a line break, and nothing but the document's own characters.
         isBlank = 1U << 5U,
-        // An element in which blank texts are content: other text stands beside them, xml:space says
+        // An element in which blank texts are content: other text stands beside them, xml:space
+        // says
         // so, or the caller.
         keepsLayout = 1U << 6U,
     };

@@ -47,7 +47,7 @@ void expectWithin(std::size_t limit, std::size_t taken, std::string_view what) {
                  taken, limit);
 }
 
-constexpr std::size_t documentSize = 16'000'000;
+constexpr std::size_t documentSize = 4'000'000;
 constexpr std::size_t free = 64U << 20U;
 
 // Of every shape that has many nodes in few bytes.
@@ -80,8 +80,8 @@ void bind() {
     document += repeated("<b/>", 4 * children);
     for (int level = 0; level < 200; ++level)
         document += "</a>";
-    expectWithin(free + 2 * nodeSize * children,
-                 peakOf([&] { marshaller->readString(document); }), "what is kept");
+    expectWithin(free + 2 * nodeSize * children, peakOf([&] { marshaller->readString(document); }),
+                 "what is kept");
 }
 
 } // namespace
@@ -101,8 +101,10 @@ void operator delete(void* memory, std::size_t, std::align_val_t) noexcept {
     ::operator delete(memory);
 }
 
+// Says nothing of what is kept.
+void QXLogWarning(std::string_view, std::span<const qx::Value>) {}
+
 int main() {
-    qx::setLogSink == nullptr;
     parse();
     bind();
     return isFailed ? 1 : 0;

@@ -1,7 +1,8 @@
 #pragma once
 
-// The name of a member as the source has it, and where a type comes from. No standard way leads to it, but GCC and Clang spell a
-// template's arguments out in the name of the function that is being compiled:
+// The name of a member as the source has it, and where a type comes from. No standard way leads to
+// it, but GCC and Clang spell a template's arguments out in the name of the function that is being
+// compiled:
 //
 //     GCC      … qx::detail::memberName() [with auto Member = &Point::lat; …]
 //     Clang    … qx::detail::memberName() [Member = &Point::lat]
