@@ -115,7 +115,7 @@ TEST(Marshaller, ReportsValuesThatAPropertyDoesNotTake) {
     for (const auto& [document, expected] : cases)
         EXPECT_EQ(scenario::read(*marshaller, document),
                   "-222: Unable to set value: " + std::string(expected) +
-                      " in class: Listener (Invalid Value)");
+                      " in class: MarshallerTest.Listener (Invalid Value)");
     EXPECT_EQ(marshaller->readString("<item count=' 12 '/>")->valueForKey("count"), Value(12));
 }
 
