@@ -322,38 +322,6 @@ void XMLElement::setStringValue(const String& value) {
         holdText(std::move(text));
 }
 
-XMLExtent XMLElement::extent(std::size_t enough) const noexcept {
-    XMLExtent extent;
-    const auto add = [&](const XMLNode& node) {
-        ++extent.nodes;
-        extent.textSize += node._value.size();
-    };
-    for (const XMLNode* node = this; node != nullptr && extent.nodes < enough;
-         node = following(node)) {
-        add(*node);
-        const XMLElement* element = node->asElement();
-        if (element == nullptr)
-            continue;
-        ++extent.elements;
-        extent.nodes += element->holdsText() ? 1 : 0;
-        for (const HeldAttribute& attribute : element->held()) {
-            ++extent.nodes;
-            extent.textSize += attribute.value.size();
-        }
-        for (const XMLNode* attribute = element->_firstAttribute; attribute != nullptr;
-             attribute = attribute->_next)
-            add(*attribute);
-        for (const XMLNode* declaration = element->_firstNamespace; declaration != nullptr;
-             declaration = declaration->_next)
-            add(*declaration);
-    }
-    return extent;
-}
-
-Ref<XMLNode> XMLElement::copy() const { return copyVisiting(nullptr); }
-
-Ref<XMLElement> XMLElement::copy(const CopyVisitor& visit) { return copyVisiting(&visit); }
-
 Ref<XMLElement> XMLElement::copyAlone() const {
     auto element = Ref<XMLElement>::adopt(newElement(_name, _heldCount));
     element->_line = _line;
@@ -370,14 +338,8 @@ Ref<XMLElement> XMLElement::copyAlone() const {
 }
 
 // Walks both trees in step, so that depth costs no stack.
-Ref<XMLElement> XMLElement::copyVisiting(const CopyVisitor* visit) const {
-    const auto alone = [&](const XMLElement& from) {
-        Ref<XMLElement> made = from.copyAlone();
-        if (visit != nullptr)
-            (*visit)(const_cast<XMLElement&>(from), *made);
-        return made;
-    };
-    Ref<XMLElement> top = alone(*this);
+Ref<XMLNode> XMLElement::copy() const {
+    Ref<XMLElement> top = copyAlone();
     XMLElement* target = top.get();
     const XMLNode* node = this;
     while (true) {
@@ -395,7 +357,7 @@ Ref<XMLElement> XMLElement::copyVisiting(const CopyVisitor* visit) const {
             node = node->_next;
         }
         const XMLElement* element = node->asElement();
-        Ref<XMLNode> copied = element != nullptr ? Ref<XMLNode>(alone(*element)) : node->copy();
+        Ref<XMLNode> copied = element != nullptr ? Ref<XMLNode>(element->copyAlone()) : node->copy();
         XMLNode* child = copied.get();
         // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): likewise
         XMLSiblings::append(*target, target->_firstChild, copied.detach());

@@ -5,19 +5,11 @@
 
 #include <QXXMLMarshalling/xml/XMLNode.h>
 
-#include <functional>
 #include <memory>
 #include <span>
 #include <vector>
 
 namespace qx {
-
-// How much an element holds, itself included.
-struct XMLExtent {
-    std::size_t elements = 0;
-    std::size_t nodes = 0;    // of all kinds, attributes and namespace declarations too
-    std::size_t textSize = 0; // the bytes of texts, comments, processing instructions, attributes
-};
 
 class QX_API XMLElement final : public XMLNode {
 public:
@@ -90,12 +82,6 @@ public:
     bool holdsText() const noexcept { return !_value.isNull(); }
     void setStringValue(const String& value) override;
     Ref<XMLNode> copy() const override;
-    // The same; calls visit(original, copy) for this element and each one inside.
-    using CopyVisitor = std::function<void(XMLElement& original, XMLElement& copy)>;
-    Ref<XMLElement> copy(const CopyVisitor& visit);
-    // Counted anew each time, which needs no nodes of texts and attributes. The count ends early
-    // once there are `enough` nodes in it.
-    XMLExtent extent(std::size_t enough = SIZE_MAX) const noexcept;
 
 private:
     friend class XMLNode;
@@ -125,7 +111,6 @@ private:
     }
     static XMLElement* newElement(const String& name, std::size_t attributes);
     Ref<XMLElement> copyAlone() const;
-    Ref<XMLElement> copyVisiting(const CopyVisitor* visit) const;
     std::span<HeldAttribute> held() const noexcept {
         auto* first = reinterpret_cast<HeldAttribute*>(const_cast<XMLElement*>(this) + 1);
         return {first, _heldCount};
