@@ -35,26 +35,13 @@ private:
     std::unordered_map<XMLIndex::Number, Ref<XMLNode>> _nodes;
 };
 
-namespace {
-
-// The attribute or declaration of that name; null where it is there no more.
-Ref<XMLNode> attributeOf(XMLElement& element, XMLNodeKind kind, const String& name) {
-    if (kind == XMLNodeKind::attribute)
-        return Ref<XMLNode>(element.attributeForName(name));
-    for (XMLNode& declaration : element.namespaces())
-        if (declaration.name() == name)
-            return Ref<XMLNode>(&declaration);
-    return nullptr;
-}
-
-} // namespace
-
 Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number number) {
     if (auto known = find(number))
         return known;
     const XMLIndexEntry& entry = _index[number];
     const auto element = find(holder);
-    auto node = element ? attributeOf(*element->asElement(), entry.nodeKind(), _index.name(entry))
+    auto node = element ? XMLNodeMaker::attributeOf(*element->asElement(), entry.nodeKind(),
+                                                    _index.name(entry))
                         : nullptr;
     if (!node)
         node = _maker.node(number);
@@ -233,7 +220,8 @@ Ref<XMLNode> IndexedXML::attribute(Nodes nodes, Number holder, Number number) {
         return pool(nodes).attribute(holder, number);
     const XMLIndexEntry& entry = index()[number];
     const auto element = this->element(Nodes::own, holder);
-    auto node = attributeOf(*element->asElement(), entry.nodeKind(), index().name(entry));
+    auto node =
+        XMLNodeMaker::attributeOf(*element->asElement(), entry.nodeKind(), index().name(entry));
     return node ? node : XMLNodeMaker(index()).node(number);
 }
 

@@ -119,6 +119,17 @@ TEST(Hostile, AttributesThatManyObjectsKeepCountOnce) {
         << scenario::told(error);
 }
 
+TEST(Hostile, VeryManyDeclarationsAreKeptInLinearTime) {
+    const auto element = qx::XMLElement::initWithName("a");
+    for (int i = 0; i < 60'000; ++i)
+        element->addNamespace(qx::XMLNode::namespaceWithName("p" + std::to_string(i), "u"));
+    const auto marshaller = scenario::marshaller("<A/>");
+    marshaller->setMaximumKeptNodes({.base = SIZE_MAX, .perElement = 0});
+    const std::clock_t start = std::clock();
+    EXPECT_TRUE(marshaller->unmarshallElement(element.get()));
+    EXPECT_LT(std::clock() - start, 2 * CLOCKS_PER_SEC);
+}
+
 TEST(Hostile, LimitsAreTheHosts) {
     const auto marshaller = scenario::marshaller(twice());
     const std::string document = nested("a", 4, "<b/>"); // 15 objects, 8 kept nodes, 5 elements
