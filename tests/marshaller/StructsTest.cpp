@@ -468,6 +468,34 @@ TEST_F(Structs, AreCopiedByKeyValueAccess) {
     EXPECT_THROW(tree.valueForKey("height"), qx::UndefinedKeyException);
 }
 
+TEST_F(Structs, AreUndoneAsMembersOfObjects) {
+    struct Undone : qx::UndoableObject {
+        Place place;
+        std::vector<Place> places;
+    };
+    qx::Class::define<Undone, qx::UndoableObject>("Undone")
+        .members<&Undone::place, &Undone::places>();
+    const auto object = qx::make<Undone>();
+    const auto manager = qx::make<qx::UndoManager>();
+    object->setUndoManager(manager);
+    {
+        const qx::UndoGroup group(*manager);
+        object->setValueForKey(qx::make<qx::Boxed<Place>>(Place{"Bath", 1}), "place");
+        auto all = qx::make<qx::Array>();
+        all->add(qx::make<qx::Boxed<Place>>(Place{"Wells", 2}));
+        object->setValueForKey(all, "places");
+    }
+    for (int i = 0; i < 2; ++i) {
+        manager->undo();
+        EXPECT_EQ(object->place, Place());
+        EXPECT_EQ(object->places.size(), 0U);
+        manager->redo();
+        EXPECT_EQ(object->place, (Place{"Bath", 1}));
+        EXPECT_EQ(object->places, (std::vector<Place>{{"Wells", 2}}));
+    }
+    qx::Class::forget("Undone");
+}
+
 TEST_F(Structs, ArePartOfRecordsAndHostClasses) {
     const auto mixed = scenario::marshaller(
         "<class name='Counted'><map-to xml='c'/>"
@@ -511,10 +539,10 @@ TEST_F(Structs, AreWrittenAsItemsWhereMuteClassesAreLeftOutAloud) {
 
 namespace {
 
-struct Page {
+struct Sheet {
     std::string title;
     QXUnknownXML unknown;
-    std::vector<Page> pages;
+    std::vector<Sheet> pages;
 };
 class Leaf : public QXMappedObject {
 public:
@@ -525,22 +553,22 @@ public:
 } // namespace
 
 TEST(UnknownXML, IsKeptInAMemberAndByTheBaseClass) {
-    qx::Class::define<Page>("Page").members<&Page::title, &Page::unknown, &Page::pages>();
+    qx::Class::define<Sheet>("Sheet").members<&Sheet::title, &Sheet::unknown, &Sheet::pages>();
     qx::Class::define<Leaf, QXMappedObject>("Leaf").members<&Leaf::name, &Leaf::leaves>();
     const auto marshaller = scenario::marshaller(
-        "<class name='Page'><map-to xml='page'/><field name='title'><bind-xml node='attribute'/>"
-        "</field><field name='pages' type='Page' collection='array'><bind-xml name='p'/></field>"
+        "<class name='Sheet'><map-to xml='sheet'/><field name='title'><bind-xml node='attribute'/>"
+        "</field><field name='pages' type='Sheet' collection='array'><bind-xml name='p'/></field>"
         "</class><class name='Leaf'><map-to xml='leaf'/><field name='name'>"
         "<bind-xml node='attribute'/></field><field name='leaves' type='Leaf' collection='array'>"
         "<bind-xml name='leaf'/></field></class>");
-    const std::string document = R"(<page xmlns:x="urn:x" title="t" a="1"><p title="u" x:b="2">)"
-                                 R"(<c>d</c></p><e></e><e></e></page>)";
-    const auto page = marshaller->readString<Page>(document);
-    ASSERT_TRUE(page) << errorOf(page);
-    EXPECT_EQ(page->unknown.children()->count(), 1U);
-    EXPECT_TRUE(page->pages.at(0).unknown.namespaces() == nullptr);
-    const Page copy = *page;
-    EXPECT_EQ(marshaller->marshall(*page)->rootElement()->XMLString().view(), document);
+    const std::string document = R"(<sheet xmlns:x="urn:x" title="t" a="1"><p title="u" x:b="2">)"
+                                 R"(<c>d</c></p><e></e><e></e></sheet>)";
+    const auto sheet = marshaller->readString<Sheet>(document);
+    ASSERT_TRUE(sheet) << errorOf(sheet);
+    EXPECT_EQ(sheet->unknown.children()->count(), 1U);
+    EXPECT_TRUE(sheet->pages.at(0).unknown.namespaces() == nullptr);
+    const Sheet copy = *sheet;
+    EXPECT_EQ(marshaller->marshall(*sheet)->rootElement()->XMLString().view(), document);
     EXPECT_EQ(marshaller->marshall(copy)->rootElement()->XMLString().view(), document)
         << "with nodes of its own";
 
@@ -553,6 +581,6 @@ TEST(UnknownXML, IsKeptInAMemberAndByTheBaseClass) {
     const auto orphan = (*leaf)->leaves.at(0);
     (*leaf)->leaves.clear();
     EXPECT_EQ(scenario::write(*marshaller, orphan), R"(<leaf name="c"><d></d></leaf>)");
-    qx::Class::forget("Page");
+    qx::Class::forget("Sheet");
     qx::Class::forget("Leaf");
 }
