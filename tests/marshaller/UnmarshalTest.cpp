@@ -172,6 +172,9 @@ constexpr Case collections[] = {
     {"a strict marshaller refuses a child that no class maps to",
      "<Order><lines collection='array'/></Order>", "<order><line>1</line><other/></order>",
      strict | discard, "-211: No definition to handle element: <other></other> (Invalid Mapping)"},
+    {"layout that is content beside text is quoted as it is",
+     "<Order><lines collection='array'/></Order>", "<order>\n<line/>text</order>", strict | discard,
+     "-211: No definition to handle element: \n (Invalid Mapping)"},
     {"an item that fails fails the collection",
      "<Order><lines type='Owner' collection='array' name='item'/></Order><Owner>"
      "<city required='true' node='attribute'/></Owner>",
