@@ -4,6 +4,7 @@
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 namespace {
@@ -25,12 +26,18 @@ constexpr const char* classes =
     "<Line xml='line'><text node='text'/></Line><Address xml='adr' ns-uri='urn:a'>"
     "<street node='attribute'/></Address>";
 
-// What a field is given, and what its Order is written as.
+// What a field is given, and what its Order is written as: a record, and a struct where that is
+// another.
 struct Case {
     const char* question;
     const char* fields;
     Value x;
     std::string expected;
+    std::string ofStruct = expected;
+};
+
+struct Order {
+    Value x, a, e;
 };
 
 void run(const std::vector<Case>& table) {
@@ -40,6 +47,10 @@ void run(const std::vector<Case>& table) {
             scenario::marshaller("<Order>" + std::string(row.fields) + "</Order>" + classes);
         const auto order = record("Order", {{"x", row.x}, {"a", "1"}, {"e", "2"}});
         EXPECT_EQ(scenario::write(*marshaller, order), row.expected);
+        qx::Class::define<Order>("Order").members<&Order::x, &Order::a, &Order::e>();
+        const auto box = qx::make<qx::Boxed<Order>>(Order{row.x, "1", "2"});
+        EXPECT_EQ(scenario::write(*marshaller, box), row.ofStruct);
+        qx::Class::forget("Order");
     }
 }
 
@@ -53,11 +64,11 @@ TEST(Marshal, WritesAttributesUnlessTheyAreOptionalAndZeroOrEmpty) {
     run({
         {"text", optional, "1<2", R"(<Order x="1&lt;2"></Order>)"},
         {"a number", optional, 3.5, R"(<Order x="3.5"></Order>)"},
-        {"zero", optional, 0, "<Order></Order>"},
-        {"a number that is cut to zero", optional, 0.5, "<Order></Order>"},
-        {"false", optional, false, "<Order></Order>"},
+        {"zero", optional, 0, "<Order></Order>", R"(<Order x="0"></Order>)"},
+        {"cut to zero", optional, 0.5, "<Order></Order>", R"(<Order x="0.5"></Order>)"},
+        {"false", optional, false, "<Order></Order>", R"(<Order x="0"></Order>)"},
         {"the text 0", optional, "0", R"(<Order x="0"></Order>)"},
-        {"empty text", optional, "", "<Order></Order>"},
+        {"empty text", optional, "", "<Order></Order>", R"(<Order x=""></Order>)"},
         {"no value", optional, {}, "<Order></Order>"},
         {"required zero", required, 0, R"(<Order x="0"></Order>)"},
         {"required empty text", required, "", R"(<Order x=""></Order>)"},
@@ -91,7 +102,8 @@ TEST(Marshal, WritesElementsUnderTheFieldsNameOrTheClasses) {
         {"no flattened object",
          flat,
          {},
-         "-211: No class name for marshalling defined: QXGenericRecord (Invalid XML)"},
+         "-211: No class name for marshalling defined: QXGenericRecord (Invalid XML)",
+         "-211: No class name for marshalling defined: Order (Invalid XML)"},
         {"a required number without a value",
          "<x type='int' required='true' node='element'/>",
          {},
@@ -111,7 +123,7 @@ TEST(Marshal, WritesTextOverWhatStoodThereAndAutomaticFieldsAsAttributes) {
     run({
         {"children go, attributes stay", text, "3", R"(<Order a="1">3</Order>)"},
         {"a simple value", "<x name='n'/>", "v", R"(<Order n="v"></Order>)"},
-        {"an optional zero", "<x/>", 0, "<Order></Order>"},
+        {"an optional zero", "<x/>", 0, "<Order></Order>", R"(<Order x="0"></Order>)"},
         {"a required empty text", "<x required='true'/>", "", R"(<Order x=""></Order>)"},
         {"an object", "<x/>", address, R"(<Order><adr xmlns="urn:a" street="s"></adr></Order>)"},
         {"an object's children without its attributes", "<x container='false'/>", address,

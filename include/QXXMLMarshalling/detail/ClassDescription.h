@@ -137,7 +137,6 @@ Property memberProperty(std::string_view name) {
     describeGetter<T, Member>(property);
     if constexpr (std::is_member_object_pointer_v<decltype(Member)>) {
         using M = std::remove_reference_t<decltype(std::declval<T&>().*Member)>;
-        property.isMember = true;
         if constexpr (!std::is_const_v<M>)
             property.set = &setMember<T, Member>;
     }
@@ -157,7 +156,6 @@ Property partProperty(Key key) {
         T* instance = instanceIn<T>(object);
         return instance != nullptr && std::invoke(Set, instance->*Member, value);
     };
-    property.isMember = true;
     return property;
 }
 

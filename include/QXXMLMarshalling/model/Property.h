@@ -26,8 +26,6 @@ struct Property {
     Value (*lend)(const Property&, const Object&) = nullptr;
     // Whether zero, false and empty text are values like any other when the object is written.
     bool keepsZero = false;
-    // Whether it is a data member: no function of the host's sets it.
-    bool isMember = false;
     // Member function pointers that were only known at run time.
     Member getter{};
     Member setter{};
