@@ -11,6 +11,11 @@
 //     }
 //     if (error) std::cerr << error->localizedDescription().view();
 //
+// Where a class is described in C++ (Class.h), a call may ask for it and answers a qx::Result:
+//
+//     auto order = marshaller->readFile<Order>("order.xml");
+//     if (!order) return report(*order.error());
+//
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
 // setters of host classes throw passes through every operation here. They may use the marshaller,

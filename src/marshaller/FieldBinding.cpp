@@ -37,7 +37,7 @@ bool Marshalling::writeField(const FieldPlan& field, XMLElement& element, Object
     if (value.isNull() && field.isContainer) {
         if (!field.isRequired)
             return true;
-        if (field.valueType == ValueType::other)
+        if (field.valueType == ValueType::other || field.valueType == ValueType::string)
             return fail(error, errors::requiredValueMissing, field.key.string(), &object);
         value = false;
     }

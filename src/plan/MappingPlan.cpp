@@ -79,6 +79,8 @@ FieldPlan MappingPlan::planFor(const QXXMLFieldMapping& mapping) const {
     FieldPlan plan = FieldPlan::withoutClasses(mapping);
     if (!mapping.type().isEmpty())
         plan.typeClass = classNamed(mapping.type());
+    if (plan.valueType == ValueType::string && plan.typeClass != nullptr)
+        plan.valueType = ValueType::other;
     for (BindingPlan& binding : plan.bindings) {
         binding.classOfBindTo = classForElement(binding.bindTo);
         binding.classOfName = classForElement(binding.name);

@@ -37,6 +37,9 @@ private:
 
 namespace {
 
+// Texts up to this are as fast made again as looked up.
+constexpr std::size_t longestUnshared = 256;
+
 // The attribute or declaration of that name; null where it is there no more.
 Ref<XMLNode> attributeOf(XMLElement& element, XMLNodeKind kind, const String& name) {
     if (kind == XMLNodeKind::attribute)
@@ -111,7 +114,13 @@ void IndexedXML::internNames() {
 }
 
 String IndexedXML::value(Number number) {
-    return textInBlock(index().value(index()[number], _room));
+    const XMLIndexEntry& entry = index()[number];
+    if (entry.end - entry.begin <= longestUnshared)
+        return textInBlock(index().value(entry, _room));
+    String& value = _longTexts[number];
+    if (value.isNull())
+        value = index().value(entry, _room);
+    return value;
 }
 
 bool IndexedXML::hasPlainText(Number element) {
@@ -131,9 +140,13 @@ String IndexedXML::text(Number element) {
     if (only.next == end && only.nodeKind() == XMLNodeKind::text &&
         !XMLIndex::isLayout(only, index()[element]))
         return value(first);
-    std::string text;
-    appendText(element, text);
-    return text;
+    if (const auto known = _longTexts.find(element); known != _longTexts.end())
+        return known->second;
+    std::string joined;
+    appendText(element, joined);
+    if (joined.size() <= longestUnshared)
+        return textInBlock(joined);
+    return _longTexts.try_emplace(element, joined).first->second;
 }
 
 void IndexedXML::appendText(Number element, std::string& text) {
