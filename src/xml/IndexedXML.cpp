@@ -1,11 +1,8 @@
 #include "xml/IndexedXML.h"
 
-#include <QXXMLMarshalling/base/Key.h>
-
+#include "base/KnownName.h"
 #include "base/TextBlocks.h"
 #include "xml/XMLNodeMaker.h"
-
-#include <algorithm>
 
 namespace qx {
 
@@ -34,6 +31,13 @@ private:
     XMLNodeMaker _maker;
     std::unordered_map<XMLIndex::Number, Ref<XMLNode>> _nodes;
 };
+
+namespace {
+
+// Texts up to this are as fast made again as looked up.
+constexpr std::size_t longestUnshared = 256;
+
+} // namespace
 
 Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number number) {
     if (auto known = find(number))
@@ -88,17 +92,23 @@ void IndexedXML::findRoot() noexcept {
 void IndexedXML::internNames() {
     const auto names = _index->names();
     for (std::size_t i = 0; i < names.size(); ++i) {
-        const Key known = names[i].isInterned() ? Key() : Key::existing(names[i]);
-        if (known.isNull())
+        String known = knownName(names[i]);
+        if (known.isSameAs(names[i]))
             continue;
         if (_interned.empty())
             _interned.assign(names.begin(), names.end());
-        _interned[i] = known.string();
+        _interned[i] = std::move(known);
     }
 }
 
 String IndexedXML::value(Number number) {
-    return textInBlock(index().value(index()[number], _room));
+    const XMLIndexEntry& entry = index()[number];
+    if (entry.end - entry.begin <= longestUnshared)
+        return textInBlock(index().value(entry, _room));
+    String& value = _longTexts[number];
+    if (value.isNull())
+        value = index().value(entry, _room);
+    return value;
 }
 
 bool IndexedXML::hasPlainText(Number element) {
@@ -118,9 +128,13 @@ String IndexedXML::text(Number element) {
     if (only.next == end && only.nodeKind() == XMLNodeKind::text &&
         !XMLIndex::isLayout(only, index()[element]))
         return value(first);
-    std::string text;
-    appendText(element, text);
-    return text;
+    if (const auto known = _longTexts.find(element); known != _longTexts.end())
+        return known->second;
+    std::string joined;
+    appendText(element, joined);
+    if (joined.size() <= longestUnshared)
+        return textInBlock(joined);
+    return _longTexts.try_emplace(element, joined).first->second;
 }
 
 void IndexedXML::appendText(Number element, std::string& text) {

@@ -104,6 +104,21 @@ TEST(Hostile, SmallDocumentsPassHoweverTheyAreRead) {
     }
 }
 
+// At each level twice as many objects have it.
+TEST(Hostile, ALongTextStandsOnceHoweverManyObjectsReadIt) {
+    const auto marshaller = scenario::marshaller(
+        "<A xml='a'><x name='a' node='element'/><y name='a' node='element'/><t node='text'/>"
+        "<v name='v' node='attribute'/></A>");
+    const std::string text(1000, 't');
+    const auto object = marshaller->readString("<a><a v='" + text + "'>" + text + "<b/></a></a>");
+    ASSERT_TRUE(object);
+    for (const char* key : {"t", "v"})
+        EXPECT_TRUE(object->valueForKeyPath(std::string("x.") + key)
+                        .string()
+                        .isSameAs(object->valueForKeyPath(std::string("y.") + key).string()))
+            << key;
+}
+
 TEST(Hostile, AttributesThatManyObjectsKeepCountOnce) {
     std::string attributes;
     for (int i = 0; i < 20; ++i)

@@ -1,7 +1,7 @@
 // Host objects that turn on the reading that makes them: whatever their setters do to the document,
 // the marshaller and its options, no freed memory is used and no list loses an item.
 
-#include "Host.h"
+#include "ObjectKinds.h"
 #include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
@@ -34,7 +34,7 @@ struct Meddling {
     }
 };
 
-class Meddler : public host::Host {
+class Meddler : public kinds::Host {
 public:
     Meddler() { Meddling::call(); }
     void setClassName(const qx::String&) { Meddling::call(); }
@@ -44,7 +44,7 @@ public:
     void setParent(qx::Object*) { Meddling::call(); }
     bool isRemovable() const override {
         Meddling::call();
-        return Host::isRemovable();
+        return HostBase::isRemovable();
     }
 
 protected:
@@ -52,12 +52,17 @@ protected:
 };
 
 const bool described = [] {
-    host::describe(qx::Class::define<Meddler>("ReentranceTest.Meddler")
-                       .operation<&Meddler::setClassName>("setClassNameForMarshalling:")
-                       .operation<&Meddler::setNotify>("setNotifyBindingsObservers:")
-                       .operation<&Meddler::setUndoManager>("setUndoManager:")
-                       .operation<&Meddler::rootObject>("rootObject")
-                       .operation<&Meddler::setParent>("setParent:"));
+    kinds::Keys keys = kinds::kept;
+    keys.insert(keys.end(), {"id", "text", "located", "typed", "named", "wrapped", "all", "child",
+                             "word", "flat"});
+    kinds::describe<kinds::HostBase>(
+        qx::Class::define<Meddler>("ReentranceTest.Meddler")
+            .operation<&Meddler::setClassName>("setClassNameForMarshalling:")
+            .operation<&Meddler::setNotify>("setNotifyBindingsObservers:")
+            .operation<&Meddler::setUndoManager>("setUndoManager:")
+            .operation<&Meddler::rootObject>("rootObject")
+            .operation<&Meddler::setParent>("setParent:"),
+        keys);
     return true;
 }();
 
