@@ -1,7 +1,6 @@
 #include <QXXMLMarshalling/base/Key.h>
 
 #include "base/Immortal.h"
-#include "base/PropertyNames.h"
 
 #include <algorithm>
 #include <cstring>
@@ -55,11 +54,6 @@ Key Key::existing(std::string_view name) noexcept {
     Key key;
     key._rep = immortal<NameTable>().find(name);
     return key;
-}
-
-void detail::markAsProperty(Key key) noexcept {
-    if (key._rep != nullptr)
-        key._rep->count.fetch_or(Key::propertyBit, std::memory_order_relaxed);
 }
 
 std::size_t Selector::argumentCount() const noexcept {

@@ -10,7 +10,16 @@
 #include <mutex>
 #include <utility>
 
-using namespace qx;
+using qx::Array;
+using qx::Data;
+using qx::Dictionary;
+using qx::Error;
+using qx::Exception;
+using qx::Ref;
+using qx::String;
+using qx::Value;
+using qx::XMLDocument;
+using qx::detail::NameLookUp;
 
 const char* const QXXMLDataRepositoryVolatileName = "QXXMLDataRepositoryVolatileName";
 const char* const QXXMLDataRepositoryPersistentName = "QXXMLDataRepositoryPersistentName";
@@ -44,7 +53,7 @@ thread_local bool Making::_active = false;
 } // namespace
 
 Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::defaultManager() {
-    auto& shared = immortal<SharedManager>();
+    auto& shared = qx::immortal<SharedManager>();
     {
         const std::lock_guard lock(shared.mutex);
         if (shared.manager)
@@ -59,20 +68,20 @@ Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::defaultManager() {
 }
 
 void QXXMLDataRepositoryManager::flushDefaultManager() {
-    auto& shared = immortal<SharedManager>();
+    auto& shared = qx::immortal<SharedManager>();
     Ref<QXXMLDataRepositoryManager> dropped; // ends after the lock is gone
     const std::lock_guard lock(shared.mutex);
     dropped = std::exchange(shared.manager, nullptr);
 }
 
 Ref<QXXMLDataRepositoryManager> QXXMLDataRepositoryManager::init() {
-    return make<QXXMLDataRepositoryManager>();
+    return qx::make<QXXMLDataRepositoryManager>();
 }
 
 // Both are registered under one name on purpose: the file system takes the place of the repository
 // in memory, which a host registers itself where it wants one.
 QXXMLDataRepositoryManager::QXXMLDataRepositoryManager()
-    : _repositories(make<Dictionary>()), _repositoryNames(make<Array>()) {
+    : _repositories(qx::make<Dictionary>()), _repositoryNames(qx::make<Array>()) {
     addRepository(QXXMLVolatileDataRepository::init(), QXXMLDataRepositoryPersistentName);
     addRepository(QXXMLFileSystemDataRepository::init(), QXXMLDataRepositoryPersistentName);
 }
@@ -117,7 +126,7 @@ void QXXMLDataRepositoryManager::setPersistentRepository(
 Ref<Array> QXXMLDataRepositoryManager::repositoryNames() const { return _repositoryNames; }
 
 void QXXMLDataRepositoryManager::setRepositoryNames(const Ref<Array>& names) {
-    _repositoryNames = names ? names : make<Array>();
+    _repositoryNames = names ? names : qx::make<Array>();
     ++_orderings;
 }
 
@@ -150,13 +159,13 @@ QXXMLDataRepositoryManager::repositoryForDataNamed(const String& name) const {
 
 Ref<XMLDocument> QXXMLDataRepositoryManager::documentNamed(const String& name, std::uint64_t* size,
                                                            Ref<Error>* error) const {
-    const detail::NameLookUp lookUp;
+    const NameLookUp lookUp;
     const auto repository = repositoryForDocumentNamed(name);
     return repository ? repository->documentNamed(name, size, error) : nullptr;
 }
 
 Ref<Data> QXXMLDataRepositoryManager::dataForName(const String& name, Ref<Error>* error) const {
-    const detail::NameLookUp lookUp;
+    const NameLookUp lookUp;
     const auto repository = repositoryForDataNamed(name);
     return repository ? repository->dataForName(name, error) : nullptr;
 }

@@ -16,7 +16,16 @@
 #include <atomic>
 #include <cerrno>
 
-using namespace qx;
+using qx::Array;
+using qx::Bundle;
+using qx::Data;
+using qx::Error;
+using qx::Exception;
+using qx::Ref;
+using qx::String;
+using qx::Value;
+using qx::XMLDocument;
+using qx::detail::NameLookUp;
 
 namespace {
 
@@ -59,7 +68,7 @@ void QXXMLFileSystemDataRepository::setRepositoryCreateFunction(CreateFunction f
 }
 
 QXXMLFileSystemDataRepository::QXXMLFileSystemDataRepository()
-    : _searchPaths(make<Array>()), _searchBundles(make<Array>()) {}
+    : _searchPaths(qx::make<Array>()), _searchBundles(qx::make<Array>()) {}
 
 QXXMLFileSystemDataRepository::~QXXMLFileSystemDataRepository() = default;
 
@@ -70,17 +79,17 @@ void QXXMLFileSystemDataRepository::initialize(QXXMLFileSystemDataRepository& re
 }
 
 void QXXMLFileSystemDataRepository::setSearchPaths(const Ref<Array>& paths) {
-    _searchPaths = paths ? paths : make<Array>();
+    _searchPaths = paths ? paths : qx::make<Array>();
 }
 
 void QXXMLFileSystemDataRepository::setSearchBundles(const Ref<Array>& bundles) {
-    _searchBundles = bundles ? bundles : make<Array>();
+    _searchBundles = bundles ? bundles : qx::make<Array>();
 }
 
 void QXXMLFileSystemDataRepository::initializeSearchPaths() {
-    _searchPaths = make<Array>();
-    const String processName = ProcessInfo::processName();
-    for (const String& directory : searchPathForApplicationSupport())
+    _searchPaths = qx::make<Array>();
+    const String processName = qx::ProcessInfo::processName();
+    for (const String& directory : qx::searchPathForApplicationSupport())
         addPathToSearchPaths(directory, processName);
     if (_searchPaths->isEmpty())
         throw Exception(Exception::internalInconsistency,
@@ -89,7 +98,7 @@ void QXXMLFileSystemDataRepository::initializeSearchPaths() {
     // The library's own class stands for its bundle even where it is linked into the program.
     const std::type_info& type = typeid(*this);
     const bool isLibrarys = type == typeid(QXXMLFileSystemDataRepository);
-    _searchBundles = make<Array>();
+    _searchBundles = qx::make<Array>();
     for (const auto& bundle : {Bundle::mainBundle(), isLibrarys ? Bundle::frameworkBundle()
                                                                 : Bundle::bundleForClass(type)})
         if (bundle)
@@ -107,7 +116,7 @@ void QXXMLFileSystemDataRepository::addPathToSearchPaths(const String& directory
 
 Ref<Bundle> QXXMLFileSystemDataRepository::applicationBundle() {
     const Value identifier =
-        UserDefaults::standardUserDefaults()->objectForKey(clientBundleIdentifierKey);
+        qx::UserDefaults::standardUserDefaults()->objectForKey(clientBundleIdentifierKey);
     if (identifier.isNull())
         return Bundle::mainBundle();
     if (auto bundle = Bundle::bundleWithIdentifier(identifier.string()))
@@ -157,21 +166,21 @@ String QXXMLFileSystemDataRepository::pathForResourceInBundlesNamed(const String
 
 bool QXXMLFileSystemDataRepository::containsDocument(const String& name) {
     const String path = pathForResourceNamed(name);
-    detail::NameLookUp::leave(*this, name, path);
+    NameLookUp::leave(*this, name, path);
     return !path.isNull();
 }
 
 bool QXXMLFileSystemDataRepository::containsData(const String& name) {
     const String path = pathForResourceNamed(name);
-    detail::NameLookUp::leave(*this, name, path);
+    NameLookUp::leave(*this, name, path);
     return !path.isNull();
 }
 
 Ref<Data> QXXMLFileSystemDataRepository::dataForName(const String& name, Ref<Error>* error) {
-    String path = detail::NameLookUp::take(*this, name);
+    String path = NameLookUp::take(*this, name);
     if (path.isNull())
         path = pathForResourceNamed(name);
-    return path.isNull() ? Ref<Data>() : readFile(path, error, ReadableFiles::regular);
+    return path.isNull() ? Ref<Data>() : readFile(path, error, qx::ReadableFiles::regular);
 }
 
 Ref<XMLDocument> QXXMLFileSystemDataRepository::documentNamed(const String& name,
@@ -184,10 +193,10 @@ Ref<XMLDocument> QXXMLFileSystemDataRepository::documentNamed(const String& name
 }
 
 String QXXMLFileSystemDataRepository::userOverrideArea() {
-    const auto directories = searchPathForApplicationSupport();
+    const auto directories = qx::searchPathForApplicationSupport();
     if (directories.empty())
         return nullptr;
-    return directoryForProcess(directories.back(), ProcessInfo::processName());
+    return directoryForProcess(directories.back(), qx::ProcessInfo::processName());
 }
 
 Ref<Error> QXXMLFileSystemDataRepository::createUserOverrideArea(const String& directory) {
@@ -195,7 +204,7 @@ Ref<Error> QXXMLFileSystemDataRepository::createUserOverrideArea(const String& d
     if (!fileExists(directory))
         createDirectoryWithParents(directory, &error);
     else if (!isDirectory(directory))
-        fail(&error, errors::areaIsNoDirectory, directory);
+        fail(&error, qx::errors::areaIsNoDirectory, directory);
     return error;
 }
 
@@ -203,12 +212,12 @@ String QXXMLFileSystemDataRepository::writeFile(const Ref<Data>& data, const Str
                                                 const String& name, Ref<Error>* error) {
     const String relative = relativePath(name);
     if (relative.isNull())
-        return fail(error, errors::invalidFileName);
+        return fail(error, qx::errors::invalidFileName);
     if (directory.isEmpty())
-        return failWithSystemError(error, errors::writeFailed, relative, ENOENT);
+        return failWithSystemError(error, qx::errors::writeFailed, relative, ENOENT);
     const String target = appendingPathComponent(directory, relative);
     if (!data)
-        return failWithSystemError(error, errors::writeFailed, target, EINVAL);
+        return failWithSystemError(error, qx::errors::writeFailed, target, EINVAL);
     if (!checkLengthOfPath(target, error))
         return nullptr;
     if (Ref<Error> problem = createUserOverrideArea(directory)) {
@@ -236,19 +245,19 @@ String QXXMLFileSystemDataRepository::writeFileToVersionedUserOverrideArea(const
         return writeFile(data, area, name, error);
     const String versioned = directoryForVersion(area, applicationVersion());
     if (versioned.isNull())
-        return fail(error, errors::invalidFileName);
+        return fail(error, qx::errors::invalidFileName);
     return writeFile(data, versioned, name, error);
 }
 
 String QXXMLFileSystemDataRepository::writeDocumentToUserOverrideArea(
     const Ref<XMLDocument>& document, const String& name, Ref<Error>* error) {
-    constexpr XMLOptions options = XMLPrettyPrint | XMLCompactEmptyElements;
+    constexpr qx::XMLOptions options = qx::XMLPrettyPrint | qx::XMLCompactEmptyElements;
     Ref<Data> data;
     try {
         if (document)
-            data = make<Data>(document->XMLData(options));
+            data = qx::make<Data>(document->XMLData(options));
     } catch (const Exception& exception) {
-        return fail(error, errors::textCannotBeWritten, exception.reason());
+        return fail(error, qx::errors::textCannotBeWritten, exception.reason());
     }
     return writeFileToUserOverrideArea(data, name, error);
 }

@@ -2,15 +2,20 @@
 
 #include <limits>
 
-using namespace qx;
+using qx::Data;
+using qx::Dictionary;
+using qx::Error;
+using qx::Ref;
+using qx::String;
+using qx::XMLDocument;
 
 QXXMLVolatileDataRepository::QXXMLVolatileDataRepository()
-    : _documents(make<Dictionary>()), _datas(make<Dictionary>()) {}
+    : _documents(qx::make<Dictionary>()), _datas(qx::make<Dictionary>()) {}
 
 QXXMLVolatileDataRepository::~QXXMLVolatileDataRepository() = default;
 
 Ref<QXXMLVolatileDataRepository> QXXMLVolatileDataRepository::init() {
-    return make<QXXMLVolatileDataRepository>();
+    return qx::make<QXXMLVolatileDataRepository>();
 }
 
 bool QXXMLVolatileDataRepository::containsDocument(const String& name) {
