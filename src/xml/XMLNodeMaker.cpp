@@ -20,8 +20,10 @@ XMLNode* XMLNodeMaker::newNode(const XMLIndexEntry& entry) {
     const bool isNamed = kind != XMLNodeKind::text && kind != XMLNodeKind::comment;
     String name = isNamed ? _index.name(entry) : String();
     String value = textInBlock(_index.value(entry, _room));
-    return ::new (_blocks.allocate(sizeof(XMLNode)))
-        XMLNode(kind, std::move(name), std::move(value));
+    auto* const made =
+        ::new (_blocks.allocate(sizeof(XMLNode))) XMLNode(kind, std::move(name), std::move(value));
+    made->_isLayout = entry.has(XMLIndexEntry::isBlank);
+    return made;
 }
 
 Ref<XMLNode> XMLNodeMaker::node(Number number) {
@@ -95,9 +97,7 @@ void XMLNodeMaker::addContent(const Open& parent, Number number) {
     if (content.nodeKind() == XMLNodeKind::text && !content.has(XMLIndexEntry::isBlank) &&
         element._childCount == 0 && parent.at == parent.end)
         return element.holdText(textInBlock(_index.value(content, _room)));
-    XMLNode* const made = newNode(content);
-    made->_isLayout = content.has(XMLIndexEntry::isBlank);
-    XMLSiblings::append(element, element._firstChild, made);
+    XMLSiblings::append(element, element._firstChild, newNode(content));
     ++element._childCount;
 }
 

@@ -151,4 +151,10 @@ TEST(Hostile, LimitsAreTheHosts) {
     EXPECT_EQ(limit(4, 2, 2), tooManyObjects);
     EXPECT_EQ(limit(15, 0, 1), "Reading keeps more nodes than the limit of 5: a");
     EXPECT_EQ(limit(SIZE_MAX, SIZE_MAX, SIZE_MAX), "read");
+
+    const auto copying =
+        scenario::marshaller("<A><u type='Flat' container='false' node='element'/></A><Flat/>");
+    copying->setMaximumKeptNodes({.base = 2, .perElement = 0});
+    EXPECT_EQ(scenario::read(*copying, "<a><b><c/></b></a>"),
+              "-224: Reading keeps more nodes than the limit of 2: b (Invalid Mapping)");
 }
