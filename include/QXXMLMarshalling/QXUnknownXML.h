@@ -43,7 +43,7 @@ private:
 };
 
 template <>
-struct qx::MemberKeys<QXUnknownXML> {
+struct qx::detail::MemberKeys<QXUnknownXML> {
     static constexpr std::size_t count = 3;
     static constexpr const char* keys[count] = {"unboundChildren", "unboundAttributes",
                                                 "__namespaces"};

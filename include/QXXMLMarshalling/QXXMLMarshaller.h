@@ -199,7 +199,9 @@ public:
     bool mapArray(const qx::Array& array, qx::XMLElement& element, const QXXMLFieldMapping& field,
                   qx::Ref<qx::Error>* error = nullptr);
 
-    // The steps of unmarshalling.
+    // The steps of unmarshalling. Each goes over the element's children anew, so that binding field
+    // by field costs more than binding them all. One that is told that the object is flattened
+    // takes the children that it binds out of the element.
     //
     // The object for the node's element name. Null for a node that no class maps to, with an error
     // only from a marshaller that is not lenient:

@@ -2,8 +2,6 @@
 
 // Bytes as text of the base64 alphabet.
 
-#include <QXXMLMarshalling/base/Export.h>
-
 #include <optional>
 #include <string>
 #include <string_view>
@@ -11,10 +9,10 @@
 namespace qx {
 
 // With padding, without line breaks.
-QX_API std::string encodeBase64(std::string_view bytes);
+std::string encodeBase64(std::string_view bytes);
 
 // White space is passed over. None for any other character, for a length that no bytes have, for
 // padding that is wrong and for bits left over.
-QX_API std::optional<std::string> decodeBase64(std::string_view text);
+std::optional<std::string> decodeBase64(std::string_view text);
 
 } // namespace qx

@@ -12,7 +12,7 @@ namespace qx {
 // The signed integer at the start: white space of any script is skipped, a sign is taken, reading
 // stops at the first character that is no digit; beyond 64 bits the limit value. None where no
 // digit stands.
-QX_API std::optional<std::int64_t> scanInteger(std::string_view text) noexcept;
+std::optional<std::int64_t> scanInteger(std::string_view text) noexcept;
 
 // The number at the start, likewise.
 std::optional<double> scanReal(std::string_view text) noexcept;

@@ -1,7 +1,5 @@
 #include "files/Files.h"
 
-#include <istream>
-
 #include "files/Descriptor.h"
 #include "files/Paths.h"
 #include "files/SystemErrors.h"
@@ -9,6 +7,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <fcntl.h>
+#include <istream>
 #include <sys/stat.h>
 
 namespace qx {

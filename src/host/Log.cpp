@@ -5,6 +5,7 @@
 
 #include "model/Warning.h"
 
+#include <algorithm>
 #include <ctime>
 #include <dlfcn.h>
 #include <link.h>

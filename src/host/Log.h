@@ -14,7 +14,6 @@ using LogFunction = void (*)(std::string_view format, std::span<const Value> arg
 // The host's function; null where it has none. Ask before each use.
 LogFunction hostLogDebug() noexcept;
 LogFunction hostLogWarning() noexcept;
-inline bool hostHasLogDebug() noexcept { return hostLogDebug() != nullptr; }
 inline bool hostHasLogWarning() noexcept { return hostLogWarning() != nullptr; }
 
 // One line on standard error: time, process name and identifier, message.

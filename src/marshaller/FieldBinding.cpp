@@ -18,6 +18,10 @@ const FieldBinding& bindingOf(const FieldPlan& field) {
 
 } // namespace
 
+const FieldBinding& bindingAsElement(const FieldPlan& field) noexcept {
+    return field.isContainer ? elementBinding : flattenedBinding;
+}
+
 // A kind that found nothing and complains of nothing does not fail the object.
 bool Unmarshalling::readField(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (field.isCollection())

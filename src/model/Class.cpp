@@ -11,6 +11,7 @@
 #include <cstdlib>
 #include <mutex>
 #include <shared_mutex>
+#include <typeindex>
 #include <unordered_map>
 
 #include <cxxabi.h>

@@ -2,6 +2,7 @@
 
 #include "model/LibraryClass.h"
 
+#include <array>
 #include <new>
 
 namespace qx {

@@ -2,7 +2,7 @@
 
 // What only some objects have, kept apart so that the others stay small.
 
-#include <QXXMLMarshalling/model/Object.h>
+#include <QXXMLMarshalling/model/WeakRef.h>
 
 #include <memory>
 #include <vector>

@@ -7,12 +7,22 @@
 
 namespace qx::detail {
 
+// What only the objects of structs ask of a class.
+struct StructInternals {
+    static const StructType& typeOf(const Class& described) { return *described._structType; }
+    static Value withClass(const Ref<StructObject>& object, const Class* known) {
+        if (known != nullptr)
+            known->assignTo(*object);
+        return object;
+    }
+};
+
 void* StructObject::upcast(void* place, const std::type_info& type) const {
     const Class* from = &isa();
     while (place != nullptr && from != nullptr && from->isStruct()) {
         if (from->type() == type)
             return place;
-        const auto toBase = from->structType()->toBase;
+        const auto toBase = StructInternals::typeOf(*from).toBase;
         place = toBase != nullptr ? toBase(place) : nullptr;
         from = from->superclass();
     }
@@ -36,7 +46,7 @@ namespace {
 
 template <class Taken>
 Taken takeWhole(StructObject& held, Taken (*StructType::*function)(void*)) {
-    const auto move = held.isa().structType()->*function;
+    const auto move = StructInternals::typeOf(held.isa()).*function;
     if (move == nullptr)
         return nullptr;
     const auto source = held.isMovable() ? Ref<StructObject>(&held) : copyOf(held);
@@ -97,17 +107,11 @@ StructPlace describedPlace(StructPlace whole, StructPlace base, const Class*& kn
     return base;
 }
 
-Value withClass(Ref<StructObject> object, const Class* known) {
-    if (known != nullptr)
-        known->assignTo(*object);
-    return object;
-}
-
 } // namespace
 
 Value lentStruct(StructPlace whole, StructPlace base, const Class*& known) {
     const StructPlace lent = describedPlace(whole, base, known);
-    return withClass(make<StructObject>(*lent.type, lent.place), known);
+    return StructInternals::withClass(make<StructObject>(*lent.type, lent.place), known);
 }
 
 Value sharedStruct(StructPlace whole, StructPlace base, const std::shared_ptr<const void>& owner) {
@@ -115,7 +119,7 @@ Value sharedStruct(StructPlace whole, StructPlace base, const std::shared_ptr<co
     const StructPlace shared = describedPlace(whole, base, known);
     std::shared_ptr<void> place(std::const_pointer_cast<void>(owner),
                                 const_cast<void*>(shared.place));
-    return withClass(make<SharedStruct>(*shared.type, std::move(place)), known);
+    return StructInternals::withClass(make<SharedStruct>(*shared.type, std::move(place)), known);
 }
 
 } // namespace qx::detail

@@ -1,8 +1,14 @@
+#include "observe/Observance.h"
+
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 #include "observe/ObservationInfo.h"
+#include "observe/ObservationPath.h"
+
+#include <atomic>
+#include <utility>
 
 namespace qx {
 
@@ -44,10 +50,6 @@ Ref<Dictionary> dictionaryOf(const ValueChange& change, unsigned options) {
         result->set(isPrior, true);
     return result;
 }
-
-} // namespace
-
-namespace {
 
 std::atomic<std::uint64_t> observancesMade{0};
 

@@ -1,5 +1,7 @@
 #include "observe/ObservationInfo.h"
 
+#include "observe/ObservationPath.h"
+
 #include <algorithm>
 #include <exception>
 #include <limits>

@@ -3,6 +3,8 @@
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include <algorithm>
+
 namespace qx::detail {
 
 namespace {

@@ -7,6 +7,7 @@
 #include "model/NameList.h"
 #include "model/Warning.h"
 
+#include <array>
 #include <exception>
 
 namespace qx {

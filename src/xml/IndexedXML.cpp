@@ -1,11 +1,8 @@
 #include "xml/IndexedXML.h"
 
-#include <QXXMLMarshalling/base/Key.h>
-
+#include "base/KnownName.h"
 #include "base/TextBlocks.h"
 #include "xml/XMLNodeMaker.h"
-
-#include <algorithm>
 
 namespace qx {
 
@@ -104,12 +101,12 @@ void IndexedXML::findRoot() noexcept {
 void IndexedXML::internNames() {
     const auto names = _index->names();
     for (std::size_t i = 0; i < names.size(); ++i) {
-        const Key known = names[i].isInterned() ? Key() : Key::existing(names[i]);
-        if (known.isNull())
+        String known = knownName(names[i]);
+        if (known.isSameAs(names[i]))
             continue;
         if (_interned.empty())
             _interned.assign(names.begin(), names.end());
-        _interned[i] = known.string();
+        _interned[i] = std::move(known);
     }
 }
 

@@ -4,6 +4,7 @@
 #include "xml/XMLSiblings.h"
 
 #include <algorithm>
+#include <vector>
 
 namespace qx {
 

@@ -8,8 +8,6 @@
 #include "xml/TextPosition.h"
 #include "xml/XMLTreeIndexer.h"
 
-#include <vector>
-
 namespace qx {
 
 // The nodes that have been made of an index, by the numbers of their entries: elements, and perhaps

@@ -14,15 +14,13 @@
 #include <utility>
 #include <vector>
 
-namespace qx {
+namespace qx::detail {
 
 // A type of member that stands for several keys, whatever the key is that it is described with:
 // `count`, `keys[count]`, and static functions get<I>(const T&), a value, and set<I>(T&, value),
 // false where it is refused.
 template <class T>
 struct MemberKeys;
-
-namespace detail {
 
 // A class before it is published.
 struct ClassDraft {
@@ -308,5 +306,4 @@ Operation classOperation(std::string_view name) {
     return operation;
 }
 
-} // namespace detail
-} // namespace qx
+} // namespace qx::detail

@@ -7,6 +7,7 @@
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
+#include <array>
 #include <memory>
 #include <optional>
 #include <set>

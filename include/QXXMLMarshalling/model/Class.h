@@ -35,11 +35,15 @@
 #include <QXXMLMarshalling/detail/ClassDescription.h>
 #include <QXXMLMarshalling/model/Boxed.h>
 
+#include <array>
+#include <atomic>
 #include <initializer_list>
-#include <memory>
-#include <typeindex>
 
 namespace qx {
+
+namespace detail {
+struct StructInternals;
+} // namespace detail
 
 template <class T>
 class ClassBuilder;
@@ -86,11 +90,6 @@ public:
         return performWithArguments(selector, values);
     }
 
-    // For the library: how structs of the class are moved, null for objects; makes an object that
-    // holds one know its class at once.
-    const detail::StructType* structType() const noexcept { return _structType; }
-    void assignTo(const detail::StructObject& object) const noexcept;
-
     // Whether setValueForKey tells observers of the property by itself: the answer of the class
     // operation "automaticallyNotifiesObserversForKey:", else true.
     bool automaticallyNotifiesObserversForKey(Key key) const;
@@ -101,15 +100,18 @@ public:
 private:
     friend class Object;
     friend struct ClassRegistry;
+    friend struct detail::StructInternals;
 
     explicit Class(detail::ClassDraft draft);
     // The class of the object's dynamic type; a stand-in when nobody described it.
     static const Class& ofObject(const Object& object);
+    // Makes an object that holds a struct of the class know it at once.
+    void assignTo(const detail::StructObject& object) const noexcept;
 
     Key _name;
     const std::type_info* _type;
     const std::type_info* _superclassType;
-    const detail::StructType* _structType;
+    const detail::StructType* _structType; // how structs of the class are moved; null for objects
     mutable std::atomic<const Class*> _superclass{nullptr};
     Ref<Object> (*_create)();
     std::vector<Property> _properties;

@@ -153,24 +153,6 @@ private:
     mutable std::atomic<std::uint32_t> _count{1}; // last: small members of other classes fit behind
 };
 
-// What weak references hold on to: it outlives its object and then yields null.
-class QX_API WeakAnchor {
-public:
-    explicit WeakAnchor(Object* target) noexcept : _target(target) {}
-    Object* target() const noexcept { return _target.load(std::memory_order_acquire); }
-    void clear() noexcept { _target.store(nullptr, std::memory_order_release); }
-
-    void retain() const noexcept { _count.fetch_add(1, std::memory_order_relaxed); }
-    void release() const noexcept {
-        if (_count.fetch_sub(1, std::memory_order_acq_rel) == 1)
-            delete this;
-    }
-
-private:
-    mutable std::atomic<std::uint32_t> _count{1};
-    std::atomic<Object*> _target;
-};
-
 } // namespace qx
 
 #include <QXXMLMarshalling/model/Value.h>

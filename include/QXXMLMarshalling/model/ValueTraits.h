@@ -40,10 +40,8 @@
 #include <QXXMLMarshalling/model/Boxed.h>
 #include <QXXMLMarshalling/model/Value.h>
 
-#include <array>
 #include <concepts>
 #include <cstddef>
-#include <limits>
 #include <string>
 #include <type_traits>
 #include <vector>
