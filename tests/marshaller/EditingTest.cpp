@@ -1,6 +1,7 @@
 // Documents are read, edited and written: undoing all that was edited gives the text again that
 // they would have been written with.
 
+#include "support/Page.h"
 #include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
@@ -47,20 +48,8 @@ const bool described = [] {
     return true;
 }();
 
-constexpr const char* mapping =
-    "<Order xml='order' ns-uri='urn:order'><title node='attribute'/>"
-    "<owner type='Owner' node='element'/>"
-    "<lines collection='array' type='EditingTest.Line' name='line' location='lines'/>"
-    "<notes collection='array' type='Note' name='note'/></Order><Owner><name node='attribute'/>"
-    "<count type='int' node='element'/></Owner><Note><text node='text'/></Note><EditingTest.Line>"
-    "<count type='int' node='attribute'/><text node='text'/></EditingTest.Line>"
-    "<EditingTest.Page xml='page'><title required='true' node='attribute'/>"
-    "<text required='true' node='element'/></EditingTest.Page>";
-
-constexpr const char* document =
-    "<order title='t' xmlns='urn:order' late='yes'><owner name='Ada'><count>3</count><vat/>"
-    "</owner><lines><line count='1' id='a'>one</line><line count='2'>two</line></lines>"
-    "<note>n</note><extra><deep/></extra></order>";
+const auto blocks = support::blocksOf(QX_SOURCE_DIR "/tests/marshaller/editing.md");
+const std::string &mapping = blocks.at(0).text, &document = blocks.at(1).text;
 
 TEST(EditingTest, UndoneToTheStartADocumentIsWrittenAsBeforeAndRedoneAsAfter) {
     const auto marshaller = scenario::marshaller(mapping);

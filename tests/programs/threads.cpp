@@ -34,38 +34,16 @@ struct Line : qx::UndoableObject {
 template <unsigned number>
 struct Visitor : qx::Object {};
 
-const char* const mappingText = R"(<mapping>
-    <include href="common.xml"/>
-    <class name="Order" extends="Common">
-        <map-to xml="order" ns-uri="urn:order"/>
-        <field name="title" required="true"><bind-xml name="title" node="element"/></field>
-        <field name="lines" collection="array" type="Line"><bind-xml name="line" location="lines"/></field>
-        <field name="any" collection="array"><bind-xml name="any"/></field>
-        <field name="place" type="Place"><bind-xml name="place" node="element"/></field>
-    </class>
-    <class name="Place">
-        <field name="address" type="Address" container="false"><bind-xml node="element"/></field>
-    </class>
-    <class name="Line">
-        <map-to xml="line"/>
-        <field name="count" type="int"><bind-xml name="count" node="attribute"/></field>
-        <field name="text"><bind-xml node="text"/></field>
-    </class>
-    <class name="Note"><map-to xml="note"/><field name="text"><bind-xml node="text"/></field></class>
-    <class name="Address"><field name="city"><bind-xml name="city" node="element"/></field></class>
-</mapping>)";
-
-const char* const includedText = R"(<mapping>
-    <class name="Common"><field name="id"><bind-xml name="id" node="attribute"/></field></class>
-</mapping>)";
+qx::Ref<qx::XMLDocument> documentOf(const std::string& name) {
+    return qx::XMLDocument::initWithContentsOfFile(QX_SOURCE_DIR "/tests/programs/" + name);
+}
 
 // What a mapping includes is looked for through the shared manager, which one thread uses at a
 // time.
 qx::Ref<QXXMLMarshallingMapping> resolve() {
     static std::mutex mutex;
     const std::lock_guard lock(mutex);
-    return QXXMLMarshallingMapping::initWithDocument(
-        qx::XMLDocument::initWithData(mappingText).get());
+    return QXXMLMarshallingMapping::initWithDocument(documentOf("threads.xml").get());
 }
 
 std::string orderText(unsigned thread, unsigned round) {
@@ -178,7 +156,7 @@ void useBundles(unsigned thread, unsigned round) {
 void useRepositories(unsigned thread, unsigned round) {
     const auto inMemory = QXXMLVolatileDataRepository::init();
     const qx::String name = "document" + std::to_string(thread) + ".xml";
-    inMemory->setDocument(qx::XMLDocument::initWithData(mappingText), name);
+    inMemory->setDocument(documentOf("threads.xml"), name);
     const auto own = QXXMLDataRepositoryManager::init();
     own->setRepository(inMemory, "own");
     check(static_cast<bool>(own->documentNamed(name)), "a document is found by name");
@@ -266,7 +244,7 @@ int main(int argc, char** argv) {
         .property<&Line::namespaces>("__namespaces")
         .operation<&Line::isRemovable>("isRemovable");
     const auto included = QXXMLVolatileDataRepository::init();
-    included->setDocument(qx::XMLDocument::initWithData(includedText), "common.xml");
+    included->setDocument(documentOf("threads-common.xml"), "common.xml");
     QXXMLDataRepositoryManager::defaultManager()->setVolatileRepository(included);
 
     const auto mapping = resolve();

@@ -72,30 +72,6 @@ TEST(XMLSerializer, TextsThatAParserWouldChangeAreReadBack) {
     }
 }
 
-TEST(XMLSerializer, PrettyPrintingTouchesNoText) {
-    const std::pair<const char*, const char*> cases[] = {
-        {"<a/>", "<a></a>\n"},
-        {"<a>x</a>", "<a>x</a>\n"},
-        {"<a><b/><c>x</c></a>", "<a>\n    <b></b>\n    <c>x</c>\n</a>\n"},
-        {"<a><b><c><!--d--></c></b><?e f?></a>",
-         "<a>\n    <b>\n        <c>\n            <!--d-->\n        </c>\n    </b>\n    <?e "
-         "f?>\n</a>\n"},
-        {"<a><b>x<c><d/></c></b></a>", "<a>\n    <b>x<c><d></d></c></b>\n</a>\n"},
-        {"<a> <b/></a>", "<a> <b></b></a>\n"},
-        {"<a><b xml:space='preserve'><c/></b></a>",
-         "<a>\n    <b xml:space=\"preserve\"><c></c></b>\n</a>\n"},
-        {"<a xml:space='preserve'><b xml:space='default'><c/></b></a>",
-         "<a xml:space=\"preserve\"><b xml:space=\"default\">\n        <c></c>\n    </b></a>\n"},
-        {"<?xml version='1.0'?><!--x--><a/>", "<?xml version=\"1.0\"?>\n<!--x-->\n<a></a>\n"},
-    };
-    for (const auto& [text, pretty] : cases) {
-        const auto document = XMLDocument::initWithData(text);
-        EXPECT_EQ(document->XMLData(qx::XMLPrettyPrint), pretty) << text;
-        const auto again = XMLDocument::initWithData(document->XMLData(qx::XMLPrettyPrint));
-        EXPECT_TRUE(again->isSameXML(*document)) << text;
-    }
-}
-
 TEST(XMLSerializer, EmptyElementsMayBeCompact) {
     const auto document = XMLDocument::initWithData("<a><b c='1'></b>x<d>y</d></a>");
     EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements), "<a><b c=\"1\"/>x<d>y</d></a>");
