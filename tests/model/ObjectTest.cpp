@@ -104,4 +104,25 @@ TEST(ObjectTest, KeyPathsPassOverNullAndRaiseAtWhatIsNoObject) {
               "its key seats");
 }
 
+TEST(ObjectTest, KeysAreReadAndAssignedInBrackets) {
+    const auto wagon = make<Wagon>();
+    wagon["load"] = "tea";
+    wagon["seats"] = 4;
+    wagon["next"] = make<Wagon>();
+    wagon->next["load"] = wagon["load"];
+    (*wagon)["load"] = std::vector{1, 2};
+    EXPECT_EQ(wagon->next["load"], "tea");
+    EXPECT_EQ(wagon["load"].get<std::vector<int>>(), (std::vector{1, 2}));
+    const Wagon& read = *wagon;
+    EXPECT_EQ(read["seats"].get<std::string>(), "4");
+    EXPECT_EQ(read["load"].tryGet<int>(), std::nullopt);
+    wagon["load"] = nullptr;
+    EXPECT_EQ(support::oneLine(read["load"]), "(null)");
+    EXPECT_EQ(raised([&] { wagon["seats"] = "x"; }),
+              "NSInvalidArgumentException: class ObjectTest.Wagon does not take the value x for "
+              "its key seats");
+    EXPECT_EQ(raised([&] { read["nothing"].get<int>(); }),
+              "NSUndefinedKeyException: class ObjectTest.Wagon has no key nothing to read");
+}
+
 } // namespace
