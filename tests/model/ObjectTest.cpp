@@ -118,11 +118,8 @@ TEST(ObjectTest, KeysAreReadAndAssignedInBrackets) {
     EXPECT_EQ(read["load"].tryGet<int>(), std::nullopt);
     wagon["load"] = nullptr;
     EXPECT_EQ(support::oneLine(read["load"]), "(null)");
-    EXPECT_EQ(raised([&] { wagon["seats"] = "x"; }),
-              "NSInvalidArgumentException: class ObjectTest.Wagon does not take the value x for "
-              "its key seats");
-    EXPECT_EQ(raised([&] { read["nothing"].get<int>(); }),
-              "NSUndefinedKeyException: class ObjectTest.Wagon has no key nothing to read");
+    EXPECT_THROW(wagon["seats"] = "x", Exception);
+    EXPECT_THROW(read["nothing"].get<int>(), Exception);
 }
 
 } // namespace

@@ -107,30 +107,18 @@ TEST(ValueTest, EqualNumbersAreEqualWhateverTheirKindAndNoOthers) {
 }
 
 TEST(ValueTest, ValuesHaveOneOrderWhateverTheirKind) {
-    // Those of a row are of one place.
-    const std::vector<std::vector<Value>> rows{{nullptr},
-                                               {NAN},
-                                               {-INFINITY},
-                                               {INT64_MIN, -0x1p63},
-                                               {-3.5},
-                                               {-3, -3.0},
-                                               {false, 0.0},
-                                               {true, 1},
-                                               {1.5},
-                                               {9'007'199'254'740'992, 0x1p53},
-                                               {INT64_C(9'007'199'254'740'993)},
-                                               {INT64_MAX},
-                                               {0x1p63},
-                                               {INFINITY},
-                                               {"", String() + ""},
-                                               {"10"},
-                                               {"9"},
-                                               {make<Array>(), make<Dictionary>()}};
-    for (std::size_t i = 0; i < rows.size(); ++i)
-        for (std::size_t j = 0; j < rows.size(); ++j)
-            for (const Value& a : rows[i])
-                for (const Value& b : rows[j])
-                    EXPECT_EQ(a <=> b, std::weak_ordering(i <=> j)) << oneLine(array({a, b}));
+    constexpr std::int64_t odd = 9'007'199'254'740'993; // no double
+    const std::vector<Value> values{nullptr, NAN,      -INFINITY, INT64_MIN, -3.5, -3,
+                                    false,   1,        1.5,       odd - 1,   odd,  INT64_MAX,
+                                    0x1p63,  INFINITY, "",        "10",      "9",  make<Array>()};
+    const std::vector<Value> others{
+        nullptr, NAN, -INFINITY, -0x1p63, -3.5,     -3.0, 0.0,  true, 1.5,
+        0x1p53,  odd, INT64_MAX, 0x1p63,  INFINITY, "",   "10", "9",  make<Dictionary>()};
+    for (std::size_t i = 0; i < values.size(); ++i)
+        for (std::size_t j = 0; j < others.size(); ++j) {
+            EXPECT_EQ(values[i] <=> others[j], std::weak_ordering(i <=> j)) << i << ' ' << j;
+            EXPECT_EQ(others[j] <=> values[i], std::weak_ordering(j <=> i)) << i << ' ' << j;
+        }
 }
 
 struct Spot {
@@ -149,8 +137,6 @@ TEST(ValueTest, AValueIsHadAsWhatAPropertyWouldTake) {
     // Structs are copied, at any depth, though nobody else holds their boxes.
     const Value spot = make<Boxed<Spot>>(Spot{3});
     const Value spots = array({array({make<Boxed<Spot>>(Spot{4})})});
-    EXPECT_EQ(raised([&] { spot.get<std::string>(); }).substr(0, 43),
-              "NSInvalidArgumentException: the value <Valu");
     for (int times = 0; times < 2; ++times) {
         EXPECT_EQ(spot.get<Spot>().number, 3);
         EXPECT_EQ(spot.get<std::unique_ptr<Spot>>()->number, 3);
@@ -165,9 +151,8 @@ TEST(ValueTest, CollectionsAreRanges) {
     std::ranges::stable_sort(*list, std::greater(), &Value::intValue);
     EXPECT_EQ(oneLine(list), "( 3, 2.5, (null), a, b )");
     EXPECT_EQ(std::ranges::find(std::as_const(*list), "a") - std::as_const(*list).begin(), 3);
-    list[0] = "new";
-    list->at(1) = list[4];
-    EXPECT_EQ(oneLine(list), "( new, b, (null), a, b )");
+    list->at(0) = list[4];
+    EXPECT_EQ(oneLine(list), "( b, 2.5, (null), a, b )");
     EXPECT_EQ(raised([&] { list[5] = 1; }), "NSRangeException: index 5 in an array of 5 items");
     EXPECT_EQ(
         raised([&] { std::ranges::for_each(*list, [&](const Value&) { list->removeAll(); }); }),
