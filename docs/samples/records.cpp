@@ -11,6 +11,7 @@
 #include <QXXMLMarshalling/observe/Observation.h>
 #include <QXXMLMarshalling/undo/UndoableObject.h>
 
+#include <algorithm>
 #include <iostream>
 #include <sstream>
 
@@ -19,21 +20,39 @@ namespace {
 TEST(RecordsPage, Keys) {
     // sample: keys
     auto order = qx::make<QXGenericRecord>();
-    order->setValueForKey("A-17", "number");
-    order->setValueForKey(3, "count");
+    order["number"] = "A-17"; // the same as order->setValueForKey("A-17", "number")
+    order["count"] = 3;
 
+    auto number = order["number"].get<std::string>();    // "A-17"; raises where it is no text
     std::optional<int> count = order->get<int>("count"); // 3
     std::optional<int> none = order->get<int>("number"); // no number: none
-    qx::Value unknown = order->valueForKey("colour");    // null
-    order->setValueForKey(nullptr, "count");             // the key is gone
+    qx::Value unknown = order["colour"];                 // null
+    order["count"] = nullptr;                            // the key is gone
 
     for (const qx::String& key : order->keys()) // in the order in which they were first set
-        std::cout << key.view() << '\n';
+        std::cout << key << '\n';
     // end of sample
+    EXPECT_EQ(number, "A-17");
     EXPECT_EQ(count, 3);
     EXPECT_EQ(none, std::nullopt);
     EXPECT_TRUE(unknown.isNull());
     EXPECT_EQ(order->keys(), std::vector<qx::String>{"number"});
+}
+
+TEST(RecordsPage, Ranges) {
+    const auto order = qx::make<QXGenericRecord>();
+    // sample: ranges
+    order["sizes"] = std::vector{40, 36, 38};
+    auto sizes = order["sizes"].get<qx::Ref<qx::Array>>(); // the list itself, not a copy
+    std::ranges::sort(*sizes);
+    sizes[0] = sizes[0].get<int>() - 1; // 35
+    auto large = std::ranges::count_if(*sizes, [](const qx::Value& size) { return size > 37; });
+
+    for (const auto& [key, value] : *order->contents())
+        std::cout << key + ": " << value.description() << '\n';
+    // end of sample
+    EXPECT_EQ(large, 2);
+    EXPECT_EQ(order["sizes"].get<std::vector<int>>(), (std::vector{35, 38, 40}));
 }
 
 TEST(RecordsPage, ClassNamesAndReservedKeys) {

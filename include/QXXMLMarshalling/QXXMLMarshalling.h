@@ -43,6 +43,7 @@
 #include <QXXMLMarshalling/model/Error.h>
 #include <QXXMLMarshalling/model/Format.h>
 #include <QXXMLMarshalling/model/Invocation.h>
+#include <QXXMLMarshalling/model/KeyedValue.h>
 #include <QXXMLMarshalling/model/MethodSignature.h>
 #include <QXXMLMarshalling/model/Null.h>
 #include <QXXMLMarshalling/model/Object.h>

@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <new>
+#include <ostream>
 
 #include <sys/auxv.h>
 
@@ -81,6 +82,8 @@ String String::concat(std::initializer_list<std::string_view> parts) {
     }
     return String(rep);
 }
+
+std::ostream& String::print(std::ostream& out) const { return out << view(); }
 
 namespace {
 

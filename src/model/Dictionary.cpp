@@ -43,6 +43,12 @@ Value Dictionary::get(const String& key) const {
     return value != nullptr ? *value : Value();
 }
 
+const Value& Dictionary::at(const String& key) const {
+    if (const Value* value = find(key))
+        return *value;
+    throw Exception(Exception::undefinedKey, "a dictionary has no key " + Value(key).description());
+}
+
 namespace {
 
 [[noreturn, gnu::cold]] void raiseNull(const String& key) {

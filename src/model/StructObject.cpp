@@ -1,9 +1,12 @@
 #include <QXXMLMarshalling/detail/StructObject.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Class.h>
 
 #include "model/TypeNames.h"
+
+#include <unordered_set>
 
 namespace qx::detail {
 
@@ -92,6 +95,15 @@ Value copyInBox(const std::type_info& type, const void* place) {
         if (auto copy = copyOf(lent))
             return copy;
     raiseNoCopy(type);
+}
+
+std::vector<Value> heldIn(const Value& value) {
+    std::vector<Value> held{value};
+    std::unordered_set<const Object*> seen; // an array may stand in itself
+    for (std::size_t i = 0; i < held.size(); ++i)
+        if (const auto array = held[i].as<Array>(); array && seen.insert(array.get()).second)
+            held.insert(held.end(), array->begin(), array->end());
+    return held;
 }
 
 namespace {

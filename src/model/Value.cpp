@@ -1,9 +1,11 @@
 #include <QXXMLMarshalling/model/Value.h>
 
+#include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 #include "base/Scan.h"
 #include "base/WhiteSpace.h"
+#include "model/TypeNames.h"
 
 #include <algorithm>
 #include <cmath>
@@ -55,21 +57,22 @@ bool textIsTrue(std::string_view text) {
             (text.front() >= '1' && text.front() <= '9'));
 }
 
+constexpr double twoTo63 = 9223372036854775808.0;
+
 std::int64_t saturated(double value) {
-    constexpr double limit = 9223372036854775808.0; // 2^63
     if (std::isnan(value))
         return 0;
-    if (value >= limit)
+    if (value >= twoTo63)
         return INT64_MAX;
-    if (value < -limit)
+    if (value < -twoTo63)
         return INT64_MIN;
     return static_cast<std::int64_t>(value);
 }
 
 // Exact, where a comparison of doubles would round the integer.
 bool equal(std::int64_t integer, double real) {
-    return std::trunc(real) == real && real >= -9223372036854775808.0 &&
-           real < 9223372036854775808.0 && static_cast<std::int64_t>(real) == integer;
+    return std::trunc(real) == real && real >= -twoTo63 && real < twoTo63 &&
+           static_cast<std::int64_t>(real) == integer;
 }
 
 } // namespace
@@ -170,6 +173,45 @@ bool Value::isEqual(const Value& other) const {
     return true;
 }
 
+namespace {
+
+std::weak_ordering orderOfReals(double a, double b) {
+    if (std::isnan(a) || std::isnan(b))
+        return std::isnan(b) <=> std::isnan(a);
+    return a < b   ? std::weak_ordering::less
+           : b < a ? std::weak_ordering::greater
+                   : std::weak_ordering::equivalent;
+}
+
+// Exact as above: what is cut off decides only where the whole numbers are the same.
+std::weak_ordering order(std::int64_t integer, double real) {
+    if (std::isnan(real) || real < -twoTo63)
+        return std::weak_ordering::greater;
+    if (real >= twoTo63)
+        return std::weak_ordering::less;
+    const auto whole = static_cast<std::int64_t>(real);
+    return integer != whole ? integer <=> whole : orderOfReals(0, real - std::trunc(real));
+}
+
+} // namespace
+
+std::weak_ordering Value::compare(const Value& other) const noexcept {
+    if (isNumber() && other.isNumber()) {
+        if (_kind == Kind::real)
+            return other._kind == Kind::real ? orderOfReals(_payload.real, other._payload.real)
+                                             : 0 <=> order(other.intValue(), _payload.real);
+        return other._kind == Kind::real ? order(intValue(), other._payload.real)
+                                         : intValue() <=> other.intValue();
+    }
+    if (isString() && other.isString())
+        return view() <=> other.view();
+    // Booleans, integers and doubles have one place among the kinds.
+    const auto place = [](const Value& value) {
+        return value.isNumber() ? Kind::real : value._kind;
+    };
+    return place(*this) <=> place(other);
+}
+
 bool Value::isSameAs(const Value& other) const noexcept {
     if (_kind != other._kind)
         return false;
@@ -207,6 +249,11 @@ String Value::classNameForMarshalling() const {
         return _payload.object->classNameForMarshalling();
     }
     return {};
+}
+
+void detail::raiseNotOfType(const Value& value, const std::type_info& type) {
+    throw Exception(Exception::invalidArgument, String::concat({"the value ", value.description(),
+                                                                " is no ", readableName(type)}));
 }
 
 } // namespace qx

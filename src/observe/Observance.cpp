@@ -81,7 +81,7 @@ void Observance::enlist(Object* observer) {
 }
 
 void Observance::begin(Object* observer, Selector context,
-                       std::function<void(const ValueChange&)> call) {
+                       detail::UniqueFunction<void(const ValueChange&)> call) {
     if (ObjectInternals::isEnding(*_root) ||
         (observer != nullptr && ObjectInternals::isEnding(*observer))) {
         _root = nullptr;

@@ -11,7 +11,6 @@
 #include <QXXMLMarshalling/model/Value.h>
 #include <QXXMLMarshalling/observe/Observation.h>
 
-#include <functional>
 #include <list>
 #include <optional>
 #include <span>
@@ -46,7 +45,8 @@ public:
     }
 
     // Ended at once where one of the objects is ending.
-    void begin(Object* observer, Selector context, std::function<void(const ValueChange&)> call);
+    void begin(Object* observer, Selector context,
+               detail::UniqueFunction<void(const ValueChange&)> call);
     // Takes it out of all objects; the callable lives on until nobody tells it any more.
     void end() noexcept;
     bool hasEnded() const noexcept { return _root == nullptr; }
@@ -85,7 +85,7 @@ private:
     Key _keyPath;
     unsigned _options;
     Selector _context;
-    std::function<void(const ValueChange&)> _call;
+    detail::UniqueFunction<void(const ValueChange&)> _call;
     std::vector<ObservationLink*> _links; // null for a link whose object has ended
     bool _isOutdated = false;
     bool _isWalking = false;

@@ -14,7 +14,7 @@ void Object::addObserver(Object* observer, Key keyPath, unsigned options, Select
     make<Observance>(*this, keyPath, options)->begin(observer, context, nullptr);
 }
 
-ObservationToken Object::observe(Key keyPath, std::function<void(const ValueChange&)> call,
+ObservationToken Object::observe(Key keyPath, detail::UniqueFunction<void(const ValueChange&)> call,
                                  unsigned options) {
     if (!call)
         throw Exception(Exception::invalidArgument,

@@ -12,7 +12,6 @@
 
 #include "model/ObjectExtras.h"
 
-#include <functional>
 #include <unordered_map>
 #include <vector>
 
@@ -38,7 +37,7 @@ struct UndoAction : UndoItem {
     UndoAction* nextOfTarget = nullptr;
     Selector selector;
     std::vector<Value> arguments;
-    std::function<void(Object&)> call; // instead of the selector, where it is set
+    detail::UniqueFunction<void(Object&)> call; // instead of the selector, where it is set
 };
 
 struct UndoItemGroup : UndoItem {

@@ -128,7 +128,7 @@ void UndoManager::registerChange(Object& target, Selector selector, const Value&
     _state->add(std::move(action));
 }
 
-void UndoManager::registerCall(Object& target, std::function<void(Object&)> call) {
+void UndoManager::registerCall(Object& target, detail::UniqueFunction<void(Object&)> call) {
     if (!isUndoRegistrationEnabled() || ObjectInternals::isEnding(target))
         return;
     const Ref<UndoManager> kept(this);

@@ -104,4 +104,22 @@ TEST(ObjectTest, KeyPathsPassOverNullAndRaiseAtWhatIsNoObject) {
               "its key seats");
 }
 
+TEST(ObjectTest, KeysAreReadAndAssignedInBrackets) {
+    const auto wagon = make<Wagon>();
+    wagon["load"] = "tea";
+    wagon["seats"] = 4;
+    wagon["next"] = make<Wagon>();
+    wagon->next["load"] = wagon["load"];
+    (*wagon)["load"] = std::vector{1, 2};
+    EXPECT_EQ(wagon->next["load"], "tea");
+    EXPECT_EQ(wagon["load"].get<std::vector<int>>(), (std::vector{1, 2}));
+    const Wagon& read = *wagon;
+    EXPECT_EQ(read["seats"].get<std::string>(), "4");
+    EXPECT_EQ(read["load"].tryGet<int>(), std::nullopt);
+    wagon["load"] = nullptr;
+    EXPECT_EQ(support::oneLine(read["load"]), "(null)");
+    EXPECT_THROW(wagon["seats"] = "x", Exception);
+    EXPECT_THROW(read["nothing"].get<int>(), Exception);
+}
+
 } // namespace

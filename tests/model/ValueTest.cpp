@@ -3,12 +3,14 @@
 #include "support/Texts.h"
 
 #include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 #include <QXXMLMarshalling/model/Format.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 
 namespace {
@@ -102,6 +104,75 @@ TEST(ValueTest, EqualNumbersAreEqualWhateverTheirKindAndNoOthers) {
     EXPECT_EQ(Value(3.0), Value(3));
     EXPECT_NE(Value(9'007'199'254'740'993), Value(9007199254740992.0));
     EXPECT_NE(Value("3"), Value(3));
+}
+
+TEST(ValueTest, ValuesHaveOneOrderWhateverTheirKind) {
+    constexpr std::int64_t odd = 9'007'199'254'740'993; // no double
+    const std::vector<Value> values{nullptr, NAN,      -INFINITY, INT64_MIN, -3.5, -3,
+                                    false,   1,        1.5,       odd - 1,   odd,  INT64_MAX,
+                                    0x1p63,  INFINITY, "",        "10",      "9",  make<Array>()};
+    const std::vector<Value> others{
+        nullptr, NAN, -INFINITY, -0x1p63, -3.5,     -3.0, 0.0,  true, 1.5,
+        0x1p53,  odd, INT64_MAX, 0x1p63,  INFINITY, "",   "10", "9",  make<Dictionary>()};
+    for (std::size_t i = 0; i < values.size(); ++i)
+        for (std::size_t j = 0; j < others.size(); ++j) {
+            EXPECT_EQ(values[i] <=> others[j], std::weak_ordering(i <=> j)) << i << ' ' << j;
+            EXPECT_EQ(others[j] <=> values[i], std::weak_ordering(j <=> i)) << i << ' ' << j;
+        }
+}
+
+struct Spot {
+    int number = 0;
+};
+
+TEST(ValueTest, AValueIsHadAsWhatAPropertyWouldTake) {
+    Class::define<Spot>("ValueTest.Spot").members<&Spot::number>();
+    EXPECT_EQ(Value("7").get<int>(), 7);
+    EXPECT_EQ(Value("2d").get<Fix>(), Fix::flat);
+    EXPECT_EQ(Value().get<std::optional<int>>(), std::nullopt);
+    EXPECT_EQ(Value().tryGet<int>(), std::nullopt);
+    EXPECT_EQ(Value("7 pieces").tryGet<int>(), std::nullopt);
+    EXPECT_EQ(raised([] { Value("7 pieces").get<int>(); }),
+              "NSInvalidArgumentException: the value 7 pieces is no int");
+    // Structs are copied, at any depth, though nobody else holds their boxes.
+    const Value spot = make<Boxed<Spot>>(Spot{3});
+    const Value spots = array({array({make<Boxed<Spot>>(Spot{4})})});
+    for (int times = 0; times < 2; ++times) {
+        EXPECT_EQ(spot.get<Spot>().number, 3);
+        EXPECT_EQ(spot.get<std::unique_ptr<Spot>>()->number, 3);
+        EXPECT_EQ((spots.get<std::vector<std::vector<Spot>>>()[0][0].number), 4);
+    }
+}
+
+TEST(ValueTest, CollectionsAreRanges) {
+    const auto list = array({"b", 3, "a", nullptr, 2.5});
+    std::ranges::sort(*list);
+    EXPECT_EQ(oneLine(list), "( (null), 2.5, 3, a, b )");
+    std::ranges::stable_sort(*list, std::greater(), &Value::intValue);
+    EXPECT_EQ(oneLine(list), "( 3, 2.5, (null), a, b )");
+    EXPECT_EQ(std::ranges::find(std::as_const(*list), "a") - std::as_const(*list).begin(), 3);
+    list->at(0) = list[4];
+    EXPECT_EQ(oneLine(list), "( b, 2.5, (null), a, b )");
+    EXPECT_EQ(raised([&] { list[5] = 1; }), "NSRangeException: index 5 in an array of 5 items");
+    EXPECT_EQ(
+        raised([&] { std::ranges::for_each(*list, [&](const Value&) { list->removeAll(); }); }),
+        "NSGenericException: an array was changed while it was walked");
+
+    const auto map = make<Dictionary>();
+    map["b"] = 2;
+    map["a"] = Fix::flat;
+    map["c"] = map["b"];
+    map["gone"] = 1;
+    map["gone"] = nullptr;
+    std::string all;
+    for (const auto& [key, value] : *map)
+        all += key.str() + "=" + value.description().str() + " ";
+    EXPECT_EQ(all, "b=2 a=2d c=2 ");
+    EXPECT_EQ(std::ranges::find(*map, "a", &Dictionary::Entry::key)->value, "2d");
+    EXPECT_EQ(map["b"].get<int>() + map->at("b").get<int>(), 4);
+    EXPECT_EQ(std::as_const(*map)["gone"].value(), nullptr);
+    EXPECT_EQ(raised([&] { map->at("gone"); }),
+              "NSUndefinedKeyException: a dictionary has no key gone");
 }
 
 TEST(ValueTest, CollectionsRaiseForWhatTheyCannotDo) {

@@ -15,6 +15,7 @@
 namespace {
 
 using namespace qx;
+using support::raised;
 using Texts = std::vector<std::string>;
 
 class Place : public Object {
@@ -265,6 +266,28 @@ TEST_F(ObservationTest, AnObserverMayRemoveItselfAndOthersWhileItIsTold) {
     rome->setValueForKey("Rome", "city");
     EXPECT_EQ(notebook->notes.size(), 1U);
     EXPECT_EQ(calls, 10);
+}
+
+// The first lies in the observation, the second outside.
+TEST_F(ObservationTest, CallablesNeedNotBeCopiedAndEndWithTheirToken) {
+    const auto held = std::make_shared<int>(0);
+    ObservationToken tokens[] = {
+        rome->observe("city", [own = std::make_unique<int>(1),
+                               &held](const ValueChange&) { *held += ++*own; }),
+        rome->observe("city", [own = std::make_unique<int>(10), kept = held](const ValueChange&) {
+            *kept += ++*own;
+        })};
+    rome->setValueForKey("Roma", "city");
+    rome->setValueForKey("Rome", "city");
+    EXPECT_EQ(*held, 2 + 11 + 3 + 12);
+    tokens[1].end();
+    EXPECT_EQ(held.use_count(), 1);
+    const std::function<void(const ValueChange&)> empty;
+    void (*const none)(const ValueChange&) = nullptr;
+    const std::string refused = "NSInvalidArgumentException: no callable was given for city";
+    EXPECT_EQ(raised([&] { tokens[1] = rome->observe("city", empty); }), refused);
+    EXPECT_EQ(raised([&] { tokens[1] = rome->observe("city", none); }), refused);
+    EXPECT_EQ(raised([&] { tokens[1] = rome->observe("city", nullptr); }), refused);
 }
 
 TEST_F(ObservationTest, EitherSideMayGoFirst) {

@@ -231,6 +231,15 @@ TEST_F(UndoManagerTest, AnUndoOrRedoWithoutMemoryLeavesEverythingAsItWas) {
     EXPECT_EQ(counter->number, 3);
 }
 
+TEST_F(UndoManagerTest, CallablesNeedNotBeCopied) {
+    manager->registerUndo(*counter,
+                          [own = std::make_unique<int>(4)](Counter& c) { c.number += *own; });
+    manager->registerUndo(*counter, &Counter::reset);
+    counter->number = 7;
+    manager->undo();
+    EXPECT_EQ(counter->number, 4);
+}
+
 // Each as the second of three actions, alone and before one that finds no memory.
 TEST_F(UndoManagerTest, ActionsMayDoAnythingToTheManagerAndItsTargets) {
     Ref<Counter> ending;

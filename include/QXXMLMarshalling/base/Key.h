@@ -43,6 +43,11 @@ public:
     }
 
     friend bool operator==(Key a, Key b) noexcept { return a._rep == b._rep; }
+    // Same text, which does not become a key by that.
+    template <std::same_as<String> Text>
+    friend bool operator==(Key a, const Text& b) noexcept {
+        return a.string() == b;
+    }
 
 private:
     friend void detail::markAsProperty(Key key) noexcept;

@@ -55,6 +55,15 @@ public:
     T* operator->() const noexcept { return _object; }
     T& operator*() const noexcept { return *_object; }
     explicit operator bool() const noexcept { return _object != nullptr; }
+    // The object's own operator: array[0], record["city"].
+    decltype(auto) operator[](std::size_t index) const requires requires(T& object) {
+        object[index];
+    }
+    { return (*_object)[index]; }
+    template <class K>
+    requires(!std::integral<K>) decltype(auto) operator[](const K& key) const {
+        return (*_object)[key];
+    }
 
     // The same object as another class, or null where it is of no such class.
     template <class U>

@@ -9,14 +9,45 @@
 #include <QXXMLMarshalling/detail/StringRep.h>
 
 #include <atomic>
+#include <compare>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <initializer_list>
+#include <iosfwd>
 #include <string>
 #include <string_view>
+#include <type_traits>
 #include <utility>
+#include <version>
+#ifdef __cpp_lib_format
+#include <format>
+#endif
 
 namespace qx {
+
+class String;
+
+namespace detail {
+// What stands beside a String in comparisons and sums: std::string, std::string_view, a C string
+// (a null pointer is no text).
+template <class T>
+concept Text =
+    std::convertible_to<const T&, std::string_view> && !std::same_as<T, std::nullptr_t> &&
+    !std::same_as<T, String>;
+template <Text T>
+bool isNullText(const T& text) noexcept {
+    if constexpr (std::is_pointer_v<T>)
+        return text == nullptr;
+    else
+        return false;
+}
+template <Text T>
+std::string_view viewOf(const T& text) {
+    return isNullText(text) ? std::string_view() : std::string_view(text);
+}
+} // namespace detail
 
 class QX_API String {
 public:
@@ -67,13 +98,39 @@ public:
             return false;
         return a.view() == b.view();
     }
-    friend bool operator==(const String& a, std::string_view b) noexcept {
-        return a._rep != nullptr && a.view() == b;
-    }
-    friend bool operator==(const String& a, const char* b) noexcept {
-        return b == nullptr ? a.isNull() : a == std::string_view(b);
+    template <detail::Text T>
+    friend bool operator==(const String& a, const T& b) noexcept {
+        return a.isNull() ? detail::isNullText(b)
+                          : !detail::isNullText(b) && a.view() == detail::viewOf(b);
     }
     friend bool operator==(const String& a, std::nullptr_t) noexcept { return a.isNull(); }
+    // By bytes, so by code points; the null string comes before all others.
+    friend std::strong_ordering operator<=>(const String& a, const String& b) noexcept {
+        return a.compare(b.isNull(), b.view());
+    }
+    template <detail::Text T>
+    friend std::strong_ordering operator<=>(const String& a, const T& b) noexcept {
+        return a.compare(detail::isNullText(b), detail::viewOf(b));
+    }
+
+    // A new text of both, never null: a null one adds nothing. `concat` joins many at once.
+    friend String operator+(const String& a, const String& b) {
+        return concat({a.view(), b.view()});
+    }
+    template <detail::Text T>
+    friend String operator+(const String& a, const T& b) {
+        return concat({a.view(), detail::viewOf(b)});
+    }
+    template <detail::Text T>
+    friend String operator+(const T& a, const String& b) {
+        return concat({detail::viewOf(a), b.view()});
+    }
+
+    // The text, nothing for the null string; the stream's width counts. std::format prints it like
+    // a std::string_view, where the standard library has it.
+    friend std::ostream& operator<<(std::ostream& out, const String& text) {
+        return text.print(out);
+    }
 
     // True when both are the very same text in memory.
     bool isSameAs(const String& other) const noexcept { return _rep == other._rep; }
@@ -104,6 +161,12 @@ private:
     static constexpr std::uint32_t propertyBit = 0x20000000U; // see Key::namesProperty
 
     explicit String(Rep* rep) noexcept : _rep(rep) {}
+    std::strong_ordering compare(bool otherIsNull, std::string_view other) const noexcept {
+        if (isNull() || otherIsNull)
+            return otherIsNull <=> isNull();
+        return view() <=> other;
+    }
+    std::ostream& print(std::ostream& out) const;
     static const char* text(const Rep* rep) noexcept { return rep->view().data(); }
     // A text of that many bytes, which the caller fills in, with a count of one.
     static Rep* newRep(void* memory, std::size_t size, bool isInBlock) noexcept;
@@ -127,3 +190,30 @@ private:
 };
 
 } // namespace qx
+
+// Equal texts have equal hashes, in one process; they differ from process to process.
+template <>
+struct std::hash<qx::String> {
+    std::size_t operator()(const qx::String& text) const noexcept { return text.hash(); }
+};
+
+// Algorithms of std::ranges compare strings with other texts as views: each converts to the other,
+// so the language names no common type.
+template <qx::detail::Text T, template <class> class Q, template <class> class QT>
+struct std::basic_common_reference<qx::String, T, Q, QT> {
+    using type = std::string_view;
+};
+template <qx::detail::Text T, template <class> class QT, template <class> class Q>
+struct std::basic_common_reference<T, qx::String, QT, Q> {
+    using type = std::string_view;
+};
+
+#ifdef __cpp_lib_format
+template <>
+struct std::formatter<qx::String> : std::formatter<std::string_view> {
+    template <class Context>
+    auto format(const qx::String& text, Context& context) const {
+        return std::formatter<std::string_view>::format(text.view(), context);
+    }
+};
+#endif

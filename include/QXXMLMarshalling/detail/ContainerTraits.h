@@ -55,6 +55,20 @@ bool convert(const Value& value, Take take) {
     }
 }
 
+// The value and the items of its arrays, at any depth: a box that is held twice keeps its struct.
+QX_API std::vector<Value> heldIn(const Value& value);
+
+// What Value::tryGet gives.
+template <class T>
+std::optional<T> copiedAs(const Value& value) {
+    [[maybe_unused]] std::vector<Value> held;
+    if constexpr (Lendable<T>)
+        held = heldIn(value);
+    std::optional<T> result;
+    convert<T>(value, [&](T&& read) { result.emplace(std::move(read)); });
+    return result;
+}
+
 } // namespace detail
 
 template <class T>

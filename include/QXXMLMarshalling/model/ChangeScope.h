@@ -23,9 +23,10 @@ enum class ChangeKind : std::uint8_t { setting = 1, insertion, removal, replacem
 // Announces a change that is made in its scope. The observed object must outlive it.
 class QX_API ChangeScope {
 public:
-    ChangeScope(Object& object, Key key);
+    [[nodiscard]] ChangeScope(Object& object, Key key);
     // Items inserted into, removed from or replaced in the collection under the key.
-    ChangeScope(Object& object, Key key, ChangeKind kind, std::vector<std::size_t> indexes);
+    [[nodiscard]] ChangeScope(Object& object, Key key, ChangeKind kind,
+                              std::vector<std::size_t> indexes);
     // What observers throw comes out, unless another exception is on its way already.
     ~ChangeScope() noexcept(false);
     ChangeScope(const ChangeScope&) = delete;

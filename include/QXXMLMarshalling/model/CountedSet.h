@@ -22,7 +22,7 @@ public:
     // Lowers the count by as much, not below zero.
     void remove(const String& name, std::size_t times);
     void removeAll() noexcept;
-    Ref<CountedSet> mutableCopy() const;
+    [[nodiscard]] Ref<CountedSet> mutableCopy() const;
 
     std::size_t countFor(const String& name) const noexcept;
     bool contains(const String& name) const noexcept { return countFor(name) != 0; }

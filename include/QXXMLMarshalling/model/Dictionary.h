@@ -5,10 +5,14 @@
 // unless the dictionary has lost 1,000 keys more than it holds and then gained others. Changing it
 // while it is walked raises NSGenericException at the walk's next step. Small dictionaries are
 // scanned, larger ones carry an index.
+//
+//     for (const auto& [key, value] : *dictionary) …
 
 #include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/model/Value.h>
 
+#include <cstddef>
+#include <iterator>
 #include <memory>
 #include <vector>
 
@@ -31,34 +35,52 @@ public:
     static void* operator new(std::size_t size);
     static void operator delete(void* memory) noexcept;
 
+    // Walks the entries forwards and notices changes.
     class Iterator {
     public:
+        using iterator_category = std::forward_iterator_tag;
+        using value_type = Entry;
+        using difference_type = std::ptrdiff_t;
+        using pointer = const Entry*;
+        using reference = const Entry&;
+
+        Iterator() noexcept = default;
         Iterator(const Dictionary& dictionary, std::size_t index) noexcept
             : _dictionary(&dictionary), _index(index), _changes(dictionary._changes) {
             skipRemoved();
         }
         const Entry& operator*() const { return _dictionary->_entries[_index]; }
+        const Entry* operator->() const { return &**this; }
         Iterator& operator++() {
-            _dictionary->checkUnchanged(_changes);
+            check();
             ++_index;
             skipRemoved();
             return *this;
         }
-        bool operator!=(const Iterator& end) const {
-            _dictionary->checkUnchanged(_changes);
-            return _index < end._index;
+        Iterator operator++(int) {
+            const Iterator before = *this;
+            ++*this;
+            return before;
+        }
+        friend bool operator==(const Iterator& a, const Iterator& b) {
+            a.check();
+            return a._index == b._index;
         }
 
     private:
+        void check() const {
+            if (_dictionary != nullptr)
+                _dictionary->checkUnchanged(_changes);
+        }
         void skipRemoved() noexcept {
             while (_index < _dictionary->_entries.size() &&
                    _dictionary->_entries[_index].value.isNull())
                 ++_index;
         }
 
-        const Dictionary* _dictionary;
-        std::size_t _index;
-        std::size_t _changes;
+        const Dictionary* _dictionary = nullptr;
+        std::size_t _index = 0;
+        std::size_t _changes = 0;
     };
     Iterator begin() const { return {*this, _firstLive}; }
     Iterator end() const { return {*this, _entries.size()}; }
@@ -68,6 +90,12 @@ public:
 
     // Null when absent.
     Value get(const String& key) const;
+    // Raises NSUndefinedKeyException when absent. Good until the next change.
+    const Value& at(const String& key) const;
+    // Reads like get, sets like set; null removes the key: dictionary["city"] = "Bath". See
+    // KeyedValue.h.
+    KeyedValue<Dictionary, String> operator[](String key);
+    KeyedValue<const Dictionary, String> operator[](String key) const;
     bool contains(const String& key) const { return find(key) != nullptr; }
     // The stored value without a copy; null pointer when absent. Good until the next change.
     const Value* find(const String& key) const noexcept;
@@ -83,7 +111,7 @@ public:
     Ref<Array> allKeys() const;
     Ref<Array> allValues() const;
     // A new dictionary with the same keys and the very same values.
-    Ref<Dictionary> mutableCopy() const;
+    [[nodiscard]] Ref<Dictionary> mutableCopy() const;
     // How a dictionary is copied with the values inside it: null until the host installs a way.
     using DeepCopyFunction = Ref<Dictionary> (*)(const Dictionary&);
     static DeepCopyFunction deepCopyFunction() noexcept;

@@ -14,11 +14,11 @@
 #include <QXXMLMarshalling/base/Key.h>
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/detail/Count.h>
+#include <QXXMLMarshalling/detail/UniqueFunction.h>
 
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <span>
 #include <string_view>
 
@@ -31,6 +31,8 @@ class MethodSignature;
 class ObservationToken;
 class Value;
 class WeakAnchor;
+template <class Owner, class K>
+class KeyedValue;
 enum class ChangeKind : std::uint8_t;
 struct ValueChange;
 
@@ -78,6 +80,9 @@ public:
     virtual SetOutcome trySetValueForKey(const Value& value, Key key);
     virtual Value valueForUndefinedKey(Key key) const;
     virtual void setValueForUndefinedKey(const Value& value, Key key);
+    // The value under the key, to be read or assigned: object["city"] = "Bath". See KeyedValue.h.
+    KeyedValue<Object, Key> operator[](Key key);
+    KeyedValue<const Object, Key> operator[](Key key) const;
     // Keys separated by dots, followed from object to object. Null, or the null marker, on the way
     // reads as null and takes nothing that is set; a text or a number on the way raises
     // NSUndefinedKeyException in both directions.
@@ -103,9 +108,11 @@ public:
     // Called for each change; the default raises NSInternalInconsistencyException.
     virtual void observeValueForKeyPath(const String& keyPath, Object* object,
                                         const Dictionary& change, Selector context);
-    // Calls the callable for each change until the token ends.
-    [[nodiscard]] ObservationToken
-    observe(Key keyPath, std::function<void(const ValueChange&)> call, unsigned options = 3);
+    // Calls the callable, which need not be copyable, for each change until the token ends. Raises
+    // like addObserver, and NSInvalidArgumentException for an empty one.
+    [[nodiscard]] ObservationToken observe(Key keyPath,
+                                           detail::UniqueFunction<void(const ValueChange&)> call,
+                                           unsigned options = 3);
 
     // True when the class describes an operation of that name.
     bool respondsTo(Selector selector) const;

@@ -12,15 +12,33 @@
 //   string()       the text of a string; the null string for every other kind.
 //   view()         the same without a count of its own, as long as the value lives and keeps it.
 //   object()       the object; null for every other kind.
+//   get<T>()       what qx::ValueTraits<T> makes of it (ValueTraits.h), and nothing else: raises.
+//   tryGet<T>()    the same in a std::optional: none.
+//
+// Values have an order, so that they can be sorted: null, numbers by value, strings by bytes,
+// objects. NaN comes before the other numbers, and no object before another.
 
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/model/Object.h>
 
 #include <array>
+#include <compare>
 #include <concepts>
 #include <cstdint>
+#include <optional>
+#include <typeinfo>
+#include <utility>
 
 namespace qx {
+
+template <class T>
+struct ValueTraits;
+
+namespace detail {
+template <class T>
+std::optional<T> copiedAs(const Value& value); // ContainerTraits.h
+[[noreturn]] QX_API void raiseNotOfType(const Value& value, const std::type_info& type);
+} // namespace detail
 
 class QX_API Value {
 public:
@@ -98,6 +116,21 @@ public:
     Ref<T> as() const noexcept {
         return Ref<T>(dynamic_cast<T*>(object()));
     }
+    // The value as a T of its own, structs copied: what a property of type T would hold. None where
+    // the property would refuse it.
+    template <class T>
+    [[nodiscard]] std::optional<T> tryGet() const {
+        static_assert(sizeof(ValueTraits<T>) != 0,
+                      "include <QXXMLMarshalling/model/ValueTraits.h>");
+        return detail::copiedAs<T>(*this);
+    }
+    // The same; raises NSInvalidArgumentException where tryGet gives none.
+    template <class T>
+    T get() const {
+        if (std::optional<T> taken = tryGet<T>())
+            return *std::move(taken);
+        detail::raiseNotOfType(*this, typeid(T));
+    }
 
     // The value as text. A boolean gives "1" or "0", an integer its decimal form, a double the
     // shortest text that reads back equal (without an exponent from 1e-5 to below 1e17), an object
@@ -111,6 +144,10 @@ public:
     // The same object, the same text in memory, or equal numbers of one kind; null is null.
     bool isSameAs(const Value& other) const noexcept;
     friend bool operator==(const Value& a, const Value& b) { return a.isEqual(b); }
+    // The order described above. Values that are not equal may have the same place in it.
+    friend std::weak_ordering operator<=>(const Value& a, const Value& b) noexcept {
+        return a.compare(b);
+    }
 
     // The class name under which the value is looked up when it is marshalled: an object's own
     // answer; for strings and numbers a name in angle brackets that no mapping can hold; null for
@@ -119,6 +156,7 @@ public:
 
 private:
     void releasePayload() noexcept;
+    std::weak_ordering compare(const Value& other) const noexcept;
 
     union Payload {
         bool boolean;

@@ -308,5 +308,6 @@ struct ValueTraits<std::vector<std::byte>> {
 
 } // namespace qx
 
-// Types that are made of others.
+// Types that are made of others, and where the traits are used next.
 #include <QXXMLMarshalling/detail/ContainerTraits.h>
+#include <QXXMLMarshalling/model/KeyedValue.h>

@@ -68,12 +68,12 @@ public:
     // nothing is looked at while registration is disabled.
     void registerUndoWithTarget(Object* target, Selector selector, const Value& object);
     // The call comes with UndoRecorder::perform, which raises the same.
-    UndoRecorder prepareWithInvocationTarget(Object* target);
-    // Undone by call(target). What the callable holds is kept alive.
+    [[nodiscard]] UndoRecorder prepareWithInvocationTarget(Object* target);
+    // Undone by call(target). The callable need not be copyable; what it holds is kept alive.
     template <std::derived_from<Object> T, std::invocable<T&> F>
     void registerUndo(T& target, F call) {
         registerCall(target, [call = std::move(call)](Object& object) mutable {
-            call(static_cast<T&>(object));
+            std::invoke(call, static_cast<T&>(object));
         });
     }
 
@@ -118,7 +118,7 @@ private:
     friend class UndoRecorder;
     struct State;
 
-    void registerCall(Object& target, std::function<void(Object&)> call);
+    void registerCall(Object& target, detail::UniqueFunction<void(Object&)> call);
     void registerOperation(Object* target, Selector selector, std::vector<Value> arguments);
     std::uint64_t beginGroup(const String& actionName);
     // To be called before a change, so that it can be registered afterwards though memory fails.
