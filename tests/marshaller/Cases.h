@@ -7,9 +7,8 @@
 //     text given       an object, shown as the next, that is written; nothing is read then
 //     text object      what reading gives
 //     xml written      what is written
-//     text error       "CODE: message (reason)" of the mapping, of reading or of writing; a page
-//     may
-//                      leave the reasons out
+//     text error       "CODE: message (reason)" of the mapping, of reading or of writing; the
+//                      reason may be left out
 //
 // Options are "strict", "discard" and "no-namespaces". Each case runs on records, on host classes
 // and on plain structs; where they differ, a block says for which it is: "records", "hosts",
@@ -124,6 +123,10 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
+    static const support::Words known = {"strict",  "discard", "no-namespaces",
+                                         "records", "hosts",   "structs"};
+    for (const std::string& option : expectation.options)
+        EXPECT_TRUE(known.contains(option)) << option << " is no option";
     const auto isFor = [&](const char* name) { return expectation.options.contains(name); };
     if (std::ranges::any_of(kinds::names, isFor) && !isFor(kinds::names[kind]))
         return;
