@@ -99,8 +99,10 @@ if(TARGET QXXMLMarshalling)
         set_tests_properties(program_${name} PROPERTIES LABELS programs TIMEOUT 300)
         add_dependencies(tests program_${name})
     endforeach()
-    # It takes the parser's memory away.
-    target_link_libraries(program_without_memory PRIVATE LibXml2::LibXml2)
+    # They take the parser's memory away, and count it.
+    foreach(name without_memory bounded_memory)
+        target_link_libraries(program_${name} PRIVATE LibXml2::LibXml2)
+    endforeach()
 
     if(QX_BUILD_EXAMPLES)
         file(GLOB demos CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/examples/*/demo")

@@ -11,6 +11,11 @@
 //     }
 //     if (error) std::cerr << error->localizedDescription().view();
 //
+// Where a class is described in C++ (Class.h), a call may ask for it and answers a qx::Result:
+//
+//     auto order = marshaller->readFile<Order>("order.xml");
+//     if (!order) return report(*order.error());
+//
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
 // setters of host classes throw passes through every operation here. They may use the marshaller,
@@ -194,7 +199,9 @@ public:
     bool mapArray(const qx::Array& array, qx::XMLElement& element, const QXXMLFieldMapping& field,
                   qx::Ref<qx::Error>* error = nullptr);
 
-    // The steps of unmarshalling.
+    // The steps of unmarshalling. Each goes over the element's children anew, so that binding field
+    // by field costs more than binding them all. One that is told that the object is flattened
+    // takes the children that it binds out of the element.
     //
     // The object for the node's element name. Null for a node that no class maps to, with an error
     // only from a marshaller that is not lenient:

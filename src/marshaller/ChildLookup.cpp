@@ -18,7 +18,7 @@ ChildLookup::ChildLookup(IndexedXML& document, Number element, Nodes nodes, std:
 
 ChildLookup::ChildLookup(const ChildLookup& other, Nodes nodes)
     : _document(other._document), _element(other._element), _nodes(nodes), _isCopy(true),
-      _lookups(other._lookups) {
+      _isWhole(other._isWhole), _lookups(other._lookups) {
     for (const Child& child : other.children())
         if (child.number != none)
             add(child.name, child.number);
@@ -102,7 +102,7 @@ std::vector<ChildLookup::Number> ChildLookup::all() const {
 }
 
 String ChildLookup::stringValue() const {
-    if (!_isCopy)
+    if (_isWhole)
         return _document.text(_element);
     std::string text;
     forEachChild([&](Number child) {
@@ -115,6 +115,7 @@ String ChildLookup::stringValue() const {
 }
 
 void ChildLookup::take(Number child) {
+    _isWhole = false;
     if (!_isCopy)
         _document.detach(child);
     if (_isIndexed) {
@@ -133,10 +134,10 @@ void ChildLookup::take(Number child) {
 
 Ref<XMLNode> ChildLookup::keepElement(Number child, ReadingBudget& budget,
                                       ReadingBudget::ErrorSlot error) const {
-    std::size_t nodes = 1;
-    if (_nodes == Nodes::copied && !_document.isMade(_nodes, child))
-        nodes += _document.extent(child).nodes;
-    return budget.takeKept(nodes, _element, error) ? _document.element(_nodes, child) : nullptr;
+    const bool isNew = _nodes == Nodes::copied && !_document.isMade(_nodes, child);
+    const bool fits = budget.takeKept(1, _element, error) &&
+                      (!isNew || budget.takeKept(_document.extent(child).nodes, child, error));
+    return fits ? _document.element(_nodes, child) : nullptr;
 }
 
 // Of an element's attributes the objects flattened into it keep the same copies: these count once,

@@ -110,6 +110,7 @@ private:
     const Number _element;
     const Nodes _nodes;
     const bool _isCopy = false;
+    bool _isWhole = true; // no child was taken
     bool _isIndexed = false;
     std::size_t _lookups;
     // The children: most elements have few, which take no memory of their own.

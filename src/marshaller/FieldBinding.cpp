@@ -18,6 +18,10 @@ const FieldBinding& bindingOf(const FieldPlan& field) {
 
 } // namespace
 
+const FieldBinding& bindingAsElement(const FieldPlan& field) noexcept {
+    return field.isContainer ? elementBinding : flattenedBinding;
+}
+
 // A kind that found nothing and complains of nothing does not fail the object.
 bool Unmarshalling::readField(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (field.isCollection())
@@ -37,7 +41,7 @@ bool Marshalling::writeField(const FieldPlan& field, XMLElement& element, Object
     if (value.isNull() && field.isContainer) {
         if (!field.isRequired)
             return true;
-        if (field.valueType == ValueType::other)
+        if (field.valueType == ValueType::other || field.valueType == ValueType::string)
             return fail(error, errors::requiredValueMissing, field.key.string(), &object);
         value = false;
     }

@@ -28,6 +28,9 @@ extern const FieldBinding elementBinding;   // element.cpp
 extern const FieldBinding flattenedBinding; // flattened.cpp
 extern const FieldBinding automaticBinding; // automatic.cpp
 
+// That of a field taken as an element's: flattened where it has no container.
+const FieldBinding& bindingAsElement(const FieldPlan& field) noexcept;
+
 // collection.cpp. The values of a collection are an array; a field without "collection" may hold an
 // array, too, and is written like one.
 bool readCollection(Unmarshalling& reading, const FieldPlan& field,

@@ -13,20 +13,40 @@ Value booleanOf(const String& text) {
     return text.equalsIgnoringCase("true") || text.equalsIgnoringCase("yes") || text == "1";
 }
 
+// Null with -221 where there is no integer.
+Value integerOf(const FieldPlan& field, const String& text, Ref<Error>* error) {
+    if (const auto integer = scanInteger(text))
+        return *integer;
+    logWarningOrLine(errors::notAnInteger.message, field.xmlName(), text);
+    fail(error, errors::notAnInteger, field.xmlName(), text);
+    return nullptr;
+}
+
 } // namespace
 
 bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error) {
-    if (!value.isString() || !field.hasSimpleType())
+    const bool isConverted =
+        field.valueType == ValueType::boolean || field.valueType == ValueType::integer;
+    if (!value.isString() || !isConverted)
         return ObjectAccess::set(object, key, std::move(value), error);
     const String text = value.string();
     if (field.valueType == ValueType::boolean)
         return ObjectAccess::set(object, key, booleanOf(text), error);
     if (text.isEmpty())
         return ObjectAccess::set(object, key, nullptr, error);
-    if (const auto integer = scanInteger(text))
-        return ObjectAccess::set(object, key, *integer, error);
-    logWarningOrLine(errors::notAnInteger.message, field.xmlName(), text);
-    return fail(error, errors::notAnInteger, field.xmlName(), text);
+    Value integer = integerOf(field, text, error);
+    return !integer.isNull() && ObjectAccess::set(object, key, std::move(integer), error);
+}
+
+Value itemOf(const FieldPlan& field, const String& text, Ref<Error>* error) {
+    switch (field.valueType) {
+    case ValueType::boolean:
+        return booleanOf(text);
+    case ValueType::integer:
+        return integerOf(field, text, error);
+    default:
+        return text;
+    }
 }
 
 } // namespace qx::detail

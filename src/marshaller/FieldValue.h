@@ -15,6 +15,9 @@ namespace qx::detail {
 //   -222  "Unable to set value: %@ for key: %@ in class: %@"
 bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error);
 
+// The text as an item of a collection of a simple type; null with -221 as above.
+Value itemOf(const FieldPlan& field, const String& text, Ref<Error>* error);
+
 inline String textOf(const Value& value, ValueType type) {
     if (type == ValueType::boolean)
         return value.boolValue() ? "true" : "false";

@@ -46,7 +46,10 @@ ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
     const Property* property = type.property(key);
     if (property == nullptr)
         return {object.valueForKey(key), false};
-    return {property->lend != nullptr ? property->lend(*property, object) : object.valueForKey(key),
+    if (property->lend != nullptr)
+        return {property->lend(*property, object), property->keepsZero};
+    // A class of a host's may answer for a property in its own way.
+    return {type.isStruct() ? property->get(*property, object) : object.valueForKey(key),
             property->keepsZero};
 }
 

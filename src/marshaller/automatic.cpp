@@ -8,9 +8,8 @@ namespace {
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
-    const FieldBinding& otherwise = field.isContainer ? elementBinding : flattenedBinding;
     return attributeBinding.read(reading, field, target, error) ||
-           otherwise.read(reading, field, target, error);
+           bindingAsElement(field).read(reading, field, target, error);
 }
 
 // An object of a class that the mapping has is an element under that class's name. Without a

@@ -53,6 +53,11 @@ bool findItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
     return reading.budget().takeVisits(source.childCount(), source.element(), error);
 }
 
+// Texts without a bind name have the field's.
+const String& nameOfItems(const FieldPlan& field, const BindingPlan& binding) {
+    return field.typeClass != nullptr ? binding.bindTo : binding.name;
+}
+
 // Items are the elements of a bind name, whatever class their own name maps to, in the element or
 // in the one wrapper that a location names. A wrapper counts instead of its items, and once found
 // it is searched by the later bindings too.
@@ -74,15 +79,16 @@ bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Targe
                 target.bound.fields.add(binding.location);
             }
         }
-        if (!binding.bindTo.isEmpty())
-            items.nodes = (wrapper ? *wrapper : target.source).all(binding.bindTo);
+        const String& name = nameOfItems(field, binding);
+        if (!name.isEmpty())
+            items.nodes = (wrapper ? *wrapper : target.source).all(name);
         if (!items.nodes.empty() || wrapper)
             break;
     }
     return true;
 }
 
-// Calls make(Number) for each item, and sets the list of those that were made.
+// Calls make(Number) for each item, and sets the list of the values that were made.
 template <class Make>
 bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& target,
                const Items& items, Ref<Error>* error, Make make) {
@@ -93,18 +99,27 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
     auto array = qx::make<Array>();
     array->reserve(std::min(items.nodes.size(), usualSize));
     for (const auto node : items.nodes) {
-        const auto item = make(node);
+        const Value item = make(node);
         if ((error != nullptr && *error) || reading.budget().isSpent())
             return false;
-        if (!item)
+        if (item.isNull())
             continue;
         if (!items.areCounted)
             target.bound.fields.add(reading.document().name(node));
-        if (!reading.adopt(*item, target.object, error))
+        if (Object* const object = item.object();
+            object != nullptr && !reading.adopt(*object, target.object, error))
             return false;
         array->add(item);
     }
     return ObjectAccess::set(target.object, field.key, array, error);
+}
+
+// The text of an item.
+Value readText(Unmarshalling& reading, const FieldPlan& field, Unmarshalling::Number node,
+               Ref<Error>* error) {
+    if (!reading.budget().takeVisits(1, node, error) || !reading.budget().takeText(node, error))
+        return nullptr;
+    return itemOf(field, reading.document().text(node), error);
 }
 
 } // namespace
@@ -119,19 +134,21 @@ bool readCollection(Unmarshalling& reading, const FieldPlan& field, const Target
     if (!findItems(reading, field, target, items, error))
         return false;
     return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
-        return reading.unmarshallNode(node, target.source.nodes(), error);
+        return Value(reading.unmarshallNode(node, target.source.nodes(), error));
     });
 }
 
 bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const Target& target,
                           Ref<Error>* error) {
-    if (field.typeClass == nullptr)
+    if (!field.hasItemType())
         return fail(error, errors::noMappingForClass, field.mapping->type());
     Items items;
     if (!findItemsByType(reading, field, target, items, error))
         return false;
     return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
-        return reading.build(*field.typeClass, node, target.source.nodes(), error);
+        return field.typeClass != nullptr
+                   ? Value(reading.build(*field.typeClass, node, target.source.nodes(), error))
+                   : readText(reading, field, node, error);
     });
 }
 
@@ -149,7 +166,7 @@ XMLElement& appendNew(XMLElement& parent, const String& name) {
 XMLElement& elementForItems(const FieldPlan& field, XMLElement& element) {
     if (!field.location().isEmpty())
         return appendNew(element, field.location());
-    if (field.typeClass == nullptr && !field.bindTo().isEmpty() &&
+    if (!field.hasType() && !field.bindTo().isEmpty() &&
         field.bindings.front().classOfBindTo == nullptr)
         return appendNew(element, field.bindTo());
     return element;
@@ -161,13 +178,19 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, XMLElement& e
                      const Array& array, Ref<Error>* error) {
     if (array.isEmpty() && !field.isRequired)
         return true;
-    if (field.hasType() && field.typeClass == nullptr)
+    if (field.hasType() && !field.hasItemType())
         return fail(error, errors::noMappingForDeclaredClass, field.mapping->type());
     XMLElement& target = elementForItems(field, element);
     // An item's own accessors may change the array it stands in.
     for (std::size_t i = 0; i < array.count(); ++i) {
         // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
         const Value item = array.at(i);
+        if (field.typeClass == nullptr && field.hasSimpleType()) {
+            if (!item.isNullOrMarker())
+                target.addChild(
+                    XMLElement::initWithName(field.xmlName(), textOf(item, field.valueType)));
+            continue;
+        }
         Ref<Error> problem;
         auto child = field.typeClass != nullptr
                          ? writing.element(*field.typeClass, field.bindTo(), item, &problem)

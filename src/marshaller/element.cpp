@@ -31,7 +31,8 @@ bool findElement(Unmarshalling& reading, const FieldPlan& field,
 // An object where a class is known for the field or for the child's name, else the child's text.
 Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
               Unmarshalling::Number child, const ClassPlan* classOfElement, Ref<Error>* error) {
-    const ClassPlan* plan = field.typeClass != nullptr ? field.typeClass : classOfElement;
+    const bool isText = field.valueType == ValueType::string;
+    const ClassPlan* plan = field.typeClass != nullptr || isText ? field.typeClass : classOfElement;
     if (plan != nullptr)
         return reading.build(*plan, child, target.source.nodes(), error);
     return reading.budget().takeText(child, error) ? Value(reading.document().text(child))
@@ -99,7 +100,8 @@ bool setElementValue(Unmarshalling& reading, const FieldPlan& field,
 bool findClassToWrite(const Marshalling& writing, const FieldPlan& field, const Value& value,
                       const ClassPlan*& plan, Ref<Error>* error) {
     const bool isDeclared = field.valueType == ValueType::other;
-    plan = isDeclared ? field.typeClass : writing.classOf(value);
+    const bool isText = field.valueType == ValueType::string;
+    plan = isDeclared || isText ? field.typeClass : writing.classOf(value);
     return !isDeclared || plan != nullptr ||
            fail(error, errors::noMappingForClass, field.mapping->type());
 }

@@ -15,35 +15,26 @@ using namespace qx::detail;
 
 namespace {
 
-class PlanOfClass {
+template <class Plan>
+class PlanOf {
 public:
-    PlanOfClass(const QXXMLMarshaller& marshaller, const QXXMLClassMapping& mapping)
-        : PlanOfClass(MappingPlan::of(marshaller.mapping()), mapping) {}
-    const ClassPlan& operator*() const noexcept { return _plan; }
+    template <class Mapping>
+    PlanOf(const QXXMLMarshaller& marshaller, const Mapping& mapping) {
+        const MappingPlan& all = MappingPlan::of(marshaller.mapping());
+        _plan = all.planOf(mapping);
+        if (_plan != nullptr)
+            return;
+        _own = all.newPlan(mapping);
+        _plan = _own.get();
+    }
+    const Plan& operator*() const noexcept { return *_plan; }
 
 private:
-    PlanOfClass(const MappingPlan& plan, const QXXMLClassMapping& mapping)
-        : _own(plan.classOf(mapping) == nullptr ? plan.planFor(mapping) : nullptr),
-          _plan(_own ? *_own : *plan.classOf(mapping)) {}
-
-    std::unique_ptr<ClassPlan> _own;
-    const ClassPlan& _plan;
+    std::unique_ptr<Plan> _own;
+    const Plan* _plan;
 };
-
-class PlanOfField {
-public:
-    PlanOfField(const QXXMLMarshaller& marshaller, const QXXMLFieldMapping& mapping)
-        : PlanOfField(MappingPlan::of(marshaller.mapping()), mapping) {}
-    const FieldPlan& operator*() const noexcept { return _plan; }
-
-private:
-    PlanOfField(const MappingPlan& plan, const QXXMLFieldMapping& mapping)
-        : _own(plan.fieldOf(mapping) == nullptr ? plan.planFor(mapping) : FieldPlan()),
-          _plan(plan.fieldOf(mapping) == nullptr ? _own : *plan.fieldOf(mapping)) {}
-
-    FieldPlan _own;
-    const FieldPlan& _plan;
-};
+using PlanOfClass = PlanOf<ClassPlan>;
+using PlanOfField = PlanOf<FieldPlan>;
 
 // What a step of its own binds from, and what it counts as consumed on top of the caller's sets.
 class Step {
@@ -179,67 +170,80 @@ bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Ob
         });
 }
 
+namespace {
+
+// What the steps of a field are given.
+struct FieldStep {
+    QXXMLMarshaller& marshaller;
+    const QXXMLFieldMapping& field;
+    Object& object;
+    XMLElement& element;
+    CountedSet& boundFields;
+    CountedSet& boundAttributes;
+    bool isFlattened;
+    Ref<Error>* error;
+
+    // Calls read(Unmarshalling&, const FieldPlan&, const Unmarshalling::Target&, Ref<Error>*).
+    template <class Read>
+    bool run(Read read) const {
+        const PlanOfField plan(marshaller, field);
+        return Step(marshaller, element, (*plan).bindings.size(), boundFields, boundAttributes)
+            .run(object, isFlattened, [&](Unmarshalling& reading, const auto& target) {
+                return read(reading, *plan, target, error);
+            });
+    }
+};
+
+} // namespace
+
 bool QXXMLMarshaller::bindField(const QXXMLFieldMapping& field, Object& object, std::size_t,
                                 XMLElement& element, CountedSet& boundFields,
                                 CountedSet& boundAttributes, bool isFlattened, Ref<Error>* error) {
-    const PlanOfField plan(*this, field);
-    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
-        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
-            return step.readField(*plan, target, error);
-        });
+    return FieldStep{*this,       field,           object,      element,
+                     boundFields, boundAttributes, isFlattened, error}
+        .run([](Unmarshalling& reading, const FieldPlan& plan, const auto& target,
+                Ref<Error>* slot) { return reading.readField(plan, target, slot); });
 }
 
 bool QXXMLMarshaller::bindFieldAsAttribute(const QXXMLFieldMapping& field, Object& object,
                                            std::size_t, XMLElement& element,
                                            CountedSet& boundFields, CountedSet& boundAttributes,
                                            Ref<Error>* error) {
-    const PlanOfField plan(*this, field);
-    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
-        .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return attributeBinding.read(step, *plan, target, error);
-        });
+    return FieldStep{*this, field, object, element, boundFields, boundAttributes, false, error}.run(
+        attributeBinding.read);
 }
 
 bool QXXMLMarshaller::bindFieldAsText(const QXXMLFieldMapping& field, Object& object, std::size_t,
                                       XMLElement& element, CountedSet& boundFields,
                                       CountedSet& boundAttributes, Ref<Error>* error) {
-    const PlanOfField plan(*this, field);
-    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
-        .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return textBinding.read(step, *plan, target, error);
-        });
+    return FieldStep{*this, field, object, element, boundFields, boundAttributes, false, error}.run(
+        textBinding.read);
 }
 
 bool QXXMLMarshaller::bindFieldAsElement(const QXXMLFieldMapping& field, Object& object,
                                          std::size_t, XMLElement& element, CountedSet& boundFields,
                                          CountedSet& boundAttributes, bool isFlattened,
                                          Ref<Error>* error) {
-    const PlanOfField plan(*this, field);
-    const FieldBinding& binding = (*plan).isContainer ? elementBinding : flattenedBinding;
-    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
-        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
-            return binding.read(step, *plan, target, error);
+    return FieldStep{*this,       field,           object,      element,
+                     boundFields, boundAttributes, isFlattened, error}
+        .run([](Unmarshalling& reading, const FieldPlan& plan, const auto& target,
+                Ref<Error>* slot) {
+            return bindingAsElement(plan).read(reading, plan, target, slot);
         });
 }
 
 bool QXXMLMarshaller::bindCollectionField(const QXXMLFieldMapping& field, Object& object,
                                           XMLElement& element, CountedSet& boundFields,
                                           CountedSet& boundAttributes, Ref<Error>* error) {
-    const PlanOfField plan(*this, field);
-    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
-        .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return readCollection(step, *plan, target, error);
-        });
+    return FieldStep{*this, field, object, element, boundFields, boundAttributes, false, error}.run(
+        readCollection);
 }
 
 bool QXXMLMarshaller::bindArrayFieldByType(const QXXMLFieldMapping& field, Object& object,
                                            XMLElement& element, CountedSet& boundFields,
                                            CountedSet& boundAttributes, Ref<Error>* error) {
-    const PlanOfField plan(*this, field);
-    return Step(*this, element, (*plan).bindings.size(), boundFields, boundAttributes)
-        .run(object, false, [&](Unmarshalling& step, const auto& target) {
-            return readCollectionByType(step, *plan, target, error);
-        });
+    return FieldStep{*this, field, object, element, boundFields, boundAttributes, false, error}.run(
+        readCollectionByType);
 }
 
 bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,

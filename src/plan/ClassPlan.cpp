@@ -14,7 +14,7 @@ bool mayBeAttribute(const FieldPlan& field) {
 // Adds the names of the child elements that the field may bind. False where that could be any, or
 // one of those that are there already.
 bool addChildren(const FieldPlan& field, std::vector<String>& names) {
-    if (!field.isContainer || (field.isCollection() && field.typeClass == nullptr))
+    if (!field.isContainer || (field.isCollection() && !field.hasItemType()))
         return false;
     if (!field.isCollection() && field.kind == BindingKind::attribute)
         return true;

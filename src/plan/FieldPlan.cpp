@@ -11,6 +11,8 @@ ValueType valueTypeOf(const String& type) {
         return ValueType::none;
     if (type.equalsIgnoringCase("boolean"))
         return ValueType::boolean;
+    if (type.equalsIgnoringCase("string"))
+        return ValueType::string;
     const bool integer = type.equalsIgnoringCase("integer") || type.equalsIgnoringCase("int");
     return integer ? ValueType::integer : ValueType::other;
 }

@@ -25,8 +25,8 @@ enum class BindingKind : std::uint8_t {
 // How a field's "collection" is gathered.
 enum class CollectionKind : std::uint8_t { none, array, unknown };
 
-// What a field's "type" makes of text.
-enum class ValueType : std::uint8_t { none, boolean, integer, other };
+// What a field's "type" makes of text: `other` is the name of a class.
+enum class ValueType : std::uint8_t { none, boolean, integer, string, other };
 
 // One place where a field's value may stand. The names are interned.
 struct BindingPlan {
@@ -63,10 +63,11 @@ struct FieldPlan {
     }
 
     bool isCollection() const { return collection != CollectionKind::none; }
+    // Whether it is known what each item of the collection is: an object of a class, or a text.
+    bool hasItemType() const { return typeClass != nullptr || hasSimpleType(); }
     bool hasType() const { return valueType != ValueType::none; }
-    bool hasSimpleType() const {
-        return valueType == ValueType::boolean || valueType == ValueType::integer;
-    }
+    // Values are texts, as they are or converted.
+    bool hasSimpleType() const { return hasType() && valueType != ValueType::other; }
 
 private:
     static const BindingPlan noBinding;

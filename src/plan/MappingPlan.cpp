@@ -79,6 +79,8 @@ FieldPlan MappingPlan::planFor(const QXXMLFieldMapping& mapping) const {
     FieldPlan plan = FieldPlan::withoutClasses(mapping);
     if (!mapping.type().isEmpty())
         plan.typeClass = classNamed(mapping.type());
+    if (plan.valueType == ValueType::string && plan.typeClass != nullptr)
+        plan.valueType = ValueType::other;
     for (BindingPlan& binding : plan.bindings) {
         binding.classOfBindTo = classForElement(binding.bindTo);
         binding.classOfName = classForElement(binding.name);
@@ -86,7 +88,11 @@ FieldPlan MappingPlan::planFor(const QXXMLFieldMapping& mapping) const {
     return plan;
 }
 
-std::unique_ptr<ClassPlan> MappingPlan::planFor(const QXXMLClassMapping& mapping) const {
+std::unique_ptr<FieldPlan> MappingPlan::newPlan(const QXXMLFieldMapping& mapping) const {
+    return std::make_unique<FieldPlan>(planFor(mapping));
+}
+
+std::unique_ptr<ClassPlan> MappingPlan::newPlan(const QXXMLClassMapping& mapping) const {
     auto plan = std::make_unique<ClassPlan>();
     plan->mapping = &mapping;
     plan->index = _classes.size();
@@ -95,12 +101,12 @@ std::unique_ptr<ClassPlan> MappingPlan::planFor(const QXXMLClassMapping& mapping
     return plan;
 }
 
-const ClassPlan* MappingPlan::classOf(const QXXMLClassMapping& mapping) const {
+const ClassPlan* MappingPlan::planOf(const QXXMLClassMapping& mapping) const {
     const ClassPlan* plan = classNamed(mapping.className());
     return plan != nullptr && plan->mapping == &mapping ? plan : nullptr;
 }
 
-const FieldPlan* MappingPlan::fieldOf(const QXXMLFieldMapping& mapping) const {
+const FieldPlan* MappingPlan::planOf(const QXXMLFieldMapping& mapping) const {
     const auto found = _fields.find(&mapping);
     return found != _fields.end() ? found->second : nullptr;
 }

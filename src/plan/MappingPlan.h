@@ -38,14 +38,14 @@ public:
         return find(_byElementName, elementName);
     }
     // The plan of a class or a field that stands in the mapping; null for any other, a copy too.
-    const ClassPlan* classOf(const QXXMLClassMapping& mapping) const;
-    const FieldPlan* fieldOf(const QXXMLFieldMapping& mapping) const;
+    const ClassPlan* planOf(const QXXMLClassMapping& mapping) const;
+    const FieldPlan* planOf(const QXXMLFieldMapping& mapping) const;
 
     std::size_t classCount() const noexcept { return _classes.size(); }
 
     // The plan of a class or a field that stands in no mapping, as one of this mapping.
-    std::unique_ptr<ClassPlan> planFor(const QXXMLClassMapping& mapping) const;
-    FieldPlan planFor(const QXXMLFieldMapping& mapping) const;
+    std::unique_ptr<ClassPlan> newPlan(const QXXMLClassMapping& mapping) const;
+    std::unique_ptr<FieldPlan> newPlan(const QXXMLFieldMapping& mapping) const;
 
     // The name under which documents give an element of the class: "map-to", or the class name in
     // lower case.
@@ -57,6 +57,7 @@ private:
         return found != plans.end() ? found->second : nullptr;
     }
     void fill(ClassPlan& plan) const;
+    FieldPlan planFor(const QXXMLFieldMapping& mapping) const;
     void markCycles();
 
     std::vector<std::unique_ptr<ClassPlan>> _classes;

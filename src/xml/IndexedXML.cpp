@@ -1,11 +1,8 @@
 #include "xml/IndexedXML.h"
 
-#include <QXXMLMarshalling/base/Key.h>
-
+#include "base/KnownName.h"
 #include "base/TextBlocks.h"
 #include "xml/XMLNodeMaker.h"
-
-#include <algorithm>
 
 namespace qx {
 
@@ -37,15 +34,8 @@ private:
 
 namespace {
 
-// The attribute or declaration of that name; null where it is there no more.
-Ref<XMLNode> attributeOf(XMLElement& element, XMLNodeKind kind, const String& name) {
-    if (kind == XMLNodeKind::attribute)
-        return Ref<XMLNode>(element.attributeForName(name));
-    for (XMLNode& declaration : element.namespaces())
-        if (declaration.name() == name)
-            return Ref<XMLNode>(&declaration);
-    return nullptr;
-}
+// Texts up to this are as fast made again as looked up.
+constexpr std::size_t longestUnshared = 256;
 
 } // namespace
 
@@ -54,7 +44,8 @@ Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number numbe
         return known;
     const XMLIndexEntry& entry = _index[number];
     const auto element = find(holder);
-    auto node = element ? attributeOf(*element->asElement(), entry.nodeKind(), _index.name(entry))
+    auto node = element ? XMLNodeMaker::attributeOf(*element->asElement(), entry.nodeKind(),
+                                                    _index.name(entry))
                         : nullptr;
     if (!node)
         node = _maker.node(number);
@@ -101,17 +92,23 @@ void IndexedXML::findRoot() noexcept {
 void IndexedXML::internNames() {
     const auto names = _index->names();
     for (std::size_t i = 0; i < names.size(); ++i) {
-        const Key known = names[i].isInterned() ? Key() : Key::existing(names[i]);
-        if (known.isNull())
+        String known = knownName(names[i]);
+        if (known.isSameAs(names[i]))
             continue;
         if (_interned.empty())
             _interned.assign(names.begin(), names.end());
-        _interned[i] = known.string();
+        _interned[i] = std::move(known);
     }
 }
 
 String IndexedXML::value(Number number) {
-    return textInBlock(index().value(index()[number], _room));
+    const XMLIndexEntry& entry = index()[number];
+    if (entry.end - entry.begin <= longestUnshared)
+        return textInBlock(index().value(entry, _room));
+    String& value = _longTexts[number];
+    if (value.isNull())
+        value = index().value(entry, _room);
+    return value;
 }
 
 bool IndexedXML::hasPlainText(Number element) {
@@ -131,9 +128,13 @@ String IndexedXML::text(Number element) {
     if (only.next == end && only.nodeKind() == XMLNodeKind::text &&
         !XMLIndex::isLayout(only, index()[element]))
         return value(first);
-    std::string text;
-    appendText(element, text);
-    return text;
+    if (const auto known = _longTexts.find(element); known != _longTexts.end())
+        return known->second;
+    std::string joined;
+    appendText(element, joined);
+    if (joined.size() <= longestUnshared)
+        return textInBlock(joined);
+    return _longTexts.try_emplace(element, joined).first->second;
 }
 
 void IndexedXML::appendText(Number element, std::string& text) {
@@ -233,7 +234,8 @@ Ref<XMLNode> IndexedXML::attribute(Nodes nodes, Number holder, Number number) {
         return pool(nodes).attribute(holder, number);
     const XMLIndexEntry& entry = index()[number];
     const auto element = this->element(Nodes::own, holder);
-    auto node = attributeOf(*element->asElement(), entry.nodeKind(), index().name(entry));
+    auto node =
+        XMLNodeMaker::attributeOf(*element->asElement(), entry.nodeKind(), index().name(entry));
     return node ? node : XMLNodeMaker(index()).node(number);
 }
 

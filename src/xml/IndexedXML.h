@@ -65,9 +65,9 @@ public:
             if (index()[at].nodeKind() == kind)
                 visit(at);
     }
-    // Of a text, attribute or declaration.
+    // Of a text, attribute or declaration. Whoever asks for a long one gets the same.
     String value(Number number);
-    // All text inside an element, concatenated.
+    // All text inside an element, concatenated. Likewise.
     String text(Number element);
     // The attribute of that name, which is interned; none where there is none.
     Number attribute(Number element, const String& name);
@@ -91,7 +91,7 @@ public:
     Ref<XMLNode> attribute(Nodes nodes, Number holder, Number number);
     // Any child, to be quoted.
     Ref<XMLNode> quoted(Number number);
-    // Whether the host has the nodes of what is read, or can ask for them.
+    // Whether that node was made for its own sake already.
     bool isMade(Nodes nodes, Number number) const;
     // Takes the element out of the host's tree; nothing where the host has none.
     void detach(Number element);
@@ -119,6 +119,7 @@ private:
     Number _root = none;
     std::vector<String> _interned; // the names, where the index has not all that are known by now
     std::string _room;
+    std::unordered_map<Number, String> _longTexts; // of attributes, texts and elements
     // Of elements with many attributes, by name.
     std::unordered_map<Number, std::unordered_map<const void*, Number>> _attributes;
     std::unique_ptr<NodePool> _own;

@@ -6,8 +6,6 @@
 #include "xml/XMLIndex.h"
 #include "xml/XMLInput.h"
 
-#include <memory>
-
 namespace qx {
 
 class ParsedDocument {

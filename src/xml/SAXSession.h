@@ -56,7 +56,6 @@ private:
     void startElement(XMLNames::Name local, XMLNames::Name prefix, int namespaceCount,
                       const xmlChar** namespaces, int attributeCount, int defaultedCount,
                       const xmlChar** attributes);
-    void endElement();
     void addText(std::string_view piece);
     void addCDATA(std::string_view piece);
     void declareEntity(const xmlChar* name, int type, const xmlChar* publicID,

@@ -1,10 +1,7 @@
 #include "xml/ScannedNames.h"
 
-#include <QXXMLMarshalling/base/Key.h>
-
+#include "base/KnownName.h"
 #include "xml/XMLCharacters.h"
-
-#include <algorithm>
 
 namespace qx {
 
@@ -30,8 +27,7 @@ ScannedNames::Number ScannedNames::add(std::string_view text, std::uint64_t star
         takeApart(name, text);
     if ((_names.size() + 1) * 2 > _slots.size())
         grow();
-    const Key known = Key::existing(text);
-    _texts.push_back(known.isNull() ? String(text) : known.string());
+    _texts.push_back(knownName(text));
     const auto number = static_cast<Number>(_names.size());
     _names.push_back(name);
     fill(number);

@@ -1,6 +1,7 @@
 #include "xml/TextPosition.h"
 
 #include <algorithm>
+#include <cstdint>
 #include <cstring>
 
 namespace qx {

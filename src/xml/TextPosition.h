@@ -5,7 +5,6 @@
 // long the lines are.
 
 #include <cstddef>
-#include <cstdint>
 #include <string_view>
 #include <vector>
 

@@ -7,6 +7,8 @@
 
 #include "xml/ParsedDocument.h"
 
+#include <memory>
+
 namespace qx {
 
 struct XMLDocumentContent {

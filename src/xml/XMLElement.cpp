@@ -357,7 +357,8 @@ Ref<XMLNode> XMLElement::copy() const {
             node = node->_next;
         }
         const XMLElement* element = node->asElement();
-        Ref<XMLNode> copied = element != nullptr ? Ref<XMLNode>(element->copyAlone()) : node->copy();
+        Ref<XMLNode> copied =
+            element != nullptr ? Ref<XMLNode>(element->copyAlone()) : node->copy();
         XMLNode* child = copied.get();
         // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): likewise
         XMLSiblings::append(*target, target->_firstChild, copied.detach());

@@ -2,6 +2,7 @@
 
 #include "xml/XMLCharacters.h"
 
+#include <algorithm>
 #include <cstdlib>
 
 namespace qx {

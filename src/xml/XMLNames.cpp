@@ -1,5 +1,6 @@
 #include "xml/XMLNames.h"
 
+#include "base/KnownName.h"
 #include "xml/CParserText.h"
 #include "xml/ParseFailure.h"
 
@@ -12,11 +13,8 @@ XMLNames::Number XMLNames::add(Name local, Name prefix) {
         throw std::bad_alloc();
     if (_count >= maximumNames)
         throw ParseFailure(parseErrors::tooManyNames, {maximumNames});
-    String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})
-                                    : String(viewOf(local));
-    const Key known = Key::existing(name);
-    if (!known.isNull())
-        name = known.string();
+    const String name = prefix != nullptr ? String::concat({viewOf(prefix), ":", viewOf(local)})
+                                          : String(viewOf(local));
     if (_count * 2 >= _entries.size()) {
         std::vector<Entry> old(_entries.size() * 2);
         old.swap(_entries);
@@ -25,7 +23,7 @@ XMLNames::Number XMLNames::add(Name local, Name prefix) {
                 freeEntry(entry.local, entry.prefix).number = entry.number;
     }
     const auto number = static_cast<Number>(_names.size());
-    _names.push_back(std::move(name));
+    _names.push_back(knownName(name));
     freeEntry(local, prefix).number = number;
     ++_count;
     return number;

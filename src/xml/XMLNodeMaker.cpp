@@ -4,6 +4,7 @@
 #include "xml/XMLSiblings.h"
 
 #include <algorithm>
+#include <vector>
 
 namespace qx {
 
@@ -20,12 +21,21 @@ XMLNode* XMLNodeMaker::newNode(const XMLIndexEntry& entry) {
     const bool isNamed = kind != XMLNodeKind::text && kind != XMLNodeKind::comment;
     String name = isNamed ? _index.name(entry) : String();
     String value = textInBlock(_index.value(entry, _room));
-    return ::new (_blocks.allocate(sizeof(XMLNode)))
-        XMLNode(kind, std::move(name), std::move(value));
+    auto* const made =
+        ::new (_blocks.allocate(sizeof(XMLNode))) XMLNode(kind, std::move(name), std::move(value));
+    made->_isLayout = entry.has(XMLIndexEntry::isBlank);
+    return made;
 }
 
 Ref<XMLNode> XMLNodeMaker::node(Number number) {
     return Ref<XMLNode>::adopt(newNode(_index[number]));
+}
+
+Ref<XMLNode> XMLNodeMaker::attributeOf(const XMLElement& element, XMLNodeKind kind,
+                                       const String& name) {
+    return Ref<XMLNode>(kind == XMLNodeKind::attribute
+                            ? element.attributeForName(name)
+                            : element.findNode(element._firstNamespace, name));
 }
 
 void XMLNodeMaker::place(XMLElement& element, Number number) {
@@ -46,10 +56,8 @@ Ref<XMLElement> XMLNodeMaker::start(Number number) {
     std::size_t attributes = 0;
     for (Number at = begin; at < end; ++at)
         attributes += _index[at].nodeKind() == XMLNodeKind::attribute ? 1 : 0;
-    const std::size_t room = XMLElement::roomFor(attributes);
-    String name = _index.name(_index[number]);
-    auto element = Ref<XMLElement>::adopt(::new (_blocks.allocate(XMLElement::sizeWith(room)))
-                                              XMLElement(name, room));
+    auto element = Ref<XMLElement>::adopt(::new (_blocks.allocate(sizeof(XMLElement)))
+                                              XMLElement(_index.name(_index[number]), 0));
     place(*element, number);
     element->expectAttributes(attributes);
     for (Number at = begin; at < end; ++at)
@@ -65,13 +73,10 @@ void XMLNodeMaker::addAttribute(XMLElement& element, Number number) {
     Ref<XMLNode> known = _table != nullptr ? _table->find(number) : nullptr;
     if (known && known->_parent != nullptr)
         return; // the host has put it elsewhere
-    if (!known && isAttribute && element.canHoldAttribute())
-        return element.holdAttribute(_index.name(entry), textInBlock(_index.value(entry, _room)));
     if (!known)
         known = node(number);
     if (!isAttribute)
         return element.appendUnlessThere(element._firstNamespace, std::move(known));
-    element.attributes(); // of those that are held become nodes, too
     element.appendAttribute(std::move(known));
 }
 
@@ -86,18 +91,13 @@ XMLElement* XMLNodeMaker::addElement(XMLElement& parent, Number number) {
     return isNew ? child->asElement() : nullptr;
 }
 
-// What is no element. The only text of an element is held by the element itself.
+// What is no element.
 void XMLNodeMaker::addContent(const Open& parent, Number number) {
     const XMLIndexEntry& content = _index[number];
     XMLElement& element = *parent.element;
     if (XMLIndex::isLayout(content, _index[parent.number]))
         return;
-    if (content.nodeKind() == XMLNodeKind::text && !content.has(XMLIndexEntry::isBlank) &&
-        element._childCount == 0 && parent.at == parent.end)
-        return element.holdText(textInBlock(_index.value(content, _room)));
-    XMLNode* const made = newNode(content);
-    made->_isLayout = content.has(XMLIndexEntry::isBlank);
-    XMLSiblings::append(element, element._firstChild, made);
+    XMLSiblings::append(element, element._firstChild, newNode(content));
     ++element._childCount;
 }
 

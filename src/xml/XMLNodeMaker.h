@@ -8,8 +8,6 @@
 #include "xml/TextPosition.h"
 #include "xml/XMLTreeIndexer.h"
 
-#include <vector>
-
 namespace qx {
 
 // The nodes that have been made of an index, by the numbers of their entries: elements, and perhaps
@@ -41,6 +39,9 @@ public:
 
     // The node of an entry of any other kind.
     Ref<XMLNode> node(Number number);
+    // The element's attribute or declaration of that name; null where it is there no more.
+    static Ref<XMLNode> attributeOf(const XMLElement& element, XMLNodeKind kind,
+                                    const String& name);
 
 private:
     // An element whose children are being made: those from `at` to `end` are left.

@@ -8,6 +8,8 @@
 
 #include "xml/ParsedDocument.h"
 
+#include <memory>
+
 namespace qx {
 
 class XMLParser {

@@ -4,6 +4,7 @@
 #include "xml/XMLLimits.h"
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 
 namespace qx {

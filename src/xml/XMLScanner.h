@@ -18,9 +18,6 @@
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
-#include <array>
-#include <optional>
-
 namespace qx {
 
 class XMLScanner {

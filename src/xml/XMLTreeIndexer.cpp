@@ -1,7 +1,8 @@
 #include "xml/XMLTreeIndexer.h"
 
 #include <QXXMLMarshalling/base/Exception.h>
-#include <QXXMLMarshalling/base/Key.h>
+
+#include "base/KnownName.h"
 
 namespace qx {
 
@@ -25,8 +26,7 @@ std::uint32_t XMLTreeIndexer::numberOf(const String& name) {
         _numbers.try_emplace(name, static_cast<std::uint32_t>(_index._names.size()));
     if (isNew) {
         require(_index._names.size() < XMLIndex::mostNames);
-        const Key known = name.isInterned() ? Key() : Key::existing(name);
-        _index._names.push_back(known.isNull() ? name : known.string());
+        _index._names.push_back(knownName(name));
     }
     return at->second;
 }

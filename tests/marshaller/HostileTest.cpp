@@ -104,6 +104,21 @@ TEST(Hostile, SmallDocumentsPassHoweverTheyAreRead) {
     }
 }
 
+// At each level twice as many objects have it.
+TEST(Hostile, ALongTextStandsOnceHoweverManyObjectsReadIt) {
+    const auto marshaller = scenario::marshaller(
+        "<A xml='a'><x name='a' node='element'/><y name='a' node='element'/><t node='text'/>"
+        "<v name='v' node='attribute'/></A>");
+    const std::string text(1000, 't');
+    const auto object = marshaller->readString("<a><a v='" + text + "'>" + text + "<b/></a></a>");
+    ASSERT_TRUE(object);
+    for (const char* key : {"t", "v"})
+        EXPECT_TRUE(object->valueForKeyPath(std::string("x.") + key)
+                        .string()
+                        .isSameAs(object->valueForKeyPath(std::string("y.") + key).string()))
+            << key;
+}
+
 TEST(Hostile, AttributesThatManyObjectsKeepCountOnce) {
     std::string attributes;
     for (int i = 0; i < 20; ++i)
@@ -117,6 +132,17 @@ TEST(Hostile, AttributesThatManyObjectsKeepCountOnce) {
     EXPECT_TRUE(
         marshaller->readString(nested("list", 1, repeated("<a" + attributes + "/>", 1000)), &error))
         << scenario::told(error);
+}
+
+TEST(Hostile, VeryManyDeclarationsAreKeptInLinearTime) {
+    const auto element = qx::XMLElement::initWithName("a");
+    for (int i = 0; i < 60'000; ++i)
+        element->addNamespace(qx::XMLNode::namespaceWithName("p" + std::to_string(i), "u"));
+    const auto marshaller = scenario::marshaller("<A/>");
+    marshaller->setMaximumKeptNodes({.base = SIZE_MAX, .perElement = 0});
+    const std::clock_t start = std::clock();
+    EXPECT_TRUE(marshaller->unmarshallElement(element.get()));
+    EXPECT_LT(std::clock() - start, 2 * CLOCKS_PER_SEC);
 }
 
 TEST(Hostile, LimitsAreTheHosts) {
@@ -136,4 +162,10 @@ TEST(Hostile, LimitsAreTheHosts) {
     EXPECT_EQ(limit(4, 2, 2), tooManyObjects);
     EXPECT_EQ(limit(15, 0, 1), "Reading keeps more nodes than the limit of 5: a");
     EXPECT_EQ(limit(SIZE_MAX, SIZE_MAX, SIZE_MAX), "read");
+
+    const auto copying =
+        scenario::marshaller("<A><u type='Flat' container='false' node='element'/></A><Flat/>");
+    copying->setMaximumKeptNodes({.base = 2, .perElement = 0});
+    EXPECT_EQ(scenario::read(*copying, "<a><b><c/></b></a>"),
+              "-224: Reading keeps more nodes than the limit of 2: b (Invalid Mapping)");
 }

@@ -250,7 +250,7 @@ TEST(Marshaller, TakesSingleStepsForAHostThatCallsThem) {
         "<Order><title name='t' node='attribute'/><note node='text'/>"
         "<word name='w' node='element'/><line type='Line' node='element'/>"
         "<lines type='Line' collection='array' name='l'/><items collection='array'/></Order>"
-        "<Line/>");
+        "<Line/><Flat><word name='w' node='element'/><note node='text'/></Flat>");
     const QXXMLClassMapping& order = *marshaller->mapping()->mappingForClassName("Order");
     const auto& fields = order.fields();
     const auto document =
@@ -274,6 +274,11 @@ TEST(Marshaller, TakesSingleStepsForAHostThatCallsThem) {
     // Flattened: the first of several was taken out of the element.
     EXPECT_EQ(element.XMLString(), R"(<o t="1">x<w>2</w><line></line><l></l><l></l></o>)");
     EXPECT_FALSE(marshaller->buildClassWithMapping(order, nullptr, false));
+    // What one field took, another does not find.
+    const QXXMLClassMapping& flat = *marshaller->mapping()->mappingForClassName("Flat");
+    EXPECT_EQ(support::show(marshaller->buildClassWithMapping(
+                  flat, support::parsed("<o>x<w>1</w><w>2</w></o>")->rootElement(), true)),
+              "Flat{note: \"x2\", word: \"1\"}");
     // Whatever the options, the counts are the caller's and stay.
     marshaller->setSaveUnknownXML(false);
     EXPECT_TRUE(

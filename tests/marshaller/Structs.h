@@ -61,14 +61,9 @@ public:
     QXUnknownXML unknown;
 };
 
-// The error as a text.
 template <class Result>
 std::string errorOf(const Result& result) {
-    if (result)
-        return "no error";
-    const qx::Error& error = *result.error();
-    return std::to_string(error.code()) + ": " + error.localizedDescription().str() + " (" +
-           error.localizedFailureReason().str() + ")";
+    return support::told(result.error());
 }
 
 inline std::string attributeField(const std::string& name) {

@@ -1,6 +1,6 @@
-// Plain structs by the call and where they lie meanwhile; unknown XML. StructMembersTest.cpp has
-// the types of their members, and the tables of UnmarshalTest.cpp and MarshalTest.cpp run on
-// structs, too.
+// Plain structs by the call and where they lie meanwhile. StructMembersTest.cpp has the
+// types of their members, and the tables of UnmarshalTest.cpp and MarshalTest.cpp run on structs,
+// too.
 
 #include "Structs.h"
 
@@ -59,23 +59,6 @@ TEST_F(Structs, LoseNoZero) {
     marshaller->setOmitsZeroAttributes(false);
     EXPECT_EQ(scenario::write(*marshaller, counted),
               R"(<Counted zero="0" cut="-0.1276" plain="0"></Counted>)");
-}
-
-TEST_F(Structs, KeepNoUnknownXMLAndSaySoOnce) {
-    testing::internal::CaptureStderr();
-    const char* document = "<place xmlns:x='urn:x' zip='1' a='1'><b/></place>";
-    for (int i = 0; i < 2; ++i)
-        EXPECT_EQ(marshaller->readString<Place>(document)->zip, 1);
-    const std::string log = testing::internal::GetCapturedStderr();
-    const std::string message = "Objects of class Place keep no unknown XML";
-    const auto said = log.find(message);
-    EXPECT_NE(said, std::string::npos) << log;
-    EXPECT_EQ(log.find(message, said + 1), std::string::npos) << log;
-    marshaller->setLenient(false);
-    marshaller->setSaveUnknownXML(false);
-    EXPECT_EQ(errorOf(marshaller->readString<Place>("<place a='1'/>")),
-              "-215: Unknown attributes found in XML document: (a [1]) element: place "
-              "(Invalid XML)");
 }
 
 namespace {
@@ -153,6 +136,34 @@ TEST_F(Structs, AreCopiedByKeyValueAccess) {
     EXPECT_THROW(tree.valueForKey("height"), qx::UndefinedKeyException);
 }
 
+TEST_F(Structs, AreUndoneAsMembersOfObjects) {
+    struct Undone : qx::UndoableObject {
+        Place place;
+        std::vector<Place> places;
+    };
+    qx::Class::define<Undone, qx::UndoableObject>("Undone")
+        .members<&Undone::place, &Undone::places>();
+    const auto object = qx::make<Undone>();
+    const auto manager = qx::make<qx::UndoManager>();
+    object->setUndoManager(manager);
+    {
+        const qx::UndoGroup group(*manager);
+        object->setValueForKey(qx::make<qx::Boxed<Place>>(Place{"Bath", 1}), "place");
+        auto all = qx::make<qx::Array>();
+        all->add(qx::make<qx::Boxed<Place>>(Place{"Wells", 2}));
+        object->setValueForKey(all, "places");
+    }
+    for (int i = 0; i < 2; ++i) {
+        manager->undo();
+        EXPECT_EQ(object->place, Place());
+        EXPECT_EQ(object->places.size(), 0U);
+        manager->redo();
+        EXPECT_EQ(object->place, (Place{"Bath", 1}));
+        EXPECT_EQ(object->places, (std::vector<Place>{{"Wells", 2}}));
+    }
+    qx::Class::forget("Undone");
+}
+
 TEST_F(Structs, ArePartOfRecordsAndHostClasses) {
     const auto mixed = scenario::marshaller(
         "<class name='Counted'><map-to xml='c'/>"
@@ -166,78 +177,4 @@ TEST_F(Structs, ArePartOfRecordsAndHostClasses) {
     const auto counted = mixed->readString<Counted>(host);
     ASSERT_TRUE(counted) << errorOf(counted);
     EXPECT_EQ(scenario::write(*mixed, *counted), host);
-}
-
-namespace {
-
-// Answers nothing and keeps nothing.
-class Mute : public qx::Object {};
-
-} // namespace
-
-TEST_F(Structs, AreWrittenAsItemsWhereMuteClassesAreLeftOutAloud) {
-    qx::Class::define<Mute>("Mute");
-    const auto list = scenario::marshaller("<class name='List'><field name='all' "
-                                           "collection='array'><bind-xml/></field></class>"
-                                           "<class name='Mute'/><class name='Place'/>");
-    const auto read =
-        list->readString("<list><mute a='1' xmlns:x='urn:x'/><place/><mute><b/></mute></list>");
-    testing::internal::CaptureStderr();
-    EXPECT_EQ(scenario::write(*list, read), "<List><Place></Place></List>");
-    EXPECT_EQ(scenario::write(*list, read), "<List><Place></Place></List>");
-    const std::string log = testing::internal::GetCapturedStderr();
-    const std::string message =
-        "Items of class Mute are not written: the class does not answer isRemovable";
-    const auto said = log.find(message);
-    EXPECT_NE(said, std::string::npos) << log;
-    EXPECT_EQ(log.find(message, said + 1), std::string::npos) << log;
-    qx::Class::forget("Mute");
-}
-
-namespace {
-
-struct Page {
-    std::string title;
-    QXUnknownXML unknown;
-    std::vector<Page> pages;
-};
-class Leaf : public QXMappedObject {
-public:
-    std::string name;
-    std::vector<qx::Ref<Leaf>> leaves;
-};
-
-} // namespace
-
-TEST(UnknownXML, IsKeptInAMemberAndByTheBaseClass) {
-    qx::Class::define<Page>("Page").members<&Page::title, &Page::unknown, &Page::pages>();
-    qx::Class::define<Leaf, QXMappedObject>("Leaf").members<&Leaf::name, &Leaf::leaves>();
-    const auto marshaller = scenario::marshaller(
-        "<class name='Page'><map-to xml='page'/><field name='title'><bind-xml node='attribute'/>"
-        "</field><field name='pages' type='Page' collection='array'><bind-xml name='p'/></field>"
-        "</class><class name='Leaf'><map-to xml='leaf'/><field name='name'>"
-        "<bind-xml node='attribute'/></field><field name='leaves' type='Leaf' collection='array'>"
-        "<bind-xml name='leaf'/></field></class>");
-    const std::string document = R"(<page xmlns:x="urn:x" title="t" a="1"><p title="u" x:b="2">)"
-                                 R"(<c>d</c></p><e></e><e></e></page>)";
-    const auto page = marshaller->readString<Page>(document);
-    ASSERT_TRUE(page) << errorOf(page);
-    EXPECT_EQ(page->unknown.children()->count(), 1U);
-    EXPECT_TRUE(page->pages.at(0).unknown.namespaces() == nullptr);
-    const Page copy = *page;
-    EXPECT_EQ(marshaller->marshall(*page)->rootElement()->XMLString().view(), document);
-    EXPECT_EQ(marshaller->marshall(copy)->rootElement()->XMLString().view(), document)
-        << "with nodes of its own";
-
-    const std::string tree = R"(<leaf name="a" b="1"><leaf name="c"><d></d></leaf></leaf>)";
-    const auto leaf = marshaller->readString<Leaf>(tree);
-    ASSERT_TRUE(leaf) << errorOf(leaf);
-    EXPECT_EQ((*leaf)->leaves.at(0)->parent<Leaf>(), *leaf);
-    EXPECT_EQ((*leaf)->parent(), nullptr);
-    EXPECT_EQ(scenario::write(*marshaller, *leaf), tree);
-    const auto orphan = (*leaf)->leaves.at(0);
-    (*leaf)->leaves.clear();
-    EXPECT_EQ(scenario::write(*marshaller, orphan), R"(<leaf name="c"><d></d></leaf>)");
-    qx::Class::forget("Page");
-    qx::Class::forget("Leaf");
 }

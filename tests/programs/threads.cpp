@@ -1,7 +1,7 @@
-// Eight threads over one mapping, each reading and writing documents of its own, while others use
-// what a program has one of: classes by name, user defaults, the shared repository manager,
-// interned names, bundles and the log. Under the thread sanitizer (scripts/test-threads) a race
-// ends it; everywhere else each result is compared.
+// Eight threads over one mapping, each reading documents that all of them read, and reading and
+// writing some of its own, while others use what a program has one of: classes by name, user
+// defaults, the shared repository manager, interned names, bundles and the log. Under the thread
+// sanitizer (scripts/test-threads) a race ends it; everywhere else each result is compared.
 //
 // usage: threads [ROUNDS]
 
@@ -201,9 +201,40 @@ void useRepositories(unsigned thread, unsigned round) {
         check(static_cast<bool>(resolve()), "a mapping resolves");
 }
 
-void run(const qx::Ref<QXXMLMarshallingMapping>& mapping, unsigned thread, unsigned rounds) {
+// All threads read the same documents, and make their nodes, whoever comes first.
+using Documents = std::vector<qx::Ref<qx::XMLDocument>>;
+const char* const sharedText =
+    "<order xmlns:x='urn:x' id='1' x:a='2'><title>Pens</title><lines x:b='3'><line count='4' c='5'>"
+    "a</line></lines><place d='6'><city>Galway</city><e f='7'>g</e></place><h i='8'>j</h></order>";
+
+// All values in a tree, each node asked for.
+std::string valuesIn(const qx::XMLNode& node) {
+    std::string values = node.stringValue().str();
+    if (const qx::XMLElement* const element = node.asElement())
+        for (const qx::XMLNode& attribute : element->attributes())
+            values += attribute.stringValue().view();
+    for (const qx::XMLNode& child : node.children())
+        values += valuesIn(child);
+    return values;
+}
+
+void readShared(QXXMLMarshaller& marshaller, qx::XMLDocument& document, unsigned thread) {
+    if (thread % 2 == 0)
+        check(valuesIn(*document.rootElement()).starts_with("PensaGalwaygj12"), "nodes are there");
+    const auto order = marshaller.unmarshall(&document);
+    check(order && order->valueForKeyPath("place.address.city").string().view() == "Galway",
+          "a document that others read is read");
+    const auto kept = order->valueForKey("unboundAttributes").as<qx::Array>();
+    check(kept && kept->at(0).as<qx::XMLNode>().get() ==
+                      document.rootElement()->attributeForName("x:a"),
+          "what is kept of it are its own nodes");
+}
+
+void run(const qx::Ref<QXXMLMarshallingMapping>& mapping, const Documents& documents,
+         unsigned thread) {
     const auto marshaller = QXXMLMarshaller::initWithMapping(mapping);
-    for (unsigned round = 0; round < rounds; ++round) {
+    for (unsigned round = 0; round < documents.size(); ++round) {
+        readShared(*marshaller, *documents[round], thread);
         readAndWrite(*marshaller, thread, round);
         registerClasses(thread);
         useDefaults(thread, round);
@@ -240,12 +271,15 @@ int main(int argc, char** argv) {
 
     const auto mapping = resolve();
     check(static_cast<bool>(mapping), "the mapping resolves");
+    Documents documents;
+    for (unsigned round = 0; round < rounds; ++round)
+        documents.push_back(qx::XMLDocument::initWithData(sharedText));
     std::latch start(threadCount);
     std::vector<std::thread> threads;
     for (unsigned thread = 0; mapping && thread < threadCount; ++thread)
         threads.emplace_back([&, thread] {
             start.arrive_and_wait();
-            run(mapping, thread, rounds);
+            run(mapping, documents, thread);
         });
     for (std::thread& thread : threads)
         thread.join();

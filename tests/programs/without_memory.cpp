@@ -122,6 +122,7 @@ struct Stage {
     Ref<M> marshaller = M::initWithMappingXML(qx::XMLDocument::initWithData(mappingText).get());
     Ref<qx::XMLDocument> document = qx::XMLDocument::initWithData(documentText);
     Ref<qx::XMLElement> root{document->rootElement()};
+    Ref<qx::XMLDocument> withoutNodes = qx::XMLDocument::initWithData(documentText);
     Ref<qx::Object> order = marshaller->readString(documentText);
     Ref<QXGenericRecord> target = qx::make<QXGenericRecord>();
     Ref<qx::XMLElement> written = qx::XMLElement::initWithName("order");
@@ -195,6 +196,13 @@ void marshalling() {
                  made ? std::to_string(made->mapping()->mapping()->classMappings().size()) : "";
          }},
         {"unmarshall", [](M& m, Stage& s) { s.made = m.unmarshall(s.document, &s.error); }},
+        {"unmarshall without nodes",
+         [](M& m, Stage& s) {
+             s.made = m.unmarshall(s.withoutNodes, &s.error);
+             s.text = s.withoutNodes->description().str();
+         }},
+        {"rootElement",
+         [](M&, Stage& s) { s.made = Ref<qx::Object>(s.withoutNodes->rootElement()); }},
         {"unmarshallElement",
          [](M& m, Stage& s) { s.made = m.unmarshallElement(s.root.get(), &s.error); }},
         {"buildClassWithMapping",

@@ -13,6 +13,7 @@ struct Block {
     std::string heading; // what stands behind the opening
     std::string text;    // outdented as far as the opening is indented
     std::size_t line = 0;
+    std::string section; // the page's heading above it
 };
 
 // The blocks between a line that begins with `opening` and the next line `closing`.
@@ -20,6 +21,7 @@ inline std::vector<Block> blocksOf(const std::string& path, const std::string& o
                                    const std::string& closing = "```") {
     std::vector<Block> blocks;
     std::ifstream file(path);
+    std::string section;
     std::size_t number = 0, indent = 0;
     bool isInside = false;
     for (std::string line; std::getline(file, line);) {
@@ -32,7 +34,9 @@ inline std::vector<Block> blocksOf(const std::string& path, const std::string& o
         } else if (line.compare(blanks, opening.size(), opening) == 0) {
             isInside = true;
             indent = blanks;
-            blocks.push_back({line.substr(blanks + opening.size()), "", number});
+            blocks.push_back({line.substr(blanks + opening.size()), "", number, section});
+        } else if (line.starts_with('#')) {
+            section = line.substr(std::min(line.find_first_not_of("# "), line.size()));
         }
     }
     return blocks;

@@ -35,8 +35,8 @@ public:
     // The same before a child of this element, at the end where `before` is null.
     void insertChild(Ref<XMLNode> child, XMLNode* before);
 
-    // In document order. An element's attributes, too, may become nodes when they are asked for:
-    // see XMLNode::children().
+    // In document order. Those of an element made by hand, too, may become nodes when they are
+    // asked for: see XMLNode::children().
     XMLNodeRange attributes() const {
         if (_heldCount != 0)
             makeAttributeNodes();
@@ -97,7 +97,7 @@ private:
     // 1. An attribute is held or has a node, and while one is held none has a node: asking for a
     //    node makes those of all, lazily.
     // 2. The room is fixed when the element is made, and goes with it. What does not fit is a node.
-    // 3. The element owns them; like all of a document they belong to one thread at a time.
+    // 3. The element owns them. A parsed one holds none: many threads may ask for its attributes.
     struct HeldAttribute {
         String name;
         String value;

@@ -118,8 +118,8 @@ public:
         return _previous != nullptr && _previous->_next != nullptr ? _previous : nullptr;
     }
     // The child nodes in document order: of elements and documents; of other kinds none.
-    // An element's only text may become a node when it is asked for: that is a use of the tree like
-    // any other, for one thread at a time.
+    // What was parsed has all its nodes, and any number of threads may read it while none changes
+    // it. Of elements set by hand the only text may become a node now: for one thread at a time.
     XMLNodeRange children() const { return XMLNodeRange(firstChild()); }
     virtual XMLNode* firstChild() const { return nullptr; }
 

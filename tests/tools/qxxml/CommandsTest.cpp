@@ -19,7 +19,7 @@ void run(const std::string& page, std::size_t least, Answer answer) {
         if (block.heading.starts_with("xml "))
             home.write(block.heading.substr(4), block.text);
     std::size_t commands = 0;
-    for (const auto& [heading, text, line] : blocks) {
+    for (const auto& [heading, text, line, section] : blocks) {
         if (heading != "console")
             continue;
         const std::size_t end = text.find('\n');

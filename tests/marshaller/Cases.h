@@ -1,0 +1,158 @@
+#pragma once
+
+// What the blocks of a page say of a marshaller (see support/Cases.h for pages):
+//
+//     xml mapping      a <mapping>, or the classes in one
+//     xml document     what is read, and of what comes is written again
+//     text given       an object, shown as the next, that is written; nothing is read then
+//     text object      what reading gives
+//     xml written      what is written
+//     text error       "CODE: message (reason)" of the mapping, of reading or of writing; a page
+//     may
+//                      leave the reasons out
+//
+// Options are "strict", "discard" and "no-namespaces". Each case runs on records, on host classes
+// and on plain structs; where they differ, a block says for which it is: "records", "hosts",
+// "structs".
+
+#include "ObjectKinds.h"
+#include "support/Cases.h"
+#include "support/Show.h"
+#include "support/Texts.h"
+
+#include <QXXMLMarshalling/QXGenericRecord.h>
+#include <QXXMLMarshalling/QXXMLMarshaller.h>
+#include <QXXMLMarshalling/model/Array.h>
+
+#include <algorithm>
+#include <charconv>
+
+namespace cases {
+
+using support::Expectation;
+
+// Makes the object that support::show() prints as a text.
+class Maker {
+public:
+    explicit Maker(std::string_view text) : _rest(text) {}
+
+    qx::Value value() {
+        if (takes('"')) {
+            const std::string text = upTo("\"");
+            _rest.remove_prefix(1);
+            return text;
+        }
+        if (takes('[')) {
+            const auto array = qx::make<qx::Array>();
+            while (!takes(']'))
+                array->add(value());
+            return array;
+        }
+        const std::string word = upTo(":{,]} \n");
+        if (takes('{'))
+            return object(word);
+        if (word == "null" || word == "true" || word == "false")
+            return word == "null" ? qx::Value() : qx::Value(word == "true");
+        double number = 0;
+        std::from_chars(word.data(), word.data() + word.size(), number);
+        return word.find('.') == std::string::npos ? qx::Value(static_cast<int>(number)) : number;
+    }
+
+private:
+    qx::Value object(const std::string& className) {
+        const qx::Class* const type = qx::Class::named(className);
+        const auto record = type == nullptr ? qx::make<QXGenericRecord>() : nullptr;
+        const qx::Ref<qx::Object> object = record ? record : type->create();
+        if (record)
+            record->setClassNameForMarshalling(className);
+        while (!takes('}')) {
+            const std::string key = upTo(":");
+            takes(':');
+            object->setValueForKey(value(), key);
+        }
+        return object;
+    }
+    // Passes over the character where it is the next, and what separates it from others.
+    bool takes(char c) {
+        _rest.remove_prefix(std::min(_rest.find_first_not_of(", \n"), _rest.size()));
+        const bool isNext = _rest.starts_with(c);
+        _rest.remove_prefix(isNext ? 1 : 0);
+        return isNext;
+    }
+    std::string upTo(const char* ends) {
+        const std::string_view text = _rest.substr(0, _rest.find_first_of(ends));
+        _rest.remove_prefix(text.size());
+        return std::string(text);
+    }
+
+    std::string_view _rest;
+};
+
+struct Result {
+    std::string object, written, error = "no error\n", errorWithoutReason;
+};
+
+// What comes of a case. A document is read as a text, or as a tree.
+inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool isTree) {
+    const auto& [kind, text, options, given] = expectation;
+    Result result;
+    qx::Ref<qx::Error> error;
+    if (const auto marshaller = QXXMLMarshaller::initWithMappingXML(&mapping, &error)) {
+        marshaller->setLenient(!options.contains("strict"));
+        marshaller->setSaveUnknownXML(!options.contains("discard"));
+        marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
+        const auto source = given.find("document");
+        const bool isRead = source != given.end();
+        const auto document =
+            isTree && isRead ? qx::XMLDocument::initWithData(source->second) : nullptr;
+        const qx::Value object = !isRead    ? Maker(given.at("given")).value()
+                                 : document ? qx::Value(marshaller->unmarshall(document, &error))
+                                            : marshaller->readString(source->second, &error);
+        EXPECT_FALSE(!object.isNull() && error) << "both an object and an error";
+        result.object = support::show(object);
+        const auto element = error ? nullptr : marshaller->marshallObject(object, &error);
+        EXPECT_FALSE(element && error) << "both an element and an error";
+        result.written = element ? element->XMLString(qx::XMLPrettyPrint).str() + "\n" : "";
+    }
+    if (error) {
+        result.error = support::told(error) + "\n";
+        result.errorWithoutReason =
+            std::to_string(error->code()) + ": " + error->localizedDescription().str() + "\n";
+    }
+    return result;
+}
+
+// Compares what comes with the block, on that kind of object.
+inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
+    const auto isFor = [&](const char* name) { return expectation.options.contains(name); };
+    if (std::ranges::any_of(kinds::names, isFor) && !isFor(kinds::names[kind]))
+        return;
+    const std::string& text = expectation.given.at("mapping");
+    const auto mapping =
+        support::parsed(text.starts_with("<mapping") ? text : "<mapping>" + text + "</mapping>");
+    const kinds::Defined classes(kind, *mapping->rootElement());
+    for (const bool isTree : {false, true}) {
+        SCOPED_TRACE(std::string("on ") + kinds::names[kind] +
+                     (isTree ? ", from a tree" : ", from a text"));
+        const Result result = run(expectation, *mapping, isTree);
+        if (expectation.kind == "object") {
+            EXPECT_EQ(support::withoutLayout(result.object),
+                      support::withoutLayout(expectation.text))
+                << result.error;
+        } else if (expectation.kind == "written") {
+            EXPECT_EQ(result.written, expectation.text) << result.error;
+        } else if (expectation.text != result.errorWithoutReason) {
+            EXPECT_EQ(result.error, expectation.text);
+        }
+    }
+}
+
+inline bool addPage(const std::string& page, std::vector<kinds::Kind> on) {
+    return support::addCases(page, {"mapping", "document", "given"}, {"object", "written", "error"},
+                             [=](const Expectation& expectation) {
+                                 for (const kinds::Kind kind : on)
+                                     checkOn(kind, expectation);
+                             });
+}
+
+} // namespace cases

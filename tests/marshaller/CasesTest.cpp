@@ -1,0 +1,16 @@
+// The pages of cases in this folder, on every kind of object.
+
+#include "Cases.h"
+
+namespace {
+
+using kinds::Kind;
+
+const bool added = [] {
+    for (const char* page : {"reading", "writing", "round-trips"})
+        cases::addPage("tests/marshaller/" + std::string(page) + ".md",
+                       {Kind::record, Kind::host, Kind::plain});
+    return true;
+}();
+
+} // namespace
