@@ -6,7 +6,7 @@
 
 #include <QXXMLMarshalling/xml/XMLElement.h>
 
-#include "plan/MappingPlan.h"
+#include <unordered_map>
 
 namespace qx::detail {
 
@@ -39,7 +39,7 @@ public:
 
 private:
     Ref<XMLNode> _seen;
-    StringMap<Ref<XMLNode>> _last;
+    std::unordered_map<String, Ref<XMLNode>> _last;
 };
 
 } // namespace qx::detail

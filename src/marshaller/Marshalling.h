@@ -8,6 +8,7 @@
 
 #include "marshaller/LastChildByName.h"
 #include "marshaller/ObjectAccess.h"
+#include "plan/MappingPlan.h"
 
 namespace qx::detail {
 

@@ -15,12 +15,6 @@ class QXXMLMarshallingMapping;
 
 namespace qx::detail {
 
-struct StringHash {
-    std::size_t operator()(const String& text) const noexcept { return text.hash(); }
-};
-template <class T>
-using StringMap = std::unordered_map<String, T, StringHash>;
-
 class MappingPlan {
 public:
     // That of the mapping; of a null one a plan without classes.
@@ -52,7 +46,8 @@ public:
     static String elementNameOf(const QXXMLClassMapping& mapping);
 
 private:
-    static const ClassPlan* find(const StringMap<const ClassPlan*>& plans, const String& name) {
+    static const ClassPlan* find(const std::unordered_map<String, const ClassPlan*>& plans,
+                                 const String& name) {
         const auto found = plans.find(name);
         return found != plans.end() ? found->second : nullptr;
     }
@@ -61,8 +56,8 @@ private:
     void markCycles();
 
     std::vector<std::unique_ptr<ClassPlan>> _classes;
-    StringMap<const ClassPlan*> _byClassName;
-    StringMap<const ClassPlan*> _byElementName;
+    std::unordered_map<String, const ClassPlan*> _byClassName;
+    std::unordered_map<String, const ClassPlan*> _byElementName;
     std::unordered_map<const QXXMLFieldMapping*, const FieldPlan*> _fields;
 };
 

@@ -41,7 +41,7 @@ public:
 
 private:
     // Positions count from 1; 0 stands for none.
-    using Latest = StringMap<std::size_t>;
+    using Latest = std::unordered_map<String, std::size_t>;
     struct Repeated {
         const QXXMLClassMapping* mapping;
         std::size_t sameClass; // the latest class before it that has its name

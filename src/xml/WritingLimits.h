@@ -48,10 +48,6 @@ private:
         std::size_t depth;
         std::size_t count;
     };
-    struct Hash {
-        std::size_t operator()(const String& text) const noexcept { return text.hash(); }
-    };
-
     void enterLimited(const XMLElement& element, std::size_t attributes, std::size_t declarations);
     void leaveLimited() noexcept;
     void requireFewNames(const XMLPlace& place) const;
@@ -61,8 +57,8 @@ private:
     std::size_t _textSize = 0;
     std::size_t _namespaces = 0; // in force
     std::vector<Declarations> _declarations;
-    std::unordered_set<String, Hash> _names;
-    std::unordered_set<String, Hash> _URIs;
+    std::unordered_set<String> _names;
+    std::unordered_set<String> _URIs;
 };
 
 } // namespace qx

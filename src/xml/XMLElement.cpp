@@ -54,10 +54,7 @@ static_assert(sizeof(void*) != 8 || (sizeof(XMLElement) <= 112 && sizeof(XMLNode
 
 // An index holds all the nodes of its list, or is not there.
 struct XMLElement::Indexes final : ObjectAttachment {
-    struct Hash {
-        std::size_t operator()(const String& name) const noexcept { return name.hash(); }
-    };
-    using Index = std::unordered_map<String, XMLNode*, Hash>;
+    using Index = std::unordered_map<String, XMLNode*>;
 
     std::optional<Index>& of(XMLNodeKind kind) noexcept {
         return kind == XMLNodeKind::attribute ? attributes : namespaces;

@@ -40,14 +40,10 @@ private:
     void addChild(XMLNode& child);
     std::uint32_t numberOf(const String& name);
 
-    struct Hash {
-        std::size_t operator()(const String& name) const noexcept { return name.hash(); }
-    };
-
     XMLIndex _index;
     std::vector<Ref<XMLElement>> _elements; // by entry; null for other kinds
     std::vector<std::uint8_t> _isExpanded;  // likewise
-    std::unordered_map<String, std::uint32_t, Hash> _numbers;
+    std::unordered_map<String, std::uint32_t> _numbers;
 };
 
 } // namespace qx
