@@ -106,10 +106,11 @@ constexpr const char* itemsAreLeftOut =
 } // namespace
 
 // A class that lacks a key raises when it is read by a key that it does not take; so it is asked
-// once. A struct has the keys that it was described with, and no others.
+// once. A struct has the keys that it was described with, and no others. Of a record these are no
+// properties: it is not asked whether they are.
 Value ObjectAccess::getKept(const Object& object, KeptXML what) {
     if (&object.isa() == records)
-        return object.valueForKey(keyOf(what));
+        return object.valueForUndefinedKey(keyOf(what));
     bool& isLacking = hooksOf(object).lacks[static_cast<std::size_t>(what)];
     if (isLacking)
         return {};
