@@ -11,7 +11,8 @@
 namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller)
-    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())) {}
+    : _marshaller(&marshaller), _mapping(marshaller.mapping()),
+      _plan(MappingPlan::of(_mapping.get())) {}
 
 const ClassPlan* Marshalling::classOf(const Value& value) const {
     return value.isObject() ? _plan.classNamed(value.classNameForMarshalling()) : nullptr;

@@ -48,6 +48,7 @@ private:
     void restoreNamespaces(XMLElement& element, const Object& object);
 
     const qx::Ref<const QXXMLMarshaller> _marshaller;
+    const qx::Ref<const QXXMLMarshallingMapping> _mapping; // of the plan
     const MappingPlan& _plan;
     ObjectAccess _access;
     std::size_t _depth = 0;

@@ -11,7 +11,8 @@
 namespace qx::detail {
 
 Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use)
-    : _marshaller(&marshaller), _document(document), _plan(MappingPlan::of(marshaller.mapping())),
+    : _marshaller(&marshaller), _mapping(marshaller.mapping()), _document(document),
+      _plan(MappingPlan::of(_mapping.get())),
       _use(use), _budget(marshaller, document), _classes(_plan.classCount() + 1),
       _classKnown(_plan.classCount() + 1) {}
 

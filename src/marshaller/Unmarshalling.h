@@ -94,6 +94,7 @@ private:
     bool keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error);
 
     const Ref<QXXMLMarshaller> _marshaller;
+    const Ref<const QXXMLMarshallingMapping> _mapping; // of the plan
     IndexedXML& _document;
     const MappingPlan& _plan;
     const Use _use;

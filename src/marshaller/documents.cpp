@@ -83,6 +83,15 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parse
     return objectOf(marshaller, document, type, error);
 }
 
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, Ref<qx::Data> data,
+                         const std::type_info& type, Ref<Error>* error) {
+    if (!data)
+        return nullptr;
+    return objectOf(marshaller,
+                    qx::XMLParser::parse(std::move(data), parseOptions(marshaller), error), type,
+                    error);
+}
+
 // What no XML document can hold, or none that could be read again, raises while it is written.
 template <class Result, class Write>
 Result written(Write write, Ref<Error>* error) {
@@ -112,27 +121,19 @@ Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, qx::XMLParser::parseLent(xml, parseOptions(*this), error), type, error);
+    return objectOf(*this, qx::XMLParser::parseCopy(xml, parseOptions(*this), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
                                           Ref<Error>* error) {
     reset(error);
-    auto data = qx::readFile(path, error);
-    if (!data)
-        return nullptr;
-    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error), type,
-                    error);
+    return objectOf(*this, qx::readFile(path, error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    auto data = qx::readStream(stream, error);
-    if (!data)
-        return nullptr;
-    return objectOf(*this, qx::XMLParser::parse(std::move(data), parseOptions(*this), error), type,
-                    error);
+    return objectOf(*this, qx::readStream(stream, error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {

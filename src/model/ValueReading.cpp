@@ -23,6 +23,12 @@ bool readWhole(std::string_view text, T& result) {
 constexpr double twoTo63 = 9223372036854775808.0;
 constexpr double twoTo64 = 18446744073709551616.0;
 
+// Whether it is a number without a fraction in [from, to).
+bool isWholeReal(const Value& value, double from, double to) {
+    const double real = value.doubleValue();
+    return std::trunc(real) == real && real >= from && real < to;
+}
+
 } // namespace
 
 bool readBoolean(const Value& value, bool& result) {
@@ -46,13 +52,9 @@ bool readBoolean(const Value& value, bool& result) {
 bool readInteger(const Value& value, std::int64_t& result) {
     if (value.isString())
         return readWhole(value.view(), result);
-    if (!value.isNumber())
+    if (value.kind() == Value::Kind::real ? !isWholeReal(value, -twoTo63, twoTo63)
+                                          : !value.isNumber())
         return false;
-    if (value.kind() == Value::Kind::real) {
-        const double real = value.doubleValue();
-        if (std::trunc(real) != real || real < -twoTo63 || real >= twoTo63)
-            return false;
-    }
     result = value.intValue();
     return true;
 }
@@ -60,16 +62,13 @@ bool readInteger(const Value& value, std::int64_t& result) {
 bool readUnsigned(const Value& value, std::uint64_t& result) {
     if (value.isString())
         return readWhole(value.view(), result);
-    if (!value.isNumber())
-        return false;
     if (value.kind() == Value::Kind::real) {
-        const double real = value.doubleValue();
-        if (std::trunc(real) != real || real < 0 || real >= twoTo64)
+        if (!isWholeReal(value, 0, twoTo64))
             return false;
-        result = static_cast<std::uint64_t>(real);
+        result = static_cast<std::uint64_t>(value.doubleValue());
         return true;
     }
-    if (value.intValue() < 0)
+    if (!value.isNumber() || value.intValue() < 0)
         return false;
     result = static_cast<std::uint64_t>(value.intValue());
     return true;

@@ -91,7 +91,7 @@ public:
     Ref<XMLNode> attribute(Nodes nodes, Number holder, Number number);
     // Any child, to be quoted.
     Ref<XMLNode> quoted(Number number);
-    // Whether that node was made for its own sake already.
+    // Whether that node of the pool has been made already.
     bool isMade(Nodes nodes, Number number) const;
     // Takes the element out of the host's tree; nothing where the host has none.
     void detach(Number element);

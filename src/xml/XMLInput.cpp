@@ -36,10 +36,10 @@ String encodingInDeclaration(std::string_view text) {
 
 } // namespace
 
-void XMLInput::read(XMLBytes bytes, bool copies) {
-    const bool isConverted = decodeBytes(bytes.view());
+void XMLInput::read(std::string_view bytes, bool copies) {
+    const bool isConverted = decodeBytes(bytes);
     checkStart();
-    if (!isConverted && (copies || !bytes.isTerminated()))
+    if (!isConverted && copies)
         _text = _own = _text;
     const std::size_t tag = findTagBeyond(_text, xmlLimits::attributes);
     if (tag != std::string_view::npos)

@@ -1,10 +1,10 @@
 #pragma once
 
 // A document's bytes made ready for the parser: as UTF-8 without a byte-order mark, with nothing in
-// them that the parser would take unlimited time for. Lent UTF-8 that a zero byte follows stays
-// where it is and is not copied.
+// them that the parser would take unlimited time for. UTF-8 is read where it
+// stands, without a copy, if its owner stays.
 
-#include <QXXMLMarshalling/xml/XMLDocument.h>
+#include <QXXMLMarshalling/base/String.h>
 
 #include <string>
 #include <string_view>
@@ -17,9 +17,9 @@ public:
     XMLInput(const XMLInput&) = delete;
     XMLInput& operator=(const XMLInput&) = delete;
 
-    // With a copy where the bytes go with the call. Throws ParseFailure; text() is then what could
-    // be read up to its place.
-    void read(XMLBytes bytes, bool copies);
+    // Bytes that are not copied stay where they are as long as this, and a zero byte follows them.
+    // Throws ParseFailure; text() is then what could be read up to its place.
+    void read(std::string_view bytes, bool copies);
 
     // A zero byte follows it.
     std::string_view text() const noexcept { return _text; }

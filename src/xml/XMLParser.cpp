@@ -6,32 +6,25 @@
 
 namespace qx {
 
-XMLParser::Parsed XMLParser::parseLent(XMLBytes bytes, const XMLParseOptions& options,
-                                       Ref<Error>* error) {
-    return run(bytes, Text::lent, options, error, Way::fastest);
-}
-
 XMLParser::Parsed XMLParser::parse(Ref<const Data> data, const XMLParseOptions& options,
                                    Ref<Error>* error) {
-    const auto parsed = run(*data, Text::lent, options, error, Way::fastest);
-    if (parsed)
-        parsed->_owner = std::move(data);
-    return parsed;
+    const std::string_view bytes = data->view();
+    return run(bytes, std::move(data), options, error, Way::fastest);
 }
 
 XMLParser::Parsed XMLParser::parseCopy(XMLBytes bytes, const XMLParseOptions& options,
                                        Ref<Error>* error, Way way) {
-    return run(bytes, Text::copied, options, error, way);
+    return run(bytes.view(), nullptr, options, error, way);
 }
 
-std::shared_ptr<ParsedDocument> XMLParser::run(XMLBytes bytes, Text text,
-                                               const XMLParseOptions& options, Ref<Error>* error,
-                                               Way way) {
-    auto parsed = std::make_shared<ParsedDocument>();
+XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
+                                 const XMLParseOptions& options, Ref<Error>* error, Way way) {
+    const auto parsed = std::make_shared<ParsedDocument>();
+    parsed->_owner = std::move(owner);
     XMLInput& input = parsed->_input;
     XMLIndex& index = parsed->_index;
     try {
-        input.read(bytes, text == Text::copied);
+        input.read(bytes, !parsed->_owner);
         index = XMLIndex(input.text());
         if (way == Way::cParserOnly || !XMLScanner::scan(index, options))
             SAXSession(index, options).run();

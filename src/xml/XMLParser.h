@@ -18,18 +18,17 @@ public:
     enum class Way : std::uint8_t { fastest, cParserOnly };
     using Parsed = std::shared_ptr<const ParsedDocument>;
 
-    // All give null with an error for what is no well-formed XML, cannot be decoded, or exceeds a
-    // limit. Lent bytes must outlive what was parsed of them.
-    static Parsed parseLent(XMLBytes bytes, const XMLParseOptions& options, Ref<Error>* error);
+    // Both give null with an error for what is no well-formed XML, cannot be decoded, or exceeds a
+    // limit. What is parsed holds the data, or a copy of the bytes: whoever lent them may be a
+    // setter's host, which changes them while objects are read.
     static Parsed parse(Ref<const Data> data, const XMLParseOptions& options, Ref<Error>* error);
-    // Has a text of its own.
     static Parsed parseCopy(XMLBytes bytes, const XMLParseOptions& options, Ref<Error>* error,
                             Way way = Way::fastest);
 
 private:
-    enum class Text : std::uint8_t { lent, copied };
-    static std::shared_ptr<ParsedDocument>
-    run(XMLBytes bytes, Text text, const XMLParseOptions& options, Ref<Error>* error, Way way);
+    // Copies the bytes where they have no owner.
+    static Parsed run(std::string_view bytes, Ref<const Data> owner, const XMLParseOptions& options,
+                      Ref<Error>* error, Way way);
 };
 
 } // namespace qx

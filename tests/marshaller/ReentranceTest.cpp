@@ -177,6 +177,20 @@ TEST(Reentrance, WhateverHostObjectsDoMeanwhileListsComeWhole) {
     }
 }
 
+TEST(Reentrance, TheTextThatIsReadMayBeChangedMeanwhile) {
+    const auto marshaller = scenario::marshaller(mapping(Order::host));
+    std::string text = document();
+    const std::string expected = scenario::read(*marshaller, text);
+    const auto forgetText = [&] { text = std::string(); };
+    std::string shown;
+    for (int call = 0; Meddling::during(call, forgetText,
+                                        [&] { shown = scenario::read(*marshaller, text); });
+         ++call) {
+        ASSERT_EQ(shown, expected) << "at call " << call;
+        text = document();
+    }
+}
+
 TEST(Reentrance, OptionsHoldFromTheMomentTheyAreSet) {
     const auto marshaller =
         scenario::marshaller("<One type='ReentranceTest.Meddler' xml='one'><word "

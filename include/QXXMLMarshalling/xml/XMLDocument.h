@@ -57,8 +57,7 @@ struct XMLParseOptions {
     bool refuseDoctype = false;
 };
 
-// The bytes of a document, lent for the time of a call. Those that a zero byte follows, as in a
-// std::string, can be read where they stand; others have to be copied.
+// The bytes of a document, lent for the time of a call, which copies them.
 class XMLBytes {
 public:
     XMLBytes(std::string_view bytes) noexcept : _view(bytes) {}
@@ -67,18 +66,14 @@ public:
     template <class Text>
     requires std::convertible_to<const Text&, std::string_view> XMLBytes(const Text& text)
     noexcept : _view(text) {}
-    XMLBytes(const std::string& text) noexcept : _view(text), _isTerminated(true) {}
-    XMLBytes(const String& text) noexcept : _view(text), _isTerminated(true) {}
-    XMLBytes(const Data& data) noexcept : _view(data.view()), _isTerminated(true) {}
+    XMLBytes(const Data& data) noexcept : _view(data.view()) {}
     // A null pointer gives no bytes.
-    XMLBytes(const char* text) noexcept : _view(text != nullptr ? text : ""), _isTerminated(true) {}
+    XMLBytes(const char* text) noexcept : _view(text != nullptr ? text : "") {}
 
     std::string_view view() const noexcept { return _view; }
-    bool isTerminated() const noexcept { return _isTerminated; }
 
 private:
     std::string_view _view;
-    bool _isTerminated = false;
 };
 
 class QX_API XMLDocument final : public XMLNode {
