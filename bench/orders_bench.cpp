@@ -9,6 +9,7 @@
 
 #include <benchmark/benchmark.h>
 
+#include <istream>
 #include <map>
 
 namespace {
@@ -51,6 +52,32 @@ void read(benchmark::State& state) {
     besideUnit(state, xml, [&] { return reader->readString(xml).get() != nullptr; });
 }
 
+// The bytes as a stream, without a copy of them.
+class Bytes final : public std::streambuf {
+public:
+    explicit Bytes(const std::string& bytes) {
+        char* const begin = const_cast<char*>(bytes.data());
+        setg(begin, begin, begin + bytes.size());
+    }
+};
+
+// One order after another, each forgotten before the next.
+template <class Order>
+void readEachOf(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const auto reader = marshaller();
+    besideUnit(state, xml, [&] {
+        Bytes bytes(xml);
+        std::istream stream(&bytes);
+        return reader->unmarshallEach<Order>(stream, "order", [](const auto&) {});
+    });
+}
+void readEach(benchmark::State& state) { readEachOf<qx::Object>(state); }
+void readEachStruct(benchmark::State& state) {
+    const bench::Described described;
+    readEachOf<bench::Order>(state);
+}
+
 void write(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     const auto writer = marshaller();
@@ -84,8 +111,10 @@ void sizes(benchmark::internal::Benchmark* benchmark) {
 
 BENCHMARK(parse)->Apply(sizes);
 BENCHMARK(read)->Apply(sizes);
+BENCHMARK(readEach)->Apply(sizes);
 BENCHMARK(write)->Apply(sizes);
 BENCHMARK(readStructs)->Apply(sizes);
+BENCHMARK(readEachStruct)->Apply(sizes);
 BENCHMARK(writeStructs)->Apply(sizes);
 
 } // namespace

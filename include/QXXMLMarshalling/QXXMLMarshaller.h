@@ -30,8 +30,13 @@
 #include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/undo/UndoManager.h>
 
+#include <concepts>
 #include <iosfwd>
 #include <typeinfo>
+
+namespace qx {
+class ByteSource;
+}
 
 class QX_API QXXMLMarshaller : public qx::Object {
 public:
@@ -143,6 +148,27 @@ public:
     template <class T, std::derived_from<qx::XMLDocument> D>
     [[nodiscard]] qx::ResultOf<T> unmarshall(const qx::Ref<D>& document) {
         return unmarshall<T>(document.get());
+    }
+
+    // Reads a document that need not fit into memory: calls visit(object) with the object of each
+    // outermost element of that name, at whatever depth, when it has been read, and forgets it.
+    // What stands around these elements is parsed and passed over. `source` is the path of a file,
+    // or a std::istream, which is read in blocks. `visit` may answer false to stop. True when it
+    // was called for all of them, or has stopped; the errors are those of readFile(), also where a
+    // class is asked for. Objects before a fault have been handed over when the call answers false.
+    //
+    //     marshaller->unmarshallEach("orders.xml", "order", [](qx::Ref<qx::Object> order) { … });
+    //     marshaller->unmarshallEach<Order>(stream, "order", [](Order order) { … }, &error);
+    //
+    // Each object has an undo group of its own, and limits count anew after some. The document may
+    // be of any size, one element of that name, with a DOCTYPE, of 2 GB.
+    template <class T = qx::Object, class Source, class Visit>
+    bool unmarshallEach(Source&& source, const qx::String& elementName, Visit visit,
+                        qx::Ref<qx::Error>* error = nullptr) {
+        const auto visitor = [&visit](const qx::Ref<qx::Object>& object) {
+            return visited<T>(visit, object);
+        };
+        return readEach(source, elementName, typeid(T), visitor, error);
     }
 
     // Marshall and serialise in one step, one element a line. The slot is set to null first. The
@@ -290,15 +316,44 @@ private:
                                    qx::Ref<qx::Error>* error);
     qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, const std::type_info& type,
                                    qx::Ref<qx::Error>* error);
+    // What became of an object that was handed over: an error ends the reading.
+    struct Visited {
+        bool goesOn;
+        qx::Ref<qx::Error> error;
+    };
+    using Visitor = qx::detail::UniqueFunction<Visited(const qx::Ref<qx::Object>&)>;
+    bool readEach(const qx::String& path, const qx::String& elementName, const std::type_info& type,
+                  Visitor visitor, qx::Ref<qx::Error>* error);
+    bool readEach(std::istream& stream, const qx::String& elementName, const std::type_info& type,
+                  Visitor visitor, qx::Ref<qx::Error>* error);
+    bool readEach(qx::ByteSource& source, const qx::String& elementName, const std::type_info& type,
+                  Visitor visitor, qx::Ref<qx::Error>* error);
+    template <class T, class Visit>
+    static Visited visited(Visit& visit, const qx::Ref<qx::Object>& object) {
+        auto result = resultOf<T>(object);
+        if (!result)
+            return {false, result.error()};
+        if constexpr (std::is_void_v<decltype(visit(*std::move(result)))>) {
+            visit(*std::move(result));
+            return {true, nullptr};
+        } else {
+            return {static_cast<bool>(visit(*std::move(result))), nullptr};
+        }
+    }
+
     // -211 for an object that is not of that type.
     static qx::Ref<qx::Error> wrongClass(const qx::Object& object, const std::type_info& type);
 
-    template <class T, class Read>
+    template <class T, std::invocable<qx::Ref<qx::Error>*> Read>
     static qx::ResultOf<T> resultOf(Read read) {
         qx::Ref<qx::Error> error;
         const qx::Ref<qx::Object> object = read(&error);
         if (!object)
             return error;
+        return resultOf<T>(object);
+    }
+    template <class T>
+    static qx::ResultOf<T> resultOf(const qx::Ref<qx::Object>& object) {
         if constexpr (std::derived_from<T, qx::Object>) {
             if (auto cast = object.template as<T>())
                 return cast;

@@ -12,9 +12,8 @@ namespace qx::detail {
 
 Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()), _document(document),
-      _plan(MappingPlan::of(_mapping.get())),
-      _use(use), _budget(marshaller, document), _classes(_plan.classCount() + 1),
-      _classKnown(_plan.classCount() + 1) {}
+      _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
+      _classes(_plan.classCount() + 1), _classKnown(_plan.classCount() + 1) {}
 
 // Lends consumed names for the time of one object's binding.
 class Unmarshalling::LentNames {
@@ -236,11 +235,14 @@ private:
 
 } // namespace
 
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
-    const ReadingGroup group(marshaller.undoManager());
+Ref<Object> Unmarshalling::read(Number element, ErrorSlot error) {
+    const ReadingGroup group(_marshaller->undoManager());
     const BulkObjects bulk;
-    return Unmarshalling(marshaller, document)
-        .unmarshallNode(document.root(), IndexedXML::Nodes::own, error);
+    return unmarshallNode(element, IndexedXML::Nodes::own, error);
+}
+
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
+    return Unmarshalling(marshaller, document).read(document.root(), error);
 }
 
 } // namespace qx::detail

@@ -45,6 +45,8 @@ public:
     // The document must outlive the call.
     Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
+    // In an undo group of its own.
+    Ref<Object> read(Number element, ErrorSlot error);
     // `nodes` are those that are kept of the element.
     Ref<Object> unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error);
     // `source` may be shared with the object that this one is flattened into.

@@ -8,7 +8,7 @@
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
 #include "model/TypeNames.h"
-#include "xml/XMLParser.h"
+#include "xml/XMLPieces.h"
 
 #include <algorithm>
 
@@ -51,27 +51,33 @@ String nameOf(const std::type_info& type) {
     return described != nullptr ? described->name() : String(qx::readableName(type));
 }
 
+// Whether an element of that name may become such an object, as far as that shows before it is
+// read.
+template <class Quoted>
+bool mayRead(const QXXMLMarshaller& marshaller, const String& elementName,
+             const std::type_info& type, Ref<Error>* error, Quoted quoted) {
+    const ClassPlan* const plan =
+        MappingPlan::of(marshaller.mapping()).classForElement(elementName);
+    if (plan == nullptr)
+        return qx::fail(error, qx::errors::noDefinitionForElement, quoted);
+    if (!mayBe(*plan, type))
+        return qx::fail(error, qx::errors::rootOfOtherClass, plan->className.string(),
+                        nameOf(type));
+    return true;
+}
+
 // A lenient marshaller gives no object for a root that no class maps to, and no error either:
 // whoever reads in one step is told. So is who asks for a class, before anything is read.
 Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, qx::IndexedXML& document,
                          const std::type_info& type, Ref<Error>* error) {
     const auto root = document.root();
-    const auto noDefinition = [&] {
-        return qx::fail(error, qx::errors::noDefinitionForElement,
-                        [&] { return document.quoted(root); });
-    };
-    const ClassPlan* const plan =
-        root != qx::IndexedXML::none
-            ? MappingPlan::of(marshaller.mapping()).classForElement(document.name(root))
-            : nullptr;
-    if (plan == nullptr)
-        return noDefinition();
-    if (!mayBe(*plan, type))
-        return qx::fail(error, qx::errors::rootOfOtherClass, plan->className.string(),
-                        nameOf(type));
+    const auto quoted = [&] { return document.quoted(root); };
+    const String name = root != qx::IndexedXML::none ? document.name(root) : String();
+    if (!mayRead(marshaller, name, type, error, quoted))
+        return nullptr;
     auto object = qx::detail::readDocument(marshaller, document, error);
     if (!object && error != nullptr && !*error)
-        return noDefinition();
+        return qx::fail(error, qx::errors::noDefinitionForElement, quoted);
     return object;
 }
 
@@ -146,6 +152,45 @@ Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error)
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
     return readStream(stream, typeid(qx::Object), error);
+}
+
+bool QXXMLMarshaller::readEach(const String& path, const String& elementName,
+                               const std::type_info& type, Visitor visitor, Ref<Error>* error) {
+    qx::FileSource source(path);
+    return readEach(source, elementName, type, std::move(visitor), error);
+}
+
+bool QXXMLMarshaller::readEach(std::istream& stream, const String& elementName,
+                               const std::type_info& type, Visitor visitor, Ref<Error>* error) {
+    qx::StreamSource source(stream);
+    return readEach(source, elementName, type, std::move(visitor), error);
+}
+
+bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName,
+                               const std::type_info& type, Visitor visitor, Ref<Error>* error) {
+    reset(error);
+    const Ref<QXXMLMarshaller> held(this); // the visitor may let go of it
+    if (!mayRead(*this, elementName, type, error, [&] { return elementName; }))
+        return false;
+    Ref<Error> failure;
+    bool goesOn = true;
+    qx::XMLPieces pieces(source, elementName, parseOptions(*this));
+    while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
+        qx::IndexedXML document(*piece);
+        qx::detail::Unmarshalling reading(*this, document);
+        document.forEachOutermost(elementName, [&](qx::IndexedXML::Number item) {
+            const auto object = reading.read(item, &failure);
+            if (!object && !failure)
+                qx::fail(&failure, qx::errors::noDefinitionForElement,
+                         [&] { return document.quoted(item); });
+            auto visited = object ? visitor(object) : Visited{false, failure};
+            failure = std::move(visited.error);
+            return goesOn = visited.goesOn;
+        });
+    }
+    if (failure && error != nullptr)
+        *error = failure;
+    return !failure;
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {

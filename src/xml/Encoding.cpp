@@ -2,6 +2,8 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "base/WhiteSpace.h"
+
 #include <algorithm>
 #include <cerrno>
 #include <iconv.h>
@@ -10,6 +12,8 @@
 namespace qx {
 
 namespace {
+
+constexpr std::string_view declarationStart = "<?xml";
 
 bool isAlphanumeric(char c) {
     return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
@@ -47,36 +51,45 @@ iconv_t openConverter(const char* to, const char* from, std::string_view name) {
     return open(to, from);
 }
 
-// False at bytes that mean nothing in the one encoding or cannot be said in the other.
-bool run(iconv_t converter, std::string_view input, std::string& output) {
+enum class Conversion { whole, cutOff, malformed };
+
+// Moves the input behind what was converted: all of it, unless it ends inside a character, or
+// means nothing in the one encoding, or cannot be said in the other.
+Conversion run(iconv_t converter, std::string_view& input, std::string& output) {
     char block[16 * 1024];
     char* from = const_cast<char*>(input.data());
     std::size_t left = input.size();
-    bool flushing = false;
     while (true) {
         char* to = block;
         std::size_t room = sizeof block;
-        const std::size_t result = flushing ? ::iconv(converter, nullptr, nullptr, &to, &room)
-                                            : ::iconv(converter, &from, &left, &to, &room);
+        const std::size_t result = ::iconv(converter, &from, &left, &to, &room);
         const int failure = errno;
         output.append(block, sizeof block - room);
-        if (result != static_cast<std::size_t>(-1)) {
-            if (flushing)
-                return true;
-            flushing = true;
-        } else if (failure != E2BIG) {
-            return false;
-        }
+        input.remove_prefix(input.size() - left);
+        if (result != static_cast<std::size_t>(-1))
+            return Conversion::whole;
+        if (failure != E2BIG)
+            return failure == EINVAL ? Conversion::cutOff : Conversion::malformed;
     }
 }
 
-} // namespace
-
-bool isUTF8Name(std::string_view encoding) noexcept {
-    std::string_view expected = encoding.size() == 4 ? "utf8" : "utf-8";
-    return std::equal(encoding.begin(), encoding.end(), expected.begin(), expected.end(),
-                      [](char a, char b) { return (a >= 'A' && a <= 'Z' ? a + 32 : a) == b; });
+// What the converter still holds back at the end of a text.
+bool flush(iconv_t converter, std::string& output) {
+    char block[64];
+    char* to = block;
+    std::size_t room = sizeof block;
+    const std::size_t result = ::iconv(converter, nullptr, nullptr, &to, &room);
+    output.append(block, sizeof block - room);
+    return result != static_cast<std::size_t>(-1);
 }
+
+// The encoding that the first bytes show: by a byte-order mark, or by how "<?" is stored. Null for
+// none, which leaves encodings that store ASCII as it is.
+struct EncodingSignature {
+    const char* encoding;
+    // How many bytes the byte-order mark takes.
+    std::size_t markSize;
+};
 
 EncodingSignature encodingSignature(std::string_view bytes) noexcept {
     using namespace std::string_view_literals;
@@ -97,16 +110,75 @@ EncodingSignature encodingSignature(std::string_view bytes) noexcept {
     return {nullptr, 0};
 }
 
+} // namespace
+
+bool isUTF8Name(std::string_view encoding) noexcept {
+    std::string_view expected = encoding.size() == 4 ? "utf8" : "utf-8";
+    return std::equal(encoding.begin(), encoding.end(), expected.begin(), expected.end(),
+                      [](char a, char b) { return (a >= 'A' && a <= 'Z' ? a + 32 : a) == b; });
+}
+
+String encodingInDeclaration(std::string_view text) {
+    if (!text.starts_with(declarationStart))
+        return nullptr;
+    text = text.substr(0, text.find("?>"));
+    constexpr std::string_view name = "encoding";
+    const std::size_t at = text.find(name);
+    if (at == std::string_view::npos || !isWhite(text[at - 1]))
+        return nullptr;
+    text = withoutLeadingWhite(text.substr(at + name.size()));
+    if (!text.starts_with('='))
+        return nullptr;
+    text = withoutLeadingWhite(text.substr(1));
+    if (!text.starts_with('"') && !text.starts_with('\''))
+        return nullptr;
+    const std::size_t end = text.find(text.front(), 1);
+    if (end == std::string_view::npos)
+        return nullptr;
+    return text.substr(1, end - 1);
+}
+
+bool DocumentEncoding::isContradictedBy(std::string_view text) const noexcept {
+    return isDeclared && !text.starts_with(declarationStart);
+}
+
+DocumentEncoding encodingOf(std::string_view bytes) {
+    const EncodingSignature signature = encodingSignature(bytes);
+    const bool isSigned = signature.encoding != nullptr;
+    const String name = isSigned ? String(signature.encoding) : encodingInDeclaration(bytes);
+    if (name.isEmpty() || isUTF8Name(name))
+        return {nullptr, signature.markSize, false};
+    return {name, signature.markSize, !isSigned};
+}
+
 DecodeResult decode(std::string_view bytes, const String& encoding, std::string& text) {
-    iconv_t converter = openConverter("UTF-8", encoding.c_str(), encoding);
-    if (converter == noConverter())
+    TextDecoder decoder(encoding);
+    if (!decoder.isKnown())
         return DecodeResult::unknownEncoding;
-    struct Closer {
-        iconv_t converter;
-        ~Closer() { ::iconv_close(converter); }
-    } const closer{converter};
     text.reserve(text.size() + bytes.size() + bytes.size() / 8);
-    return run(converter, bytes, text) ? DecodeResult::decoded : DecodeResult::malformed;
+    const bool isWhole = decoder.decode(bytes, text) && decoder.finish(text);
+    return isWhole ? DecodeResult::decoded : DecodeResult::malformed;
+}
+
+TextDecoder::TextDecoder(const String& encoding) {
+    const iconv_t converter = openConverter("UTF-8", encoding.c_str(), encoding);
+    if (converter != noConverter())
+        _converter.reset(converter);
+}
+
+bool TextDecoder::decode(std::string_view bytes, std::string& text) {
+    std::string joined;
+    if (!_cutOff.empty()) {
+        joined = _cutOff.append(bytes);
+        bytes = joined;
+    }
+    const Conversion result = run(_converter.get(), bytes, text);
+    _cutOff = bytes;
+    return result != Conversion::malformed;
+}
+
+bool TextDecoder::finish(std::string& text) {
+    return _cutOff.empty() && flush(_converter.get(), text);
 }
 
 TextEncoder::TextEncoder(const String& encoding) : _name(encoding) {
@@ -117,9 +189,8 @@ TextEncoder::TextEncoder(const String& encoding) : _name(encoding) {
     _converter.reset(converter);
     // A reader must find the declaration: it looks for "<?xml" as it is, or for a signature.
     std::string start;
-    constexpr std::string_view declaration = "<?xml";
-    if (!convert(declaration, start) ||
-        (start != declaration && encodingSignature(start).encoding == nullptr))
+    if (!convert(declarationStart, start) ||
+        (start != declarationStart && encodingSignature(start).encoding == nullptr))
         throw Exception(Exception::invalidArgument,
                         String::concat({"no document can be written in the encoding ", encoding}));
     std::string ascii;
@@ -128,11 +199,12 @@ TextEncoder::TextEncoder(const String& encoding) : _name(encoding) {
     _lacksASCII = !comesBack(ascii += '\x7F');
 }
 
-void TextEncoder::Closer::operator()(void* converter) const noexcept { ::iconv_close(converter); }
+void ConverterCloser::operator()(void* converter) const noexcept { ::iconv_close(converter); }
 
 bool TextEncoder::convert(std::string_view text, std::string& bytes) {
     ::iconv(_converter.get(), nullptr, nullptr, nullptr, nullptr);
-    return run(_converter.get(), text, bytes);
+    return run(_converter.get(), text, bytes) == Conversion::whole &&
+           flush(_converter.get(), bytes);
 }
 
 bool TextEncoder::comesBack(std::string_view text) {

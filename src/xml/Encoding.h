@@ -12,17 +12,47 @@
 
 namespace qx {
 
+struct ConverterCloser {
+    void operator()(void* converter) const noexcept;
+};
+using ConverterHandle = std::unique_ptr<void, ConverterCloser>;
+
 // "UTF-8" in any case, also without the hyphen.
 bool isUTF8Name(std::string_view encoding) noexcept;
 
-// The encoding that the first bytes show: by a byte-order mark, or by how "<?" is stored. Null for
-// none, which leaves encodings that store ASCII as it is.
-struct EncodingSignature {
-    const char* encoding;
-    // How many bytes the byte-order mark takes.
-    std::size_t markSize;
+// Reads one document, which may come in pieces, as UTF-8; belongs to one thread.
+class TextDecoder {
+public:
+    explicit TextDecoder(const String& encoding);
+    // False for an encoding that is not known: nothing can be decoded then.
+    bool isKnown() const noexcept { return _converter != nullptr; }
+
+    // Appends the bytes as UTF-8; false when they are malformed, behind what came before. A
+    // character that is cut off at the end waits for the next bytes.
+    bool decode(std::string_view bytes, std::string& text);
+    // The document ends here. False in the middle of a character.
+    bool finish(std::string& text);
+
+private:
+    ConverterHandle _converter;
+    std::string _cutOff;
 };
-EncodingSignature encodingSignature(std::string_view bytes) noexcept;
+
+// The value of encoding="…" in the XML declaration that the text begins with; null where there is
+// none. What is wrong with a declaration is for the parser to say.
+String encodingInDeclaration(std::string_view text);
+
+// How a document is stored, as its first bytes show: the signature, or the declaration.
+struct DocumentEncoding {
+    String name; // null for UTF-8
+    // How many bytes the byte-order mark takes.
+    std::size_t markSize = 0;
+    bool isDeclared = false;
+
+    // An encoding that stores ASCII in another way cannot be what the declaration was read in.
+    bool isContradictedBy(std::string_view text) const noexcept;
+};
+DocumentEncoding encodingOf(std::string_view bytes);
 
 enum class DecodeResult { decoded, unknownEncoding, malformed };
 
@@ -48,10 +78,7 @@ private:
     bool convert(std::string_view text, std::string& bytes);
     bool comesBack(std::string_view text);
 
-    struct Closer {
-        void operator()(void* converter) const noexcept;
-    };
-    std::unique_ptr<void, Closer> _converter;
+    ConverterHandle _converter;
     String _name;
     bool _lacksASCII = false;
     std::unordered_map<char32_t, bool> _known;

@@ -65,6 +65,18 @@ public:
             if (index()[at].nodeKind() == kind)
                 visit(at);
     }
+    // Calls visit(Number) for each element of that name that stands in no other of that name, until
+    // it answers false. Of a parsed document only.
+    template <class Visit>
+    void forEachOutermost(const String& name, Visit visit) {
+        const Number end = static_cast<Number>(index().entries().size());
+        for (Number at = 0; at < end;) {
+            const bool isFound = isElement(at) && this->name(at) == name;
+            if (isFound && !visit(at))
+                return;
+            at = isFound ? index().siblingOf(at) : at + 1;
+        }
+    }
     // Of a text, attribute or declaration. Whoever asks for a long one gets the same.
     String value(Number number);
     // All text inside an element, concatenated. Likewise.

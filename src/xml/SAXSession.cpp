@@ -201,8 +201,9 @@ SAXSession::ErrorChannel::ErrorChannel(SAXSession& session) {
 SAXSession::ErrorChannel::~ErrorChannel() { xmlSetStructuredErrorFunc(_user, _function); }
 
 SAXSession::SAXSession(XMLIndex& index, const XMLParseOptions& options)
-    : _text(index.text()), _refusesDoctype(options.refuseDoctype), _builder(index, options),
-      _names(_builder.names()), _subset(options.maximumSubsetSize), _texts(_text), _channel(*this) {
+    : _text(index.text()), _origin(index.origin()), _refusesDoctype(options.refuseDoctype),
+      _builder(index, options), _names(_builder.names()), _subset(options.maximumSubsetSize),
+      _texts(_text), _channel(*this) {
     _context.reset(xmlNewParserCtxt());
     if (_context == nullptr || _lacksMemory)
         throw std::bad_alloc();
@@ -234,10 +235,21 @@ void SAXSession::pushInput() {
         throw std::bad_alloc();
     input->base = input->cur = reinterpret_cast<const xmlChar*>(_text.data());
     input->end = input->base + _text.size();
+    setLine(*input, 0);
     if (inputPush(_context.get(), input) >= 0)
         return;
     xmlFreeInputStream(input);
     throw std::bad_alloc();
+}
+
+// Its messages tell the lines of start tags. The first tag that was added to a piece stands behind
+// a prologue, each other behind the one before it; behind the last the piece begins.
+void SAXSession::setLine(xmlParserInput& input, std::size_t addedTags) {
+    const auto& lines = _origin.tagLines;
+    const std::size_t line = addedTags < lines.size() ? lines[addedTags] : _origin.line;
+    const char* const prologue = _text.data();
+    const char* const tag = prologue + (addedTags == 0 ? _origin.prologue : 0);
+    input.line = static_cast<int>(line) - static_cast<int>(std::count(prologue, tag, '\n'));
 }
 
 // Where memory lacks the parser may go on without the thing that it could not make. A document that
@@ -277,6 +289,8 @@ void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int n
                               const xmlChar** attributes) {
     const void* start = ::memrchr(_text.data(), isInsideReference() ? '&' : '<', offset());
     _tagOffset = start != nullptr ? static_cast<const char*>(start) - _text.data() : 0;
+    if (_tagOffset < _origin.added)
+        setLine(*_context->input, ++_addedTags);
     if (_attributeDefaults != 0)
         countDefaulted(namespaceCount, namespaces, defaultedCount,
                        attributes + 5 * (attributeCount - defaultedCount));

@@ -50,6 +50,7 @@ private:
     };
 
     void pushInput();
+    void setLine(xmlParserInput& input, std::size_t addedTags);
     void startDocument();
     void startSubset(const xmlChar* name, const xmlChar* publicID, const xmlChar* systemID);
     void endSubset();
@@ -85,6 +86,8 @@ private:
     };
 
     std::string_view _text;
+    const TextOrigin _origin;
+    std::size_t _addedTags = 0; // seen so far
     const bool _refusesDoctype;
     XMLIndexBuilder _builder;
     XMLNames& _names;

@@ -35,10 +35,10 @@ const char* skipBlanks(const char* from, const char* to) noexcept {
 } // namespace
 
 void TextPosition::moveTo(std::size_t offset) {
-    offset = std::min(offset, _text.size());
+    offset = std::min(offset - std::min(offset, _added), _text.size());
     if (offset < _at.offset) {
         const std::size_t passed = offset / blockSize;
-        _at = passed != 0 ? _passed[passed - 1] : Place();
+        _at = passed != 0 ? _passed[passed - 1] : _start;
     }
     for (std::size_t end = 0; (end = (_at.offset / blockSize + 1) * blockSize) <= offset;) {
         advance(end);

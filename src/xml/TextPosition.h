@@ -10,10 +10,22 @@
 
 namespace qx {
 
+// Where a text that is one piece of a document begins in it. What was put before the piece, to make
+// it a document, stands at that place as a whole.
+struct TextOrigin {
+    std::size_t added = 0; // bytes before the piece: a prologue, and start tags
+    std::size_t prologue = 0;
+    std::size_t line = 1;
+    std::size_t column = 1;
+    std::vector<std::size_t> tagLines; // of the tags among what was added
+};
+
 class TextPosition {
 public:
     // The text must outlive the position, which starts at its first character.
-    explicit TextPosition(std::string_view text) noexcept : _text(text) {}
+    explicit TextPosition(std::string_view text, const TextOrigin& origin = {}) noexcept
+        : _text(text.substr(origin.added)),
+          _added(origin.added), _start{0, origin.line, origin.column}, _at(_start) {}
 
     void moveTo(std::size_t offset);
 
@@ -31,6 +43,8 @@ private:
     void advance(std::size_t offset) noexcept;
 
     std::string_view _text;
+    const std::size_t _added;
+    const Place _start;
     Place _at;
     std::vector<Place> _passed; // one for each block of the text: where the block ends
 };

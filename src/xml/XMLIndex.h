@@ -31,6 +31,8 @@
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/xml/XMLNode.h>
 
+#include "xml/TextPosition.h"
+
 #include <span>
 #include <vector>
 
@@ -79,9 +81,11 @@ public:
     using Number = std::uint32_t; // of an entry
     static constexpr std::uint32_t mostNames = 1U << 24U;
 
-    explicit XMLIndex(std::string_view text) noexcept : _text(text) {}
+    explicit XMLIndex(std::string_view text, const TextOrigin& origin = {}) noexcept
+        : _text(text), _origin(origin) {}
 
     std::string_view text() const noexcept { return _text; }
+    const TextOrigin& origin() const noexcept { return _origin; }
     std::span<const XMLIndexEntry> entries() const noexcept { return _entries; }
     const XMLIndexEntry& operator[](Number number) const noexcept { return _entries[number]; }
 
@@ -133,6 +137,7 @@ private:
     std::string_view workedOut(const XMLIndexEntry& entry, std::string& room) const;
 
     std::string_view _text;
+    TextOrigin _origin;
     std::vector<XMLIndexEntry> _entries;
     std::vector<String> _names;
     std::string _aside;

@@ -20,6 +20,8 @@ public:
     // Bytes that are not copied stay where they are as long as this, and a zero byte follows them.
     // Throws ParseFailure; text() is then what could be read up to its place.
     void read(std::string_view bytes, bool copies);
+    // Likewise, of text that is UTF-8 already.
+    void take(std::string text);
 
     // A zero byte follows it.
     std::string_view text() const noexcept { return _text; }
@@ -31,6 +33,7 @@ private:
     bool decodeBytes(std::string_view bytes);
     void convert(std::string_view bytes, const String& encoding);
     void checkStart() const;
+    void checkTags() const;
 
     std::string_view _text;
     std::string _own;

@@ -29,7 +29,7 @@ public:
     // that the index shows, if any.
     explicit XMLNodeMaker(const XMLIndex& index, XMLNodeTable* table = nullptr,
                           const XMLTreeIndexer* tree = nullptr)
-        : _index(index), _table(table), _tree(tree), _position(index.text()),
+        : _index(index), _table(table), _tree(tree), _position(index.text(), index.origin()),
           _blocks(MemoryBlocks::ofNodes()) {}
 
     // All nodes of the document, which has none.

@@ -1,7 +1,6 @@
 #include "xml/XMLParser.h"
 
 #include "xml/SAXSession.h"
-#include "xml/TextPosition.h"
 #include "xml/XMLScanner.h"
 
 namespace qx {
@@ -22,22 +21,38 @@ XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
     const auto parsed = std::make_shared<ParsedDocument>();
     parsed->_owner = std::move(owner);
     XMLInput& input = parsed->_input;
-    XMLIndex& index = parsed->_index;
     try {
         input.read(bytes, !parsed->_owner);
-        index = XMLIndex(input.text());
-        if (way == Way::cParserOnly || !XMLScanner::scan(index, options))
-            SAXSession(index, options).run();
+        parsed->_index = XMLIndex(input.text());
+        fill(parsed->_index, options, way);
         return parsed;
     } catch (const ParseFailure& failure) {
-        if (error == nullptr)
-            return nullptr;
-        TextPosition place(input.text());
-        place.moveTo(failure.offset);
-        *error = make<Error>(Error::parserDomain, *failure.text, failure.code, failure.arguments,
-                             place.line(), place.column());
+        if (error != nullptr)
+            *error = errorOf(failure, input.text());
         return nullptr;
     }
+}
+
+XMLParser::Parsed XMLParser::parsePiece(std::string text, const TextOrigin& origin,
+                                        const XMLParseOptions& options) {
+    const auto parsed = std::make_shared<ParsedDocument>();
+    parsed->_input.take(std::move(text));
+    parsed->_index = XMLIndex(parsed->_input.text(), origin);
+    fill(parsed->_index, options, Way::fastest);
+    return parsed;
+}
+
+void XMLParser::fill(XMLIndex& index, const XMLParseOptions& options, Way way) {
+    if (way == Way::cParserOnly || !XMLScanner::scan(index, options))
+        SAXSession(index, options).run();
+}
+
+Ref<Error> XMLParser::errorOf(const ParseFailure& failure, std::string_view text,
+                              const TextOrigin& origin) {
+    TextPosition place(text, origin);
+    place.moveTo(failure.offset);
+    return make<Error>(Error::parserDomain, *failure.text, failure.code, failure.arguments,
+                       place.line(), place.column());
 }
 
 } // namespace qx

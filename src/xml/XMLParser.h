@@ -6,6 +6,7 @@
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
+#include "xml/ParseFailure.h"
 #include "xml/ParsedDocument.h"
 
 #include <memory>
@@ -24,11 +25,17 @@ public:
     static Parsed parse(Ref<const Data> data, const XMLParseOptions& options, Ref<Error>* error);
     static Parsed parseCopy(XMLBytes bytes, const XMLParseOptions& options, Ref<Error>* error,
                             Way way = Way::fastest);
+    // Of one piece of a document, which is UTF-8. Throws ParseFailure.
+    static Parsed parsePiece(std::string text, const TextOrigin& origin,
+                             const XMLParseOptions& options);
+    static Ref<Error> errorOf(const ParseFailure& failure, std::string_view text,
+                              const TextOrigin& origin = {});
 
 private:
     // Copies the bytes where they have no owner.
     static Parsed run(std::string_view bytes, Ref<const Data> owner, const XMLParseOptions& options,
                       Ref<Error>* error, Way way);
+    static void fill(XMLIndex& index, const XMLParseOptions& options, Way way);
 };
 
 } // namespace qx

@@ -74,7 +74,7 @@ bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options) {
         XMLScanner(index, options).scanDocument();
         return true;
     } catch (const Refused&) {
-        index = XMLIndex(index.text());
+        index = XMLIndex(index.text(), index.origin());
         return false;
     }
 }

@@ -183,8 +183,8 @@ TEST(Reentrance, TheTextThatIsReadMayBeChangedMeanwhile) {
     const std::string expected = scenario::read(*marshaller, text);
     const auto forgetText = [&] { text = std::string(); };
     std::string shown;
-    for (int call = 0; Meddling::during(call, forgetText,
-                                        [&] { shown = scenario::read(*marshaller, text); });
+    for (int call = 0;
+         Meddling::during(call, forgetText, [&] { shown = scenario::read(*marshaller, text); });
          ++call) {
         ASSERT_EQ(shown, expected) << "at call " << call;
         text = document();

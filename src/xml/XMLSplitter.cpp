@@ -1,0 +1,218 @@
+#include "xml/XMLSplitter.h"
+
+#include "base/WhiteSpace.h"
+
+#include <array>
+
+namespace qx {
+
+namespace {
+
+constexpr std::string_view comment = "<!--";
+constexpr std::string_view cdata = "<![CDATA[";
+constexpr std::string_view doctype = "<!DOCTYPE";
+
+bool isWhiteAt(std::string_view text, std::size_t at) noexcept {
+    return at < text.size() && isWhite(text[at]);
+}
+
+// What ends the plain run of bytes in a tag.
+constexpr std::array<bool, 256> tagMarks() {
+    std::array<bool, 256> marks{};
+    for (const unsigned char c : {'"', '\'', '<', '>'})
+        marks[c] = true;
+    return marks;
+}
+
+} // namespace
+
+void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
+    _text = text;
+    while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext()) {
+    }
+    _text = {};
+}
+
+void XMLSplitter::removeUpToCut() {
+    _at -= _cut;
+    _cut = 0;
+    _itemCount = 0;
+    for (Open& open : _open)
+        open.place = none;
+}
+
+std::string XMLSplitter::opening() const {
+    std::string text = _prologue;
+    for (const Open& open : _open)
+        text += open.tag;
+    return text += _root;
+}
+
+std::string XMLSplitter::closing() const {
+    std::string text;
+    for (auto open = _open.rbegin(); open != _open.rend(); ++open)
+        text.append("</").append(open->name()).append(">");
+    return text;
+}
+
+bool XMLSplitter::fail() {
+    _isFaulty = true;
+    return false;
+}
+
+// Behind something that is whole. False where the text ends before.
+bool XMLSplitter::pass(End end) {
+    if (end == none)
+        return false;
+    _at = end;
+    if (_depth == 0 && (!_open.empty() || !_root.empty()))
+        _cut = end;
+    return true;
+}
+
+bool XMLSplitter::goOverNext() {
+    if (_text[_at] != '<')
+        return pass(_text.find('<', _at));
+    if (_at + 1 == _text.size())
+        return false;
+    switch (_text[_at + 1]) {
+    case '/':
+        return goOverEndTag();
+    case '!':
+        return goOverDeclaration();
+    case '?':
+        return goOverInstruction();
+    default:
+        return goOverStartTag();
+    }
+}
+
+XMLSplitter::End XMLSplitter::behind(std::string_view mark, std::size_t from) const {
+    const std::size_t at = _text.find(mark, from);
+    return at != none ? at + mark.size() : none;
+}
+
+bool XMLSplitter::goOverDeclaration() {
+    const std::string_view rest = _text.substr(_at);
+    if (rest.starts_with(comment))
+        return pass(behind("-->", _at + comment.size()));
+    if (rest.starts_with(cdata))
+        return pass(behind("]]>", _at + cdata.size()));
+    for (const std::string_view start : {comment, cdata, doctype})
+        if (rest.size() < start.size() && start.starts_with(rest))
+            return false;
+    if (!rest.starts_with(doctype) || !_open.empty() || !_root.empty())
+        return fail();
+    const End end = endOfDoctype();
+    if (end != none)
+        _prologue += _text.substr(_at, end - _at);
+    return pass(end);
+}
+
+// Its own ">": none of the declarations in it.
+XMLSplitter::End XMLSplitter::endOfDoctype() const {
+    bool isInSubset = false;
+    std::size_t at = _at + doctype.size();
+    while ((at = _text.find_first_of("\"'[]<>", at)) != none) {
+        const char c = _text[at];
+        if (c == '>' && !isInSubset)
+            return at + 1;
+        if (c == '[' || c == ']')
+            isInSubset = c == '[';
+        if (c == '"' || c == '\'')
+            at = behind({&c, 1}, at + 1);
+        else if (_text.substr(at).starts_with(comment))
+            at = behind("-->", at + comment.size());
+        else if (_text.substr(at).starts_with("<?"))
+            at = behind("?>", at);
+        else
+            ++at;
+        if (at == none)
+            break;
+    }
+    return none;
+}
+
+bool XMLSplitter::goOverInstruction() {
+    const End end = behind("?>", _at);
+    const bool isDeclaration = _at == 0 && _open.empty() && _root.empty() &&
+                               _text.starts_with("<?xml") && isWhiteAt(_text, 5);
+    if (isDeclaration && end != none)
+        _prologue = _text.substr(0, end);
+    return pass(end);
+}
+
+// Behind the ">" that no quotes hold.
+XMLSplitter::End XMLSplitter::endOfTag() {
+    static constexpr auto marks = tagMarks();
+    std::size_t at = _at + 1;
+    while (true) {
+        while (at < _text.size() && !marks[static_cast<unsigned char>(_text[at])])
+            ++at;
+        if (at == _text.size())
+            return none;
+        const char c = _text[at];
+        if (c == '>')
+            return at + 1;
+        if (c == '<')
+            break;
+        const std::size_t quote = _text.find(c, at + 1);
+        const std::string_view value = _text.substr(at + 1, quote - at - 1);
+        if (value.find('<') != none)
+            break;
+        if (quote == none)
+            return none;
+        at = quote + 1;
+    }
+    fail();
+    return none;
+}
+
+bool XMLSplitter::goOverStartTag() {
+    const End end = endOfTag();
+    if (end == none)
+        return false;
+    const std::string_view tag = _text.substr(_at, end - _at);
+    const bool isEmpty = tag[tag.size() - 2] == '/';
+    if (_depth != 0) {
+        _depth += isEmpty ? 0 : 1;
+        return pass(end);
+    }
+    if (_open.empty() && !_root.empty())
+        return fail();
+    const std::size_t nameSize = tag.find_first_of(" \t\r\n/>") - 1;
+    const bool isItem = tag.substr(1, nameSize) == _itemName;
+    if (isItem)
+        _depth = 1;
+    else
+        _open.push_back({std::string(tag), nameSize, _at});
+    return isEmpty ? endElement(end) : pass(end);
+}
+
+bool XMLSplitter::goOverEndTag() {
+    const std::size_t mark = _text.find_first_of("<>", _at + 1);
+    if (mark == none)
+        return false;
+    if (_text[mark] == '<')
+        return fail();
+    const End end = mark + 1;
+    if (_depth == 0) {
+        const std::string_view name = _text.substr(_at + 2, end - _at - 3);
+        if (_open.empty() || withoutTrailingWhite(name) != _open.back().name())
+            return fail();
+    }
+    return endElement(end);
+}
+
+bool XMLSplitter::endElement(End end) {
+    if (_depth == 0)
+        _open.pop_back();
+    else if (--_depth == 0)
+        ++_itemCount;
+    // No name of an item, whatever the root was called.
+    if (_depth == 0 && _open.empty())
+        _root = _itemName == "a" ? "<b/>" : "<a/>";
+    return pass(end);
+}
+
+} // namespace qx

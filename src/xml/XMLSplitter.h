@@ -1,0 +1,87 @@
+#pragma once
+
+// Finds where a document can be cut, so that each piece, with the tags that are open around it, is
+// a document of its own. It goes over the text tag by tag and checks next to nothing: whoever
+// parses the pieces finds the faults. A document can be cut behind
+//
+// 1. a start tag, an end tag, a text, a comment or an instruction outside of the items: elements of
+//    one name that stand in no other of that name,
+// 2. an item as a whole,
+//
+// but not before its root begins. The same text may be shown again, longer, until there is a cut.
+
+#include <QXXMLMarshalling/base/String.h>
+
+#include "xml/XMLIndex.h"
+
+#include <string>
+#include <vector>
+
+namespace qx {
+
+class XMLSplitter {
+public:
+    static constexpr std::size_t none = std::string_view::npos;
+
+    explicit XMLSplitter(String itemName) : _itemName(std::move(itemName)) {}
+
+    // Goes on until a cut at `enough` bytes or more, or as far as whole tags reach. Always shown
+    // with what it was shown before, from the last removal on.
+    void goOver(std::string_view text, std::size_t enough);
+    // The last place found where the text can be cut; 0 where there is none.
+    std::size_t cut() const noexcept { return _cut; }
+    // How many items end before it.
+    std::size_t itemCount() const noexcept { return _itemCount; }
+    // Up to where it came: inside what begins there the text ends.
+    std::size_t position() const noexcept { return _at; }
+    // The text does not go on as a document could.
+    bool isFaulty() const noexcept { return _isFaulty; }
+    // Where the text up to the cut goes.
+    void removeUpToCut();
+
+    // What makes a document of the text that follows the cut, before and behind it: the prologue
+    // and the start tags, and the end tags.
+    std::string opening() const;
+    std::string closing() const;
+    std::size_t prologueSize() const noexcept { return _prologue.size(); }
+    // How many tags are open, and where those begin that have come since the last removal, in the
+    // text; none of others.
+    std::size_t openCount() const noexcept { return _open.size(); }
+    std::size_t placeOfOpen(std::size_t i) const noexcept { return _open[i].place; }
+    bool hasRootEnded() const noexcept { return !_root.empty(); }
+
+private:
+    struct Open {
+        std::string tag; // the whole start tag
+        std::size_t nameSize;
+        std::size_t place;
+        std::string_view name() const noexcept { return std::string_view(tag).substr(1, nameSize); }
+    };
+    // Where something ends; none where the text ends before.
+    using End = std::size_t;
+
+    bool goOverNext();
+    bool goOverDeclaration();
+    bool goOverInstruction();
+    bool goOverStartTag();
+    bool goOverEndTag();
+    bool endElement(End end);
+    End behind(std::string_view mark, std::size_t from) const;
+    End endOfTag();
+    End endOfDoctype() const;
+    bool pass(End end);
+    bool fail();
+
+    String _itemName;
+    std::string_view _text;
+    std::size_t _at = 0;
+    std::size_t _cut = 0;
+    std::size_t _itemCount = 0;
+    std::size_t _depth = 0; // of elements inside an item
+    bool _isFaulty = false;
+    std::string _prologue; // the declaration and the DOCTYPE
+    std::vector<Open> _open;
+    std::string _root; // an empty element in its place, once it has ended
+};
+
+} // namespace qx

@@ -1,0 +1,54 @@
+#include "xml/XMLTextSource.h"
+
+#include "xml/ParseFailure.h"
+
+namespace qx {
+
+bool XMLTextSource::readBytes(std::size_t most, std::string& to, Ref<Error>* error) {
+    const std::size_t before = to.size();
+    to.resize(before + most);
+    const auto count = _bytes.read(to.data() + before, most, error);
+    to.resize(before + count.value_or(0));
+    _isAtEnd = count == std::size_t(0);
+    _isWaiting = count.value_or(0) < most;
+    _bytesRead += count.value_or(0);
+    return count.has_value();
+}
+
+// The bytes in which the encoding shows.
+bool XMLTextSource::readStart(Ref<Error>* error) {
+    constexpr std::size_t longestDeclaration = 4096;
+    while (!_isAtEnd && _raw.size() < longestDeclaration &&
+           (_raw.size() < 5 || (_raw.starts_with("<?xml") && _raw.find("?>") == std::string::npos)))
+        if (!readBytes(longestDeclaration, _raw, error))
+            return false;
+    _encoding = encodingOf(_raw);
+    _raw.erase(0, _encoding->markSize);
+    if (_encoding->name.isNull())
+        return true;
+    _decoder.emplace(_encoding->name);
+    if (!_decoder->isKnown())
+        throw ParseFailure(parseErrors::unknownEncoding, {_encoding->name}, 0);
+    return true;
+}
+
+bool XMLTextSource::read(std::size_t most, std::string& text, Ref<Error>* error) {
+    const bool isStart = !_encoding;
+    if (!(isStart ? readStart(error) : readBytes(most, _decoder ? _raw : text, error)))
+        return false;
+    if (_decoder)
+        decode(text);
+    else
+        text += _raw;
+    _raw.clear();
+    if (isStart && _encoding->isContradictedBy(text))
+        throw ParseFailure(parseErrors::otherEncoding, {_encoding->name}, 0);
+    return true;
+}
+
+void XMLTextSource::decode(std::string& text) {
+    if (!_decoder->decode(_raw, text) || (_isAtEnd && !_decoder->finish(text)))
+        throw ParseFailure(parseErrors::malformedCharacter, {_encoding->name}, text.size());
+}
+
+} // namespace qx
