@@ -5,6 +5,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 
 #include "files/Files.h"
+#include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
 #include "model/TypeNames.h"
@@ -83,6 +84,71 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parse
     return objectOf(marshaller, document, type, error);
 }
 
+// What the reading of the new object does is no change of the one that is there.
+class NoUndo {
+public:
+    explicit NoUndo(Ref<qx::UndoManager> manager) : _manager(std::move(manager)) {
+        _manager->disableUndoRegistration();
+    }
+    ~NoUndo() { _manager->enableUndoRegistration(); }
+    NoUndo(const NoUndo&) = delete;
+    NoUndo& operator=(const NoUndo&) = delete;
+
+private:
+    const Ref<qx::UndoManager> _manager;
+};
+
+qx::Object& present(qx::Object* object) {
+    if (object == nullptr)
+        throw qx::Exception(qx::Exception::invalidArgument, "there is no object to read into");
+    return *object;
+}
+
+// The C++ type that the root has to be of, as far as that is asked before it is read.
+const std::type_info& typeOf(qx::Object& object) {
+    if (!object.isa().isStruct())
+        return typeid(qx::Object);
+    const auto& held = static_cast<qx::detail::StructObject&>(object);
+    if (held.as(held.type()) == nullptr)
+        throw qx::Exception(qx::Exception::invalidArgument,
+                            "the struct that is to be read into was moved away");
+    return held.type();
+}
+
+bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& document,
+          Ref<Error>* error) {
+    // The object's own code may let go of either.
+    const Ref<QXXMLMarshaller> kept(&marshaller);
+    const Ref<qx::Object> held(&object);
+    // Without a slot a reading leaves out what fails.
+    Ref<Error> problem;
+    Ref<qx::Object> fresh;
+    {
+        const NoUndo noUndo(marshaller.undoManager());
+        fresh = objectOf(marshaller, document, typeOf(object), &problem);
+    }
+    bool isRead = fresh.get() != nullptr;
+    if (isRead && !qx::detail::Reloading::isOfSameClass(object, *fresh))
+        isRead = qx::fail(&problem, qx::errors::rootOfOtherClass, fresh->classNameForMarshalling(),
+                          object.classNameForMarshalling());
+    if (isRead) {
+        const MappingPlan& plan = MappingPlan::of(marshaller.mapping());
+        const ClassPlan* root = plan.classForElement(document.name(document.root()));
+        isRead = qx::detail::Reloading(plan).run(*root, object, *fresh, &problem);
+    }
+    if (error != nullptr)
+        *error = std::move(problem);
+    return isRead;
+}
+
+bool fill(QXXMLMarshaller& marshaller, qx::Object& object, const qx::XMLParser::Parsed& parsed,
+          Ref<Error>* error) {
+    if (!parsed)
+        return false;
+    qx::IndexedXML document(*parsed);
+    return fill(marshaller, object, document, error);
+}
+
 // What no XML document can hold, or none that could be read again, raises while it is written.
 template <class Result, class Write>
 Result written(Write write, Ref<Error>* error) {
@@ -145,6 +211,34 @@ Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, Ref<Error>* error)
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* error) {
     return readStream(stream, typeid(qx::Object), error);
+}
+
+bool QXXMLMarshaller::readBytesInto(qx::Object* object, qx::XMLBytes xml, Ref<Error>* error) {
+    reset(error);
+    return fill(*this, present(object), qx::XMLParser::parseLent(xml, parseOptions(*this), error),
+                error);
+}
+
+bool QXXMLMarshaller::readFileInto(qx::Object* object, const String& path, Ref<Error>* error) {
+    reset(error);
+    auto data = qx::readFile(path, error);
+    return data && fill(*this, present(object),
+                        qx::XMLParser::parse(std::move(data), parseOptions(*this), error), error);
+}
+
+bool QXXMLMarshaller::readInputInto(qx::Object* object, std::istream& stream, Ref<Error>* error) {
+    reset(error);
+    auto data = qx::readStream(stream, error);
+    return data && fill(*this, present(object),
+                        qx::XMLParser::parse(std::move(data), parseOptions(*this), error), error);
+}
+
+bool QXXMLMarshaller::readTreeInto(qx::Object* object, XMLDocument* document, Ref<Error>* error) {
+    reset(error);
+    if (document == nullptr)
+        return qx::fail(error, qx::errors::noDefinitionForElement, document);
+    qx::IndexedXML read(*document);
+    return fill(*this, present(object), read, error);
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {

@@ -134,4 +134,12 @@ Value sharedStruct(StructPlace whole, StructPlace base, const std::shared_ptr<co
     return StructInternals::withClass(make<SharedStruct>(*shared.type, std::move(place)), known);
 }
 
+bool TakeOver::mergeStructs(StructPlace held, StructPlace fresh, bool isShared) {
+    if (*held.type != *fresh.type)
+        return false;
+    StructObject taking(*held.type, held.place);
+    StructObject taken(*fresh.type, fresh.place);
+    return mergeStructs(taking, taken, isShared);
+}
+
 } // namespace qx::detail

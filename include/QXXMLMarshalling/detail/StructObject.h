@@ -125,6 +125,22 @@ bool takeStruct(const Value& value, Take take) {
     return true;
 }
 
+// Calls with the object, with that of a Ref, which may be null, or with the struct as an object.
+template <class T, class Call>
+auto withObject(T& held, Call call) {
+    if constexpr (std::derived_from<T, Object>) {
+        return call(&held);
+    } else if constexpr (requires {
+                             { held.get() } -> std::convertible_to<Object*>;
+                         }) {
+        return call(held.get());
+    } else {
+        const StructPlace whole = wholeOf(held);
+        StructObject object(*whole.type, whole.place);
+        return call(&object);
+    }
+}
+
 template <class T, class Base>
 constexpr StructType structType() {
     StructType type{};
