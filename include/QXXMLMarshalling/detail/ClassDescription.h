@@ -76,11 +76,14 @@ Value toValue(T&& value) {
     return ValueTraits<Stored<T>>::toValue(std::forward<T>(value));
 }
 
-// The object as a T, or the T that it holds; null where the struct was moved out.
+// The object as a T, or the T that it holds; null where the struct was moved out. From a virtual
+// base only a dynamic cast leads there.
 template <class T>
 const T* instanceIn(const Object& object) {
-    if constexpr (std::derived_from<T, Object>)
+    if constexpr (requires { static_cast<const T*>(&object); })
         return static_cast<const T*>(&object);
+    else if constexpr (std::derived_from<T, Object>)
+        return dynamic_cast<const T*>(&object);
     else
         return static_cast<const T*>(static_cast<const StructObject&>(object).as(typeid(T)));
 }
