@@ -12,6 +12,7 @@
 
 #include <concepts>
 #include <memory>
+#include <new>
 #include <type_traits>
 #include <typeinfo>
 #include <utility>
@@ -33,6 +34,10 @@ public:
     // Refers to the struct, which lives on somewhere else.
     StructObject(const std::type_info& type, const void* place) noexcept
         : StructObject(type, const_cast<void*>(place), false) {}
+    static void* operator new(std::size_t size);
+    static void* operator new(std::size_t size, std::align_val_t alignment);
+    static void operator delete(void* memory) noexcept;
+    static void operator delete(void* memory, std::align_val_t alignment) noexcept;
 
     const std::type_info& type() const noexcept { return *_type; }
     // The struct as that type: its own, or one that its class was derived from when it was
