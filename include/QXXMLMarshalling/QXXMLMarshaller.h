@@ -171,6 +171,51 @@ public:
         return readEach(source, elementName, typeid(T), visitor, error);
     }
 
+    // Read into an object that is there, so that it equals what the operations above would make of
+    // the document: a reload. It is a plain struct that was described, an object, or a Ref to one.
+    // True when it was done; the slot is set to null first.
+    //
+    // - What the mapping has a field for is set, to what a new object has where the document does
+    //   not say; what it has none for stays. Unknown XML that was kept gives way to the document's.
+    // - Objects that it holds, and structs behind pointers, stay and are read into where the
+    //   document has one of the same class in that place; items of collections go by their place.
+    //   Structs in objects that have an undo manager are replaced.
+    // - Observers hear of the keys whose values differ, and of those that hold structs. For an
+    //   object with an undo manager it is one group, which covers the objects that it holds, too.
+    //
+    // The document is read into a new object first, which registers no undo: whatever fails there
+    // leaves yours as it was, with the errors above or with
+    //   -211  "The root is of class: %@, not of class: %@"   (the root's, the object's)
+    // Only what the object itself refuses of values that a new one took (-222), or what its setters
+    // and observers throw, ends it halfway; undoing the group takes back what was done. A null Ref
+    // and a box whose struct was moved away raise NSInvalidArgumentException.
+    template <qx::Reloadable T>
+    bool readInto(T&& object, const qx::String& path, qx::Ref<qx::Error>* error = nullptr) {
+        return qx::detail::withObject(
+            object, [&](qx::Object* held) { return readFileInto(held, path, error); });
+    }
+    template <qx::Reloadable T>
+    bool readStringInto(T&& object, qx::XMLBytes xml, qx::Ref<qx::Error>* error = nullptr) {
+        return qx::detail::withObject(
+            object, [&](qx::Object* held) { return readBytesInto(held, xml, error); });
+    }
+    template <qx::Reloadable T>
+    bool readStreamInto(T&& object, std::istream& stream, qx::Ref<qx::Error>* error = nullptr) {
+        return qx::detail::withObject(
+            object, [&](qx::Object* held) { return readInputInto(held, stream, error); });
+    }
+    template <qx::Reloadable T>
+    bool unmarshallInto(T&& object, qx::XMLDocument* document,
+                        qx::Ref<qx::Error>* error = nullptr) {
+        return qx::detail::withObject(
+            object, [&](qx::Object* held) { return readTreeInto(held, document, error); });
+    }
+    template <qx::Reloadable T, std::derived_from<qx::XMLDocument> D>
+    bool unmarshallInto(T&& object, const qx::Ref<D>& document,
+                        qx::Ref<qx::Error>* error = nullptr) {
+        return unmarshallInto(object, document.get(), error);
+    }
+
     // Marshall and serialise in one step, one element a line. The slot is set to null first. The
     // string is null on failure; a file
     // is replaced atomically, and untouched on failure. Besides the errors of marshall() and of
@@ -341,6 +386,10 @@ private:
         }
     }
 
+    bool readFileInto(qx::Object* object, const qx::String& path, qx::Ref<qx::Error>* error);
+    bool readBytesInto(qx::Object* object, qx::XMLBytes xml, qx::Ref<qx::Error>* error);
+    bool readInputInto(qx::Object* object, std::istream& stream, qx::Ref<qx::Error>* error);
+    bool readTreeInto(qx::Object* object, qx::XMLDocument* document, qx::Ref<qx::Error>* error);
     // -211 for an object that is not of that type.
     static qx::Ref<qx::Error> wrongClass(const qx::Object& object, const std::type_info& type);
 

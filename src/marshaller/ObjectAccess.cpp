@@ -75,12 +75,12 @@ SetOutcome ObjectAccess::setProperty(Object& object, Key key, const Value& value
                : SetOutcome::refused;
 }
 
-namespace {
-
-Key keyOf(KeptXML what) {
+Key ObjectAccess::keyOf(KeptXML what) {
     static const Key keys[] = {"unboundChildren", "unboundAttributes", "__namespaces"};
     return keys[static_cast<std::size_t>(what)];
 }
+
+namespace {
 
 // Whether it is the first time in the process that this is said of the class.
 bool isFirst(const Class& type, const char* message) {
@@ -134,6 +134,20 @@ bool ObjectAccess::setKept(Object& object, KeptXML what, Value value, Ref<Error>
         return fail(error, errors::unableToSetValue, value, key.string(), object.isa().name());
     if (outcome == SetOutcome::unknownKey && !std::exchange(isLacking, true))
         warnOnce(object.isa(), unknownXMLIsDropped);
+    return true;
+}
+
+bool ObjectAccess::adopt(Object& item, Object& parent, Ref<Error>* error) {
+    // A struct moves to where it is held: there is no parent to tell it, and none that it could be.
+    if (plainRecord(item) != nullptr || item.isa().isStruct() || parent.isa().isStruct())
+        return true;
+    const Operation* setParent = hooksOf(item).setParent;
+    if (setParent == nullptr)
+        return true;
+    const Value argument(&parent);
+    if (!setParent->takes({&argument, 1}))
+        return fail(error, errors::unableToSetValue, argument, "parent", item.isa().name());
+    send(item, *setParent, argument);
     return true;
 }
 

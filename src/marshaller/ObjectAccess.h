@@ -61,6 +61,12 @@ public:
     // each class.
     bool setKept(Object& object, KeptXML what, Value value, Ref<Error>* error);
 
+    // Tells the item of the object that is to hold it, which comes before that one gets it. False
+    // with -222 when the item does not take such a parent.
+    bool adopt(Object& item, Object& parent, Ref<Error>* error);
+    // The key under which objects have it.
+    static Key keyOf(KeptXML what);
+
     // Whether an item of a collection is written: when it says that it cannot be removed, as
     // records and structs do. One that says nothing is not.
     bool isToBeWritten(Object& item);

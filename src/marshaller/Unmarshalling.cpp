@@ -196,21 +196,6 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
     return _access.setKept(target.object, KeptXML::namespaces, kept, error);
 }
 
-bool Unmarshalling::adopt(Object& item, Object& parent, ErrorSlot error) {
-    // A struct moves to where it is held: there is no parent to tell it, and none that it could be.
-    if (ObjectAccess::plainRecord(item) != nullptr || item.isa().isStruct() ||
-        parent.isa().isStruct())
-        return true;
-    const Operation* setParent = _access.hooksOf(item).setParent;
-    if (setParent == nullptr)
-        return true;
-    const Value argument(&parent);
-    if (!setParent->takes({&argument, 1}))
-        return fail(error, errors::unableToSetValue, argument, "parent", item.isa().name());
-    ObjectAccess::send(item, *setParent, argument);
-    return true;
-}
-
 namespace {
 
 // One group for what a reading registers. It closes however the reading ends, with the groups that

@@ -74,7 +74,9 @@ public:
     }
     // Tells the item of the object that is to hold it, which comes before that one gets it. False
     // when the item does not take such a parent.
-    bool adopt(Object& item, Object& parent, ErrorSlot error);
+    bool adopt(Object& item, Object& parent, ErrorSlot error) {
+        return _access.adopt(item, parent, error);
+    }
 
 private:
     // An object that is being bound, and those whose binding led to it.

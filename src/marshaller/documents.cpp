@@ -5,6 +5,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 
 #include "files/Files.h"
+#include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
 #include "model/TypeNames.h"
@@ -89,13 +90,75 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parse
     return objectOf(marshaller, document, type, error);
 }
 
-Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, Ref<qx::Data> data,
-                         const std::type_info& type, Ref<Error>* error) {
-    if (!data)
-        return nullptr;
-    return objectOf(marshaller,
-                    qx::XMLParser::parse(std::move(data), parseOptions(marshaller), error), type,
-                    error);
+// Null for no data.
+qx::XMLParser::Parsed parsed(const QXXMLMarshaller& marshaller, Ref<qx::Data> data,
+                             Ref<Error>* error) {
+    return data ? qx::XMLParser::parse(std::move(data), parseOptions(marshaller), error) : nullptr;
+}
+
+// What the reading of the new object does is no change of the one that is there.
+class NoUndo {
+public:
+    explicit NoUndo(Ref<qx::UndoManager> manager) : _manager(std::move(manager)) {
+        _manager->disableUndoRegistration();
+    }
+    ~NoUndo() { _manager->enableUndoRegistration(); }
+    NoUndo(const NoUndo&) = delete;
+    NoUndo& operator=(const NoUndo&) = delete;
+
+private:
+    const Ref<qx::UndoManager> _manager;
+};
+
+qx::Object& present(qx::Object* object) {
+    if (object == nullptr)
+        throw qx::Exception(qx::Exception::invalidArgument, "there is no object to read into");
+    return *object;
+}
+
+// The C++ type that the root has to be of, as far as that is asked before it is read.
+const std::type_info& typeOf(qx::Object& object) {
+    if (!object.isa().isStruct())
+        return typeid(qx::Object);
+    const auto& held = static_cast<qx::detail::StructObject&>(object);
+    if (held.as(held.type()) == nullptr)
+        throw qx::Exception(qx::Exception::invalidArgument,
+                            "the struct that is to be read into was moved away");
+    return held.type();
+}
+
+bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& document,
+          Ref<Error>* error) {
+    // The object's own code may let go of either.
+    const Ref<QXXMLMarshaller> kept(&marshaller);
+    const Ref<qx::Object> held(&object);
+    // Without a slot a reading leaves out what fails.
+    Ref<Error> problem;
+    Ref<qx::Object> fresh;
+    {
+        const NoUndo noUndo(marshaller.undoManager());
+        fresh = objectOf(marshaller, document, typeOf(object), &problem);
+    }
+    bool isRead = fresh.get() != nullptr;
+    if (isRead && !qx::detail::Reloading::isOfSameClass(object, *fresh))
+        isRead = qx::fail(&problem, qx::errors::rootOfOtherClass, fresh->classNameForMarshalling(),
+                          object.classNameForMarshalling());
+    if (isRead) {
+        const MappingPlan& plan = MappingPlan::of(marshaller.mapping());
+        const ClassPlan* root = plan.classForElement(document.name(document.root()));
+        isRead = qx::detail::Reloading(plan).run(*root, object, *fresh, &problem);
+    }
+    if (error != nullptr)
+        *error = std::move(problem);
+    return isRead;
+}
+
+bool fill(QXXMLMarshaller& marshaller, qx::Object& object, const qx::XMLParser::Parsed& parsed,
+          Ref<Error>* error) {
+    if (!parsed)
+        return false;
+    qx::IndexedXML document(*parsed);
+    return fill(marshaller, object, document, error);
 }
 
 // What no XML document can hold, or none that could be read again, raises while it is written.
@@ -133,13 +196,13 @@ Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_in
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
                                           Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, qx::readFile(path, error), type, error);
+    return objectOf(*this, parsed(*this, qx::readFile(path, error), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, qx::readStream(stream, error), type, error);
+    return objectOf(*this, parsed(*this, qx::readStream(stream, error), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
@@ -191,6 +254,30 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
     if (failure && error != nullptr)
         *error = failure;
     return !failure;
+}
+
+bool QXXMLMarshaller::readBytesInto(qx::Object* object, qx::XMLBytes xml, Ref<Error>* error) {
+    reset(error);
+    return fill(*this, present(object), qx::XMLParser::parseCopy(xml, parseOptions(*this), error),
+                error);
+}
+
+bool QXXMLMarshaller::readFileInto(qx::Object* object, const String& path, Ref<Error>* error) {
+    reset(error);
+    return fill(*this, present(object), parsed(*this, qx::readFile(path, error), error), error);
+}
+
+bool QXXMLMarshaller::readInputInto(qx::Object* object, std::istream& stream, Ref<Error>* error) {
+    reset(error);
+    return fill(*this, present(object), parsed(*this, qx::readStream(stream, error), error), error);
+}
+
+bool QXXMLMarshaller::readTreeInto(qx::Object* object, XMLDocument* document, Ref<Error>* error) {
+    reset(error);
+    if (document == nullptr)
+        return qx::fail(error, qx::errors::noDefinitionForElement, document);
+    qx::IndexedXML read(*document);
+    return fill(*this, present(object), read, error);
 }
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {

@@ -95,7 +95,7 @@ struct ClassRegistry {
         return *made;
     }
 
-    const Class& publish(detail::ClassDraft draft, bool listed) {
+    const Class& publish(detail::ClassDraft draft, bool listed, bool* isTaken) {
         const Key name = draft.name;
         const std::type_index type(*draft.type);
         // Warnings are given with the lock released: a host's log may ask for classes.
@@ -110,10 +110,12 @@ struct ClassRegistry {
         // Descriptions are immortal: objects keep pointers to them.
         const auto* published = new Class(std::move(draft));
         byType.emplace(type, published);
+        if (isTaken != nullptr)
+            *isTaken = true;
         standIns.clear(); // it may be the base, or the very class, of what one stands in for
-        const bool isTaken = listed && !byName.emplace(name, published).second;
+        const bool isNameTaken = listed && !byName.emplace(name, published).second;
         lock.unlock();
-        if (isTaken)
+        if (isNameTaken)
             reportWarning(String::concat(
                 {"The class name ", name.view(), " is taken; it stays with the first class"}));
         return *published;
@@ -124,11 +126,15 @@ struct ClassRegistry {
         const auto found = byName.find(name);
         if (found == byName.end())
             return false;
-        retired.push_back(found->second);
-        byType.erase(*found->second->_type);
-        byName.erase(found);
-        standIns.clear();
+        forgetLocked(*found->second);
         return true;
+    }
+
+    void forget(const Class& described) {
+        const std::unique_lock lock(mutex);
+        const auto found = byType.find(*described._type);
+        if (found != byType.end() && found->second == &described)
+            forgetLocked(described);
     }
 
     std::shared_mutex mutex;
@@ -137,6 +143,16 @@ struct ClassRegistry {
     std::vector<const Class*> retired; // not to be found any more, but perhaps still pointed to
 
 private:
+    // The name may be another class's.
+    void forgetLocked(const Class& described) {
+        retired.push_back(&described);
+        byType.erase(*described._type);
+        if (const auto found = byName.find(described._name);
+            found != byName.end() && found->second == &described)
+            byName.erase(found);
+        standIns.clear();
+    }
+
     struct StandIn {
         std::string typeName;
         const Class* description = nullptr;
@@ -188,6 +204,11 @@ const Class* Class::named(std::string_view name) {
 
 const Class* Class::described(const std::type_info& type) {
     return immortal<ClassRegistry>().described(type);
+}
+
+ClassRegistration::~ClassRegistration() {
+    if (_described != nullptr)
+        immortal<ClassRegistry>().forget(*_described);
 }
 
 bool Class::forget(std::string_view name) {
@@ -290,8 +311,8 @@ bool Class::automaticallyNotifiesObserversForKey(Key key) const {
 
 namespace detail {
 
-const Class& publish(ClassDraft draft, bool listed) {
-    return immortal<ClassRegistry>().publish(std::move(draft), listed);
+const Class& publish(ClassDraft draft, bool listed, bool* isTaken) {
+    return immortal<ClassRegistry>().publish(std::move(draft), listed, isTaken);
 }
 
 void raiseArgumentCount(Selector selector, const Class& receiver, std::size_t given) {

@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/detail/StructObject.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/detail/ObjectMemory.h>
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Class.h>
 
@@ -19,6 +20,19 @@ struct StructInternals {
         return object;
     }
 };
+
+// A reading makes a box for each struct: cut from blocks, they halve what it allocates.
+void* StructObject::operator new(std::size_t size) { return ObjectMemory::allocate(size); }
+
+void* StructObject::operator new(std::size_t size, std::align_val_t alignment) {
+    return ::operator new(size, alignment);
+}
+
+void StructObject::operator delete(void* memory) noexcept { ObjectMemory::release(memory); }
+
+void StructObject::operator delete(void* memory, std::align_val_t alignment) noexcept {
+    ::operator delete(memory, alignment);
+}
 
 void* StructObject::upcast(void* place, const std::type_info& type) const {
     const Class* from = &isa();
@@ -132,6 +146,14 @@ Value sharedStruct(StructPlace whole, StructPlace base, const std::shared_ptr<co
     std::shared_ptr<void> place(std::const_pointer_cast<void>(owner),
                                 const_cast<void*>(shared.place));
     return StructInternals::withClass(make<SharedStruct>(*shared.type, std::move(place)), known);
+}
+
+bool TakeOver::mergeStructs(StructPlace held, StructPlace fresh, bool isShared) {
+    if (*held.type != *fresh.type)
+        return false;
+    StructObject taking(*held.type, held.place);
+    StructObject taken(*fresh.type, fresh.place);
+    return mergeStructs(taking, taken, isShared);
 }
 
 } // namespace qx::detail

@@ -10,6 +10,8 @@
 //     text error       "CODE: message (reason)" of the mapping, of reading or of writing; the
 //                      reason may be left out
 //
+// What is read is also read into an object that is there.
+//
 // Options are "strict", "discard" and "no-namespaces". Each case runs on records, on host classes
 // and on plain structs; where they differ, a block says for which it is: "records", "hosts",
 // "structs".
@@ -87,6 +89,20 @@ private:
     std::string_view _rest;
 };
 
+// Whatever an object holds, reading a document into it makes it what reading makes of the document.
+inline void checkReload(QXXMLMarshaller& marshaller, const std::string& source) {
+    const qx::Ref<qx::Object> held = marshaller.readString(source);
+    const std::string root = qx::XMLDocument::initWithData(source)->rootElement()->name().str();
+    for (const std::string& text : {source, "<" + root + "/>", source}) {
+        qx::Ref<qx::Error> error, errorInto;
+        const std::string before = support::show(held);
+        const auto fresh = marshaller.readString(text, &error);
+        EXPECT_EQ(marshaller.readStringInto(held, text, &errorInto), fresh.get() != nullptr);
+        EXPECT_EQ(support::told(errorInto), support::told(error));
+        EXPECT_EQ(support::show(held), fresh ? support::show(fresh) : before);
+    }
+}
+
 struct Result {
     std::string object, written, error = "no error\n", errorWithoutReason;
 };
@@ -109,6 +125,8 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
                                             : marshaller->readString(source->second, &error);
         EXPECT_FALSE(!object.isNull() && error) << "both an object and an error";
         result.object = support::show(object);
+        if (isRead && !error && object.isObject())
+            checkReload(*marshaller, source->second);
         const auto element = error ? nullptr : marshaller->marshallObject(object, &error);
         EXPECT_FALSE(element && error) << "both an element and an error";
         result.written = element ? element->XMLString(qx::XMLPrettyPrint).str() + "\n" : "";

@@ -3,6 +3,7 @@
 // How the parts of a class description (Property.h) are made from members: each accessor becomes a
 // captureless function pointer. Hosts use them through Class::define (Class.h).
 
+#include <QXXMLMarshalling/detail/TakeOver.h>
 #include <QXXMLMarshalling/model/Property.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
@@ -35,8 +36,9 @@ struct ClassDraft {
 };
 
 // Publishes the draft, under its name too unless `listed` is false (a class that no mapping may
-// name). The class that holds the type afterwards: the first one that was published for it.
-QX_API const Class& publish(ClassDraft draft, bool listed = true);
+// name). The class that holds the type afterwards: the first one that was published for it;
+// `isTaken` tells whether it is this one.
+QX_API const Class& publish(ClassDraft draft, bool listed = true, bool* isTaken = nullptr);
 
 // Raise NSInvalidArgumentException.
 [[noreturn]] QX_API void raiseArgumentCount(Selector selector, const Class& receiver,
@@ -74,11 +76,14 @@ Value toValue(T&& value) {
     return ValueTraits<Stored<T>>::toValue(std::forward<T>(value));
 }
 
-// The object as a T, or the T that it holds; null where the struct was moved out.
+// The object as a T, or the T that it holds; null where the struct was moved out. From a virtual
+// base only a dynamic cast leads there.
 template <class T>
 const T* instanceIn(const Object& object) {
-    if constexpr (std::derived_from<T, Object>)
+    if constexpr (requires { static_cast<const T*>(&object); })
         return static_cast<const T*>(&object);
+    else if constexpr (std::derived_from<T, Object>)
+        return dynamic_cast<const T*>(&object);
     else
         return static_cast<const T*>(static_cast<const StructObject&>(object).as(typeid(T)));
 }
@@ -109,6 +114,24 @@ bool setMember(const Property&, Object& object, const Value& value) {
     return instance != nullptr && ValueTraits<V>::fromValue(value, instance->*Member);
 }
 
+template <class T, auto Member>
+void takeOverMember(const Property&, Object& held, Object& fresh, TakeOver& way) {
+    using V = Stored<decltype(std::declval<T&>().*Member)>;
+    T* instance = instanceIn<T>(held);
+    T* other = instanceIn<T>(fresh);
+    if (instance != nullptr && other != nullptr)
+        MemberTakeOver<V>::apply(instance->*Member, other->*Member, way);
+}
+
+// For numbers, enumerations and the like: others, which may hold objects, go as values.
+template <class T, auto Getter, auto Setter>
+void takeOverAccessors(const Property&, Object& held, Object& fresh, TakeOver&) {
+    T* instance = instanceIn<T>(held);
+    const T* other = instanceIn<T>(fresh);
+    if (instance != nullptr && other != nullptr)
+        std::invoke(Setter, *instance, std::invoke(Getter, *other));
+}
+
 template <class T, auto Setter>
 bool callSetter(const Property&, Object& object, const Value& value) {
     using V = Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
@@ -135,8 +158,10 @@ Property memberProperty(std::string_view name) {
     describeGetter<T, Member>(property);
     if constexpr (std::is_member_object_pointer_v<decltype(Member)>) {
         using M = std::remove_reference_t<decltype(std::declval<T&>().*Member)>;
-        if constexpr (!std::is_const_v<M>)
+        if constexpr (!std::is_const_v<M>) {
             property.set = &setMember<T, Member>;
+            property.takeOver = &takeOverMember<T, Member>;
+        }
     }
     return property;
 }
@@ -181,6 +206,9 @@ Property accessorProperty(std::string_view name) {
     property.key = name;
     describeGetter<T, Getter>(property);
     property.set = &callSetter<T, Setter>;
+    using V = Stored<Gotten<T, Getter>>;
+    if constexpr (std::is_arithmetic_v<V> || std::is_enum_v<V>)
+        property.takeOver = &takeOverAccessors<T, Getter, Setter>;
     return property;
 }
 

@@ -327,4 +327,11 @@ template <class T>
 concept WritableStruct =
     std::is_class_v<T> && !std::convertible_to<const T&, Value> && detail::Lendable<T>;
 
+// What a marshaller can read into: an object, a Ref to one, or a plain struct that can be changed.
+template <class T>
+concept Reloadable = std::convertible_to<T&, Object&> || requires(T& reference) {
+    { reference.get() } -> std::convertible_to<Object*>;
+} ||(std::is_lvalue_reference_v<T> && !std::is_const_v<std::remove_reference_t<T>> &&
+     detail::Struct<std::remove_cvref_t<T>>);
+
 } // namespace qx

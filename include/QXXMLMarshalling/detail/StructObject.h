@@ -12,6 +12,7 @@
 
 #include <concepts>
 #include <memory>
+#include <new>
 #include <type_traits>
 #include <typeinfo>
 #include <utility>
@@ -33,6 +34,10 @@ public:
     // Refers to the struct, which lives on somewhere else.
     StructObject(const std::type_info& type, const void* place) noexcept
         : StructObject(type, const_cast<void*>(place), false) {}
+    static void* operator new(std::size_t size);
+    static void* operator new(std::size_t size, std::align_val_t alignment);
+    static void operator delete(void* memory) noexcept;
+    static void operator delete(void* memory, std::align_val_t alignment) noexcept;
 
     const std::type_info& type() const noexcept { return *_type; }
     // The struct as that type: its own, or one that its class was derived from when it was
@@ -123,6 +128,22 @@ bool takeStruct(const Value& value, Take take) {
     take(std::move(*static_cast<T*>(held->as(typeid(T)))));
     held->clear();
     return true;
+}
+
+// Calls with the object, with that of a Ref, which may be null, or with the struct as an object.
+template <class T, class Call>
+auto withObject(T& held, Call call) {
+    if constexpr (std::derived_from<T, Object>) {
+        return call(&held);
+    } else if constexpr (requires {
+                             { held.get() } -> std::convertible_to<Object*>;
+                         }) {
+        return call(held.get());
+    } else {
+        const StructPlace whole = wholeOf(held);
+        StructObject object(*whole.type, whole.place);
+        return call(&object);
+    }
 }
 
 template <class T, class Base>

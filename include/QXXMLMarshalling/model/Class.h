@@ -26,7 +26,10 @@
 // The registry of classes is the list of what a document can bring to life: a mapping creates only
 // classes that were described. It may be read and written from any thread. A description is
 // published whole when its builder ends; a name that is taken stays with the first, and a warning
-// is logged. Descriptions live for ever; forget() takes a name back when a plug-in is unloaded.
+// is logged. Descriptions live for ever. A plug-in keeps what takes its classes back:
+//
+//     static const qx::ClassRegistration part =
+//         qx::Class::define<Part>("Part").members<&Part::number>().registration();
 //
 // A class that nobody described is, for its objects, a subclass of the nearest of its C++ bases
 // that is; a description that comes later, of the class or of a base, holds for objects that are
@@ -47,6 +50,27 @@ struct StructInternals;
 
 template <class T>
 class ClassBuilder;
+
+// Takes a class back when it ends: a static object of a plug-in does so when that is unloaded.
+// Objects of the class must be gone by then. Documents give records in their place afterwards.
+class QX_API ClassRegistration {
+public:
+    ClassRegistration() noexcept = default;
+    ClassRegistration(ClassRegistration&& other) noexcept
+        : _described(std::exchange(other._described, nullptr)) {}
+    ClassRegistration& operator=(ClassRegistration other) noexcept {
+        std::swap(_described, other._described);
+        return *this;
+    }
+    ~ClassRegistration();
+
+private:
+    template <class T>
+    friend class ClassBuilder;
+    explicit ClassRegistration(const Class* described) noexcept : _described(described) {}
+
+    const Class* _described = nullptr;
+};
 
 class QX_API Class {
 public:
@@ -126,7 +150,18 @@ public:
     explicit ClassBuilder(detail::ClassDraft draft) : _draft(std::move(draft)) {}
     ClassBuilder(const ClassBuilder&) = delete;
     ClassBuilder& operator=(const ClassBuilder&) = delete;
-    ~ClassBuilder() { detail::publish(std::move(_draft)); }
+    ~ClassBuilder() {
+        if (_draft.type != nullptr)
+            detail::publish(std::move(_draft));
+    }
+
+    // Publishes the description now, until the registration ends; nothing may be added any more.
+    // A description that is not taken, since the type has one, leaves an empty registration.
+    [[nodiscard]] ClassRegistration registration() {
+        bool isTaken = false;
+        const Class& described = detail::publish(std::exchange(_draft, {}), true, &isTaken);
+        return ClassRegistration(isTaken ? &described : nullptr);
+    }
 
     // Data members, under their own names.
     template <auto... Members>

@@ -12,6 +12,10 @@
 
 namespace qx {
 
+namespace detail {
+class TakeOver;
+} // namespace detail
+
 // A property of instances. `get` and `set` are handed the property, for the members it stores.
 struct Property {
     static constexpr std::size_t memberSize = 16;
@@ -24,6 +28,9 @@ struct Property {
     // What `get` answers, but that it refers to structs instead of copying them, for as long as
     // nobody changes the object. Null for a property without any.
     Value (*lend)(const Property&, const Object&) = nullptr;
+    // Gives an object what another has, moved without a conversion; the objects that it holds stay
+    // (TakeOver.h). Null where `set` has to do, with what `get` answers of the other.
+    void (*takeOver)(const Property&, Object& held, Object& fresh, detail::TakeOver&) = nullptr;
     // Whether zero, false and empty text are values like any other when the object is written.
     bool keepsZero = false;
     // Member function pointers that were only known at run time.
