@@ -81,6 +81,8 @@ inline constexpr ErrorText notAnInteger{-221, "<%@>: Unable to convert value to 
                                         invalidXML};
 inline constexpr ErrorText unableToSetValue{
     -222, "Unable to set value: %@ for key: %@ in class: %@", invalidValue};
+inline constexpr ErrorText objectOfWrongClass{
+    -222, "Unable to set value: %@ for key: %@ in class: %@, which takes: %@", invalidValue};
 inline constexpr ErrorText nestedTooDeep{-223, "Objects nest deeper than the limit of %@: %@",
                                          invalidValue};
 inline constexpr ErrorText tooManyObjects{

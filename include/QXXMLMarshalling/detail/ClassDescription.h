@@ -109,9 +109,13 @@ bool setMember(const Property&, Object& object, const Value& value) {
     return instance != nullptr && ValueTraits<V>::fromValue(value, instance->*Member);
 }
 
+template <auto Setter>
+using SetterValue =
+    Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
+
 template <class T, auto Setter>
 bool callSetter(const Property&, Object& object, const Value& value) {
-    using V = Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
+    using V = SetterValue<Setter>;
     T* instance = instanceIn<T>(object);
     return instance != nullptr && convert<V>(value, [&](V&& converted) {
                std::invoke(Setter, *instance, std::move(converted));
@@ -126,6 +130,7 @@ void describeGetter(Property& property) {
     if constexpr (Lendable<V> && std::is_lvalue_reference_v<Gotten<T, Member>>)
         property.lend = &lendMember<T, Member>;
     property.keepsZero = isOptional<V> || !std::derived_from<T, Object>;
+    property.objects = takenObjects<V>();
 }
 
 template <class T, auto Member>
@@ -181,6 +186,7 @@ Property accessorProperty(std::string_view name) {
     property.key = name;
     describeGetter<T, Getter>(property);
     property.set = &callSetter<T, Setter>;
+    property.objects = takenObjects<SetterValue<Setter>>();
     return property;
 }
 
@@ -216,6 +222,7 @@ Property boundProperty(std::string_view name, V (T::*getter)() const, void (T::*
                });
     };
     property.keepsZero = isOptional<Stored<V>> || !std::derived_from<T, Object>;
+    property.objects = takenObjects<Stored<V>>();
     return property;
 }
 

@@ -12,6 +12,10 @@
 
 namespace qx {
 
+namespace detail {
+struct TakenObjects;
+} // namespace detail
+
 // A property of instances. `get` and `set` are handed the property, for the members it stores.
 struct Property {
     static constexpr std::size_t memberSize = 16;
@@ -26,6 +30,8 @@ struct Property {
     Value (*lend)(const Property&, const Object&) = nullptr;
     // Whether zero, false and empty text are values like any other when the object is written.
     bool keepsZero = false;
+    // Of which classes objects have to be; null for a property that takes no objects, or any.
+    const detail::TakenObjects* objects = nullptr;
     // Member function pointers that were only known at run time.
     Member getter{};
     Member setter{};
