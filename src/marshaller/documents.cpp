@@ -55,6 +55,8 @@ String nameOf(const std::type_info& type) {
 // whoever reads in one step is told. So is who asks for a class, before anything is read.
 Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, qx::IndexedXML& document,
                          const std::type_info& type, Ref<Error>* error) {
+    if (const qx::NamespaceTable* const table = qx::detail::NamespaceMatching::of(marshaller))
+        document.matchBy(*table);
     const auto root = document.root();
     const auto noDefinition = [&] {
         return qx::fail(error, qx::errors::noDefinitionForElement,

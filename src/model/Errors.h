@@ -91,6 +91,12 @@ inline constexpr ErrorText tooManyKeptNodes{
     -224, "Reading keeps more nodes than the limit of %@: %@", "Invalid Mapping"};
 inline constexpr ErrorText tooManyVisits{
     -224, "Reading goes over more nodes than the limit of %@: %@", "Invalid Mapping"};
+inline constexpr ErrorText noNamespacePrefix{-225, "%@ cannot be the prefix of the namespace: %@",
+                                             "Invalid Mapping"};
+inline constexpr ErrorText prefixOfTwoNamespaces{
+    -225, "The prefix: %@ would stand for two namespaces: %@ and: %@", "Invalid Mapping"};
+inline constexpr ErrorText namespaceOfTwoPrefixes{
+    -225, "The namespace: %@ would have two prefixes: %@ and: %@", "Invalid Mapping"};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 
