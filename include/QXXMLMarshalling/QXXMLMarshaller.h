@@ -32,11 +32,17 @@
 
 #include <concepts>
 #include <iosfwd>
+#include <map>
+#include <memory>
 #include <typeinfo>
 
 namespace qx {
 class ByteSource;
-}
+class NamespaceTable;
+namespace detail {
+class NamespaceMatching;
+} // namespace detail
+} // namespace qx
 
 class QX_API QXXMLMarshaller : public qx::Object {
 public:
@@ -79,6 +85,25 @@ public:
     // that hold a value are always written.
     bool omitsZeroAttributes() const noexcept { return _omitsZeroAttributes; }
     void setOmitsZeroAttributes(bool omit) noexcept { _omitsZeroAttributes = omit; }
+    // Names in documents are matched as they are written, prefix included. With a table from the
+    // URIs of namespaces to prefixes they are matched by namespace instead: an element or attribute
+    // in a namespace of the table has, for the mapping, the prefix that stands there, whatever the
+    // document has for it; an empty one for names without. What is in another namespace, or in
+    // none, does not match by a prefix of the table. Nothing is renamed in the document, in what is
+    // kept of it, or in messages. What is written has the prefixes that stand for the namespaces
+    // there, and declarations of those that are missing. Empty at first, then nothing of this is
+    // done. False, and all is left as it was, with
+    //   -225  "%@ cannot be the prefix of the namespace: %@"
+    //   -225  "The prefix: %@ would stand for two namespaces: %@ and: %@"
+    // Without a slot an error is logged.
+    using NamespacePrefixes = std::map<qx::String, qx::String>;
+    const NamespacePrefixes& namespacePrefixes() const noexcept { return _namespacePrefixes; }
+    bool setNamespacePrefixes(NamespacePrefixes prefixes, qx::Ref<qx::Error>* error = nullptr);
+    // Whether the table also has what the class mappings say by "ns-uri" and "ns-prefix", but for
+    // namespaces that were given a prefix above. False at first. Answers as above, or with
+    //   -225  "The namespace: %@ would have two prefixes: %@ and: %@"
+    bool matchesNamespaces() const noexcept { return _matchesNamespaces; }
+    bool setMatchesNamespaces(bool matches, qx::Ref<qx::Error>* error = nullptr);
     // How deep objects may nest, in both directions; 256 at first, 2,048 at most (more counts as
     // that many). A level takes about a kilobyte of the thread's stack. Deeper objects end in
     //   -223  "Objects nest deeper than the limit of %@: %@"   (the limit, the class)
@@ -352,6 +377,9 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
+    friend class qx::detail::NamespaceMatching;
+
+    bool matchNamespaces(NamespacePrefixes prefixes, bool matches, qx::Ref<qx::Error>* error);
     // The object of a document whose root is to be of that C++ type.
     qx::Ref<qx::Object> readString(qx::XMLBytes xml, const std::type_info& type,
                                    qx::Ref<qx::Error>* error);
@@ -421,6 +449,9 @@ private:
     std::size_t _maximumDepth = 256;
     Limit _maximumObjects{10'000, 16};
     Limit _maximumKeptNodes{10'000, 64};
+    bool _matchesNamespaces = false;
+    NamespacePrefixes _namespacePrefixes;
+    std::shared_ptr<const qx::NamespaceTable> _namespaces; // null: names are matched as written
 };
 
 // Converts the value by the field's type and sets it under the key. False with

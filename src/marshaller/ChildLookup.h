@@ -35,7 +35,7 @@ public:
 
     IndexedXML& document() const noexcept { return _document; }
     Number element() const noexcept { return _element; }
-    const String& elementName() const noexcept { return _document.name(_element); }
+    const String& elementName() const noexcept { return _document.writtenName(_element); }
     Nodes nodes() const noexcept { return _nodes; }
     bool isCopy() const noexcept { return _isCopy; }
     // How many children the element has.

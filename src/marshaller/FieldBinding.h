@@ -48,7 +48,11 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, XMLElement& e
 bool setElementValue(Unmarshalling& reading, const FieldPlan& field,
                      const Unmarshalling::Target& target, Value value, Ref<Error> problem,
                      const String& name, Ref<Error>* error);
-// The class that "type" names, else that of the value, null where it has none. False with
+// True but for a plain struct, which is written by its class only. False with
+//   -211  "No mapping definition for class: %@"
+bool hasText(const Value& value, Ref<Error>* error);
+// The class that "type" names, else that of the value, null where it has none. False as above, or
+// with
 //   -207  "No mapping for class: %@"   (the declared one)
 bool findClassToWrite(const Marshalling& writing, const FieldPlan& field, const Value& value,
                       const ClassPlan*& plan, Ref<Error>* error);

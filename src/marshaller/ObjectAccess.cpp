@@ -53,13 +53,28 @@ ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
             property->keepsZero};
 }
 
+namespace {
+
+// Of a wrong class is an object, or the first such item of a list: that one is told, and the
+// classes that the property takes.
+bool refuse(const Object& object, Key key, const Value& value, Ref<Error>* error) {
+    const Class& type = object.isa();
+    const Property* const property = type.property(key);
+    const TakenObjects* const taken = property != nullptr ? property->objects : nullptr;
+    const Value wrong = taken != nullptr ? taken->firstRefused(value) : Value();
+    return wrong.isNull() ? fail(error, errors::unableToSetValue, value, key.string(), type.name())
+                          : fail(error, errors::objectOfWrongClass, wrong, key.string(),
+                                 type.name(), taken->names);
+}
+
+} // namespace
+
 bool ObjectAccess::set(Object& object, Key key, Value value, Ref<Error>* error) {
     QXGenericRecord* record = plainRecord(object);
     if (record != nullptr && RecordFilling::add(*record, key, std::move(value)))
         return true;
     // NOLINTNEXTLINE(bugprone-use-after-move): it was left alone
-    return setProperty(object, key, value) == SetOutcome::set ||
-           fail(error, errors::unableToSetValue, value, key.string(), object.isa().name());
+    return setProperty(object, key, value) == SetOutcome::set || refuse(object, key, value, error);
 }
 
 // Nobody observes a struct.

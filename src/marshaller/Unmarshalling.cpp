@@ -13,7 +13,10 @@ namespace qx::detail {
 Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()), _document(document),
       _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
-      _classes(_plan.classCount() + 1), _classKnown(_plan.classCount() + 1) {}
+      _classes(_plan.classCount() + 1), _classKnown(_plan.classCount() + 1) {
+    if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
+        document.matchBy(*table);
+}
 
 // Lends consumed names for the time of one object's binding.
 class Unmarshalling::LentNames {

@@ -15,6 +15,7 @@
 
 #include "marshaller/ChildLookup.h"
 #include "marshaller/ConsumedNames.h"
+#include "marshaller/NamespaceMatching.h"
 #include "marshaller/ObjectAccess.h"
 #include "plan/MappingPlan.h"
 
@@ -93,7 +94,8 @@ private:
     bool keepNamespaces(const Target& target, ErrorSlot error);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
     bool validateChildren(const Target& target, ErrorSlot error);
-    bool keepChildren(const Target& target, const CountedSet& names, ErrorSlot error);
+    bool keepChildren(const Target& target, const CountedSet& names, const CountedSet& written,
+                      ErrorSlot error);
     bool validateAttributes(const Target& target, ErrorSlot error);
     bool keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error);
 

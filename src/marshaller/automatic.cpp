@@ -18,6 +18,8 @@ bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, co
            Ref<Error>* error) {
     const ClassPlan* plan = writing.classOf(value);
     if (plan == nullptr) {
+        if (!hasText(value, error))
+            return false;
         const String text = textOf(value, field.valueType);
         if (!writing.isLeftOut(field, value, text))
             element.addAttribute(field.xmlName(), text);

@@ -71,6 +71,8 @@ bool mayRead(const QXXMLMarshaller& marshaller, const String& elementName,
 // whoever reads in one step is told. So is who asks for a class, before anything is read.
 Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, qx::IndexedXML& document,
                          const std::type_info& type, Ref<Error>* error) {
+    if (const qx::NamespaceTable* const table = qx::detail::NamespaceMatching::of(marshaller))
+        document.matchBy(*table);
     const auto root = document.root();
     const auto quoted = [&] { return document.quoted(root); };
     const String name = root != qx::IndexedXML::none ? document.name(root) : String();
@@ -237,7 +239,10 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
         return false;
     Ref<Error> failure;
     bool goesOn = true;
-    qx::XMLPieces pieces(source, elementName, parseOptions(*this));
+    const auto match = qx::detail::NamespaceMatching::of(*this) != nullptr
+                           ? qx::XMLSplitter::Match::localNames
+                           : qx::XMLSplitter::Match::names;
+    qx::XMLPieces pieces(source, elementName, match, parseOptions(*this));
     while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
         qx::IndexedXML document(*piece);
         qx::detail::Unmarshalling reading(*this, document);

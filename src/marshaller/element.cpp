@@ -97,13 +97,19 @@ bool setElementValue(Unmarshalling& reading, const FieldPlan& field,
     return false;
 }
 
+bool hasText(const Value& value, Ref<Error>* error) {
+    return dynamic_cast<const StructObject*>(value.object()) == nullptr ||
+           fail(error, errors::noMappingDefinition, value.classNameForMarshalling());
+}
+
 bool findClassToWrite(const Marshalling& writing, const FieldPlan& field, const Value& value,
                       const ClassPlan*& plan, Ref<Error>* error) {
     const bool isDeclared = field.valueType == ValueType::other;
     const bool isText = field.valueType == ValueType::string;
     plan = isDeclared || isText ? field.typeClass : writing.classOf(value);
-    return !isDeclared || plan != nullptr ||
-           fail(error, errors::noMappingForClass, field.mapping->type());
+    if (isDeclared && plan == nullptr)
+        return fail(error, errors::noMappingForClass, field.mapping->type());
+    return plan != nullptr || hasText(value, error);
 }
 
 } // namespace qx::detail

@@ -138,9 +138,9 @@ Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapp
         return nullptr;
     const PlanOfClass plan(*this, mapping);
     IndexedXML document(element, IndexedXML::Content::asNeeded);
+    Unmarshalling reading(*this, document, Unmarshalling::Use::steps);
     ChildLookup source(document, document.root(), IndexedXML::Nodes::own, (*plan).bindingCount);
-    return Unmarshalling(*this, document, Unmarshalling::Use::steps)
-        .build(*plan, source, isFlattened, error);
+    return reading.build(*plan, source, isFlattened, error);
 }
 
 Ref<Object> QXXMLMarshaller::allocateClassWithMapping(const QXXMLClassMapping& mapping,
@@ -252,10 +252,10 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
     ConsumedNames fields(boundFields);
     ConsumedNames attributes(boundAttributes);
     IndexedXML document(&element, IndexedXML::Content::asNeeded);
+    Unmarshalling reading(*this, document, Unmarshalling::Use::steps);
     ChildLookup source(document, document.root(), IndexedXML::Nodes::own, 0);
     const Ref<Object> held(&object);
-    return Unmarshalling(*this, document, Unmarshalling::Use::steps)
-        .validate(nullptr, {object, source, {fields, attributes}, false}, error);
+    return reading.validate(nullptr, {object, source, {fields, attributes}, false}, error);
 }
 
 bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,

@@ -16,18 +16,26 @@ class Unknown {
 public:
     explicit Unknown(ConsumedNames& bound) : _bound(bound) {}
 
-    void see(const String& name) {
+    void see(const IndexedXML& document, IndexedXML::Number node) {
+        const String& name = document.name(node);
         if (name.isNull() || _bound.take(name))
             return;
-        if (!_names)
+        if (!_names) {
             _names = make<CountedSet>();
+            _written = document.isMatched() ? make<CountedSet>() : _names;
+        }
         _names->add(name);
+        if (_written != _names)
+            _written->add(document.writtenName(node));
     }
+    // As they are matched, and as they stand in the document.
     const Ref<CountedSet>& names() const noexcept { return _names; }
+    const Ref<CountedSet>& written() const noexcept { return _written; }
 
 private:
     ConsumedNames& _bound;
     Ref<CountedSet> _names;
+    Ref<CountedSet> _written;
 };
 
 } // namespace
@@ -53,35 +61,45 @@ bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& tar
 
 bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     Unknown unknown(target.bound.fields);
-    target.source.forEachChild([&](Number child) { unknown.see(_document.name(child)); });
+    target.source.forEachChild([&](Number child) { unknown.see(_document, child); });
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML())
-        return fail(error, errors::unknownFields, unknown.names(), target.source.elementName());
+        return fail(error, errors::unknownFields, unknown.written(), target.source.elementName());
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
     // host's log at all is asked of the warnings.
     if (hostHasLogWarning())
-        logDebug("*** Warning: Unbound fields: %@", unknown.names());
+        logDebug("*** Warning: Unbound fields: %@", unknown.written());
     else
-        log("Unbound fields: %@", unknown.names());
-    return keepChildren(target, *unknown.names(), error);
+        log("Unbound fields: %@", unknown.written());
+    return keepChildren(target, *unknown.names(), *unknown.written(), error);
 }
 
-// A name that is left is kept with all its elements, those that were consumed included.
-bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names, ErrorSlot error) {
+// A name that is left is kept with all its elements, those that were consumed included; under the
+// name as it is written.
+bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names,
+                                 const CountedSet& written, ErrorSlot error) {
     auto kept = make<Dictionary>();
-    for (const String& name : names.names())
+    for (const String& name : written.names())
         kept->set(name, make<Array>());
     bool fits = true;
+    const auto listFor = [&](Number child) -> Array* {
+        const String& name = _document.writtenName(child);
+        if (_document.isMatched() && !names.contains(_document.name(child)))
+            return nullptr;
+        if (_document.isMatched() && kept->find(name) == nullptr)
+            kept->set(name, make<Array>());
+        const Value* const elements = kept->find(name);
+        return elements != nullptr ? static_cast<Array*>(elements->object()) : nullptr;
+    };
     target.source.forEachChild([&](Number child) {
-        const bool mayFit = fits && _document.isElement(child);
-        const Value* elements = mayFit ? kept->find(_document.name(child)) : nullptr;
+        Array* const elements = fits && _document.isElement(child) ? listFor(child) : nullptr;
         if (elements == nullptr)
             return;
         const auto node = target.source.keepElement(child, _budget, error);
         fits = node.get() != nullptr;
         if (fits)
-            static_cast<Array*>(elements->object())->add(node);
+            elements->add(node);
     });
     // A processing instruction leaves a name alone.
     std::size_t lone = 0;
@@ -96,7 +114,7 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     Unknown unknown(target.bound.attributes);
     std::size_t seen = 0;
     _document.forEachOfKind(XMLNodeKind::attribute, element, [&](Number attribute) {
-        unknown.see(_document.name(attribute));
+        unknown.see(_document, attribute);
         ++seen;
     });
     if (!_budget.takeVisits(seen, element, error))
@@ -104,8 +122,9 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML())
-        return fail(error, errors::unknownAttributes, unknown.names(), target.source.elementName());
-    logWarningOrLine("Unbound attributes: %@", unknown.names());
+        return fail(error, errors::unknownAttributes, unknown.written(),
+                    target.source.elementName());
+    logWarningOrLine("Unbound attributes: %@", unknown.written());
     return keepAttributes(target, *unknown.names(), error);
 }
 

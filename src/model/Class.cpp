@@ -121,6 +121,14 @@ struct ClassRegistry {
         return *published;
     }
 
+    std::vector<const Class*> all() {
+        const std::shared_lock lock(mutex);
+        std::vector<const Class*> classes;
+        for (const auto& [type, described] : byType)
+            classes.push_back(described);
+        return classes;
+    }
+
     bool forget(Key name) {
         const std::unique_lock lock(mutex);
         const auto found = byName.find(name);
@@ -209,6 +217,19 @@ const Class* Class::described(const std::type_info& type) {
 ClassRegistration::~ClassRegistration() {
     if (_described != nullptr)
         immortal<ClassRegistry>().forget(*_described);
+}
+
+std::vector<const Class*> Class::derivedFrom(const std::type_info& type) {
+    std::vector<const Class*> classes = immortal<ClassRegistry>().all();
+    std::erase_if(classes, [&](const Class* described) {
+        const Class* link = described;
+        while (link != nullptr && *link->_type != type &&
+               (link->_superclassType == nullptr || *link->_superclassType != type))
+            link = link->superclass();
+        return link == nullptr;
+    });
+    std::ranges::sort(classes, {}, [](const Class* described) { return described->key().view(); });
+    return classes;
 }
 
 bool Class::forget(std::string_view name) {

@@ -81,6 +81,8 @@ inline constexpr ErrorText notAnInteger{-221, "<%@>: Unable to convert value to 
                                         invalidXML};
 inline constexpr ErrorText unableToSetValue{
     -222, "Unable to set value: %@ for key: %@ in class: %@", invalidValue};
+inline constexpr ErrorText objectOfWrongClass{
+    -222, "Unable to set value: %@ for key: %@ in class: %@, which takes: %@", invalidValue};
 inline constexpr ErrorText nestedTooDeep{-223, "Objects nest deeper than the limit of %@: %@",
                                          invalidValue};
 inline constexpr ErrorText tooManyObjects{
@@ -89,6 +91,12 @@ inline constexpr ErrorText tooManyKeptNodes{
     -224, "Reading keeps more nodes than the limit of %@: %@", "Invalid Mapping"};
 inline constexpr ErrorText tooManyVisits{
     -224, "Reading goes over more nodes than the limit of %@: %@", "Invalid Mapping"};
+inline constexpr ErrorText noNamespacePrefix{-225, "%@ cannot be the prefix of the namespace: %@",
+                                             "Invalid Mapping"};
+inline constexpr ErrorText prefixOfTwoNamespaces{
+    -225, "The prefix: %@ would stand for two namespaces: %@ and: %@", "Invalid Mapping"};
+inline constexpr ErrorText namespaceOfTwoPrefixes{
+    -225, "The namespace: %@ would have two prefixes: %@ and: %@", "Invalid Mapping"};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 

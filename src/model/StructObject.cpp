@@ -14,6 +14,10 @@ namespace qx::detail {
 // What only the objects of structs ask of a class.
 struct StructInternals {
     static const StructType& typeOf(const Class& described) { return *described._structType; }
+    // The type to which StructType::toBase leads.
+    static const std::type_info& baseOf(const Class& described) {
+        return *described._superclassType;
+    }
     static Value withClass(const Ref<StructObject>& object, const Class* known) {
         if (known != nullptr)
             known->assignTo(*object);
@@ -41,6 +45,8 @@ void* StructObject::upcast(void* place, const std::type_info& type) const {
             return place;
         const auto toBase = StructInternals::typeOf(*from).toBase;
         place = toBase != nullptr ? toBase(place) : nullptr;
+        if (place != nullptr && StructInternals::baseOf(*from) == type)
+            return place; // nobody has to describe it
         from = from->superclass();
     }
     return nullptr;

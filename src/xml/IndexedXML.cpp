@@ -2,7 +2,10 @@
 
 #include "base/KnownName.h"
 #include "base/TextBlocks.h"
+#include "xml/MatchedNames.h"
 #include "xml/XMLNodeMaker.h"
+
+#include <algorithm>
 
 namespace qx {
 
@@ -99,6 +102,32 @@ void IndexedXML::internNames() {
             _interned.assign(names.begin(), names.end());
         _interned[i] = std::move(known);
     }
+}
+
+namespace {
+
+// What is declared on the elements around this one, outermost first.
+std::vector<MatchedNames::Declaration> declarationsAround(const XMLElement& element) {
+    std::vector<MatchedNames::Declaration> declarations;
+    const XMLNode* parent = element.parent();
+    for (; parent != nullptr && parent->isElement(); parent = parent->parent())
+        for (const XMLNode& declaration : parent->asElement()->namespaces())
+            declarations.emplace_back(declaration.name(), declaration.stringValue());
+    std::ranges::reverse(declarations);
+    return declarations;
+}
+
+} // namespace
+
+void IndexedXML::matchBy(const NamespaceTable& table) {
+    if (_root == none || !_matched.empty())
+        return;
+    expandAll(_root);
+    if (_interned.empty())
+        _interned.assign(index().names().begin(), index().names().end());
+    const auto around = _tree ? declarationsAround(_tree->element(_root))
+                              : std::vector<MatchedNames::Declaration>();
+    _matched = MatchedNames(index(), _root, around, table, _interned).takeNumbers();
 }
 
 String IndexedXML::value(Number number) {

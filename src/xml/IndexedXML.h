@@ -12,6 +12,7 @@
 
 namespace qx {
 
+class NamespaceTable;
 class NodePool;
 
 class IndexedXML {
@@ -31,22 +32,33 @@ public:
     IndexedXML(const IndexedXML&) = delete;
     IndexedXML& operator=(const IndexedXML&) = delete;
 
+    // From here on elements and attributes are matched by namespace (MatchedNames.h), by the first
+    // table that is given. A tree is read to its end for that.
+    void matchBy(const NamespaceTable& table);
+    bool isMatched() const noexcept { return !_matched.empty(); }
+
     // The element that is read; none where there is none.
     Number root() const noexcept { return _root; }
 
     XMLNodeKind kind(Number number) const noexcept { return index()[number].nodeKind(); }
     bool isElement(Number number) const noexcept { return kind(number) == XMLNodeKind::element; }
-    // Null of texts and comments. A name that a mapping knows is the interned one.
+    // The name to match by: as written, unless matchBy() was called. Null of texts and comments.
+    // A name that a mapping knows is the interned one.
     const String& name(Number number) const noexcept {
         const XMLIndexEntry& entry = index()[number];
         const bool hasNone =
             entry.nodeKind() == XMLNodeKind::text || entry.nodeKind() == XMLNodeKind::comment;
         return hasNone             ? _noName
                : _interned.empty() ? index().name(entry)
-                                   : _interned[entry.name()];
+                                   : _interned[nameNumber(number)];
+    }
+    const String& writtenName(Number number) const noexcept {
+        return isMatched() ? index().name(index()[number]) : name(number);
     }
     // The number of an element's name among those of the document.
-    std::uint32_t nameNumber(Number element) const noexcept { return index()[element].name(); }
+    std::uint32_t nameNumber(Number element) const noexcept {
+        return isMatched() ? _matched[element] : index()[element].name();
+    }
 
     // Calls visit(Number) for each child, attribute or declaration of an element.
     template <class Visit>
@@ -129,7 +141,9 @@ private:
     const XMLIndex* _index = nullptr; // what was parsed, or the tree's; null where there is nothing
     const String _noName;
     Number _root = none;
-    std::vector<String> _interned; // the names, where the index has not all that are known by now
+    // The names, where the index has not all that are known by now, or is matched by namespace.
+    std::vector<String> _interned;
+    std::vector<std::uint32_t> _matched; // then: of each entry, its name's number
     std::string _room;
     std::unordered_map<Number, String> _longTexts; // of attributes, texts and elements
     // Of elements with many attributes, by name.

@@ -17,8 +17,9 @@ namespace qx {
 class XMLPieces {
 public:
     // The bytes must outlive the pieces.
-    XMLPieces(ByteSource& bytes, const String& itemName, const XMLParseOptions& options)
-        : _source(bytes), _splitter(itemName), _options(options) {}
+    XMLPieces(ByteSource& bytes, const String& itemName, XMLSplitter::Match match,
+              const XMLParseOptions& options)
+        : _source(bytes), _splitter(itemName, match), _options(options) {}
 
     // The next piece; null at the end, with an error of the bytes or of parsing where that came too
     // early.

@@ -24,7 +24,19 @@ constexpr std::array<bool, 256> tagMarks() {
     return marks;
 }
 
+std::string_view localPart(std::string_view name) noexcept {
+    return name.substr(name.find(':') + 1);
+}
+
 } // namespace
+
+XMLSplitter::XMLSplitter(String itemName, Match match)
+    : _match(match),
+      _itemName(match == Match::names ? std::move(itemName) : String(localPart(itemName))) {}
+
+bool XMLSplitter::isItemName(std::string_view name) const noexcept {
+    return (_match == Match::names ? name : localPart(name)) == _itemName;
+}
 
 void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
     _text = text;
@@ -181,7 +193,7 @@ bool XMLSplitter::goOverStartTag() {
     if (_open.empty() && !_root.empty())
         return fail();
     const std::size_t nameSize = tag.find_first_of(" \t\r\n/>") - 1;
-    const bool isItem = tag.substr(1, nameSize) == _itemName;
+    const bool isItem = isItemName(tag.substr(1, nameSize));
     if (isItem)
         _depth = 1;
     else

@@ -23,7 +23,10 @@ class XMLSplitter {
 public:
     static constexpr std::size_t none = std::string_view::npos;
 
-    explicit XMLSplitter(String itemName) : _itemName(std::move(itemName)) {}
+    // Items are matched by their names as written, or, where the prefixes that a document writes
+    // are not known, by what stands behind these: then there are more.
+    enum class Match : std::uint8_t { names, localNames };
+    XMLSplitter(String itemName, Match match);
 
     // Goes on until a cut at `enough` bytes or more, or as far as whole tags reach. Always shown
     // with what it was shown before, from the last removal on.
@@ -72,6 +75,9 @@ private:
     bool pass(End end);
     bool fail();
 
+    bool isItemName(std::string_view name) const noexcept;
+
+    Match _match;
     String _itemName;
     std::string_view _text;
     std::size_t _at = 0;

@@ -132,9 +132,13 @@ void takeOverAccessors(const Property&, Object& held, Object& fresh, TakeOver&) 
         std::invoke(Setter, *instance, std::invoke(Getter, *other));
 }
 
+template <auto Setter>
+using SetterValue =
+    Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
+
 template <class T, auto Setter>
 bool callSetter(const Property&, Object& object, const Value& value) {
-    using V = Stored<std::tuple_element_t<0, typename Signature<decltype(Setter)>::Arguments>>;
+    using V = SetterValue<Setter>;
     T* instance = instanceIn<T>(object);
     return instance != nullptr && convert<V>(value, [&](V&& converted) {
                std::invoke(Setter, *instance, std::move(converted));
@@ -149,6 +153,7 @@ void describeGetter(Property& property) {
     if constexpr (Lendable<V> && std::is_lvalue_reference_v<Gotten<T, Member>>)
         property.lend = &lendMember<T, Member>;
     property.keepsZero = isOptional<V> || !std::derived_from<T, Object>;
+    property.objects = takenObjects<V>();
 }
 
 template <class T, auto Member>
@@ -209,6 +214,7 @@ Property accessorProperty(std::string_view name) {
     using V = Stored<Gotten<T, Getter>>;
     if constexpr (std::is_arithmetic_v<V> || std::is_enum_v<V>)
         property.takeOver = &takeOverAccessors<T, Getter, Setter>;
+    property.objects = takenObjects<SetterValue<Setter>>();
     return property;
 }
 
@@ -244,6 +250,7 @@ Property boundProperty(std::string_view name, V (T::*getter)() const, void (T::*
                });
     };
     property.keepsZero = isOptional<Stored<V>> || !std::derived_from<T, Object>;
+    property.objects = takenObjects<Stored<V>>();
     return property;
 }
 

@@ -4,24 +4,16 @@
 // containers. Included by ValueTraits.h. Each may have two ways to a value: `toValue`, which copies
 // structs, and `lend`, which refers to those that lie in it; `lend` is there where it differs.
 
+#include <QXXMLMarshalling/detail/TakenObjects.h>
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
-#include <array>
 #include <memory>
-#include <optional>
-#include <set>
-#include <unordered_set>
-#include <variant>
 
 namespace qx {
 
 namespace detail {
 
-template <class T>
-concept Struct = requires {
-    typename ValueTraits<T>::IsStruct;
-};
 template <class T>
 concept Lendable = requires(const T& value) {
     ValueTraits<T>::lend(value);
@@ -101,16 +93,6 @@ struct OwnerTraits {
     }
 };
 
-// The struct that the value is, if a pointer to T may own it: one of T itself, or of a class that
-// was described as derived from T.
-template <class T>
-StructObject* derivedStruct(const Value& value, bool isDeletedAsT) {
-    StructObject* held = structIn(value, typeid(T));
-    if (held == nullptr || held->type() == typeid(T))
-        return held;
-    return std::has_virtual_destructor_v<T> || !isDeletedAsT ? held : nullptr;
-}
-
 } // namespace detail
 
 template <class T>
@@ -131,7 +113,7 @@ struct ValueTraits<std::unique_ptr<T>> : detail::OwnerTraits<std::unique_ptr<T>>
             return true;
         }
         if constexpr (detail::Struct<T>) {
-            auto* held = detail::derivedStruct<T>(value, true);
+            auto* held = detail::Takes<std::unique_ptr<T>>::taken(value);
             void* whole = held != nullptr ? detail::takeOnHeap(*held) : nullptr;
             if (whole == nullptr)
                 return false;
@@ -161,7 +143,7 @@ struct ValueTraits<std::shared_ptr<T>> : detail::OwnerTraits<std::shared_ptr<T>>
             return true;
         }
         if constexpr (detail::Struct<T>) {
-            auto* held = detail::derivedStruct<T>(value, false);
+            auto* held = detail::Takes<std::shared_ptr<T>>::taken(value);
             auto owner = held != nullptr ? detail::takeShared(*held) : nullptr;
             if (!owner)
                 return false;
@@ -245,15 +227,13 @@ Value lentArray(const Container& values) {
 }
 
 // Hands each item to `take`; false where one is refused. No struct is moved before it is sure that
-// all are of the type.
+// all are of a class that is taken.
 template <class T, class Take>
 bool readItems(const Array& array, Take take) {
-    if constexpr (Struct<T>) {
-        for (const Value& item : array) {
-            const StructObject* held = structIn(item);
-            if (held == nullptr || held->type() != typeid(T))
+    if constexpr (Lendable<T> && TakesObjects<T>) {
+        for (const Value& item : array)
+            if ((Struct<T> || item.isObject()) && !Takes<T>::takes(item))
                 return false;
-        }
     }
     for (const Value& item : array)
         if (!convert<T>(item, take))

@@ -78,6 +78,9 @@ public:
     static const Class* named(std::string_view name);
     // The class described for the C++ type; null when there is none.
     static const Class* described(const std::type_info& type);
+    // The classes that were described for the C++ type, which need not be described itself, and for
+    // those that derive from it, by name.
+    static std::vector<const Class*> derivedFrom(const std::type_info& type);
     // Begins the description of T, whose base class is Base (Object when not given).
     template <class T, class Base = Object>
     static ClassBuilder<T> define(std::string_view name);

@@ -14,6 +14,7 @@ namespace qx {
 
 namespace detail {
 class TakeOver;
+struct TakenObjects;
 } // namespace detail
 
 // A property of instances. `get` and `set` are handed the property, for the members it stores.
@@ -33,6 +34,8 @@ struct Property {
     void (*takeOver)(const Property&, Object& held, Object& fresh, detail::TakeOver&) = nullptr;
     // Whether zero, false and empty text are values like any other when the object is written.
     bool keepsZero = false;
+    // Of which classes objects have to be; null for a property that takes no objects, or any.
+    const detail::TakenObjects* objects = nullptr;
     // Member function pointers that were only known at run time.
     Member getter{};
     Member setter{};
