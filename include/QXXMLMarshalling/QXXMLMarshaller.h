@@ -41,6 +41,7 @@ class ByteSource;
 class NamespaceTable;
 namespace detail {
 class NamespaceMatching;
+class ReadingProgress;
 } // namespace detail
 } // namespace qx
 
@@ -128,6 +129,23 @@ public:
     // The unknown XML that objects keep, and the nodes that are copied for that; 10,000 and 64.
     Limit maximumKeptNodes() const noexcept { return _maximumKeptNodes; }
     void setMaximumKeptNodes(Limit limit) noexcept { _maximumKeptNodes = limit; }
+
+    // How readFile(), readString(), readStream() and unmarshallEach() parse. A document may nest at
+    // least as deep as its objects may, whatever the options say. Other operations that parse
+    // have options of their own.
+    const qx::XMLParseOptions& parseOptions() const noexcept { return _parseOptions; }
+    void setParseOptions(const qx::XMLParseOptions& options) { _parseOptions = options; }
+    // Called with the bytes that have been gone over, about once a megabyte, while a text, a file
+    // or a stream is read, between two objects; `size` is 0 where it is not known. An answer of
+    // false ends the reading in
+    //   -226  "The reading was cancelled"
+    // It may use the marshaller as setters may, and replace the handler. Null for none.
+    struct Progress {
+        std::uint64_t bytesRead;
+        std::uint64_t size;
+    };
+    using ProgressHandler = qx::detail::UniqueFunction<bool(const Progress&)>;
+    void setProgressHandler(ProgressHandler handler);
 
     // A new document, version "1.0" and encoding "UTF-8", whose root represents the object; null
     // with one of the errors of marshallObject and of the fields. Kept unknown XML is moved, not
@@ -378,6 +396,7 @@ protected:
 
 private:
     friend class qx::detail::NamespaceMatching;
+    friend class qx::detail::ReadingProgress;
 
     bool matchNamespaces(NamespacePrefixes prefixes, bool matches, qx::Ref<qx::Error>* error);
     // The object of a document whose root is to be of that C++ type.
@@ -449,6 +468,8 @@ private:
     std::size_t _maximumDepth = 256;
     Limit _maximumObjects{10'000, 16};
     Limit _maximumKeptNodes{10'000, 64};
+    qx::XMLParseOptions _parseOptions;
+    std::shared_ptr<ProgressHandler> _progressHandler;
     bool _matchesNamespaces = false;
     NamespacePrefixes _namespacePrefixes;
     std::shared_ptr<const qx::NamespaceTable> _namespaces; // null: names are matched as written

@@ -77,6 +77,8 @@ bool Unmarshalling::isBeingBound(const ClassPlan& plan, Number element) const {
 
 bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error) {
     const Number element = source.element();
+    if (_progress != nullptr && !_progress->mayPass(_document.placeOf(element), error))
+        return false;
     if (isBeingBound(plan, element))
         return fail(error, errors::noDefinitionForElement, quoted(element));
     const std::size_t depth = _frame != nullptr ? _frame->depth : 0;
@@ -223,14 +225,18 @@ private:
 
 } // namespace
 
-Ref<Object> Unmarshalling::read(Number element, ErrorSlot error) {
+Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress* progress) {
+    _progress = progress;
     const ReadingGroup group(_marshaller->undoManager());
     const BulkObjects bulk;
     return unmarshallNode(element, IndexedXML::Nodes::own, error);
 }
 
 Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
-    return Unmarshalling(marshaller, document).read(document.root(), error);
+    ReadingProgress progress(marshaller, document.size());
+    auto object = Unmarshalling(marshaller, document).read(document.root(), error, &progress);
+    // Without a slot a collection leaves out what fails.
+    return progress.isCancelled() ? nullptr : object;
 }
 
 } // namespace qx::detail

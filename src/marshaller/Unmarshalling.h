@@ -17,6 +17,7 @@
 #include "marshaller/ConsumedNames.h"
 #include "marshaller/NamespaceMatching.h"
 #include "marshaller/ObjectAccess.h"
+#include "marshaller/ReadingProgress.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -47,7 +48,7 @@ public:
     Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
     // In an undo group of its own.
-    Ref<Object> read(Number element, ErrorSlot error);
+    Ref<Object> read(Number element, ErrorSlot error, ReadingProgress* progress = nullptr);
     // `nodes` are those that are kept of the element.
     Ref<Object> unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error);
     // `source` may be shared with the object that this one is flattened into.
@@ -106,6 +107,7 @@ private:
     const Use _use;
     ReadingBudget _budget;
     ObjectAccess _access;
+    ReadingProgress* _progress = nullptr;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;

@@ -30,8 +30,8 @@ void reset(Ref<Error>* error) {
 }
 
 // What is written is meant to be read by such a marshaller, too.
-qx::XMLParseOptions parseOptions(const QXXMLMarshaller& marshaller) {
-    qx::XMLParseOptions options;
+qx::XMLParseOptions parsingOf(const QXXMLMarshaller& marshaller) {
+    qx::XMLParseOptions options = marshaller.parseOptions();
     // An object may stand in a wrapper, and hold a last element with text.
     options.maximumDepth = std::max(options.maximumDepth, 2 * marshaller.maximumDepth() + 1);
     return options;
@@ -95,7 +95,7 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parse
 // Null for no data.
 qx::XMLParser::Parsed parsed(const QXXMLMarshaller& marshaller, Ref<qx::Data> data,
                              Ref<Error>* error) {
-    return data ? qx::XMLParser::parse(std::move(data), parseOptions(marshaller), error) : nullptr;
+    return data ? qx::XMLParser::parse(std::move(data), parsingOf(marshaller), error) : nullptr;
 }
 
 // What the reading of the new object does is no change of the one that is there.
@@ -192,7 +192,7 @@ Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, qx::XMLParser::parseCopy(xml, parseOptions(*this), error), type, error);
+    return objectOf(*this, qx::XMLParser::parseCopy(xml, parsingOf(*this), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
@@ -242,8 +242,11 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
     const auto match = qx::detail::NamespaceMatching::of(*this) != nullptr
                            ? qx::XMLSplitter::Match::localNames
                            : qx::XMLSplitter::Match::names;
-    qx::XMLPieces pieces(source, elementName, match, parseOptions(*this));
+    qx::XMLPieces pieces(source, elementName, match, parsingOf(*this));
+    qx::detail::ReadingProgress progress(*this, source.size());
     while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
+        if (!progress.mayPass(pieces.bytesRead(), &failure))
+            break;
         qx::IndexedXML document(*piece);
         qx::detail::Unmarshalling reading(*this, document);
         document.forEachOutermost(elementName, [&](qx::IndexedXML::Number item) {
@@ -263,7 +266,7 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
 
 bool QXXMLMarshaller::readBytesInto(qx::Object* object, qx::XMLBytes xml, Ref<Error>* error) {
     reset(error);
-    return fill(*this, present(object), qx::XMLParser::parseCopy(xml, parseOptions(*this), error),
+    return fill(*this, present(object), qx::XMLParser::parseCopy(xml, parsingOf(*this), error),
                 error);
 }
 
@@ -287,7 +290,7 @@ bool QXXMLMarshaller::readTreeInto(qx::Object* object, XMLDocument* document, Re
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
     reset(error);
-    const auto options = parseOptions(*this); // the getters may let go of the marshaller
+    const auto options = parsingOf(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     if (!document)
         return nullptr;
@@ -296,7 +299,7 @@ String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) 
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
     reset(error);
-    const auto options = parseOptions(*this); // the getters may let go of the marshaller
+    const auto options = parsingOf(*this); // the getters may let go of the marshaller
     const auto document = marshall(object, error);
     const auto write = [&] { return document->writeToFile(path, layout, error, options); };
     return document && written<bool>(write, error);
@@ -305,7 +308,7 @@ bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
                                   Ref<Error>* error) {
     reset(error);
-    const auto options = parseOptions(*this);
+    const auto options = parsingOf(*this);
     const auto document = marshall(object, error);
     const auto write = [&] { return document->writeToStream(stream, layout, error, options); };
     return document && written<bool>(write, error);

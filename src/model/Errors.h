@@ -97,6 +97,8 @@ inline constexpr ErrorText prefixOfTwoNamespaces{
     -225, "The prefix: %@ would stand for two namespaces: %@ and: %@", "Invalid Mapping"};
 inline constexpr ErrorText namespaceOfTwoPrefixes{
     -225, "The namespace: %@ would have two prefixes: %@ and: %@", "Invalid Mapping"};
+inline constexpr ErrorText readingCancelled{-226, "The reading was cancelled",
+                                            "The program asked for it."};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 

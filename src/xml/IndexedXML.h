@@ -55,6 +55,11 @@ public:
     const String& writtenName(Number number) const noexcept {
         return isMatched() ? index().name(index()[number]) : name(number);
     }
+    // Where an element begins among the bytes of the document's text; 0 in a tree, which has none.
+    std::size_t placeOf(Number element) const noexcept {
+        return _tree ? 0 : index()[element].begin;
+    }
+    std::size_t size() const noexcept { return _index != nullptr ? index().text().size() : 0; }
     // The number of an element's name among those of the document.
     std::uint32_t nameNumber(Number element) const noexcept {
         return isMatched() ? _matched[element] : index()[element].name();

@@ -33,7 +33,7 @@ private:
 };
 
 constexpr const char* mapping = "<Item xml='item'><id node='attribute'/><text node='text'/></Item>"
-                                "<Others xml='o'><items collection='array' type='Item'/></Others>";
+                                "<Others xml='o'><items collection='array' type='Item' name='item'/></Others>";
 
 struct Told {
     std::string objects;
@@ -204,4 +204,37 @@ TEST(Sequences, StopWhenTheVisitorSaysSoOrAnObjectFails) {
     EXPECT_FALSE(marshaller->unmarshallEach(
         "/no/such/file", "item", [](const Ref<qx::Object>&) {}, &error));
     EXPECT_EQ(error->code(), 260);
+}
+
+TEST(Sequences, AReadingTellsHowFarItIsAndCanBeCancelled) {
+    const std::string item = "<item id='1'>" + repeated("x", 1'000) + "</item>";
+    const std::string document = "<o>" + repeated(item, 3'500) + "</o>";
+    const auto marshaller = scenario::marshaller(mapping);
+    std::vector<std::uint64_t> told;
+    std::size_t most = 9;
+    marshaller->setProgressHandler([&](const QXXMLMarshaller::Progress& progress) {
+        told.push_back(progress.bytesRead / 1'000'000);
+        EXPECT_LE(progress.bytesRead, document.size());
+        return told.size() < most;
+    });
+    const auto readEach = [&](Ref<qx::Error>* error) {
+        std::istringstream stream(document);
+        return marshaller->unmarshallEach(
+            stream, "item", [](const Ref<qx::Object>&) {}, error);
+    };
+    using Megabytes = std::vector<std::uint64_t>;
+    EXPECT_TRUE(marshaller->readString(document));
+    EXPECT_EQ(std::exchange(told, {}), (Megabytes{1, 2, 3}));
+    EXPECT_TRUE(readEach(nullptr));
+    EXPECT_EQ(std::exchange(told, {}), (Megabytes{1, 2, 3}));
+    most = 2;
+    EXPECT_FALSE(marshaller->readString(document)) << "without a slot, too";
+    EXPECT_EQ(std::exchange(told, {}), (Megabytes{1, 2}));
+    for (const bool isEach : {false, true}) {
+        Ref<qx::Error> error;
+        EXPECT_FALSE(isEach ? readEach(&error) : !!marshaller->readString(document, &error));
+        EXPECT_EQ(scenario::told(error),
+                  "-226: The reading was cancelled (The program asked for it.)");
+        told.clear();
+    }
 }

@@ -2,12 +2,11 @@
 
 #include "qxxml/Commands.h"
 #include "qxxml/Failure.h"
+#include "qxxml/Output.h"
 
 #include <CLI/CLI.hpp>
 
-#include <cerrno>
 #include <cstdio>
-#include <cstring>
 #include <functional>
 #include <new>
 #include <sstream>
@@ -25,16 +24,6 @@ constexpr int wrongUsage = 2;
 int fail(const std::string& message) {
     std::fputs(("qxxml: error " + message + "\n").c_str(), stderr);
     return failed;
-}
-
-// Output that did not arrive whole is a failure; some of it only shows when it is flushed.
-int print(const std::string& text) {
-    errno = 0;
-    const bool written = std::fwrite(text.data(), 1, text.size(), stdout) == text.size();
-    if (written && std::fflush(stdout) == 0)
-        return 0;
-    return fail("512: " +
-                message("The standard output cannot be written: %@", std::strerror(errno)));
 }
 
 // What is wrong with the value of --application; nothing when it is empty.
@@ -105,8 +94,14 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
     addMapping(*command, options);
     addSearch(*command, options);
 
-    command = add("read", "Read a document into an object and print it as JSON", read);
+    command = add("read", "Read a document into an object and print it as JSON", nullptr);
+    command->callback([&] { chosen = options.each.empty() ? read : readEach; });
     addReading(*command, options);
+    command
+        ->add_option("--each", options.each,
+                     "Read each element of this name by itself and print one object a line, "
+                     "however large the document is")
+        ->option_text("NAME");
     addSearch(*command, options);
 
     command = add("roundtrip", "Read a document, write its object and print that", roundtrip);
@@ -125,8 +120,11 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
 // Help and version are asked for; anything else is wrong usage.
 int endParsing(const CLI::App& tool, const CLI::ParseError& error) {
     std::ostringstream text;
-    if (tool.exit(error, text, text) == 0)
-        return print(text.str());
+    if (tool.exit(error, text, text) == 0) {
+        print(text.str());
+        flushOutput();
+        return 0;
+    }
     std::fputs(("qxxml: " + text.str()).c_str(), stderr);
     return wrongUsage;
 }
@@ -143,7 +141,9 @@ int runCommandLine(int argc, const char* const* argv) try {
     } catch (const CLI::ParseError& error) {
         return endParsing(tool, error);
     }
-    return print(command(options));
+    print(command(options));
+    flushOutput();
+    return 0;
 } catch (const std::bad_alloc&) {
     std::fputs("qxxml: error 12: Out of memory\n", stderr);
     return failed;

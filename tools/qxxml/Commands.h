@@ -1,7 +1,8 @@
 #pragma once
 
 // The commands. Each gives the text for standard output, which is printed only once it is whole,
-// and throws Failure, or lets qx::Exception pass, when it cannot.
+// and throws Failure, or lets qx::Exception pass, when it cannot. What comes one by one (readEach)
+// is printed as it comes.
 
 #include "qxxml/Options.h"
 
@@ -11,6 +12,8 @@ namespace qxxml {
 std::string describe(const Options& options);
 // The document's object as JSON, see Json.h; "null" for a document that no class handles.
 std::string read(const Options& options);
+// An object a line as JSON, of each of the document's elements of one name.
+std::string readEach(const Options& options);
 // The document, read into an object and written from it.
 std::string roundtrip(const Options& options);
 // The path that a name resolves to, and the places that were looked at up to there.

@@ -120,4 +120,8 @@ std::string textOf(const ordered_json& json) {
     return json.dump(4, ' ', false, ordered_json::error_handler_t::replace);
 }
 
+std::string lineOf(const ordered_json& json) {
+    return json.dump(-1, ' ', false, ordered_json::error_handler_t::replace);
+}
+
 } // namespace qxxml

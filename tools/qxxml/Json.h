@@ -30,5 +30,7 @@ inline constexpr std::size_t deepestJson = 1024;
 nlohmann::ordered_json jsonOf(const qx::Value& value);
 // One member or item a line, 4 blanks a level. Bytes that are no UTF-8 become U+FFFD.
 std::string textOf(const nlohmann::ordered_json& json);
+// All of it on one line.
+std::string lineOf(const nlohmann::ordered_json& json);
 
 } // namespace qxxml

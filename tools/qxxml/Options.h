@@ -11,6 +11,7 @@ struct Options {
     std::string mapping;  // path of the mapping document
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
+    std::string each; // the name of the elements to read one by one; empty for the whole document
 
     bool strict = false;
     bool discardUnknown = false;

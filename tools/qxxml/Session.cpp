@@ -50,21 +50,35 @@ qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
 }
 
 qx::Ref<qx::Object> Session::readObject(QXXMLMarshaller& marshaller) const {
-    const bool isStandardInput = _options.document == "-";
-    const std::string file = isStandardInput ? "<stdin>" : _options.document;
+    const auto parsing = parseOptions();
+    qx::Ref<qx::Error> error;
+    const auto document =
+        isStandardInput()
+            ? qx::XMLDocument::initWithStream(std::cin, parsing, &error)
+            : qx::XMLDocument::initWithContentsOfFile(_options.document, parsing, &error);
+    if (!document)
+        throw Failure(error, file());
+    auto object = marshaller.unmarshall(document, &error);
+    if (error)
+        throw Failure(error, file());
+    return object;
+}
+
+void Session::readEach(QXXMLMarshaller& marshaller, const std::string& elementName,
+                       const std::function<void(const qx::Ref<qx::Object>&)>& visit) const {
+    // A descriptor gives what a pipe has; a stream may wait for more.
+    const std::string path = isStandardInput() ? "/dev/stdin" : _options.document;
+    marshaller.setParseOptions(parseOptions());
+    qx::Ref<qx::Error> error;
+    if (!marshaller.unmarshallEach(path, elementName, visit, &error))
+        throw Failure(error, file());
+}
+
+qx::XMLParseOptions Session::parseOptions() const {
     qx::XMLParseOptions parsing;
     parsing.keepWhiteSpace = _options.keepWhiteSpace;
     parsing.refuseDoctype = _options.noDoctype;
-    qx::Ref<qx::Error> error;
-    const auto document = isStandardInput
-                              ? qx::XMLDocument::initWithStream(std::cin, parsing, &error)
-                              : qx::XMLDocument::initWithContentsOfFile(file, parsing, &error);
-    if (!document)
-        throw Failure(error, file);
-    auto object = marshaller.unmarshall(document, &error);
-    if (error)
-        throw Failure(error, file);
-    return object;
+    return parsing;
 }
 
 } // namespace qxxml

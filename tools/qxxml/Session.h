@@ -8,6 +8,8 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include <functional>
+
 namespace qxxml {
 
 class Session {
@@ -21,7 +23,16 @@ public:
     // The object that the marshaller reads from the document; null where no class handles it.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
 
+    // Calls visit(object) for each outermost element of that name.
+    void readEach(QXXMLMarshaller& marshaller, const std::string& elementName,
+                  const std::function<void(const qx::Ref<qx::Object>&)>& visit) const;
+
 private:
+    qx::XMLParseOptions parseOptions() const;
+    // As messages call it.
+    std::string file() const { return isStandardInput() ? "<stdin>" : _options.document; }
+    bool isStandardInput() const { return _options.document == "-"; }
+
     const Options& _options;
     qx::Ref<ToolRepository> _repository;
 };

@@ -34,10 +34,12 @@ void run(const std::string& page, std::size_t least, Answer answer) {
 
 } // namespace
 
-TEST(Commands, DoWhatTheirPageShows) {
-    run("docs/qxxml.md", 8, [](const Shell& home, const std::string& command) {
+TEST(Commands, DoWhatTheirPagesShow) {
+    const auto answer = [](const Shell& home, const std::string& command) {
         return home.run(command + " 2>&1").output;
-    });
+    };
+    run("docs/qxxml.md", 8, answer);
+    run("docs/large-documents.md", 2, answer);
 }
 
 TEST(Commands, AreAnsweredWithOutputErrorsAndStatus) {
