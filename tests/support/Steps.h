@@ -1,0 +1,40 @@
+#pragma once
+
+// Steps on a page of cases (support/Cases.h): in a ```text steps block each line is a command and,
+// behind "=>", what it says or raises. A line without "=>" says nothing.
+//
+//     set rome.city Roma      => city: Rome > Roma
+//
+// A world has the commands of a page by their first words. Each block begins in a new world.
+
+#include "support/Cases.h"
+
+#include <vector>
+
+namespace support {
+
+class Steps {
+public:
+    void perform(const std::string& steps);
+
+protected:
+    using Arguments = std::vector<std::string>; // the other words of the line
+    using Command = std::function<void(const Arguments&)>;
+
+    // Adds commands, in the place of those that have their names.
+    void know(const std::map<std::string, Command>& commands);
+    void call(const std::string& command, const Arguments& arguments);
+    void say(const std::string& what);
+
+private:
+    std::map<std::string, Command> _commands;
+    std::string _said;
+};
+
+template <class World>
+bool addSteps(const std::string& page) {
+    return addCases(page, {}, {"steps"},
+                    [](const Expectation& expected) { World().perform(expected.text); });
+}
+
+} // namespace support
