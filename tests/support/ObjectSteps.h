@@ -47,29 +47,26 @@ public:
             const std::string& note = notebook->notes.back();
             say(note.starts_with("whole:") ? oneLine(notebook->seen) : note);
         };
-        know({{"make", [this](auto& words) { makeObject(words); }},
-              {"set", [this](auto& words) { set(words.at(0), value(words.at(1))); }},
-              {"get",
-               [this](auto& words) {
-                   const auto [object, key] = place(words.at(0));
-                   sayValue(object->valueForKey(key));
-               }},
-              {"perform", [this](auto& words) { performMessage(words); }},
-              {"observe", [this](auto& words) { observe(words); }},
-              {"ignore",
-               [this](auto& words) {
-                   const auto [object, path] = place(words.at(0));
-                   if (words.size() > 1)
-                       object->removeObserver(notebook.get(), path, words[1].c_str());
-                   else
-                       object->removeObserver(notebook.get(), path);
-               }},
-              {"change",
-               [this](auto& words) {
-                   const auto [object, key] = place(words.at(0));
-                   scopes.push_back(std::make_unique<qx::ChangeScope>(*object, key));
-               }},
-              {"changed", [this](auto&) { scopes.pop_back(); }}});
+        know("make", [this](auto& words) { makeObject(words); });
+        know("set", [this](auto& words) { set(words.at(0), value(words.at(1))); });
+        know("get", [this](auto& words) {
+            const auto [object, key] = place(words.at(0));
+            sayValue(object->valueForKey(key));
+        });
+        know("perform", [this](auto& words) { performMessage(words); });
+        know("observe", [this](auto& words) { observe(words); });
+        know("ignore", [this](auto& words) {
+            const auto [object, path] = place(words.at(0));
+            if (words.size() > 1)
+                object->removeObserver(notebook.get(), path, words[1].c_str());
+            else
+                object->removeObserver(notebook.get(), path);
+        });
+        know("change", [this](auto& words) {
+            const auto [object, key] = place(words.at(0));
+            scopes.push_back(std::make_unique<qx::ChangeScope>(*object, key));
+        });
+        know("changed", [this](auto&) { scopes.pop_back(); });
     }
 
 protected:

@@ -27,11 +27,6 @@ void Steps::perform(const std::string& steps) {
     }
 }
 
-void Steps::know(const std::map<std::string, Command>& commands) {
-    for (const auto& [name, command] : commands)
-        _commands[name] = command;
-}
-
 void Steps::call(const std::string& command, const Arguments& arguments) {
     const auto known = _commands.find(command);
     ASSERT_NE(known, _commands.end()) << command << " is no command of the page";

@@ -21,8 +21,7 @@ protected:
     using Arguments = std::vector<std::string>; // the other words of the line
     using Command = std::function<void(const Arguments&)>;
 
-    // Adds commands, in the place of those that have their names.
-    void know(const std::map<std::string, Command>& commands);
+    void know(const std::string& name, Command command) { _commands[name] = std::move(command); }
     void call(const std::string& command, const Arguments& arguments);
     void say(const std::string& what);
 
