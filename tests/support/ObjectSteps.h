@@ -3,7 +3,7 @@
 // Steps with objects, their keys and who observes them (support/Steps.h for how they are written):
 //
 //     make NAME CLASS [KEY VALUE]…    an object, by its name from here on
-//     set NAME.KEY VALUE              a word, a number, null, or an object by its name
+//     set NAME.KEY VALUE              a word, a number, null, <null> or an object
 //     get NAME.KEY                    says the value
 //     perform NAME MESSAGE VALUE…     says what comes back
 //     observe NAME.PATH [CONTEXT [OPTION]…]
@@ -17,6 +17,7 @@
 
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
+#include <QXXMLMarshalling/model/Null.h>
 #include <QXXMLMarshalling/observe/Observation.h>
 
 #include <charconv>
@@ -79,14 +80,16 @@ protected:
         const auto object = objects.find(word);
         if (object != objects.end())
             return object->second;
-        int number = 0;
+        double number = 0;
         const auto end = word.data() + word.size();
-        if (!word.empty() && std::from_chars(word.data(), end, number).ptr == end)
-            return number;
+        if (std::from_chars(word.data(), end, number).ptr == end && !word.empty())
+            return word.find('.') == word.npos ? qx::Value(static_cast<int>(number)) : number;
+        if (word == "<null>")
+            return qx::Null::marker();
         return word == "null" ? qx::Value() : qx::Value(word);
     }
     void sayValue(const qx::Value& value) {
-        const std::string text = oneLine(value);
+        const std::string text = value.isNull() ? "null" : oneLine(value);
         say(value.kind() == qx::Value::Kind::string ? '"' + text + '"' : text);
     }
     void set(const std::string& where, const qx::Value& value) const {

@@ -9,7 +9,9 @@ namespace support {
 
 void Steps::perform(const std::string& steps) {
     std::istringstream lines(steps);
+    int number = 0;
     for (std::string line; std::getline(lines, line);) {
+        ++number;
         const std::size_t arrow = line.find("=>");
         std::istringstream text(line.substr(0, arrow));
         std::string command;
@@ -23,7 +25,8 @@ void Steps::perform(const std::string& steps) {
         } catch (const std::exception& raised) {
             say(raised.what());
         }
-        EXPECT_EQ(_said, arrow == std::string::npos ? "" : line.substr(arrow + 3)) << line;
+        EXPECT_EQ(_said, arrow == std::string::npos ? "" : line.substr(arrow + 3))
+            << "step " << number << ": " << line;
     }
 }
 

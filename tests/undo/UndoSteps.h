@@ -7,7 +7,7 @@
 //     scope [NAME]                     an UndoGroup, which "leave" ends
 //     step NAME.KEY VALUE [NAME]       a scope with that change alone
 //     later COMMAND                    the command as an undo action
-//     register NAME|null MESSAGE       the message as an undo action
+//     register NAME|null MESSAGE VALUE the message as an undo action
 //     can                              says what can be done: undo, redo or nothing
 //     level, names                     say how many groups are open, the names to undo and redo
 
@@ -45,7 +45,7 @@ public:
         });
         know("register", [this](const Arguments& words) {
             const auto target = value(words.at(0)).as<qx::Object>();
-            manager->registerUndoWithTarget(target.get(), words.at(1).c_str(), nullptr);
+            manager->registerUndoWithTarget(target.get(), words.at(1).c_str(), value(words.at(2)));
         });
         know("can", [this](auto&) {
             const std::string redo = manager->canRedo() ? "redo" : "nothing";
@@ -57,6 +57,7 @@ public:
                 say(name.description().str());
         });
     }
+    ~UndoSteps() { manager->removeAllActions(); }
 
 protected:
     qx::Ref<qx::UndoManager> manager = qx::make<qx::UndoManager>();
