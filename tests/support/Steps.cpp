@@ -38,4 +38,11 @@ void Steps::call(const std::string& command, const Arguments& arguments) {
 
 void Steps::say(const std::string& what) { _said += (_said.empty() ? "" : "; ") + what; }
 
+std::string unescaped(const std::string& text) {
+    std::string bytes = text;
+    for (std::size_t at = 0; (at = bytes.find("\\x", at)) != std::string::npos; ++at)
+        bytes.replace(at, 4, 1, static_cast<char>(std::stoi(bytes.substr(at + 2, 2), nullptr, 16)));
+    return bytes;
+}
+
 } // namespace support

@@ -30,6 +30,9 @@ private:
     std::string _said;
 };
 
+// With bytes in the place of "\x1F" and the like.
+std::string unescaped(const std::string& text);
+
 template <class World>
 bool addSteps(const std::string& page) {
     return addCases(page, {}, {"steps"},

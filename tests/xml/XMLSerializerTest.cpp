@@ -72,60 +72,6 @@ TEST(XMLSerializer, TextsThatAParserWouldChangeAreReadBack) {
     }
 }
 
-TEST(XMLSerializer, EmptyElementsMayBeCompact) {
-    const auto document = XMLDocument::initWithData("<a><b c='1'></b>x<d>y</d></a>");
-    EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements), "<a><b c=\"1\"/>x<d>y</d></a>");
-    document->rootElement()->setStringValue("");
-    EXPECT_EQ(document->XMLString(qx::XMLCompactEmptyElements | qx::XMLPrettyPrint), "<a/>\n");
-}
-
-TEST(XMLSerializer, ANodeAloneIsWrittenByItsKind) {
-    EXPECT_EQ(XMLNode::attributeWithName("a", "<\"\n'")->XMLString(), "a=\"&lt;&quot;&#10;'\"");
-    EXPECT_EQ(XMLNode::namespaceWithName("", "u")->XMLString(), "xmlns=\"u\"");
-    EXPECT_EQ(XMLNode::namespaceWithName("p", "u")->XMLString(), "xmlns:p=\"u\"");
-    EXPECT_EQ(XMLNode::initTextWithStringValue("a>\"")->XMLString(), "a&gt;\"");
-    EXPECT_EQ(XMLNode::initCommentWithStringValue("a-b")->XMLString(), "<!--a-b-->");
-    EXPECT_EQ(XMLNode::initProcessingInstructionWithName("a", "")->XMLString(), "<?a?>");
-}
-
-TEST(XMLSerializer, WhatWouldBeNoXMLIsRefusedByItsPlace) {
-    const auto comment = "a comment holds \"--\" or ends in \"-\" at /order/item[2]/comment()";
-    const std::string instruction =
-        "a processing instruction would not be read back as it is at /order/item[2]/?";
-    const std::pair<Ref<XMLNode>, std::string> cases[] = {
-        {XMLNode::attributeWithName("a b", ""), "a name is no XML name at /order/item[2]/@a b"},
-        {XMLElement::initWithName("1"), "a name is no XML name at /order/item[2]/1"},
-        {XMLElement::initWithName(nullptr), "a name is no XML name at /order/item[2]/"},
-        {XMLNode::namespaceWithName("1", "u"), "a name is no XML name at /order/item[2]/@xmlns:1"},
-        {XMLNode::attributeWithName("c", "\x1F"),
-         "a text holds a control character at /order/item[2]/@c"},
-        {XMLNode::initTextWithStringValue(std::string_view("\0", 1)),
-         "a text holds a control character at /order/item[2]/text()"},
-        {XMLNode::initTextWithStringValue("\xC0\x80"),
-         "a text holds what is no XML character at /order/item[2]/text()"},
-        {XMLNode::initCommentWithStringValue("a--b"), comment},
-        {XMLNode::initCommentWithStringValue("a-"), comment},
-        {XMLNode::initProcessingInstructionWithName("p", "?>"), instruction + "p"},
-        {XMLNode::initProcessingInstructionWithName("XML", ""), instruction + "XML"},
-        {XMLNode::attributeWithName("xmlns:p", "u"),
-         "a namespace is declared twice at /order/item[2]/@xmlns:p"},
-    };
-    for (const auto& [node, reason] : cases) {
-        const auto document =
-            XMLDocument::initWithData("<order><item/><item xmlns:p='u'/></order>");
-        XMLElement& item = *document->rootElement()->lastChild()->asElement();
-        if (node->kind() == qx::XMLNodeKind::attribute)
-            item.addAttribute(node);
-        else if (node->kind() == qx::XMLNodeKind::namespaceDeclaration)
-            item.addNamespace(node);
-        else
-            item.addChild(node);
-        EXPECT_EQ(support::raised([&] { document->XMLString(); }),
-                  "NSInvalidArgumentException: " + reason);
-        EXPECT_TRUE(document->description().view().starts_with("<order><item></item><item"));
-    }
-}
-
 // Rows make <a> with as much in it as may be read, or one more.
 TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
     const auto x = [](std::size_t size) { return std::string(size, 'x'); };
@@ -218,23 +164,6 @@ TEST(XMLSerializer, WhatIsBeyondALimitOfReadingIsNotWritten) {
             const std::string refusal = "NSInvalidArgumentException: "s + row.reason + " at ";
             EXPECT_EQ(outcome.substr(0, refusal.size()), extra == 0 ? "nothing" : refusal);
         }
-}
-
-TEST(XMLSerializer, ADocumentDeclaresWhatIsSet) {
-    const auto document = XMLDocument::initWithRootElement(XMLElement::initWithName("a"));
-    EXPECT_EQ(document->XMLData(), "<a></a>");
-    document->setCharacterEncoding("utf-8");
-    EXPECT_EQ(document->XMLData(), "<?xml version=\"1.0\" encoding=\"utf-8\"?><a></a>");
-    document->setVersion("1.0");
-    document->setStandalone("no");
-    EXPECT_EQ(document->XMLData(),
-              "<?xml version=\"1.0\" encoding=\"utf-8\" standalone=\"no\"?><a></a>");
-    document->setVersion("2.0");
-    EXPECT_THROW(document->XMLData(), qx::Exception);
-    document->setVersion("1.0");
-    document->setStandalone("maybe");
-    EXPECT_THROW(document->XMLData(), qx::Exception);
-    EXPECT_THROW(XMLDocument::initWithRootElement(nullptr)->XMLData(), qx::Exception);
 }
 
 TEST(XMLSerializer, EncodingsHoldWhatTheyCanAndReferToTheRest) {
