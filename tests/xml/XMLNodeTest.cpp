@@ -1,4 +1,3 @@
-#include "Text.h"
 #include "support/Steps.h"
 #include "support/Texts.h"
 
@@ -17,6 +16,7 @@ using qx::XMLDocument;
 using qx::XMLElement;
 using qx::XMLNode;
 using support::parsed;
+using support::repeated;
 using namespace std::string_literals;
 
 // What trees.md does with nodes.

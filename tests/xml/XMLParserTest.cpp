@@ -1,5 +1,5 @@
-#include "Text.h"
 #include "support/Steps.h"
+#include "support/Texts.h"
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
@@ -13,6 +13,7 @@ using qx::Ref;
 using qx::XMLDocument;
 using qx::XMLElement;
 using qx::XMLNode;
+using support::repeated;
 using namespace std::string_literals;
 
 // The document as XML, or its error as "line:column code message".
