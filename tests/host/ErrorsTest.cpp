@@ -68,38 +68,6 @@ TEST(ErrorsTest, TextsAreLookedUpWhenTheyAreAskedFor) {
     EXPECT_EQ(error->localizedDescription(), "The document is empty");
 }
 
-TEST(StringsFileTest, EntriesAreReadButThoseThatAreFaulty) {
-    using Texts = StringsFile::Texts;
-    const std::string face = "\xF0\x9F\x98\x80";
-    const struct {
-        std::string file;
-        Texts texts;
-        std::vector<std::size_t> faultyLines;
-    } rows[]{{"\xEF\xBB\xBF/* \"not\" = \"this\"; */ // nor this\n"
-              "\"a\"=\"A\";\"tab\\t\" = \"\\\"\\\\ \\U00fc\\n\" ; \"none\" = \"\";",
-              {{"a", "A"}, {"tab\t", "\"\\ \xC3\xBC\n"}},
-              {}},
-             {R"("two" = "\UD83D\ude00"; "half" = "\UD83Dx";)", // and one half alone
-              {{"two", face}, {"half", "\xEF\xBF\xBDx"}},
-              {}},
-             {"\"a\" \"A\"; \"b\" = \"B\";\n\"c\" = \"C\"\n\"d\" = \"D\";",
-              {{"b", "B"}, {"d", "D"}},
-              {1, 2}},
-             {"\"a\" = \"A;\n\"b\" = \"B\";\n\"c\" // = \"C\";\n\"d\" = \"D\"; \"",
-              {{"b", "B"}, {"d", "D"}},
-              {1, 3, 4}},
-             {"\"a\" = \"\xFC\"; /* no end\n\"b\" = \"\\U12\"; \"c\" = \"C\"; \"d\" = \"\\U0000\";",
-              {{"c", "C"}},
-              {1, 2}}};
-    for (const auto& row : rows) {
-        const StringsFile read = parseStrings(row.file);
-        EXPECT_EQ(read.texts, row.texts) << row.file;
-        EXPECT_EQ(read.faultyLines, row.faultyLines) << row.file;
-    }
-    for (const char* cut : {"", "\"", "\"a\\", R"("a" = "\U12)", "/*", "//"})
-        EXPECT_TRUE(parseStrings(cut).texts.empty()) << cut;
-}
-
 TEST(StringsFileTest, UTF16ShowsByItsFirstBytes) {
     const std::u16string text = u"\"a\" = \"\u00E4\U0001F600\";";
     for (const std::u16string& file : {u"\uFEFF" + text, text})

@@ -1,6 +1,7 @@
-// What stands around a program, by steps: host.md.
+// What stands around a program, by steps (host.md), and files of translations (strings.md).
 
 #include "host/Directories.h"
+#include "host/StringsFile.h"
 #include "model/Errors.h"
 
 #include "support/FileSandbox.h"
@@ -69,6 +70,17 @@ private:
     Ref<Bundle> app = folder.bundle("app");
 };
 const bool added = support::addSteps<HostSteps>("tests/host/host.md");
+
+const bool addedStrings =
+    support::addCases("tests/host/strings.md", {"strings"}, {"entries"}, [](const auto& expected) {
+        const StringsFile read = parseStrings(support::unescaped(expected.given.at("strings")));
+        std::string text;
+        for (const auto& [key, translation] : read.texts)
+            text += key + " = " + translation.str() + "\n";
+        for (const std::size_t line : read.faultyLines)
+            text += "line " + std::to_string(line) + " is faulty\n";
+        EXPECT_EQ(text, support::unescaped(expected.text));
+    });
 
 TEST(DirectoriesTest, AServiceWithoutAHomeHasThatOfItsAccount) {
     FileSandbox sandbox;
