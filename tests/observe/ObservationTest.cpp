@@ -42,6 +42,13 @@ public:
     static bool notifies(const String& key) { return key != "silent"; }
 };
 
+// Does something at its end.
+struct Wagon : Place {
+    ~Wagon() override { onEnd(*this); }
+    Ref<Wagon> next;
+    std::function<void(Wagon&)> onEnd;
+};
+
 const bool described = [] {
     Class::define<Place>("Place")
         .property<&Place::city>("city")
@@ -55,6 +62,7 @@ const bool described = [] {
         .classOperation<&Place::affecting>("keyPathsForValuesAffectingValueForKey:")
         .classOperation<&Place::affectingAddress>("keyPathsForValuesAffectingAddress")
         .classOperation<&Place::notifies>("automaticallyNotifiesObserversForKey:");
+    Class::define<Wagon, Place>("Wagon");
     return true;
 }();
 
@@ -253,6 +261,49 @@ TEST_F(ObservationTest, AThrowingPriorObserverCancelsTheAnnouncement) {
     EXPECT_EQ(rome->city, "Rome");
     refuses = false;
     EXPECT_EQ(afterSetting(*rome, "city", "Roma"), Texts{"city: Rome > Roma"});
+}
+
+TEST_F(ObservationTest, ALongChainOfObservedObjectsEndsWholeWhateverItsDestructorsDo) {
+    const auto engine = place("engine");
+    int told = 0, ended = 0;
+    std::vector<WeakRef<Object>> seen;
+    std::vector<ObservationToken> tokens;
+    const auto atEnd = [&](Wagon& wagon) {
+        ++ended;
+        seen.emplace_back(&wagon);
+        tokens.push_back(wagon.observe("city", [&](const ValueChange&) { ++told; }));
+        // Beyond a depth the following one is whole still and waits for its end.
+        Wagon* following = ended % 64 == 0 ? wagon.next.get() : nullptr;
+        wagon.next = nullptr;
+        if (following != nullptr) {
+            EXPECT_EQ(following->isa().name(), "Wagon");
+            WeakRef<Wagon> waiting(following);
+            EXPECT_FALSE(waiting);
+            tokens.push_back(following->observe("city", [&](const ValueChange&) { ++told; }));
+            following->setValueForKey("coal", "city");
+        }
+        engine->setValueForKey(std::to_string(ended), "city");
+    };
+    for (const bool observed : {false, true}) {
+        Ref<Wagon> train;
+        for (int i = 0; i < 640; ++i) {
+            auto wagon = make<Wagon>();
+            wagon->next = std::move(train);
+            wagon->within = engine;
+            wagon->onEnd = atEnd;
+            if (observed)
+                tokens.push_back(wagon->observe("within.city", [&](const ValueChange& change) {
+                    ++told;
+                    EXPECT_EQ(change.object.isa().name(), "Wagon");
+                }));
+            train = std::move(wagon);
+        }
+        train = nullptr;
+    }
+    EXPECT_EQ(ended, 1280);
+    EXPECT_GT(told, 0); // by those whose turn it was not yet
+    for (const auto& one : seen)
+        EXPECT_FALSE(one);
 }
 
 TEST_F(ObservationTest, ManyObservationsCostTheSameInAnyOrder) {

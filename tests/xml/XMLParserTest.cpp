@@ -250,8 +250,8 @@ TEST(XMLParser, OnlyAttributesCountAsAttributes) {
             << inside.substr(0, 20);
 }
 
-TEST(XMLParser, DocumentsComeInManyEncodings) {
-    const std::string utf16 = "<?xml version='1.0' encoding='UTF-16'?><a>\xC3\xA9</a>";
+// Encodings of one byte: documents.md.
+TEST(XMLParser, DocumentsComeInUTF16) {
     const auto wide = [](std::string_view text, bool big) {
         std::string bytes;
         for (std::size_t i = 0; i < text.size(); ++i) {
@@ -261,28 +261,14 @@ TEST(XMLParser, DocumentsComeInManyEncodings) {
         return bytes;
     };
     const std::string accent = "<a>\xC3\xA9</a>";
-    const auto withLabel = [&](const char* label) {
-        return "<?xml version=\"1.0\" encoding=\""s + label + "\"?>" + accent;
-    };
-    run({
-        {"\xFE\xFF" + wide(utf16, true), withLabel("UTF-16")},
-        {"\xFF\xFE" + wide(utf16, false), withLabel("UTF-16")},
-        {wide(accent, true), accent},
-        {wide(accent, false), accent},
-        {"<?xml version='1.0' encoding='ISO-8859-1'?><a>\xE9</a>", withLabel("ISO-8859-1")},
-        {"<?xml version='1.0' encoding = 'windows-1252'?><a>\xE9</a>", withLabel("windows-1252")},
-        {"<?xml version='1.0' encoding='utf-8'?><a>\xC3\xA9</a>", withLabel("utf-8")},
-        {"<?xml version='1.0' encoding='nope'?><a/>", "1:1 32 The encoding nope is not known"},
-        {"<?xml version='1.0' encoding='UTF-8//IGNORE'?><a/>",
-         "1:1 32 The encoding UTF-8//IGNORE is not known"},
-        {"<?xml version='1.0' encoding='UTF-16'?><a></a>",
-         "1:1 81 The document is not in the encoding that it declares, UTF-16"},
-        {"<?xml version='1.0' encoding='US-ASCII'?>\n<a>\xE9</a>",
-         "2:4 81 A character is not in the encoding US-ASCII"},
-        {"\xFE\xFF" + wide("<a>\n</a>", true) + "x",
-         "2:5 81 A character is not in the encoding UTF-16BE"},
-        {"\xFF\xFE", "1:1 4 The document is empty"},
-    });
+    const std::string labelled = "<?xml version=\"1.0\" encoding=\"UTF-16\"?>" + accent;
+    run({{"\xFE\xFF" + wide(labelled, true), labelled},
+         {"\xFF\xFE" + wide(labelled, false), labelled},
+         {wide(accent, true), accent},
+         {wide(accent, false), accent},
+         {"\xFE\xFF" + wide("<a>\n</a>", true) + "x",
+          "2:5 81 A character is not in the encoding UTF-16BE"},
+         {"\xFF\xFE", "1:1 4 The document is empty"}});
 }
 
 } // namespace
