@@ -1,5 +1,6 @@
-// Plain structs: how they are asked for, and where they lie while they are read and written. The types
-// of their members are tried in StructMembersTest.cpp, kinds of binding by the pages of cases.
+// Plain structs: how they are asked for, and where they lie while they are read and written. The
+// types of their members are tried in StructMembersTest.cpp, kinds of binding by the pages of
+// cases.
 
 #include "Structs.h"
 
