@@ -1,6 +1,6 @@
-// Plain structs by the call and where they lie meanwhile. StructMembersTest.cpp has the
-// types of their members, and the pages of cases run on structs,
-// too.
+// Plain structs: how they are asked for, and where they lie while they are read and written. The
+// types of their members are tried in StructMembersTest.cpp, kinds of binding by the pages of
+// cases.
 
 #include "Structs.h"
 

@@ -120,6 +120,7 @@ const std::string documentText = pairText.substr(mappingText.size() + separator.
 // What an operation of a marshaller works on, and what it gives.
 struct Stage {
     Ref<M> marshaller = M::initWithMappingXML(qx::XMLDocument::initWithData(mappingText).get());
+    M& m = *marshaller;
     Ref<qx::XMLDocument> document = qx::XMLDocument::initWithData(documentText);
     Ref<qx::XMLElement> root{document->rootElement()};
     Ref<qx::XMLDocument> withoutNodes = qx::XMLDocument::initWithData(documentText);
@@ -172,11 +173,11 @@ private:
 };
 
 void tryMarshaller(const std::string& name, bool changesArguments,
-                   const std::function<void(M&, Stage&)>& operation) {
+                   const std::function<void(Stage&)>& operation) {
     tryEach(name, [&] {
         const auto stage = std::make_shared<Stage>();
         Trial trial;
-        trial.operation = [stage, &operation] { operation(*stage->marshaller, *stage); };
+        trial.operation = [stage, &operation] { operation(*stage); };
         trial.outcome = [stage] { return stage->outcome(); };
         trial.restore = [stage, changesArguments] {
             stage->error = nullptr;
@@ -188,94 +189,81 @@ void tryMarshaller(const std::string& name, bool changesArguments,
 }
 
 void marshalling() {
-    const std::pair<const char*, std::function<void(M&, Stage&)>> making[] = {
-        {"initWithMappingXML",
-         [](M& m, Stage& s) {
-             const auto made = M::initWithMappingXML(m.mapping()->document(), &s.error);
-             s.text =
-                 made ? std::to_string(made->mapping()->mapping()->classMappings().size()) : "";
-         }},
-        {"unmarshall", [](M& m, Stage& s) { s.made = m.unmarshall(s.document, &s.error); }},
-        {"unmarshall without nodes",
-         [](M& m, Stage& s) {
-             s.made = m.unmarshall(s.withoutNodes, &s.error);
-             s.text = s.withoutNodes->description().str();
-         }},
-        {"rootElement",
-         [](M&, Stage& s) { s.made = Ref<qx::Object>(s.withoutNodes->rootElement()); }},
-        {"unmarshallElement",
-         [](M& m, Stage& s) { s.made = m.unmarshallElement(s.root.get(), &s.error); }},
-        {"buildClassWithMapping",
-         [](M& m, Stage& s) {
-             s.made = m.buildClassWithMapping(s.type(), s.root.get(), false, &s.error);
-         }},
-        {"allocateClassWithMapping",
-         [](M& m, Stage& s) {
-             s.made = m.allocateClassWithMapping(s.type(), &s.error);
-             s.made->setValueForKey("n", "number");
-             s.made->setValueForKey(s.order, "flat");
-         }},
-        {"readString", [](M& m, Stage& s) { s.made = m.readString(documentText, &s.error); }},
-        {"marshallObject", [](M& m, Stage& s) { s.made = m.marshallObject(s.order, &s.error); }},
-        {"elementWithMapping",
-         [](M& m, Stage& s) { s.made = m.elementWithMapping(s.type(), *s.order, &s.error); }},
-        {"marshall",
-         [](M& m, Stage& s) {
-             const auto document = m.marshall(s.order, &s.error);
-             s.made = Ref<qx::Object>(document ? document->rootElement() : nullptr);
-         }},
-        {"writeString", [](M& m, Stage& s) { s.text = m.writeString(s.order, &s.error).str(); }},
-        {"writeStream", [](M& m, Stage& s) {
-             Buffer buffer;
-             std::ostream out(&buffer);
-             s.result = m.writeStream(s.order, out, &s.error);
-             s.text = buffer.text();
-         }}};
-    for (const auto& [name, operation] : making)
-        tryMarshaller(name, false, operation);
+    const auto tryMaking = [](const char* name, auto make) { tryMarshaller(name, false, make); };
+    tryMaking("initWithMappingXML", [](Stage& s) {
+        const auto made = M::initWithMappingXML(s.m.mapping()->document(), &s.error);
+        s.text = made ? std::to_string(made->mapping()->mapping()->classMappings().size()) : "";
+    });
+    tryMaking("unmarshall", [](Stage& s) { s.made = s.m.unmarshall(s.document, &s.error); });
+    tryMaking("unmarshall without nodes", [](Stage& s) {
+        s.made = s.m.unmarshall(s.withoutNodes, &s.error);
+        s.text = s.withoutNodes->description().str();
+    });
+    tryMaking("rootElement",
+              [](Stage& s) { s.made = Ref<qx::Object>(s.withoutNodes->rootElement()); });
+    tryMaking("unmarshallElement",
+              [](Stage& s) { s.made = s.m.unmarshallElement(s.root.get(), &s.error); });
+    tryMaking("buildClassWithMapping", [](Stage& s) {
+        s.made = s.m.buildClassWithMapping(s.type(), s.root.get(), false, &s.error);
+    });
+    tryMaking("allocateClassWithMapping", [](Stage& s) {
+        s.made = s.m.allocateClassWithMapping(s.type(), &s.error);
+        s.made->setValueForKey("n", "number");
+        s.made->setValueForKey(s.order, "flat");
+    });
+    tryMaking("readString", [](Stage& s) { s.made = s.m.readString(documentText, &s.error); });
+    tryMaking("marshallObject", [](Stage& s) { s.made = s.m.marshallObject(s.order, &s.error); });
+    tryMaking("elementWithMapping",
+              [](Stage& s) { s.made = s.m.elementWithMapping(s.type(), *s.order, &s.error); });
+    tryMaking("marshall", [](Stage& s) {
+        const auto document = s.m.marshall(s.order, &s.error);
+        s.made = Ref<qx::Object>(document ? document->rootElement() : nullptr);
+    });
+    tryMaking("writeString", [](Stage& s) { s.text = s.m.writeString(s.order, &s.error).str(); });
+    tryMaking("writeStream", [](Stage& s) {
+        Buffer buffer;
+        std::ostream out(&buffer);
+        s.result = s.m.writeStream(s.order, out, &s.error);
+        s.text = buffer.text();
+    });
 
-    const std::pair<const char*, std::function<bool(M&, Stage&)>> binding[] = {
-        {"bindFieldsWithMapping",
-         [](M& m, Stage& s) {
-             return m.bindFieldsWithMapping(s.type(), *s.target, *s.root, *s.fields, *s.attributes,
-                                            false, &s.error);
-         }},
-        {"validateBoundFields",
-         [](M& m, Stage& s) {
-             return m.validateBoundFields(*s.fields, *s.attributes, *s.root, *s.target, &s.error);
-         }},
-        {"TakeValueForKey",
-         [](M&, Stage& s) {
-             return TakeValueForKey(*s.target, "text", "a text of some length", s.field(2),
-                                    &s.error);
-         }},
-        {"bindFieldMappings",
-         [](M& m, Stage& s) {
-             return m.bindFieldMappings(s.type(), *s.written, *s.order, &s.error);
-         }},
-        {"mapArray", [](M& m, Stage& s) {
-             const auto lines = s.order->valueForKey("lines").as<qx::Array>();
-             return m.mapArray(*lines, *s.written, s.field(5), &s.error);
-         }}};
-    for (const auto& [name, bind] : binding)
-        tryMarshaller(name, true, [&bind = bind](M& m, Stage& s) { s.result = bind(m, s); });
+    const auto tryBinding = [](const std::string& name, auto bind) {
+        tryMarshaller(name, true, [bind](Stage& s) { s.result = bind(s); });
+    };
+    tryBinding("bindFieldsWithMapping", [](Stage& s) {
+        return s.m.bindFieldsWithMapping(s.type(), *s.target, *s.root, *s.fields, *s.attributes,
+                                         false, &s.error);
+    });
+    tryBinding("validateBoundFields", [](Stage& s) {
+        return s.m.validateBoundFields(*s.fields, *s.attributes, *s.root, *s.target, &s.error);
+    });
+    tryBinding("TakeValueForKey", [](Stage& s) {
+        return TakeValueForKey(*s.target, "text", "a text of some length", s.field(2), &s.error);
+    });
+    tryBinding("bindFieldMappings", [](Stage& s) {
+        return s.m.bindFieldMappings(s.type(), *s.written, *s.order, &s.error);
+    });
+    tryBinding("mapArray", [](Stage& s) {
+        const auto lines = s.order->valueForKey("lines").as<qx::Array>();
+        return s.m.mapArray(*lines, *s.written, s.field(5), &s.error);
+    });
 
     // Steps for one field come with an index and a flag, with an index, or with neither.
-    using Bind = std::function<bool(M&, Stage&, const QXXMLFieldMapping&)>;
+    using Bind = std::function<bool(Stage&, const QXXMLFieldMapping&)>;
     const auto flagged = [](auto step) {
-        return [step](M& m, Stage& s, const QXXMLFieldMapping& field) {
-            return (m.*step)(field, *s.target, 0, *s.root, *s.fields, *s.attributes, false,
-                             &s.error);
+        return [step](Stage& s, const QXXMLFieldMapping& field) {
+            return (s.m.*step)(field, *s.target, 0, *s.root, *s.fields, *s.attributes, false,
+                               &s.error);
         };
     };
     const auto indexed = [](auto step) {
-        return [step](M& m, Stage& s, const QXXMLFieldMapping& field) {
-            return (m.*step)(field, *s.target, 0, *s.root, *s.fields, *s.attributes, &s.error);
+        return [step](Stage& s, const QXXMLFieldMapping& field) {
+            return (s.m.*step)(field, *s.target, 0, *s.root, *s.fields, *s.attributes, &s.error);
         };
     };
     const auto plain = [](auto step) {
-        return [step](M& m, Stage& s, const QXXMLFieldMapping& field) {
-            return (m.*step)(field, *s.target, *s.root, *s.fields, *s.attributes, &s.error);
+        return [step](Stage& s, const QXXMLFieldMapping& field) {
+            return (s.m.*step)(field, *s.target, *s.root, *s.fields, *s.attributes, &s.error);
         };
     };
     const std::pair<const char*, Bind> eachField[] = {
@@ -285,14 +273,14 @@ void marshalling() {
         {"bindFieldAsText", indexed(&M::bindFieldAsText)},
         {"bindCollectionField", plain(&M::bindCollectionField)},
         {"bindArrayFieldByType", plain(&M::bindArrayFieldByType)},
-        {"mapField", [](M& m, Stage& s, const QXXMLFieldMapping& field) {
-             return m.mapField(field, *s.written, *s.order, &s.error);
+        {"mapField", [](Stage& s, const QXXMLFieldMapping& field) {
+             return s.m.mapField(field, *s.written, *s.order, &s.error);
          }}};
     const std::size_t count = Stage().type().fields().size();
     for (const auto& [name, bind] : eachField)
         for (std::size_t i = 0; i < count; ++i)
-            tryMarshaller(name + (" " + std::to_string(i)), true,
-                          [bind = bind, i](M& m, Stage& s) { s.result = bind(m, s, s.field(i)); });
+            tryBinding(name + (" " + std::to_string(i)),
+                       [bind = bind, i](Stage& s) { return bind(s, s.field(i)); });
 }
 
 // Both sides of a pair change in one setter.

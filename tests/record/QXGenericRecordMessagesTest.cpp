@@ -1,6 +1,6 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 
-#include "support/Texts.h"
+#include "undo/UndoSteps.h"
 
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/host/UserDefaults.h>
@@ -11,12 +11,12 @@
 
 #include <gtest/gtest.h>
 
+#include <optional>
 #include <utility>
 
 namespace {
 
 using namespace qx;
-using support::raised;
 using Record = QXGenericRecord;
 
 // Notes the changes that it is told of.
@@ -91,38 +91,50 @@ TEST_F(QXGenericRecordObservationTest, ARecordMayStopObservingWhileItIsToldAndMa
     rome->setValueForKey("Roma", "name");
 }
 
-// What is on here is off again afterwards.
-struct QXGenericRecordForwardingTest : testing::Test {
-    Ref<UserDefaults> defaults = UserDefaults::standardUserDefaults();
-    Ref<Record> record = place("Rome");
-
-    QXGenericRecordForwardingTest() {
-        defaults->setObject("YES", AllowMethodForwardingInGenericRecords);
+// Messages are forwarded to keys while it lives, where they are allowed to.
+struct Forwarding {
+    explicit Forwarding(bool isAllowed) {
+        UserDefaults::standardUserDefaults()->setObject(isAllowed,
+                                                        AllowMethodForwardingInGenericRecords);
     }
-    ~QXGenericRecordForwardingTest() override {
-        defaults->removeObjectForKey(AllowMethodForwardingInGenericRecords);
+    ~Forwarding() {
+        UserDefaults::standardUserDefaults()->removeObjectForKey(
+            AllowMethodForwardingInGenericRecords);
     }
 };
 
-TEST_F(QXGenericRecordForwardingTest, MessagesRaiseThatCannotBeForwarded) {
-    const std::string unanswered = "class QXGenericRecord does not answer the operation ";
-    const struct {
-        bool isAllowed;
-        const char* message;
-        std::vector<Value> arguments;
-        std::string reason;
-    } cases[] = {
-        {false, "name", {}, unanswered + "name"},
-        {true, "setName:country:", {"a", "b"}, unanswered + "setName:country:"},
-        {true, "name", {1}, "the operation name takes 0 arguments, not 1"},
-    };
-    for (const auto& row : cases) {
-        defaults->setObject(row.isAllowed, AllowMethodForwardingInGenericRecords);
-        EXPECT_EQ(raised([&] { record->performWithArguments(row.message, row.arguments); }),
-                  "NSInvalidArgumentException: " + row.reason);
-        EXPECT_EQ(bool(record->methodSignatureForSelector("setName:")), row.isAllowed);
-        EXPECT_TRUE(record->methodSignatureForSelector("className"));
+class RecordSteps : public UndoSteps {
+public:
+    RecordSteps() {
+        know("allow", [this](auto&) { _forwarding.emplace(true); });
+        know("forbid", [this](auto&) { _forwarding.emplace(false); });
+        know("keys", [this](auto& words) {
+            for (const String& key : objects.at(words.at(0)).template as<Record>()->keys())
+                say('"' + key.str() + '"');
+        });
+        know("cached", [this](auto& words) {
+            const auto [object, key] = place(words.at(0));
+            sayValue(Value(object).as<UndoableObject>()->changeCache()->get(key));
+        });
     }
+
+private:
+    std::optional<Forwarding> _forwarding;
+};
+const bool added = support::addSteps<RecordSteps>("tests/record/records.md");
+
+TEST(QXGenericRecordForwardingTest, OnlyWhatCanBeForwardedHasASignature) {
+    const auto record = place("Rome");
+    for (const bool isAllowed : {false, true}) {
+        const Forwarding forwarding(isAllowed);
+        EXPECT_EQ(bool(record->methodSignatureForSelector("setName:")), isAllowed);
+        EXPECT_TRUE(record->methodSignatureForSelector("className"));
+        EXPECT_FALSE(record->respondsTo("name"));
+    }
+    const Forwarding forwarding(true);
+    const auto signature = record->methodSignatureForSelector("name");
+    EXPECT_EQ(signature->numberOfArguments(), 2U);
+    EXPECT_NE(signature->methodReturnLength(), 0U);
     // Signatures of the caller's own that fit neither a reading nor a writing.
     for (const auto& [message, arguments, returnsValue] :
          {std::tuple{"name", 0U, false}, {"name:", 1U, true}, {"setName:to:", 2U, false}}) {
@@ -131,62 +143,6 @@ TEST_F(QXGenericRecordForwardingTest, MessagesRaiseThatCannotBeForwarded) {
                              std::vector<Value>(arguments));
         EXPECT_THROW(record->forwardInvocation(*invocation), Exception) << message;
     }
-}
-
-TEST_F(QXGenericRecordForwardingTest, MessagesWithOneArgumentWriteTheKeyThatTheyName) {
-    const struct {
-        const char* message;
-        const char* key;
-    } cases[] = {{"setTitle:", "title"},
-                 {"title:", "title"},
-                 {"setURL:", "uRL"},
-                 {"setÄnderung:", "änderung"},
-                 {"setup:", "up"},
-                 {"set:", ""},
-                 {"Set:", "Set"},
-                 {"se:", "se"},
-                 {":", ""},
-                 {"setA:b", "a:b"}};
-    int value = 0;
-    for (const auto& row : cases) {
-        EXPECT_TRUE(record->perform(row.message, ++value).isNull()) << row.message;
-        EXPECT_EQ(record->valueForKey(row.key), Value(value)) << row.message;
-    }
-    record->perform("setTitle:", nullptr);
-    EXPECT_FALSE(record->contents()->contains("title"));
-    // A message that the record answers itself is not forwarded.
-    record->perform("setClassName:", "Town");
-    EXPECT_FALSE(record->contents()->contains("className"));
-}
-
-TEST_F(QXGenericRecordForwardingTest, MessagesWithoutArgumentsReadKeysAndPaths) {
-    record->setValueForKey(place("Italy"), "within");
-    EXPECT_EQ(record->perform("within.name"), Value("Italy"));
-    EXPECT_TRUE(record->perform("setTitle").isNull());
-    EXPECT_FALSE(record->respondsTo("name"));
-    const auto signature = record->methodSignatureForSelector("name");
-    EXPECT_EQ(signature->numberOfArguments(), 2U);
-    EXPECT_NE(signature->methodReturnLength(), 0U);
-}
-
-TEST_F(QXGenericRecordForwardingTest, WhatEveryObjectAnswersIsNoKey) {
-    EXPECT_EQ(record->perform("valueForKey:", "name"), Value("Rome"));
-    EXPECT_EQ(record->perform("isEqual:", record), Value(true));
-    record->perform("willChangeValueForKey:", "name");
-    record->perform("_cacheValueForKey:", "name");
-    EXPECT_EQ(record->changeCache()->get("name"), Value("Rome"));
-    EXPECT_EQ(record->keys(), std::vector<String>{"name"});
-}
-
-TEST_F(QXGenericRecordForwardingTest, WhatIsWrittenByMessageIsUndoneAndMayBeAnUndoAction) {
-    const auto manager = make<UndoManager>();
-    record->setUndoManager(manager);
-    record->perform("setName:", "Roma");
-    manager->undo();
-    EXPECT_EQ(record->valueForKey("name"), Value("Rome"));
-    manager->prepareWithInvocationTarget(record.get()).perform("setName:", "Caput Mundi");
-    manager->undo();
-    EXPECT_EQ(record->valueForKey("name"), Value("Caput Mundi"));
 }
 
 } // namespace

@@ -57,55 +57,6 @@ public:
 
 } // namespace
 
-TEST_F(RepositoryManagerTest, AFreshManagerAsksTheFileSystemAlone) {
-    EXPECT_EQ(namesOf(*manager), "QXXMLDataRepositoryPersistentName ");
-    EXPECT_FALSE(manager->volatileRepository());
-    EXPECT_TRUE(manager->persistentRepository().as<QXXMLFileSystemDataRepository>());
-
-    sandbox.write("data/Client/a.xml", "<a/>");
-    std::uint64_t size = 0;
-    EXPECT_EQ(manager->documentNamed("a.xml", &size)->rootElement()->name(), "a");
-    EXPECT_EQ(size, 4U);
-    EXPECT_EQ(manager->dataForName("a.xml")->view(), "<a/>");
-
-    Ref<Error> error;
-    EXPECT_FALSE(manager->documentNamed("none.xml", &size, &error));
-    EXPECT_FALSE(manager->dataForName("none.xml", &error));
-    EXPECT_EQ(size, 4U);
-    EXPECT_FALSE(error);
-}
-
-TEST_F(RepositoryManagerTest, TheFirstThatClaimsANameServesIt) {
-    sandbox.write("data/Client/a.xml", "<file/>");
-    const auto memory = holding("a.xml");
-    manager->setVolatileRepository(memory);
-    EXPECT_EQ(namesOf(*manager),
-              "QXXMLDataRepositoryPersistentName QXXMLDataRepositoryVolatileName ");
-    EXPECT_EQ(manager->documentNamed("a.xml")->rootElement()->name(), "file");
-    manager->setRepositoryNames(make<Array>(std::initializer_list<Value>{
-        "nobody", nullptr, QXXMLDataRepositoryVolatileName, QXXMLDataRepositoryPersistentName}));
-    EXPECT_EQ(manager->documentNamed("a.xml")->rootElement()->name(), "held");
-    EXPECT_EQ(manager->repositoryForDocumentNamed("a.xml"), memory);
-    EXPECT_EQ(manager->repositoryForDataNamed("a.xml"), manager->persistentRepository());
-    manager->setRepositoryNames(nullptr);
-    EXPECT_FALSE(manager->documentNamed("a.xml"));
-}
-
-TEST_F(RepositoryManagerTest, NoOtherRepositoryIsAskedWhenTheFirstFails) {
-    sandbox.write("data/Client/a.xml", "<broken");
-    const std::string folder = sandbox.path("data/Client/b");
-    std::filesystem::create_directory(folder);
-    const auto memory = holding("a.xml");
-    memory->setData(make<Data>(), "b");
-    manager->setVolatileRepository(memory);
-    Ref<Error> error;
-    EXPECT_FALSE(manager->documentNamed("a.xml", nullptr, &error));
-    EXPECT_EQ(error->domain(), Error::parserDomain);
-    error.reset();
-    EXPECT_FALSE(manager->dataForName("b", &error));
-    EXPECT_EQ(error->localizedDescription().str(), "The file cannot be read: " + folder);
-}
-
 TEST_F(RepositoryManagerTest, ANameIsSearchedOnceForEachLookUpAndNoneIsKept) {
     sandbox.write("app/a.xml", "<shipped/>");
     const auto files = QXXMLFileSystemDataRepository::init<Searching>();
@@ -120,22 +71,10 @@ TEST_F(RepositoryManagerTest, ANameIsSearchedOnceForEachLookUpAndNoneIsKept) {
     EXPECT_EQ(manager->documentNamed("a.xml")->rootElement()->name(), "own");
 }
 
-TEST_F(RepositoryManagerTest, ARepositoryUnderAKnownNameKeepsItsPlace) {
-    manager->addRepository(holding("a.xml"), "one");
-    manager->addRepository(holding("b.xml"), "two");
-    const auto replacement = holding("c.xml");
-    manager->setRepository(replacement, "one");
-    EXPECT_EQ(namesOf(*manager), "QXXMLDataRepositoryPersistentName one two ");
-    EXPECT_EQ(manager->repositoryForName("one"), replacement);
-    EXPECT_FALSE(manager->documentNamed("a.xml"));
+TEST_F(RepositoryManagerTest, ARepositoryHasANameAndANameARepository) {
     EXPECT_THROW(manager->setRepository(nullptr, "three"), Exception);
-    EXPECT_THROW(manager->setRepository(replacement, nullptr), Exception);
-    EXPECT_EQ(namesOf(*manager), "QXXMLDataRepositoryPersistentName one two ");
-    manager->setRepositoryNames(make<Array>(std::initializer_list<Value>{
-        QXXMLDataRepositoryVolatileName, QXXMLDataRepositoryPersistentName}));
-    manager->setVolatileRepository(replacement); // whose name has its place already
-    EXPECT_EQ(namesOf(*manager),
-              "QXXMLDataRepositoryVolatileName QXXMLDataRepositoryPersistentName ");
+    EXPECT_THROW(manager->setRepository(holding("a.xml"), nullptr), Exception);
+    EXPECT_EQ(namesOf(*manager), "QXXMLDataRepositoryPersistentName ");
 }
 
 TEST_F(RepositoryManagerTest, ChangingTheOrderDuringALookUpRaises) {

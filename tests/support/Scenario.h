@@ -64,6 +64,7 @@ inline qx::Ref<QXXMLMarshaller> marshaller(std::string_view mapping, unsigned op
     return made;
 }
 
+using support::repeated;
 using support::told;
 
 // The object that the document gives, or the error.
@@ -80,13 +81,6 @@ inline std::string write(QXXMLMarshaller& marshaller, const qx::Value& object) {
     const auto element = marshaller.marshallObject(object, &error);
     EXPECT_FALSE(element && error) << "both an element and an error";
     return error ? told(error) : element ? element->XMLString().str() : "null";
-}
-
-inline std::string repeated(std::string_view text, std::size_t times) {
-    std::string all;
-    while (times-- > 0)
-        all += text;
-    return all;
 }
 
 // Elements in one another.

@@ -13,6 +13,13 @@
 
 namespace support {
 
+inline std::string repeated(std::string_view text, std::size_t times) {
+    std::string all;
+    while (times-- > 0)
+        all += text;
+    return all;
+}
+
 // What a call raises: "NSRangeException: the reason", or "nothing".
 template <class F>
 std::string raised(F call) {

@@ -1,6 +1,6 @@
 // Walking back and forth through groups, at random: tests/record/QXGenericRecordUndoTest.cpp.
 
-#include "support/Texts.h"
+#include "UndoSteps.h"
 
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/WeakRef.h>
@@ -22,8 +22,8 @@ public:
         manager.prepareWithInvocationTarget(this).perform("setNumber:", number);
         number = value;
     }
+    int getNumber() const { return number; }
     void reset() { setNumber(0); }
-    void fail() { throw std::runtime_error("fails"); }
 
     UndoManager& manager;
     int number = 0;
@@ -33,11 +33,18 @@ const bool described = [] {
     Class::define<Counter>("UndoManagerTest.Counter")
         .operation<&Counter::setNumber>("setNumber:")
         .operation<&Counter::reset>("reset")
-        .operation<&Counter::fail>("fail");
+        .property<&Counter::getNumber, &Counter::setNumber>("number");
     return true;
 }();
 
-const std::string inconsistent = "NSInternalInconsistencyException: ";
+struct CounterSteps : UndoSteps {
+    CounterSteps() {
+        for (const char* name : {"counter", "other"})
+            objects[name] = make<Counter>(*manager);
+        know("fail", [](auto&) { throw std::runtime_error("it fails"); });
+    }
+};
+const bool added = support::addSteps<CounterSteps>("tests/undo/groups.md");
 
 struct UndoManagerTest : testing::Test {
     Ref<UndoManager> manager = make<UndoManager>();
@@ -48,105 +55,6 @@ struct UndoManagerTest : testing::Test {
         counter->setNumber(value);
     }
 };
-
-TEST_F(UndoManagerTest, ARegistrationOutsideAnyGroupOpensOneUntilTheEventEnds) {
-    counter->setNumber(1);
-    counter->setNumber(2);
-    EXPECT_EQ(manager->groupingLevel(), 1U);
-    manager->endEventGroup();
-    EXPECT_EQ(manager->groupingLevel(), 0U);
-    manager->endEventGroup(); // there is none any more
-    manager->undo();
-    EXPECT_EQ(counter->number, 0);
-}
-
-TEST_F(UndoManagerTest, NestedGroupsCanBeUndoneWhileTheOuterStaysOpen) {
-    manager->beginUndoGrouping();
-    EXPECT_EQ(manager->groupingLevel(), 1U); // it opens no other
-    setInGroup(1);
-    setInGroup(2);
-    manager->undoNestedGroup();
-    EXPECT_EQ(counter->number, 1);
-    EXPECT_EQ(manager->groupingLevel(), 1U);
-    counter->setNumber(7);
-    EXPECT_EQ(raised([&] { manager->undoNestedGroup(); }),
-              inconsistent + "the last entry of the open group is an action, not a nested group");
-    manager->undo(); // ends the group and undoes all of it
-    EXPECT_EQ(counter->number, 0);
-    EXPECT_EQ(manager->groupingLevel(), 0U);
-}
-
-TEST_F(UndoManagerTest, FaultsOfTheCallerRaise) {
-    EXPECT_EQ(raised([&] { manager->endUndoGrouping(); }),
-              inconsistent + "no undo group is open to be ended");
-    EXPECT_EQ(raised([&] { manager->enableUndoRegistration(); }),
-              inconsistent + "undo registration is not disabled");
-    manager->setGroupsByEvent(false);
-    EXPECT_EQ(raised([&] { counter->setNumber(1); }),
-              inconsistent + "an undo action was registered outside any group");
-    EXPECT_EQ(raised([&] { manager->registerUndoWithTarget(nullptr, "reset", nullptr); }),
-              "NSInvalidArgumentException: an undo action was registered without target");
-    EXPECT_EQ(
-        raised([&] { manager->prepareWithInvocationTarget(counter.get()).perform("unknown"); }),
-        "NSInvalidArgumentException: an undo action was registered for the operation unknown, "
-        "which class UndoManagerTest.Counter does not answer");
-    const UndoGroup outer(manager);
-    const UndoGroup inner(manager);
-    EXPECT_EQ(raised([&] { manager->undo(); }),
-              inconsistent + "undo was called inside a nested group");
-    EXPECT_EQ(raised([&] { manager->redo(); }),
-              inconsistent + "redo was called inside a nested group");
-    EXPECT_EQ(manager->groupingLevel(), 2U);
-}
-
-TEST_F(UndoManagerTest, ScopesEndTheirGroupWhateverWasLeftOpenOrClosedInside) {
-    try {
-        const UndoGroup group(manager);
-        manager->beginUndoGrouping();
-        counter->setNumber(1);
-        throw 1;
-    } catch (int) {
-    }
-    EXPECT_EQ(manager->groupingLevel(), 0U);
-    {
-        const UndoGroup group(manager);
-        manager->endUndoGrouping();
-        manager->beginUndoGrouping();
-    }
-    EXPECT_EQ(manager->groupingLevel(), 1U);
-    manager->undo();
-    EXPECT_EQ(counter->number, 0);
-}
-
-TEST_F(UndoManagerTest, AScopeIsAStepOfItsOwnUnderItsOwnName) {
-    counter->setNumber(1); // in the group that opens by itself
-    {
-        const UndoGroup outer(manager, "Outer");
-        counter->setNumber(2);
-        const UndoGroup inner(manager, "Inner");
-        counter->setNumber(3);
-    }
-    setInGroup(4);
-    EXPECT_EQ(manager->undoActionName(), nullptr);
-    manager->undo();
-    EXPECT_EQ(manager->undoActionName(), "Outer");
-    manager->undo();
-    EXPECT_EQ(counter->number, 1);
-    manager->undo();
-    EXPECT_EQ(counter->number, 0);
-}
-
-TEST_F(UndoManagerTest, DisablingIsCounted) {
-    manager->disableUndoRegistration();
-    manager->disableUndoRegistration();
-    manager->enableUndoRegistration();
-    setInGroup(1);
-    EXPECT_FALSE(manager->canUndo());
-    manager->enableUndoRegistration();
-    setInGroup(2);
-    manager->undo();
-    EXPECT_EQ(counter->number, 1);
-}
 
 TEST_F(UndoManagerTest, ATargetThatDiesOrIsTakenOutIsForgottenInEveryGroup) {
     setInGroup(1);
@@ -182,24 +90,6 @@ TEST_F(UndoManagerTest, ArgumentsAreKeptUntilTheActionGoes) {
     manager->undo();
     EXPECT_EQ(counter->number, 9);
     EXPECT_FALSE(watched);
-}
-
-TEST_F(UndoManagerTest, AnActionThatThrowsDoesNotKeepTheOthersFromBeingUndone) {
-    const auto other = make<Counter>(*manager);
-    setInGroup(1);
-    {
-        const UndoGroup group(manager);
-        counter->setNumber(2);
-        manager->registerUndoWithTarget(counter.get(), "fail", nullptr);
-        other->setNumber(3);
-    }
-    EXPECT_THROW(manager->undo(), std::runtime_error);
-    EXPECT_FALSE(manager->isUndoing());
-    EXPECT_EQ(manager->groupingLevel(), 0U);
-    EXPECT_EQ(counter->number * 10 + other->number, 10);
-    manager->redo();
-    EXPECT_EQ(counter->number * 10 + other->number, 23);
-    EXPECT_FALSE(manager->canRedo());
 }
 
 TEST_F(UndoManagerTest, AnUndoOrRedoWithoutMemoryLeavesEverythingAsItWas) {
@@ -293,56 +183,6 @@ TEST_F(UndoManagerTest, ActionsMayDoAnythingToTheManagerAndItsTargets) {
                 raised([&] { manager->redo(); });
             manager->removeAllActions();
         }
-}
-
-TEST_F(UndoManagerTest, ActionsCannotUndoOrEndTheGroupTheyRunIn) {
-    const std::pair<void (UndoManager::*)(), const char*> cases[] = {
-        {&UndoManager::undo, "undo was called by an undo action"},
-        {&UndoManager::redo, "redo was called by an undo action"},
-        {&UndoManager::endUndoGrouping, "no undo group is open to be ended"},
-        {&UndoManager::undoNestedGroup, "undoNestedGroup was called by an undo action"}};
-    for (const auto& [call, reason] : cases) {
-        setInGroup(1);
-        manager->registerUndo(*counter,
-                              [step = call](Counter& target) { (target.manager.*step)(); });
-        EXPECT_EQ(raised([&] { manager->undo(); }), inconsistent + reason);
-        EXPECT_EQ(manager->groupingLevel(), 0U);
-    }
-}
-
-TEST_F(UndoManagerTest, AnActionMayRemoveThoseThatWouldFollow) {
-    setInGroup(1);
-    counter->setNumber(2);
-    manager->registerUndo(*counter, [](Counter& c) { c.manager.removeAllActions(); });
-    manager->undo();
-    EXPECT_EQ(counter->number, 2);
-    EXPECT_FALSE(manager->canUndo() || manager->canRedo());
-}
-
-TEST_F(UndoManagerTest, LevelsOfUndoDropTheOldest) {
-    manager->setLevelsOfUndo(3);
-    for (int value = 1; value <= 5; ++value)
-        setInGroup(value);
-    while (manager->canUndo())
-        manager->undo();
-    EXPECT_EQ(counter->number, 2);
-    manager->setLevelsOfUndo(1);
-    manager->redo();
-    EXPECT_FALSE(manager->canRedo());
-}
-
-TEST_F(UndoManagerTest, NamesGoAlongFromUndoToRedo) {
-    setInGroup(1, "One");
-    counter->setNumber(2);
-    manager->setActionName("Two");
-    EXPECT_EQ(manager->undoActionName(), "Two");
-    manager->undo();
-    EXPECT_EQ(manager->undoActionName(), "One");
-    EXPECT_EQ(manager->redoActionName(), "Two");
-    manager->setActionName("First"); // no group is open: the last entry
-    manager->undo();
-    EXPECT_EQ(manager->undoActionName(), nullptr);
-    EXPECT_EQ(manager->redoActionName(), "First");
 }
 
 TEST_F(UndoManagerTest, AManagerMayEndWithATargetOrTheActionsThatHoldIt) {

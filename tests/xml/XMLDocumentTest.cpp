@@ -63,6 +63,7 @@ TEST(XMLDocument, IsWrittenWhollyOrNotAtAll) {
     EXPECT_EQ(error->domain(), qx::Error::cocoaDomain);
     document->rootElement()->setStringValue("\x01");
     EXPECT_ANY_THROW(document->writeToFile(path));
+    EXPECT_ANY_THROW(XMLDocument::initWithRootElement(nullptr)->XMLData());
     EXPECT_EQ(files.read("a.xml"), "<a><b/></a>");
     EXPECT_EQ(files.list(""), "a.xml ");
 }

@@ -1,4 +1,4 @@
-#include "Text.h"
+#include "support/Steps.h"
 #include "support/Texts.h"
 
 #include <QXXMLMarshalling/base/Exception.h>
@@ -16,7 +16,102 @@ using qx::XMLDocument;
 using qx::XMLElement;
 using qx::XMLNode;
 using support::parsed;
+using support::repeated;
 using namespace std::string_literals;
+
+// What trees.md does with nodes.
+class TreeSteps : public support::Steps {
+public:
+    TreeSteps() {
+        know("parse", [this](auto& words) { document = parsed(words.at(0)); });
+        know("new", [this](auto& words) { nodes[words.at(0)] = make(words); });
+        know("last", [this](auto& words) {
+            nodes[words.at(0)] = Ref<XMLNode>(element(words.at(1)).lastChild());
+        });
+        know("add", [this](auto& words) { element(words.at(0)).addChild(child(words.at(1))); });
+        know("add-to-document", [this](auto& words) { document->addChild(child(words.at(0))); });
+        know("insert", [this](auto& words) {
+            element(words.at(0)).insertChild(child(words.at(1)), &node(words.at(2)));
+        });
+        know("add-attribute",
+             [this](auto& words) { element(words.at(0)).addAttribute(child(words.at(1))); });
+        know("add-namespace",
+             [this](auto& words) { element(words.at(0)).addNamespace(child(words.at(1))); });
+        know("set-namespaces", [this](auto& words) {
+            std::vector<Ref<XMLNode>> declarations;
+            for (std::size_t i = 1; i < words.size(); ++i)
+                declarations.push_back(child(words[i]));
+            element(words.at(0)).setNamespaces(declarations);
+        });
+        know("set-attribute", [this](auto& words) {
+            element(words.at(0)).addAttribute(text(words, 1), text(words, 2));
+        });
+        know("remove-attribute",
+             [this](auto& words) { element(words.at(0)).removeAttributeForName(words.at(1)); });
+        know("attribute", [this](auto& words) {
+            say(qx::Value(element(words.at(0)).attributeValue(words.at(1))).description().str());
+        });
+        know("detach", [this](auto& words) { node(words.at(0)).detach(); });
+        know("set-text", [this](auto& words) { node(words.at(0)).setStringValue(text(words, 1)); });
+        know("text", [this](auto& words) { say(node(words.at(0)).stringValue().str()); });
+        know("declare", [this](auto& words) {
+            document->setVersion(text(words, 0));
+            document->setCharacterEncoding(text(words, 1));
+            document->setStandalone(text(words, 2));
+        });
+        know("show", [this](auto& words) { say(node(words.at(0)).description().str()); });
+        know("write", [this](auto& words) { say(node(words.at(0)).XMLString().str()); });
+        know("write-compact", [this](auto& words) {
+            say(node(words.at(0)).XMLString(qx::XMLCompactEmptyElements).str());
+        });
+        know("data", [this](auto&) { say(document->XMLData()); });
+    }
+
+private:
+    static qx::String text(const Arguments& words, std::size_t i) {
+        return words.at(i) == "null" ? qx::String() : qx::String(support::unescaped(words[i]));
+    }
+    static Ref<XMLNode> make(const Arguments& words) {
+        const std::string& kind = words.at(1);
+        const qx::String first = text(words, 2);
+        if (kind == "text")
+            return XMLNode::initTextWithStringValue(first);
+        if (kind == "comment")
+            return XMLNode::initCommentWithStringValue(first);
+        if (kind == "element")
+            return XMLElement::initWithName(first);
+        if (kind == "sized-element")
+            return XMLElement::initForAttributes(first, 2);
+        if (kind == "attribute")
+            return XMLNode::attributeWithName(first, text(words, 3));
+        if (kind == "namespace")
+            return XMLNode::namespaceWithName(first, text(words, 3));
+        return XMLNode::initProcessingInstructionWithName(first, text(words, 3));
+    }
+    // A node that was named, "document", or the first element of a name.
+    XMLNode& node(const std::string& name) const {
+        const auto named = nodes.find(name);
+        if (named != nodes.end())
+            return *named->second;
+        XMLNode* const found = name == "document" ? document.get() : find(*document, name);
+        return found != nullptr ? *found : throw std::invalid_argument("no node " + name);
+    }
+    XMLElement& element(const std::string& name) const { return *node(name).asElement(); }
+    Ref<XMLNode> child(const std::string& name) const {
+        return name == "nothing" ? nullptr : Ref<XMLNode>(&node(name));
+    }
+    static XMLNode* find(XMLNode& below, std::string_view name) {
+        XMLNode* found = nullptr;
+        for (XMLNode& each : below.children())
+            if (found == nullptr)
+                found = each.isElement() && each.name().view() == name ? &each : find(each, name);
+        return found;
+    }
+
+    Ref<XMLDocument> document;
+    std::map<std::string, Ref<XMLNode>> nodes;
+};
+const bool added = support::addSteps<TreeSteps>("tests/xml/trees.md");
 
 TEST(XMLNode, AKeptNodeOutlivesItsDocument) {
     auto document = parsed("<a><b c='1'>text</b></a>");
@@ -87,45 +182,6 @@ TEST(XMLNode, NoDepthNeedsStack) {
         copy->XMLString(qx::XMLPrettyPrint).view().starts_with("<a>\n    <a>\n        <a>"));
 }
 
-TEST(XMLNode, WhatCannotBeAChildRaises) {
-    const auto document = parsed("<a><b/></a>");
-    XMLElement& root = *document->rootElement();
-    XMLElement& inner = *root.firstChild()->asElement();
-    const auto loose = XMLElement::initWithName("loose");
-    loose->addChild(XMLElement::initWithName("below"));
-    XMLElement& below = *loose->firstChild()->asElement();
-    const Ref<XMLNode> bad[] = {Ref<XMLNode>(&inner),
-                                Ref<XMLNode>(&root),
-                                document,
-                                XMLNode::attributeWithName("x", "y"),
-                                XMLNode::namespaceWithName("x", "y"),
-                                Ref<XMLNode>()};
-    for (const Ref<XMLNode>& node : bad)
-        EXPECT_THROW(inner.addChild(node), qx::Exception);
-    EXPECT_THROW(below.addChild(loose), qx::Exception);
-    EXPECT_THROW(loose->addChild(loose), qx::Exception);
-    EXPECT_THROW(loose->insertChild(XMLElement::initWithName("x"), &inner), qx::Exception);
-    EXPECT_THROW(document->addChild(XMLElement::initWithName("second")), qx::Exception);
-    EXPECT_THROW(document->addChild(XMLNode::initTextWithStringValue("t")), qx::Exception);
-    EXPECT_EQ(document->XMLString(), "<a><b></b></a>");
-}
-
-TEST(XMLElement, AnAttributeThatIsThereKeepsItsValue) {
-    const auto element = XMLElement::initWithName("a");
-    element->addAttribute(XMLNode::attributeWithName("b", "1"));
-    element->addAttribute(XMLNode::attributeWithName("c", "2"));
-    const Ref<XMLNode> second = XMLNode::attributeWithName("b", "3");
-    element->addAttribute(second);
-    EXPECT_EQ(second->parent(), nullptr);
-    EXPECT_EQ(element->XMLString(), "<a b=\"1\" c=\"2\"></a>");
-    EXPECT_THROW(element->addAttribute(Ref<XMLNode>(element->attributeForName("b"))),
-                 qx::Exception);
-    EXPECT_THROW(element->addAttribute(XMLNode::namespaceWithName("b", "3")), qx::Exception);
-    element->removeAttributeForName("b");
-    element->removeAttributeForName("nothing");
-    EXPECT_EQ(element->XMLString(), "<a c=\"2\"></a>");
-}
-
 TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
     std::string many = "<a";
     for (int i = 0; i < 40; ++i)
@@ -153,26 +209,6 @@ TEST(XMLElement, AttributesAreTheSameWithAndWithoutNodes) {
         EXPECT_EQ(held.XMLString().view(), text);
         EXPECT_EQ(copied->XMLString().view(), text);
     }
-}
-
-TEST(XMLElement, AttributesByNameAndValueNeedNoNodes) {
-    const auto element = XMLElement::initForAttributes("a", 2);
-    element->addAttribute("b", "1");
-    element->addAttribute("b", "2");
-    EXPECT_EQ(element->attributeValue("b"), "1");
-    EXPECT_TRUE(element->attributeValue("c").isNull());
-    element->addAttribute("c", nullptr);
-    element->addAttribute("d", "\x1F");
-    EXPECT_EQ(element->description(), "<a b=\"1\" c=\"\" d=\"\x1F\"></a>");
-    EXPECT_EQ(support::raised([&] { static_cast<void>(element->XMLString()); }),
-              "NSInvalidArgumentException: a text holds a control character at /a/@d");
-    element->removeAttributeForName("d");
-    EXPECT_EQ(element->XMLString(), "<a b=\"1\" c=\"\"></a>");
-    EXPECT_EQ(element->attributeForName("d"), nullptr);
-    const auto nameless = XMLElement::initForAttributes("a", 2);
-    nameless->addAttribute(nullptr, "1");
-    nameless->addAttribute(nullptr, "2");
-    EXPECT_EQ(nameless->description(), "<a =\"1\"></a>");
 }
 
 TEST(XMLElement, VeryManyAttributesAndNamespacesTakeNoLongerEach) {
@@ -212,55 +248,16 @@ TEST(XMLElement, VeryManyAttributesAndNamespacesTakeNoLongerEach) {
     EXPECT_LT(std::clock() - start, 15 * CLOCKS_PER_SEC);
 }
 
-TEST(XMLElement, TheFirstOfTwoEqualPrefixesWins) {
-    const auto element = XMLElement::initWithName("a");
-    element->addNamespace(XMLNode::namespaceWithName("old", "urn:old"));
-    const Ref<XMLNode> both = XMLNode::namespaceWithName("q", "urn:q");
-    const Ref<XMLNode> set[] = {XMLNode::namespaceWithName("p", "urn:1"), both, both,
-                                XMLNode::namespaceWithName("p", "urn:2"),
-                                XMLNode::namespaceWithName("", "urn:3")};
-    element->setNamespaces(set);
-    EXPECT_EQ(element->XMLString(), "<a xmlns:p=\"urn:1\" xmlns:q=\"urn:q\" xmlns=\"urn:3\"></a>");
-    const Ref<XMLNode> bad[] = {XMLNode::namespaceWithName("r", "urn:4"), both};
-    EXPECT_THROW(element->setNamespaces(bad), qx::Exception);
-    EXPECT_EQ(element->namespaces().begin()->name(), "p");
+TEST(XMLElement, AStringValueMayBeANameOfWhatItReplaces) {
+    const auto document = parsed("<a><some-long-name/></a>");
+    document->setStringValue(document->rootElement()->firstChild()->name());
+    EXPECT_EQ(document->XMLString(), "<a>some-long-name</a>");
 }
 
-TEST(XMLElement, ItsStringValueIsAllTextInsideAndAPieceAloneIsShared) {
-    const std::pair<const char*, const char*> cases[] = {
-        {"<a/>", ""},
-        {"<a>x<b>y<c/></b><!--no--><?no no?>z</a>", "xyz"},
-        {"<a><b><c>deep</c></b></a>", "deep"}};
-    for (const auto& [text, value] : cases)
-        EXPECT_EQ(parsed(text)->rootElement()->stringValue(), value) << text;
+TEST(XMLElement, APieceOfTextAloneIsSharedAsItsStringValue) {
     const auto document = parsed("<a>shared text</a>");
     const qx::String value = document->stringValue();
     EXPECT_TRUE(value.isSameAs(document->rootElement()->firstChild()->stringValue()));
-}
-
-TEST(XMLElement, SettingItsStringValueReplacesTheContent) {
-    const auto document = parsed("<a b='1'><c/>x</a>");
-    document->setStringValue("<&");
-    EXPECT_EQ(document->XMLString(), "<a b=\"1\">&lt;&amp;</a>");
-    document->rootElement()->setStringValue(nullptr);
-    EXPECT_EQ(document->XMLString(), "<a b=\"1\"></a>");
-    EXPECT_EQ(document->rootElement()->childCount(), 0U);
-    document->rootElement()->addChild(XMLElement::initWithName("some-long-name"));
-    document->setStringValue(document->rootElement()->firstChild()->name()); // of what goes
-    EXPECT_EQ(document->XMLString(), "<a b=\"1\">some-long-name</a>");
-}
-
-TEST(XMLElement, AnOnlyTextIsAChildLikeAnyOther) {
-    const auto document = parsed("<a><b>one</b><c>two</c></a>");
-    auto* b = document->rootElement()->firstChild()->asElement();
-    EXPECT_EQ(document->stringValue(), "onetwo");
-    EXPECT_EQ(b->childCount(), 1U);
-    b->insertChild(XMLElement::initWithName("i"), b->lastChild());
-    EXPECT_EQ(document->XMLString(), "<a><b><i></i>one</b><c>two</c></a>");
-    const Ref<XMLNode> text(b->lastChild());
-    text->detach();
-    EXPECT_EQ(text->stringValue(), "one");
-    EXPECT_EQ(document->copy()->XMLString(), "<a><b><i></i></b><c>two</c></a>");
 }
 
 TEST(XMLNode, NodesMayDieOnAnotherThread) {

@@ -108,6 +108,13 @@ TEST(XMLScanner, LeavesTheRestToTheCParser) {
 TEST(XMLScanner, AgreesOnADocumentCutAnywhere) {
     for (std::size_t size = 0; size < sample.size(); ++size)
         expectSame(sample.substr(0, size));
+    // Memory of that very size, so that the sanitizer sees a look behind the end.
+    const std::string_view declared =
+        "<!DOCTYPE a [<!ENTITY e 'x'><!ATTLIST a b CDATA 'c'>]><a>&e;</a>";
+    for (std::size_t size = 0; size < declared.size(); ++size) {
+        const std::vector<char> bytes(declared.begin(), declared.begin() + size);
+        EXPECT_FALSE(qx::XMLDocument::initWithData(std::string_view(bytes.data(), size))) << size;
+    }
 }
 
 TEST(XMLScanner, AgreesWhateverByteStandsAnywhere) {

@@ -1,11 +1,64 @@
+// Runs the built tool as a user does: shell commands in a home folder of their own, with nothing of
+// this machine in what they print.
+//
+//     /home/ada                           the folder where commands run, and its user's home
+//     /usr/bin                            the folder of the tool
+//     /usr/share/QXXMLMarshalling         the library's resources
+
+#include "support/FileSandbox.h"
 #include "support/Page.h"
-#include "tools/qxxml/Shell.h"
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <regex>
 
+#include <sys/wait.h>
+
 namespace {
+
+struct Outcome {
+    int status;
+    std::string output;
+    std::string errors;
+};
+
+class Shell {
+public:
+    Shell() {
+        _home.setVariable("HOME", _home.root());
+        _home.setVariable("XDG_DATA_HOME", std::nullopt);
+        _home.setVariable("XDG_CONFIG_HOME", std::nullopt);
+    }
+    // Writes a file; its name may hold folders.
+    void write(const std::string& name, const std::string& text) { _home.write(name, text); }
+    // Standard input is empty unless the command says otherwise.
+    Outcome run(const std::string& command) const {
+        const std::string output = _outside.path("output"), errors = _outside.path("errors");
+        const std::string line = "cd '" + _home.root() +
+                                 "' && PATH='" QX_BUILD_DIR "/bin':\"$PATH\" && { " + command +
+                                 "\n} </dev/null >'" + output + "' 2>'" + errors + "'";
+        const int status = std::system(line.c_str());
+        return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, withoutPaths(_outside.read("output")),
+                withoutPaths(_outside.read("errors"))};
+    }
+
+private:
+    std::string withoutPaths(std::string text) const {
+        using std::filesystem::canonical;
+        const std::pair<std::string, const char*> places[] = {
+            {_home.root(), "/home/ada"},
+            {canonical(QX_BUILD_DIR "/bin"), "/usr/bin"},
+            {canonical(QX_SOURCE_DIR "/share"), "/usr/share/QXXMLMarshalling"}};
+        for (const auto& [place, name] : places)
+            for (std::size_t at; (at = text.find(place)) != std::string::npos;)
+                text.replace(at, place.size(), name);
+        return text;
+    }
+
+    FileSandbox _home;
+    FileSandbox _outside; // what the commands print is no part of the user's home
+};
 
 // The page's documents ("xml NAME") are laid out; `answer` tells what comes of each of its commands
 // ("console").
