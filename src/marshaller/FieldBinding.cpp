@@ -34,7 +34,7 @@ bool Unmarshalling::readField(const FieldPlan& field, const Target& target, Erro
     return false;
 }
 
-bool Marshalling::writeField(const FieldPlan& field, XMLElement& element, Object& object,
+bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
                              ErrorSlot error) {
     ObjectAccess::Held held = ObjectAccess::get(object, field.key);
     Value& value = held.value;

@@ -4,11 +4,14 @@
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "files/AtomicWrite.h"
 #include "files/Files.h"
+#include "marshaller/Marshalling.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
 #include "model/TypeNames.h"
 #include "xml/XMLParser.h"
+#include "xml/XMLSerializer.h"
 
 #include <algorithm>
 
@@ -20,8 +23,6 @@ using qx::detail::ClassPlan;
 using qx::detail::MappingPlan;
 
 namespace {
-
-constexpr qx::XMLOptions layout = qx::XMLPrettyPrint;
 
 void reset(Ref<Error>* error) {
     if (error != nullptr)
@@ -83,11 +84,25 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parse
     return objectOf(marshaller, document, type, error);
 }
 
-// What no XML document can hold, or none that could be read again, raises while it is written.
-template <class Result, class Write>
-Result written(Write write, Ref<Error>* error) {
+// Calls use(text) with the document of the object, which is drafted and printed; what use()
+// answers. The draft's names are the mapping's, which the marshalling holds: getters may let go of
+// the marshaller. What no XML document can hold, or none that could be read again, raises while it
+// is printed.
+template <class Use>
+auto withDocument(const QXXMLMarshaller& marshaller, const qx::Value& object, qx::XMLOptions layout,
+                  Ref<Error>* error, Use use) -> decltype(use(std::declval<qx::TextBuffer&>())) {
+    reset(error);
+    const qx::XMLParseOptions reading = parseOptions(marshaller);
+    const qx::Value held = object; // whatever the getters do to the caller's
+    qx::XMLDraft draft;
+    qx::detail::Marshalling marshalling(marshaller, &draft);
+    const auto root = marshalling.marshallObject(held, error);
+    if (!root || (error != nullptr && *error))
+        return {};
     try {
-        return write();
+        qx::TextBuffer text;
+        qx::writeDraft(*root.drafted, layout, reading, text);
+        return use(text);
     } catch (const qx::Exception& exception) {
         return qx::fail(error, qx::errors::textCannotBeWritten, exception.reason());
     }
@@ -147,28 +162,22 @@ Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, Ref<Error>* er
     return readStream(stream, typeid(qx::Object), error);
 }
 
-String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
-    reset(error);
-    const auto options = parseOptions(*this); // the getters may let go of the marshaller
-    const auto document = marshall(object, error);
-    if (!document)
-        return nullptr;
-    return written<String>([&] { return document->XMLString(layout, options); }, error);
+String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error,
+                                    qx::XMLOptions layout) {
+    return withDocument(*this, object, layout, error,
+                        [](qx::TextBuffer& text) { return text.take(); });
 }
 
-bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
-    reset(error);
-    const auto options = parseOptions(*this); // the getters may let go of the marshaller
-    const auto document = marshall(object, error);
-    const auto write = [&] { return document->writeToFile(path, layout, error, options); };
-    return document && written<bool>(write, error);
+bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error,
+                                qx::XMLOptions layout) {
+    return withDocument(*this, object, layout, error, [&](const qx::TextBuffer& text) {
+        return qx::writeFileAtomically(path, text.view(), error);
+    });
 }
 
-bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
-                                  Ref<Error>* error) {
-    reset(error);
-    const auto options = parseOptions(*this);
-    const auto document = marshall(object, error);
-    const auto write = [&] { return document->writeToStream(stream, layout, error, options); };
-    return document && written<bool>(write, error);
+bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream, Ref<Error>* error,
+                                  qx::XMLOptions layout) {
+    return withDocument(*this, object, layout, error, [&](const qx::TextBuffer& text) {
+        return qx::writeToStream(stream, text.view(), error);
+    });
 }
