@@ -35,9 +35,7 @@ void ElementWriter::addChild(const WrittenElement& parent, const String& name,
                              const FieldText& text) {
     if (parent.node)
         return parent.node->addChild(XMLElement::initWithName(name, text.string()));
-    XMLDraft::Element& child = _draft->newElement(name);
-    _draft->setText(child, text.view());
-    XMLDraft::addChild(*parent.drafted, child);
+    _draft->addLeaf(*parent.drafted, name, text.view());
 }
 
 void ElementWriter::setText(const WrittenElement& element, const FieldText& text) {

@@ -58,25 +58,26 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
         ~Deeper() { --depth; }
     } const deeper(_depth);
 
-    std::vector<const ClassPlan*> levels;
+    std::vector<const ClassPlan*> ancestors;
     ExtendsWalk walk(plan);
     do {
-        levels.push_back(&walk.current());
+        if (&walk.current() != &plan)
+            ancestors.push_back(&walk.current());
         if (walk.current().mapping->isSelfFirst() &&
             !writeOwnFields(walk.current(), element, object, error))
             return false;
     } while (walk.next());
     if (!walk.broken().isNull())
         return fail(error, errors::noExtendsWhenMarshalling, walk.broken());
-    std::reverse(levels.begin(), levels.end());
-    for (const ClassPlan* level : levels) {
-        if (!level->mapping->isSelfFirst() && !writeOwnFields(*level, element, object, error))
+    const auto finish = [&](const ClassPlan& level) {
+        if (!level.mapping->isSelfFirst() && !writeOwnFields(level, element, object, error))
             return false;
-        if (_marshaller->saveUnknownXML())
-            restoreUnknownXML(element, object);
-        restoreNamespaces(element, object);
-    }
-    return true;
+        restoreXML(element, object);
+        return true;
+    };
+    return std::all_of(ancestors.rbegin(), ancestors.rend(),
+                       [&](const ClassPlan* ancestor) { return finish(*ancestor); }) &&
+           finish(plan);
 }
 
 bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
@@ -103,6 +104,14 @@ Ref<XMLNode> keptNode(const Value& kept, XMLNodeKind kind) {
 }
 
 } // namespace
+
+void Marshalling::restoreXML(const WrittenElement& element, const Object& object) {
+    if (!_access.mayKeepXML(object))
+        return;
+    if (_marshaller->saveUnknownXML())
+        restoreUnknownXML(element, object);
+    restoreNamespaces(element, object);
+}
 
 void Marshalling::restoreUnknownXML(const WrittenElement& element, const Object& object) {
     if (const auto children = _access.getKept(object, KeptXML::children).as<Dictionary>())

@@ -47,6 +47,7 @@ public:
 private:
     bool writeOwnFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                         ErrorSlot error);
+    void restoreXML(const WrittenElement& element, const Object& object);
     void restoreUnknownXML(const WrittenElement& element, const Object& object);
     void restoreNamespaces(const WrittenElement& element, const Object& object);
 

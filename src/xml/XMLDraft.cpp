@@ -20,7 +20,8 @@ void XMLDraft::grow(std::size_t size) {
 }
 
 XMLDraft::Node* XMLDraft::newNode(Kind kind, const String* name, std::string_view value) {
-    void* const memory = allocate(sizeof(Node) + value.size());
+    // What moves leaves a pointer.
+    void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
     Node* const node =
         ::new (memory) Node{name, nullptr, value.size(), static_cast<std::uint8_t>(kind)};
     if (!value.empty())
@@ -106,6 +107,21 @@ void XMLDraft::addChild(Element& parent, Element& child) noexcept {
     append(parent.lastChild, &child);
 }
 
+void XMLDraft::addLeaf(Element& parent, const String& name, std::string_view text) {
+    append(parent.lastChild, text.empty() ? &newElement(name) : newNode(Kind::leaf, &name, text));
+}
+
+XMLDraft::Element& XMLDraft::enlarged(Node& child) {
+    if (child.kind() == Kind::leaf) {
+        Element& element = newElement(*child.name);
+        setText(element, child.value());
+        const Element* const place = &element;
+        std::memcpy(&child + 1, &place, sizeof place);
+        child.kindNumber = static_cast<std::uint8_t>(Kind::moved);
+    }
+    return const_cast<Element&>(child.element());
+}
+
 void XMLDraft::setText(Element& element, std::string_view text) {
     Node* const node = !text.empty() ? newNode(Kind::text, nullptr, text) : nullptr;
     _children.erase(&element);
@@ -159,9 +175,8 @@ XMLDraft::Children& XMLDraft::indexedChildren(const Element& element) {
     while (index.seen != element.lastChild) {
         Node* const node = (index.seen != nullptr ? index.seen : element.lastChild)->next;
         const std::size_t place = index.count + 1;
-        if (node->kind() == Kind::element)
-            index.elements.insert_or_assign(node->name->view(),
-                                            Children::Last{static_cast<Element*>(node), place});
+        if (node->name != nullptr)
+            index.elements.insert_or_assign(node->name->view(), Children::Last{node, place});
         else if (node->kind() == Kind::keptChildren)
             index.holders.emplace_back(place, &node->holder());
         index.count = place;
@@ -198,8 +213,10 @@ Ref<XMLElement> XMLDraft::makeElement(const Element& draft) {
                 element->addAttribute(std::move(kept));
     });
     forEach(draft.lastChild, [&](const Node& node) {
-        if (node.kind() == Kind::element)
-            element->addChild(makeElement(static_cast<const Element&>(node)));
+        if (node.kind() == Kind::element || node.kind() == Kind::moved)
+            element->addChild(makeElement(node.element()));
+        else if (node.kind() == Kind::leaf)
+            element->addChild(XMLElement::initWithName(*node.name, String(node.value())));
         else if (node.kind() == Kind::text)
             element->addChild(XMLNode::initTextWithStringValue(String(node.value())));
         else

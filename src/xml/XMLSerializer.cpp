@@ -168,9 +168,11 @@ void XMLSerializer::endElement(const XMLElement& element) {
 }
 
 void XMLSerializer::endTag(const String& name) {
-    _output += "</";
-    _output += name.view();
-    _output += '>';
+    char* const tag = _output.extend(name.size() + 3);
+    tag[0] = '<';
+    tag[1] = '/';
+    std::memcpy(tag + 2, name.c_str(), name.size());
+    tag[name.size() + 2] = '>';
 }
 
 void XMLSerializer::writeLeaf(const XMLNode& node) {

@@ -85,6 +85,7 @@ private:
     void writeElement(const XMLDraft::Element& element);
     DraftTag startTag(const XMLDraft::Element& element);
     void writeChildren(const XMLDraft::Element& element);
+    void writeLeaf(const XMLDraft::Node& leaf);
     void endTag(const String& name);
 
     TextBuffer& _output;

@@ -132,20 +132,37 @@ void XMLSerializer::writeElement(const XMLDraft::Element& element) { // NOLINT(m
 void XMLSerializer::writeChildren(const XMLDraft::Element& element) { // NOLINT(misc-no-recursion)
     const bool isLaidOut = has(XMLPrettyPrint) && !_levels.back().isInline();
     XMLDraft::forEach(element.lastChild, [&](const XMLDraft::Node& node) {
-        if (node.kind() == XMLDraft::Kind::element) {
-            if (isLaidOut)
-                breakLine(_levels.size());
-            writeElement(static_cast<const XMLDraft::Element&>(node));
-        } else if (node.kind() == XMLDraft::Kind::text) {
+        if (isLaidOut && node.name != nullptr)
+            breakLine(_levels.size());
+        switch (node.kind()) {
+        case XMLDraft::Kind::leaf:
+            writeLeaf(node);
+            break;
+        case XMLDraft::Kind::text:
             _limits.addText(node.size, {});
             writeEscaped(node.value(), Where::text, isWhite(node.value()), {});
-        } else {
+            break;
+        case XMLDraft::Kind::keptChildren:
             for (const XMLNode& kept : node.holder().children()) {
                 startLine(kept);
                 writeTree(kept);
             }
+            break;
+        default:
+            writeElement(node.element());
         }
     });
+}
+
+void XMLSerializer::writeLeaf(const XMLDraft::Node& leaf) {
+    _output += '<';
+    writeName(*leaf.name, {});
+    _output += '>';
+    _limits.enter({}, 0, 0);
+    _limits.requireSize(leaf.size, "a text is larger than", {});
+    writeEscaped(leaf.value(), Where::text, isWhite(leaf.value()), {});
+    _limits.leave();
+    endTag(*leaf.name);
 }
 
 // Nodes are made only for the place of what cannot be written.
