@@ -259,17 +259,19 @@ public:
         return unmarshallInto(object, document.get(), error);
     }
 
-    // Marshall and serialise in one step, one element a line. The slot is set to null first. The
-    // string is null on failure; a file
-    // is replaced atomically, and untouched on failure. Besides the errors of marshall() and of
-    // writing:
+    // Marshall and serialise in one step, one element a line unless the layout says otherwise
+    // (XMLNode.h); no tree of nodes is made. The slot is set to null first. The string is null on
+    // failure; a file is replaced atomically, and untouched on failure. Kept unknown XML is taken
+    // out of where it was, as by marshall(). Besides the errors of marshall() and of writing:
     //   517  "The text cannot be written: %@"   (a character or a name that XML has no place for,
     //         or what this marshaller could not read again: see the limits in XMLDocument.h)
-    qx::String writeString(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr);
+    qx::String writeString(const qx::Value& object, qx::Ref<qx::Error>* error = nullptr,
+                           qx::XMLOptions layout = qx::XMLPrettyPrint);
     bool writeFile(const qx::Value& object, const qx::String& path,
-                   qx::Ref<qx::Error>* error = nullptr);
+                   qx::Ref<qx::Error>* error = nullptr, qx::XMLOptions layout = qx::XMLPrettyPrint);
     bool writeStream(const qx::Value& object, std::ostream& stream,
-                     qx::Ref<qx::Error>* error = nullptr);
+                     qx::Ref<qx::Error>* error = nullptr,
+                     qx::XMLOptions layout = qx::XMLPrettyPrint);
 
     // The same for a plain struct, or what owns one (std::unique_ptr, std::variant and the like).
     // It is read where it is and not copied: nothing may change it meanwhile.
@@ -278,16 +280,19 @@ public:
         return marshall(qx::detail::lend(object), error);
     }
     template <qx::WritableStruct T>
-    qx::String writeString(const T& object, qx::Ref<qx::Error>* error = nullptr) {
-        return writeString(qx::detail::lend(object), error);
+    qx::String writeString(const T& object, qx::Ref<qx::Error>* error = nullptr,
+                           qx::XMLOptions layout = qx::XMLPrettyPrint) {
+        return writeString(qx::detail::lend(object), error, layout);
     }
     template <qx::WritableStruct T>
-    bool writeFile(const T& object, const qx::String& path, qx::Ref<qx::Error>* error = nullptr) {
-        return writeFile(qx::detail::lend(object), path, error);
+    bool writeFile(const T& object, const qx::String& path, qx::Ref<qx::Error>* error = nullptr,
+                   qx::XMLOptions layout = qx::XMLPrettyPrint) {
+        return writeFile(qx::detail::lend(object), path, error, layout);
     }
     template <qx::WritableStruct T>
-    bool writeStream(const T& object, std::ostream& stream, qx::Ref<qx::Error>* error = nullptr) {
-        return writeStream(qx::detail::lend(object), stream, error);
+    bool writeStream(const T& object, std::ostream& stream, qx::Ref<qx::Error>* error = nullptr,
+                     qx::XMLOptions layout = qx::XMLPrettyPrint) {
+        return writeStream(qx::detail::lend(object), stream, error, layout);
     }
 
     // The steps of marshalling, for hosts that build trees of their own.

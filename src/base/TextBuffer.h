@@ -22,29 +22,31 @@ public:
 
     TextBuffer& operator+=(std::string_view text) {
         if (!text.empty())
-            std::memcpy(room(text.size()), text.data(), text.size());
+            std::memcpy(extend(text.size()), text.data(), text.size());
         return *this;
     }
     TextBuffer& operator+=(char c) {
-        *room(1) = c;
+        *extend(1) = c;
         return *this;
     }
     void append(std::size_t count, char c) {
         if (count != 0)
-            std::memset(room(count), c, count);
+            std::memset(extend(count), c, count);
     }
 
-    // The text; the buffer is empty afterwards.
-    String take();
-
-private:
-    char* room(std::size_t count) {
+    // Makes the text longer by so many bytes, which the caller fills in.
+    char* extend(std::size_t count) {
         if (_capacity - _size < count)
             grow(count);
         char* const place = reinterpret_cast<char*>(_rep + 1) + _size;
         _size += count;
         return place;
     }
+
+    // The text; the buffer is empty afterwards.
+    String take();
+
+private:
     void grow(std::size_t count);
 
     String::Rep* _rep = nullptr;

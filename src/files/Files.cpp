@@ -8,6 +8,7 @@
 #include <cerrno>
 #include <fcntl.h>
 #include <istream>
+#include <ostream>
 #include <sys/stat.h>
 
 namespace qx {
@@ -71,6 +72,11 @@ Ref<Data> readStream(std::istream& stream, Ref<Error>* error) {
     if (stream.eof() && !stream.bad())
         return make<Data>(std::move(bytes));
     return fail(error, errors::streamNotRead);
+}
+
+bool writeToStream(std::ostream& stream, std::string_view bytes, Ref<Error>* error) {
+    stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    return stream.flush() ? true : fail(error, errors::streamNotWritten);
 }
 
 bool fileExists(const String& path) {

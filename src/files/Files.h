@@ -28,6 +28,8 @@ Ref<Data> readFile(const String& path, Ref<Error>* error = nullptr,
 
 // What a stream has left; null with error 256 when it fails.
 Ref<Data> readStream(std::istream& stream, Ref<Error>* error = nullptr);
+// Writes and flushes; false with error 512 when the stream fails.
+bool writeToStream(std::ostream& stream, std::string_view bytes, Ref<Error>* error = nullptr);
 
 // Whether anything is there, symbolic links followed.
 bool fileExists(const String& path);

@@ -34,22 +34,22 @@ bool Unmarshalling::readField(const FieldPlan& field, const Target& target, Erro
     return false;
 }
 
-bool Marshalling::writeField(const FieldPlan& field, XMLElement& element, Object& object,
+bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
                              ErrorSlot error) {
     ObjectAccess::Held held = ObjectAccess::get(object, field.key);
-    Value& value = held.value;
-    if (value.isNull() && field.isContainer) {
+    if (held.value().isNull() && field.isContainer) {
         if (!field.isRequired)
             return true;
         if (field.valueType == ValueType::other || field.valueType == ValueType::string)
             return fail(error, errors::requiredValueMissing, field.key.string(), &object);
-        value = false;
+        held = {false, held.keepsZero()};
     }
+    const Value& value = held.value();
     if (const auto array = value.as<Array>())
         return writeCollection(*this, field, element, *array, error);
-    if (value.classNameForMarshalling().isNull())
+    if (value.isNull() || (value.isObject() && value.classNameForMarshalling().isNull()))
         return fail(error, errors::noClassName, object.isa().name());
-    _omitsZero = _marshaller->omitsZeroAttributes() && !held.keepsZero;
+    _omitsZero = _marshaller->omitsZeroAttributes() && !held.keepsZero();
     return bindingOf(field).write(*this, field, element, value, error);
 }
 

@@ -18,7 +18,7 @@ struct FieldBinding {
     bool (*read)(Unmarshalling& reading, const FieldPlan& field,
                  const Unmarshalling::Target& target, Ref<Error>* error);
     // Writes the value, which is no array; a null one only of a field that is no container.
-    bool (*write)(Marshalling& writing, const FieldPlan& field, XMLElement& element,
+    bool (*write)(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
                   const Value& value, Ref<Error>* error);
 };
 
@@ -38,7 +38,7 @@ bool readCollection(Unmarshalling& reading, const FieldPlan& field,
 // A collection whose items are of the class that "type" names.
 bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field,
                           const Unmarshalling::Target& target, Ref<Error>* error);
-bool writeCollection(Marshalling& writing, const FieldPlan& field, XMLElement& element,
+bool writeCollection(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
                      const Array& array, Ref<Error>* error);
 
 // element.cpp, for what stands in a child element and what is flattened alike.

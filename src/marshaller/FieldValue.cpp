@@ -5,6 +5,8 @@
 #include "marshaller/ObjectAccess.h"
 #include "model/Errors.h"
 
+#include <charconv>
+
 namespace qx::detail {
 
 namespace {
@@ -47,6 +49,28 @@ Value itemOf(const FieldPlan& field, const String& text, Ref<Error>* error) {
     default:
         return text;
     }
+}
+
+FieldText::FieldText(const Value& value, ValueType type) : _value(value) {
+    if (type == ValueType::boolean) {
+        _view = value.boolValue() ? "true" : "false";
+    } else if (value.isString()) {
+        _view = value.view();
+    } else if (value.kind() == Value::Kind::integer) {
+        const auto end =
+            std::to_chars(_digits.data(), _digits.data() + _digits.size(), value.intValue()).ptr;
+        _view = {_digits.data(), end};
+    } else {
+        _description = value.description();
+        _view = _description;
+    }
+}
+
+String FieldText::string() const {
+    if (!_description.isNull())
+        return _description;
+    const std::string_view own = _value.view();
+    return own.data() == _view.data() && _value.isString() ? _value.string() : String(_view);
 }
 
 } // namespace qx::detail

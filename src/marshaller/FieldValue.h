@@ -7,6 +7,8 @@
 
 #include "plan/FieldPlan.h"
 
+#include <array>
+
 namespace qx::detail {
 
 // Converts a text by the field's type and sets it under the key; any other value is set as it is.
@@ -18,10 +20,24 @@ bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref
 // The text as an item of a collection of a simple type; null with -221 as above.
 Value itemOf(const FieldPlan& field, const String& text, Ref<Error>* error);
 
-inline String textOf(const Value& value, ValueType type) {
-    if (type == ValueType::boolean)
-        return value.boolValue() ? "true" : "false";
-    return value.description();
-}
+// The text under which a value is written: "true" or "false" for a boolean field, else the value's
+// description. It needs the value as long as it is used.
+class FieldText {
+public:
+    FieldText(const Value& value, ValueType type);
+    FieldText(const FieldText&) = delete;
+    FieldText& operator=(const FieldText&) = delete;
+
+    std::string_view view() const noexcept { return _view; }
+    bool isEmpty() const noexcept { return _view.empty(); }
+    // The value's own where it is one.
+    String string() const;
+
+private:
+    const Value& _value;
+    std::string_view _view;
+    String _description; // of what is neither text nor integer
+    std::array<char, 20> _digits;
+};
 
 } // namespace qx::detail

@@ -10,15 +10,15 @@
 
 namespace qx::detail {
 
-Marshalling::Marshalling(const QXXMLMarshaller& marshaller)
+Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()),
-      _plan(MappingPlan::of(_mapping.get())) {}
+      _plan(MappingPlan::of(_mapping.get())), _output(draft) {}
 
 const ClassPlan* Marshalling::classOf(const Value& value) const {
     return value.isObject() ? _plan.classNamed(value.classNameForMarshalling()) : nullptr;
 }
 
-Ref<XMLElement> Marshalling::marshallObject(const Value& object, ErrorSlot error) {
+WrittenElement Marshalling::marshallObject(const Value& object, ErrorSlot error) {
     const String className = object.classNameForMarshalling();
     if (className.isNull())
         return fail(error, errors::noClassName,
@@ -29,24 +29,26 @@ Ref<XMLElement> Marshalling::marshallObject(const Value& object, ErrorSlot error
     return element(*plan, plan->elementName, object, error);
 }
 
-Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, const Value& object,
-                                     ErrorSlot error) {
+WrittenElement Marshalling::element(const ClassPlan& plan, const String& name, const Value& object,
+                                    ErrorSlot error) {
     if (!object.isObject())
         return fail(error, errors::noMappingDefinition, object.classNameForMarshalling());
-    auto element = XMLElement::initForAttributes(name.isEmpty() ? plan.className.string() : name,
-                                                 plan.attributeCount);
+    static const String noPrefix("");
+    auto element =
+        _output.newElement(name.isEmpty() ? plan.namelessName : name, plan.attributeCount);
     const QXXMLClassMapping& mapping = *plan.mapping;
-    if (_marshaller->isUsingNamespaceURIs() && !mapping.nsURI().isEmpty()) {
-        const String prefix = mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix();
-        element->addNamespace(XMLNode::namespaceWithName(prefix, mapping.nsURI()));
-    }
-    return writeFields(plan, *element, *object.object(), error) ? element : nullptr;
+    if (_marshaller->isUsingNamespaceURIs() && !mapping.nsURI().isEmpty())
+        _output.addDeclaration(element, mapping.nsPrefix().isNull() ? noPrefix : mapping.nsPrefix(),
+                               mapping.nsURI());
+    if (!writeFields(plan, element, *object.object(), error))
+        return {};
+    return element;
 }
 
 // A class that is self-first writes its fields before its ancestors', any other after them. Kept
 // XML is put back at every level, the farthest ancestor's first, so that it ends up behind all
 // fields.
-bool Marshalling::writeFields(const ClassPlan& plan, XMLElement& element, Object& object,
+bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                               ErrorSlot error) {
     const std::size_t deepest = _marshaller->maximumDepth();
     if (_depth >= deepest)
@@ -57,29 +59,30 @@ bool Marshalling::writeFields(const ClassPlan& plan, XMLElement& element, Object
         ~Deeper() { --depth; }
     } const deeper(_depth);
 
-    std::vector<const ClassPlan*> levels;
+    std::vector<const ClassPlan*> ancestors;
     ExtendsWalk walk(plan);
     do {
-        levels.push_back(&walk.current());
+        if (&walk.current() != &plan)
+            ancestors.push_back(&walk.current());
         if (walk.current().mapping->isSelfFirst() &&
             !writeOwnFields(walk.current(), element, object, error))
             return false;
     } while (walk.next());
     if (!walk.broken().isNull())
         return fail(error, errors::noExtendsWhenMarshalling, walk.broken());
-    std::reverse(levels.begin(), levels.end());
-    for (const ClassPlan* level : levels) {
-        if (!level->mapping->isSelfFirst() && !writeOwnFields(*level, element, object, error))
+    const auto finish = [&](const ClassPlan& level) {
+        if (!level.mapping->isSelfFirst() && !writeOwnFields(level, element, object, error))
             return false;
-        if (_marshaller->saveUnknownXML())
-            restoreUnknownXML(element, object);
-        restoreNamespaces(element, object);
-    }
-    return true;
+        restoreXML(element, object);
+        return true;
+    };
+    return std::all_of(ancestors.rbegin(), ancestors.rend(),
+                       [&](const ClassPlan* ancestor) { return finish(*ancestor); }) &&
+           finish(plan);
 }
 
-bool Marshalling::writeOwnFields(const ClassPlan& plan, XMLElement& element, Object& object,
-                                 ErrorSlot error) {
+bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
+                                 Object& object, ErrorSlot error) {
     for (const FieldPlan& field : plan.fields) {
         Ref<Error> problem;
         if (writeField(field, element, object, &problem))
@@ -91,55 +94,41 @@ bool Marshalling::writeOwnFields(const ClassPlan& plan, XMLElement& element, Obj
     return true;
 }
 
-XMLElement* Marshalling::lastChildNamed(const XMLElement& element, const String& name) {
-    // Up to so many, looking through the children costs no more than an index of them.
-    constexpr std::size_t mostScanned = 64;
-    if (element.childCount() > mostScanned)
-        return _lastChildren[&element].named(element, name);
-    for (XMLNode* child = element.lastChild(); child != nullptr; child = child->previousSibling())
-        if (child->isElement() && child->name() == name)
-            return child->asElement();
-    return nullptr;
-}
-
 bool Marshalling::isToBeWritten(const Value& item) { return _access.isToBeWritten(*item.object()); }
 
 namespace {
 
-// Takes a kept node out of wherever it is; null for what is no such node.
-Ref<XMLNode> moved(const Value& kept, XMLNodeKind kind) {
+// Null for what is no such node.
+Ref<XMLNode> keptNode(const Value& kept, XMLNodeKind kind) {
     auto node = kept.as<XMLNode>();
-    if (!node || node->kind() != kind)
-        return nullptr;
-    node->detach();
-    return node;
+    return node && node->kind() == kind ? node : nullptr;
 }
 
 } // namespace
 
-void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
-    if (const auto children = _access.getKept(object, KeptXML::children).as<Dictionary>()) {
-        const auto known = _lastChildren.find(&element);
-        LastChildByName* const last = known != _lastChildren.end() ? &known->second : nullptr;
-        if (last != nullptr)
-            last->catchUp(element);
+void Marshalling::restoreXML(const WrittenElement& element, const Object& object) {
+    if (!_access.mayKeepXML(object))
+        return;
+    if (_marshaller->saveUnknownXML())
+        restoreUnknownXML(element, object);
+    restoreNamespaces(element, object);
+}
+
+void Marshalling::restoreUnknownXML(const WrittenElement& element, const Object& object) {
+    if (const auto children = _access.getKept(object, KeptXML::children).as<Dictionary>())
         for (const auto& entry : *children)
             if (const auto elements = entry.value.as<Array>())
                 for (const Value& kept : *elements)
-                    if (const auto child = moved(kept, XMLNodeKind::element)) {
-                        element.addChild(child);
-                        if (last != nullptr)
-                            last->see(*child);
-                    }
-    }
+                    if (const auto child = keptNode(kept, XMLNodeKind::element))
+                        _output.keepChild(element, child);
     if (const auto attributes = _access.getKept(object, KeptXML::attributes).as<Array>())
         for (const Value& kept : *attributes)
-            if (auto attribute = moved(kept, XMLNodeKind::attribute))
-                element.addAttribute(std::move(attribute));
+            if (const auto attribute = keptNode(kept, XMLNodeKind::attribute))
+                _output.keepAttribute(element, attribute);
 }
 
 // The declarations that were read take the place of the class mapping's own.
-void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) {
+void Marshalling::restoreNamespaces(const WrittenElement& element, const Object& object) {
     const auto kept = _access.getKept(object, KeptXML::namespaces).as<Array>();
     if (!kept || kept->isEmpty() || !_marshaller->isUsingNamespaceURIs())
         return;
@@ -149,7 +138,7 @@ void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) {
         if (declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
             copies.push_back(declaration->copy());
     }
-    element.setNamespaces(copies);
+    _output.setDeclarations(element, copies);
 }
 
 } // namespace qx::detail

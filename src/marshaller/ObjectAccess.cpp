@@ -7,8 +7,10 @@
 #include "model/Errors.h"
 #include "record/RecordFilling.h"
 
+#include <algorithm>
 #include <mutex>
 #include <set>
+#include <span>
 #include <utility>
 
 namespace qx::detail {
@@ -42,7 +44,7 @@ const Class* const ObjectAccess::records = &QXGenericRecord::classObject();
 ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
     const Class& type = object.isa();
     if (&type == records)
-        return {object.valueForKey(key), false};
+        return getContent(static_cast<const QXGenericRecord&>(object), key);
     const Property* property = type.property(key);
     if (property == nullptr)
         return {object.valueForKey(key), false};
@@ -69,6 +71,16 @@ bool refuse(const Object& object, Key key, const Value& value, Ref<Error>* error
 
 } // namespace
 
+ObjectAccess::Held ObjectAccess::getContent(const QXGenericRecord& record, Key key) {
+    if (key.namesProperty())
+        return {record.valueForKey(key), false};
+    const Dictionary* const contents = record.contents().get();
+    const Value* const value = contents != nullptr ? contents->find(key.string()) : nullptr;
+    if (value == nullptr)
+        return {Value(), false};
+    return value->isObject() ? Held(*value, false) : Held(*value);
+}
+
 bool ObjectAccess::set(Object& object, Key key, Value value, Ref<Error>* error) {
     QXGenericRecord* record = plainRecord(object);
     if (record != nullptr && RecordFilling::add(*record, key, std::move(value)))
@@ -90,8 +102,18 @@ SetOutcome ObjectAccess::setProperty(Object& object, Key key, const Value& value
                : SetOutcome::refused;
 }
 
+namespace {
+
+std::span<const String, 3> keptKeys() {
+    static const String keys[] = {Key("unboundChildren"), Key("unboundAttributes"),
+                                  Key("__namespaces")};
+    return keys;
+}
+
+} // namespace
+
 Key ObjectAccess::keyOf(KeptXML what) {
-    static const Key keys[] = {"unboundChildren", "unboundAttributes", "__namespaces"};
+    static const Key keys[] = {keptKeys()[0], keptKeys()[1], keptKeys()[2]};
     return keys[static_cast<std::size_t>(what)];
 }
 
@@ -119,6 +141,18 @@ constexpr const char* itemsAreLeftOut =
     "Items of class %@ are not written: the class does not answer isRemovable";
 
 } // namespace
+
+bool ObjectAccess::mayKeepXML(const Object& object) {
+    if (&object.isa() != records) {
+        const bool(&lacks)[3] = hooksOf(object).lacks;
+        return !lacks[0] || !lacks[1] || !lacks[2];
+    }
+    const Dictionary* const contents = static_cast<const QXGenericRecord&>(object).contents().get();
+    const auto keys = keptKeys();
+    return contents != nullptr && std::ranges::any_of(*contents, [&](const auto& entry) {
+               return entry.key == keys[0] || entry.key == keys[1] || entry.key == keys[2];
+           });
+}
 
 // A class that lacks a key raises when it is read by a key that it does not take; so it is asked
 // once. A struct has the keys that it was described with, and no others. Of a record these are no
@@ -167,6 +201,8 @@ bool ObjectAccess::adopt(Object& item, Object& parent, Ref<Error>* error) {
 }
 
 bool ObjectAccess::isToBeWritten(Object& item) {
+    if (plainRecord(item) != nullptr)
+        return true;
     const ObjectHooks& hooks = hooksOf(item);
     if (hooks.isRemovable != nullptr)
         return !send(item, *hooks.isRemovable).boolValue();

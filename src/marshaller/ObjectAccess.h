@@ -46,12 +46,25 @@ public:
     static Value send(Object& object, const Operation& operation);
     static Value send(Object& object, const Operation& operation, const Value& argument);
 
-    // A value that is to be written. Structs in it stay where they are, in their owner.
-    struct Held {
-        Value value;
-        bool keepsZero; // see Property
+    // A value that is to be written. Structs in it stay where they are, in their owner. A record's
+    // text or number stays there, too: it is good until the next call of anything of a host's.
+    class Held {
+    public:
+        Held(Value value, bool keepsZero) noexcept
+            : _own(std::move(value)), _keepsZero(keepsZero) {}
+        explicit Held(const Value& lent) noexcept : _lent(&lent) {}
+
+        const Value& value() const noexcept { return _lent != nullptr ? *_lent : _own; }
+        bool keepsZero() const noexcept { return _keepsZero; } // see Property
+
+    private:
+        Value _own;
+        const Value* _lent = nullptr;
+        bool _keepsZero = false;
     };
     static Held get(const Object& object, Key key);
+    // False where getKept would give null for each.
+    bool mayKeepXML(const Object& object);
     // Null where the object has no such key.
     Value getKept(const Object& object, KeptXML what);
     // Sets and reports what the object does not take:
@@ -72,6 +85,7 @@ public:
     bool isToBeWritten(Object& item);
 
 private:
+    static Held getContent(const QXGenericRecord& record, Key key);
     static SetOutcome setProperty(Object& object, Key key, const Value& value);
 
     static const Class* const records;

@@ -37,20 +37,22 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     return false;
 }
 
-bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
-           Ref<Error>*) {
-    const String text = textOf(value, field.valueType);
+bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
+           const Value& value, Ref<Error>*) {
+    const FieldText text(value, field.valueType);
     if (writing.isLeftOut(field, value, text))
         return true;
-    XMLElement* const target =
-        field.location().isEmpty() ? &element : writing.lastChildNamed(element, field.location());
-    if (target != nullptr) {
-        target->addAttribute(field.xmlName(), text);
-    } else {
-        auto wrapper = XMLElement::initForAttributes(field.location(), 1);
-        wrapper->addAttribute(field.xmlName(), text);
-        element.addChild(std::move(wrapper));
+    ElementWriter& output = writing.output();
+    if (field.location().isEmpty()) {
+        output.addAttribute(element, field.xmlName(), text);
+        return true;
     }
+    WrittenElement wrapper = output.lastChildNamed(element, field.location());
+    if (!wrapper) {
+        wrapper = output.newElement(field.location(), 1);
+        output.addChild(element, wrapper);
+    }
+    output.addAttribute(wrapper, field.xmlName(), text);
     return true;
 }
 

@@ -14,29 +14,24 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 
 // An object of a class that the mapping has is an element under that class's name. Without a
 // container only what is inside of it is written.
-bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
-           Ref<Error>* error) {
+bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
+           const Value& value, Ref<Error>* error) {
     const ClassPlan* plan = writing.classOf(value);
     if (plan == nullptr) {
         if (!hasText(value, error))
             return false;
-        const String text = textOf(value, field.valueType);
+        const FieldText text(value, field.valueType);
         if (!writing.isLeftOut(field, value, text))
-            element.addAttribute(field.xmlName(), text);
+            writing.output().addAttribute(element, field.xmlName(), text);
         return true;
     }
     const auto child = writing.element(*plan, plan->elementName, value, error);
     if (!child)
         return false;
-    if (field.isContainer) {
-        element.addChild(child);
-        return true;
-    }
-    while (XMLNode* first = child->firstChild()) {
-        Ref<XMLNode> node(first);
-        node->detach();
-        element.addChild(std::move(node));
-    }
+    if (field.isContainer)
+        writing.output().addChild(element, child);
+    else
+        writing.output().moveChildren(child, element);
     return true;
 }
 

@@ -154,50 +154,50 @@ bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const 
 
 namespace {
 
-XMLElement& appendNew(XMLElement& parent, const String& name) {
-    auto child = XMLElement::initWithName(name);
-    XMLElement& appended = *child;
-    parent.addChild(std::move(child));
-    return appended;
+WrittenElement appendNew(ElementWriter& output, const WrittenElement& parent, const String& name) {
+    auto child = output.newElement(name, 0);
+    output.addChild(parent, child);
+    return child;
 }
 
 // Items stand in the wrapper of the location; else, when nothing says what their elements are, in a
 // wrapper of the item name; else in the element itself.
-XMLElement& elementForItems(const FieldPlan& field, XMLElement& element) {
+WrittenElement elementForItems(ElementWriter& output, const FieldPlan& field,
+                               const WrittenElement& element) {
     if (!field.location().isEmpty())
-        return appendNew(element, field.location());
+        return appendNew(output, element, field.location());
     if (!field.hasType() && !field.bindTo().isEmpty() &&
         field.bindings.front().classOfBindTo == nullptr)
-        return appendNew(element, field.bindTo());
+        return appendNew(output, element, field.bindTo());
     return element;
 }
 
 } // namespace
 
-bool writeCollection(Marshalling& writing, const FieldPlan& field, XMLElement& element,
+bool writeCollection(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
                      const Array& array, Ref<Error>* error) {
     if (array.isEmpty() && !field.isRequired)
         return true;
     if (field.hasType() && !field.hasItemType())
         return fail(error, errors::noMappingForDeclaredClass, field.mapping->type());
-    XMLElement& target = elementForItems(field, element);
+    ElementWriter& output = writing.output();
+    const WrittenElement target = elementForItems(output, field, element);
     // An item's own accessors may change the array it stands in.
     for (std::size_t i = 0; i < array.count(); ++i) {
         // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
         const Value item = array.at(i);
         if (field.typeClass == nullptr && field.hasSimpleType()) {
             if (!item.isNullOrMarker())
-                target.addChild(
-                    XMLElement::initWithName(field.xmlName(), textOf(item, field.valueType)));
+                output.addChild(target, field.xmlName(), FieldText(item, field.valueType));
             continue;
         }
         Ref<Error> problem;
-        auto child = field.typeClass != nullptr
-                         ? writing.element(*field.typeClass, field.bindTo(), item, &problem)
-                         : writing.marshallObject(item, &problem);
+        const auto child = field.typeClass != nullptr
+                               ? writing.element(*field.typeClass, field.bindTo(), item, &problem)
+                               : writing.marshallObject(item, &problem);
         if (child) {
             if (writing.isToBeWritten(item))
-                target.addChild(std::move(child));
+                output.addChild(target, child);
         } else if (error != nullptr && problem) {
             *error = std::move(problem);
             return false;

@@ -57,21 +57,21 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 }
 
 // A declared class gives the element the field's name, a class found by the value its own.
-bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
-           Ref<Error>* error) {
+bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
+           const Value& value, Ref<Error>* error) {
     const ClassPlan* plan = nullptr;
     if (!findClassToWrite(writing, field, value, plan, error))
         return false;
     if (plan != nullptr) {
         const bool isDeclared = field.valueType == ValueType::other;
-        auto child =
+        const auto child =
             writing.element(*plan, isDeclared ? field.xmlName() : plan->elementName, value, error);
         if (child)
-            element.addChild(child);
-        return child.get() != nullptr;
+            writing.output().addChild(element, child);
+        return static_cast<bool>(child);
     }
     if (field.isRequired || !value.isNullOrMarker())
-        element.addChild(XMLElement::initWithName(field.xmlName(), textOf(value, field.valueType)));
+        writing.output().addChild(element, field.xmlName(), FieldText(value, field.valueType));
     return true;
 }
 

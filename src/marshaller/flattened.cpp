@@ -25,8 +25,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 }
 
 // What is no object has an element of its own all the same.
-bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, const Value& value,
-           Ref<Error>* error) {
+bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
+           const Value& value, Ref<Error>* error) {
     const ClassPlan* plan = nullptr;
     if (!findClassToWrite(writing, field, value, plan, error))
         return false;

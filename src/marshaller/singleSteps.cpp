@@ -87,39 +87,39 @@ private:
 
 Ref<XMLElement> QXXMLMarshaller::marshallObject(const qx::Value& object, Ref<Error>* error) {
     const qx::Value held = object; // whatever the getters do to the caller's
-    return Marshalling(*this).marshallObject(held, error);
+    return Marshalling(*this).marshallObject(held, error).node;
 }
 
 Ref<XMLElement> QXXMLMarshaller::elementWithMapping(const QXXMLClassMapping& mapping,
                                                     Object& object, Ref<Error>* error) {
     const Ref<Object> held(&object);
     const PlanOfClass plan(*this, mapping);
-    return Marshalling(*this).element(*plan, (*plan).elementName, &object, error);
+    return Marshalling(*this).element(*plan, (*plan).elementName, &object, error).node;
 }
 
 bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLElement& element,
                                         Object& object, Ref<Error>* error) {
     const Ref<Object> held(&object);
-    const Ref<XMLElement> target(&element);
+    const WrittenElement target{Ref<XMLElement>(&element)};
     const PlanOfClass plan(*this, mapping);
-    return Marshalling(*this).writeFields(*plan, element, object, error);
+    return Marshalling(*this).writeFields(*plan, target, object, error);
 }
 
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
                                Ref<Error>* error) {
     const Ref<Object> held(&object);
-    const Ref<XMLElement> target(&element);
+    const WrittenElement target{Ref<XMLElement>(&element)};
     const PlanOfField plan(*this, field);
-    return Marshalling(*this).writeField(*plan, element, object, error);
+    return Marshalling(*this).writeField(*plan, target, object, error);
 }
 
 bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
                                const QXXMLFieldMapping& field, Ref<Error>* error) {
     const Ref<const qx::Array> held(&array);
-    const Ref<XMLElement> target(&element);
+    const WrittenElement target{Ref<XMLElement>(&element)};
     const PlanOfField plan(*this, field);
     Marshalling writing(*this);
-    return writeCollection(writing, *plan, element, array, error);
+    return writeCollection(writing, *plan, target, array, error);
 }
 
 Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>* error) {
@@ -264,5 +264,5 @@ bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,
 }
 
 qx::String StringValueOfObjectWithMapping(const qx::Value& value, const QXXMLFieldMapping& field) {
-    return textOf(value, FieldPlan::withoutClasses(field).valueType);
+    return FieldText(value, FieldPlan::withoutClasses(field).valueType).string();
 }

@@ -38,9 +38,9 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 }
 
 // Whatever stood in the element before goes: earlier children too.
-bool write(Marshalling&, const FieldPlan& field, XMLElement& element, const Value& value,
-           Ref<Error>*) {
-    element.setStringValue(textOf(value, field.valueType));
+bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
+           const Value& value, Ref<Error>*) {
+    writing.output().setText(element, FieldText(value, field.valueType));
     return true;
 }
 

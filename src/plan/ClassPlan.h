@@ -15,7 +15,8 @@ public:
     Key className;
     Key classNameToInstantiate;
     std::vector<FieldPlan> fields;
-    String elementName; // "map-to", null or empty where documents are given the class name
+    String elementName;  // "map-to", null or empty where documents are given the class name
+    String namelessName; // of an element that nothing else names: the class name
     // About how many names are looked up to bind the class's own fields.
     std::size_t bindingCount = 0;
     // How many fields, those of the ancestors too, may be attributes of the class's element.

@@ -48,6 +48,7 @@ void MappingPlan::fill(ClassPlan& plan) const {
     plan.className = mapping.className();
     plan.classNameToInstantiate = mapping.classNameToInstantiate();
     plan.elementName = mapping.mapTo();
+    plan.namelessName = plan.className;
     plan.fields.reserve(mapping.fields().size());
     for (const auto& field : mapping.fields()) {
         plan.fields.push_back(planFor(*field));

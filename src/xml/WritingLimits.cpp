@@ -4,12 +4,12 @@
 
 namespace qx {
 
-void WritingLimits::enterLimited(const XMLElement& element, std::size_t attributes,
+void WritingLimits::enterLimited(const XMLPlace& element, std::size_t attributes,
                                  std::size_t declarations) {
     if (++_depth > _reading->maximumDepth)
-        refuseBeyond("elements nest deeper than", _reading->maximumDepth, {element});
+        refuseBeyond("elements nest deeper than", _reading->maximumDepth, element);
     if (attributes > xmlLimits::attributes)
-        refuseBeyond("an element has more attributes than", xmlLimits::attributes, {element});
+        refuseBeyond("an element has more attributes than", xmlLimits::attributes, element);
     _textSize = 0;
     if (declarations == 0)
         return;
@@ -17,7 +17,7 @@ void WritingLimits::enterLimited(const XMLElement& element, std::size_t attribut
     _namespaces += declarations;
     if (_namespaces > xmlLimits::namespaces)
         refuseBeyond("more namespace declarations are in force than", xmlLimits::namespaces,
-                     {element});
+                     element);
 }
 
 void WritingLimits::leaveLimited() noexcept {
@@ -29,9 +29,9 @@ void WritingLimits::leaveLimited() noexcept {
     _textSize = 0;
 }
 
-void WritingLimits::requireDocument(std::size_t size, const XMLDocument& document) const {
+void WritingLimits::requireDocument(std::size_t size, const XMLPlace& document) const {
     if (_reading != nullptr && size > xmlLimits::documentSize)
-        refuseBeyond("the document is larger than", xmlLimits::documentSize, {document});
+        refuseBeyond("the document is larger than", xmlLimits::documentSize, document);
 }
 
 void WritingLimits::countName(const String& name, const XMLPlace& place) {

@@ -18,7 +18,7 @@ public:
     explicit WritingLimits(const XMLParseOptions* reading) noexcept : _reading(reading) {}
 
     // Around what an element holds.
-    void enter(const XMLElement& element, std::size_t attributes, std::size_t declarations) {
+    void enter(const XMLPlace& element, std::size_t attributes, std::size_t declarations) {
         if (_reading != nullptr)
             enterLimited(element, attributes, declarations);
     }
@@ -38,7 +38,7 @@ public:
         if (_reading != nullptr && size > _reading->maximumTextSize)
             refuseBeyond(what, _reading->maximumTextSize, place);
     }
-    void requireDocument(std::size_t size, const XMLDocument& document) const;
+    void requireDocument(std::size_t size, const XMLPlace& document) const;
     void countName(const String& name, const XMLPlace& place);
     void countURI(const String& URI, const XMLPlace& place);
 
@@ -48,7 +48,7 @@ private:
         std::size_t depth;
         std::size_t count;
     };
-    void enterLimited(const XMLElement& element, std::size_t attributes, std::size_t declarations);
+    void enterLimited(const XMLPlace& element, std::size_t attributes, std::size_t declarations);
     void leaveLimited() noexcept;
     void requireFewNames(const XMLPlace& place) const;
 

@@ -128,12 +128,9 @@ bool XMLDocument::writeToFile(const String& path, XMLOptions options, Ref<Error>
 
 bool XMLDocument::writeToStream(std::ostream& stream, XMLOptions options, Ref<Error>* error,
                                 const XMLParseOptions& reading) const {
-    withBytes(options, reading, [&](std::string_view bytes) {
-        stream.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    return withBytes(options, reading, [&](std::string_view bytes) {
+        return qx::writeToStream(stream, bytes, error);
     });
-    if (stream.flush())
-        return true;
-    return fail(error, errors::streamNotWritten);
 }
 
 String XMLDocument::stringValue() const {

@@ -42,8 +42,8 @@ std::string stepTo(const XMLNode& node) {
 // Makes the node where the element holds what it stands for.
 const XMLNode& nodeAt(const XMLPlace& place) {
     if (place.attributeName != nullptr)
-        return *place.node.asElement()->attributeForName(*place.attributeName);
-    return place.isItsText ? *place.node.firstChild() : place.node;
+        return *place.node->asElement()->attributeForName(*place.attributeName);
+    return place.isItsText ? *place.node->firstChild() : *place.node;
 }
 
 } // namespace
@@ -63,6 +63,8 @@ std::string pathOf(const XMLNode& node) {
 }
 
 void refuse(std::string_view what, const XMLPlace& place) {
+    if (place.node == nullptr)
+        throw Exception(Exception::invalidArgument, what);
     throw Exception(Exception::invalidArgument,
                     String::concat({what, " at ", pathOf(nodeAt(place))}));
 }

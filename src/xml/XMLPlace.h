@@ -9,9 +9,14 @@
 
 namespace qx {
 
-// A node, or what an element holds without a node of its own.
+// A node, or what an element holds without a node of its own. One without a node stands for
+// nowhere: in what has no nodes.
 struct XMLPlace {
-    const XMLNode& node;
+    XMLPlace() noexcept = default;
+    XMLPlace(const XMLNode& where, bool isText = false, const String* attribute = nullptr) noexcept
+        : node(&where), isItsText(isText), attributeName(attribute) {}
+
+    const XMLNode* node = nullptr;
     bool isItsText = false;
     const String* attributeName = nullptr; // of the node's attribute
 };

@@ -55,7 +55,13 @@ void XMLSerializer::write(const XMLNode& node) {
 void XMLSerializer::writeDocument(const XMLDocument& document) {
     if (isChecked() && document.rootElement() == nullptr)
         throw Exception(Exception::invalidArgument, "the document has no root element");
-    writeDeclaration(document);
+    const String& version = document.version();
+    const String& standalone = document.standalone();
+    if (isChecked() && !version.isEmpty() && !isXMLVersion(version))
+        refuse("the version is no XML version", {document});
+    if (isChecked() && !standalone.isEmpty() && standalone != "yes" && standalone != "no")
+        refuse("standalone is neither yes nor no", {document});
+    writeDeclaration(version, document.characterEncoding(), standalone);
     for (const XMLNode& node : document.children()) {
         writeTree(node);
         if (has(XMLPrettyPrint))
@@ -64,26 +70,20 @@ void XMLSerializer::writeDocument(const XMLDocument& document) {
     _limits.requireDocument(_output.size(), document);
 }
 
-void XMLSerializer::writeDeclaration(const XMLDocument& document) {
-    const String& version = document.version();
-    const String& encoding = document.characterEncoding();
-    const String& standalone = document.standalone();
-    if (version.isEmpty() && encoding.isEmpty() && standalone.isEmpty())
+void XMLSerializer::writeDeclaration(std::string_view version, std::string_view encoding,
+                                     std::string_view standalone) {
+    if (version.empty() && encoding.empty() && standalone.empty())
         return;
-    if (isChecked() && !version.isEmpty() && !isXMLVersion(version))
-        refuse("the version is no XML version", {document});
-    if (isChecked() && !standalone.isEmpty() && standalone != "yes" && standalone != "no")
-        refuse("standalone is neither yes nor no", {document});
     _output += "<?xml version=\"";
-    _output += version.isEmpty() ? std::string_view("1.0") : version.view();
+    _output += version.empty() ? "1.0" : version;
     for (const auto& [name, value] :
-         {std::pair(" encoding=", &encoding), std::pair(" standalone=", &standalone)}) {
-        if (value->isEmpty())
+         {std::pair(" encoding=", encoding), std::pair(" standalone=", standalone)}) {
+        if (value.empty())
             continue;
         _output += '"';
         _output += name;
         _output += '"';
-        _output += value->view();
+        _output += value;
     }
     _output += "\"?>";
     if (has(XMLPrettyPrint))
@@ -99,7 +99,7 @@ void XMLSerializer::writeTree(const XMLNode& top) {
             const String text = element->_value;
             _limits.requireSize(text.size(), "a text is larger than", {*element, true});
             writeEscaped(text, Where::text, isWhite(text), {*element, true});
-            endTag(*element);
+            endTag(element->name());
             _limits.leave();
         } else if (element != nullptr) {
             startElement(*element);
@@ -129,13 +129,15 @@ void XMLSerializer::startTag(const XMLElement& element) {
     std::size_t declarations = 0;
     for (const XMLNode& declaration : element.namespaces()) {
         _output += ' ';
-        writeNamespace(declaration);
+        writeNamespace(declaration.name(), declaration._value, {declaration});
         ++declarations;
     }
     std::size_t attributes = declarations;
     element.forEachAttribute([&](const String& name, const String& value) {
         _output += ' ';
-        writeAttribute(name, value, &element, {element, false, &name});
+        writeAttribute(name, value, {element, false, &name}, [&](std::string_view prefix) {
+            return element.findNode(element._firstNamespace, prefix) != nullptr;
+        });
         ++attributes;
         declarations += isDeclaration(name) ? 1 : 0;
     });
@@ -162,13 +164,15 @@ void XMLSerializer::endElement(const XMLElement& element) {
         _output += "/>";
         return;
     }
-    endTag(element);
+    endTag(element.name());
 }
 
-void XMLSerializer::endTag(const XMLElement& element) {
-    _output += "</";
-    _output += element.name().view();
-    _output += '>';
+void XMLSerializer::endTag(const String& name) {
+    char* const tag = _output.extend(name.size() + 3);
+    tag[0] = '<';
+    tag[1] = '/';
+    std::memcpy(tag + 2, name.c_str(), name.size());
+    tag[name.size() + 2] = '>';
 }
 
 void XMLSerializer::writeLeaf(const XMLNode& node) {
@@ -177,11 +181,15 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
         _limits.endText();
     switch (node.kind()) {
     case XMLNodeKind::attribute:
-        writeAttribute(node.name(), text,
-                       node.parent() != nullptr ? node.parent()->asElement() : nullptr, {node});
+        writeAttribute(node.name(), text, {node}, [&](std::string_view prefix) {
+            const XMLElement* parent =
+                node.parent() != nullptr ? node.parent()->asElement() : nullptr;
+            return parent != nullptr &&
+                   parent->findNode(parent->_firstNamespace, prefix) != nullptr;
+        });
         break;
     case XMLNodeKind::namespaceDeclaration:
-        writeNamespace(node);
+        writeNamespace(node.name(), text, {node});
         break;
     case XMLNodeKind::comment:
         if (isChecked() && (holds(text, "--") || text.view().ends_with('-')))
@@ -208,37 +216,16 @@ void XMLSerializer::writeLeaf(const XMLNode& node) {
     }
 }
 
-bool XMLSerializer::isDeclaration(const String& attribute) noexcept {
-    const std::string_view name = attribute.view();
-    return name.starts_with("xmlns") && (name.size() == 5 || name[5] == ':');
-}
-
-void XMLSerializer::writeAttribute(const String& name, const String& value,
-                                   const XMLElement* parent, const XMLPlace& place) {
-    _limits.requireSize(value.size(), "an attribute's value is larger than", place);
-    if (isChecked() && isDeclaration(name)) {
-        const String prefix = name.view().substr(std::min<std::size_t>(name.size(), 6));
-        if (parent != nullptr && parent->findNode(parent->_firstNamespace, prefix) != nullptr)
-            refuse("a namespace is declared twice", place);
-        _limits.countURI(value, place);
-    }
-    writeName(name, place);
-    _output += "=\"";
-    writeEscaped(value, Where::attribute, true, place);
-    _output += '"';
-}
-
-void XMLSerializer::writeNamespace(const XMLNode& declaration) {
+void XMLSerializer::writeNamespace(const String& prefix, const String& URI, const XMLPlace& place) {
     _output += "xmlns";
-    if (!declaration.name().isEmpty()) {
+    if (!prefix.isEmpty()) {
         _output += ':';
-        writeName(declaration.name(), {declaration});
+        writeName(prefix, place);
     }
     _output += "=\"";
-    _limits.requireSize(declaration._value.size(), "a namespace's URI is larger than",
-                        {declaration});
-    _limits.countURI(declaration._value, {declaration});
-    writeEscaped(declaration._value, Where::attribute, true, {declaration});
+    _limits.requireSize(URI.size(), "a namespace's URI is larger than", place);
+    _limits.countURI(URI, place);
+    writeEscaped(URI, Where::attribute, true, place);
     _output += '"';
 }
 
@@ -302,7 +289,8 @@ void XMLSerializer::writeLiteral(std::string_view text, const XMLPlace& place) {
 
 void XMLSerializer::writeName(const String& name, const XMLPlace& place) {
     const char* const address = name.view().data();
-    const char*& checked = _checked[reinterpret_cast<std::uintptr_t>(address) / 16 % nameSlots];
+    const auto number = reinterpret_cast<std::uintptr_t>(address) / 16;
+    const char*& checked = _checked[(number ^ number / nameSlots) % nameSlots];
     if (isChecked() && (checked != address || address == nullptr)) {
         checkName(name, place);
         checked = address;
@@ -332,7 +320,7 @@ void XMLSerializer::breakLine(std::size_t depth) {
 }
 
 XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {
-    Level level = _levels.empty() ? Level{false, false} : _levels.back();
+    Level level = enclosingLevel();
     element.forEachAttribute([&](const String& name, const String& value) {
         if (name == "xml:space")
             level.preserves = value == "preserve";

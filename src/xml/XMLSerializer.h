@@ -10,7 +10,9 @@
 
 #include "base/TextBuffer.h"
 #include "xml/WritingLimits.h"
+#include "xml/XMLDraft.h"
 
+#include <algorithm>
 #include <array>
 #include <string>
 #include <vector>
@@ -30,6 +32,9 @@ public:
     }
 
     void write(const XMLNode& node);
+    // The draft as a document of version "1.0" and encoding "UTF-8". What it raises names no place.
+    // XMLSerializerDraft.cpp.
+    void write(const XMLDraft::Element& root);
 
 private:
     // How the children of an open element are laid out.
@@ -41,16 +46,18 @@ private:
     enum class Where { text, attribute };
 
     void writeDocument(const XMLDocument& document);
-    void writeDeclaration(const XMLDocument& document);
+    void writeDeclaration(std::string_view version, std::string_view encoding,
+                          std::string_view standalone);
     void writeTree(const XMLNode& top);
     void writeLeaf(const XMLNode& node);
     void startElement(const XMLElement& element);
     void endElement(const XMLElement& element);
     void startTag(const XMLElement& element);
-    void endTag(const XMLElement& element);
-    void writeAttribute(const String& name, const String& value, const XMLElement* parent,
-                        const XMLPlace& place);
-    void writeNamespace(const XMLNode& declaration);
+    // declares(prefix) tells whether the element declares that prefix besides.
+    template <class Declares>
+    void writeAttribute(const String& name, std::string_view value, const XMLPlace& place,
+                        Declares declares);
+    void writeNamespace(const String& prefix, const String& URI, const XMLPlace& place);
     void writeText(const XMLNode& text);
     void writeEscaped(std::string_view text, Where where, bool escapesBreaks,
                       const XMLPlace& place);
@@ -63,11 +70,23 @@ private:
     // Of a pretty-printed document.
     void startLine(const XMLNode& child);
     void breakLine(std::size_t depth);
+    Level enclosingLevel() const { return _levels.empty() ? Level{false, false} : _levels.back(); }
     Level levelOf(const XMLElement& element) const;
 
     bool has(XMLOptions option) const noexcept { return (_options & option) != 0; }
     bool isChecked() const noexcept { return _checks == XMLChecks::on; }
-    static bool isDeclaration(const String& attribute) noexcept;
+    static bool isDeclaration(const String& attribute) noexcept {
+        const std::string_view name = attribute.view();
+        return name.starts_with("xmlns") && (name.size() == 5 || name[5] == ':');
+    }
+
+    // Of a draft.
+    struct DraftTag;
+    void writeElement(const XMLDraft::Element& element);
+    DraftTag startTag(const XMLDraft::Element& element);
+    void writeChildren(const XMLDraft::Element& element);
+    void writeLeaf(const XMLDraft::Node& leaf);
+    void endTag(const String& name);
 
     TextBuffer& _output;
     XMLOptions _options;
@@ -78,10 +97,31 @@ private:
 
     // A direct-mapped cache of names that were checked and counted, by their address: the tree that
     // is written holds them. A new name evicts the one in its slot.
-    static constexpr std::size_t nameSlots = 64;
+    static constexpr std::size_t nameSlots = 256;
     std::array<const char*, nameSlots> _checked{};
 
     WritingLimits _limits;
 };
+
+// Writes the draft like such a document, into an empty buffer. What cannot be written raises
+// NSInvalidArgumentException that names the place: what is kept may then have moved into nodes that
+// are gone.
+void writeDraft(const XMLDraft::Element& root, XMLOptions options, const XMLParseOptions& reading,
+                TextBuffer& output);
+
+template <class Declares>
+void XMLSerializer::writeAttribute(const String& name, std::string_view value,
+                                   const XMLPlace& place, Declares declares) {
+    _limits.requireSize(value.size(), "an attribute's value is larger than", place);
+    if (isChecked() && isDeclaration(name)) {
+        if (declares(name.view().substr(std::min<std::size_t>(name.size(), 6))))
+            refuse("a namespace is declared twice", place);
+        _limits.countURI(String(value), place);
+    }
+    writeName(name, place);
+    _output += "=\"";
+    writeEscaped(value, Where::attribute, true, place);
+    _output += '"';
+}
 
 } // namespace qx

@@ -107,7 +107,10 @@ struct Result {
     std::string object, written, error = "no error\n", errorWithoutReason;
 };
 
-// What comes of a case. A document is read as a text, or as a tree.
+constexpr const char* declaration = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n";
+
+// What comes of a case. A document is read as a text, or as a tree. What is written is a tree, and
+// the same as a text without one.
 inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool isTree) {
     const auto& [kind, text, options, given] = expectation;
     Result result;
@@ -130,6 +133,12 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
         const auto element = error ? nullptr : marshaller->marshallObject(object, &error);
         EXPECT_FALSE(element && error) << "both an element and an error";
         result.written = element ? element->XMLString(qx::XMLPrettyPrint).str() + "\n" : "";
+        qx::Ref<qx::Error> problem;
+        const qx::String text =
+            object.isNull() ? qx::String() : marshaller->writeString(object, &problem);
+        EXPECT_EQ(text.str(), element ? std::string(declaration) + result.written : "")
+            << "written without a tree: " << support::told(problem);
+        EXPECT_TRUE(element || object.isNull() || support::told(problem) == support::told(error));
     }
     if (error) {
         result.error = support::told(error) + "\n";

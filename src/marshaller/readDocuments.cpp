@@ -1,17 +1,17 @@
-// Reading objects from files, texts and streams, and writing them.
+// Reading objects from files, texts, streams and documents: new ones, one after another, or into
+// those that are there.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/model/Class.h>
 
 #include "files/Files.h"
+#include "marshaller/DocumentParsing.h"
 #include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
 #include "model/TypeNames.h"
 #include "xml/XMLPieces.h"
-
-#include <algorithm>
 
 using qx::Error;
 using qx::Ref;
@@ -22,19 +22,9 @@ using qx::detail::MappingPlan;
 
 namespace {
 
-constexpr qx::XMLOptions layout = qx::XMLPrettyPrint;
-
 void reset(Ref<Error>* error) {
     if (error != nullptr)
         error->reset();
-}
-
-// What is written is meant to be read by such a marshaller, too.
-qx::XMLParseOptions parsingOf(const QXXMLMarshaller& marshaller) {
-    qx::XMLParseOptions options = marshaller.parseOptions();
-    // An object may stand in a wrapper, and hold a last element with text.
-    options.maximumDepth = std::max(options.maximumDepth, 2 * marshaller.maximumDepth() + 1);
-    return options;
 }
 
 // Whether objects of the class may be of the C++ type, as far as that is known beforehand: a type
@@ -95,7 +85,8 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parse
 // Null for no data.
 qx::XMLParser::Parsed parsed(const QXXMLMarshaller& marshaller, Ref<qx::Data> data,
                              Ref<Error>* error) {
-    return data ? qx::XMLParser::parse(std::move(data), parsingOf(marshaller), error) : nullptr;
+    return data ? qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error)
+                : nullptr;
 }
 
 // What the reading of the new object does is no change of the one that is there.
@@ -163,16 +154,6 @@ bool fill(QXXMLMarshaller& marshaller, qx::Object& object, const qx::XMLParser::
     return fill(marshaller, object, document, error);
 }
 
-// What no XML document can hold, or none that could be read again, raises while it is written.
-template <class Result, class Write>
-Result written(Write write, Ref<Error>* error) {
-    try {
-        return write();
-    } catch (const qx::Exception& exception) {
-        return qx::fail(error, qx::errors::textCannotBeWritten, exception.reason());
-    }
-}
-
 } // namespace
 
 Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, const std::type_info& type,
@@ -192,7 +173,8 @@ Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, qx::XMLParser::parseCopy(xml, parsingOf(*this), error), type, error);
+    return objectOf(*this, qx::XMLParser::parseCopy(xml, qx::detail::parsingOf(*this), error), type,
+                    error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
@@ -242,7 +224,7 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
     const auto match = qx::detail::NamespaceMatching::of(*this) != nullptr
                            ? qx::XMLSplitter::Match::localNames
                            : qx::XMLSplitter::Match::names;
-    qx::XMLPieces pieces(source, elementName, match, parsingOf(*this));
+    qx::XMLPieces pieces(source, elementName, match, qx::detail::parsingOf(*this));
     qx::detail::ReadingProgress progress(*this, source.size());
     while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
         if (!progress.mayPass(pieces.bytesRead(), &failure))
@@ -266,8 +248,8 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
 
 bool QXXMLMarshaller::readBytesInto(qx::Object* object, qx::XMLBytes xml, Ref<Error>* error) {
     reset(error);
-    return fill(*this, present(object), qx::XMLParser::parseCopy(xml, parsingOf(*this), error),
-                error);
+    return fill(*this, present(object),
+                qx::XMLParser::parseCopy(xml, qx::detail::parsingOf(*this), error), error);
 }
 
 bool QXXMLMarshaller::readFileInto(qx::Object* object, const String& path, Ref<Error>* error) {
@@ -286,30 +268,4 @@ bool QXXMLMarshaller::readTreeInto(qx::Object* object, XMLDocument* document, Re
         return qx::fail(error, qx::errors::noDefinitionForElement, document);
     qx::IndexedXML read(*document);
     return fill(*this, present(object), read, error);
-}
-
-String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error) {
-    reset(error);
-    const auto options = parsingOf(*this); // the getters may let go of the marshaller
-    const auto document = marshall(object, error);
-    if (!document)
-        return nullptr;
-    return written<String>([&] { return document->XMLString(layout, options); }, error);
-}
-
-bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error) {
-    reset(error);
-    const auto options = parsingOf(*this); // the getters may let go of the marshaller
-    const auto document = marshall(object, error);
-    const auto write = [&] { return document->writeToFile(path, layout, error, options); };
-    return document && written<bool>(write, error);
-}
-
-bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
-                                  Ref<Error>* error) {
-    reset(error);
-    const auto options = parsingOf(*this);
-    const auto document = marshall(object, error);
-    const auto write = [&] { return document->writeToStream(stream, layout, error, options); };
-    return document && written<bool>(write, error);
 }

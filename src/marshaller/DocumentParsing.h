@@ -1,0 +1,18 @@
+#pragma once
+
+// How a marshaller parses a document. What it writes is meant to be read so, too.
+
+#include <QXXMLMarshalling/QXXMLMarshaller.h>
+
+#include <algorithm>
+
+namespace qx::detail {
+
+inline XMLParseOptions parsingOf(const QXXMLMarshaller& marshaller) {
+    XMLParseOptions options = marshaller.parseOptions();
+    // An object may stand in a wrapper, and hold a last element with text.
+    options.maximumDepth = std::max(options.maximumDepth, 2 * marshaller.maximumDepth() + 1);
+    return options;
+}
+
+} // namespace qx::detail
