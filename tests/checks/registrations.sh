@@ -25,14 +25,15 @@ run() {
     [[ $(family "$1") == clang++ ]] || flags+=(-fno-gnu-unique)
     if [[ $(cached QX_SANITIZE) == ON ]]; then
         if [[ $1 == "$own" ]]; then
-            flags+=(-fsanitize=address,undefined)
+            # A call through a pointer to a base's member is taken for one on another object.
+            flags+=(-fsanitize=address,undefined -fno-sanitize=vptr)
         else
             preload=$("$own" -print-file-name=libasan.so)
             [[ -e $preload ]] || return 0
         fi
     fi
     local library=(-L"$build/lib" -lQXXMLMarshalling "-Wl,-rpath,$build/lib" -Wl,--allow-shlib-undefined)
-    "$1" "${flags[@]}" -shared "$source/tests/checks/registrations-plug-in.cpp" -o plug-in.so "${library[@]}"
+    "$1" "${flags[@]}" -shared -DPLUG_IN "$source/tests/checks/registrations.cpp" -o plug-in.so "${library[@]}"
     "$1" "${flags[@]}" "$source/tests/checks/registrations.cpp" -o registrations "${library[@]}" -ldl
     LD_PRELOAD=$preload ASAN_OPTIONS=detect_leaks=0 ./registrations ./plug-in.so 2>log || {
         echo "with $1:" >&2

@@ -200,6 +200,16 @@ TEST_F(StructMembers, AreOfEveryType) {
     ASSERT_TRUE(again) << errorOf(again);
     EXPECT_EQ(again->tree, read->tree);
     EXPECT_EQ(marshaller->marshall(*again)->rootElement()->XMLString().view(), everything());
+    Everything reloaded;
+    for (const std::string& text :
+         {everything(), everything(), std::string("<everything/>"), everything()}) {
+        ASSERT_TRUE(marshaller->readStringInto(reloaded, text, &error))
+            << support::told(error) << text;
+        EXPECT_EQ(marshaller->marshall(reloaded)->rootElement()->XMLString(),
+                  marshaller->marshall(*marshaller->readString<Everything>(text))
+                      ->rootElement()
+                      ->XMLString());
+    }
 }
 
 // Kinds of text that members do not take, with the whole message each.

@@ -94,7 +94,7 @@ struct MemberTakeOver<std::variant<T...>> {
     using Variant = std::variant<T...>;
     static void apply(Variant& held, Variant& fresh, TakeOver& way) {
         [&]<std::size_t... I>(std::index_sequence<I...>) {
-            ((fresh.index() == I && (applyOne<I>(held, fresh, way), true)) || ...);
+            ((fresh.index() == I ? applyOne<I>(held, fresh, way) : void()), ...);
         }
         (std::index_sequence_for<T...>{});
     }
