@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
+#include "marshaller/NamespaceMatching.h"
 #include "model/Errors.h"
 
 #include <algorithm>
@@ -11,7 +12,26 @@
 namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller)
-    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())) {}
+    : _marshaller(&marshaller), _plan(MappingPlan::of(marshaller.mapping())) {
+    if (auto table = NamespaceMatching::keptOf(marshaller);
+        table != nullptr && marshaller.isUsingNamespaceURIs())
+        _names = std::make_unique<OutputNames>(std::move(table));
+}
+
+Marshalling::Marshalling(const QXXMLMarshaller& marshaller, const XMLElement& inside)
+    : Marshalling(marshaller) {
+    if (!_names)
+        return;
+    std::vector<const XMLElement*> around;
+    const XMLNode* node = &inside;
+    for (; node != nullptr && node->isElement(); node = node->parent())
+        around.push_back(node->asElement());
+    std::vector<OutputNames::Declaration> declarations;
+    for (const XMLElement* element : around)
+        for (const XMLNode& declaration : element->namespaces())
+            declarations.push_back({declaration.name(), declaration.stringValue()});
+    _names->enter(declarations);
+}
 
 const ClassPlan* Marshalling::classOf(const Value& value) const {
     return value.isObject() ? _plan.classNamed(value.classNameForMarshalling()) : nullptr;
@@ -32,14 +52,62 @@ Ref<XMLElement> Marshalling::element(const ClassPlan& plan, const String& name, 
                                      ErrorSlot error) {
     if (!object.isObject())
         return fail(error, errors::noMappingDefinition, object.classNameForMarshalling());
-    auto element = XMLElement::initForAttributes(name.isEmpty() ? plan.className.string() : name,
-                                                 plan.attributeCount);
+    const Opened opened(*this, declarationsOf(plan, *object.object()));
+    auto element = newElement(name.isEmpty() ? plan.className.string() : name, plan.attributeCount);
     const QXXMLClassMapping& mapping = *plan.mapping;
     if (_marshaller->isUsingNamespaceURIs() && !mapping.nsURI().isEmpty()) {
         const String prefix = mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix();
         element->addNamespace(XMLNode::namespaceWithName(prefix, mapping.nsURI()));
     }
     return writeFields(plan, *element, *object.object(), error) ? element : nullptr;
+}
+
+// Its declarations and attributes go with it. What was declared for its attributes counts as
+// declared outside: so it is.
+Ref<XMLElement> Marshalling::shell(const ClassPlan& plan, XMLElement& target, const Value& object,
+                                   ErrorSlot error) {
+    if (!_names)
+        return element(plan, plan.elementName, object, error);
+    auto shell = XMLElement::initWithName(plan.className.string());
+    if (!writeFields(plan, *shell, *object.object(), error))
+        return nullptr;
+    for (const auto& [prefix, URI] : _names->added())
+        target.addNamespace(XMLNode::namespaceWithName(prefix, URI));
+    return shell;
+}
+
+Ref<XMLElement> Marshalling::newElement(const String& name, std::size_t attributes) {
+    if (!_names)
+        return XMLElement::initForAttributes(name, attributes);
+    const OutputNames::Name written = _names->elementName(name);
+    auto element = XMLElement::initForAttributes(written.text, attributes);
+    if (written.declaration) {
+        const auto& [prefix, URI] = *written.declaration;
+        element->addNamespace(XMLNode::namespaceWithName(prefix, URI));
+        _names->declare(*written.declaration);
+    }
+    return element;
+}
+
+Ref<XMLElement> Marshalling::textElement(const String& name, const String& text) {
+    if (!_names)
+        return XMLElement::initWithName(name, text);
+    const Opened opened(*this);
+    auto element = newElement(name, 0);
+    element->setStringValue(text);
+    return element;
+}
+
+void Marshalling::addAttribute(XMLElement& element, const String& name, const String& text) {
+    if (!_names)
+        return element.addAttribute(name, text);
+    const OutputNames::Name written = _names->attributeName(name);
+    if (written.declaration) {
+        const auto& [prefix, URI] = *written.declaration;
+        element.addNamespace(XMLNode::namespaceWithName(prefix, URI));
+        _names->declare(*written.declaration);
+    }
+    element.addAttribute(written.text, text);
 }
 
 // A class that is self-first writes its fields before its ancestors', any other after them. Kept
@@ -90,7 +158,8 @@ bool Marshalling::writeOwnFields(const ClassPlan& plan, XMLElement& element, Obj
     return true;
 }
 
-XMLElement* Marshalling::lastChildNamed(const XMLElement& element, const String& name) {
+XMLElement* Marshalling::lastChildNamed(const XMLElement& element, const String& mapped) {
+    const String& name = _names ? _names->elementName(mapped).text : mapped;
     // Up to so many, looking through the children costs no more than an index of them.
     constexpr std::size_t mostScanned = 64;
     if (element.childCount() > mostScanned)
@@ -137,7 +206,26 @@ void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
                 element.addAttribute(std::move(attribute));
 }
 
-// The declarations that were read take the place of the class mapping's own.
+// Those that will stand on the object's element.
+std::vector<OutputNames::Declaration> Marshalling::declarationsOf(const ClassPlan& plan,
+                                                                  const Object& object) {
+    std::vector<OutputNames::Declaration> declarations;
+    if (!_names)
+        return declarations;
+    if (const auto kept = _access.getKept(object, KeptXML::namespaces).as<Array>())
+        for (const Value& value : *kept)
+            if (const auto declaration = value.as<XMLNode>();
+                declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
+                declarations.push_back({declaration->name(), declaration->stringValue()});
+    const QXXMLClassMapping& mapping = *plan.mapping;
+    if (declarations.empty() && !mapping.nsURI().isEmpty())
+        declarations.push_back(
+            {mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix(), mapping.nsURI()});
+    return declarations;
+}
+
+// The declarations that were read take the place of the class mapping's own; those that names need
+// beside them stay.
 void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) {
     const auto kept = _access.getKept(object, KeptXML::namespaces).as<Array>();
     if (!kept || kept->isEmpty() || !_marshaller->isUsingNamespaceURIs())
@@ -148,6 +236,9 @@ void Marshalling::restoreNamespaces(XMLElement& element, const Object& object) {
         if (declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
             copies.push_back(declaration->copy());
     }
+    if (_names)
+        for (const auto& [prefix, URI] : _names->added())
+            copies.push_back(XMLNode::namespaceWithName(prefix, URI));
     element.setNamespaces(copies);
 }
 

@@ -42,15 +42,18 @@ bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, co
     const String text = textOf(value, field.valueType);
     if (writing.isLeftOut(field, value, text))
         return true;
-    XMLElement* const target =
-        field.location().isEmpty() ? &element : writing.lastChildNamed(element, field.location());
-    if (target != nullptr) {
-        target->addAttribute(field.xmlName(), text);
-    } else {
-        auto wrapper = XMLElement::initForAttributes(field.location(), 1);
-        wrapper->addAttribute(field.xmlName(), text);
+    if (field.location().isEmpty()) {
+        writing.addAttribute(element, field.xmlName(), text);
+        return true;
+    }
+    XMLElement* target = writing.lastChildNamed(element, field.location());
+    const Marshalling::Opened opened(writing);
+    if (target == nullptr) {
+        auto wrapper = writing.newElement(field.location(), 1);
+        target = wrapper.get();
         element.addChild(std::move(wrapper));
     }
+    writing.addAttribute(*target, field.xmlName(), text);
     return true;
 }
 

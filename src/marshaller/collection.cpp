@@ -154,8 +154,8 @@ bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const 
 
 namespace {
 
-XMLElement& appendNew(XMLElement& parent, const String& name) {
-    auto child = XMLElement::initWithName(name);
+XMLElement& appendNew(Marshalling& writing, XMLElement& parent, const String& name) {
+    auto child = writing.newElement(name, 0);
     XMLElement& appended = *child;
     parent.addChild(std::move(child));
     return appended;
@@ -163,12 +163,12 @@ XMLElement& appendNew(XMLElement& parent, const String& name) {
 
 // Items stand in the wrapper of the location; else, when nothing says what their elements are, in a
 // wrapper of the item name; else in the element itself.
-XMLElement& elementForItems(const FieldPlan& field, XMLElement& element) {
+XMLElement& elementForItems(Marshalling& writing, const FieldPlan& field, XMLElement& element) {
     if (!field.location().isEmpty())
-        return appendNew(element, field.location());
+        return appendNew(writing, element, field.location());
     if (!field.hasType() && !field.bindTo().isEmpty() &&
         field.bindings.front().classOfBindTo == nullptr)
-        return appendNew(element, field.bindTo());
+        return appendNew(writing, element, field.bindTo());
     return element;
 }
 
@@ -180,7 +180,8 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, XMLElement& e
         return true;
     if (field.hasType() && !field.hasItemType())
         return fail(error, errors::noMappingForDeclaredClass, field.mapping->type());
-    XMLElement& target = elementForItems(field, element);
+    const Marshalling::Opened opened(writing);
+    XMLElement& target = elementForItems(writing, field, element);
     // An item's own accessors may change the array it stands in.
     for (std::size_t i = 0; i < array.count(); ++i) {
         // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
@@ -188,7 +189,7 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, XMLElement& e
         if (field.typeClass == nullptr && field.hasSimpleType()) {
             if (!item.isNullOrMarker())
                 target.addChild(
-                    XMLElement::initWithName(field.xmlName(), textOf(item, field.valueType)));
+                    writing.textElement(field.xmlName(), textOf(item, field.valueType)));
             continue;
         }
         Ref<Error> problem;

@@ -71,7 +71,7 @@ bool write(Marshalling& writing, const FieldPlan& field, XMLElement& element, co
         return child.get() != nullptr;
     }
     if (field.isRequired || !value.isNullOrMarker())
-        element.addChild(XMLElement::initWithName(field.xmlName(), textOf(value, field.valueType)));
+        element.addChild(writing.textElement(field.xmlName(), textOf(value, field.valueType)));
     return true;
 }
 

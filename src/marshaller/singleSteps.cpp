@@ -102,7 +102,9 @@ bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLEle
     const Ref<Object> held(&object);
     const Ref<XMLElement> target(&element);
     const PlanOfClass plan(*this, mapping);
-    return Marshalling(*this).writeFields(*plan, element, object, error);
+    Marshalling writing(*this, element);
+    const Marshalling::Opened opened(writing, writing.declarationsOf(*plan, object));
+    return writing.writeFields(*plan, element, object, error);
 }
 
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
@@ -110,7 +112,7 @@ bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& eleme
     const Ref<Object> held(&object);
     const Ref<XMLElement> target(&element);
     const PlanOfField plan(*this, field);
-    return Marshalling(*this).writeField(*plan, element, object, error);
+    return Marshalling(*this, element).writeField(*plan, element, object, error);
 }
 
 bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
@@ -118,7 +120,7 @@ bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
     const Ref<const qx::Array> held(&array);
     const Ref<XMLElement> target(&element);
     const PlanOfField plan(*this, field);
-    Marshalling writing(*this);
+    Marshalling writing(*this, element);
     return writeCollection(writing, *plan, element, array, error);
 }
 

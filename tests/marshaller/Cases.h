@@ -3,6 +3,7 @@
 // What the blocks of a page say of a marshaller (see support/Cases.h for pages):
 //
 //     xml mapping      a <mapping>, or the classes in one
+//     text prefixes    the table of namespaces, one PREFIX=URI a line
 //     xml document     what is read, and of what comes is written again
 //     text given       an object, shown as the next, that is written; nothing is read then
 //     text object      what reading gives
@@ -10,9 +11,9 @@
 //     text error       "CODE: message (reason)" of the mapping, of reading or of writing; the
 //                      reason may be left out
 //
-// Options are "strict", "discard" and "no-namespaces". Each case runs on records, on host classes
-// and on plain structs; where they differ, a block says for which it is: "records", "hosts",
-// "structs".
+// Options are "strict", "discard", "no-namespaces" and "by-namespace" (of the class mappings). Each
+// case runs on records, on host classes and on plain structs; where they differ, a block says for
+// which it is: "records", "hosts", "structs".
 
 #include "ObjectKinds.h"
 #include "support/Cases.h"
@@ -25,6 +26,7 @@
 
 #include <algorithm>
 #include <charconv>
+#include <sstream>
 
 namespace cases {
 
@@ -91,12 +93,24 @@ struct Result {
     std::string object, written, error = "no error\n", errorWithoutReason;
 };
 
+inline QXXMLMarshaller::NamespacePrefixes
+prefixesOf(const std::map<std::string, std::string>& given) {
+    const auto text = given.find("prefixes");
+    std::istringstream lines(text != given.end() ? text->second : "");
+    QXXMLMarshaller::NamespacePrefixes prefixes;
+    for (std::string prefix, URI; std::getline(lines, prefix, '=') && std::getline(lines, URI);)
+        prefixes.emplace(URI, prefix);
+    return prefixes;
+}
+
 // What comes of a case. A document is read as a text, or as a tree.
 inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool isTree) {
     const auto& [kind, text, options, given] = expectation;
     Result result;
     qx::Ref<qx::Error> error;
-    if (const auto marshaller = QXXMLMarshaller::initWithMappingXML(&mapping, &error)) {
+    const auto marshaller = QXXMLMarshaller::initWithMappingXML(&mapping, &error);
+    if (marshaller && marshaller->setNamespacePrefixes(prefixesOf(given), &error) &&
+        marshaller->setMatchesNamespaces(options.contains("by-namespace"), &error)) {
         marshaller->setLenient(!options.contains("strict"));
         marshaller->setSaveUnknownXML(!options.contains("discard"));
         marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
@@ -123,7 +137,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
-    static const support::Words known = {"strict",  "discard", "no-namespaces",
+    static const support::Words known = {"strict",  "discard", "no-namespaces", "by-namespace",
                                          "records", "hosts",   "structs"};
     for (const std::string& option : expectation.options)
         EXPECT_TRUE(known.contains(option)) << option << " is no option";
@@ -151,8 +165,8 @@ inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
 }
 
 inline bool addPage(const std::string& page, std::vector<kinds::Kind> on) {
-    return support::addCases(page, {"mapping", "document", "given"}, {"object", "written", "error"},
-                             [=](const Expectation& expectation) {
+    return support::addCases(page, {"mapping", "prefixes", "document", "given"},
+                             {"object", "written", "error"}, [=](const Expectation& expectation) {
                                  for (const kinds::Kind kind : on)
                                      checkOn(kind, expectation);
                              });
