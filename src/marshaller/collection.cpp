@@ -18,6 +18,7 @@ using Target = Unmarshalling::Target;
 struct Items {
     std::vector<Unmarshalling::Number> nodes;
     bool areCounted = false; // as a whole, by their bind name or their wrapper's
+    Unmarshalling::Number wrapper = Unmarshalling::none;
 };
 
 // The wrapper's children. False where they are more than may be gone over.
@@ -25,6 +26,7 @@ bool takeChildren(Unmarshalling& reading, Unmarshalling::Number wrapper, Items& 
                   Ref<Error>* error) {
     reading.document().forEachChild(
         wrapper, [&](Unmarshalling::Number child) { items.nodes.push_back(child); });
+    items.wrapper = items.nodes.empty() ? Unmarshalling::none : wrapper;
     return reading.budget().takeVisits(items.nodes.size(), wrapper, error);
 }
 
@@ -76,6 +78,7 @@ bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Targe
                 if (!reading.budget().takeVisits(wrapper->childCount(), found.first, error))
                     return false;
                 items.areCounted = true;
+                items.wrapper = found.first;
                 target.bound.fields.add(binding.location);
             }
         }
@@ -99,7 +102,9 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
     auto array = qx::make<Array>();
     array->reserve(std::min(items.nodes.size(), usualSize));
     for (const auto node : items.nodes) {
+        reading.setWrapper(items.wrapper);
         const Value item = make(node);
+        reading.setWrapper(Unmarshalling::none);
         if ((error != nullptr && *error) || reading.budget().isSpent())
             return false;
         if (item.isNull())
