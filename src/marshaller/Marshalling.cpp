@@ -206,9 +206,7 @@ void Marshalling::restoreUnknownXML(XMLElement& element, const Object& object) {
                 element.addAttribute(std::move(attribute));
 }
 
-// Those that will stand on the object's element.
-std::vector<OutputNames::Declaration> Marshalling::declarationsOf(const ClassPlan& plan,
-                                                                  const Object& object) {
+std::vector<OutputNames::Declaration> Marshalling::keptDeclarations(const Object& object) {
     std::vector<OutputNames::Declaration> declarations;
     if (!_names)
         return declarations;
@@ -217,8 +215,14 @@ std::vector<OutputNames::Declaration> Marshalling::declarationsOf(const ClassPla
             if (const auto declaration = value.as<XMLNode>();
                 declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
                 declarations.push_back({declaration->name(), declaration->stringValue()});
+    return declarations;
+}
+
+std::vector<OutputNames::Declaration> Marshalling::declarationsOf(const ClassPlan& plan,
+                                                                  const Object& object) {
+    auto declarations = keptDeclarations(object);
     const QXXMLClassMapping& mapping = *plan.mapping;
-    if (declarations.empty() && !mapping.nsURI().isEmpty())
+    if (_names && declarations.empty() && !mapping.nsURI().isEmpty())
         declarations.push_back(
             {mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix(), mapping.nsURI()});
     return declarations;

@@ -55,9 +55,9 @@ public:
     private:
         OutputNames* const _names;
     };
-    // What the element of the object declares; nothing where that does not matter for names.
-    std::vector<OutputNames::Declaration> declarationsOf(const ClassPlan& plan,
-                                                         const Object& object);
+    // What an object's element will declare of what was read; nothing where that does not matter
+    // for names.
+    std::vector<OutputNames::Declaration> keptDeclarations(const Object& object);
     // The element that is open; names are those of the mapping.
     Ref<XMLElement> newElement(const String& name, std::size_t attributes);
     Ref<XMLElement> textElement(const String& name, const String& text);
@@ -77,6 +77,9 @@ public:
 private:
     bool writeOwnFields(const ClassPlan& plan, XMLElement& element, Object& object,
                         ErrorSlot error);
+    // The same, or else what its class declares.
+    std::vector<OutputNames::Declaration> declarationsOf(const ClassPlan& plan,
+                                                         const Object& object);
     void restoreUnknownXML(XMLElement& element, const Object& object);
     void restoreNamespaces(XMLElement& element, const Object& object);
 

@@ -103,7 +103,7 @@ bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLEle
     const Ref<XMLElement> target(&element);
     const PlanOfClass plan(*this, mapping);
     Marshalling writing(*this, element);
-    const Marshalling::Opened opened(writing, writing.declarationsOf(*plan, object));
+    const Marshalling::Opened opened(writing, writing.keptDeclarations(object));
     return writing.writeFields(*plan, element, object, error);
 }
 
