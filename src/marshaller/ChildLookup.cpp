@@ -142,11 +142,11 @@ Ref<XMLNode> ChildLookup::keepElement(Number child, ReadingBudget& budget,
 
 // Of an element's attributes the objects flattened into it keep the same copies: these count once,
 // when they are made.
-Ref<XMLNode> ChildLookup::keepAttribute(Number attribute, ReadingBudget& budget,
+Ref<XMLNode> ChildLookup::keepAttribute(Number attribute, Number holder, ReadingBudget& budget,
                                         ReadingBudget::ErrorSlot error) const {
     const bool counts = _nodes == Nodes::own || !_document.isMade(_nodes, attribute);
     return budget.takeKept(counts ? 1 : 0, _element, error)
-               ? _document.attribute(_nodes, _element, attribute)
+               ? _document.attribute(_nodes, holder, attribute)
                : nullptr;
 }
 

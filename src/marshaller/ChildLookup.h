@@ -70,7 +70,8 @@ public:
     // The nodes as an object may keep them; null with -224 when that is more than the budget has.
     Ref<XMLNode> keepElement(Number child, ReadingBudget& budget,
                              ReadingBudget::ErrorSlot error) const;
-    Ref<XMLNode> keepAttribute(Number attribute, ReadingBudget& budget,
+    // Of the element, or of the one around it that holds the attribute.
+    Ref<XMLNode> keepAttribute(Number attribute, Number holder, ReadingBudget& budget,
                                ReadingBudget::ErrorSlot error) const;
 
 private:

@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
+#include "marshaller/NamespaceMatching.h"
 #include "model/Errors.h"
 
 #include <algorithm>
@@ -12,7 +13,26 @@ namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()),
-      _plan(MappingPlan::of(_mapping.get())), _output(draft) {}
+      _plan(MappingPlan::of(_mapping.get())), _output(draft) {
+    if (auto table = NamespaceMatching::keptOf(marshaller);
+        table != nullptr && marshaller.isUsingNamespaceURIs())
+        _names = std::make_unique<OutputNames>(std::move(table));
+}
+
+Marshalling::Marshalling(const QXXMLMarshaller& marshaller, const XMLElement& inside)
+    : Marshalling(marshaller) {
+    if (!_names)
+        return;
+    std::vector<const XMLElement*> around;
+    const XMLNode* node = &inside;
+    for (; node != nullptr && node->isElement(); node = node->parent())
+        around.push_back(node->asElement());
+    std::vector<OutputNames::Declaration> declarations;
+    for (const XMLElement* element : around)
+        for (const XMLNode& declaration : element->namespaces())
+            declarations.push_back({declaration.name(), declaration.stringValue()});
+    _names->enter(declarations);
+}
 
 const ClassPlan* Marshalling::classOf(const Value& value) const {
     return value.isObject() ? _plan.classNamed(value.classNameForMarshalling()) : nullptr;
@@ -34,8 +54,8 @@ WrittenElement Marshalling::element(const ClassPlan& plan, const String& name, c
     if (!object.isObject())
         return fail(error, errors::noMappingDefinition, object.classNameForMarshalling());
     static const String noPrefix("");
-    auto element =
-        _output.newElement(name.isEmpty() ? plan.namelessName : name, plan.attributeCount);
+    const Opened opened(*this, declarationsOf(plan, *object.object()));
+    auto element = newElement(name.isEmpty() ? plan.namelessName : name, plan.attributeCount);
     const QXXMLClassMapping& mapping = *plan.mapping;
     if (_marshaller->isUsingNamespaceURIs() && !mapping.nsURI().isEmpty())
         _output.addDeclaration(element, mapping.nsPrefix().isNull() ? noPrefix : mapping.nsPrefix(),
@@ -43,6 +63,56 @@ WrittenElement Marshalling::element(const ClassPlan& plan, const String& name, c
     if (!writeFields(plan, element, *object.object(), error))
         return {};
     return element;
+}
+
+// Its declarations and attributes go with it. What was declared for its attributes counts as
+// declared outside: so it is.
+WrittenElement Marshalling::shell(const ClassPlan& plan, const WrittenElement& target,
+                                  const Value& object, ErrorSlot error) {
+    if (!_names)
+        return element(plan, plan.elementName, object, error);
+    auto shell = _output.newElement(plan.namelessName, 0);
+    if (!writeFields(plan, shell, *object.object(), error))
+        return {};
+    for (const auto& [prefix, URI] : _names->added())
+        _output.addDeclaration(target, _names->lasting(prefix), URI);
+    return shell;
+}
+
+void Marshalling::declare(const WrittenElement& element,
+                          const OutputNames::Declaration& declaration) {
+    _output.addDeclaration(element, _names->lasting(declaration.prefix), declaration.URI);
+    _names->declare(declaration);
+}
+
+WrittenElement Marshalling::newElement(const String& name, std::size_t attributes) {
+    if (!_names)
+        return _output.newElement(name, attributes);
+    const OutputNames::Name written = _names->elementName(name);
+    auto element = _output.newElement(written.text, attributes);
+    if (written.declaration)
+        declare(element, *written.declaration);
+    return element;
+}
+
+void Marshalling::addTextElement(const WrittenElement& parent, const String& name,
+                                 const FieldText& text) {
+    if (!_names)
+        return _output.addChild(parent, name, text);
+    const Opened opened(*this);
+    const auto element = newElement(name, 0);
+    _output.setText(element, text);
+    _output.addChild(parent, element);
+}
+
+void Marshalling::addAttribute(const WrittenElement& element, const String& name,
+                               const FieldText& text) {
+    if (!_names)
+        return _output.addAttribute(element, name, text);
+    const OutputNames::Name written = _names->attributeName(name);
+    if (written.declaration)
+        declare(element, *written.declaration);
+    _output.addAttribute(element, written.text, text);
 }
 
 // A class that is self-first writes its fields before its ancestors', any other after them. Kept
@@ -94,6 +164,10 @@ bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& el
     return true;
 }
 
+WrittenElement Marshalling::lastChildNamed(const WrittenElement& element, const String& name) {
+    return _output.lastChildNamed(element, _names ? _names->elementName(name).text : name);
+}
+
 bool Marshalling::isToBeWritten(const Value& item) { return _access.isToBeWritten(*item.object()); }
 
 namespace {
@@ -127,7 +201,30 @@ void Marshalling::restoreUnknownXML(const WrittenElement& element, const Object&
                 _output.keepAttribute(element, attribute);
 }
 
-// The declarations that were read take the place of the class mapping's own.
+std::vector<OutputNames::Declaration> Marshalling::keptDeclarations(const Object& object) {
+    std::vector<OutputNames::Declaration> declarations;
+    if (!_names)
+        return declarations;
+    if (const auto kept = _access.getKept(object, KeptXML::namespaces).as<Array>())
+        for (const Value& value : *kept)
+            if (const auto declaration = value.as<XMLNode>();
+                declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
+                declarations.push_back({declaration->name(), declaration->stringValue()});
+    return declarations;
+}
+
+std::vector<OutputNames::Declaration> Marshalling::declarationsOf(const ClassPlan& plan,
+                                                                  const Object& object) {
+    auto declarations = keptDeclarations(object);
+    const QXXMLClassMapping& mapping = *plan.mapping;
+    if (_names && declarations.empty() && !mapping.nsURI().isEmpty())
+        declarations.push_back(
+            {mapping.nsPrefix().isNull() ? String("") : mapping.nsPrefix(), mapping.nsURI()});
+    return declarations;
+}
+
+// The declarations that were read take the place of the class mapping's own; those that names need
+// beside them stay.
 void Marshalling::restoreNamespaces(const WrittenElement& element, const Object& object) {
     const auto kept = _access.getKept(object, KeptXML::namespaces).as<Array>();
     if (!kept || kept->isEmpty() || !_marshaller->isUsingNamespaceURIs())
@@ -138,6 +235,9 @@ void Marshalling::restoreNamespaces(const WrittenElement& element, const Object&
         if (declaration && declaration->kind() == XMLNodeKind::namespaceDeclaration)
             copies.push_back(declaration->copy());
     }
+    if (_names)
+        for (const auto& [prefix, URI] : _names->added())
+            copies.push_back(XMLNode::namespaceWithName(prefix, URI));
     _output.setDeclarations(element, copies);
 }
 

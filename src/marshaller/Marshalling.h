@@ -8,6 +8,7 @@
 
 #include "marshaller/ElementWriter.h"
 #include "marshaller/ObjectAccess.h"
+#include "marshaller/OutputNames.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -18,11 +19,16 @@ public:
 
     // Writes into the draft, into nodes where there is none.
     explicit Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft = nullptr);
+    // Writes nodes that go into this element.
+    Marshalling(const QXXMLMarshaller& marshaller, const XMLElement& inside);
 
     WrittenElement marshallObject(const Value& object, ErrorSlot error);
     // `name` is the element's; an empty one gives the class's name as written.
     WrittenElement element(const ClassPlan& plan, const String& name, const Value& object,
                            ErrorSlot error);
+    // The same, if only the children of it will be taken, into an element that is being written.
+    WrittenElement shell(const ClassPlan& plan, const WrittenElement& target, const Value& object,
+                         ErrorSlot error);
     // The fields of the class and its ancestors, with what was kept when the object was read.
     bool writeFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                      ErrorSlot error);
@@ -34,6 +40,35 @@ public:
     // The class that the mapping has for the value; null for strings and numbers.
     const ClassPlan* classOf(const Value& value) const;
     ElementWriter& output() noexcept { return _output; }
+    // While it lives, an element is open that declares this: what is made is made inside it.
+    class Opened {
+    public:
+        explicit Opened(Marshalling& writing,
+                        const std::vector<OutputNames::Declaration>& declarations = {})
+            : _names(writing._names.get()) {
+            if (_names != nullptr)
+                _names->enter(declarations);
+        }
+        ~Opened() {
+            if (_names != nullptr)
+                _names->leave();
+        }
+        Opened(const Opened&) = delete;
+        Opened& operator=(const Opened&) = delete;
+
+    private:
+        OutputNames* const _names;
+    };
+    // What an object's element will declare of what was read; nothing where that does not matter
+    // for names.
+    std::vector<OutputNames::Declaration> keptDeclarations(const Object& object);
+    // The element that is open. Names are those of the mapping, and last as long as this object.
+    WrittenElement newElement(const String& name, std::size_t attributes);
+    void addTextElement(const WrittenElement& parent, const String& name, const FieldText& text);
+    // To the element that is open, or to a child of it.
+    void addAttribute(const WrittenElement& element, const String& name, const FieldText& text);
+    // None when no child has that name.
+    WrittenElement lastChildNamed(const WrittenElement& element, const String& name);
     // Whether an item of a collection is written (ObjectAccess.h).
     bool isToBeWritten(const Value& item);
     // Whether the field that is being written is left out as an attribute: nothing requires it, and
@@ -47,6 +82,10 @@ public:
 private:
     bool writeOwnFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                         ErrorSlot error);
+    // The same, or else what its class declares.
+    std::vector<OutputNames::Declaration> declarationsOf(const ClassPlan& plan,
+                                                         const Object& object);
+    void declare(const WrittenElement& element, const OutputNames::Declaration& declaration);
     void restoreXML(const WrittenElement& element, const Object& object);
     void restoreUnknownXML(const WrittenElement& element, const Object& object);
     void restoreNamespaces(const WrittenElement& element, const Object& object);
@@ -56,6 +95,7 @@ private:
     const MappingPlan& _plan;
     ObjectAccess _access;
     ElementWriter _output;
+    std::unique_ptr<OutputNames> _names; // null: names are written as the mapping has them
     std::size_t _depth = 0;
     bool _omitsZero = true; // of the field that is being written
 };

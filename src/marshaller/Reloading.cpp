@@ -54,7 +54,7 @@ Ref<UndoManager> managerOf(Object& object) {
 // An object without such a key has no value for it.
 std::optional<Value> valueOf(const Object& object, Key key) {
     try {
-        return ObjectAccess::get(object, key).value;
+        return ObjectAccess::get(object, key).value();
     } catch (const UndefinedKeyException& exception) {
         if (!exception.concerns(&object, key))
             throw;

@@ -7,6 +7,8 @@
 #include "model/Errors.h"
 
 #include <algorithm>
+#include <unordered_set>
+#include <utility>
 
 namespace qx::detail {
 
@@ -93,6 +95,7 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, E
 
 Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
                                  ErrorSlot error) {
+    const Number wrapper = std::exchange(_wrapper, none);
     if (!mayBuild(plan, source, error))
         return nullptr;
     Ref<Object> object = allocate(plan);
@@ -106,7 +109,8 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
     if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
         ObjectAccess::send(*object, *hooks->setUndoManager, _marshaller->undoManager());
 
-    const Frame frame{&plan, source.element(), _frame, _frame != nullptr ? _frame->depth + 1 : 1};
+    const Frame frame{&plan, source.element(), _frame, _frame != nullptr ? _frame->depth + 1 : 1,
+                      wrapper};
     struct Restore {
         const Frame*& current;
         const Frame* outer;
@@ -185,20 +189,41 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
 }
 
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
+    const Number element = target.source.element();
     Ref<Array> kept;
     bool fits = true;
-    const auto keep = [&](Number declaration) {
-        auto node = fits ? target.source.keepAttribute(declaration, _budget, error) : nullptr;
+    const auto keep = [&](Number declaration, Number holder) {
+        auto node =
+            fits ? target.source.keepAttribute(declaration, holder, _budget, error) : nullptr;
         fits = node.get() != nullptr;
         if (!kept)
             kept = make<Array>();
         if (fits)
             kept->add(std::move(node));
     };
-    _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, target.source.element(), keep);
+    _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, element,
+                            [&](Number declaration) { keep(declaration, element); });
+    if (_frame != nullptr && _frame->wrapper != none && _frame->element == element)
+        for (const Number declaration : declarationsAround(element))
+            keep(declaration, _frame->wrapper);
     if (!kept || !fits)
         return fits;
     return _access.setKept(target.object, KeptXML::namespaces, kept, error);
+}
+
+// Those of the wrapper that the element has none of its own for.
+std::vector<Unmarshalling::Number> Unmarshalling::declarationsAround(Number element) {
+    std::vector<Number> declarations;
+    std::unordered_set<std::string_view> own;
+    constexpr auto kind = XMLNodeKind::namespaceDeclaration;
+    _document.forEachOfKind(kind, element, [&](Number declaration) {
+        own.insert(_document.writtenName(declaration).view());
+    });
+    _document.forEachOfKind(kind, _frame->wrapper, [&](Number declaration) {
+        if (!own.contains(_document.writtenName(declaration).view()))
+            declarations.push_back(declaration);
+    });
+    return declarations;
 }
 
 namespace {

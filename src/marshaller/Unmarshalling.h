@@ -74,6 +74,9 @@ public:
     auto quoted(Number node) {
         return [this, node] { return _document.quoted(node); };
     }
+    // The next object that is built stands in this element, which is none of an object: where names
+    // are matched by namespace, it keeps the declarations of that, too.
+    void setWrapper(Number wrapper) noexcept { _wrapper = _document.isMatched() ? wrapper : none; }
     // Tells the item of the object that is to hold it, which comes before that one gets it. False
     // when the item does not take such a parent.
     bool adopt(Object& item, Object& parent, ErrorSlot error) {
@@ -87,12 +90,14 @@ private:
         Number element;
         const Frame* parent;
         std::size_t depth;
+        Number wrapper;
     };
     class LentNames;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
     bool mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
+    std::vector<Number> declarationsAround(Number element);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
     bool validateChildren(const Target& target, ErrorSlot error);
     bool keepChildren(const Target& target, const CountedSet& names, const CountedSet& written,
@@ -111,6 +116,7 @@ private:
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
+    Number _wrapper = none; // see setWrapper
     // The classes behind the names of elements, by the numbers of these, looked up once.
     struct KnownClass {
         bool isKnown = false;

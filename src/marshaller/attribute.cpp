@@ -42,17 +42,17 @@ bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& e
     const FieldText text(value, field.valueType);
     if (writing.isLeftOut(field, value, text))
         return true;
-    ElementWriter& output = writing.output();
     if (field.location().isEmpty()) {
-        output.addAttribute(element, field.xmlName(), text);
+        writing.addAttribute(element, field.xmlName(), text);
         return true;
     }
-    WrittenElement wrapper = output.lastChildNamed(element, field.location());
+    WrittenElement wrapper = writing.lastChildNamed(element, field.location());
+    const Marshalling::Opened opened(writing);
     if (!wrapper) {
-        wrapper = output.newElement(field.location(), 1);
-        output.addChild(element, wrapper);
+        wrapper = writing.newElement(field.location(), 1);
+        writing.output().addChild(element, wrapper);
     }
-    output.addAttribute(wrapper, field.xmlName(), text);
+    writing.addAttribute(wrapper, field.xmlName(), text);
     return true;
 }
 

@@ -22,10 +22,11 @@ bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& e
             return false;
         const FieldText text(value, field.valueType);
         if (!writing.isLeftOut(field, value, text))
-            writing.output().addAttribute(element, field.xmlName(), text);
+            writing.addAttribute(element, field.xmlName(), text);
         return true;
     }
-    const auto child = writing.element(*plan, plan->elementName, value, error);
+    const auto child = field.isContainer ? writing.element(*plan, plan->elementName, value, error)
+                                         : writing.shell(*plan, element, value, error);
     if (!child)
         return false;
     if (field.isContainer)

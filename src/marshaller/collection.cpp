@@ -18,6 +18,7 @@ using Target = Unmarshalling::Target;
 struct Items {
     std::vector<Unmarshalling::Number> nodes;
     bool areCounted = false; // as a whole, by their bind name or their wrapper's
+    Unmarshalling::Number wrapper = Unmarshalling::none;
 };
 
 // The wrapper's children. False where they are more than may be gone over.
@@ -25,6 +26,7 @@ bool takeChildren(Unmarshalling& reading, Unmarshalling::Number wrapper, Items& 
                   Ref<Error>* error) {
     reading.document().forEachChild(
         wrapper, [&](Unmarshalling::Number child) { items.nodes.push_back(child); });
+    items.wrapper = items.nodes.empty() ? Unmarshalling::none : wrapper;
     return reading.budget().takeVisits(items.nodes.size(), wrapper, error);
 }
 
@@ -76,6 +78,7 @@ bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Targe
                 if (!reading.budget().takeVisits(wrapper->childCount(), found.first, error))
                     return false;
                 items.areCounted = true;
+                items.wrapper = found.first;
                 target.bound.fields.add(binding.location);
             }
         }
@@ -99,7 +102,9 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
     auto array = qx::make<Array>();
     array->reserve(std::min(items.nodes.size(), usualSize));
     for (const auto node : items.nodes) {
+        reading.setWrapper(items.wrapper);
         const Value item = make(node);
+        reading.setWrapper(Unmarshalling::none);
         if ((error != nullptr && *error) || reading.budget().isSpent())
             return false;
         if (item.isNull())
@@ -154,21 +159,21 @@ bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const 
 
 namespace {
 
-WrittenElement appendNew(ElementWriter& output, const WrittenElement& parent, const String& name) {
-    auto child = output.newElement(name, 0);
-    output.addChild(parent, child);
+WrittenElement appendNew(Marshalling& writing, const WrittenElement& parent, const String& name) {
+    auto child = writing.newElement(name, 0);
+    writing.output().addChild(parent, child);
     return child;
 }
 
 // Items stand in the wrapper of the location; else, when nothing says what their elements are, in a
 // wrapper of the item name; else in the element itself.
-WrittenElement elementForItems(ElementWriter& output, const FieldPlan& field,
+WrittenElement elementForItems(Marshalling& writing, const FieldPlan& field,
                                const WrittenElement& element) {
     if (!field.location().isEmpty())
-        return appendNew(output, element, field.location());
+        return appendNew(writing, element, field.location());
     if (!field.hasType() && !field.bindTo().isEmpty() &&
         field.bindings.front().classOfBindTo == nullptr)
-        return appendNew(output, element, field.bindTo());
+        return appendNew(writing, element, field.bindTo());
     return element;
 }
 
@@ -180,15 +185,15 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
         return true;
     if (field.hasType() && !field.hasItemType())
         return fail(error, errors::noMappingForDeclaredClass, field.mapping->type());
-    ElementWriter& output = writing.output();
-    const WrittenElement target = elementForItems(output, field, element);
+    const Marshalling::Opened opened(writing);
+    const WrittenElement target = elementForItems(writing, field, element);
     // An item's own accessors may change the array it stands in.
     for (std::size_t i = 0; i < array.count(); ++i) {
         // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
         const Value item = array.at(i);
         if (field.typeClass == nullptr && field.hasSimpleType()) {
             if (!item.isNullOrMarker())
-                output.addChild(target, field.xmlName(), FieldText(item, field.valueType));
+                writing.addTextElement(target, field.xmlName(), FieldText(item, field.valueType));
             continue;
         }
         Ref<Error> problem;
@@ -197,7 +202,7 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
                                : writing.marshallObject(item, &problem);
         if (child) {
             if (writing.isToBeWritten(item))
-                output.addChild(target, child);
+                writing.output().addChild(target, child);
         } else if (error != nullptr && problem) {
             *error = std::move(problem);
             return false;

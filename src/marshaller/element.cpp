@@ -71,7 +71,7 @@ bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& e
         return static_cast<bool>(child);
     }
     if (field.isRequired || !value.isNullOrMarker())
-        writing.output().addChild(element, field.xmlName(), FieldText(value, field.valueType));
+        writing.addTextElement(element, field.xmlName(), FieldText(value, field.valueType));
     return true;
 }
 

@@ -102,7 +102,9 @@ bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLEle
     const Ref<Object> held(&object);
     const WrittenElement target{Ref<XMLElement>(&element)};
     const PlanOfClass plan(*this, mapping);
-    return Marshalling(*this).writeFields(*plan, target, object, error);
+    Marshalling writing(*this, element);
+    const Marshalling::Opened opened(writing, writing.keptDeclarations(object));
+    return writing.writeFields(*plan, target, object, error);
 }
 
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,
@@ -110,7 +112,7 @@ bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& eleme
     const Ref<Object> held(&object);
     const WrittenElement target{Ref<XMLElement>(&element)};
     const PlanOfField plan(*this, field);
-    return Marshalling(*this).writeField(*plan, target, object, error);
+    return Marshalling(*this, element).writeField(*plan, target, object, error);
 }
 
 bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
@@ -118,7 +120,7 @@ bool QXXMLMarshaller::mapArray(const qx::Array& array, XMLElement& element,
     const Ref<const qx::Array> held(&array);
     const WrittenElement target{Ref<XMLElement>(&element)};
     const PlanOfField plan(*this, field);
-    Marshalling writing(*this);
+    Marshalling writing(*this, element);
     return writeCollection(writing, *plan, target, array, error);
 }
 

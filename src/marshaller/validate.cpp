@@ -134,7 +134,7 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
     const auto keep = [&](Number attribute) {
         if (!fits || !names.contains(_document.name(attribute)))
             return;
-        auto node = target.source.keepAttribute(attribute, _budget, error);
+        auto node = target.source.keepAttribute(attribute, target.source.element(), _budget, error);
         fits = node.get() != nullptr;
         if (fits)
             kept->add(std::move(node));

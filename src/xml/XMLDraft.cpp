@@ -56,6 +56,13 @@ XMLDraft::Element& XMLDraft::newElement(const String& name) {
 }
 
 void XMLDraft::addDeclaration(Element& element, const String& prefix, const String& URI) {
+    bool isThere = false;
+    if (element.hasDeclarations)
+        forEach(element.lastAttribute, [&](const Node& node) {
+            isThere |= node.kind() == Kind::declaration && *node.name == prefix;
+        });
+    if (isThere)
+        return;
     append(element.lastAttribute, newNode(Kind::declaration, &prefix, URI));
     element.hasDeclarations = true;
 }

@@ -74,6 +74,7 @@ public:
 
     // An element that stands nowhere yet.
     Element& newElement(const String& name);
+    // Adds nothing when the prefix is declared there already.
     void addDeclaration(Element& element, const String& prefix, const String& URI);
     // Adds nothing when an attribute of that name is there already.
     void addAttribute(Element& element, const String& name, std::string_view value);

@@ -3,6 +3,7 @@
 // What the blocks of a page say of a marshaller (see support/Cases.h for pages):
 //
 //     xml mapping      a <mapping>, or the classes in one
+//     text prefixes    the table of namespaces, one PREFIX=URI a line
 //     xml document     what is read, and of what comes is written again
 //     text given       an object, shown as the next, that is written; nothing is read then
 //     text object      what reading gives
@@ -12,9 +13,9 @@
 //
 // What is read is also read into an object that is there.
 //
-// Options are "strict", "discard" and "no-namespaces". Each case runs on records, on host classes
-// and on plain structs; where they differ, a block says for which it is: "records", "hosts",
-// "structs".
+// Options are "strict", "discard", "no-namespaces" and "by-namespace" (of the class mappings). Each
+// case runs on records, on host classes and on plain structs; where they differ, a block says for
+// which it is: "records", "hosts", "structs".
 
 #include "ObjectKinds.h"
 #include "support/Cases.h"
@@ -27,6 +28,7 @@
 
 #include <algorithm>
 #include <charconv>
+#include <sstream>
 
 namespace cases {
 
@@ -109,13 +111,25 @@ struct Result {
 
 constexpr const char* declaration = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n";
 
+inline QXXMLMarshaller::NamespacePrefixes
+prefixesOf(const std::map<std::string, std::string>& given) {
+    const auto text = given.find("prefixes");
+    std::istringstream lines(text != given.end() ? text->second : "");
+    QXXMLMarshaller::NamespacePrefixes prefixes;
+    for (std::string prefix, URI; std::getline(lines, prefix, '=') && std::getline(lines, URI);)
+        prefixes.emplace(URI, prefix);
+    return prefixes;
+}
+
 // What comes of a case. A document is read as a text, or as a tree. What is written is a tree, and
 // the same as a text without one.
 inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool isTree) {
     const auto& [kind, text, options, given] = expectation;
     Result result;
     qx::Ref<qx::Error> error;
-    if (const auto marshaller = QXXMLMarshaller::initWithMappingXML(&mapping, &error)) {
+    const auto marshaller = QXXMLMarshaller::initWithMappingXML(&mapping, &error);
+    if (marshaller && marshaller->setNamespacePrefixes(prefixesOf(given), &error) &&
+        marshaller->setMatchesNamespaces(options.contains("by-namespace"), &error)) {
         marshaller->setLenient(!options.contains("strict"));
         marshaller->setSaveUnknownXML(!options.contains("discard"));
         marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
@@ -150,7 +164,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
-    static const support::Words known = {"strict",  "discard", "no-namespaces",
+    static const support::Words known = {"strict",  "discard", "no-namespaces", "by-namespace",
                                          "records", "hosts",   "structs"};
     for (const std::string& option : expectation.options)
         EXPECT_TRUE(known.contains(option)) << option << " is no option";
@@ -178,8 +192,8 @@ inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
 }
 
 inline bool addPage(const std::string& page, std::vector<kinds::Kind> on) {
-    return support::addCases(page, {"mapping", "document", "given"}, {"object", "written", "error"},
-                             [=](const Expectation& expectation) {
+    return support::addCases(page, {"mapping", "prefixes", "document", "given"},
+                             {"object", "written", "error"}, [=](const Expectation& expectation) {
                                  for (const kinds::Kind kind : on)
                                      checkOn(kind, expectation);
                              });

@@ -43,6 +43,15 @@ std::string checkApplication(const std::string& application) {
     return {};
 }
 
+// What is wrong with the value of --prefix; nothing when it is empty. The library knows which are
+// prefixes.
+std::string checkPrefix(const std::string& prefix) {
+    const std::size_t equals = prefix.find('=');
+    if (equals == std::string::npos || equals + 1 == prefix.size())
+        return "PREFIX=URI or =URI is expected, not \"" + prefix + "\"";
+    return {};
+}
+
 void addSearch(CLI::App& command, Options& options) {
     command
         .add_option("--search-path", options.searchPaths,
@@ -75,6 +84,15 @@ void addReading(CLI::App& command, Options& options) {
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
                      "Do not write namespace declarations");
+    command
+        .add_option("--prefix", options.prefixes,
+                    "Match names by namespace: the mapping has this prefix, or none, for the "
+                    "namespace of that URI; may be given more than once")
+        ->option_text("[PREFIX]=URI")
+        ->allow_extra_args(false)
+        ->check(CLI::Validator(checkPrefix, ""));
+    command.add_flag("--match-namespaces", options.matchNamespaces,
+                     "The same for the namespaces that the class mappings declare");
     command.add_flag("--keep-white-space", options.keepWhiteSpace,
                      "Keep the white space between elements");
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");

@@ -19,6 +19,10 @@ struct Options {
     bool keepWhiteSpace = false;
     bool noDoctype = false;
     bool pretty = false;
+    bool matchNamespaces = false;
+
+    // PREFIX=URI each, an empty prefix for names without one.
+    std::vector<std::string> prefixes;
 
     // Folders that are searched before the usual places, in this order.
     std::vector<std::string> searchPaths;

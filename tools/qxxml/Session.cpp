@@ -22,6 +22,15 @@ void standFor(const std::string& application) {
         qx::ProcessInfo::setProcessVersion(application.substr(slash + 1), "");
 }
 
+QXXMLMarshaller::NamespacePrefixes prefixes(const std::vector<std::string>& options) {
+    QXXMLMarshaller::NamespacePrefixes prefixes;
+    for (const std::string& option : options) {
+        const std::size_t equals = option.find('=');
+        prefixes.insert_or_assign(option.substr(equals + 1), option.substr(0, equals));
+    }
+    return prefixes;
+}
+
 } // namespace
 
 Session::Session(const Options& options) : _options(options) {
@@ -46,6 +55,9 @@ qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);
+    if (!marshaller->setNamespacePrefixes(prefixes(_options.prefixes), &error) ||
+        !marshaller->setMatchesNamespaces(_options.matchNamespaces, &error))
+        throw Failure(error, _options.mapping);
     return marshaller;
 }
 
