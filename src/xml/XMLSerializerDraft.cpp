@@ -106,7 +106,7 @@ XMLSerializer::DraftTag XMLSerializer::startTag(const XMLDraft::Element& element
 }
 
 // Drafts are as deep as objects may nest.
-void XMLSerializer::writeElement(const XMLDraft::Element& element) { // NOLINT(misc-no-recursion)
+void XMLSerializer::writeElement(const XMLDraft::Element& element) {
     const DraftTag tag = startTag(element);
     if (tag.hasChildren) {
         const bool isMixed =
@@ -129,7 +129,7 @@ void XMLSerializer::writeElement(const XMLDraft::Element& element) { // NOLINT(m
         _output += "/>";
 }
 
-void XMLSerializer::writeChildren(const XMLDraft::Element& element) { // NOLINT(misc-no-recursion)
+void XMLSerializer::writeChildren(const XMLDraft::Element& element) {
     const bool isLaidOut = has(XMLPrettyPrint) && !_levels.back().isInline();
     XMLDraft::forEach(element.lastChild, [&](const XMLDraft::Node& node) {
         if (isLaidOut && node.name != nullptr)

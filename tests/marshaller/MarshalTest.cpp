@@ -4,6 +4,7 @@
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Array.h>
+#include <QXXMLMarshalling/model/Dictionary.h>
 #include <QXXMLMarshalling/model/Null.h>
 
 namespace {
@@ -47,6 +48,45 @@ TEST(Marshal, WritesHostItemsOnlyWhenTheySayThatTheyCannotBeRemoved) {
     const auto items = qx::make<qx::Array>(std::vector<Value>{qx::make<Silent>()});
     EXPECT_EQ(scenario::write(*marshaller, record("Order", {{"x", items}})),
               "<Order><all></all></Order>");
+}
+
+// What is kept moves to the object that is written last, comes last into the start tag, and counts
+// for the layout of all that stands before.
+TEST(Marshal, WritesTextsWithoutATreeAsItWritesTrees) {
+    const auto marshaller = scenario::marshaller(
+        "<Order><all collection='array'/><one type='Part' container='false' node='element'/>"
+        "<at name='a' node='attribute' location='x'/><end node='element'/></Order>"
+        "<Part><text name='w' node='element'/><a name='a' node='attribute' location='w'/></Part>");
+    const auto source =
+        qx::XMLDocument::initWithData("<s xml:space='preserve' b='1'><x><y/> <!--c--></x><x/></s>");
+    const auto root = source->rootElement();
+    const auto keep = [&](const Ref<QXGenericRecord>& object) {
+        const auto children = qx::make<qx::Dictionary>();
+        children->set("x", qx::make<qx::Array>(std::vector<Value>{root->elementsForName("x")[0],
+                                                                  root->elementsForName("x")[1]}));
+        object->setValueForKey(children, "unboundChildren");
+        const auto attributes = qx::make<qx::Array>();
+        for (qx::XMLNode& attribute : root->attributes())
+            attributes->add(Value(&attribute));
+        object->setValueForKey(attributes, "unboundAttributes");
+        return object;
+    };
+    const auto part = keep(record("Part", {{"text", "<t>"}, {"a", 1}}));
+    const auto order = keep(record("Order", {{"all", qx::make<qx::Array>(std::vector<Value>{part})},
+                                             {"one", part},
+                                             {"at", "&"},
+                                             {"end", 2}}));
+    for (const auto layout : {qx::XMLPrettyPrint, qx::XMLNoOptions, qx::XMLCompactEmptyElements})
+        for (const bool isLast : {false, true}) {
+            order->setValueForKey(isLast ? part : record("Part"), "one");
+            const auto tree = marshaller->marshall(order)->XMLString(layout, {});
+            EXPECT_EQ(marshaller->writeString(order, nullptr, layout), tree);
+            EXPECT_FALSE(root->firstChild());
+        }
+    EXPECT_EQ(marshaller->writeString(order, nullptr, qx::XMLCompactEmptyElements).view(),
+              R"(<?xml version="1.0" encoding="UTF-8"?><Order xml:space="preserve" b="1"><Part>)"
+              R"(<w a="1">&lt;t&gt;</w></Part><w a="1">&lt;t&gt;</w><end>2</end>)"
+              R"(<x><y/> <!--c--></x><x a="&amp;"/></Order>)");
 }
 
 TEST(Marshal, EndsAtTheDepthLimitForObjectsThatContainThemselves) {
