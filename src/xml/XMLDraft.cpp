@@ -22,8 +22,8 @@ void XMLDraft::grow(std::size_t size) {
 XMLDraft::Node* XMLDraft::newNode(Kind kind, const String* name, std::string_view value) {
     // What moves leaves a pointer.
     void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
-    Node* const node =
-        ::new (memory) Node{name, nullptr, value.size(), static_cast<std::uint8_t>(kind)};
+    Node* const node = ::new (memory) Node{name, nullptr, 0, static_cast<std::uint8_t>(kind)};
+    node->size = value.size() & Node::largestSize;
     if (!value.empty())
         std::memcpy(node + 1, value.data(), value.size());
     return node;

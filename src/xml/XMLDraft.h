@@ -49,6 +49,7 @@ public:
     struct Node {
         const String* name;
         Node* next;
+        static constexpr std::uint64_t largestSize = (std::uint64_t(1) << 56U) - 1;
         std::uint64_t size : 56;
         std::uint64_t kindNumber : 8;
 

@@ -148,9 +148,9 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
         EXPECT_FALSE(element && error) << "both an element and an error";
         result.written = element ? element->XMLString(qx::XMLPrettyPrint).str() + "\n" : "";
         qx::Ref<qx::Error> problem;
-        const qx::String text =
+        const qx::String untreed =
             object.isNull() ? qx::String() : marshaller->writeString(object, &problem);
-        EXPECT_EQ(text.str(), element ? std::string(declaration) + result.written : "")
+        EXPECT_EQ(untreed.str(), element ? std::string(declaration) + result.written : "")
             << "written without a tree: " << support::told(problem);
         EXPECT_TRUE(element || object.isNull() || support::told(problem) == support::told(error));
     }
