@@ -44,6 +44,25 @@ TEST(LargeDocumentsPage, EachReadingIsHandedOver) {
     // end of sample
     EXPECT_FALSE(error);
     EXPECT_EQ(total, 700'000);
+    int left = 3;
+    const auto nextReading = [&] { return Reading{"m", left--}; };
+    // sample: write
+    marshaller->marshallEach(
+        path, "readings",
+        [&]() -> std::optional<Reading> {
+            if (left == 0)
+                return std::nullopt;
+            return nextReading();
+        },
+        &error);
+    // end of sample
+    EXPECT_FALSE(error);
+    EXPECT_EQ(folder.read("readings.xml"), "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+                                           "<readings>\n"
+                                           "    <reading>3</reading>\n"
+                                           "    <reading>2</reading>\n"
+                                           "    <reading>1</reading>\n"
+                                           "</readings>\n");
     EXPECT_GE(bar.shown, 50U);
 }
 

@@ -37,6 +37,7 @@
 #include <typeinfo>
 
 namespace qx {
+class ByteSink;
 class ByteSource;
 class NamespaceTable;
 namespace detail {
@@ -295,6 +296,30 @@ public:
         return writeStream(qx::detail::lend(object), stream, error, layout);
     }
 
+    // Writes a document that need not fit into memory: a root element of that name with the objects
+    // that produce() answers, one after another, until that is null or empty: a qx::Value, a
+    // qx::Ref, or a std::optional of a struct. `sink` is the path of a file, which is replaced
+    // atomically at the end, or a std::ostream, which gets some of it where a later object fails.
+    // The errors are those of writeFile(), 517 for what is no name of a root. unmarshallEach()
+    // reads such documents.
+    //
+    //     marshaller->marshallEach("orders.xml", "orders", [&]() -> std::optional<Order> { … });
+    template <class Sink, class Produce>
+    bool marshallEach(Sink&& sink, const qx::String& rootName, Produce produce,
+                      qx::Ref<qx::Error>* error = nullptr,
+                      qx::XMLOptions layout = qx::XMLPrettyPrint) {
+        using Produced = decltype(produce());
+        std::optional<Produced> latest; // lent while it is written
+        const auto next = [&]() -> qx::Value {
+            latest.emplace(produce());
+            if constexpr (std::convertible_to<Produced, qx::Value>)
+                return *latest;
+            else
+                return qx::detail::lend(*latest);
+        };
+        return writeEach(sink, rootName, next, error, layout);
+    }
+
     // The steps of marshalling, for hosts that build trees of their own.
     //
     // A new element for the object. Null with
@@ -442,6 +467,14 @@ private:
     bool readBytesInto(qx::Object* object, qx::XMLBytes xml, qx::Ref<qx::Error>* error);
     bool readInputInto(qx::Object* object, std::istream& stream, qx::Ref<qx::Error>* error);
     bool readTreeInto(qx::Object* object, qx::XMLDocument* document, qx::Ref<qx::Error>* error);
+    using Producer = qx::detail::UniqueFunction<qx::Value()>;
+    bool writeEach(const qx::String& path, const qx::String& rootName, Producer next,
+                   qx::Ref<qx::Error>* error, qx::XMLOptions layout);
+    bool writeEach(std::ostream& stream, const qx::String& rootName, Producer next,
+                   qx::Ref<qx::Error>* error, qx::XMLOptions layout);
+    bool writeEach(qx::ByteSink& sink, const qx::String& rootName, Producer next,
+                   qx::Ref<qx::Error>* error, qx::XMLOptions layout);
+
     // -211 for an object that is not of that type.
     static qx::Ref<qx::Error> wrongClass(const qx::Object& object, const std::type_info& type);
 

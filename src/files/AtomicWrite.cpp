@@ -219,37 +219,58 @@ private:
     bool _isRenamed = false;
 };
 
-// 0 or the error number.
-int replace(const Target& target, const std::string& directory, std::string_view bytes) {
-    const bool isNew = target.kind == Target::Kind::nothing;
-    TemporaryFile temporary(directory, isNew ? 0666 : 0600);
-    const bool isDone =
-        temporary.isOpen() && writeAll(temporary.descriptor(), bytes) &&
-        (target.kind != Target::Kind::file || keepPermissions(temporary.descriptor(), target)) &&
-        ::fsync(temporary.descriptor()) == 0 && temporary.renameTo(target.path);
-    return isDone ? 0 : errno;
-}
-
 } // namespace
 
-bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>* error) {
-    if (path.isEmpty() || holdsZeroByte(path) || path.view().back() == '/')
+struct AtomicFile::State {
+    Target target;
+    std::string directory;
+    TemporaryFile temporary;
+
+    explicit State(Target found)
+        : target(std::move(found)), directory(directoryOf(target.path)),
+          temporary(directory, target.kind == Target::Kind::nothing ? 0666 : 0600) {}
+};
+
+AtomicFile::AtomicFile(String path) : _path(std::move(path)) {}
+
+AtomicFile::~AtomicFile() = default;
+
+bool AtomicFile::open(Ref<Error>* error) {
+    if (_path.isEmpty() || holdsZeroByte(_path) || _path.view().back() == '/')
         return fail(error, errors::invalidFileName);
-    Target target{path.str()};
+    Target target{_path.str()};
     if (const int errorNumber = target.find())
-        return failWriting(error, path, errorNumber);
+        return failWriting(error, _path, errorNumber);
     if (target.kind == Target::Kind::special)
-        return fail(error, errors::noRegularTarget, path);
-    const std::string directory = directoryOf(target.path);
-    if (const int errorNumber = replace(target, directory, bytes))
-        return failWriting(error, path, errorNumber);
+        return fail(error, errors::noRegularTarget, _path);
+    _state = std::make_unique<State>(std::move(target));
+    return _state->temporary.isOpen() || failWriting(error, _path, errno);
+}
+
+bool AtomicFile::write(std::string_view bytes, Ref<Error>* error) {
+    return writeAll(_state->temporary.descriptor(), bytes) || failWriting(error, _path, errno);
+}
+
+bool AtomicFile::commit(Ref<Error>* error) {
+    const Target& target = _state->target;
+    TemporaryFile& temporary = _state->temporary;
+    const bool isDone =
+        (target.kind != Target::Kind::file || keepPermissions(temporary.descriptor(), target)) &&
+        ::fsync(temporary.descriptor()) == 0 && temporary.renameTo(target.path);
+    if (!isDone)
+        return failWriting(error, _path, errno);
 
     // The document is in place. Where the directory can't be flushed (no permission to read it, a
     // file system without the notion) nothing better can be done.
-    const Descriptor parent(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const Descriptor parent(::open(_state->directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (parent.isOpen())
         ::fsync(parent.number());
     return true;
+}
+
+bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>* error) {
+    AtomicFile file(path);
+    return file.open(error) && file.write(bytes, error) && file.commit(error);
 }
 
 bool checkLengthOfPath(const String& path, Ref<Error>* error) {

@@ -4,6 +4,10 @@
 
 #include <QXXMLMarshalling/model/Error.h>
 
+#include "files/ByteSink.h"
+
+#include <memory>
+
 namespace qx {
 
 // Writes a temporary file beside the target, flushes it to disk and renames it over the target: at
@@ -21,6 +25,27 @@ namespace qx {
 // A temporary file is called ".~qx-save-N.tmp". What a writer left that was killed is removed by
 // the next that saves into the same folder.
 bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>* error = nullptr);
+
+// The same, of bytes that come one after another. Until commit() the old file is untouched; what
+// was not committed goes with the object.
+class AtomicFile final : public ByteSink {
+public:
+    explicit AtomicFile(String path);
+    AtomicFile(const AtomicFile&) = delete;
+    AtomicFile& operator=(const AtomicFile&) = delete;
+    ~AtomicFile() override;
+
+    // Before anything else.
+    bool open(Ref<Error>* error) override;
+    bool write(std::string_view bytes, Ref<Error>* error) override;
+    bool commit(Ref<Error>* error) override;
+
+private:
+    struct State;
+
+    const String _path;
+    std::unique_ptr<State> _state;
+};
 
 // False with an error for a path that is too long to be written, or has a component that is: to be
 // known before directories are made for it.

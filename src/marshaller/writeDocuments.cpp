@@ -8,6 +8,7 @@
 #include "marshaller/DocumentParsing.h"
 #include "marshaller/Marshalling.h"
 #include "model/Errors.h"
+#include "xml/XMLCharacters.h"
 #include "xml/XMLSerializer.h"
 
 using qx::Error;
@@ -16,49 +17,100 @@ using qx::String;
 
 namespace {
 
-// Calls use(text) with the document of the object, which is drafted and printed; what use()
-// answers. The draft's names are the mapping's, which the marshalling holds: getters may let go of
-// the marshaller. What no XML document can hold, or none that could be read again, raises while it
-// is printed.
-template <class Use>
-auto withDocument(const QXXMLMarshaller& marshaller, const qx::Value& object, qx::XMLOptions layout,
-                  Ref<Error>* error, Use use) -> decltype(use(std::declval<qx::TextBuffer&>())) {
-    if (error != nullptr)
-        error->reset();
+// Drafts the object and has print(element, limits) print the draft. Its names are the mapping's,
+// which the marshalling holds: getters may let go of the marshaller. What no XML document can hold,
+// or none that could be read again, raises while it is printed.
+template <class Print>
+bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Error>* error,
+             Print print) {
     const qx::XMLParseOptions reading = qx::detail::parsingOf(marshaller);
     const qx::Value held = object; // whatever the getters do to the caller's
     qx::XMLDraft draft;
     qx::detail::Marshalling marshalling(marshaller, &draft);
     const auto root = marshalling.marshallObject(held, error);
     if (!root || (error != nullptr && *error))
-        return {};
+        return false;
     try {
-        qx::TextBuffer text;
-        qx::writeDraft(*root.drafted, layout, reading, text);
-        return use(text);
+        print(*root.drafted, reading);
+        return true;
     } catch (const qx::Exception& exception) {
         return qx::fail(error, qx::errors::textCannotBeWritten, exception.reason());
     }
+}
+
+void reset(Ref<Error>* error) {
+    if (error != nullptr)
+        error->reset();
+}
+
+// The text of the object's document; false with an error.
+bool print(const QXXMLMarshaller& marshaller, const qx::Value& object, qx::XMLOptions layout,
+           Ref<Error>* error, qx::TextBuffer& text) {
+    reset(error);
+    return printed(marshaller, object, error, [&](const auto& root, const auto& reading) {
+        qx::writeDraft(root, layout, reading, text);
+    });
 }
 
 } // namespace
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error,
                                     qx::XMLOptions layout) {
-    return withDocument(*this, object, layout, error,
-                        [](qx::TextBuffer& text) { return text.take(); });
+    qx::TextBuffer text;
+    return print(*this, object, layout, error, text) ? text.take() : String();
 }
 
 bool QXXMLMarshaller::writeFile(const qx::Value& object, const String& path, Ref<Error>* error,
                                 qx::XMLOptions layout) {
-    return withDocument(*this, object, layout, error, [&](const qx::TextBuffer& text) {
-        return qx::writeFileAtomically(path, text.view(), error);
-    });
+    qx::TextBuffer text;
+    return print(*this, object, layout, error, text) &&
+           qx::writeFileAtomically(path, text.view(), error);
 }
 
 bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream, Ref<Error>* error,
                                   qx::XMLOptions layout) {
-    return withDocument(*this, object, layout, error, [&](const qx::TextBuffer& text) {
-        return qx::writeToStream(stream, text.view(), error);
-    });
+    qx::TextBuffer text;
+    return print(*this, object, layout, error, text) &&
+           qx::writeToStream(stream, text.view(), error);
+}
+
+bool QXXMLMarshaller::writeEach(const String& path, const String& rootName, Producer next,
+                                Ref<Error>* error, qx::XMLOptions layout) {
+    qx::AtomicFile file(path);
+    return writeEach(file, rootName, std::move(next), error, layout);
+}
+
+bool QXXMLMarshaller::writeEach(std::ostream& stream, const String& rootName, Producer next,
+                                Ref<Error>* error, qx::XMLOptions layout) {
+    qx::StreamSink sink(stream);
+    return writeEach(sink, rootName, std::move(next), error, layout);
+}
+
+bool QXXMLMarshaller::writeEach(qx::ByteSink& sink, const String& rootName, Producer next,
+                                Ref<Error>* error, qx::XMLOptions layout) {
+    constexpr std::size_t blockSize = 64 * 1024;
+    reset(error);
+    const Ref<QXXMLMarshaller> held(this); // the producer may let go of it
+    if (!qx::isXMLName(rootName))
+        return qx::fail(error, qx::errors::textCannotBeWritten,
+                        String::concat({rootName, " is no name of an element"}));
+    if (!sink.open(error))
+        return false;
+    const std::string_view lineEnd = (layout & qx::XMLPrettyPrint) != 0 ? "\n" : "";
+    std::string_view beforeEnd;
+    qx::TextBuffer text;
+    text +=
+        String::concat({"<?xml version=\"1.0\" encoding=\"UTF-8\"?>", lineEnd, "<", rootName, ">"})
+            .view();
+    for (qx::Value object = next(); !object.isNull(); object = next()) {
+        const bool isPrinted =
+            printed(*this, object, error, [&](const auto& element, const auto& reading) {
+                qx::writeDraftInside(element, layout, reading, text);
+            });
+        beforeEnd = lineEnd;
+        if (!isPrinted || (text.size() >= blockSize && !sink.write(text.take(), error)))
+            return false;
+    }
+    text += String::concat({beforeEnd, "</", rootName, ">", lineEnd}).view();
+    return sink.write(text.view(), error) && sink.commit(error);
 }

@@ -35,6 +35,8 @@ public:
     // The draft as a document of version "1.0" and encoding "UTF-8". What it raises names no place.
     // XMLSerializerDraft.cpp.
     void write(const XMLDraft::Element& root);
+    // The draft as one of the elements inside a document's root.
+    void writeInside(const XMLDraft::Element& element);
 
 private:
     // How the children of an open element are laid out.
@@ -108,6 +110,9 @@ private:
 // are gone.
 void writeDraft(const XMLDraft::Element& root, XMLOptions options, const XMLParseOptions& reading,
                 TextBuffer& output);
+// Likewise appends it as one of the elements inside a document's root.
+void writeDraftInside(const XMLDraft::Element& element, XMLOptions options,
+                      const XMLParseOptions& reading, TextBuffer& output);
 
 template <class Declares>
 void XMLSerializer::writeAttribute(const String& name, std::string_view value,

@@ -165,6 +165,15 @@ void XMLSerializer::writeLeaf(const XMLDraft::Node& leaf) {
     endTag(*leaf.name);
 }
 
+void XMLSerializer::writeInside(const XMLDraft::Element& element) {
+    _limits.enter({}, 0, 0);
+    if (has(XMLPrettyPrint)) {
+        _levels.push_back({false, false});
+        breakLine(_levels.size());
+    }
+    writeElement(element);
+}
+
 // Nodes are made only for the place of what cannot be written.
 void writeDraft(const XMLDraft::Element& root, XMLOptions options, const XMLParseOptions& reading,
                 TextBuffer& output) {
@@ -176,6 +185,18 @@ void writeDraft(const XMLDraft::Element& root, XMLOptions options, const XMLPars
     }
     XMLSerializer(output, options, XMLChecks::on, nullptr, &reading)
         .write(*XMLDraft::makeDocument(root));
+}
+
+void writeDraftInside(const XMLDraft::Element& element, XMLOptions options,
+                      const XMLParseOptions& reading, TextBuffer& output) {
+    try {
+        XMLSerializer(output, options, XMLChecks::on, nullptr, &reading).writeInside(element);
+    } catch (const Exception&) {
+        TextBuffer unused;
+        XMLSerializer(unused, options, XMLChecks::on, nullptr, &reading)
+            .write(*XMLDraft::makeDocument(element));
+        throw;
+    }
 }
 
 } // namespace qx

@@ -2,6 +2,7 @@
 // its bytes come, up to where it has a fault, which is told at the same place.
 
 #include "support/Scenario.h"
+#include "support/TemporaryFolder.h"
 
 #include <QXXMLMarshalling/model/Class.h>
 
@@ -32,8 +33,9 @@ private:
     std::size_t _given = 0;
 };
 
-constexpr const char* mapping = "<Item xml='item'><id node='attribute'/><text node='text'/></Item>"
-                                "<Others xml='o'><items collection='array' type='Item' name='item'/></Others>";
+constexpr const char* mapping =
+    "<Item xml='item'><id node='attribute'/><text node='text'/></Item>"
+    "<Others xml='o'><items collection='array' type='Item' name='item'/></Others>";
 
 struct Told {
     std::string objects;
@@ -237,4 +239,52 @@ TEST(Sequences, AReadingTellsHowFarItIsAndCanBeCancelled) {
                   "-226: The reading was cancelled (The program asked for it.)");
         told.clear();
     }
+}
+
+TEST(Sequences, AreWrittenAsTheWholeDocumentWouldBe) {
+    const auto marshaller = scenario::marshaller(mapping);
+    const auto whole = marshaller->readString("<o><item id='1'/><item id='2'>a\nb</item></o>");
+    const auto items = whole->valueForKey("items").as<qx::Array>();
+    for (const qx::XMLOptions layout : {qx::XMLPrettyPrint, qx::XMLNoOptions}) {
+        std::ostringstream written;
+        std::size_t next = 0;
+        EXPECT_TRUE(marshaller->marshallEach(
+            written, "o", [&] { return next < items->count() ? items->at(next++) : qx::Value(); },
+            nullptr, layout));
+        EXPECT_EQ(written.str(), marshaller->writeString(whole, nullptr, layout).str());
+    }
+}
+
+TEST(Sequences, AreWrittenWholeOrNotAtAll) {
+    const auto marshaller = scenario::marshaller(mapping);
+    const TemporaryFolder folder;
+    const qx::String path = folder.write("items.xml", "old");
+    const auto items = marshaller->readString("<o><item id='1'/><item id='2'/></o>")
+                           ->valueForKey("items")
+                           .as<qx::Array>();
+    const auto write = [&](const char* root, std::size_t many, const char* last) {
+        std::size_t next = 0;
+        Ref<qx::Error> error;
+        marshaller->marshallEach(
+            path, root,
+            [&]() -> qx::Value {
+                if (next++ < many)
+                    return items->at(next % 2);
+                return next == many + 1 && last != nullptr ? qx::Value(last) : qx::Value();
+            },
+            &error);
+        return error ? scenario::told(error) : "";
+    };
+    EXPECT_EQ(write("o", 10'000, "text"),
+              "-211: No mapping definition for class: <string> (Invalid XML)");
+    EXPECT_EQ(write("a b", 1, nullptr),
+              "517: The text cannot be written: a b is no name of an element ()");
+    items->at(0).object()->setValueForKey("\x01", "text");
+    EXPECT_TRUE(write("o", 9, nullptr).find("/item/text()") != std::string::npos);
+    EXPECT_EQ(folder.read("items.xml"), "old");
+    items->at(0).object()->setValueForKey("", "text");
+    EXPECT_EQ(write("o", 10'000, nullptr), "");
+    std::size_t count = 0;
+    EXPECT_TRUE(marshaller->unmarshallEach(path, "item", [&](const Ref<qx::Object>&) { ++count; }));
+    EXPECT_EQ(count, 10'000U);
 }
