@@ -8,7 +8,7 @@ namespace qx {
 
 namespace {
 
-constexpr std::size_t blockSize = 256 * 1024;
+constexpr std::size_t usualSize = 256 * 1024;
 // What is repeated before each piece is at most this part of it.
 constexpr std::size_t shareOfOpening = 4;
 
@@ -38,7 +38,7 @@ XMLParser::Parsed XMLPieces::next(Ref<Error>* error) {
 }
 
 XMLPieces::Found XMLPieces::findCut() {
-    const std::size_t enough = std::max(blockSize, shareOfOpening * _opening.size());
+    const std::size_t enough = std::max(usualSize, shareOfOpening * _opening.size());
     while (true) {
         _splitter.goOver(text(), enough);
         if (_splitter.cut() >= enough || isWorthACut())
@@ -58,18 +58,23 @@ bool XMLPieces::isWorthACut() const {
            _splitter.cut() * shareOfOpening >= _opening.size();
 }
 
-// Of a whole document, or of what no document has so much of in one.
+// Of a whole document, or of what no document has so much of in one: texts and the DOCTYPE have
+// limits, whose characters may be references, and a tag a number of attributes.
 bool XMLPieces::isBeyondLimit() const noexcept {
-    constexpr std::size_t bytesOfCharacter = 16; // as the longest references have them
+    constexpr std::size_t bytesOfCharacter = 16;
+    constexpr std::size_t largestTag = 64 * 1024 * 1024;
+    const std::size_t unfinished = text().size() - _splitter.position();
     return text().size() > xmlLimits::documentSize ||
-           (text().size() - _splitter.position()) / bytesOfCharacter > _options.maximumTextSize;
+           (unfinished > largestTag &&
+            unfinished / bytesOfCharacter >
+                std::max(_options.maximumTextSize, _options.maximumSubsetSize));
 }
 
 void XMLPieces::readMore() {
     _text.erase(0, _start);
     _start = 0;
     try {
-        _source.read(std::max(blockSize, _text.size()), _text, &_failure);
+        _source.read(_text, &_failure);
     } catch (const ParseFailure& failure) {
         _undecoded = failure;
     }

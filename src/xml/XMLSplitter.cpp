@@ -47,6 +47,7 @@ void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
 
 void XMLSplitter::removeUpToCut() {
     _at -= _cut;
+    _seen -= std::min(_seen, _cut);
     _cut = 0;
     _itemCount = 0;
     for (Open& open : _open)
@@ -74,9 +75,12 @@ bool XMLSplitter::fail() {
 
 // Behind something that is whole. False where the text ends before.
 bool XMLSplitter::pass(End end) {
-    if (end == none)
+    if (end == none) {
+        _seen = std::max(_seen, _text.size());
         return false;
+    }
     _at = end;
+    _seen = 0;
     if (_depth == 0 && (!_open.empty() || !_root.empty()))
         _cut = end;
     return true;
@@ -84,7 +88,7 @@ bool XMLSplitter::pass(End end) {
 
 bool XMLSplitter::goOverNext() {
     if (_text[_at] != '<')
-        return pass(_text.find('<', _at));
+        return pass(_text.find('<', resume(0)));
     if (_at + 1 == _text.size())
         return false;
     switch (_text[_at + 1]) {
@@ -100,7 +104,9 @@ bool XMLSplitter::goOverNext() {
 }
 
 XMLSplitter::End XMLSplitter::behind(std::string_view mark, std::size_t from) const {
-    const std::size_t at = _text.find(mark, from);
+    // The mark may have been cut off.
+    const std::size_t seen = _seen - std::min(_seen, mark.size() - 1);
+    const std::size_t at = _text.find(mark, std::max(from, seen));
     return at != none ? at + mark.size() : none;
 }
 
@@ -115,6 +121,9 @@ bool XMLSplitter::goOverDeclaration() {
             return false;
     if (!rest.starts_with(doctype) || !_open.empty() || !_root.empty())
         return fail();
+    // It is looked through again only when it is twice as long as before.
+    if (_text.size() - _at < 2 * (_seen - std::min(_seen, _at)))
+        return false;
     const End end = endOfDoctype();
     if (end != none)
         _prologue += _text.substr(_at, end - _at);
@@ -123,9 +132,13 @@ bool XMLSplitter::goOverDeclaration() {
 
 // Its own ">": none of the declarations in it.
 XMLSplitter::End XMLSplitter::endOfDoctype() const {
+    const auto behind = [this](std::string_view mark, std::size_t from) {
+        const std::size_t at = _text.find(mark, from);
+        return at != none ? at + mark.size() : none;
+    };
     bool isInSubset = false;
     std::size_t at = _at + doctype.size();
-    while ((at = _text.find_first_of("\"'[]<>", at)) != none) {
+    while (at != none && (at = _text.find_first_of("\"'[]<>", at)) != none) {
         const char c = _text[at];
         if (c == '>' && !isInSubset)
             return at + 1;
@@ -139,8 +152,6 @@ XMLSplitter::End XMLSplitter::endOfDoctype() const {
             at = behind("?>", at);
         else
             ++at;
-        if (at == none)
-            break;
     }
     return none;
 }
@@ -154,36 +165,48 @@ bool XMLSplitter::goOverInstruction() {
     return pass(end);
 }
 
-// Behind the ">" that no quotes hold.
+// Behind the ">" that no quotes hold. No "<" may come before.
 XMLSplitter::End XMLSplitter::endOfTag() {
     static constexpr auto marks = tagMarks();
-    std::size_t at = _at + 1;
-    while (true) {
-        while (at < _text.size() && !marks[static_cast<unsigned char>(_text[at])])
-            ++at;
-        if (at == _text.size())
-            return none;
+    for (std::size_t at = resume(1); at < _text.size(); ++at) {
         const char c = _text[at];
-        if (c == '>')
-            return at + 1;
-        if (c == '<')
-            break;
-        const std::size_t quote = _text.find(c, at + 1);
-        const std::string_view value = _text.substr(at + 1, quote - at - 1);
-        if (value.find('<') != none)
-            break;
-        if (quote == none)
+        if (!marks[static_cast<unsigned char>(c)])
+            continue;
+        if (c == '<') {
+            fail();
             return none;
-        at = quote + 1;
+        }
+        if (c == '>' && _quote == 0)
+            return at + 1;
+        if (c == '"' || c == '\'')
+            _quote = _quote == 0 ? c : _quote == c ? '\0' : _quote;
     }
-    fail();
     return none;
+}
+
+// The start tag without the attributes that mean nothing inside the element: those may bring in
+// much. One that is no tag stays as it is.
+std::string XMLSplitter::reopened(std::string_view tag, std::size_t nameSize) {
+    std::string kept(tag.substr(0, nameSize + 1));
+    for (std::size_t at = nameSize + 1;;) {
+        at = std::min(tag.find_first_not_of(" \t\r\n", at), tag.size() - 1);
+        if (tag[at] == '>' || tag[at] == '/')
+            return kept += '>';
+        const std::size_t quote = tag.find_first_of("\"'", at);
+        const std::size_t end = quote != none ? tag.find(tag[quote], quote + 1) : none;
+        if (end == none)
+            return std::string(tag);
+        const std::string_view attribute = tag.substr(at, end + 1 - at);
+        if (attribute.starts_with("xml"))
+            kept.append(" ").append(attribute);
+        at = end + 1;
+    }
 }
 
 bool XMLSplitter::goOverStartTag() {
     const End end = endOfTag();
     if (end == none)
-        return false;
+        return pass(end);
     const std::string_view tag = _text.substr(_at, end - _at);
     const bool isEmpty = tag[tag.size() - 2] == '/';
     if (_depth != 0) {
@@ -197,14 +220,14 @@ bool XMLSplitter::goOverStartTag() {
     if (isItem)
         _depth = 1;
     else
-        _open.push_back({std::string(tag), nameSize, _at});
+        _open.push_back({reopened(tag, nameSize), nameSize, _at});
     return isEmpty ? endElement(end) : pass(end);
 }
 
 bool XMLSplitter::goOverEndTag() {
-    const std::size_t mark = _text.find_first_of("<>", _at + 1);
+    const std::size_t mark = _text.find_first_of("<>", resume(1));
     if (mark == none)
-        return false;
+        return pass(none);
     if (_text[mark] == '<')
         return fail();
     const End end = mark + 1;

@@ -8,12 +8,14 @@
 //    one name that stand in no other of that name,
 // 2. an item as a whole,
 //
-// but not before its root begins. The same text may be shown again, longer, until there is a cut.
+// but not before its root begins. The same text is shown again, longer, until there is a cut; what
+// was looked at is not looked at again.
 
 #include <QXXMLMarshalling/base/String.h>
 
 #include "xml/XMLIndex.h"
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -55,7 +57,7 @@ public:
 
 private:
     struct Open {
-        std::string tag; // the whole start tag
+        std::string tag; // the start tag, of its attributes those that hold inside
         std::size_t nameSize;
         std::size_t place;
         std::string_view name() const noexcept { return std::string_view(tag).substr(1, nameSize); }
@@ -72,8 +74,11 @@ private:
     End behind(std::string_view mark, std::size_t from) const;
     End endOfTag();
     End endOfDoctype() const;
+    static std::string reopened(std::string_view tag, std::size_t nameSize);
     bool pass(End end);
     bool fail();
+    // Where to go on with what begins at _at, of which so much is a start.
+    std::size_t resume(std::size_t start) const noexcept { return std::max(_at + start, _seen); }
 
     bool isItemName(std::string_view name) const noexcept;
 
@@ -81,6 +86,8 @@ private:
     String _itemName;
     std::string_view _text;
     std::size_t _at = 0;
+    std::size_t _seen = 0; // up to here what begins at _at does not end
+    char _quote = 0;       // that is open there, in a tag
     std::size_t _cut = 0;
     std::size_t _itemCount = 0;
     std::size_t _depth = 0; // of elements inside an item

@@ -4,15 +4,15 @@
 
 namespace qx {
 
-bool XMLTextSource::readBytes(std::size_t most, std::string& to, Ref<Error>* error) {
-    const std::size_t before = to.size();
-    to.resize(before + most);
-    const auto count = _bytes.read(to.data() + before, most, error);
-    to.resize(before + count.value_or(0));
-    _isAtEnd = count == std::size_t(0);
-    _isWaiting = count.value_or(0) < most;
-    _bytesRead += count.value_or(0);
-    return count.has_value();
+bool XMLTextSource::readBytes(std::string& to, Ref<Error>* error) {
+    const auto count = _bytes.read(_block.get(), blockSize, error);
+    if (!count)
+        return false;
+    to.append(_block.get(), *count);
+    _isAtEnd = *count == 0;
+    _isWaiting = *count < blockSize;
+    _bytesRead += *count;
+    return true;
 }
 
 // The bytes in which the encoding shows.
@@ -20,7 +20,7 @@ bool XMLTextSource::readStart(Ref<Error>* error) {
     constexpr std::size_t longestDeclaration = 4096;
     while (!_isAtEnd && _raw.size() < longestDeclaration &&
            (_raw.size() < 5 || (_raw.starts_with("<?xml") && _raw.find("?>") == std::string::npos)))
-        if (!readBytes(longestDeclaration, _raw, error))
+        if (!readBytes(_raw, error))
             return false;
     _encoding = encodingOf(_raw);
     _raw.erase(0, _encoding->markSize);
@@ -32,9 +32,9 @@ bool XMLTextSource::readStart(Ref<Error>* error) {
     return true;
 }
 
-bool XMLTextSource::read(std::size_t most, std::string& text, Ref<Error>* error) {
+bool XMLTextSource::read(std::string& text, Ref<Error>* error) {
     const bool isStart = !_encoding;
-    if (!(isStart ? readStart(error) : readBytes(most, _decoder ? _raw : text, error)))
+    if (!(isStart ? readStart(error) : readBytes(_decoder ? _raw : text, error)))
         return false;
     if (_decoder)
         decode(text);
