@@ -9,6 +9,8 @@
 #include <algorithm>
 #include <chrono>
 #include <iostream>
+#include <memory>
+#include <numbers>
 
 namespace {
 
@@ -64,6 +66,36 @@ bool addStage(QXXMLMarshaller& marshaller, const std::string& path) {
 bool hasPhoto(const Trip& trip) {
     const auto& children = trip.unknown.children();
     return children && children->get("photo") != nullptr;
+}
+// end of sample
+
+// sample: shapes
+struct Shape {
+    virtual ~Shape() = default;
+    virtual double area() const = 0;
+};
+struct Circle : Shape {
+    double radius = 0;
+    double area() const override { return std::numbers::pi * radius * radius; }
+};
+struct Square : Shape {
+    double side = 0;
+    double area() const override { return side * side; }
+};
+struct Drawing {
+    std::vector<std::unique_ptr<Shape>> shapes;
+};
+
+void describeShapes() {
+    qx::Class::define<Circle, Shape>("Circle").members<&Circle::radius>();
+    qx::Class::define<Square, Shape>("Square").members<&Square::side>();
+    qx::Class::define<Drawing>("Drawing").members<&Drawing::shapes>();
+}
+// end of sample
+
+// sample: layout
+qx::String compact(QXXMLMarshaller& marshaller, const Trip& trip) {
+    return marshaller.writeString(trip, nullptr, qx::XMLCompactEmptyElements); // one line, <photo/>
 }
 // end of sample
 
@@ -148,6 +180,40 @@ TEST_F(Cookbook, RefusesWhatMembersDoNotTake) {
               "-211: The root is of class: Folder, not of class: Trip (Invalid Mapping)");
     EXPECT_EQ(told("<journey/>"),
               "-211: No definition to handle element: <journey></journey> (Invalid Mapping)");
+}
+
+TEST_F(Cookbook, HoldsShapesOfSeveralKinds) {
+    describeShapes();
+    const auto drawer = scenario::marshaller(
+        "<Drawing xml='drawing'><shapes collection='array' name='shapes'/></Drawing>"
+        "<Circle xml='circle'><radius node='attribute'/></Circle>"
+        "<Square xml='square'><side node='attribute'/></Square>");
+    const std::string text = "<drawing><shapes><square side=\"2\"></square><circle radius=\"1\">"
+                             "</circle></shapes></drawing>";
+    const auto drawing = drawer->readString<Drawing>(text);
+    ASSERT_TRUE(drawing);
+    EXPECT_EQ(drawing->shapes.at(0)->area(), 4);
+    EXPECT_EQ(drawer->marshall(*drawing)->rootElement()->XMLString().str(), text);
+    for (const char* name : {"Circle", "Square", "Drawing"})
+        qx::Class::forget(name);
+}
+
+TEST_F(Cookbook, MatchesByNamespaceAndWritesOtherLayouts) {
+    const auto trip = marshaller->readString<Trip>(document);
+    EXPECT_NE(compact(*marshaller, *trip).view().find("map=\"12\"><tag>hills</tag>"),
+              std::string_view::npos);
+    EXPECT_NE(compact(*marshaller, *trip).view().find("<photo/></trip>"), std::string_view::npos);
+    const auto reader = scenario::marshaller("<Feed xml='feed'><id node='element'/></Feed>");
+    qx::Ref<qx::Error> error;
+    // sample: prefixes
+    reader->setNamespacePrefixes({{"http://www.w3.org/2005/Atom", ""}}, &error);
+    // end of sample
+    const qx::String text =
+        "<a:feed xmlns:a=\"http://www.w3.org/2005/Atom\"><a:id>7</a:id></a:feed>";
+    const auto feed = reader->readString(text);
+    ASSERT_TRUE(feed);
+    EXPECT_EQ(feed->valueForKey("id").string(), "7");
+    EXPECT_EQ(reader->marshall(feed)->rootElement()->XMLString(), text);
 }
 
 TEST_F(Cookbook, ReadsIntoWhatIsThere) {

@@ -50,6 +50,9 @@ void XMLSplitter::removeUpToCut() {
     _seen -= std::min(_seen, _cut);
     _cut = 0;
     _itemCount = 0;
+    // What comes before a root goes with some declaration: a text of nothing is another fault.
+    if (_prologue.empty())
+        _prologue = "<?xml version=\"1.0\"?>";
     for (Open& open : _open)
         open.place = none;
 }
@@ -62,11 +65,14 @@ std::string XMLSplitter::opening() const {
 }
 
 std::string XMLSplitter::closing() const {
-    std::string text;
+    std::string text = _open.empty() && _root.empty() ? noItem() : "";
     for (auto open = _open.rbegin(); open != _open.rend(); ++open)
         text.append("</").append(open->name()).append(">");
     return text;
 }
+
+// An empty root.
+std::string XMLSplitter::noItem() const { return _itemName == "a" ? "<b/>" : "<a/>"; }
 
 bool XMLSplitter::fail() {
     _isFaulty = true;
@@ -81,7 +87,7 @@ bool XMLSplitter::pass(End end) {
     }
     _at = end;
     _seen = 0;
-    if (_depth == 0 && (!_open.empty() || !_root.empty()))
+    if (_depth == 0)
         _cut = end;
     return true;
 }
@@ -246,7 +252,7 @@ bool XMLSplitter::endElement(End end) {
         ++_itemCount;
     // No name of an item, whatever the root was called.
     if (_depth == 0 && _open.empty())
-        _root = _itemName == "a" ? "<b/>" : "<a/>";
+        _root = noItem();
     return pass(end);
 }
 

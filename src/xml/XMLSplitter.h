@@ -6,9 +6,9 @@
 //
 // 1. a start tag, an end tag, a text, a comment or an instruction outside of the items: elements of
 //    one name that stand in no other of that name,
-// 2. an item as a whole,
+// 2. an item as a whole.
 //
-// but not before its root begins. The same text is shown again, longer, until there is a cut; what
+// The same text is shown again, longer, until there is a cut; what
 // was looked at is not looked at again.
 
 #include <QXXMLMarshalling/base/String.h>
@@ -75,6 +75,7 @@ private:
     End endOfTag();
     End endOfDoctype() const;
     static std::string reopened(std::string_view tag, std::size_t nameSize);
+    std::string noItem() const;
     bool pass(End end);
     bool fail();
     // Where to go on with what begins at _at, of which so much is a start.

@@ -175,6 +175,11 @@ TEST(Sequences, ATreeLargerThanABlockKeepsItsPlaces) {
     EXPECT_EQ(count, 2'000U);
     ASSERT_TRUE(error);
     EXPECT_EQ(toldWithPlace(error), whole(document).error);
+    const std::string comments = repeated("<!-- no root -->\n", 40'000);
+    EXPECT_EQ(each(comments, 1'000'000).error, whole(comments).error);
+    const std::string late =
+        comments + "<!DOCTYPE all [<!ENTITY e 'e'>]>\n<all><item>&e;</item></all>";
+    EXPECT_EQ(each(late, 1'000'000), whole(late));
 }
 
 TEST(Sequences, StopWhenTheVisitorSaysSoOrAnObjectFails) {
