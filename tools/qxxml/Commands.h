@@ -11,6 +11,8 @@ namespace qxxml {
 std::string describe(const Options& options);
 // The document's object as JSON, see Json.h; "null" for a document that no class handles.
 std::string read(const Options& options);
+// A mapping that fits the documents, or structs that fit this mapping.
+std::string infer(const Options& options);
 // The document, read into an object and written from it.
 std::string roundtrip(const Options& options);
 // The path that a name resolves to, and the places that were looked at up to there.

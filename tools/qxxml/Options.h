@@ -8,9 +8,10 @@
 namespace qxxml {
 
 struct Options {
-    std::string mapping;  // path of the mapping document
-    std::string document; // path of the document; "-" is standard input
-    std::string name;     // what `where` looks for
+    std::string mapping;                // path of the mapping document
+    std::string document;               // path of the document; "-" is standard input
+    std::string name;                   // what `where` looks for
+    std::vector<std::string> documents; // what `infer` goes by
 
     bool strict = false;
     bool discardUnknown = false;
@@ -18,6 +19,8 @@ struct Options {
     bool keepWhiteSpace = false;
     bool noDoctype = false;
     bool pretty = false;
+    bool classes = false;
+    bool keepOrder = false;
 
     // Folders that are searched before the usual places, in this order.
     std::vector<std::string> searchPaths;

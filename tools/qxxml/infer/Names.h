@@ -1,0 +1,28 @@
+#pragma once
+
+// XML names made identifiers: "atom:feed" is the class AtomFeed and the field atomFeed.
+
+#include <set>
+#include <string>
+#include <string_view>
+
+namespace qxxml {
+
+// Names that are told apart by a number behind them: "line", "line2".
+class UniqueNames {
+public:
+    explicit UniqueNames(std::set<std::string> taken = {}) : _taken(std::move(taken)) {}
+    // The name, or the name with the suffix, or that with the first number that is free.
+    std::string add(const std::string& name, const std::string& suffix = "");
+
+private:
+    std::set<std::string> _taken;
+};
+
+std::string classNameOf(std::string_view xmlName);
+std::string fieldNameOf(std::string_view xmlName);
+
+// Behind a keyword of C++ stands an underscore.
+std::string memberNameOf(const std::string& fieldName);
+
+} // namespace qxxml
