@@ -13,11 +13,14 @@ enum class Form { text, object, wrapper, unknown };
 // What is known of an element name besides what was counted.
 struct Shape {
     Form form = Form::object;
-    bool isList = false;            // one untyped collection has all children
-    std::string reason;             // why it is kept as unknown XML
-    std::vector<std::size_t> order; // of the children, by index
-    bool hasOrder = true;           // every element's children stand in it
-    std::string className;          // of those that become classes
+    bool isList = false;             // one untyped collection has all children
+    std::string reason;              // why it is kept as unknown XML
+    std::vector<std::size_t> order;  // of the children, by index
+    std::vector<std::size_t> places; // of each child in that order
+    std::size_t unknownChildren = 0; // and the place of the first of them
+    std::size_t firstUnknown = static_cast<std::size_t>(-1);
+    bool hasOrder = true;  // every element's children stand in it
+    std::string className; // of those that become classes
 };
 
 class Inference {
@@ -30,7 +33,7 @@ public:
 private:
     void orderChildren();
     void findUnknown();
-    std::string reasonAgainst(std::size_t index) const;
+    std::string reasonAgainst(std::size_t parent, std::size_t child);
     bool isTextOnly(std::size_t index) const;
     bool isWrapper(std::size_t index) const;
     void findForms();
@@ -57,6 +60,7 @@ void orderOf(const ElementStatistics& element, Shape& shape) {
     for (const ChildStatistics& child : element.children)
         for (const std::size_t follower : child.followers)
             ++before[follower];
+    shape.places.resize(before.size());
     std::set<std::size_t> waiting;
     std::set<std::size_t> ready;
     for (std::size_t i = 0; i < before.size(); ++i)
@@ -66,6 +70,7 @@ void orderOf(const ElementStatistics& element, Shape& shape) {
         shape.hasOrder = shape.hasOrder && &source == &ready;
         const std::size_t next = *source.begin();
         source.erase(source.begin());
+        shape.places[next] = shape.order.size();
         shape.order.push_back(next);
         for (const std::size_t follower : element.children[next].followers)
             if (--before[follower] == 0 && waiting.erase(follower) != 0)
@@ -80,45 +85,50 @@ void Inference::orderChildren() {
     }
 }
 
-// Empty where a class can have all that elements of the name hold.
-std::string Inference::reasonAgainst(std::size_t index) const {
-    const ElementStatistics& element = _elements[index];
-    const Shape& shape = _shapes[index];
+// Empty where a class can have the texts and elements of those of the name.
+std::string reasonAgainstContent(const ElementStatistics& element) {
     if (element.textAmongChildren > 0)
         return "text stands among its elements";
     if (element.withText > 0 && element.withChildren > 0)
         return "it holds now text, now elements";
-    bool isUnknownBefore = false;
-    for (const std::size_t child : shape.order) {
-        const std::size_t name = element.children[child].element;
-        const bool isUnknown = _shapes[name].form == Form::unknown;
-        if (isUnknown && shape.isList)
-            return "its children come in turns, and <" + _elements[name].name +
-                   "> is kept as unknown XML";
-        if (isUnknownBefore && !isUnknown && _keepsOrder)
-            return "<" + _elements[name].name + "> stands behind unknown XML";
-        isUnknownBefore = isUnknownBefore || isUnknown;
-    }
     return {};
 }
 
-// What is unknown may make its parents unknown; a root is always a class.
+// Unknown XML is written behind the fields. Empty where the parent's order does not suffer.
+std::string Inference::reasonAgainst(std::size_t parent, std::size_t child) {
+    const ElementStatistics& element = _elements[parent];
+    Shape& shape = _shapes[parent];
+    ++shape.unknownChildren;
+    shape.firstUnknown = std::min(shape.firstUnknown, shape.places[element.childIndexes.at(child)]);
+    const std::string name = "<" + _elements[child].name + ">";
+    if (shape.isList)
+        return "its children come in turns, and " + name + " is kept as unknown XML";
+    const bool isLast = shape.firstUnknown + shape.unknownChildren == shape.order.size();
+    return _keepsOrder && !isLast ? name + " is kept as unknown XML, and others stand behind it"
+                                  : "";
+}
+
+// What is unknown may make its parents unknown: each pair of them is looked at once. A root is
+// always a class.
 void Inference::findUnknown() {
-    std::vector<std::size_t> pending(_elements.size());
-    for (std::size_t i = 0; i < pending.size(); ++i)
-        pending[i] = pending.size() - 1 - i;
-    while (!pending.empty()) {
-        const std::size_t index = pending.back();
-        pending.pop_back();
+    std::vector<std::size_t> pending;
+    const auto leave = [&](std::size_t index, const std::string& reason) {
         Shape& shape = _shapes[index];
-        if (shape.form == Form::unknown)
-            continue;
-        shape.reason = reasonAgainst(index);
-        if (shape.reason.empty() || _elements[index].roots > 0)
-            continue;
+        if (reason.empty() || !shape.reason.empty())
+            return;
+        shape.reason = reason;
+        if (_elements[index].roots > 0)
+            return;
         shape.form = Form::unknown;
-        pending.insert(pending.end(), _elements[index].parents.begin(),
-                       _elements[index].parents.end());
+        pending.push_back(index);
+    };
+    for (std::size_t i = 0; i < _elements.size(); ++i)
+        leave(i, reasonAgainstContent(_elements[i]));
+    while (!pending.empty()) {
+        const std::size_t child = pending.back();
+        pending.pop_back();
+        for (const std::size_t parent : _elements[child].parents)
+            leave(parent, reasonAgainst(parent, child));
     }
 }
 

@@ -146,19 +146,23 @@ std::string UniqueNames::add(const std::string& name, const std::string& suffix)
     if (!suffix.empty() && _taken.insert(other).second)
         return other;
     const std::string stem = isDigit(other.back()) ? other + "_" : other;
-    std::size_t number = 2;
-    while (!_taken.insert(stem + std::to_string(number)).second)
-        ++number;
-    return stem + std::to_string(number);
+    std::size_t& number = _numbers.try_emplace(stem, 1).first->second;
+    std::string numbered;
+    do
+        numbered = stem + std::to_string(++number);
+    while (!_taken.insert(numbered).second);
+    return numbered;
 }
 
 std::string classNameOf(std::string_view xmlName) {
     std::string name = joined(xmlName);
     name.front() = upper(name.front());
-    // What the "type" of a field takes for no class, in any case.
+    // What the "type" of a field takes for no class, in any case; and what no struct can be called.
     std::string word = name;
     std::transform(word.begin(), word.end(), word.begin(), lower);
-    if (word == "boolean" || word == "integer" || word == "int" || word == "string")
+    const bool isType = word == "boolean" || word == "integer" || word == "int" || word == "string";
+    const bool isMacro = name == "EOF" || name == "INFINITY" || name == "NAN" || name == "NULL";
+    if (isType || isMacro)
         name += "Element";
     return name;
 }

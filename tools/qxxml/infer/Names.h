@@ -2,6 +2,7 @@
 
 // XML names made identifiers: "atom:feed" is the class AtomFeed and the field atomFeed.
 
+#include <map>
 #include <set>
 #include <string>
 #include <string_view>
@@ -17,6 +18,7 @@ public:
 
 private:
     std::set<std::string> _taken;
+    std::map<std::string, std::size_t> _numbers; // the last one of each name
 };
 
 std::string classNameOf(std::string_view xmlName);
