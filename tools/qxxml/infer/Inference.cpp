@@ -85,12 +85,14 @@ void Inference::orderChildren() {
     }
 }
 
-// Empty where a class can have the texts and elements of those of the name.
+// Empty where a class can have all content of those of the name.
 std::string reasonAgainstContent(const ElementStatistics& element) {
     if (element.textAmongChildren > 0)
         return "text stands among its elements";
     if (element.withText > 0 && element.withChildren > 0)
         return "it holds now text, now elements";
+    if (element.instructions > 0)
+        return "processing instructions stand in it";
     return {};
 }
 
@@ -264,7 +266,7 @@ void Inference::addContent(std::size_t index, UniqueNames& keys, InferredClass& 
         made.remarks.push_back("lost or moved when it is written: " + shape.reason);
     if (!shape.hasOrder && !shape.isList)
         made.remarks.push_back(
-            "children stand in different orders: they are written in this one (or --keep-order)");
+            "children stand in different orders; they are written in this one");
     const std::size_t withText = element.texts.count - element.texts.empty;
     if (element.withChildren == 0 && withText > 0)
         made.fields.push_back({.key = keys.add("text"),

@@ -5,7 +5,7 @@
 //     an element name with attributes, children, or as a root      a class
 //     one with text only                                           a field's text
 //     one with nothing but several elements of one name            the location of a collection
-//     one with text among its elements                             nothing: kept as unknown XML
+//     one with text beside its elements, or processing instructions  nothing: kept as unknown XML
 //
 // A class whose children come in turns (<a/><b/><a/>) gets one untyped collection for all of them,
 // which keeps their order; so all of their names are classes. Such an element that holds one which

@@ -76,15 +76,18 @@ void Statistics::seeChildren(const qx::XMLElement& element, std::size_t index) {
     std::string text;
     bool isParent = false;
     std::size_t previous = none;
+    std::size_t instructions = 0;
     for (const qx::XMLNode& child : element.children()) {
         if (child.kind() == qx::XMLNodeKind::text)
             text += child.stringValue().view();
+        instructions += child.kind() == qx::XMLNodeKind::processingInstruction ? 1 : 0;
         if (!child.isElement())
             continue;
         isParent = true;
         seeChild(index, indexOf(child.name().str()), previous);
     }
     ElementStatistics& statistics = _elements[index];
+    statistics.instructions += instructions;
     if (!isWhiteSpace(text))
         ++(isParent ? statistics.textAmongChildren : statistics.withText);
     if (isParent)

@@ -54,8 +54,9 @@ struct ElementStatistics {
     std::size_t withChildren = 0;
     std::size_t withText = 0; // more than white space, and no elements
     std::size_t textAmongChildren = 0;
-    bool isInterleaved = false; // <a/><b/><a/>: the order of the children carries meaning
-    TextStatistics texts;       // of those without child elements
+    std::size_t instructions = 0; // processing instructions, which no field has
+    bool isInterleaved = false;   // <a/><b/><a/>: the order of the children carries meaning
+    TextStatistics texts;         // of those without child elements
     std::vector<AttributeStatistics> attributes; // here and below in the order of the documents
     std::vector<ChildStatistics> children;
     std::map<Declaration, std::size_t> declarations;
