@@ -265,8 +265,7 @@ void Inference::addContent(std::size_t index, UniqueNames& keys, InferredClass& 
     if (!shape.reason.empty())
         made.remarks.push_back("lost or moved when it is written: " + shape.reason);
     if (!shape.hasOrder && !shape.isList)
-        made.remarks.push_back(
-            "children stand in different orders; they are written in this one");
+        made.remarks.push_back("children stand in different orders; they are written in this one");
     const std::size_t withText = element.texts.count - element.texts.empty;
     if (element.withChildren == 0 && withText > 0)
         made.fields.push_back({.key = keys.add("text"),
