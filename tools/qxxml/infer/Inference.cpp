@@ -42,7 +42,7 @@ private:
     void addNamespace(const ElementStatistics& element, InferredClass& made) const;
     void addAttributes(const ElementStatistics& element, UniqueNames& keys,
                        InferredClass& made) const;
-    void addContent(std::size_t index, UniqueNames& keys, InferredClass& made) const;
+    void addChildren(std::size_t index, UniqueNames& keys, InferredClass& made) const;
     InferredField list(std::size_t index, UniqueNames& keys) const;
     InferredField field(const ElementStatistics& owner, const ChildStatistics& child,
                         UniqueNames& keys) const;
@@ -199,6 +199,27 @@ std::vector<InferredClass> Inference::classes() {
     return made;
 }
 
+InferredType typeOf(const TextStatistics& texts, bool mayBeZero) {
+    if (!mayBeZero && texts.zeros > 0)
+        return InferredType::text;
+    return texts.areIntegers()   ? InferredType::integer
+           : texts.areBooleans() ? InferredType::boolean
+                                 : InferredType::text;
+}
+
+void addText(const ElementStatistics& element, UniqueNames& keys, InferredClass& made) {
+    const std::size_t withText = element.texts.count - element.texts.empty;
+    if (element.withChildren > 0 || withText == 0)
+        return;
+    made.fields.push_back({.key = keys.add("text"),
+                           .kind = InferredKind::text,
+                           .type = typeOf(element.texts, true),
+                           .isRequired = withText == element.count,
+                           .isWholeNumber = element.texts.areIntegers(),
+                           .count = withText,
+                           .holders = withText});
+}
+
 InferredClass Inference::classOf(std::size_t index) const {
     const ElementStatistics& element = _elements[index];
     InferredClass made;
@@ -210,7 +231,8 @@ InferredClass Inference::classOf(std::size_t index) const {
     UniqueNames keys({"unboundChildren", "unboundAttributes"});
     addNamespace(element, made);
     addAttributes(element, keys, made);
-    addContent(index, keys, made);
+    addText(element, keys, made);
+    addChildren(index, keys, made);
     return made;
 }
 
@@ -226,14 +248,6 @@ void Inference::addNamespace(const ElementStatistics& element, InferredClass& ma
         made.nsPrefix = prefix;
         made.nsURI = URI;
     }
-}
-
-InferredType typeOf(const TextStatistics& texts, bool mayBeZero) {
-    if (!mayBeZero && texts.zeros > 0)
-        return InferredType::text;
-    return texts.areIntegers()   ? InferredType::integer
-           : texts.areBooleans() ? InferredType::boolean
-                                 : InferredType::text;
 }
 
 void Inference::addAttributes(const ElementStatistics& element, UniqueNames& keys,
@@ -259,22 +273,13 @@ void Inference::addAttributes(const ElementStatistics& element, UniqueNames& key
     }
 }
 
-void Inference::addContent(std::size_t index, UniqueNames& keys, InferredClass& made) const {
+void Inference::addChildren(std::size_t index, UniqueNames& keys, InferredClass& made) const {
     const ElementStatistics& element = _elements[index];
     const Shape& shape = _shapes[index];
     if (!shape.reason.empty())
         made.remarks.push_back("lost or moved when it is written: " + shape.reason);
     if (!shape.hasOrder && !shape.isList)
         made.remarks.push_back("children stand in different orders; they are written in this one");
-    const std::size_t withText = element.texts.count - element.texts.empty;
-    if (element.withChildren == 0 && withText > 0)
-        made.fields.push_back({.key = keys.add("text"),
-                               .kind = InferredKind::text,
-                               .type = typeOf(element.texts, true),
-                               .isRequired = withText == element.count,
-                               .isWholeNumber = element.texts.areIntegers(),
-                               .count = withText,
-                               .holders = withText});
     if (shape.isList)
         made.fields.push_back(list(index, keys));
     for (const std::size_t number : shape.order) {
