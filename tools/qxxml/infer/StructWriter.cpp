@@ -7,6 +7,10 @@ namespace qxxml {
 
 namespace {
 
+// Compilers bound the classes of a variant, some at 256; far below, nobody wants to write a
+// visitor. An array of any objects takes its place.
+constexpr std::size_t largestVariant = 64;
+
 class StructWriter {
 public:
     explicit StructWriter(const std::vector<InferredClass>& classes) : _classes(classes) {
@@ -93,8 +97,12 @@ std::string joined(const std::vector<std::string>& parts) {
 
 std::string StructWriter::memberType(const InferredField& field) const {
     if (field.kind == InferredKind::mixedCollection)
-        return "std::vector<std::variant<" +
-               (field.itemClasses.empty() ? "std::monostate" : joined(field.itemClasses)) + ">>";
+        return field.itemClasses.size() > largestVariant
+                   ? "qx::Value"
+                   : "std::vector<std::variant<" +
+                         (field.itemClasses.empty() ? "std::monostate"
+                                                    : joined(field.itemClasses)) +
+                         ">>";
     std::string type = field.type == InferredType::object    ? field.className
                        : field.type == InferredType::boolean ? "bool"
                        : field.isWholeNumber                 ? "std::int64_t"
