@@ -221,18 +221,22 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
         return false;
     Ref<Error> failure;
     bool goesOn = true;
-    const auto match = qx::detail::NamespaceMatching::of(*this) != nullptr
-                           ? qx::XMLSplitter::Match::localNames
-                           : qx::XMLSplitter::Match::names;
+    // The visitor may change it: what is an item stays.
+    const auto table = qx::detail::NamespaceMatching::keptOf(*this);
+    const auto match = table ? qx::XMLSplitter::Match::localNames : qx::XMLSplitter::Match::names;
     qx::XMLPieces pieces(source, elementName, match, qx::detail::parsingOf(*this));
     qx::detail::ReadingProgress progress(*this, source.size());
     while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
-        if (!progress.mayPass(pieces.bytesRead(), &failure))
+        if (!progress.startPiece(pieces.bytesRead(), &failure))
             break;
         qx::IndexedXML document(*piece);
+        if (table)
+            document.matchBy(*table);
+        else
+            document.matchAsWritten();
         qx::detail::Unmarshalling reading(*this, document);
         document.forEachOutermost(elementName, [&](qx::IndexedXML::Number item) {
-            const auto object = reading.read(item, &failure);
+            const auto object = reading.read(item, &failure, &progress);
             if (!object && !failure)
                 qx::fail(&failure, qx::errors::noDefinitionForElement,
                          [&] { return document.quoted(item); });

@@ -120,7 +120,7 @@ std::vector<MatchedNames::Declaration> declarationsAround(const XMLElement& elem
 } // namespace
 
 void IndexedXML::matchBy(const NamespaceTable& table) {
-    if (_root == none || !_matched.empty())
+    if (_root == none || _isAsWritten || !_matched.empty())
         return;
     expandAll(_root);
     if (_interned.empty())

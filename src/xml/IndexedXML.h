@@ -35,6 +35,8 @@ public:
     // From here on elements and attributes are matched by namespace (MatchedNames.h), by the first
     // table that is given. A tree is read to its end for that.
     void matchBy(const NamespaceTable& table);
+    // From here on as written, whatever table is given.
+    void matchAsWritten() noexcept { _isAsWritten = true; }
     bool isMatched() const noexcept { return !_matched.empty(); }
 
     // The element that is read; none where there is none.
@@ -148,6 +150,7 @@ private:
     Number _root = none;
     // The names, where the index has not all that are known by now, or is matched by namespace.
     std::vector<String> _interned;
+    bool _isAsWritten = false;
     std::vector<std::uint32_t> _matched; // then: of each entry, its name's number
     std::string _room;
     std::unordered_map<Number, String> _longTexts; // of attributes, texts and elements

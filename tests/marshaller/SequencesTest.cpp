@@ -224,16 +224,18 @@ TEST(Sequences, AReadingTellsHowFarItIsAndCanBeCancelled) {
         EXPECT_LE(progress.bytesRead, document.size());
         return told.size() < most;
     });
-    const auto readEach = [&](Ref<qx::Error>* error) {
+    const auto readEach = [&](Ref<qx::Error>* error, const char* name = "item") {
         std::istringstream stream(document);
         return marshaller->unmarshallEach(
-            stream, "item", [](const Ref<qx::Object>&) {}, error);
+            stream, name, [](const Ref<qx::Object>&) {}, error);
     };
     using Megabytes = std::vector<std::uint64_t>;
     EXPECT_TRUE(marshaller->readString(document));
     EXPECT_EQ(std::exchange(told, {}), (Megabytes{1, 2, 3}));
     EXPECT_TRUE(readEach(nullptr));
     EXPECT_EQ(std::exchange(told, {}), (Megabytes{1, 2, 3}));
+    EXPECT_TRUE(readEach(nullptr, "o"));
+    EXPECT_EQ(std::exchange(told, {}).size(), 3U) << "inside of one object";
     most = 2;
     EXPECT_FALSE(marshaller->readString(document)) << "without a slot, too";
     EXPECT_EQ(std::exchange(told, {}), (Megabytes{1, 2}));

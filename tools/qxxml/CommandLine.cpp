@@ -98,6 +98,19 @@ void addReading(CLI::App& command, Options& options) {
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
+void addInferring(CLI::App& command, Options& options) {
+    command
+        .add_option("DOCUMENT", options.documents, "The paths of documents; - is standard input")
+        ->option_text("...")
+        ->required();
+    command.add_flag("--classes", options.classes,
+                     "Print C++ structs for the mapping instead of it");
+    command.add_flag("--keep-order", options.keepOrder,
+                     "Keep the order of children that stand in different ones, in an untyped "
+                     "collection");
+    command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
+}
+
 // Defines the commands; the one that was called is left in `chosen`.
 void define(CLI::App& tool, Options& options, Command& chosen) {
     tool.require_subcommand(1);
@@ -126,6 +139,9 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
     addReading(*command, options);
     command->add_flag("--pretty", options.pretty, "Print one element a line");
     addSearch(*command, options);
+
+    command = add("infer", "Print a mapping that fits documents which have none", infer);
+    addInferring(*command, options);
 
     command =
         add("where", "Print the file that a name resolves to, and where it was looked for", where);

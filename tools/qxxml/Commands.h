@@ -14,6 +14,8 @@ std::string describe(const Options& options);
 std::string read(const Options& options);
 // An object a line as JSON, of each of the document's elements of one name.
 std::string readEach(const Options& options);
+// A mapping that fits the documents, or structs that fit this mapping.
+std::string infer(const Options& options);
 // The document, read into an object and written from it.
 std::string roundtrip(const Options& options);
 // The path that a name resolves to, and the places that were looked at up to there.

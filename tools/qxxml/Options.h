@@ -12,6 +12,7 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
+    std::vector<std::string> documents; // what `infer` goes by
 
     bool strict = false;
     bool discardUnknown = false;
@@ -19,6 +20,8 @@ struct Options {
     bool keepWhiteSpace = false;
     bool noDoctype = false;
     bool pretty = false;
+    bool classes = false;
+    bool keepOrder = false;
     bool matchNamespaces = false;
 
     // PREFIX=URI each, an empty prefix for names without one.
