@@ -37,7 +37,6 @@
 #include <typeinfo>
 
 namespace qx {
-class ByteSink;
 class ByteSource;
 class NamespaceTable;
 namespace detail {
@@ -472,8 +471,6 @@ private:
     bool writeEach(const qx::String& path, const qx::String& rootName, Producer next,
                    qx::Ref<qx::Error>* error, qx::XMLOptions layout);
     bool writeEach(std::ostream& stream, const qx::String& rootName, Producer next,
-                   qx::Ref<qx::Error>* error, qx::XMLOptions layout);
-    bool writeEach(qx::ByteSink& sink, const qx::String& rootName, Producer next,
                    qx::Ref<qx::Error>* error, qx::XMLOptions layout);
 
     // -211 for an object that is not of that type.

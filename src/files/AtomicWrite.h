@@ -4,8 +4,6 @@
 
 #include <QXXMLMarshalling/model/Error.h>
 
-#include "files/ByteSink.h"
-
 #include <memory>
 
 namespace qx {
@@ -28,17 +26,17 @@ bool writeFileAtomically(const String& path, std::string_view bytes, Ref<Error>*
 
 // The same, of bytes that come one after another. Until commit() the old file is untouched; what
 // was not committed goes with the object.
-class AtomicFile final : public ByteSink {
+class AtomicFile {
 public:
     explicit AtomicFile(String path);
     AtomicFile(const AtomicFile&) = delete;
     AtomicFile& operator=(const AtomicFile&) = delete;
-    ~AtomicFile() override;
+    ~AtomicFile();
 
     // Before anything else.
-    bool open(Ref<Error>* error) override;
-    bool write(std::string_view bytes, Ref<Error>* error) override;
-    bool commit(Ref<Error>* error) override;
+    bool open(Ref<Error>* error);
+    bool write(std::string_view bytes, Ref<Error>* error);
+    bool commit(Ref<Error>* error);
 
 private:
     struct State;

@@ -34,6 +34,8 @@ bool Reloading::isOfSameClass(const Object& held, const Object& fresh) {
 }
 
 bool Reloading::run(const ClassPlan& plan, Object& held, Object& fresh, Ref<Error>* error) {
+    if (StructObject* const whole = structIn(Value(&held)))
+        _taken.insert(whole->as(whole->type()));
     takeOver(plan, held, fresh);
     if (!_problem)
         return true;

@@ -52,6 +52,52 @@ bool print(const QXXMLMarshaller& marshaller, const qx::Value& object, qx::XMLOp
     });
 }
 
+// A document of the objects that next() answers, until that is null. The sink opens, takes bytes
+// and is committed at the end.
+template <class Sink>
+bool writeSequence(QXXMLMarshaller& marshaller, Sink& sink, const String& rootName,
+                   qx::detail::UniqueFunction<qx::Value()>& next, Ref<Error>* error,
+                   qx::XMLOptions layout) {
+    constexpr std::size_t blockSize = 64 * 1024;
+    reset(error);
+    const Ref<QXXMLMarshaller> held(&marshaller); // the producer may let go of it
+    if (!qx::isXMLName(rootName))
+        return qx::fail(error, qx::errors::textCannotBeWritten,
+                        String::concat({rootName, " is no name of an element"}));
+    if (!sink.open(error))
+        return false;
+    const std::string_view lineEnd = (layout & qx::XMLPrettyPrint) != 0 ? "\n" : "";
+    std::string_view beforeEnd;
+    qx::TextBuffer text;
+    text +=
+        String::concat({"<?xml version=\"1.0\" encoding=\"UTF-8\"?>", lineEnd, "<", rootName, ">"})
+            .view();
+    for (qx::Value object = next(); !object.isNull(); object = next()) {
+        const bool isPrinted =
+            printed(marshaller, object, error, [&](const auto& element, const auto& reading) {
+                qx::writeDraftInside(element, layout, reading, text);
+            });
+        beforeEnd = lineEnd;
+        if (!isPrinted || (text.size() >= blockSize && !sink.write(text.take(), error)))
+            return false;
+    }
+    text += String::concat({beforeEnd, "</", rootName, ">", lineEnd}).view();
+    return sink.write(text.view(), error) && sink.commit(error);
+}
+
+class StreamSink {
+public:
+    explicit StreamSink(std::ostream& stream) noexcept : _stream(stream) {}
+    static bool open(Ref<Error>*) { return true; }
+    bool write(std::string_view bytes, Ref<Error>* error) {
+        return qx::writeToStream(_stream, bytes, error);
+    }
+    static bool commit(Ref<Error>*) { return true; }
+
+private:
+    std::ostream& _stream;
+};
+
 } // namespace
 
 String QXXMLMarshaller::writeString(const qx::Value& object, Ref<Error>* error,
@@ -77,40 +123,11 @@ bool QXXMLMarshaller::writeStream(const qx::Value& object, std::ostream& stream,
 bool QXXMLMarshaller::writeEach(const String& path, const String& rootName, Producer next,
                                 Ref<Error>* error, qx::XMLOptions layout) {
     qx::AtomicFile file(path);
-    return writeEach(file, rootName, std::move(next), error, layout);
+    return writeSequence(*this, file, rootName, next, error, layout);
 }
 
 bool QXXMLMarshaller::writeEach(std::ostream& stream, const String& rootName, Producer next,
                                 Ref<Error>* error, qx::XMLOptions layout) {
-    qx::StreamSink sink(stream);
-    return writeEach(sink, rootName, std::move(next), error, layout);
-}
-
-bool QXXMLMarshaller::writeEach(qx::ByteSink& sink, const String& rootName, Producer next,
-                                Ref<Error>* error, qx::XMLOptions layout) {
-    constexpr std::size_t blockSize = 64 * 1024;
-    reset(error);
-    const Ref<QXXMLMarshaller> held(this); // the producer may let go of it
-    if (!qx::isXMLName(rootName))
-        return qx::fail(error, qx::errors::textCannotBeWritten,
-                        String::concat({rootName, " is no name of an element"}));
-    if (!sink.open(error))
-        return false;
-    const std::string_view lineEnd = (layout & qx::XMLPrettyPrint) != 0 ? "\n" : "";
-    std::string_view beforeEnd;
-    qx::TextBuffer text;
-    text +=
-        String::concat({"<?xml version=\"1.0\" encoding=\"UTF-8\"?>", lineEnd, "<", rootName, ">"})
-            .view();
-    for (qx::Value object = next(); !object.isNull(); object = next()) {
-        const bool isPrinted =
-            printed(*this, object, error, [&](const auto& element, const auto& reading) {
-                qx::writeDraftInside(element, layout, reading, text);
-            });
-        beforeEnd = lineEnd;
-        if (!isPrinted || (text.size() >= blockSize && !sink.write(text.take(), error)))
-            return false;
-    }
-    text += String::concat({beforeEnd, "</", rootName, ">", lineEnd}).view();
-    return sink.write(text.view(), error) && sink.commit(error);
+    StreamSink sink(stream);
+    return writeSequence(*this, sink, rootName, next, error, layout);
 }

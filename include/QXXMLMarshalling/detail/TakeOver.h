@@ -4,6 +4,10 @@
 // stay where they are and take over in their turn where both sides hold one of the same class;
 // items of collections are matched by place. All else is moved. Afterwards the new object is of no
 // use any more.
+//
+// Setters of a host may be called meanwhile, and let go of what is being read into. So the contents
+// of a list, an optional and the like are taken out until they are done: what a setter puts in
+// their place then gives way to them.
 
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
@@ -37,6 +41,22 @@ struct MemberTakeOver {
     }
 };
 
+// Takes a value out of its place for a time.
+template <class T>
+class TakenOut {
+public:
+    explicit TakenOut(T& place) : _place(place), value(std::move(place)) {}
+    ~TakenOut() { _place = std::move(value); }
+    TakenOut(const TakenOut&) = delete;
+    TakenOut& operator=(const TakenOut&) = delete;
+
+private:
+    T& _place;
+
+public:
+    T value;
+};
+
 // For a place where nothing is held yet.
 template <class T>
 T taken(T& fresh, TakeOver& way) {
@@ -67,10 +87,10 @@ struct MemberTakeOver<std::optional<T>> {
     static void apply(std::optional<T>& held, std::optional<T>& fresh, TakeOver& way) {
         if (!fresh)
             held.reset();
-        else if (held)
-            MemberTakeOver<T>::apply(*held, *fresh, way);
+        else if (TakenOut<std::optional<T>> out(held); out.value)
+            MemberTakeOver<T>::apply(*out.value, *fresh, way);
         else
-            held.emplace(taken(*fresh, way));
+            out.value.emplace(taken(*fresh, way));
     }
 };
 
@@ -78,10 +98,12 @@ struct MemberTakeOver<std::optional<T>> {
 template <class Pointer, bool isShared>
 struct OwnerTakeOver {
     static void apply(Pointer& held, Pointer& fresh, TakeOver& way) {
+        TakenOut<Pointer> out(held);
         if constexpr (Struct<typename Pointer::element_type>)
-            if (held && fresh && way.mergeStructs(wholeOf(*held), wholeOf(*fresh), isShared))
+            if (out.value && fresh &&
+                way.mergeStructs(wholeOf(*out.value), wholeOf(*fresh), isShared))
                 return;
-        held = std::move(fresh);
+        out.value = std::move(fresh);
     }
 };
 template <class T>
@@ -92,7 +114,9 @@ struct MemberTakeOver<std::shared_ptr<T>> : OwnerTakeOver<std::shared_ptr<T>, tr
 template <class... T>
 struct MemberTakeOver<std::variant<T...>> {
     using Variant = std::variant<T...>;
-    static void apply(Variant& held, Variant& fresh, TakeOver& way) {
+    static void apply(Variant& place, Variant& fresh, TakeOver& way) {
+        TakenOut<Variant> out(place);
+        Variant& held = out.value;
         [&]<std::size_t... I>(std::index_sequence<I...>) {
             ((fresh.index() == I ? applyOne<I>(held, fresh, way) : void()), ...);
         }
@@ -113,7 +137,9 @@ private:
 
 template <class T>
 requires(!std::is_trivially_copyable_v<T>) struct MemberTakeOver<std::vector<T>> {
-    static void apply(std::vector<T>& held, std::vector<T>& fresh, TakeOver& way) {
+    static void apply(std::vector<T>& place, std::vector<T>& fresh, TakeOver& way) {
+        TakenOut<std::vector<T>> out(place);
+        std::vector<T>& held = out.value;
         const std::size_t common = std::min(held.size(), fresh.size());
         for (std::size_t i = 0; i < common; ++i)
             MemberTakeOver<T>::apply(held[i], fresh[i], way);
