@@ -28,9 +28,9 @@ struct Series {
 };
 
 const Series allSeries[] = {
-    {"libxml2, empty pass", "records", "passMs", "#777777"},
+    {"libxml2, empty pass", "read", "passMs", "#777777"},
     {"pugixml by hand, structs", "pugixmlStructs", "ms", "#d95f02"},
-    {"records", "records", "ms", "#1b6ca8"},
+    {"records", "read", "ms", "#1b6ca8"},
     {"plain structs", "structs", "ms", "#2a9d5c"},
     {"unmarshallEach, records", "eachRecord", "ms", "#8e44ad"},
 };

@@ -15,10 +15,10 @@ struct Row {
 const Row unitRows[] = {
     {"index of a document", "index/60", 0.4},
     {"bytes to the node tree", "tree/60", 0},
-    {"bytes to records, freed", "records/60", 1.2},
+    {"bytes to records, freed", "read/60", 1.2},
     {"bytes to host classes, freed", "hostClasses/60", 1.2},
     {"bytes to plain structs, freed", "structs/60", 1.1},
-    {"records to bytes", "writeRecords/60", 1.3},
+    {"records to bytes", "write/60", 1.3},
     {"structs to bytes", "writeStructs/60", 1.3},
     {"unmarshallEach, records dropped", "eachRecord/60", 1.0},
     {"unmarshallEach, structs dropped", "eachStruct/60", 1.0},
@@ -60,7 +60,7 @@ void print(const char* work, double value, double goal, const char* unit) {
 } // namespace
 
 void Results::add(const benchmark::BenchmarkReporter::Run& run) {
-    // "records/60/iterations:5/manual_time" is kept as "records/60".
+    // "read/60/iterations:5/manual_time" is kept as "read/60".
     const std::string name = run.benchmark_name();
     auto end = name.find('/');
     if (end != std::string::npos && name.compare(end, 12, "/iterations:") != 0)
@@ -91,9 +91,9 @@ void Results::printTable() const {
     for (const Row& row : unitRows)
         print(row.work, counter(row.name, "units"), row.goal, "units");
     print("documents of 0.9 kB beside one of all their bytes",
-          ratio("smallDocuments/60", "units", "records/60"), 1.3, "times");
-    print("a megabyte of 600 beside one alone, to records",
-          ratio("records/600", "ms", "records/1") / 600, 1.2, "times");
+          ratio("smallDocuments/60", "units", "read/60"), 1.3, "times");
+    print("a megabyte of 600 beside one alone, to records", ratio("read/600", "ms", "read/1") / 600,
+          1.2, "times");
     print("an included mapping of 1,000 beside one of 100",
           ratio("include/1000", "realTime", "include/100") / 10, 0, "times");
     for (const Row& row : peakRows)

@@ -21,7 +21,7 @@ public:
     bool plot(const std::string& path) const;
 
 private:
-    // 0 when the run did not have it. "records/60" is a benchmark's name without its settings.
+    // 0 when the run did not have it. "read/60" is a benchmark's name without its settings.
     double counter(const std::string& name, const char* counter) const;
     double ratio(const std::string& name, const char* counter, const std::string& other) const;
 

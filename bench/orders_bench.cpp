@@ -27,7 +27,7 @@ void tree(benchmark::State& state) {
     });
 }
 
-void records(benchmark::State& state) {
+void read(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     const auto reader = marshaller();
     besideUnit(state, xml, [&] { return reader->readString(xml).get() != nullptr; });
@@ -51,7 +51,7 @@ void structs(benchmark::State& state) {
     });
 }
 
-void writeRecords(benchmark::State& state) {
+void write(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     const auto writer = marshaller();
     const auto object = writer->readString(xml);
@@ -109,11 +109,11 @@ void smallDocuments(benchmark::State& state) {
 
 BENCHMARK(index)->Apply(once);
 BENCHMARK(tree)->Apply(once);
-BENCHMARK(records)->Apply(sizes);
+BENCHMARK(read)->Apply(sizes);
 BENCHMARK(smallDocuments)->Apply(once);
 BENCHMARK(hostClasses)->Apply(once);
 BENCHMARK(structs)->Apply(sizes);
-BENCHMARK(writeRecords)->Apply(once);
+BENCHMARK(write)->Apply(once);
 BENCHMARK(writeStructs)->Apply(once);
 BENCHMARK(eachRecord)->Apply(sizes);
 BENCHMARK(eachStruct)->Apply(once);
