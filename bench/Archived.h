@@ -1,12 +1,12 @@
 #pragma once
 
-// The orders as archives take them: one function names the members of each struct.
+// The orders for libraries that write and read documents of their own form.
 
 #include "Orders.h"
 
 namespace bench {
 
-// Orders whose archive has about as much in it as a document of that many megabytes.
+// About as many orders as a document of that many megabytes has.
 inline Orders ordersToArchive(std::size_t megabytes) {
     Orders orders;
     for (std::size_t i = 0; i < megabytes * 1100; ++i) {
