@@ -41,17 +41,19 @@ bool Units::measure(std::string_view xml, const std::function<bool()>& work) {
     const bool done = work();
     _latest = processorSeconds() - start;
     const double unit = (before + pass()) / 2;
-    if (before > 0)
+    if (before > 0) {
         _units.push_back(_latest / unit);
+        _seconds.push_back(_latest);
+        _passSeconds.push_back(unit);
+    }
     return done && before > 0;
 }
 
-double Units::median() const {
-    if (_units.empty())
+double Units::middle(std::vector<double> measures) {
+    if (measures.empty())
         return 0;
-    std::vector<double> sorted = _units;
-    const auto middle = sorted.begin() + static_cast<std::ptrdiff_t>(sorted.size() / 2);
-    std::nth_element(sorted.begin(), middle, sorted.end());
+    const auto middle = measures.begin() + static_cast<std::ptrdiff_t>(measures.size() / 2);
+    std::nth_element(measures.begin(), middle, measures.end());
     return *middle;
 }
 

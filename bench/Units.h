@@ -19,11 +19,18 @@ public:
     bool measure(std::string_view xml, const std::function<bool()>& work);
     double latestSeconds() const { return _latest; }
     // How many passes the work took; the middle one of all measures.
-    double median() const;
+    double median() const { return middle(_units); }
+    // How long the work took, and how long a pass beside it.
+    double medianSeconds() const { return middle(_seconds); }
+    double medianPassSeconds() const { return middle(_passSeconds); }
 
 private:
+    static double middle(std::vector<double> measures);
+
     double _latest = 0;
     std::vector<double> _units;
+    std::vector<double> _seconds;
+    std::vector<double> _passSeconds;
 };
 
 } // namespace bench

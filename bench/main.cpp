@@ -1,11 +1,12 @@
-// Runs the benchmarks, then tells parsing, reading and writing in units of the parser's own pass
-// and how the time for a megabyte, or an included document, changes with their number.
+// Runs the benchmarks, then prints what they found as a table, in units of the parser's own pass.
+// With --plot FILE it draws time over size, too.
 
-#include <benchmark/benchmark.h>
+#include "Peak.h"
+#include "Results.h"
 
 #include <cstdio>
-#include <map>
-#include <string>
+#include <cstdlib>
+#include <string_view>
 
 namespace {
 
@@ -15,51 +16,46 @@ public:
 
     void ReportRuns(const std::vector<Run>& runs) override {
         ConsoleReporter::ReportRuns(runs);
-        for (const Run& run : runs) {
-            if (run.error_occurred || run.run_type != Run::RT_Iteration)
-                continue;
-            // "read/60/manual_time" is kept as "read/60".
-            const std::string name = run.benchmark_name();
-            const std::string shortName = name.substr(0, name.find('/', name.find('/') + 1));
-            _times[shortName] = run.GetAdjustedRealTime();
-            const auto units = run.counters.find("units");
-            if (units != run.counters.end())
-                _units[shortName] = units->second;
-        }
+        for (const Run& run : runs)
+            if (!run.error_occurred && run.run_type == Run::RT_Iteration)
+                _results.add(run);
     }
 
-    void tellRatios() const {
-        for (const auto& [name, units] : _units)
-            std::printf("%-9s %5.2f units\n", name.c_str(), units);
-        for (const char* work : {"parse", "read", "write"})
-            tellGrowth(work, "megabyte", 1, 60);
-        tellGrowth("include", "document", 100, 1000);
-    }
+    const bench::Results& results() const { return _results; }
 
 private:
-    double time(const std::string& name) const {
-        const auto found = _times.find(name);
-        return found != _times.end() ? found->second : 0;
-    }
-    void tellGrowth(const std::string& work, const char* what, int few, int many) const {
-        const double small = time(work + "/" + std::to_string(few)) / few;
-        const double large = time(work + "/" + std::to_string(many)) / many;
-        if (small > 0 && large > 0)
-            std::printf("%s: a %s among %d takes %.2f times one among %d\n", work.c_str(), what,
-                        many, large / small, few);
-    }
-
-    std::map<std::string, double> _times;
-    std::map<std::string, double> _units;
+    bench::Results _results;
 };
+
+// Takes "--plot FILE" out of the arguments; null where it is not among them.
+const char* takePlot(int& argc, char** argv) {
+    for (int i = 1; i + 1 < argc; ++i)
+        if (std::string_view(argv[i]) == "--plot") {
+            const char* const path = argv[i + 1];
+            for (int rest = i + 2; rest <= argc; ++rest)
+                argv[rest - 2] = argv[rest];
+            argc -= 2;
+            return path;
+        }
+    return nullptr;
+}
 
 } // namespace
 
 int main(int argc, char** argv) {
+    if (argc == 4 && std::string_view(argv[1]) == "--peak")
+        return bench::runPeakWork(argv[2], std::strtoul(argv[3], nullptr, 10));
+    const char* const plot = takePlot(argc, argv);
     benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv))
+        return 2;
     Reporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
-    reporter.tellRatios();
+    reporter.results().printTable();
     benchmark::Shutdown();
+    if (plot && !reporter.results().plot(plot)) {
+        std::fprintf(stderr, "bench: %s cannot be written\n", plot);
+        return 1;
+    }
     return 0;
 }

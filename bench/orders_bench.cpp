@@ -1,55 +1,68 @@
-// Reading and writing documents of nested orders. Beside each pass runs one of the parser with
-// empty callbacks over the same bytes: the unit in which the others are told, since it moves with
-// the machine.
+// Reading and writing documents of nested orders.
 
-#include "Orders.h"
-#include "Units.h"
+#include "Beside.h"
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include <benchmark/benchmark.h>
-
 #include <istream>
-#include <map>
 
 namespace {
 
-constexpr std::size_t megabyte = 1000 * 1000;
-
-const std::string& document(std::int64_t megabytes) {
-    static std::map<std::int64_t, std::string> made;
-    std::string& xml = made[megabytes];
-    if (xml.empty())
-        xml = bench::orders(static_cast<std::size_t>(megabytes) * megabyte);
-    return xml;
-}
+using namespace bench;
 
 qx::Ref<QXXMLMarshaller> marshaller() {
-    const auto mapping = qx::XMLDocument::initWithData(bench::orderMapping);
+    const auto mapping = qx::XMLDocument::initWithData(orderMapping);
     return QXXMLMarshaller::initWithMappingXML(mapping.get());
 }
 
-// Runs work() beside the unit; it returns whether it did what it should.
-template <class Work>
-void besideUnit(benchmark::State& state, const std::string& xml, Work work) {
-    bench::Units units;
-    for (auto _ : state) {
-        if (!units.measure(xml, work))
-            state.SkipWithError("nothing was parsed, read or written");
-        state.SetIterationTime(units.latestSeconds());
-    }
-    state.counters["units"] = units.median();
-}
-
-void parse(benchmark::State& state) {
+// The nodes are made when one is asked for.
+void index(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     besideUnit(state, xml, [&] { return qx::XMLDocument::initWithData(xml).get() != nullptr; });
+}
+void tree(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    besideUnit(state, xml, [&] {
+        return qx::XMLDocument::initWithData(xml)->rootElement()->childCount() != 0;
+    });
 }
 
 void read(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     const auto reader = marshaller();
     besideUnit(state, xml, [&] { return reader->readString(xml).get() != nullptr; });
+}
+void hostClasses(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const DescribedHosts described;
+    const auto reader = marshaller();
+    besideUnit(state, xml, [&] {
+        const auto orders = reader->readString<HostOrders>(xml);
+        return orders && !(*orders)->orders.empty();
+    });
+}
+void structs(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const Described described;
+    const auto reader = marshaller();
+    besideUnit(state, xml, [&] {
+        const auto orders = reader->readString<Orders>(xml);
+        return orders && !orders->orders.empty();
+    });
+}
+
+void write(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const auto writer = marshaller();
+    const auto object = writer->readString(xml);
+    besideUnit(state, xml, [&] { return !writer->writeString(object).isNull(); });
+}
+void writeStructs(benchmark::State& state) {
+    const std::string& xml = document(state.range(0));
+    const Described described;
+    const auto writer = marshaller();
+    const auto orders = writer->readString<Orders>(xml);
+    besideUnit(state, xml, [&] { return !writer->writeString(*orders).isNull(); });
 }
 
 // The bytes as a stream, without a copy of them.
@@ -62,59 +75,47 @@ public:
 };
 
 // One order after another, each forgotten before the next.
-template <class Order>
-void readEachOf(benchmark::State& state) {
+template <class T>
+void eachOf(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
     const auto reader = marshaller();
     besideUnit(state, xml, [&] {
         Bytes bytes(xml);
         std::istream stream(&bytes);
-        return reader->unmarshallEach<Order>(stream, "order", [](const auto&) {});
+        return reader->unmarshallEach<T>(stream, "order", [](const auto&) {});
     });
 }
-void readEach(benchmark::State& state) { readEachOf<qx::Object>(state); }
-void readEachStruct(benchmark::State& state) {
-    const bench::Described described;
-    readEachOf<bench::Order>(state);
+void eachRecord(benchmark::State& state) { eachOf<qx::Object>(state); }
+void eachStruct(benchmark::State& state) {
+    const Described described;
+    eachOf<Order>(state);
 }
 
-void write(benchmark::State& state) {
+// Documents of about 0.9 kB, in passes over all their bytes in one document.
+void smallDocuments(benchmark::State& state) {
     const std::string& xml = document(state.range(0));
-    const auto writer = marshaller();
-    const auto object = writer->readString(xml);
-    besideUnit(state, xml, [&] { return !writer->writeString(object).isNull(); });
-}
-
-void readStructs(benchmark::State& state) {
-    const std::string& xml = document(state.range(0));
-    const bench::Described described;
+    std::vector<std::string> documents;
+    for (std::size_t bytes = 0; bytes < xml.size(); bytes += documents.back().size())
+        documents.push_back(oneOrder(documents.size()));
     const auto reader = marshaller();
-    besideUnit(state, xml, [&] { return reader->readString<bench::Orders>(xml).hasValue(); });
+    besideUnit(state, xml, [&] {
+        bool isRead = true;
+        for (const std::string& text : documents)
+            isRead = reader->readString(text) && isRead;
+        return isRead;
+    });
+    state.counters["documents"] = static_cast<double>(documents.size());
 }
 
-void writeStructs(benchmark::State& state) {
-    const std::string& xml = document(state.range(0));
-    const bench::Described described;
-    const auto writer = marshaller();
-    const auto orders = writer->readString<bench::Orders>(xml);
-    besideUnit(state, xml, [&] { return !writer->writeString(*orders).isNull(); });
-}
-
-void sizes(benchmark::internal::Benchmark* benchmark) {
-    benchmark->Arg(1)
-        ->Arg(10)
-        ->Arg(60)
-        ->Unit(benchmark::kMillisecond)
-        ->UseManualTime()
-        ->MinTime(2.0);
-}
-
-BENCHMARK(parse)->Apply(sizes);
+BENCHMARK(index)->Apply(once);
+BENCHMARK(tree)->Apply(once);
 BENCHMARK(read)->Apply(sizes);
-BENCHMARK(readEach)->Apply(sizes);
-BENCHMARK(write)->Apply(sizes);
-BENCHMARK(readStructs)->Apply(sizes);
-BENCHMARK(readEachStruct)->Apply(sizes);
-BENCHMARK(writeStructs)->Apply(sizes);
+BENCHMARK(smallDocuments)->Apply(once);
+BENCHMARK(hostClasses)->Apply(once);
+BENCHMARK(structs)->Apply(sizes);
+BENCHMARK(write)->Apply(once);
+BENCHMARK(writeStructs)->Apply(once);
+BENCHMARK(eachRecord)->Apply(sizes);
+BENCHMARK(eachStruct)->Apply(once);
 
 } // namespace
