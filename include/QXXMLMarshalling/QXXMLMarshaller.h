@@ -203,9 +203,9 @@ public:
     //     marshaller->unmarshallEach("orders.xml", "order", [](qx::Ref<qx::Object> order) { … });
     //     marshaller->unmarshallEach<Order>(stream, "order", [](Order order) { … }, &error);
     //
-    // Each object has an undo group of its own. The limits of parsing and reading count anew in each
-    // piece, of some 256 KB and whole elements, that is read. The document may be of any size, one
-    // element of that name (where names are matched by namespace, of that local name) of 2 GB.
+    // Each object has an undo group of its own. The limits of parsing and reading count anew in
+    // each piece, of some 256 KB and whole elements, that is read. The document may be of any size,
+    // one element of that name (where names are matched by namespace, of that local name) of 2 GB.
     template <class T = qx::Object, class Source, class Visit>
     bool unmarshallEach(Source&& source, const qx::String& elementName, Visit visit,
                         qx::Ref<qx::Error>* error = nullptr) {

@@ -34,6 +34,7 @@
 #include "xml/TextPosition.h"
 
 #include <span>
+#include <utility>
 #include <vector>
 
 namespace qx {
@@ -81,8 +82,8 @@ public:
     using Number = std::uint32_t; // of an entry
     static constexpr std::uint32_t mostNames = 1U << 24U;
 
-    explicit XMLIndex(std::string_view text, const TextOrigin& origin = {}) noexcept
-        : _text(text), _origin(origin) {}
+    explicit XMLIndex(std::string_view text, TextOrigin origin = {}) noexcept
+        : _text(text), _origin(std::move(origin)) {}
 
     std::string_view text() const noexcept { return _text; }
     const TextOrigin& origin() const noexcept { return _origin; }

@@ -6,6 +6,7 @@
 
 #include <QXXMLMarshalling/QXXMLMarshalling.h>
 
+#include <functional>
 #include <sstream>
 
 namespace {
@@ -34,10 +35,20 @@ public:
         if (value == refused)
             throw std::runtime_error("checked");
         _checked = value;
+        if (meanwhile)
+            meanwhile();
     }
+    static inline std::function<void()> meanwhile;
 
 private:
     int _checked = 0;
+};
+
+struct Crate {
+    std::string label;
+    std::vector<std::shared_ptr<Crate>> crates;
+    std::vector<std::unique_ptr<Crate>> owned;
+    std::vector<qx::Ref<Part>> parts;
 };
 
 class Reloading : public testing::Test {
@@ -53,6 +64,7 @@ protected:
     void TearDown() override {
         qx::Class::forget("Box");
         qx::Class::forget("Part");
+        Part::meanwhile = nullptr;
     }
 
     const qx::Ref<QXXMLMarshaller> marshaller = scenario::marshaller(
@@ -223,4 +235,45 @@ TEST_F(Reloading, IsOneUndoableChange) {
     manager->undo();
     EXPECT_EQ(written(line), first) << "as far as it came";
     manager->removeAllActions();
+}
+
+TEST_F(Reloading, SettersMayLetGoOfWhatIsReadInto) {
+    qx::Class::define<Crate>("Crate")
+        .members<&Crate::label, &Crate::crates, &Crate::owned, &Crate::parts>();
+    const auto crates = scenario::marshaller(
+        "<Crate xml='crate'><crates type='Crate' collection='array' name='crate'/>"
+        "<owned type='Crate' collection='array' name='own'/>"
+        "<parts type='Part' collection='array' name='part'/><label node='attribute'/></Crate>"
+        "<Part xml='part'><checked node='attribute'/></Part>");
+    for (const char* name : {"crate", "own"}) {
+        const auto text = [&](const std::string& value) {
+            return "<crate><" + std::string(name) + " label='" + value + "'><part checked='" +
+                   value + "'/></" + name + "></crate>";
+        };
+        for (const bool readsAgain : {false, true}) {
+            Part::meanwhile = nullptr;
+            Crate root;
+            ASSERT_TRUE(crates->readStringInto(root, text("1")));
+            int calls = 0;
+            Part::meanwhile = [&] { // the second call is that of the part that stays
+                if (++calls != 2)
+                    return;
+                if (readsAgain)
+                    crates->readStringInto(root, "<crate label='none'/>");
+                root.crates.clear();
+                root.owned.clear();
+            };
+            EXPECT_TRUE(crates->readStringInto(root, text("2")));
+            EXPECT_EQ(calls, 2);
+            const Crate& inner = root.crates.empty() ? *root.owned.at(0) : *root.crates.at(0);
+            EXPECT_EQ(inner.label, "2");
+            EXPECT_EQ(inner.parts.at(0)->checked(), 2);
+        }
+    }
+    const auto root = std::make_shared<Crate>();
+    root->crates = {root};
+    EXPECT_TRUE(crates->readStringInto(*root, "<crate label='n'><crate label='in'/></crate>"));
+    EXPECT_EQ(root->label, "n");
+    root->crates.clear();
+    qx::Class::forget("Crate");
 }
