@@ -24,6 +24,7 @@
 // filled stays as it was found. Getters may let go of the marshaller and of what is being written.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
+#include <QXXMLMarshalling/detail/TypedObject.h>
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/CountedSet.h>
 #include <QXXMLMarshalling/model/Result.h>
@@ -174,19 +175,23 @@ public:
     //   -211  "The root is of class: %@, not of class: %@"   (the root's, the T's)
     template <class T>
     [[nodiscard]] qx::ResultOf<T> readString(qx::XMLBytes xml) {
-        return resultOf<T>([&](auto* error) { return readString(xml, typeid(T), error); });
+        return qx::detail::typedResult<T>(
+            [&](auto* error) { return readString(xml, typeid(T), error); });
     }
     template <class T>
     [[nodiscard]] qx::ResultOf<T> readFile(const qx::String& path) {
-        return resultOf<T>([&](auto* error) { return readFile(path, typeid(T), error); });
+        return qx::detail::typedResult<T>(
+            [&](auto* error) { return readFile(path, typeid(T), error); });
     }
     template <class T>
     [[nodiscard]] qx::ResultOf<T> readStream(std::istream& stream) {
-        return resultOf<T>([&](auto* error) { return readStream(stream, typeid(T), error); });
+        return qx::detail::typedResult<T>(
+            [&](auto* error) { return readStream(stream, typeid(T), error); });
     }
     template <class T>
     [[nodiscard]] qx::ResultOf<T> unmarshall(qx::XMLDocument* document) {
-        return resultOf<T>([&](auto* error) { return unmarshall(document, typeid(T), error); });
+        return qx::detail::typedResult<T>(
+            [&](auto* error) { return unmarshall(document, typeid(T), error); });
     }
     template <class T, std::derived_from<qx::XMLDocument> D>
     [[nodiscard]] qx::ResultOf<T> unmarshall(const qx::Ref<D>& document) {
@@ -210,7 +215,7 @@ public:
     bool unmarshallEach(Source&& source, const qx::String& elementName, Visit visit,
                         qx::Ref<qx::Error>* error = nullptr) {
         const auto visitor = [&visit](const qx::Ref<qx::Object>& object) {
-            return visited<T>(visit, object);
+            return qx::detail::visited<T>(visit, object);
         };
         return readEach(source, elementName, typeid(T), visitor, error);
     }
@@ -438,31 +443,13 @@ private:
                                    qx::Ref<qx::Error>* error);
     qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, const std::type_info& type,
                                    qx::Ref<qx::Error>* error);
-    // What became of an object that was handed over: an error ends the reading.
-    struct Visited {
-        bool goesOn;
-        qx::Ref<qx::Error> error;
-    };
-    using Visitor = qx::detail::UniqueFunction<Visited(const qx::Ref<qx::Object>&)>;
+    using Visitor = qx::detail::UniqueFunction<qx::detail::Visited(const qx::Ref<qx::Object>&)>;
     bool readEach(const qx::String& path, const qx::String& elementName, const std::type_info& type,
                   Visitor visitor, qx::Ref<qx::Error>* error);
     bool readEach(std::istream& stream, const qx::String& elementName, const std::type_info& type,
                   Visitor visitor, qx::Ref<qx::Error>* error);
     bool readEach(qx::ByteSource& source, const qx::String& elementName, const std::type_info& type,
                   Visitor visitor, qx::Ref<qx::Error>* error);
-    template <class T, class Visit>
-    static Visited visited(Visit& visit, const qx::Ref<qx::Object>& object) {
-        auto result = resultOf<T>(object);
-        if (!result)
-            return {false, result.error()};
-        if constexpr (std::is_void_v<decltype(visit(*std::move(result)))>) {
-            visit(*std::move(result));
-            return {true, nullptr};
-        } else {
-            return {static_cast<bool>(visit(*std::move(result))), nullptr};
-        }
-    }
-
     bool readFileInto(qx::Object* object, const qx::String& path, qx::Ref<qx::Error>* error);
     bool readBytesInto(qx::Object* object, qx::XMLBytes xml, qx::Ref<qx::Error>* error);
     bool readInputInto(qx::Object* object, std::istream& stream, qx::Ref<qx::Error>* error);
@@ -472,28 +459,6 @@ private:
                    qx::Ref<qx::Error>* error, qx::XMLOptions layout);
     bool writeEach(std::ostream& stream, const qx::String& rootName, Producer next,
                    qx::Ref<qx::Error>* error, qx::XMLOptions layout);
-
-    // -211 for an object that is not of that type.
-    static qx::Ref<qx::Error> wrongClass(const qx::Object& object, const std::type_info& type);
-
-    template <class T, std::invocable<qx::Ref<qx::Error>*> Read>
-    static qx::ResultOf<T> resultOf(Read read) {
-        qx::Ref<qx::Error> error;
-        const qx::Ref<qx::Object> object = read(&error);
-        if (!object)
-            return error;
-        return resultOf<T>(object);
-    }
-    template <class T>
-    static qx::ResultOf<T> resultOf(const qx::Ref<qx::Object>& object) {
-        if constexpr (std::derived_from<T, qx::Object>) {
-            if (auto cast = object.template as<T>())
-                return cast;
-        } else if (auto box = object.template as<qx::Boxed<T>>()) {
-            return std::move(**box);
-        }
-        return wrongClass(*object, typeid(T));
-    }
 
     qx::Ref<QXXMLMarshallingMapping> _mapping;
     bool _saveUnknownXML = true;

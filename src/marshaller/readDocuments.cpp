@@ -164,9 +164,10 @@ Ref<qx::Object> QXXMLMarshaller::unmarshall(XMLDocument* document, const std::ty
     return objectOf(*this, read, type, error);
 }
 
-Ref<Error> QXXMLMarshaller::wrongClass(const qx::Object& object, const std::type_info& type) {
+Ref<Error> qx::detail::wrongClass(const qx::Object& object, const std::type_info& type) {
     Ref<Error> error;
-    qx::fail(&error, qx::errors::rootOfOtherClass, object.classNameForMarshalling(), nameOf(type));
+    qx::fail(&error, qx::errors::rootOfOtherClass, object.classNameForMarshalling(),
+             ::nameOf(type));
     return error;
 }
 
@@ -240,7 +241,7 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
             if (!object && !failure)
                 qx::fail(&failure, qx::errors::noDefinitionForElement,
                          [&] { return document.quoted(item); });
-            auto visited = object ? visitor(object) : Visited{false, failure};
+            auto visited = object ? visitor(object) : qx::detail::Visited{false, failure};
             failure = std::move(visited.error);
             return goesOn = visited.goesOn;
         });
