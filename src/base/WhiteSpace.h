@@ -3,7 +3,6 @@
 // The white space of XML: space, tab, line feed and carriage return.
 
 #include <algorithm>
-#include <cstring>
 #include <string_view>
 
 namespace qx {
@@ -12,20 +11,9 @@ constexpr std::string_view whiteSpace = " \t\r\n";
 
 constexpr bool isWhite(char c) noexcept { return c == ' ' || c == '\n' || c == '\t' || c == '\r'; }
 
-// Whether nothing else is there. Layout is blanks for the most part: those are looked at four at a
-// time.
+// Whether nothing else is there.
 inline bool isWhite(std::string_view text) noexcept {
-    const char* at = text.data();
-    const char* const end = at + text.size();
-    while (at != end) {
-        if (end - at >= 4 && std::memcmp(at, "    ", 4) == 0)
-            at += 4;
-        else if (isWhite(*at))
-            ++at;
-        else
-            return false;
-    }
-    return true;
+    return std::all_of(text.begin(), text.end(), [](char c) { return isWhite(c); });
 }
 
 constexpr std::string_view withoutLeadingWhite(std::string_view text) noexcept {

@@ -26,9 +26,7 @@ ObjectHooks::ObjectHooks(const Class& describedType)
 
 const ObjectHooks& ObjectAccess::hooksOf(const Object& object) {
     const Class& type = object.isa();
-    if (_latest == nullptr || _latest->type != &type)
-        _latest = &_known.try_emplace(&type, type).first->second;
-    return *_latest;
+    return _known.try_emplace(&type, type).first->second;
 }
 
 Value ObjectAccess::send(Object& object, const Operation& operation) {

@@ -91,7 +91,6 @@ private:
     static const Class* const records;
 
     std::unordered_map<const Class*, ObjectHooks> _known;
-    const ObjectHooks* _latest = nullptr;
 };
 
 } // namespace qx::detail

@@ -42,16 +42,6 @@ private:
     ConsumedNames* _names;
 };
 
-const ClassPlan* Unmarshalling::classForElement(Number element) {
-    const std::uint32_t name = _document.nameNumber(element);
-    if (name >= _classOfName.size())
-        _classOfName.resize(std::max<std::size_t>(name + 1, _classOfName.size() * 2));
-    KnownClass& known = _classOfName[name];
-    if (!known.isKnown)
-        known = {true, _plan.classForElement(_document.name(element))};
-    return known.plan;
-}
-
 Ref<Object> Unmarshalling::unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error) {
     const bool isElement = node != none && _document.isElement(node);
     const ClassPlan* plan = isElement ? classForElement(node) : nullptr;

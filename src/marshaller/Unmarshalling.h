@@ -69,7 +69,9 @@ public:
     ReadingBudget& budget() noexcept { return _budget; }
     IndexedXML& document() noexcept { return _document; }
     // The class that maps to an element of that name; null where none does.
-    const ClassPlan* classForElement(Number element);
+    const ClassPlan* classForElement(Number element) const {
+        return _plan.classForElement(_document.name(element));
+    }
     // An argument of an error: the node as it is quoted.
     auto quoted(Number node) {
         return [this, node] { return _document.quoted(node); };
@@ -117,12 +119,6 @@ private:
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
     Number _wrapper = none; // see setWrapper
-    // The classes behind the names of elements, by the numbers of these, looked up once.
-    struct KnownClass {
-        bool isKnown = false;
-        const ClassPlan* plan = nullptr;
-    };
-    std::vector<KnownClass> _classOfName;
     // A pool of consumed names; the first few are lent to the objects that are being bound.
     std::vector<std::unique_ptr<ConsumedNames>> _names;
     std::size_t _namesLent = 0;

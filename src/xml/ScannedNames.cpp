@@ -18,10 +18,9 @@ ScannedNames::ScannedNames(std::string_view text, std::size_t longest, std::vect
     : _text(text), _longest(longest), _seed(String::hashOf("names of a document")), _slots(256),
       _texts(texts) {}
 
-ScannedNames::Number ScannedNames::add(std::string_view text, std::uint64_t start,
-                                       std::uint32_t hash) {
+ScannedNames::Number ScannedNames::add(std::string_view text, std::uint32_t hash) {
     require(text.size() <= _longest && _URIs + _names.size() < xmlLimits::names);
-    Name name{start, static_cast<std::uint32_t>(text.data() - _text.data()),
+    Name name{static_cast<std::uint32_t>(text.data() - _text.data()),
               static_cast<std::uint32_t>(text.size()), hash};
     if (!text.empty())
         takeApart(name, text);

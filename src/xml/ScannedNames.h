@@ -37,7 +37,6 @@ public:
     // What a name means as an attribute's.
     enum class Meaning : std::uint8_t { plain, space, defaultNamespace, prefixNamespace };
     struct Name {
-        std::uint64_t start; // the first eight bytes, as far as it has them
         std::uint32_t begin;
         std::uint32_t size;
         std::uint32_t hash;
@@ -55,16 +54,14 @@ public:
     // The number of the name at that place of the text. A new name is looked at in full: throws
     // Refused for what is none, and beyond a limit.
     Number numberOf(const char* begin, std::size_t size) {
-        const std::uint64_t start = startOf(begin, size);
-        const std::uint32_t hash = hashOf(start, begin, size);
+        const std::uint32_t hash = hashOf(begin, size);
         const std::size_t mask = _slots.size() - 1;
         for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
             const Name& name = _names[_slots[slot] - 1];
-            if (name.start == start && name.size == size &&
-                (size <= 8 || std::memcmp(_text.data() + name.begin, begin, size) == 0))
+            if (name.size == size && std::memcmp(_text.data() + name.begin, begin, size) == 0)
                 return _slots[slot] - 1;
         }
-        return add({begin, size}, start, hash);
+        return add({begin, size}, hash);
     }
     // The empty prefix, that of a default namespace.
     Number numberOfNoPrefix() { return numberOf(_text.data() + _text.size(), 0); }
@@ -84,8 +81,8 @@ private:
         std::memcpy(&word, place, sizeof word);
         return word;
     }
-    // Most names are shorter than a word, and are compared as one. It is read whole where the text
-    // goes on that far: a copy of a few bytes, read as a word, would have to wait for them.
+    // The first eight bytes, as far as it has them. A word is read whole where the text goes on
+    // that far: a copy of a few bytes, read as a word, would have to wait for them.
     std::uint64_t startOf(const char* begin, std::size_t size) const noexcept {
         if (size >= 8)
             return wordAt(begin);
@@ -97,13 +94,13 @@ private:
         std::memcpy(&word, begin, size);
         return word;
     }
-    std::uint32_t hashOf(std::uint64_t start, const char* begin, std::size_t size) const noexcept {
+    std::uint32_t hashOf(const char* begin, std::size_t size) const noexcept {
         // Twice: once would leave the slot untouched by what only the last bytes differ in,
         // whatever the seed, and a document could have all its names meet in one.
         const auto add = [](std::uint64_t hash, std::uint64_t word) {
             return mixed(mixed(hash ^ word));
         };
-        std::uint64_t hash = add(_seed + size, start);
+        std::uint64_t hash = add(_seed + size, startOf(begin, size));
         if (size > 8) {
             for (std::size_t at = 8; at + 8 < size; at += 8)
                 hash = add(hash, wordAt(begin + at));
@@ -111,7 +108,7 @@ private:
         }
         return static_cast<std::uint32_t>(hash);
     }
-    Number add(std::string_view text, std::uint64_t start, std::uint32_t hash);
+    Number add(std::string_view text, std::uint32_t hash);
     void takeApart(Name& name, std::string_view text);
     void fill(Number number);
     void grow();
