@@ -228,7 +228,9 @@ public:
     //   not say; what it has none for stays. Unknown XML that was kept gives way to the document's.
     // - Objects that it holds, and structs behind pointers, stay and are read into where the
     //   document has one of the same class in that place; items of collections go by their place.
-    //   Structs in objects that have an undo manager are replaced.
+    //   Structs in objects that have an undo manager are replaced. While setters are called inside
+    //   a list, a pointer or an optional of a struct, that member is empty; what they put there
+    //   goes.
     // - Observers hear of the keys whose values differ, and of those that hold structs. For an
     //   object with an undo manager it is one group, which covers the objects that it holds, too.
     //

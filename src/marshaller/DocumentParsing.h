@@ -1,6 +1,6 @@
 #pragma once
 
-// How a marshaller parses a document. What it writes is meant to be read so, too.
+// What reading and writing in one step share.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
@@ -8,6 +8,13 @@
 
 namespace qx::detail {
 
+// Their slots serve many calls.
+inline void reset(Ref<Error>* error) {
+    if (error != nullptr)
+        error->reset();
+}
+
+// How a marshaller parses a document. What it writes is meant to be read so, too.
 inline XMLParseOptions parsingOf(const QXXMLMarshaller& marshaller) {
     XMLParseOptions options = marshaller.parseOptions();
     // An object may stand in a wrapper, and hold a last element with text.

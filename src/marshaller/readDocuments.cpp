@@ -19,13 +19,9 @@ using qx::String;
 using qx::XMLDocument;
 using qx::detail::ClassPlan;
 using qx::detail::MappingPlan;
+using qx::detail::reset;
 
 namespace {
-
-void reset(Ref<Error>* error) {
-    if (error != nullptr)
-        error->reset();
-}
 
 // Whether objects of the class may be of the C++ type, as far as that is known beforehand: a type
 // that nobody described may be a base of theirs.
@@ -122,8 +118,9 @@ const std::type_info& typeOf(qx::Object& object) {
 
 bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& document,
           Ref<Error>* error) {
-    // The object's own code may let go of either.
+    // The object's own code may let go of any of them.
     const Ref<QXXMLMarshaller> kept(&marshaller);
+    const Ref<const QXXMLMarshallingMapping> mapping(marshaller.mapping());
     const Ref<qx::Object> held(&object);
     // Without a slot a reading leaves out what fails.
     Ref<Error> problem;
@@ -137,7 +134,7 @@ bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& docum
         isRead = qx::fail(&problem, qx::errors::rootOfOtherClass, fresh->classNameForMarshalling(),
                           object.classNameForMarshalling());
     if (isRead) {
-        const MappingPlan& plan = MappingPlan::of(marshaller.mapping());
+        const MappingPlan& plan = MappingPlan::of(mapping.get());
         const ClassPlan* root = plan.classForElement(document.name(document.root()));
         isRead = qx::detail::Reloading(plan).run(*root, object, *fresh, &problem);
     }

@@ -11,9 +11,12 @@
 #include "xml/XMLCharacters.h"
 #include "xml/XMLSerializer.h"
 
+#include <utility>
+
 using qx::Error;
 using qx::Ref;
 using qx::String;
+using qx::detail::reset;
 
 namespace {
 
@@ -36,11 +39,6 @@ bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Err
     } catch (const qx::Exception& exception) {
         return qx::fail(error, qx::errors::textCannotBeWritten, exception.reason());
     }
-}
-
-void reset(Ref<Error>* error) {
-    if (error != nullptr)
-        error->reset();
 }
 
 // The text of the object's document; false with an error.
@@ -67,21 +65,26 @@ bool writeSequence(QXXMLMarshaller& marshaller, Sink& sink, const String& rootNa
     if (!sink.open(error))
         return false;
     const std::string_view lineEnd = (layout & qx::XMLPrettyPrint) != 0 ? "\n" : "";
-    std::string_view beforeEnd;
+    const bool isCompact = (layout & qx::XMLCompactEmptyElements) != 0;
+    bool isEmpty = true;
     qx::TextBuffer text;
-    text +=
-        String::concat({"<?xml version=\"1.0\" encoding=\"UTF-8\"?>", lineEnd, "<", rootName, ">"})
-            .view();
+    text += String::concat({"<?xml version=\"1.0\" encoding=\"UTF-8\"?>", lineEnd, "<", rootName})
+                .view();
     for (qx::Value object = next(); !object.isNull(); object = next()) {
+        if (std::exchange(isEmpty, false))
+            text += '>';
         const bool isPrinted =
             printed(marshaller, object, error, [&](const auto& element, const auto& reading) {
                 qx::writeDraftInside(element, layout, reading, text);
             });
-        beforeEnd = lineEnd;
         if (!isPrinted || (text.size() >= blockSize && !sink.write(text.take(), error)))
             return false;
     }
-    text += String::concat({beforeEnd, "</", rootName, ">", lineEnd}).view();
+    if (isEmpty && isCompact)
+        text += "/>";
+    else
+        text += String::concat({isEmpty ? ">" : lineEnd, "</", rootName, ">"}).view();
+    text += lineEnd;
     return sink.write(text.view(), error) && sink.commit(error);
 }
 

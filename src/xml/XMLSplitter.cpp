@@ -16,6 +16,12 @@ bool isWhiteAt(std::string_view text, std::size_t at) noexcept {
     return at < text.size() && isWhite(text[at]);
 }
 
+// Behind the mark; none where there is none.
+std::size_t endOf(std::string_view mark, std::string_view text, std::size_t from) noexcept {
+    const std::size_t at = text.find(mark, from);
+    return at != std::string_view::npos ? at + mark.size() : at;
+}
+
 // What ends the plain run of bytes in a tag.
 constexpr std::array<bool, 256> tagMarks() {
     std::array<bool, 256> marks{};
@@ -112,8 +118,7 @@ bool XMLSplitter::goOverNext() {
 XMLSplitter::End XMLSplitter::behind(std::string_view mark, std::size_t from) const {
     // The mark may have been cut off.
     const std::size_t seen = _seen - std::min(_seen, mark.size() - 1);
-    const std::size_t at = _text.find(mark, std::max(from, seen));
-    return at != none ? at + mark.size() : none;
+    return endOf(mark, _text, std::max(from, seen));
 }
 
 bool XMLSplitter::goOverDeclaration() {
@@ -138,10 +143,6 @@ bool XMLSplitter::goOverDeclaration() {
 
 // Its own ">": none of the declarations in it.
 XMLSplitter::End XMLSplitter::endOfDoctype() const {
-    const auto behind = [this](std::string_view mark, std::size_t from) {
-        const std::size_t at = _text.find(mark, from);
-        return at != none ? at + mark.size() : none;
-    };
     bool isInSubset = false;
     std::size_t at = _at + doctype.size();
     while (at != none && (at = _text.find_first_of("\"'[]<>", at)) != none) {
@@ -151,11 +152,11 @@ XMLSplitter::End XMLSplitter::endOfDoctype() const {
         if (c == '[' || c == ']')
             isInSubset = c == '[';
         if (c == '"' || c == '\'')
-            at = behind({&c, 1}, at + 1);
+            at = endOf({&c, 1}, _text, at + 1);
         else if (_text.substr(at).starts_with(comment))
-            at = behind("-->", at + comment.size());
+            at = endOf("-->", _text, at + comment.size());
         else if (_text.substr(at).starts_with("<?"))
-            at = behind("?>", at);
+            at = endOf("?>", _text, at);
         else
             ++at;
     }

@@ -250,16 +250,19 @@ TEST(Sequences, AReadingTellsHowFarItIsAndCanBeCancelled) {
 
 TEST(Sequences, AreWrittenAsTheWholeDocumentWouldBe) {
     const auto marshaller = scenario::marshaller(mapping);
-    const auto whole = marshaller->readString("<o><item id='1'/><item id='2'>a\nb</item></o>");
-    const auto items = whole->valueForKey("items").as<qx::Array>();
-    for (const qx::XMLOptions layout : {qx::XMLPrettyPrint, qx::XMLNoOptions}) {
-        std::ostringstream written;
-        std::size_t next = 0;
-        EXPECT_TRUE(marshaller->marshallEach(
-            written, "o", [&] { return next < items->count() ? items->at(next++) : qx::Value(); },
-            nullptr, layout));
-        EXPECT_EQ(written.str(), marshaller->writeString(whole, nullptr, layout).str());
-    }
+    const auto compact = static_cast<qx::XMLOptions>(qx::XMLCompactEmptyElements);
+    for (const char* text : {"<o><item id='1'/><item id='2'>a\nb</item></o>", "<o/>"})
+        for (const qx::XMLOptions layout : {qx::XMLPrettyPrint, qx::XMLNoOptions, compact}) {
+            const auto whole = marshaller->readString(text);
+            const auto items = whole->valueForKey("items").as<qx::Array>();
+            std::ostringstream written;
+            std::size_t next = 0;
+            EXPECT_TRUE(marshaller->marshallEach(
+                written, "o",
+                [&] { return items && next < items->count() ? items->at(next++) : qx::Value(); },
+                nullptr, layout));
+            EXPECT_EQ(written.str(), marshaller->writeString(whole, nullptr, layout).str());
+        }
 }
 
 TEST(Sequences, AreWrittenWholeOrNotAtAll) {
