@@ -37,7 +37,10 @@ Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
 Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
                                                      const XMLParseOptions& options,
                                                      Ref<Error>* error) {
-    return documentOf(readFile(path, error), options, error);
+    auto document = documentOf(readFile(path, error), options, error);
+    if (document)
+        document->setDocumentName(path);
+    return document;
 }
 
 Ref<XMLDocument> XMLDocument::initWithData(XMLBytes bytes, const XMLParseOptions& options,
@@ -145,6 +148,7 @@ void XMLDocument::setStringValue(const String& value) {
 
 Ref<XMLNode> XMLDocument::copy() const {
     auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+    document->_documentName = _documentName;
     document->_version = _version;
     document->_encoding = _encoding;
     document->_standalone = _standalone;
