@@ -81,6 +81,10 @@ protected:
 
     qx::XMLElement& element() const noexcept { return *_element; }
 
+    // Whether reading goes on: the step succeeded, or all faults are collected and its error was
+    // put to them.
+    bool goesOn(bool succeeded, qx::Ref<qx::Error>* error) const;
+
     // Makes a T and reads the element into it: what the init… operations of subclasses are made of.
     template <class T, class... Arguments>
     static qx::Ref<T> initialized(qx::XMLElement* element, qx::Ref<qx::Error>* error,

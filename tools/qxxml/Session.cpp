@@ -37,10 +37,6 @@ Session::Session(const Options& options) : _options(options) {
     standFor(options.application);
     _repository = QXXMLFileSystemDataRepository::init<ToolRepository>();
     _repository->searchFirst(options.searchPaths);
-    if (!options.mapping.empty()) {
-        const auto folder = std::filesystem::path(options.mapping).parent_path();
-        _repository->searchFirst({folder.empty() ? "." : folder.string()});
-    }
     QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_repository);
 }
 
@@ -49,9 +45,12 @@ qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
     const auto mapping = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
     if (!mapping)
         throw Failure(error, _options.mapping);
-    auto marshaller = QXXMLMarshaller::initWithMappingXML(mapping.get(), &error);
-    if (!marshaller)
+    const auto folder = std::filesystem::path(_options.mapping).parent_path();
+    auto resolved = QXXMLMarshallingMapping::initWithDocument(
+        mapping.get(), {.includeFolder = folder.empty() ? "." : folder.string()}, &error);
+    if (!resolved)
         throw Failure(error, _repository->failedPath());
+    auto marshaller = QXXMLMarshaller::initWithMapping(std::move(resolved));
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);

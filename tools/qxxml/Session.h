@@ -18,7 +18,7 @@ public:
     explicit Session(const Options& options);
 
     ToolRepository& repository() const noexcept { return *_repository; }
-    // Made from the mapping document, whose own folder is searched first for includes.
+    // Made from the mapping document, whose own folder is searched last for includes.
     qx::Ref<QXXMLMarshaller> makeMarshaller() const;
     // The object that the marshaller reads from the document; null where no class handles it.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
