@@ -21,8 +21,7 @@ bool QXXMLClassMapping::initXML(XMLElement& element, Ref<Error>* error) {
            extractStringAttribute("extends", element, false, _extends, error) &&
            readFlag("auto-complete", _autocomplete, error) &&
            readFlag("self-first", _selfFirst, error) &&
-           extractStringAttribute("type", element, false, _type, error) &&
-           goesOn(readMapTo(error), error) &&
+           extractStringAttribute("type", element, false, _type, error) && readMapTo(error) &&
            processFields(element.elementsForName(Key("field")), error);
 }
 
@@ -32,8 +31,9 @@ bool QXXMLClassMapping::readFlag(const char* name, bool& flag, Ref<Error>* error
 
 bool QXXMLClassMapping::readMapTo(Ref<Error>* error) {
     const auto mapTos = element().elementsForName(Key("map-to"));
-    if (mapTos.size() > 1)
-        return qx::fail(error, qx::errors::tooManyMapToElements, &element());
+    if (mapTos.size() > 1 &&
+        !goesOn(qx::fail(error, qx::errors::tooManyMapToElements, &element()), error))
+        return false;
     if (mapTos.empty())
         return true;
     return extractStringAttribute("xml", *mapTos.front(), false, _mapTo, error) &&

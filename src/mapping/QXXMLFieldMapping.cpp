@@ -47,8 +47,9 @@ bool QXXMLFieldMapping::readFlag(const char* name, Flag flag, bool defaultValue,
 
 bool QXXMLFieldMapping::readBindings(Ref<Error>* error) {
     const auto bindings = element().elementsForName(qx::Key("bind-xml"));
-    if (bindings.size() > 1)
-        return qx::fail(error, qx::errors::tooManyBindXMLElements, &element());
+    if (bindings.size() > 1 &&
+        !goesOn(qx::fail(error, qx::errors::tooManyBindXMLElements, &element()), error))
+        return false;
     if (!bindings.empty()) {
         _bindToMapping = QXXMLBindToMapping::initWithXML(bindings.front(), error);
         if (!_bindToMapping)

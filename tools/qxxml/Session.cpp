@@ -40,17 +40,22 @@ Session::Session(const Options& options) : _options(options) {
     QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_repository);
 }
 
-qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
+qx::Ref<QXXMLMarshallingMapping> Session::resolveMapping(QXXMLMappingOptions options) const {
     qx::Ref<qx::Error> error;
-    const auto mapping = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
-    if (!mapping)
+    const auto document = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
+    if (!document)
         throw Failure(error, _options.mapping);
     const auto folder = std::filesystem::path(_options.mapping).parent_path();
-    auto resolved = QXXMLMarshallingMapping::initWithDocument(
-        mapping.get(), {.includeFolder = folder.empty() ? "." : folder.string()}, &error);
-    if (!resolved)
+    options.includeFolder = folder.empty() ? "." : folder.string();
+    auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), options, &error);
+    if (!mapping)
         throw Failure(error, _repository->failedPath());
-    auto marshaller = QXXMLMarshaller::initWithMapping(std::move(resolved));
+    return mapping;
+}
+
+qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
+    qx::Ref<qx::Error> error;
+    auto marshaller = QXXMLMarshaller::initWithMapping(resolveMapping());
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);
