@@ -5,6 +5,7 @@
 #include "files/AtomicWrite.h"
 #include "files/Files.h"
 #include "files/Paths.h"
+#include "model/ErrorDetails.h"
 #include "model/Errors.h"
 #include "xml/Encoding.h"
 #include "xml/XMLDocumentContent.h"
@@ -40,6 +41,8 @@ Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
     auto document = documentOf(readFile(path, error), options, error);
     if (document)
         document->setDocumentName(path);
+    else
+        detail::ErrorDetails::nameDocument(error, path);
     return document;
 }
 
