@@ -6,6 +6,7 @@
 #include "files/Files.h"
 #include "files/Paths.h"
 #include "mapping/MappingSource.h"
+#include "model/ErrorDetails.h"
 
 #include <algorithm>
 #include <utility>
@@ -29,7 +30,7 @@ bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
     const MappingSource& source = MappingSource::of(document);
     if (source.collectsFaults())
         _classes.forEachRepeated([](const QXXMLClassMapping& mapping, Ref<Error> fault) {
-            MappingSource::of(mapping).addFault(std::move(fault), mapping.place());
+            MappingSource::of(mapping).addFault(std::move(fault));
         });
     _classes = {};
     return true;
@@ -51,9 +52,11 @@ bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error
     for (std::size_t i = 0; i < document.includes().size(); ++i) {
         if (loadInclude(*manager, document, i, error))
             continue;
+        if (error != nullptr)
+            MappingSource::locate(*error, document, i);
         if (!source.collectsFaults())
             return false;
-        source.addFault(std::exchange(*error, nullptr), document.includePlace(i));
+        source.addFault(std::exchange(*error, nullptr));
     }
     return true;
 }
@@ -103,6 +106,7 @@ Ref<XMLDocument> IncludeLoader::findInFolder(const String& href, Ref<Error>* err
         return nullptr;
     const auto data = readFile(path, error, ReadableFiles::regular);
     auto document = data ? XMLDocument::initWithData(*data, {}, error) : nullptr;
+    ErrorDetails::nameDocument(error, path);
     if (document)
         document->setDocumentName(path);
     return document;

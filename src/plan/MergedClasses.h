@@ -5,6 +5,7 @@
 // its includes among it, is thus one stretch of the list, and has to name no class and no element
 // twice in itself. Each class is looked at once, however deep the includes nest.
 
+#include "mapping/MappingSource.h"
 #include "model/Errors.h"
 #include "plan/MappingPlan.h"
 
@@ -55,11 +56,15 @@ private:
     };
 
     static bool isRefused(const Repeated& repeated, std::size_t begin, Ref<Error>* error) {
-        const String& className = repeated.mapping->className();
+        const QXXMLClassMapping& mapping = *repeated.mapping;
         if (repeated.sameClass > begin)
-            return fail(error, errors::classRedefined, className);
-        return fail(error, errors::elementRedefined, MappingPlan::elementNameOf(*repeated.mapping),
-                    className);
+            fail(error, errors::classRedefined, mapping.className());
+        else
+            fail(error, errors::elementRedefined, MappingPlan::elementNameOf(mapping),
+                 mapping.className());
+        if (error != nullptr)
+            MappingSource::of(mapping).locate(*error, MappingSource::elementOf(mapping));
+        return false;
     }
 
     void add(const QXXMLClassMapping& mapping) {

@@ -49,7 +49,7 @@ qx::Ref<QXXMLMarshallingMapping> Session::resolveMapping(QXXMLMappingOptions opt
     options.includeFolder = folder.empty() ? "." : folder.string();
     auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), options, &error);
     if (!mapping)
-        throw Failure(error, _repository->failedPath());
+        throw Failure(error, error->documentName().str());
     return mapping;
 }
 

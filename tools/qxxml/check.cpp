@@ -34,7 +34,7 @@ std::string textOf(const QXXMLFinding& finding) {
         text += " [" + finding.className.str() +
                 (finding.fieldName.isNull() ? "" : "." + finding.fieldName.str()) + "]";
     if (!finding.suggestion.isNull())
-        text += "\n    " + message("did you mean %@?", finding.suggestion);
+        text += "\n    " + finding.suggestion.str();
     for (const QXXMLMappingPlace& include : finding.includedFrom)
         text += "\n    " + message("included from %@", textOf(include));
     return text + "\n";
