@@ -16,6 +16,7 @@
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
+#include <QXXMLMarshalling/QXXMLDocumentCheck.h>
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>

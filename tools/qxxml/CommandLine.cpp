@@ -71,6 +71,18 @@ void addMapping(CLI::App& command, Options& options) {
         ->required();
 }
 
+void addMatching(CLI::App& command, Options& options) {
+    command
+        .add_option("--prefix", options.prefixes,
+                    "Match names by namespace: the mapping has this prefix, or none, for the "
+                    "namespace of that URI; may be given more than once")
+        ->option_text("[PREFIX]=URI")
+        ->allow_extra_args(false)
+        ->check(CLI::Validator(checkPrefix, ""));
+    command.add_flag("--match-namespaces", options.matchNamespaces,
+                     "The same for the namespaces that the class mappings declare");
+}
+
 void addReading(CLI::App& command, Options& options) {
     addMapping(command, options);
     command.add_option("DOCUMENT", options.document, "The path of a document; - is standard input")
@@ -84,15 +96,7 @@ void addReading(CLI::App& command, Options& options) {
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
                      "Do not write namespace declarations");
-    command
-        .add_option("--prefix", options.prefixes,
-                    "Match names by namespace: the mapping has this prefix, or none, for the "
-                    "namespace of that URI; may be given more than once")
-        ->option_text("[PREFIX]=URI")
-        ->allow_extra_args(false)
-        ->check(CLI::Validator(checkPrefix, ""));
-    command.add_flag("--match-namespaces", options.matchNamespaces,
-                     "The same for the namespaces that the class mappings declare");
+    addMatching(command, options);
     command.add_flag("--keep-white-space", options.keepWhiteSpace,
                      "Keep the white space between elements");
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
@@ -100,8 +104,20 @@ void addReading(CLI::App& command, Options& options) {
 
 void addChecking(CLI::App& command, Options& options) {
     addMapping(command, options);
-    command.add_flag("--notes", options.notes, "Print what is only worth a note, too");
+    command
+        .add_option("DOCUMENT", options.documents,
+                    "The paths of documents to try the mapping on; - is standard input")
+        ->option_text("...");
+    command
+        .add_option("--why", options.why,
+                    "Tell why this node of the last document is bound or not, and nothing else")
+        ->option_text("PATH");
+    command.add_flag("--notes", options.notes, "Print the notes on the mapping, too");
     command.add_flag("--json", options.json, "Print an array of findings as JSON");
+    command.add_flag("--discard-unknown", options.discardUnknown,
+                     "Do not keep XML that the mapping does not describe");
+    addMatching(command, options);
+    command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
 void addInferring(CLI::App& command, Options& options) {
@@ -147,7 +163,10 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     command->add_flag("--pretty", options.pretty, "Print one element a line");
     addSearch(*command, options);
 
-    command = add("check", "Tell what a mapping does that its author may not want", nullptr);
+    command = add("check",
+                  "Tell what a mapping does, by itself and to documents, that its "
+                  "author may not want",
+                  nullptr);
     command->callback(
         [&] { chosen = [&status](const Options& given) { return check(given, status); }; });
     addChecking(*command, options);

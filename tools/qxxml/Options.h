@@ -12,7 +12,7 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
-    std::vector<std::string> documents; // what `infer` goes by
+    std::vector<std::string> documents; // what `infer` and `check` go by
 
     bool strict = false;
     bool discardUnknown = false;
@@ -25,6 +25,7 @@ struct Options {
     bool matchNamespaces = false;
     bool json = false;
     bool notes = false;
+    std::string why; // the path of the node that `check` is asked about
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;
