@@ -28,6 +28,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     if (!reading.budget().takeText(holder, error))
         return false;
     const bool isChild = holder != source.element();
+    if (isChild && reading.reports().isOn())
+        reading.reports().tellInside(reading.document(), holder, &target.object);
     const String text = isChild ? reading.document().text(holder) : source.stringValue();
     if (!text.isEmpty())
         return takeValue(target.object, field, field.key, text, error);
