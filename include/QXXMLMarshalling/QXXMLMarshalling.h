@@ -20,6 +20,7 @@
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldValues.h>
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
+#include <QXXMLMarshalling/QXXMLFinding.h>
 #include <QXXMLMarshalling/QXXMLMapping.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>

@@ -20,6 +20,7 @@
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/ReadingContext.h"
 #include "marshaller/ReadingProgress.h"
+#include "marshaller/ReadingTrace.h"
 #include "marshaller/Reporting.h"
 #include "plan/MappingPlan.h"
 
@@ -50,6 +51,8 @@ public:
     // The document must outlive the call.
     Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
+    // From here on it is told what becomes of each entry; it outlives the call.
+    void setTrace(ReadingTrace* trace) noexcept { _trace = trace; }
     // In an undo group of its own. Errors that the collector takes leave out what failed.
     Ref<Object> read(Number element, ErrorSlot error, ReadingProgress& progress,
                      ErrorCollector& collector);
@@ -88,6 +91,8 @@ public:
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
     IndexedXML& document() noexcept { return _document; }
+    // Null where nobody wants one.
+    ReadingTrace* trace() const noexcept { return _trace; }
     // The class that maps to an element of that name; null where none does.
     const ClassPlan* classForElement(Number element) const {
         return _plan.classForElement(_document.name(element));
@@ -146,6 +151,7 @@ private:
     ReadingProgress* _progress = nullptr;
     ErrorCollector* _collector = nullptr;
     const Reporting _reports;
+    ReadingTrace* _trace = nullptr;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
@@ -157,6 +163,7 @@ private:
 };
 
 // A whole document, in one undo group.
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error);
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
+                         ReadingTrace* trace = nullptr);
 
 } // namespace qx::detail
