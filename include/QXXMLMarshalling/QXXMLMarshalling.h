@@ -19,11 +19,13 @@
 #include <QXXMLMarshalling/QXXMLDocumentCheck.h>
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
+#include <QXXMLMarshalling/QXXMLFieldValues.h>
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
 #include <QXXMLMarshalling/QXXMLFinding.h>
 #include <QXXMLMarshalling/QXXMLMapping.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
+#include <QXXMLMarshalling/QXXMLReport.h>
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/base/Export.h>

@@ -13,7 +13,7 @@ namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()),
-      _plan(MappingPlan::of(_mapping.get())), _output(draft) {
+      _plan(MappingPlan::of(_mapping.get())), _output(draft), _reports(marshaller) {
     if (auto table = NamespaceMatching::keptOf(marshaller);
         table != nullptr && marshaller.isUsingNamespaceURIs())
         _names = std::make_unique<OutputNames>(std::move(table));

@@ -9,6 +9,7 @@
 #include "marshaller/ElementWriter.h"
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/OutputNames.h"
+#include "marshaller/Reporting.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -73,10 +74,12 @@ public:
     bool isToBeWritten(const Value& item);
     // Whether the field that is being written is left out as an attribute: nothing requires it, and
     // it is empty or zero. Numbers are cut to integers first.
-    bool isLeftOut(const FieldPlan& field, const Value& value,
-                   const FieldText& text) const noexcept {
-        return _omitsZero && !field.isRequired &&
-               ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
+    bool isLeftOut(const FieldPlan& field, const Value& value, const FieldText& text) const {
+        const bool isLeft = _omitsZero && !field.isRequired &&
+                            ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
+        if (isLeft && _reports.isOn())
+            _reports.tellOmitted(field);
+        return isLeft;
     }
 
 private:
@@ -96,6 +99,7 @@ private:
     ObjectAccess _access;
     ElementWriter _output;
     std::unique_ptr<OutputNames> _names; // null: names are written as the mapping has them
+    const Reporting _reports;
     std::size_t _depth = 0;
     bool _omitsZero = true; // of the field that is being written
 };

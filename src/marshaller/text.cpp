@@ -30,6 +30,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     if (!reading.budget().takeText(holder, error))
         return false;
     const bool isChild = holder != source.element();
+    if (isChild && reading.reports().isOn())
+        reading.reports().tellInside(reading.document(), holder, &target.object);
     const String text = isChild ? reading.document().text(holder) : source.stringValue();
     if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
         trace->take(isChild ? ReadingTrace::Form::child : ReadingTrace::Form::text, field, holder,
