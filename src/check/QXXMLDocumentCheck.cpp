@@ -119,9 +119,10 @@ struct QXXMLDocumentCheck::State {
 QXXMLDocumentCheck::QXXMLDocumentCheck(Ref<QXXMLMarshaller> marshaller)
     : _state(std::make_unique<State>()) {
     _state->marshaller = std::move(marshaller);
+    _state->marshaller->setReportHandler([](const QXXMLReport&) {});
 }
 
-QXXMLDocumentCheck::~QXXMLDocumentCheck() = default;
+QXXMLDocumentCheck::~QXXMLDocumentCheck() { _state->marshaller->setReportHandler(nullptr); }
 
 bool QXXMLDocumentCheck::addFile(const String& path, Ref<Error>* error) {
     auto data = qx::readFile(path, error);

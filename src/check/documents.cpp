@@ -79,6 +79,8 @@ private:
     const DocumentPlaces& _places;
     Tally& _tally;
     std::vector<Number> _open; // elements of which something was taken
+    // Looking for one goes over all names of a class.
+    std::size_t _suggestionsLeft = 200;
 };
 
 void UntakenCheck::checkContent(Number element) {
@@ -131,8 +133,9 @@ void UntakenCheck::add(const FindingText& text, Number entry, Number element) {
         owner != nullptr ? owner->plan->className.string() : String(),
         [&] { return _places.placeOf(entry).place; },
         [&]() -> String {
-            if (owner == nullptr)
+            if (owner == nullptr || _suggestionsLeft == 0)
                 return nullptr;
+            --_suggestionsLeft;
             const auto names = namesTakenBy(*owner->plan, _index[entry].nodeKind());
             const std::string_view near = nearestName(nameOf(entry), names);
             return near.empty() ? String() : String(near);
@@ -147,9 +150,12 @@ void checkUntaken(const TakenEntries& taken, const DocumentPlaces& places, Numbe
 }
 
 void FoundFields::add(const ReadingTrace& trace) {
+    std::unordered_map<const ClassPlan*, std::size_t> objects;
     for (const ReadingTrace::Owner& owner : trace.owners())
-        for (const ClassField& field : fieldsAsRead(*owner.plan))
-            ++_asked[field.field];
+        ++objects[owner.plan];
+    for (const auto& [plan, count] : objects)
+        for (const ClassField& field : fieldsAsRead(*plan))
+            _asked[field.field] += count;
     for (const ReadingTrace::Use& use : trace.uses())
         if (use.field != nullptr)
             _found.insert(use.field);
