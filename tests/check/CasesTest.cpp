@@ -3,6 +3,7 @@
 #include "Told.h"
 
 #include "support/Cases.h"
+#include "support/Page.h"
 #include "support/Texts.h"
 
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
@@ -50,3 +51,23 @@ const bool documents = support::addCases(
     });
 
 } // namespace
+
+// Most sections show what goes wrong, then a mapping that does without.
+TEST(RoundTripPage, WhatItWarnsOfIsFoundAndWhatItAdvisesIsNot) {
+    std::map<std::string, std::vector<std::string>> sections;
+    for (const auto& block : support::blocksOf(QX_SOURCE_DIR "/docs/round-trip.md"))
+        if (block.heading == "xml mapping")
+            sections[block.section].push_back(told(resolved(block.text)->check(), true));
+    std::size_t pairs = 0;
+    for (const auto& [section, findings] : sections) {
+        if (findings.size() != 2)
+            continue;
+        ++pairs;
+        EXPECT_TRUE(findings[0].find("written") != std::string::npos ||
+                    findings[0].find("lost") != std::string::npos)
+            << section << '\n'
+            << findings[0];
+        EXPECT_EQ(findings[1].find("warning"), std::string::npos) << section << '\n' << findings[1];
+    }
+    EXPECT_GE(pairs, 10U);
+}
