@@ -253,7 +253,7 @@ TEST(ValueTest, FormatsTakeTheirArgumentsInOrderOrByPosition) {
         {"%@%@%@%@ %", "a-2255%@ %"},    {"%0$@ %9$@", "%0$@ %9$@"},
         {"%2$u", "18446744073709551614"}};
     for (const auto& [text, expected] : cases)
-        EXPECT_EQ(format(text, arguments), expected) << text;
+        EXPECT_EQ(qx::format(text, arguments), expected) << text;
 }
 
 } // namespace
