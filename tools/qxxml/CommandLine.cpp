@@ -3,6 +3,9 @@
 #include "qxxml/Commands.h"
 #include "qxxml/Failure.h"
 #include "qxxml/Output.h"
+#include "qxxml/pages/Usage.h"
+
+#include <QXXMLMarshalling/base/Version.h>
 
 #include <CLI/CLI.hpp>
 
@@ -15,7 +18,7 @@ namespace qxxml {
 
 namespace {
 
-using Command = std::string (*)(const Options&);
+using Command = std::function<std::string(const Options&)>;
 
 constexpr int failed = 1;
 constexpr int wrongUsage = 2;
@@ -114,7 +117,8 @@ void addInferring(CLI::App& command, Options& options) {
 // Defines the commands; the one that was called is left in `chosen`.
 void define(CLI::App& tool, Options& options, Command& chosen) {
     tool.require_subcommand(1);
-    tool.set_version_flag("--version", "qxxml " QX_VERSION, "Print the version and exit");
+    tool.set_version_flag("--version", "qxxml " + std::string(qx::libraryVersionText()),
+                          "Print the version and exit");
     const auto add = [&](const char* name, const char* purpose, Command command) {
         CLI::App* const added = tool.add_subcommand(name, purpose);
         added->callback([&chosen, command] { chosen = command; });
@@ -149,6 +153,17 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
         ->option_text(" ")
         ->required();
     addSearch(*command, options);
+
+    const auto usage = [&tool] { return Usage(tool); };
+    add("manual", "Print the manual page, which \"man -l -\" shows",
+        [usage](const Options&) { return manualPage(usage()); });
+
+    command = add("completion", "Print what lets a shell complete the command line",
+                  [usage](const Options& given) { return completionScript(usage(), given.name); });
+    command->add_option("SHELL", options.name, "The shell that it is for")
+        ->option_text("bash|zsh|fish")
+        ->required()
+        ->check(CLI::IsMember({"bash", "zsh", "fish"}));
 }
 
 // Help and version are asked for; anything else is wrong usage.
