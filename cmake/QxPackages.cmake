@@ -7,7 +7,7 @@ endif()
 set(CPACK_GENERATOR DEB)
 set(CPACK_PACKAGE_NAME qxxmlmarshalling)
 set(CPACK_PACKAGE_VENDOR "The QXXMLMarshalling authors")
-set(CPACK_PACKAGE_CONTACT "The QXXMLMarshalling authors <qxxmlmarshalling@localhost>")
+set(CPACK_PACKAGE_CONTACT "The QXXMLMarshalling authors <authors@qxxml.invalid>")
 set(CPACK_RESOURCE_FILE_LICENSE "${PROJECT_SOURCE_DIR}/LICENSE")
 set(CPACK_PACKAGING_INSTALL_PREFIX "${CMAKE_INSTALL_PREFIX}")
 set(CPACK_STRIP_FILES ON)
@@ -19,33 +19,34 @@ set(CPACK_DEBIAN_PACKAGE_PRIORITY optional)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS "${CMAKE_LIBRARY_OUTPUT_DIRECTORY}")
 set(CPACK_DEBIAN_ENABLE_COMPONENT_DEPENDS ON)
+# Packages of programs that use the library learn from it which version they need.
+set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
 
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_NAME libqxxmlmarshalling${QX_SOVERSION})
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
-set(CPACK_COMPONENT_LIBRARY_DESCRIPTION "XML documents to objects and back
- What maps to what is read at run time, from a mapping document. This package holds
- the shared library and its translated texts.")
-# What programs need is told by its version, and the loader's cache hears of it.
-set(CPACK_DEBIAN_LIBRARY_PACKAGE_GENERATE_SHLIBS ON)
+set(CPACK_DEBIAN_LIBRARY_DESCRIPTION "XML documents to objects and back
+What maps to what is read at run time, from a mapping document.
+This package holds the shared library and its translated texts.")
 
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libqxxmlmarshalling-dev)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)
-set(CPACK_COMPONENT_GROUP_DEVELOPMENT_DESCRIPTION "XML documents to objects and back: headers
- What a program needs to be compiled with the library: headers, CMake and pkg-config
- files.")
+set(CPACK_DEBIAN_DEVELOPMENT_DESCRIPTION "XML documents to objects and back: headers
+What a program needs to be compiled with the library: headers, CMake
+and pkg-config files.")
 
 set(CPACK_DEBIAN_TOOL_PACKAGE_NAME qxxml)
 set(CPACK_DEBIAN_TOOL_PACKAGE_SECTION text)
-set(CPACK_COMPONENT_TOOL_DESCRIPTION "tries mapping documents on XML documents
- Reads documents under a mapping and shows what becomes of them, and makes a first
- mapping for documents that have none.")
+set(CPACK_DEBIAN_TOOL_DESCRIPTION "tries mapping documents on XML documents
+Reads documents under a mapping and shows what becomes of them, and
+makes a first mapping for documents that have none.")
 
 set(CPACK_DEBIAN_DOCUMENTATION_PACKAGE_NAME qxxmlmarshalling-doc)
 set(CPACK_DEBIAN_DOCUMENTATION_PACKAGE_SECTION doc)
 set(CPACK_DEBIAN_DOCUMENTATION_PACKAGE_ARCHITECTURE all)
 set(CPACK_DEBIAN_DOCUMENTATION_PACKAGE_SHLIBDEPS OFF)
-set(CPACK_COMPONENT_DOCUMENTATION_DESCRIPTION "XML documents to objects and back: guides
- How mapping documents are written, how classes take part, and what comes back as it was.")
+set(CPACK_DEBIAN_DOCUMENTATION_DESCRIPTION "XML documents to objects and back: guides
+How mapping documents are written, how classes take part, and what
+comes back as it was.")
 
 set(components library headers development documentation)
 if(TARGET qxxml)

@@ -93,3 +93,9 @@ for other in "$compiler" clang++; do
     configures "installed-$(basename -- "$other")" "$other" -O0 "-DCMAKE_PREFIX_PATH=$work/static-prefix"
 done
 ! command -v pkg-config >/dev/null || pkg static-pkg "$work/static-prefix" "$compiler" -O0
+
+# Texts that lie beside the program come before those in the library.
+mkdir -p -- "$work/share/QXXMLMarshalling/de.lproj"
+echo '"No definition to handle element: %@" = "Was ist %@";' >"$work/share/QXXMLMarshalling/de.lproj/Localizable.strings"
+said=$(cd -- "$work/run" && LC_ALL=de_DE.UTF-8 "$work/static/reader")
+[[ $said == *"Was ist <invoice></invoice>" ]] || fail "a file of texts is not read: $said"
