@@ -129,6 +129,11 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
     addMapping(*command, options);
     addSearch(*command, options);
 
+    command = add("graph", "Print a mapping as a graph for Graphviz", graph);
+    addMapping(*command, options);
+    command->add_flag("--svg", options.svg, "Print the picture itself, which dot draws");
+    addSearch(*command, options);
+
     command = add("read", "Read a document into an object and print it as JSON", nullptr);
     command->callback([&] { chosen = options.each.empty() ? read : readEach; });
     addReading(*command, options);
