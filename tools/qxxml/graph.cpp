@@ -52,14 +52,15 @@ std::string quoted(std::string_view text) {
     return result + '"';
 }
 
-// "@number", "customer", "items/item*", "text()": where the value of a field is looked for.
+// "@number", "customer", "items/item*", "text()": where the value of a field is looked for. What
+// kind of node it is, the field says for all its bindings.
 std::string placeOf(const QXXMLFieldMapping& field, const QXXMLBindToMapping& binding) {
     const bool isCollection = !field.collection().isEmpty();
-    const bool isText = binding.nodeType() == QXXMLNodeTypeText;
+    const bool isText = field.nodeType() == QXXMLNodeTypeText;
     std::string name = binding.bindTo().str();
     if (binding.bindTo().isEmpty() && !isText && (!isCollection || !field.type().isEmpty()))
         name = field.name().str();
-    if (!isCollection && binding.nodeType() == QXXMLNodeTypeAttribute)
+    if (!isCollection && field.nodeType() == QXXMLNodeTypeAttribute)
         name = "@" + name;
     if (isText)
         name += name.empty() ? "text()" : "/text()";
