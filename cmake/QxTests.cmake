@@ -123,3 +123,5 @@ foreach(check IN LISTS checks)
     qx_add_script_test(check_${name} checks
         bash "${check}" "${CMAKE_BINARY_DIR}" "${PROJECT_SOURCE_DIR}")
 endforeach()
+# It compiles the library once more.
+set_tests_properties(check_install PROPERTIES TIMEOUT 900)
