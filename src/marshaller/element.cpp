@@ -35,8 +35,7 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshallin
     const ClassPlan* plan = field.typeClass != nullptr || isText ? field.typeClass : classOfElement;
     if (plan != nullptr)
         return reading.build(*plan, child, target.source.nodes(), error);
-    return reading.budget().takeText(child, error) ? Value(reading.document().text(child))
-                                                   : Value();
+    return reading.budget().takeText(child, error) ? reading.document().text(child) : Value();
 }
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,

@@ -28,9 +28,9 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     if (!reading.budget().takeText(holder, error))
         return false;
     const bool isChild = holder != source.element();
-    const String text = isChild ? reading.document().text(holder) : source.stringValue();
-    if (!text.isEmpty())
-        return takeValue(target.object, field, field.key, text, error);
+    Value text = isChild ? reading.document().text(holder) : source.stringValue();
+    if (!text.view().empty())
+        return takeValue(target.object, field, field.key, std::move(text), error);
     if (field.isRequired)
         return fail(error, errors::requiredTextMissing, field.key.string(),
                     reading.quoted(source.element()));
