@@ -2,13 +2,25 @@
 
 // The base of the nodes that a mapping document is read into: document, class, field and bind-xml
 // mappings. A node keeps the element it was made from, and the text of the one "description" child
-// that any of them may have. Nodes are immutable once made (but for the back-references that are
-// set while their parent is made) and may be read by several threads.
+// that any of them may have, and knows where it stands. Nodes are immutable once made (but for the
+// back-references that are set while their parent is made) and may be read by several threads.
 
 #include <QXXMLMarshalling/model/Error.h>
 #include <QXXMLMarshalling/xml/XMLElement.h>
 
 #include <vector>
+
+namespace qx::detail {
+class MappingSource;
+} // namespace qx::detail
+
+// A place in a mapping document. Line and column are those of an element's "<", 1-based, a column
+// being one character (code point); both are 0 in a tree that was made by hand.
+struct QXXMLMappingPlace {
+    qx::String documentName; // null where the document has none
+    std::size_t line = 0;
+    std::size_t column = 0;
+};
 
 class QX_API QXXMLMapping : public qx::Object {
 public:
@@ -28,6 +40,14 @@ public:
 
     // The text of the "description" child, which may be empty; null without one.
     const qx::String& mappingDescription() const noexcept { return _mappingDescription; }
+
+    // Where the node's element stands in its mapping document. The document's name is the path of
+    // the file that it was read from, or its XMLDocument::documentName(); for an included document
+    // that has neither, the name by which it was included.
+    QXXMLMappingPlace place() const;
+    // The "include" elements that led to the node's document, the nearest first. Empty for what
+    // stands in the document that the mapping was made from.
+    std::vector<QXXMLMappingPlace> includedFrom() const;
 
     // Class name and address, then each item that is present as " key: value"; nested lists follow
     // in the list format of qx::Array. The locale is not used.
@@ -49,8 +69,9 @@ public:
                                         qx::Ref<qx::Error>* error = nullptr);
 
 protected:
-    QXXMLMapping() = default;
+    QXXMLMapping();
     friend qx::Ref<QXXMLMapping> qx::make<QXXMLMapping>();
+    friend class qx::detail::MappingSource;
 
     // Reads the element; false with the error set. Subclasses call their base's first.
     virtual bool initXML(qx::XMLElement& element, qx::Ref<qx::Error>* error);
@@ -76,7 +97,10 @@ protected:
 
 private:
     bool readElement(qx::XMLElement* element, qx::Ref<qx::Error>* error);
+    bool readElement(qx::XMLElement* element, qx::Ref<qx::Error>* error,
+                     const qx::Ref<qx::detail::MappingSource>& source);
 
     qx::Ref<qx::XMLElement> _element;
+    qx::Ref<qx::detail::MappingSource> _source; // shared by the nodes of a document
     qx::String _mappingDescription;
 };

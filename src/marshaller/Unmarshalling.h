@@ -17,6 +17,7 @@
 #include "marshaller/ConsumedNames.h"
 #include "marshaller/NamespaceMatching.h"
 #include "marshaller/ObjectAccess.h"
+#include "marshaller/ReadingContext.h"
 #include "marshaller/ReadingProgress.h"
 #include "plan/MappingPlan.h"
 
@@ -64,6 +65,16 @@ public:
     // `plan` is the class whose fields were bound, null where they were bound one by one.
     bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error);
 
+    // An error that the slot holds from before stays as it is.
+    void startWith(ErrorSlot error) noexcept {
+        _earlier = error != nullptr ? error->get() : nullptr;
+    }
+    // Tells the error that a step has left in the slot where it came about, unless it knows.
+    void locate(ErrorSlot error, const ReadingSpot& spot) {
+        if (error != nullptr && *error && error->get() != _earlier)
+            ReadingContext::tell(*error, _document, _mapping.get(), spot);
+    }
+
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
@@ -97,10 +108,12 @@ private:
     class LentNames;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
+    Number placeOf(const FieldPlan& field, const Target& target) const;
     bool mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
+    bool refuse(Number unknown, ErrorSlot error);
     bool validateChildren(const Target& target, ErrorSlot error);
     bool keepChildren(const Target& target, const CountedSet& names, const CountedSet& written,
                       ErrorSlot error);
@@ -118,6 +131,7 @@ private:
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
+    const Error* _earlier = nullptr;
     Number _wrapper = none; // see setWrapper
     // A pool of consumed names; the first few are lent to the objects that are being bound.
     std::vector<std::unique_ptr<ConsumedNames>> _names;

@@ -105,8 +105,10 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
         reading.setWrapper(items.wrapper);
         const Value item = make(node);
         reading.setWrapper(Unmarshalling::none);
-        if ((error != nullptr && *error) || reading.budget().isSpent())
+        if ((error != nullptr && *error) || reading.budget().isSpent()) {
+            reading.locate(error, {node, &field, nullptr});
             return false;
+        }
         if (item.isNull())
             continue;
         if (!items.areCounted)

@@ -3,6 +3,8 @@
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "mapping/MappingSource.h"
+
 #include <algorithm>
 
 namespace qx::detail {
@@ -29,29 +31,32 @@ bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
 bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error) {
     // Made even without an include: hosts rely on the shared manager being there afterwards.
     const auto manager = QXXMLDataRepositoryManager::defaultManager();
-    for (const String& href : document.includes()) {
+    for (std::size_t i = 0; i < document.includes().size(); ++i) {
+        const String& href = document.includes()[i];
         const bool isCycle = std::any_of(_open.begin(), _open.end(),
                                          [&](const String* open) { return *open == href; });
         if (isCycle || _open.size() == deepestInclude || _count == mostIncludes)
             return fail(error, errors::unableToLoadInclude, href);
         ++_count;
         _open.push_back(&href);
-        if (!loadInclude(*manager, href, error))
+        if (!loadInclude(*manager, document, i, error))
             return false;
         _open.pop_back();
     }
     return true;
 }
 
-bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager, const String& href,
+bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager,
+                                const QXXMLDocumentMapping& includer, std::size_t number,
                                 Ref<Error>* error) {
+    const String& href = includer.includes()[number];
     std::uint64_t size = 0;
     Ref<Error> problem;
     const auto document = manager.documentNamed(href, &size, &problem);
     bool loaded = false;
     if (!problem) {
         try {
-            loaded = resolve(document.get(), &problem);
+            loaded = resolve(document.get(), includer, number, &problem);
         } catch (const Exception&) {
             return fail(error, errors::unableToLoadInclude, href);
         }
@@ -61,11 +66,16 @@ bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager, const
     return loaded;
 }
 
-bool IncludeLoader::resolve(XMLDocument* document, Ref<Error>* error) {
+bool IncludeLoader::resolve(XMLDocument* document, const QXXMLDocumentMapping& includer,
+                            std::size_t number, Ref<Error>* error) {
     XMLElement* const root = document != nullptr ? document->rootElement() : nullptr;
     const auto mapping = QXXMLDocumentMapping::initWithXML(root, error);
     if (!mapping || *error)
         return false;
+    auto& source = MappingSource::of(*mapping);
+    if (source.name().isNull())
+        source.setName(includer.includes()[number]);
+    source.setIncluder(Ref(&MappingSource::of(includer)), includer.includePlace(number));
     _included.push_back(mapping);
     return load(*mapping, error);
 }

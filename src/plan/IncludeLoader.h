@@ -22,9 +22,11 @@ public:
 
 private:
     bool loadIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error);
-    bool loadInclude(const QXXMLDataRepositoryManager& manager, const String& href,
-                     Ref<Error>* error);
-    bool resolve(XMLDocument* document, Ref<Error>* error);
+    // The include of that number in the includer.
+    bool loadInclude(const QXXMLDataRepositoryManager& manager,
+                     const QXXMLDocumentMapping& includer, std::size_t number, Ref<Error>* error);
+    bool resolve(XMLDocument* document, const QXXMLDocumentMapping& includer, std::size_t number,
+                 Ref<Error>* error);
 
     MergedClasses _classes;
     std::vector<Ref<QXXMLDocumentMapping>> _included;

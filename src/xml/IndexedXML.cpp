@@ -56,11 +56,15 @@ Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number numbe
     return node;
 }
 
-IndexedXML::IndexedXML(const ParsedDocument& parsed) : _index(&parsed.index()) { findRoot(); }
+IndexedXML::IndexedXML(const ParsedDocument& parsed, String documentName)
+    : _parsed(&parsed), _index(&parsed.index()), _documentName(std::move(documentName)) {
+    findRoot();
+}
 
-IndexedXML::IndexedXML(XMLDocument& document) {
+IndexedXML::IndexedXML(XMLDocument& document) : _documentName(document.documentName()) {
     _reader.emplace(document);
     if (_reader->parsed() != nullptr) {
+        _parsed = _reader->parsed();
         _index = &_reader->parsed()->index();
         findRoot();
         internNames();
@@ -75,7 +79,7 @@ IndexedXML::IndexedXML(XMLElement* element, Content content) { readTree(element,
 void IndexedXML::readTree(XMLElement* element, Content content) {
     if (element == nullptr)
         return;
-    _tree.emplace(*element);
+    _tree = std::make_shared<XMLTreeIndexer>(*element);
     _index = &_tree->index();
     _root = 0;
     if (content == Content::atOnce)
@@ -240,7 +244,7 @@ IndexedXML::Extent IndexedXML::extent(Number element, std::size_t enough) {
 NodePool& IndexedXML::pool(Nodes nodes) {
     auto& pool = nodes == Nodes::own ? _own : _copies;
     if (!pool)
-        pool = std::make_unique<NodePool>(index(), _tree ? &*_tree : nullptr);
+        pool = std::make_unique<NodePool>(index(), _tree.get());
     return *pool;
 }
 
@@ -272,6 +276,20 @@ Ref<XMLNode> IndexedXML::quoted(Number number) {
     if (number == none)
         return nullptr;
     return isElement(number) ? element(Nodes::own, number) : XMLNodeMaker(index()).node(number);
+}
+
+const std::shared_ptr<const DocumentPlaces>& IndexedXML::places() {
+    if (_places)
+        return _places;
+    if (const XMLDocument* const document = _tree ? _tree->element(0).rootDocument() : nullptr)
+        _documentName = document->documentName();
+    if (_tree)
+        _places = std::make_shared<DocumentPlaces>(_tree, _documentName);
+    else if (_parsed != nullptr)
+        _places = std::make_shared<DocumentPlaces>(_parsed->shared_from_this(), _documentName);
+    else
+        _places = std::make_shared<DocumentPlaces>();
+    return _places;
 }
 
 void IndexedXML::detach(Number element) {

@@ -4,6 +4,7 @@
 // everything as it stood at the start, and the nodes behind its entries where somebody needs one.
 // Used by one thread at a time.
 
+#include "xml/DocumentPlaces.h"
 #include "xml/XMLDocumentContent.h"
 #include "xml/XMLTreeIndexer.h"
 
@@ -20,8 +21,8 @@ public:
     using Number = XMLIndex::Number;
     static constexpr Number none = UINT32_MAX;
 
-    // Borrows what was parsed, of nobody's document.
-    explicit IndexedXML(const ParsedDocument& parsed);
+    // Borrows what was parsed, of nobody's document, which messages call by that name.
+    explicit IndexedXML(const ParsedDocument& parsed, String documentName = {});
     // The document's own, without making its nodes, if it has none.
     explicit IndexedXML(XMLDocument& document);
     // Of an element the content is read at once, or, where only some of it may be needed, as it is
@@ -127,6 +128,8 @@ public:
     bool isMade(Nodes nodes, Number number) const;
     // Takes the element out of the host's tree; nothing where the host has none.
     void detach(Number element);
+    // Where its entries stand; good for longer than the reading. Made when first asked for.
+    const std::shared_ptr<const DocumentPlaces>& places();
 
 private:
     const XMLIndex& index() const noexcept { return *_index; }
@@ -145,7 +148,8 @@ private:
     NodePool& pool(Nodes nodes);
 
     std::optional<XMLDocumentContent::Reader> _reader;
-    std::optional<XMLTreeIndexer> _tree;
+    std::shared_ptr<XMLTreeIndexer> _tree;
+    const ParsedDocument* _parsed = nullptr;
     const XMLIndex* _index = nullptr; // what was parsed, or the tree's; null where there is nothing
     const String _noName;
     Number _root = none;
@@ -160,6 +164,8 @@ private:
     std::unordered_map<Number, std::unordered_map<const void*, Number>> _attributes;
     std::unique_ptr<NodePool> _own;
     std::unique_ptr<NodePool> _copies;
+    String _documentName;
+    std::shared_ptr<const DocumentPlaces> _places;
 };
 
 } // namespace qx

@@ -121,6 +121,19 @@ TEST_F(MarshallingMapping, AsksOneManagerForAllIncludesAndCatchesWhatIsRaisedBel
     EXPECT_EQ(resolve("<include href='flush'/><include href='d'/>"), "D ");
 }
 
+TEST_F(MarshallingMapping, TellsWhichIncludesLedToAClass) {
+    repository->documents = {{"b", "\n<include href='c'/>"}, {"c", "<class name='C'/>"}};
+    const auto document = mappingOf("<include href='none'/><include href='b'/>");
+    document->setDocumentName("outer.xml");
+    const auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get());
+    const QXXMLClassMapping& included = *mapping->mappingForClassName("C");
+    std::string told = included.place().documentName.str();
+    for (const QXXMLMappingPlace& place : included.includedFrom())
+        told += " from " + place.documentName.str() + ':' + std::to_string(place.line) + ':' +
+                std::to_string(place.column);
+    EXPECT_EQ(told, "c from b:2:1 from outer.xml:1:32");
+}
+
 TEST_F(MarshallingMapping, FailsForASlotThatHoldsAnErrorAlready) {
     Ref<Error> error = qx::make<Error>(Error::cocoaDomain, 1, "old", "old");
     EXPECT_FALSE(QXXMLMarshallingMapping::initWithDocument(mappingOf("").get(), &error));
