@@ -14,13 +14,8 @@ namespace qx::detail {
 class MappingSource;
 } // namespace qx::detail
 
-// A place in a mapping document. Line and column are those of an element's "<", 1-based, a column
-// being one character (code point); both are 0 in a tree that was made by hand.
-struct QXXMLMappingPlace {
-    qx::String documentName; // null where the document has none
-    std::size_t line = 0;
-    std::size_t column = 0;
-};
+// A place in a mapping document: that of an element's "<", 0:0 in a tree that was made by hand.
+using QXXMLMappingPlace = qx::DocumentPlace;
 
 class QX_API QXXMLMapping : public qx::Object {
 public:
@@ -80,6 +75,10 @@ protected:
     const qx::Class& describedClass() const override;
 
     qx::XMLElement& element() const noexcept { return *_element; }
+
+    // Whether reading goes on: the step succeeded, or all faults are collected and its error was
+    // put to them.
+    bool goesOn(bool succeeded, qx::Ref<qx::Error>* error) const;
 
     // Makes a T and reads the element into it: what the init… operations of subclasses are made of.
     template <class T, class... Arguments>

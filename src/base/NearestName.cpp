@@ -21,7 +21,7 @@ constexpr std::size_t longestFolded = 1'024;
 constexpr std::uint32_t sameButCase = 0;
 constexpr std::uint32_t sameButPrefix = 1;
 constexpr std::uint32_t firstEdit = 2;
-constexpr std::uint32_t beginning = 10;
+constexpr std::uint32_t half = 10;
 constexpr std::uint32_t notNear = 20;
 
 // So many edits leave a name of that length recognisable.
@@ -29,8 +29,9 @@ std::uint32_t mostEdits(std::size_t length) {
     return length < 3 ? 0 : length < 6 ? 1 : length < 9 ? 2 : 3;
 }
 
-bool isBeginning(std::u32string_view part, std::u32string_view whole) {
-    return part.size() >= 3 && part.size() * 2 >= whole.size() && whole.starts_with(part);
+bool isHalf(std::u32string_view part, std::u32string_view whole) {
+    return part.size() >= 3 && part.size() * 2 >= whole.size() &&
+           (whole.starts_with(part) || whole.ends_with(part));
 }
 
 std::string_view bounded(std::string_view name) { return name.substr(0, longestFolded); }
@@ -79,9 +80,9 @@ std::uint32_t NearestName::distanceTo(const Folded& candidate) {
     const std::uint32_t edits = editsBetween(candidate.whole, _folded.whole, most);
     if (edits <= most)
         return firstEdit + edits;
-    const bool begins =
-        isBeginning(candidate.whole, _folded.whole) || isBeginning(_folded.whole, candidate.whole);
-    return begins ? beginning : notNear;
+    const bool isPart =
+        isHalf(candidate.whole, _folded.whole) || isHalf(_folded.whole, candidate.whole);
+    return isPart ? half : notNear;
 }
 
 // The table of edits between all beginnings of the two, a row at a time; of two earlier rows the

@@ -7,7 +7,8 @@
 //     2  the same behind another prefix, or none          atom:feed  feed
 //     3  few edits away: a character more, less or        pirce      price
 //        another, or two neighbours swapped
-//     4  the beginning of one is the other                bool       boolean
+//     4  one is the beginning or the end of the other,    bool       boolean
+//        and no less than half of it
 //
 //     NearestName nearest("pirce");
 //     for (const auto& field : fields)

@@ -14,9 +14,34 @@ Ref<MappingSource> MappingSource::of(const XMLElement* element) {
     return source;
 }
 
-void MappingSource::setIncluder(Ref<MappingSource> includer, const QXXMLMappingPlace& place) {
-    _includer = std::move(includer);
-    _place = place;
+Ref<MappingSource> MappingSource::included(const QXXMLDocumentMapping& includer, std::size_t number,
+                                           const XMLDocument* document) {
+    auto source = make<MappingSource>();
+    if (document != nullptr)
+        source->_name = document->documentName();
+    if (source->_name.isNull())
+        source->_name = includer.includes()[number];
+    source->_includer = Ref(&of(includer));
+    source->_place = includer.includePlace(number);
+    source->_faults = source->_includer->_faults;
+    return source;
+}
+
+Ref<QXXMLDocumentMapping> MappingSource::read(XMLElement* root, Ref<Error>* error) {
+    auto mapping = make<QXXMLDocumentMapping>();
+    QXXMLMapping& node = *mapping;
+    return node.readElement(root, error, Ref(this)) ? mapping : nullptr;
+}
+
+void MappingSource::addFault(Ref<Error> fault, const QXXMLMappingPlace& place) const {
+    QXXMLFinding finding;
+    finding.severity = QXXMLFinding::Severity::error;
+    finding.kind = "fault";
+    finding.text = fault->localizedDescription();
+    finding.place = place;
+    finding.includedFrom = chain();
+    finding.fault = std::move(fault);
+    _faults->push_back(std::move(finding));
 }
 
 std::vector<QXXMLMappingPlace> MappingSource::chain() const {

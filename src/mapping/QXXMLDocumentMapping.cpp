@@ -32,9 +32,10 @@ bool QXXMLDocumentMapping::processClasses(const std::vector<XMLElement*>& elemen
                                           Ref<Error>* error) {
     for (XMLElement* element : elements) {
         auto mapping = QXXMLClassMapping::initWithXML(element, error);
-        if (!mapping)
+        if (!goesOn(mapping != nullptr, error))
             return false;
-        _classMappings.push_back(std::move(mapping));
+        if (mapping && !mapping->className().isNull())
+            _classMappings.push_back(std::move(mapping));
     }
     return true;
 }

@@ -6,6 +6,8 @@
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
 
+#include <utility>
+
 using qx::Error;
 using qx::Key;
 using qx::Ref;
@@ -61,10 +63,18 @@ bool QXXMLMapping::initXML(XMLElement& element, Ref<Error>* error) {
     static const Key descriptionKey("description");
     _element = Ref<XMLElement>(&element);
     const auto descriptions = element.elementsForName(descriptionKey);
-    if (descriptions.size() > 1)
-        return qx::fail(error, qx::errors::tooManyDescriptions, &element);
+    if (descriptions.size() > 1 &&
+        !goesOn(qx::fail(error, qx::errors::tooManyDescriptions, &element), error))
+        return false;
     if (!descriptions.empty())
         _mappingDescription = descriptions.front()->stringValue();
+    return true;
+}
+
+bool QXXMLMapping::goesOn(bool succeeded, Ref<Error>* error) const {
+    if (succeeded || error == nullptr || !*error || !_source->collectsFaults())
+        return succeeded;
+    _source->addFault(std::exchange(*error, nullptr), place());
     return true;
 }
 

@@ -109,10 +109,14 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
         ~Restore() { current = outer; }
     } const restore{_frame, _frame};
     _frame = &frame;
+    if (_trace != nullptr)
+        _trace->enter(plan, source.element(), *object);
     const LentNames fields(*this);
     const LentNames attributes(*this);
     if (!readFields(plan, {*object, source, {*fields, *attributes}, isFlattened}, error))
         return nullptr;
+    if (_trace != nullptr)
+        _trace->leave();
     if (record != nullptr)
         record->setNotifyBindingsObservers(true);
     else if (isAsked && hooks->setNotifyBindingsObservers != nullptr)
@@ -197,6 +201,8 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
             kept = make<Array>();
         if (fits)
             kept->add(std::move(node));
+        if (_trace != nullptr)
+            _trace->keep(ReadingTrace::Form::declaration, declaration);
     };
     _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, element,
                             [&](Number declaration) { keep(declaration, element); });
@@ -258,9 +264,12 @@ Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress
     return object;
 }
 
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
+                         ReadingTrace* trace) {
     ReadingProgress progress(marshaller, document.size());
-    auto object = Unmarshalling(marshaller, document).read(document.root(), error, &progress);
+    Unmarshalling reading(marshaller, document);
+    reading.setTrace(trace);
+    auto object = reading.read(document.root(), error, &progress);
     // Without a slot a collection leaves out what fails.
     return progress.isCancelled() ? nullptr : object;
 }

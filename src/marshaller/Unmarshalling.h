@@ -19,6 +19,7 @@
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/ReadingContext.h"
 #include "marshaller/ReadingProgress.h"
+#include "marshaller/ReadingTrace.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -48,6 +49,8 @@ public:
     // The document must outlive the call.
     Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
+    // From here on it is told what becomes of each entry; it outlives the call.
+    void setTrace(ReadingTrace* trace) noexcept { _trace = trace; }
     // In an undo group of its own.
     Ref<Object> read(Number element, ErrorSlot error, ReadingProgress* progress = nullptr);
     // `nodes` are those that are kept of the element.
@@ -79,6 +82,8 @@ public:
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
     IndexedXML& document() noexcept { return _document; }
+    // Null where nobody wants one.
+    ReadingTrace* trace() const noexcept { return _trace; }
     // The class that maps to an element of that name; null where none does.
     const ClassPlan* classForElement(Number element) const {
         return _plan.classForElement(_document.name(element));
@@ -128,6 +133,7 @@ private:
     ReadingBudget _budget;
     ObjectAccess _access;
     ReadingProgress* _progress = nullptr;
+    ReadingTrace* _trace = nullptr;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
@@ -139,6 +145,7 @@ private:
 };
 
 // A whole document, in one undo group.
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error);
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
+                         ReadingTrace* trace = nullptr);
 
 } // namespace qx::detail

@@ -49,6 +49,9 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     if (child != Unmarshalling::none) {
         if (target.isFlattened)
             target.source.take(child);
+        if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
+            trace->take(ReadingTrace::Form::child, field, child,
+                        static_cast<std::size_t>(binding - field.bindings.data()));
         value = valueOf(reading, field, target, child, binding->classOfName, &problem);
     }
     return setElementValue(reading, field, target, std::move(value), std::move(problem),

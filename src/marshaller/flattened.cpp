@@ -19,6 +19,8 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, ChildLookup& sourc
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
     Ref<Error> problem;
+    if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
+        trace->take(ReadingTrace::Form::flattened, field, target.source.element());
     Value value = valueOf(reading, field, target.source, &problem);
     return setElementValue(reading, field, target, std::move(value), std::move(problem), {}, error);
 }

@@ -12,6 +12,7 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
           Ref<Error>* error) {
     ChildLookup& source = target.source;
     auto holder = source.element();
+    std::size_t number = 0;
     for (const BindingPlan& binding : field.bindings) {
         if (binding.bindTo.isEmpty())
             continue;
@@ -22,6 +23,7 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
         if (found.first != Unmarshalling::none) {
             target.bound.fields.add(binding.bindTo);
             holder = found.first;
+            number = static_cast<std::size_t>(&binding - field.bindings.data());
             break;
         }
     }
@@ -29,6 +31,9 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
         return false;
     const bool isChild = holder != source.element();
     Value text = isChild ? reading.document().text(holder) : source.stringValue();
+    if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
+        trace->take(isChild ? ReadingTrace::Form::child : ReadingTrace::Form::text, field, holder,
+                    number);
     if (!text.view().empty())
         return takeValue(target.object, field, field.key, std::move(text), error);
     if (field.isRequired)

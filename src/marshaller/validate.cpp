@@ -113,6 +113,8 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names,
         fits = node.get() != nullptr;
         if (fits)
             elements->add(node);
+        if (_trace != nullptr)
+            _trace->keep(ReadingTrace::Form::keptChild, child);
     });
     // A processing instruction leaves a name alone.
     std::size_t lone = 0;
@@ -152,6 +154,8 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
         fits = node.get() != nullptr;
         if (fits)
             kept->add(std::move(node));
+        if (_trace != nullptr)
+            _trace->keep(ReadingTrace::Form::keptAttribute, attribute);
     };
     _document.forEachOfKind(XMLNodeKind::attribute, target.source.element(), keep);
     return fits && _access.setKept(target.object, KeptXML::attributes, kept, error);

@@ -16,15 +16,16 @@ TEST(NearestName, IsWhatTheWriterMeantOrNothing) {
         "price", "prices",  "quantity",      "id",        "feed",  "boolean",
         "int",   "integer", "auto-complete", "po:number", "größe", "order"};
     const std::pair<const char*, const char*> cases[] = {
-        {"pirce", "price"},        // neighbours swapped
-        {"prce", "price"},         // a character less
-        {"pricess", "prices"},     // the nearer of two
-        {"PRICE", "price"},        // case comes before edits
-        {"atom:feed", "feed"},     // another prefix
-        {"a:number", "po:number"}, //
-        {"number", "po:number"},   // or none
-        {"bool", "boolean"},       // the beginning
-        {"integr", "integer"},     //
+        {"pirce", "price"},            // neighbours swapped
+        {"prce", "price"},             // a character less
+        {"pricess", "prices"},         // the nearer of two
+        {"PRICE", "price"},            // case comes before edits
+        {"atom:feed", "feed"},         // another prefix
+        {"a:number", "po:number"},     //
+        {"number", "po:number"},       // or none
+        {"bool", "boolean"},           // the beginning
+        {"complete", "auto-complete"}, // the end
+        {"integr", "integer"},         //
         {"autoComplete", "auto-complete"},
         {"qunatiyt", "quantity"}, // two swaps
         {"grösse", ""},           // two edits are too many for so few letters

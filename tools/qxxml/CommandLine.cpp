@@ -15,7 +15,7 @@ namespace qxxml {
 
 namespace {
 
-using Command = std::string (*)(const Options&);
+using Command = std::function<std::string(const Options&)>;
 
 constexpr int failed = 1;
 constexpr int wrongUsage = 2;
@@ -98,6 +98,12 @@ void addReading(CLI::App& command, Options& options) {
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
+void addChecking(CLI::App& command, Options& options) {
+    addMapping(command, options);
+    command.add_flag("--notes", options.notes, "Print what is only worth a note, too");
+    command.add_flag("--json", options.json, "Print an array of findings as JSON");
+}
+
 void addInferring(CLI::App& command, Options& options) {
     command
         .add_option("DOCUMENT", options.documents, "The paths of documents; - is standard input")
@@ -111,8 +117,9 @@ void addInferring(CLI::App& command, Options& options) {
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
-// Defines the commands; the one that was called is left in `chosen`.
-void define(CLI::App& tool, Options& options, Command& chosen) {
+// Defines the commands; the one that was called is left in `chosen`, what it says of its exit in
+// `status`.
+void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     tool.require_subcommand(1);
     tool.set_version_flag("--version", "qxxml " QX_VERSION, "Print the version and exit");
     const auto add = [&](const char* name, const char* purpose, Command command) {
@@ -138,6 +145,12 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
     command = add("roundtrip", "Read a document, write its object and print that", roundtrip);
     addReading(*command, options);
     command->add_flag("--pretty", options.pretty, "Print one element a line");
+    addSearch(*command, options);
+
+    command = add("check", "Tell what a mapping does that its author may not want", nullptr);
+    command->callback(
+        [&] { chosen = [&status](const Options& given) { return check(given, status); }; });
+    addChecking(*command, options);
     addSearch(*command, options);
 
     command = add("infer", "Print a mapping that fits documents which have none", infer);
@@ -169,7 +182,8 @@ int runCommandLine(int argc, const char* const* argv) try {
     Options options;
     Command command = nullptr;
     CLI::App tool("Tries mapping documents on XML documents.", "qxxml");
-    define(tool, options, command);
+    int status = 0;
+    define(tool, options, command, status);
     try {
         tool.parse(argc, argv);
     } catch (const CLI::ParseError& error) {
@@ -177,7 +191,7 @@ int runCommandLine(int argc, const char* const* argv) try {
     }
     print(command(options));
     flushOutput();
-    return 0;
+    return status;
 } catch (const std::bad_alloc&) {
     std::fputs("qxxml: error 12: Out of memory\n", stderr);
     return failed;
