@@ -20,6 +20,8 @@ public:
 
     // The "href" of each "include" that has one, in document order, as written.
     const std::vector<qx::String>& includes() const noexcept { return _includes; }
+    // Where the "include" of that number in includes() stands.
+    QXXMLMappingPlace includePlace(std::size_t index) const;
     // In document order, then those that were merged.
     const std::vector<qx::Ref<QXXMLClassMapping>>& classMappings() const noexcept {
         return _classMappings;
@@ -48,4 +50,5 @@ private:
 
     std::vector<qx::Ref<QXXMLClassMapping>> _classMappings;
     std::vector<qx::String> _includes;
+    std::vector<qx::Ref<qx::XMLElement>> _includeElements;
 };

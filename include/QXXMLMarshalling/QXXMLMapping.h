@@ -2,13 +2,20 @@
 
 // The base of the nodes that a mapping document is read into: document, class, field and bind-xml
 // mappings. A node keeps the element it was made from, and the text of the one "description" child
-// that any of them may have. Nodes are immutable once made (but for the back-references that are
-// set while their parent is made) and may be read by several threads.
+// that any of them may have, and knows where it stands. Nodes are immutable once made (but for the
+// back-references that are set while their parent is made) and may be read by several threads.
 
 #include <QXXMLMarshalling/model/Error.h>
 #include <QXXMLMarshalling/xml/XMLElement.h>
 
 #include <vector>
+
+namespace qx::detail {
+class MappingSource;
+} // namespace qx::detail
+
+// A place in a mapping document: that of an element's "<", 0:0 in a tree that was made by hand.
+using QXXMLMappingPlace = qx::DocumentPlace;
 
 class QX_API QXXMLMapping : public qx::Object {
 public:
@@ -28,6 +35,14 @@ public:
 
     // The text of the "description" child, which may be empty; null without one.
     const qx::String& mappingDescription() const noexcept { return _mappingDescription; }
+
+    // Where the node's element stands in its mapping document. The document's name is the path of
+    // the file that it was read from, or its XMLDocument::documentName(); for an included document
+    // that has neither, the name by which it was included.
+    QXXMLMappingPlace place() const;
+    // The "include" elements that led to the node's document, the nearest first. Empty for what
+    // stands in the document that the mapping was made from.
+    std::vector<QXXMLMappingPlace> includedFrom() const;
 
     // Class name and address, then each item that is present as " key: value"; nested lists follow
     // in the list format of qx::Array. The locale is not used.
@@ -49,8 +64,9 @@ public:
                                         qx::Ref<qx::Error>* error = nullptr);
 
 protected:
-    QXXMLMapping() = default;
+    QXXMLMapping();
     friend qx::Ref<QXXMLMapping> qx::make<QXXMLMapping>();
+    friend class qx::detail::MappingSource;
 
     // Reads the element; false with the error set. Subclasses call their base's first.
     virtual bool initXML(qx::XMLElement& element, qx::Ref<qx::Error>* error);
@@ -59,6 +75,10 @@ protected:
     const qx::Class& describedClass() const override;
 
     qx::XMLElement& element() const noexcept { return *_element; }
+
+    // Whether reading goes on: the step succeeded, or all faults are collected and its error was
+    // put to them.
+    bool goesOn(bool succeeded, qx::Ref<qx::Error>* error) const;
 
     // Makes a T and reads the element into it: what the init… operations of subclasses are made of.
     template <class T, class... Arguments>
@@ -76,7 +96,10 @@ protected:
 
 private:
     bool readElement(qx::XMLElement* element, qx::Ref<qx::Error>* error);
+    bool readElement(qx::XMLElement* element, qx::Ref<qx::Error>* error,
+                     const qx::Ref<qx::detail::MappingSource>& source);
 
     qx::Ref<qx::XMLElement> _element;
+    qx::Ref<qx::detail::MappingSource> _source; // shared by the nodes of a document
     qx::String _mappingDescription;
 };

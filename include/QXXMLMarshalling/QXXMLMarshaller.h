@@ -55,7 +55,8 @@ public:
     // has no home at all, whether or not the mapping includes others.
     static qx::Ref<QXXMLMarshaller> initWithMappingXML(qx::XMLDocument* document,
                                                        qx::Ref<qx::Error>* error = nullptr);
-    // Null with the error of reading the document (XMLDocument.h), or as above.
+    // Null with the error of reading the document (XMLDocument.h), or as above. Documents that it
+    // includes are looked for in the repositories, then beside the file.
     static qx::Ref<QXXMLMarshaller> initWithMappingURL(const qx::String& URL,
                                                        qx::Ref<qx::Error>* error = nullptr);
     static qx::Ref<QXXMLMarshaller> initWithMappingFile(const qx::String& path,

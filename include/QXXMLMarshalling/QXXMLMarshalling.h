@@ -19,6 +19,7 @@
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
+#include <QXXMLMarshalling/QXXMLFinding.h>
 #include <QXXMLMarshalling/QXXMLMapping.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>

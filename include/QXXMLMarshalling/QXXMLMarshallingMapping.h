@@ -7,14 +7,26 @@
 //     auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), &error);
 
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
+#include <QXXMLMarshalling/QXXMLFinding.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <memory>
 
 namespace qx::detail {
 class ClassPlan;
+class IncludeLoader;
+class MappingCheck;
 class MappingPlan;
 } // namespace qx::detail
+
+// How a mapping is made.
+struct QXXMLMappingOptions {
+    // The folder where an included document is looked for last, when no repository has it; null for
+    // nowhere. A name that leads out of the folder finds nothing there, as in the repositories.
+    qx::String includeFolder = {};
+    // Goes on behind a fault, to find all of them in one run: see faults().
+    bool collectsFaults = false;
+};
 
 class QX_API QXXMLMarshallingMapping final : public qx::Object {
 public:
@@ -32,12 +44,31 @@ public:
     // NSInternalInconsistencyException, "No application support directories found".
     static qx::Ref<QXXMLMarshallingMapping> initWithDocument(qx::XMLDocument* document,
                                                              qx::Ref<qx::Error>* error = nullptr);
+    static qx::Ref<QXXMLMarshallingMapping> initWithDocument(qx::XMLDocument* document,
+                                                             const QXXMLMappingOptions& options,
+                                                             qx::Ref<qx::Error>* error = nullptr);
+    // The same for a file, whose folder is the `includeFolder` unless the options say another.
+    // Null, too, with the error of reading the file (XMLDocument.h).
+    static qx::Ref<QXXMLMarshallingMapping>
+    initWithContentsOfFile(const qx::String& path, qx::Ref<qx::Error>* error = nullptr);
+    static qx::Ref<QXXMLMarshallingMapping>
+    initWithContentsOfFile(const qx::String& path, const QXXMLMappingOptions& options,
+                           qx::Ref<qx::Error>* error = nullptr);
     ~QXXMLMarshallingMapping() override;
 
     // The document given at construction.
     qx::XMLDocument* document() const noexcept { return _document.get(); }
     // The document mapping, with the class mappings of all included documents.
     QXXMLDocumentMapping* mapping() const noexcept { return _mapping.get(); }
+
+    // All faults, in the order in which they were met; empty where faults were not collected. A
+    // mapping that has any holds what is left without the faulty parts: it serves check(), and the
+    // error slot has the first fault.
+    const std::vector<QXXMLFinding>& faults() const noexcept { return _faults; }
+    // What its author may not have wanted: faults(), and what reads or writes other than it looks.
+    // In the order of the documents, each document's own before those of its includes. Classes that
+    // the program has described are compared with those of the mapping.
+    std::vector<QXXMLFinding> check() const;
 
     // Exact, case-sensitive look-ups; null where nothing is found. The element name is that of
     // "map-to", or the class name in lower case where there is none. A node is looked up under its
@@ -55,14 +86,19 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
+    friend class qx::detail::MappingCheck;
     friend class qx::detail::MappingPlan;
     friend qx::Ref<QXXMLMarshallingMapping> qx::make<QXXMLMarshallingMapping>();
 
     QXXMLMarshallingMapping();
-    bool init(qx::XMLDocument* document, qx::Ref<qx::Error>* error);
+    bool init(qx::XMLDocument* document, const QXXMLMappingOptions& options,
+              qx::Ref<qx::Error>* error);
+    void endCollecting(qx::Ref<qx::Error>* error);
     QXXMLClassMapping* mappingOf(const qx::detail::ClassPlan* plan) const;
 
     qx::Ref<QXXMLDocumentMapping> _mapping;
     qx::Ref<qx::XMLDocument> _document;
+    std::unique_ptr<qx::detail::IncludeLoader> _includes;
+    std::vector<QXXMLFinding> _faults;
     std::unique_ptr<qx::detail::MappingPlan> _plan;
 };

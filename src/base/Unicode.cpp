@@ -4,6 +4,7 @@
 
 #include <unicode/brkiter.h>
 #include <unicode/locid.h>
+#include <unicode/uchar.h>
 #include <unicode/unistr.h>
 #include <unicode/utf16.h>
 #include <unicode/utf8.h>
@@ -74,6 +75,29 @@ bool equalIgnoringCase(std::string_view a, std::string_view b) {
                           [](char x, char y) { return asciiLower(x) == asciiLower(y); });
     }
     return decoded(a).caseCompare(decoded(b), U_FOLD_CASE_DEFAULT) == 0;
+}
+
+std::size_t endOfCharacters(std::string_view text, std::size_t count) noexcept {
+    const auto size = static_cast<std::int32_t>(std::min<std::size_t>(text.size(), INT32_MAX));
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
+    std::int32_t end = 0;
+    for (UChar32 point = 0; count != 0 && end < size; --count)
+        U8_NEXT(bytes, end, size, point);
+    return static_cast<std::size_t>(end);
+}
+
+std::size_t terminalWidth(std::string_view character) noexcept {
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(character.data());
+    std::int32_t at = 0;
+    UChar32 point = 0;
+    U8_NEXT(bytes, at, static_cast<std::int32_t>(character.size()), point);
+    if (point < 0)
+        return 1;
+    const std::int8_t kind = u_charType(point);
+    if (kind == U_NON_SPACING_MARK || kind == U_ENCLOSING_MARK || kind == U_FORMAT_CHAR)
+        return 0;
+    const int width = u_getIntPropertyValue(point, UCHAR_EAST_ASIAN_WIDTH);
+    return width == U_EA_WIDE || width == U_EA_FULLWIDTH ? 2 : 1;
 }
 
 bool isWellFormed(std::string_view text) {

@@ -12,6 +12,12 @@ std::string capitalized(std::string_view text);
 bool equalIgnoringCase(std::string_view a, std::string_view b);
 // The text from the first character on that is no white space; line ends count as such.
 std::string_view withoutLeadingSpace(std::string_view text) noexcept;
+// The bytes that so many characters (code points) at the text's beginning take: all where it has
+// fewer. A byte that is no UTF-8 counts as one.
+std::size_t endOfCharacters(std::string_view text, std::size_t count) noexcept;
+// How many columns of a terminal the character takes: 0 of a mark that stands above another, 2 of
+// wide ones.
+std::size_t terminalWidth(std::string_view character) noexcept;
 
 bool isWellFormed(std::string_view text);
 // A half of a surrogate pair without the other becomes U+FFFD.

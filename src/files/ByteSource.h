@@ -25,6 +25,8 @@ public:
     virtual std::optional<std::size_t> read(char* to, std::size_t room, Ref<Error>* error) = 0;
     // How many bytes there are in all; 0 where that is not known.
     virtual std::uint64_t size() const noexcept { return 0; }
+    // The path of a file; null of anything else.
+    virtual String name() const { return {}; }
 };
 
 class FileSource final : public ByteSource {
@@ -33,6 +35,7 @@ public:
 
     std::optional<std::size_t> read(char* to, std::size_t room, Ref<Error>* error) override;
     std::uint64_t size() const noexcept override;
+    String name() const override { return _path; }
 
 private:
     // Negative, with errno set, where it cannot be opened.

@@ -40,10 +40,10 @@ bool QXXMLBindToMapping::initXML(XMLElement& element, Ref<Error>* error) {
         return false;
     const auto classes = element.elementsForName(qx::Key("class"));
     if (classes.size() > 1)
-        return qx::fail(error, qx::errors::tooManyClassElements, &element);
+        return goesOn(qx::fail(error, qx::errors::tooManyClassElements, &element), error);
     if (!classes.empty())
         _childClassMapping = QXXMLClassMapping::initWithXML(classes.front(), error);
-    return classes.empty() || _childClassMapping;
+    return goesOn(classes.empty() || _childClassMapping, error);
 }
 
 QXXMLNodeType QXXMLBindToMapping::nodeType() const {

@@ -17,18 +17,23 @@ Ref<QXXMLClassMapping> QXXMLClassMapping::initWithXML(XMLElement* element, Ref<E
 
 bool QXXMLClassMapping::initXML(XMLElement& element, Ref<Error>* error) {
     return QXXMLMapping::initXML(element, error) &&
-           extractStringAttribute("name", element, true, _className, error) &&
+           goesOn(extractStringAttribute("name", element, true, _className, error), error) &&
            extractStringAttribute("extends", element, false, _extends, error) &&
-           extractBooleanAttribute("auto-complete", element, false, _autocomplete, error) &&
-           extractBooleanAttribute("self-first", element, false, _selfFirst, error) &&
+           readFlag("auto-complete", _autocomplete, error) &&
+           readFlag("self-first", _selfFirst, error) &&
            extractStringAttribute("type", element, false, _type, error) && readMapTo(error) &&
            processFields(element.elementsForName(Key("field")), error);
 }
 
+bool QXXMLClassMapping::readFlag(const char* name, bool& flag, Ref<Error>* error) {
+    return goesOn(extractBooleanAttribute(name, element(), false, flag, error), error);
+}
+
 bool QXXMLClassMapping::readMapTo(Ref<Error>* error) {
     const auto mapTos = element().elementsForName(Key("map-to"));
-    if (mapTos.size() > 1)
-        return qx::fail(error, qx::errors::tooManyMapToElements, &element());
+    if (mapTos.size() > 1 &&
+        !goesOn(qx::fail(error, qx::errors::tooManyMapToElements, &element()), error))
+        return false;
     if (mapTos.empty())
         return true;
     return extractStringAttribute("xml", *mapTos.front(), false, _mapTo, error) &&
@@ -39,8 +44,10 @@ bool QXXMLClassMapping::readMapTo(Ref<Error>* error) {
 bool QXXMLClassMapping::processFields(const std::vector<XMLElement*>& elements, Ref<Error>* error) {
     for (XMLElement* element : elements) {
         auto field = QXXMLFieldMapping::initWithXML(element, error);
-        if (!field)
+        if (!goesOn(field != nullptr, error))
             return false;
+        if (!field || field->name().isNull())
+            continue;
         field->setClassMapping(this);
         _fields.push_back(std::move(field));
     }

@@ -18,9 +18,13 @@ Ref<QXXMLDocumentMapping> QXXMLDocumentMapping::initWithXML(XMLElement* root, Re
 bool QXXMLDocumentMapping::initXML(XMLElement& element, Ref<Error>* error) {
     if (!QXXMLMapping::initXML(element, error))
         return false;
-    for (const XMLElement* include : element.elementsForName(Key("include")))
-        if (String href = include->attributeValue(Key("href")); !href.isNull())
-            _includes.push_back(std::move(href));
+    for (XMLElement* include : element.elementsForName(Key("include"))) {
+        String href = include->attributeValue(Key("href"));
+        if (href.isNull())
+            continue;
+        _includes.push_back(std::move(href));
+        _includeElements.emplace_back(include);
+    }
     return processClasses(element.elementsForName(Key("class")), error);
 }
 
@@ -28,11 +32,17 @@ bool QXXMLDocumentMapping::processClasses(const std::vector<XMLElement*>& elemen
                                           Ref<Error>* error) {
     for (XMLElement* element : elements) {
         auto mapping = QXXMLClassMapping::initWithXML(element, error);
-        if (!mapping)
+        if (!goesOn(mapping != nullptr, error))
             return false;
-        _classMappings.push_back(std::move(mapping));
+        if (mapping && !mapping->className().isNull())
+            _classMappings.push_back(std::move(mapping));
     }
     return true;
+}
+
+QXXMLMappingPlace QXXMLDocumentMapping::includePlace(std::size_t index) const {
+    const XMLElement& include = *_includeElements.at(index);
+    return {place().documentName, include.line(), include.column()};
 }
 
 void QXXMLDocumentMapping::mergeDocumentMapping(const QXXMLDocumentMapping* other) {

@@ -19,7 +19,7 @@ Ref<QXXMLFieldMapping> QXXMLFieldMapping::initWithXML(XMLElement* element, Ref<E
 // The order of the steps decides which error a document with several faults gets.
 bool QXXMLFieldMapping::initXML(XMLElement& element, Ref<Error>* error) {
     return QXXMLMapping::initXML(element, error) &&
-           extractStringAttribute("name", element, true, _name, error) &&
+           goesOn(extractStringAttribute("name", element, true, _name, error), error) &&
            extractStringAttribute("type", element, false, _type, error) &&
            extractStringAttribute("handler", element, false, _handler, error) &&
            extractStringAttribute("get-method", element, false, _getMethod, error) &&
@@ -30,13 +30,15 @@ bool QXXMLFieldMapping::initXML(XMLElement& element, Ref<Error>* error) {
            readFlag("container", Flag::container, true, error) &&
            readFlag("lazy", Flag::lazy, false, error) &&
            readFlag("direct", Flag::direct, false, error) &&
-           readFlag("transient", Flag::transient, false, error) && readBindings(error);
+           readFlag("transient", Flag::transient, false, error) &&
+           goesOn(readBindings(error), error);
 }
 
 bool QXXMLFieldMapping::readFlag(const char* name, Flag flag, bool defaultValue,
                                  Ref<Error>* error) {
     bool value = false;
-    if (!extractBooleanAttribute(name, element(), false, value, defaultValue, error))
+    const bool isRead = extractBooleanAttribute(name, element(), false, value, defaultValue, error);
+    if (!goesOn(isRead, error))
         return false;
     if (value)
         _flags |= static_cast<std::uint32_t>(flag);
@@ -45,8 +47,9 @@ bool QXXMLFieldMapping::readFlag(const char* name, Flag flag, bool defaultValue,
 
 bool QXXMLFieldMapping::readBindings(Ref<Error>* error) {
     const auto bindings = element().elementsForName(qx::Key("bind-xml"));
-    if (bindings.size() > 1)
-        return qx::fail(error, qx::errors::tooManyBindXMLElements, &element());
+    if (bindings.size() > 1 &&
+        !goesOn(qx::fail(error, qx::errors::tooManyBindXMLElements, &element()), error))
+        return false;
     if (!bindings.empty()) {
         _bindToMapping = QXXMLBindToMapping::initWithXML(bindings.front(), error);
         if (!_bindToMapping)

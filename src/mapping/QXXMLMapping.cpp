@@ -2,15 +2,20 @@
 
 #include <QXXMLMarshalling/model/Array.h>
 
+#include "mapping/MappingSource.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
+
+#include <utility>
 
 using qx::Error;
 using qx::Key;
 using qx::Ref;
 using qx::String;
 using qx::XMLElement;
+using qx::detail::MappingSource;
 
+QXXMLMapping::QXXMLMapping() = default;
 QXXMLMapping::~QXXMLMapping() = default;
 
 Ref<QXXMLMapping> QXXMLMapping::initWithXML(XMLElement* element, Ref<Error>* error) {
@@ -22,10 +27,16 @@ namespace {
 // Mapping nodes nest through the classes of bindings. A parsed document is limited already; one
 // built by hand is not.
 constexpr std::size_t deepestNode = 1'024;
+
+// The nodes that are being read on this thread, one inside the other: all of one document.
 thread_local std::size_t depth = 0;
+thread_local MappingSource* sourceOfAll = nullptr;
 
 struct Deeper {
-    Deeper() noexcept { ++depth; }
+    explicit Deeper(MappingSource& source) noexcept {
+        if (depth++ == 0)
+            sourceOfAll = &source;
+    }
     ~Deeper() { --depth; }
     Deeper(const Deeper&) = delete;
     Deeper& operator=(const Deeper&) = delete;
@@ -34,10 +45,17 @@ struct Deeper {
 } // namespace
 
 bool QXXMLMapping::readElement(XMLElement* element, Ref<Error>* error) {
+    return readElement(element, error,
+                       depth != 0 ? Ref<MappingSource>(sourceOfAll) : MappingSource::of(element));
+}
+
+bool QXXMLMapping::readElement(XMLElement* element, Ref<Error>* error,
+                               const Ref<MappingSource>& source) {
     const auto kept = element != nullptr ? Ref<XMLElement>(element) : XMLElement::initWithName("");
     if (depth == deepestNode)
         return qx::fail(error, qx::errors::nestedTooDeep, deepestNode, kept->name());
-    const Deeper deeper;
+    _source = source;
+    const Deeper deeper(*source);
     return initXML(*kept, error);
 }
 
@@ -45,18 +63,32 @@ bool QXXMLMapping::initXML(XMLElement& element, Ref<Error>* error) {
     static const Key descriptionKey("description");
     _element = Ref<XMLElement>(&element);
     const auto descriptions = element.elementsForName(descriptionKey);
-    if (descriptions.size() > 1)
-        return qx::fail(error, qx::errors::tooManyDescriptions, &element);
+    if (descriptions.size() > 1 &&
+        !goesOn(qx::fail(error, qx::errors::tooManyDescriptions, &element), error))
+        return false;
     if (!descriptions.empty())
         _mappingDescription = descriptions.front()->stringValue();
+    return true;
+}
+
+bool QXXMLMapping::goesOn(bool succeeded, Ref<Error>* error) const {
+    if (succeeded || error == nullptr || !*error || !_source->collectsFaults())
+        return succeeded;
+    _source->addFault(std::exchange(*error, nullptr), place());
     return true;
 }
 
 Ref<QXXMLMapping> QXXMLMapping::copyWithZone() const {
     auto copy = newInstance();
     Ref<Error> ignored;
-    return copy->readElement(_element.get(), &ignored) ? copy : nullptr;
+    return copy->readElement(_element.get(), &ignored, _source) ? copy : nullptr;
 }
+
+QXXMLMappingPlace QXXMLMapping::place() const {
+    return {_source->name(), _element->line(), _element->column()};
+}
+
+std::vector<QXXMLMappingPlace> QXXMLMapping::includedFrom() const { return _source->chain(); }
 
 Ref<QXXMLMapping> QXXMLMapping::newInstance() const { return qx::make<QXXMLMapping>(); }
 

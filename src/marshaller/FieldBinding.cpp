@@ -24,14 +24,45 @@ const FieldBinding& bindingAsElement(const FieldPlan& field) noexcept {
 
 // A kind that found nothing and complains of nothing does not fail the object.
 bool Unmarshalling::readField(const FieldPlan& field, const Target& target, ErrorSlot error) {
-    if (field.isCollection())
-        return readCollection(*this, field, target, error);
-    Ref<Error> problem;
-    if (bindingOf(field).read(*this, field, target, &problem) || !problem)
-        return true;
-    if (error != nullptr)
-        *error = std::move(problem);
+    if (field.isCollection()) {
+        if (readCollection(*this, field, target, error))
+            return true;
+    } else {
+        Ref<Error> problem;
+        if (bindingOf(field).read(*this, field, target, &problem) || !problem)
+            return true;
+        if (error != nullptr)
+            *error = std::move(problem);
+    }
+    if (error != nullptr && *error && !ErrorDetails::hasContext(**error))
+        locate(error, {placeOf(field, target), &field, nullptr});
     return false;
+}
+
+// What the field was read from, as far as it can be found again: the attribute, the child that was
+// one too many, or the child; else the element.
+Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Target& target) const {
+    ChildLookup& source = target.source;
+    const bool mayBeAttribute =
+        field.kind == BindingKind::attribute || field.kind == BindingKind::automatic;
+    for (const BindingPlan& binding : field.bindings) {
+        const String& around = binding.location;
+        const auto holder =
+            around.isEmpty() ? ChildLookup::Found{source.element(), false} : source.find(around);
+        if (holder.several)
+            return source.all(around)[1];
+        const Number attribute = mayBeAttribute && !field.isCollection() && holder.first != none
+                                     ? _document.attribute(holder.first, binding.name)
+                                     : none;
+        if (attribute != none)
+            return attribute;
+        const auto child = field.kind == BindingKind::attribute && !field.isCollection()
+                               ? ChildLookup::Found()
+                               : source.find(binding.name);
+        if (child.first != none)
+            return child.several ? source.all(binding.name)[1] : child.first;
+    }
+    return source.element();
 }
 
 bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,

@@ -1,6 +1,8 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "files/Paths.h"
 #include "marshaller/Unmarshalling.h"
+#include "model/Errors.h"
 #include "model/LibraryClass.h"
 
 using qx::Error;
@@ -29,17 +31,17 @@ Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMappingXML(XMLDocument* document, 
 }
 
 Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMappingURL(const String& URL, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithContentsOfURL(URL, {}, error);
-    if (!document || (error != nullptr && *error))
-        return nullptr;
-    return initWithMappingXML(document.get(), error);
+    const String path = qx::pathOfURL(URL);
+    if (path.isNull())
+        return qx::fail(error, qx::errors::noLocalURL, URL);
+    return initWithMappingFile(path, error);
 }
 
 Ref<QXXMLMarshaller> QXXMLMarshaller::initWithMappingFile(const String& path, Ref<Error>* error) {
-    const auto document = XMLDocument::initWithContentsOfFile(path, {}, error);
-    if (!document || (error != nullptr && *error))
+    auto mapping = QXXMLMarshallingMapping::initWithContentsOfFile(path, error);
+    if (!mapping || (error != nullptr && *error))
         return nullptr;
-    return initWithMappingXML(document.get(), error);
+    return initWithMapping(std::move(mapping), error);
 }
 
 const Ref<qx::UndoManager>& QXXMLMarshaller::undoManager() {

@@ -86,8 +86,10 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, E
 Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
                                  ErrorSlot error) {
     const Number wrapper = std::exchange(_wrapper, none);
-    if (!mayBuild(plan, source, error))
+    if (!mayBuild(plan, source, error)) {
+        locate(error, {source.element(), nullptr, &plan});
         return nullptr;
+    }
     Ref<Object> object = allocate(plan);
     // Whoever set it: a caller's earlier error stops the binding, too.
     if (error != nullptr && *error)
@@ -107,10 +109,14 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
         ~Restore() { current = outer; }
     } const restore{_frame, _frame};
     _frame = &frame;
+    if (_trace != nullptr)
+        _trace->enter(plan, source.element(), *object);
     const LentNames fields(*this);
     const LentNames attributes(*this);
     if (!readFields(plan, {*object, source, {*fields, *attributes}, isFlattened}, error))
         return nullptr;
+    if (_trace != nullptr)
+        _trace->leave();
     if (record != nullptr)
         record->setNotifyBindingsObservers(true);
     else if (isAsked && hooks->setNotifyBindingsObservers != nullptr)
@@ -158,8 +164,10 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
         bool copied = false;
         for (const FieldPlan& field : walk.current().fields) {
             if (!field.isContainer && !copied) {
-                if (!_budget.takeVisits(source->childCount(), source->element(), error))
+                if (!_budget.takeVisits(source->childCount(), source->element(), error)) {
+                    locate(error, {source->element(), &field, &plan});
                     return false;
+                }
                 copy = ChildLookup::copyOf(*source);
                 source = copy.get();
                 copied = true;
@@ -172,10 +180,13 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
             break;
         source->expectLookups(walk.current().bindingCount);
     }
-    if (!walk.broken().isNull())
-        return fail(error, errors::noExtends, walk.broken());
     const Target rest{target.object, *source, target.bound, target.isFlattened};
-    return keepNamespaces(rest, error) && validate(&plan, rest, error);
+    const bool isWhole = walk.broken().isNull()
+                             ? keepNamespaces(rest, error) && validate(&plan, rest, error)
+                             : fail(error, errors::noExtends, walk.broken());
+    if (!isWhole)
+        locate(error, {source->element(), nullptr, &plan});
+    return isWhole;
 }
 
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
@@ -190,6 +201,8 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
             kept = make<Array>();
         if (fits)
             kept->add(std::move(node));
+        if (_trace != nullptr)
+            _trace->keep(ReadingTrace::Form::declaration, declaration);
     };
     _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, element,
                             [&](Number declaration) { keep(declaration, element); });
@@ -244,12 +257,19 @@ Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress
     _progress = progress;
     const ReadingGroup group(_marshaller->undoManager());
     const BulkObjects bulk;
-    return unmarshallNode(element, IndexedXML::Nodes::own, error);
+    startWith(error);
+    auto object = unmarshallNode(element, IndexedXML::Nodes::own, error);
+    if (!object)
+        locate(error, {.number = element});
+    return object;
 }
 
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
+                         ReadingTrace* trace) {
     ReadingProgress progress(marshaller, document.size());
-    auto object = Unmarshalling(marshaller, document).read(document.root(), error, &progress);
+    Unmarshalling reading(marshaller, document);
+    reading.setTrace(trace);
+    auto object = reading.read(document.root(), error, &progress);
     // Without a slot a collection leaves out what fails.
     return progress.isCancelled() ? nullptr : object;
 }

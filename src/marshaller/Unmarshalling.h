@@ -17,7 +17,9 @@
 #include "marshaller/ConsumedNames.h"
 #include "marshaller/NamespaceMatching.h"
 #include "marshaller/ObjectAccess.h"
+#include "marshaller/ReadingContext.h"
 #include "marshaller/ReadingProgress.h"
+#include "marshaller/ReadingTrace.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -47,6 +49,8 @@ public:
     // The document must outlive the call.
     Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
+    // From here on it is told what becomes of each entry; it outlives the call.
+    void setTrace(ReadingTrace* trace) noexcept { _trace = trace; }
     // In an undo group of its own.
     Ref<Object> read(Number element, ErrorSlot error, ReadingProgress* progress = nullptr);
     // `nodes` are those that are kept of the element.
@@ -64,10 +68,22 @@ public:
     // `plan` is the class whose fields were bound, null where they were bound one by one.
     bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error);
 
+    // An error that the slot holds from before stays as it is.
+    void startWith(ErrorSlot error) noexcept {
+        _earlier = error != nullptr ? error->get() : nullptr;
+    }
+    // Tells the error that a step has left in the slot where it came about, unless it knows.
+    void locate(ErrorSlot error, const ReadingSpot& spot) {
+        if (error != nullptr && *error && error->get() != _earlier)
+            ReadingContext::tell(*error, _document, _mapping.get(), spot);
+    }
+
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
     IndexedXML& document() noexcept { return _document; }
+    // Null where nobody wants one.
+    ReadingTrace* trace() const noexcept { return _trace; }
     // The class that maps to an element of that name; null where none does.
     const ClassPlan* classForElement(Number element) const {
         return _plan.classForElement(_document.name(element));
@@ -97,10 +113,12 @@ private:
     class LentNames;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
+    Number placeOf(const FieldPlan& field, const Target& target) const;
     bool mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
+    bool refuse(Number unknown, ErrorSlot error);
     bool validateChildren(const Target& target, ErrorSlot error);
     bool keepChildren(const Target& target, const CountedSet& names, const CountedSet& written,
                       ErrorSlot error);
@@ -115,9 +133,11 @@ private:
     ReadingBudget _budget;
     ObjectAccess _access;
     ReadingProgress* _progress = nullptr;
+    ReadingTrace* _trace = nullptr;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;
+    const Error* _earlier = nullptr;
     Number _wrapper = none; // see setWrapper
     // A pool of consumed names; the first few are lent to the objects that are being bound.
     std::vector<std::unique_ptr<ConsumedNames>> _names;
@@ -125,6 +145,7 @@ private:
 };
 
 // A whole document, in one undo group.
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error);
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
+                         ReadingTrace* trace = nullptr);
 
 } // namespace qx::detail

@@ -7,6 +7,8 @@ namespace qx::detail {
 
 namespace {
 
+using Form = ReadingTrace::Form;
+
 // The wrapper of a location is not counted as consumed, and the attribute counts for the element
 // that is bound even where it stands on the wrapper: what is read so is kept as unknown XML too.
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
@@ -27,8 +29,15 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
         if (attribute == Unmarshalling::none)
             continue;
         target.bound.attributes.add(binding.name);
-        return takeValue(target.object, field, field.key, reading.document().value(attribute),
-                         error);
+        const bool isTaken =
+            takeValue(target.object, field, field.key, reading.document().value(attribute), error);
+        if (ReadingTrace* const trace = reading.trace(); trace != nullptr && isTaken) {
+            const auto number = static_cast<std::size_t>(&binding - field.bindings.data());
+            if (holder != source.element())
+                trace->take(Form::wrapper, field, holder, number);
+            trace->take(Form::attribute, field, attribute, number);
+        }
+        return isTaken;
     }
     if (field.isRequired)
         return fail(error, errors::requiredAttributeMissing,

@@ -13,11 +13,13 @@ namespace qx::detail {
 namespace {
 
 using Target = Unmarshalling::Target;
+using Form = ReadingTrace::Form;
 
 // What the items are made from: fixed before the first is.
 struct Items {
     std::vector<Unmarshalling::Number> nodes;
     bool areCounted = false; // as a whole, by their bind name or their wrapper's
+    std::size_t binding = 0; // of the field's
     Unmarshalling::Number wrapper = Unmarshalling::none;
 };
 
@@ -47,6 +49,7 @@ bool findItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
         }
         if (!items.nodes.empty()) {
             target.bound.fields.add(binding.bindTo);
+            items.binding = static_cast<std::size_t>(&binding - field.bindings.data());
             items.areCounted = true;
             return true;
         }
@@ -82,6 +85,7 @@ bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Targe
                 target.bound.fields.add(binding.location);
             }
         }
+        items.binding = static_cast<std::size_t>(&binding - field.bindings.data());
         const String& name = nameOfItems(field, binding);
         if (!name.isEmpty())
             items.nodes = (wrapper ? *wrapper : target.source).all(name);
@@ -95,6 +99,9 @@ bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Targe
 template <class Make>
 bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& target,
                const Items& items, Ref<Error>* error, Make make) {
+    ReadingTrace* const trace = reading.trace();
+    if (trace != nullptr && items.wrapper != Unmarshalling::none)
+        trace->take(Form::wrapper, field, items.wrapper, items.binding);
     if (items.nodes.empty())
         return true;
     // Few may be made of very many.
@@ -103,12 +110,20 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
     array->reserve(std::min(items.nodes.size(), usualSize));
     for (const auto node : items.nodes) {
         reading.setWrapper(items.wrapper);
+        const std::size_t uses = trace != nullptr ? trace->uses().size() : 0;
+        if (trace != nullptr)
+            trace->take(Form::item, field, node, items.binding, array->count());
         const Value item = make(node);
         reading.setWrapper(Unmarshalling::none);
-        if ((error != nullptr && *error) || reading.budget().isSpent())
+        if ((error != nullptr && *error) || reading.budget().isSpent()) {
+            reading.locate(error, {node, &field, nullptr});
             return false;
-        if (item.isNull())
+        }
+        if (item.isNull()) {
+            if (trace != nullptr)
+                trace->forget(uses);
             continue;
+        }
         if (!items.areCounted)
             target.bound.fields.add(reading.document().name(node));
         if (Object* const object = item.object();

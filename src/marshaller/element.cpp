@@ -35,8 +35,7 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshallin
     const ClassPlan* plan = field.typeClass != nullptr || isText ? field.typeClass : classOfElement;
     if (plan != nullptr)
         return reading.build(*plan, child, target.source.nodes(), error);
-    return reading.budget().takeText(child, error) ? Value(reading.document().text(child))
-                                                   : Value();
+    return reading.budget().takeText(child, error) ? reading.document().text(child) : Value();
 }
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
@@ -50,6 +49,9 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     if (child != Unmarshalling::none) {
         if (target.isFlattened)
             target.source.take(child);
+        if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
+            trace->take(ReadingTrace::Form::child, field, child,
+                        static_cast<std::size_t>(binding - field.bindings.data()));
         value = valueOf(reading, field, target, child, binding->classOfName, &problem);
     }
     return setElementValue(reading, field, target, std::move(value), std::move(problem),

@@ -13,13 +13,14 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, ChildLookup& sourc
     const ClassPlan* plan = reading.classForElement(source.element());
     if (plan != nullptr)
         return reading.build(*plan, source, false, error);
-    return reading.budget().takeText(source.element(), error) ? Value(source.stringValue())
-                                                              : Value();
+    return reading.budget().takeText(source.element(), error) ? source.stringValue() : Value();
 }
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
     Ref<Error> problem;
+    if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
+        trace->take(ReadingTrace::Form::flattened, field, target.source.element());
     Value value = valueOf(reading, field, target.source, &problem);
     return setElementValue(reading, field, target, std::move(value), std::move(problem), {}, error);
 }

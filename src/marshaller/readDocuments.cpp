@@ -18,7 +18,9 @@ using qx::Ref;
 using qx::String;
 using qx::XMLDocument;
 using qx::detail::ClassPlan;
+using qx::detail::ErrorDetails;
 using qx::detail::MappingPlan;
+using qx::detail::ReadingContext;
 using qx::detail::reset;
 
 namespace {
@@ -62,27 +64,47 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, qx::IndexedXML& document,
     const auto root = document.root();
     const auto quoted = [&] { return document.quoted(root); };
     const String name = root != qx::IndexedXML::none ? document.name(root) : String();
-    if (!mayRead(marshaller, name, type, error, quoted))
-        return nullptr;
-    auto object = qx::detail::readDocument(marshaller, document, error);
-    if (!object && error != nullptr && !*error)
-        return qx::fail(error, qx::errors::noDefinitionForElement, quoted);
+    Ref<qx::Object> object;
+    if (mayRead(marshaller, name, type, error, quoted)) {
+        object = qx::detail::readDocument(marshaller, document, error);
+        if (!object && error != nullptr && !*error)
+            qx::fail(error, qx::errors::noDefinitionForElement, quoted);
+    }
+    if (!object && error != nullptr)
+        ReadingContext::tell(*error, document, marshaller.mapping(), {.number = root});
     return object;
 }
 
-Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const qx::XMLParser::Parsed& parsed,
+// What was parsed, of the file of that name if it has one; null where that failed.
+struct Source {
+    qx::XMLParser::Parsed parsed;
+    String name;
+};
+
+Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const Source& source,
                          const std::type_info& type, Ref<Error>* error) {
-    if (!parsed)
+    if (!source.parsed)
         return nullptr;
-    qx::IndexedXML document(*parsed);
+    qx::IndexedXML document(*source.parsed, source.name);
     return objectOf(marshaller, document, type, error);
 }
 
-// Null for no data.
-qx::XMLParser::Parsed parsed(const QXXMLMarshaller& marshaller, Ref<qx::Data> data,
-                             Ref<Error>* error) {
-    return data ? qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error)
-                : nullptr;
+Source sourceOf(const QXXMLMarshaller& marshaller, Ref<qx::Data> data, Ref<Error>* error) {
+    if (!data)
+        return {};
+    return {qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error), {}};
+}
+
+Source sourceOf(const QXXMLMarshaller& marshaller, qx::XMLBytes bytes, Ref<Error>* error) {
+    return {qx::XMLParser::parseCopy(bytes, qx::detail::parsingOf(marshaller), error), {}};
+}
+
+Source sourceOfFile(const QXXMLMarshaller& marshaller, const String& path, Ref<Error>* error) {
+    Source source = sourceOf(marshaller, qx::readFile(path, error), error);
+    source.name = path;
+    if (!source.parsed)
+        ErrorDetails::nameDocument(error, path);
+    return source;
 }
 
 // What the reading of the new object does is no change of the one that is there.
@@ -143,11 +165,11 @@ bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& docum
     return isRead;
 }
 
-bool fill(QXXMLMarshaller& marshaller, qx::Object& object, const qx::XMLParser::Parsed& parsed,
+bool fill(QXXMLMarshaller& marshaller, qx::Object& object, const Source& source,
           Ref<Error>* error) {
-    if (!parsed)
+    if (!source.parsed)
         return false;
-    qx::IndexedXML document(*parsed);
+    qx::IndexedXML document(*source.parsed, source.name);
     return fill(marshaller, object, document, error);
 }
 
@@ -171,20 +193,19 @@ Ref<Error> qx::detail::wrongClass(const qx::Object& object, const std::type_info
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, qx::XMLParser::parseCopy(xml, qx::detail::parsingOf(*this), error), type,
-                    error);
+    return objectOf(*this, sourceOf(*this, xml, error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readFile(const String& path, const std::type_info& type,
                                           Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, parsed(*this, qx::readFile(path, error), error), type, error);
+    return objectOf(*this, sourceOfFile(*this, path, error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readStream(std::istream& stream, const std::type_info& type,
                                             Ref<Error>* error) {
     reset(error);
-    return objectOf(*this, parsed(*this, qx::readStream(stream, error), error), type, error);
+    return objectOf(*this, sourceOf(*this, qx::readStream(stream, error), error), type, error);
 }
 
 Ref<qx::Object> QXXMLMarshaller::readString(qx::XMLBytes xml, Ref<Error>* error) {
@@ -224,10 +245,11 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
     const auto match = table ? qx::XMLSplitter::Match::localNames : qx::XMLSplitter::Match::names;
     qx::XMLPieces pieces(source, elementName, match, qx::detail::parsingOf(*this));
     qx::detail::ReadingProgress progress(*this, source.size());
+    const String name = source.name();
     while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
         if (!progress.startPiece(pieces.bytesRead(), &failure))
             break;
-        qx::IndexedXML document(*piece);
+        qx::IndexedXML document(*piece, name);
         if (table)
             document.matchBy(*table);
         else
@@ -240,28 +262,32 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
                          [&] { return document.quoted(item); });
             auto visited = object ? visitor(object) : qx::detail::Visited{false, failure};
             failure = std::move(visited.error);
+            reading.locate(&failure, {.number = item});
             return goesOn = visited.goesOn;
         });
     }
-    if (failure && error != nullptr)
+    if (failure && error != nullptr) {
+        if (failure->documentName().isNull())
+            ErrorDetails::nameDocument(&failure, name);
         *error = failure;
+    }
     return !failure;
 }
 
 bool QXXMLMarshaller::readBytesInto(qx::Object* object, qx::XMLBytes xml, Ref<Error>* error) {
     reset(error);
-    return fill(*this, present(object),
-                qx::XMLParser::parseCopy(xml, qx::detail::parsingOf(*this), error), error);
+    return fill(*this, present(object), sourceOf(*this, xml, error), error);
 }
 
 bool QXXMLMarshaller::readFileInto(qx::Object* object, const String& path, Ref<Error>* error) {
     reset(error);
-    return fill(*this, present(object), parsed(*this, qx::readFile(path, error), error), error);
+    return fill(*this, present(object), sourceOfFile(*this, path, error), error);
 }
 
 bool QXXMLMarshaller::readInputInto(qx::Object* object, std::istream& stream, Ref<Error>* error) {
     reset(error);
-    return fill(*this, present(object), parsed(*this, qx::readStream(stream, error), error), error);
+    return fill(*this, present(object), sourceOf(*this, qx::readStream(stream, error), error),
+                error);
 }
 
 bool QXXMLMarshaller::readTreeInto(qx::Object* object, XMLDocument* document, Ref<Error>* error) {

@@ -48,8 +48,9 @@ public:
 
     // Calls bind(Unmarshalling&, const Unmarshalling::Target&).
     template <class Bind>
-    bool run(Object& object, bool isFlattened, Bind bind) {
+    bool run(Object& object, bool isFlattened, Ref<Error>* error, Bind bind) {
         const Ref<Object> held(&object);
+        _unmarshalling.startWith(error);
         const Unmarshalling::Target target{object, _source, {_fields, _attributes}, isFlattened};
         bool bound = false;
         try {
@@ -129,8 +130,11 @@ Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>*
         return qx::fail(error, qx::errors::noDefinitionForElement, element);
     IndexedXML document(element != nullptr ? element->asElement() : nullptr,
                         IndexedXML::Content::atOnce);
-    return Unmarshalling(*this, document)
-        .unmarshallNode(document.root(), IndexedXML::Nodes::own, error);
+    Unmarshalling reading(*this, document);
+    reading.startWith(error);
+    auto object = reading.unmarshallNode(document.root(), IndexedXML::Nodes::own, error);
+    reading.locate(error, {.number = document.root()});
+    return object;
 }
 
 Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapping,
@@ -141,6 +145,7 @@ Ref<Object> QXXMLMarshaller::buildClassWithMapping(const QXXMLClassMapping& mapp
     const PlanOfClass plan(*this, mapping);
     IndexedXML document(element, IndexedXML::Content::asNeeded);
     Unmarshalling reading(*this, document, Unmarshalling::Use::steps);
+    reading.startWith(error);
     ChildLookup source(document, document.root(), IndexedXML::Nodes::own, (*plan).bindingCount);
     return reading.build(*plan, source, isFlattened, error);
 }
@@ -167,7 +172,7 @@ bool QXXMLMarshaller::bindFieldsWithMapping(const QXXMLClassMapping& mapping, Ob
                                             Ref<Error>* error) {
     const PlanOfClass plan(*this, mapping);
     return Step(*this, element, (*plan).bindingCount, boundFields, boundAttributes)
-        .run(object, isFlattened, [&](Unmarshalling& step, const auto& target) {
+        .run(object, isFlattened, error, [&](Unmarshalling& step, const auto& target) {
             return step.readFields(*plan, target, error);
         });
 }
@@ -190,7 +195,7 @@ struct FieldStep {
     bool run(Read read) const {
         const PlanOfField plan(marshaller, field);
         return Step(marshaller, element, (*plan).bindings.size(), boundFields, boundAttributes)
-            .run(object, isFlattened, [&](Unmarshalling& reading, const auto& target) {
+            .run(object, isFlattened, error, [&](Unmarshalling& reading, const auto& target) {
                 return read(reading, *plan, target, error);
             });
     }
@@ -255,6 +260,7 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
     ConsumedNames attributes(boundAttributes);
     IndexedXML document(&element, IndexedXML::Content::asNeeded);
     Unmarshalling reading(*this, document, Unmarshalling::Use::steps);
+    reading.startWith(error);
     ChildLookup source(document, document.root(), IndexedXML::Nodes::own, 0);
     const Ref<Object> held(&object);
     return reading.validate(nullptr, {object, source, {fields, attributes}, false}, error);

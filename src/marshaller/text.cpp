@@ -12,6 +12,7 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
           Ref<Error>* error) {
     ChildLookup& source = target.source;
     auto holder = source.element();
+    std::size_t number = 0;
     for (const BindingPlan& binding : field.bindings) {
         if (binding.bindTo.isEmpty())
             continue;
@@ -22,15 +23,19 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
         if (found.first != Unmarshalling::none) {
             target.bound.fields.add(binding.bindTo);
             holder = found.first;
+            number = static_cast<std::size_t>(&binding - field.bindings.data());
             break;
         }
     }
     if (!reading.budget().takeText(holder, error))
         return false;
     const bool isChild = holder != source.element();
-    const String text = isChild ? reading.document().text(holder) : source.stringValue();
-    if (!text.isEmpty())
-        return takeValue(target.object, field, field.key, text, error);
+    Value text = isChild ? reading.document().text(holder) : source.stringValue();
+    if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
+        trace->take(isChild ? ReadingTrace::Form::child : ReadingTrace::Form::text, field, holder,
+                    number);
+    if (!text.view().empty())
+        return takeValue(target.object, field, field.key, std::move(text), error);
     if (field.isRequired)
         return fail(error, errors::requiredTextMissing, field.key.string(),
                     reading.quoted(source.element()));

@@ -24,6 +24,8 @@ public:
             _names = make<CountedSet>();
             _written = document.isMatched() ? make<CountedSet>() : _names;
         }
+        if (_first == IndexedXML::none)
+            _first = node;
         _names->add(name);
         if (_written != _names)
             _written->add(document.writtenName(node));
@@ -31,11 +33,14 @@ public:
     // As they are matched, and as they stand in the document.
     const Ref<CountedSet>& names() const noexcept { return _names; }
     const Ref<CountedSet>& written() const noexcept { return _written; }
+    // The first node that is left.
+    IndexedXML::Number first() const noexcept { return _first; }
 
 private:
     ConsumedNames& _bound;
     Ref<CountedSet> _names;
     Ref<CountedSet> _written;
+    IndexedXML::Number _first = IndexedXML::none;
 };
 
 } // namespace
@@ -59,13 +64,21 @@ bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& tar
            target.bound.fields.size() == target.source.childCount();
 }
 
+// False: what no field consumed is an error, there.
+bool Unmarshalling::refuse(Number unknown, ErrorSlot error) {
+    locate(error, {unknown, nullptr, _frame != nullptr ? _frame->plan : nullptr});
+    return false;
+}
+
 bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     Unknown unknown(target.bound.fields);
     target.source.forEachChild([&](Number child) { unknown.see(_document, child); });
     if (!unknown.names())
         return true;
-    if (!_marshaller->saveUnknownXML())
-        return fail(error, errors::unknownFields, unknown.written(), target.source.elementName());
+    if (!_marshaller->saveUnknownXML()) {
+        fail(error, errors::unknownFields, unknown.written(), target.source.elementName());
+        return refuse(unknown.first(), error);
+    }
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
     // host's log at all is asked of the warnings.
     if (hostHasLogWarning())
@@ -100,6 +113,8 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names,
         fits = node.get() != nullptr;
         if (fits)
             elements->add(node);
+        if (_trace != nullptr)
+            _trace->keep(ReadingTrace::Form::keptChild, child);
     });
     // A processing instruction leaves a name alone.
     std::size_t lone = 0;
@@ -121,9 +136,10 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
         return false;
     if (!unknown.names())
         return true;
-    if (!_marshaller->saveUnknownXML())
-        return fail(error, errors::unknownAttributes, unknown.written(),
-                    target.source.elementName());
+    if (!_marshaller->saveUnknownXML()) {
+        fail(error, errors::unknownAttributes, unknown.written(), target.source.elementName());
+        return refuse(unknown.first(), error);
+    }
     logWarningOrLine("Unbound attributes: %@", unknown.written());
     return keepAttributes(target, *unknown.names(), error);
 }
@@ -138,6 +154,8 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
         fits = node.get() != nullptr;
         if (fits)
             kept->add(std::move(node));
+        if (_trace != nullptr)
+            _trace->keep(ReadingTrace::Form::keptAttribute, attribute);
     };
     _document.forEachOfKind(XMLNodeKind::attribute, target.source.element(), keep);
     return fits && _access.setKept(target.object, KeptXML::attributes, kept, error);

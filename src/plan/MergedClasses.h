@@ -31,12 +31,17 @@ public:
         if (_latestRepeated <= begin)
             return true;
         const auto isIn = [begin](const Repeated& repeated) { return repeated.latest() > begin; };
-        const Repeated& first = *std::find_if(_repeated.begin(), _repeated.end(), isIn);
-        const String& className = first.mapping->className();
-        if (first.sameClass > begin)
-            return fail(error, errors::classRedefined, className);
-        return fail(error, errors::elementRedefined, MappingPlan::elementNameOf(*first.mapping),
-                    className);
+        return isRefused(*std::find_if(_repeated.begin(), _repeated.end(), isIn), begin, error);
+    }
+
+    // Calls visit(QXXMLClassMapping&, Ref<Error>) for each class that repeats a name.
+    template <class Visit>
+    void forEachRepeated(Visit visit) const {
+        for (const Repeated& repeated : _repeated) {
+            Ref<Error> error;
+            isRefused(repeated, 0, &error);
+            visit(*repeated.mapping, std::move(error));
+        }
     }
 
 private:
@@ -48,6 +53,14 @@ private:
         std::size_t sameElement;
         std::size_t latest() const noexcept { return std::max(sameClass, sameElement); }
     };
+
+    static bool isRefused(const Repeated& repeated, std::size_t begin, Ref<Error>* error) {
+        const String& className = repeated.mapping->className();
+        if (repeated.sameClass > begin)
+            return fail(error, errors::classRedefined, className);
+        return fail(error, errors::elementRedefined, MappingPlan::elementNameOf(*repeated.mapping),
+                    className);
+    }
 
     void add(const QXXMLClassMapping& mapping) {
         ++_count;

@@ -1,5 +1,7 @@
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 
+#include "files/Paths.h"
+#include "mapping/MappingSource.h"
 #include "model/LibraryClass.h"
 #include "plan/IncludeLoader.h"
 
@@ -9,33 +11,77 @@ using qx::String;
 using qx::detail::ClassPlan;
 using qx::detail::IncludeLoader;
 using qx::detail::MappingPlan;
+using qx::detail::MappingSource;
 
 QXXMLMarshallingMapping::QXXMLMarshallingMapping() = default;
 QXXMLMarshallingMapping::~QXXMLMarshallingMapping() = default;
 
 Ref<QXXMLMarshallingMapping> QXXMLMarshallingMapping::initWithDocument(qx::XMLDocument* document,
                                                                        Ref<Error>* error) {
-    auto mapping = qx::make<QXXMLMarshallingMapping>();
-    return mapping->init(document, error) ? mapping : nullptr;
+    return initWithDocument(document, {}, error);
 }
 
-bool QXXMLMarshallingMapping::init(qx::XMLDocument* document, Ref<Error>* error) {
+Ref<QXXMLMarshallingMapping>
+QXXMLMarshallingMapping::initWithDocument(qx::XMLDocument* document,
+                                          const QXXMLMappingOptions& options, Ref<Error>* error) {
+    auto mapping = qx::make<QXXMLMarshallingMapping>();
+    return mapping->init(document, options, error) ? mapping : nullptr;
+}
+
+Ref<QXXMLMarshallingMapping> QXXMLMarshallingMapping::initWithContentsOfFile(const String& path,
+                                                                             Ref<Error>* error) {
+    return initWithContentsOfFile(path, {}, error);
+}
+
+Ref<QXXMLMarshallingMapping> QXXMLMarshallingMapping::initWithContentsOfFile(
+    const String& path, const QXXMLMappingOptions& options, Ref<Error>* error) {
+    const auto document = qx::XMLDocument::initWithContentsOfFile(path, {}, error);
+    if (!document || (error != nullptr && *error))
+        return nullptr;
+    QXXMLMappingOptions besideIt = options;
+    if (besideIt.includeFolder.isNull())
+        besideIt.includeFolder = qx::directoryOf(path);
+    return initWithDocument(document.get(), besideIt, error);
+}
+
+bool QXXMLMarshallingMapping::init(qx::XMLDocument* document, const QXXMLMappingOptions& options,
+                                   Ref<Error>* error) {
     qx::XMLElement* root = document != nullptr ? document->rootElement() : nullptr;
-    _mapping = QXXMLDocumentMapping::initWithXML(root, error);
+    const auto source = MappingSource::of(root);
+    Ref<Error> slot;
+    if (options.collectsFaults) {
+        source->collectFaults(&_faults);
+        slot = error != nullptr ? *error : nullptr;
+    }
+    Ref<Error>* const step = options.collectsFaults ? &slot : error;
+    _mapping = source->read(root, step);
     // A slot that held an error before fails the construction too.
-    if (!_mapping || (error != nullptr && *error))
+    if (!_mapping || (step != nullptr && *step))
         return false;
     _document = Ref<qx::XMLDocument>(document);
-    return loadIncludedDocuments(error) && populateLookupCaches(error);
+    _includes = std::make_unique<IncludeLoader>(options.includeFolder);
+    if (!loadIncludedDocuments(step) || !populateLookupCaches(step))
+        return false;
+    if (options.collectsFaults)
+        endCollecting(error);
+    return true;
+}
+
+// Later copies of nodes report their faults themselves.
+void QXXMLMarshallingMapping::endCollecting(Ref<Error>* error) {
+    MappingSource::of(*_mapping).collectFaults(nullptr);
+    for (const auto& included : _includes->included())
+        MappingSource::of(*included).collectFaults(nullptr);
+    if (error != nullptr && !_faults.empty())
+        *error = _faults.front().fault;
 }
 
 bool QXXMLMarshallingMapping::loadIncludedDocuments(Ref<Error>* error) {
     if (_plan != nullptr)
         return true;
-    IncludeLoader loader;
-    if (!loader.load(*_mapping, error))
+    if (!_includes->load(*_mapping, error))
         return false;
-    for (const auto& included : loader.included())
+    for (const auto& included : _includes->included())
         _mapping->mergeDocumentMapping(included.get());
     return true;
 }

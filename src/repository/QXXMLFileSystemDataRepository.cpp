@@ -186,10 +186,18 @@ Ref<Data> QXXMLFileSystemDataRepository::dataForName(const String& name, Ref<Err
 Ref<XMLDocument> QXXMLFileSystemDataRepository::documentNamed(const String& name,
                                                               std::uint64_t* size,
                                                               Ref<Error>* error) {
+    String path = NameLookUp::take(*this, name);
+    if (path.isNull())
+        path = pathForResourceNamed(name);
+    const NameLookUp lookUp; // the path goes on to dataForName, which a subclass may have replaced
+    NameLookUp::leave(*this, name, path);
     const Ref<Data> data = dataForName(name, error);
     if (size != nullptr)
         *size = data ? data->size() : 0;
-    return data ? XMLDocument::initWithData(*data, {}, error) : nullptr;
+    auto document = data ? XMLDocument::initWithData(*data, {}, error) : nullptr;
+    if (document)
+        document->setDocumentName(path);
+    return document;
 }
 
 String QXXMLFileSystemDataRepository::userOverrideArea() {

@@ -1,7 +1,7 @@
 #include "xml/IndexedXML.h"
 
 #include "base/KnownName.h"
-#include "base/TextBlocks.h"
+#include "model/LentText.h"
 #include "xml/MatchedNames.h"
 #include "xml/XMLNodeMaker.h"
 
@@ -56,11 +56,15 @@ Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number numbe
     return node;
 }
 
-IndexedXML::IndexedXML(const ParsedDocument& parsed) : _index(&parsed.index()) { findRoot(); }
+IndexedXML::IndexedXML(const ParsedDocument& parsed, String documentName)
+    : _parsed(&parsed), _index(&parsed.index()), _documentName(std::move(documentName)) {
+    findRoot();
+}
 
-IndexedXML::IndexedXML(XMLDocument& document) {
+IndexedXML::IndexedXML(XMLDocument& document) : _documentName(document.documentName()) {
     _reader.emplace(document);
     if (_reader->parsed() != nullptr) {
+        _parsed = _reader->parsed();
         _index = &_reader->parsed()->index();
         findRoot();
         internNames();
@@ -75,7 +79,7 @@ IndexedXML::IndexedXML(XMLElement* element, Content content) { readTree(element,
 void IndexedXML::readTree(XMLElement* element, Content content) {
     if (element == nullptr)
         return;
-    _tree.emplace(*element);
+    _tree = std::make_shared<XMLTreeIndexer>(*element);
     _index = &_tree->index();
     _root = 0;
     if (content == Content::atOnce)
@@ -130,10 +134,10 @@ void IndexedXML::matchBy(const NamespaceTable& table) {
     _matched = MatchedNames(index(), _root, around, table, _interned).takeNumbers();
 }
 
-String IndexedXML::value(Number number) {
+Value IndexedXML::value(Number number) {
     const XMLIndexEntry& entry = index()[number];
     if (entry.end - entry.begin <= longestUnshared)
-        return textInBlock(index().value(entry, _room));
+        return detail::LentText::of(index().value(entry, _room));
     String& value = _longTexts[number];
     if (value.isNull())
         value = index().value(entry, _room);
@@ -147,7 +151,7 @@ bool IndexedXML::hasPlainText(Number element) {
     return first == end || (index().siblingOf(first) == end && !isElement(first));
 }
 
-String IndexedXML::text(Number element) {
+Value IndexedXML::text(Number element) {
     expand(element);
     const Number first = index().firstChild(element);
     const Number end = index().contentEnd(element);
@@ -159,11 +163,11 @@ String IndexedXML::text(Number element) {
         return value(first);
     if (const auto known = _longTexts.find(element); known != _longTexts.end())
         return known->second;
-    std::string joined;
-    appendText(element, joined);
-    if (joined.size() <= longestUnshared)
-        return textInBlock(joined);
-    return _longTexts.try_emplace(element, joined).first->second;
+    _joined.clear();
+    appendText(element, _joined);
+    if (_joined.size() <= longestUnshared)
+        return detail::LentText::of(_joined);
+    return _longTexts.try_emplace(element, _joined).first->second;
 }
 
 void IndexedXML::appendText(Number element, std::string& text) {
@@ -240,7 +244,7 @@ IndexedXML::Extent IndexedXML::extent(Number element, std::size_t enough) {
 NodePool& IndexedXML::pool(Nodes nodes) {
     auto& pool = nodes == Nodes::own ? _own : _copies;
     if (!pool)
-        pool = std::make_unique<NodePool>(index(), _tree ? &*_tree : nullptr);
+        pool = std::make_unique<NodePool>(index(), _tree.get());
     return *pool;
 }
 
@@ -272,6 +276,20 @@ Ref<XMLNode> IndexedXML::quoted(Number number) {
     if (number == none)
         return nullptr;
     return isElement(number) ? element(Nodes::own, number) : XMLNodeMaker(index()).node(number);
+}
+
+const std::shared_ptr<const DocumentPlaces>& IndexedXML::places() {
+    if (_places)
+        return _places;
+    if (const XMLDocument* const document = _tree ? _tree->element(0).rootDocument() : nullptr)
+        _documentName = document->documentName();
+    if (_tree)
+        _places = std::make_shared<DocumentPlaces>(_tree, _documentName);
+    else if (_parsed != nullptr)
+        _places = std::make_shared<DocumentPlaces>(_parsed->shared_from_this(), _documentName);
+    else
+        _places = std::make_shared<DocumentPlaces>();
+    return _places;
 }
 
 void IndexedXML::detach(Number element) {

@@ -4,6 +4,7 @@
 // everything as it stood at the start, and the nodes behind its entries where somebody needs one.
 // Used by one thread at a time.
 
+#include "xml/DocumentPlaces.h"
 #include "xml/XMLDocumentContent.h"
 #include "xml/XMLTreeIndexer.h"
 
@@ -20,8 +21,8 @@ public:
     using Number = XMLIndex::Number;
     static constexpr Number none = UINT32_MAX;
 
-    // Borrows what was parsed, of nobody's document.
-    explicit IndexedXML(const ParsedDocument& parsed);
+    // Borrows what was parsed, of nobody's document, which messages call by that name.
+    explicit IndexedXML(const ParsedDocument& parsed, String documentName = {});
     // The document's own, without making its nodes, if it has none.
     explicit IndexedXML(XMLDocument& document);
     // Of an element the content is read at once, or, where only some of it may be needed, as it is
@@ -96,10 +97,11 @@ public:
             at = isFound ? index().siblingOf(at) : at + 1;
         }
     }
-    // Of a text, attribute or declaration. Whoever asks for a long one gets the same.
-    String value(Number number);
+    // Of a text, attribute or declaration, good until something else is asked for; a copy is good
+    // for ever. Whoever asks for a long one gets the same.
+    Value value(Number number);
     // All text inside an element, concatenated. Likewise.
-    String text(Number element);
+    Value text(Number element);
     // The attribute of that name, which is interned; none where there is none.
     Number attribute(Number element, const String& name);
     // Whether text() finds at most one text without going far.
@@ -126,6 +128,8 @@ public:
     bool isMade(Nodes nodes, Number number) const;
     // Takes the element out of the host's tree; nothing where the host has none.
     void detach(Number element);
+    // Where its entries stand; good for longer than the reading. Made when first asked for.
+    const std::shared_ptr<const DocumentPlaces>& places();
 
 private:
     const XMLIndex& index() const noexcept { return *_index; }
@@ -144,7 +148,8 @@ private:
     NodePool& pool(Nodes nodes);
 
     std::optional<XMLDocumentContent::Reader> _reader;
-    std::optional<XMLTreeIndexer> _tree;
+    std::shared_ptr<XMLTreeIndexer> _tree;
+    const ParsedDocument* _parsed = nullptr;
     const XMLIndex* _index = nullptr; // what was parsed, or the tree's; null where there is nothing
     const String _noName;
     Number _root = none;
@@ -153,11 +158,14 @@ private:
     bool _isAsWritten = false;
     std::vector<std::uint32_t> _matched; // then: of each entry, its name's number
     std::string _room;
+    std::string _joined;
     std::unordered_map<Number, String> _longTexts; // of attributes, texts and elements
     // Of elements with many attributes, by name.
     std::unordered_map<Number, std::unordered_map<const void*, Number>> _attributes;
     std::unique_ptr<NodePool> _own;
     std::unique_ptr<NodePool> _copies;
+    String _documentName;
+    std::shared_ptr<const DocumentPlaces> _places;
 };
 
 } // namespace qx

@@ -6,9 +6,11 @@
 #include "xml/XMLIndex.h"
 #include "xml/XMLInput.h"
 
+#include <memory>
+
 namespace qx {
 
-class ParsedDocument {
+class ParsedDocument : public std::enable_shared_from_this<ParsedDocument> {
 public:
     ParsedDocument() : _index({}) {}
     ParsedDocument(const ParsedDocument&) = delete;

@@ -5,6 +5,7 @@
 // long the lines are.
 
 #include <cstddef>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -18,6 +19,10 @@ struct TextOrigin {
     std::size_t line = 1;
     std::size_t column = 1;
     std::vector<std::size_t> tagLines; // of the tags among what was added
+    // The elements that the pieces are cut behind, and how many of them stand before the piece in
+    // the elements of those tags; empty where their name is not known.
+    std::string itemName;
+    std::vector<std::size_t> tagItems;
 };
 
 class TextPosition {

@@ -5,6 +5,7 @@
 #include "files/AtomicWrite.h"
 #include "files/Files.h"
 #include "files/Paths.h"
+#include "model/ErrorDetails.h"
 #include "model/Errors.h"
 #include "xml/Encoding.h"
 #include "xml/XMLDocumentContent.h"
@@ -37,7 +38,12 @@ Ref<XMLDocument> XMLDocument::initWithContentsOfURL(const String& URL,
 Ref<XMLDocument> XMLDocument::initWithContentsOfFile(const String& path,
                                                      const XMLParseOptions& options,
                                                      Ref<Error>* error) {
-    return documentOf(readFile(path, error), options, error);
+    auto document = documentOf(readFile(path, error), options, error);
+    if (document)
+        document->setDocumentName(path);
+    else
+        detail::ErrorDetails::nameDocument(error, path);
+    return document;
 }
 
 Ref<XMLDocument> XMLDocument::initWithData(XMLBytes bytes, const XMLParseOptions& options,
@@ -145,6 +151,7 @@ void XMLDocument::setStringValue(const String& value) {
 
 Ref<XMLNode> XMLDocument::copy() const {
     auto document = Ref<XMLDocument>::adopt(new XMLDocument);
+    document->_documentName = _documentName;
     document->_version = _version;
     document->_encoding = _encoding;
     document->_standalone = _standalone;

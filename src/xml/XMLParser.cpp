@@ -1,5 +1,6 @@
 #include "xml/XMLParser.h"
 
+#include "model/ErrorDetails.h"
 #include "xml/SAXSession.h"
 #include "xml/XMLScanner.h"
 
@@ -51,8 +52,14 @@ Ref<Error> XMLParser::errorOf(const ParseFailure& failure, std::string_view text
                               const TextOrigin& origin) {
     TextPosition place(text, origin);
     place.moveTo(failure.offset);
-    return make<Error>(Error::parserDomain, *failure.text, failure.code, failure.arguments,
-                       place.line(), place.column());
+    detail::SourcePlace source;
+    source.place.line = place.line();
+    source.place.column = place.column();
+    detail::setExcerpt(source, text, failure.offset, origin.added);
+    auto error = make<Error>(*failure.text, failure.arguments, failure.code, Error::parserDomain);
+    detail::ErrorDetails::setContext(*error,
+                                     std::make_unique<detail::KnownContext>(std::move(source)));
+    return error;
 }
 
 } // namespace qx

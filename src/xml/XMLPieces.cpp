@@ -118,23 +118,28 @@ XMLParser::Parsed XMLPieces::parseUpToCut() {
 
 void XMLPieces::removeUpToCut() {
     const std::size_t cut = _splitter.cut();
-    TextPosition place(text().substr(0, cut), {0, 0, _origin.line, _origin.column, {}});
+    TextOrigin begin;
+    begin.line = _origin.line;
+    begin.column = _origin.column;
+    TextPosition place(text().substr(0, cut), begin);
     std::vector<std::size_t> lines(_splitter.openCount());
+    std::vector<std::size_t> items(lines.size());
     for (std::size_t i = 0; i < lines.size(); ++i) {
-        const std::size_t begin = _splitter.placeOfOpen(i);
-        if (begin == XMLSplitter::none) {
+        items[i] = _splitter.itemsInOpen(i);
+        const std::size_t tag = _splitter.placeOfOpen(i);
+        if (tag == XMLSplitter::none) {
             lines[i] = _origin.tagLines[i];
             continue;
         }
-        place.moveTo(begin);
+        place.moveTo(tag);
         lines[i] = place.line();
     }
     place.moveTo(cut);
     _start += cut;
     _splitter.removeUpToCut();
     _opening = _splitter.opening();
-    _origin = {_opening.size(), _splitter.prologueSize(), place.line(), place.column(),
-               std::move(lines)};
+    _origin = {_opening.size(),  _splitter.prologueSize(),          place.line(),    place.column(),
+               std::move(lines), std::string(_splitter.itemName()), std::move(items)};
 }
 
 } // namespace qx

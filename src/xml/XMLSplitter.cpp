@@ -247,10 +247,13 @@ bool XMLSplitter::goOverEndTag() {
 }
 
 bool XMLSplitter::endElement(End end) {
-    if (_depth == 0)
+    if (_depth == 0) {
         _open.pop_back();
-    else if (--_depth == 0)
+    } else if (--_depth == 0) {
         ++_itemCount;
+        if (!_open.empty())
+            ++_open.back().items;
+    }
     // No name of an item, whatever the root was called.
     if (_depth == 0 && _open.empty())
         _root = noItem();

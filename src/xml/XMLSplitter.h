@@ -54,12 +54,18 @@ public:
     std::size_t openCount() const noexcept { return _open.size(); }
     std::size_t placeOfOpen(std::size_t i) const noexcept { return _open[i].place; }
     bool hasRootEnded() const noexcept { return !_root.empty(); }
+    // How many items have ended in the element of that tag; 0 where their name is not known.
+    std::size_t itemsInOpen(std::size_t i) const noexcept { return _open[i].items; }
+    std::string_view itemName() const noexcept {
+        return _match == Match::names ? _itemName.view() : std::string_view();
+    }
 
 private:
     struct Open {
         std::string tag; // the start tag, of its attributes those that hold inside
         std::size_t nameSize;
         std::size_t place;
+        std::size_t items = 0;
         std::string_view name() const noexcept { return std::string_view(tag).substr(1, nameSize); }
     };
     // Where something ends; none where the text ends before.

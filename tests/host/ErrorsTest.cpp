@@ -46,7 +46,8 @@ TEST(ErrorsTest, EveryTextIsTranslatedWithTheSameDirectives) {
             EXPECT_EQ(found->second == std::string_view(text), language == "en")
                 << language << ": " << text;
         };
-        for (const char* header : {support::libraryErrors, support::parserErrors}) {
+        for (const char* header :
+             {support::libraryErrors, support::parserErrors, support::findingTexts}) {
             const auto written = support::errorTexts(header);
             EXPECT_GT(written.size(), 20U);
             for (const std::string& text : written)

@@ -68,6 +68,29 @@ TEST(Mapping, KnowsTheNodeKindByItsWord) {
             << binding;
 }
 
+TEST(Mapping, KnowsWhereItsNodesStand) {
+    auto source = parsed("<mapping>\n <include href='i'/>\n\n <class name='ä'><field name='f'>\n"
+                         "<bind-xml/> <alt-xml/></field></class></mapping>");
+    source->setDocumentName("maps/orders.xml");
+    const auto document = QXXMLDocumentMapping::initWithXML(source->rootElement());
+    source = nullptr; // nodes outlive it
+    const auto told = [](const QXXMLMappingPlace& place) {
+        return place.documentName.str() + ':' + std::to_string(place.line) + ':' +
+               std::to_string(place.column);
+    };
+    const auto& type = *document->classMappings()[0];
+    const auto& member = *type.fields()[0];
+    EXPECT_EQ(told(document->place()), "maps/orders.xml:1:1");
+    EXPECT_EQ(told(document->includePlace(0)), "maps/orders.xml:2:2");
+    EXPECT_EQ(told(type.place()), "maps/orders.xml:4:2");
+    EXPECT_EQ(told(member.place()), "maps/orders.xml:4:18");
+    EXPECT_EQ(told(member.bindToMappings()[1]->place()), "maps/orders.xml:5:13");
+    const auto copy = type.copyWithZone().as<QXXMLClassMapping>();
+    EXPECT_EQ(told(copy->place()), "maps/orders.xml:4:2");
+    EXPECT_EQ(copy->includedFrom().size(), 0U);
+    EXPECT_EQ(told(QXXMLMapping::initWithXML(nullptr)->place()), ":0:0");
+}
+
 TEST(Mapping, KeepsNoFieldsClassAlive) {
     Ref<QXXMLFieldMapping> kept;
     {

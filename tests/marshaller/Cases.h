@@ -10,6 +10,9 @@
 //     xml written      what is written
 //     text error       "CODE: message (reason)" of the mapping, of reading or of writing; the
 //                      reason may be left out
+//     text place       where it is: "LINE:COLUMN PATH" in the document, then a line each for
+//                      "by LINE:COLUMN FIELD of CLASS" in the mapping, as far as that is known, and
+//                      for the suggestion
 //
 // What is read is also read into an object that is there.
 //
@@ -106,8 +109,25 @@ inline void checkReload(QXXMLMarshaller& marshaller, const std::string& source) 
 }
 
 struct Result {
-    std::string object, written, error = "no error\n", errorWithoutReason;
+    std::string object, written, error = "no error\n", errorWithoutReason, place = "no error\n";
 };
+
+// A tree does not know where its attributes stand.
+inline std::string placeOf(const qx::Error& error, bool isTree) {
+    const auto told = [](const qx::DocumentPlace& place) {
+        return std::to_string(place.line) + ":" + std::to_string(place.column);
+    };
+    const std::string path = error.path().str();
+    const bool isKnown = !isTree || path.find('@') == std::string::npos;
+    std::string text = (isKnown ? told(error.place()) : "?") + " " + path + "\n";
+    if (!error.mappingClass().isNull())
+        text += "by " + told(error.mappingPlace()) +
+                (error.mappingField().isNull() ? "" : " " + error.mappingField().str()) + " of " +
+                error.mappingClass().str() + "\n";
+    if (!error.suggestion().isNull())
+        text += error.suggestion().str() + "\n";
+    return text;
+}
 
 constexpr const char* declaration = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n";
 
@@ -155,6 +175,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
         EXPECT_TRUE(element || object.isNull() || support::told(problem) == support::told(error));
     }
     if (error) {
+        result.place = placeOf(*error, isTree);
         result.error = support::told(error) + "\n";
         result.errorWithoutReason =
             std::to_string(error->code()) + ": " + error->localizedDescription().str() + "\n";
@@ -185,6 +206,11 @@ inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
                 << result.error;
         } else if (expectation.kind == "written") {
             EXPECT_EQ(result.written, expectation.text) << result.error;
+        } else if (expectation.kind == "place") {
+            const std::string& place = expectation.text;
+            const bool isHidden = isTree && place.find('@') < place.find('\n');
+            EXPECT_EQ(result.place, isHidden ? "?" + place.substr(place.find(' ')) : place)
+                << result.error;
         } else if (expectation.text != result.errorWithoutReason) {
             EXPECT_EQ(result.error, expectation.text);
         }
@@ -193,7 +219,8 @@ inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
 
 inline bool addPage(const std::string& page, std::vector<kinds::Kind> on) {
     return support::addCases(page, {"mapping", "prefixes", "document", "given"},
-                             {"object", "written", "error"}, [=](const Expectation& expectation) {
+                             {"object", "written", "error", "place"},
+                             [=](const Expectation& expectation) {
                                  for (const kinds::Kind kind : on)
                                      checkOn(kind, expectation);
                              });

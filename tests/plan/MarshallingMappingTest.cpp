@@ -1,6 +1,7 @@
 // Mapping documents are resolved: includes are pulled in, classes are found by both of their names.
 
 #include "support/Cases.h"
+#include "support/TemporaryFolder.h"
 #include "support/Texts.h"
 
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
@@ -119,6 +120,91 @@ TEST_F(MarshallingMapping, AsksOneManagerForAllIncludesAndCatchesWhatIsRaisedBel
     EXPECT_EQ(resolve("<include href='outer'/>"),
               "-218: Unable to load included file: outer (Unable to load included document)");
     EXPECT_EQ(resolve("<include href='flush'/><include href='d'/>"), "D ");
+}
+
+TEST_F(MarshallingMapping, TellsWhichIncludesLedToAClass) {
+    repository->documents = {{"b", "\n<include href='c'/>"}, {"c", "<class name='C'/>"}};
+    const auto document = mappingOf("<include href='none'/><include href='b'/>");
+    document->setDocumentName("outer.xml");
+    const auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get());
+    const QXXMLClassMapping& included = *mapping->mappingForClassName("C");
+    std::string told = included.place().documentName.str();
+    for (const QXXMLMappingPlace& place : included.includedFrom())
+        told += " from " + place.documentName.str() + ':' + std::to_string(place.line) + ':' +
+                std::to_string(place.column);
+    EXPECT_EQ(told, "c from b:2:1 from outer.xml:1:32");
+}
+
+TEST_F(MarshallingMapping, LooksBesideTheOutermostFileForWhatNoRepositoryHas) {
+    const TemporaryFolder folder;
+    const auto one = [](const char* name) {
+        return "<mapping><class name='" + std::string(name) + "'/></mapping>";
+    };
+    folder.write("secret.xml", one("Secret"));
+    folder.write("maps/both.xml", one("Beside"));
+    folder.write("maps/last.xml", one("Last"));
+    folder.write("maps/parts/inner.xml", "<mapping><include href='last.xml'/></mapping>");
+    folder.write("maps/parts/last.xml", one("NotAsked"));
+    folder.write("maps/broken.xml", "<mapping>");
+    folder.write("maps/folder/file", "");
+    repository->documents = {{"both.xml", "<class name='Repository'/>"}};
+    const auto names = [&](const std::string& href) {
+        const std::string path =
+            folder.write("maps/main.xml", "<mapping><include href='" + href + "'/></mapping>");
+        Ref<Error> error;
+        const auto mapping = QXXMLMarshallingMapping::initWithContentsOfFile(path, &error);
+        if (!mapping)
+            return "error " + std::to_string(error->code());
+        std::string told;
+        for (const auto& type : mapping->mapping()->classMappings())
+            told += type->className().str() + ' ' + type->place().documentName.str();
+        return told;
+    };
+    const std::pair<std::string, std::string> cases[] = {
+        {"last.xml", "Last " + folder.path("maps/last.xml")},
+        {"both.xml", "Repository both.xml"},
+        {"parts/inner.xml", "Last " + folder.path("maps/last.xml")},
+        {"nowhere.xml", ""},
+        {"../secret.xml", ""},
+        {"parts/../../secret.xml", ""},
+        {folder.path("secret.xml"), ""},
+        {"", ""},
+        {".", ""},
+        {std::string(100'000, 'a'), ""},
+        {"folder", "error 256"},
+        {"broken.xml", "error 77"},
+        {"main.xml", "error -218"},
+    };
+    for (const auto& [href, expected] : cases)
+        EXPECT_EQ(names(href), expected) << href.substr(0, 100);
+    const auto document = mappingOf("<include href='last.xml'/>");
+    EXPECT_TRUE(QXXMLMarshallingMapping::initWithDocument(document.get())
+                    ->mapping()
+                    ->classMappings()
+                    .empty());
+}
+
+TEST_F(MarshallingMapping, CollectsAllFaultsOfADocumentAndItsIncludesInOneRun) {
+    repository->documents = {{"b", "\n<class name='B'><field name='f' lazy='no'/></class>"
+                                   "<class name='A'/>"},
+                             {"broken", "broken"}};
+    const auto document = mappingOf("<class/>\n<class name='A' self-first='1'><map-to/><map-to/>\n"
+                                    "<field/><field name='f' lazy='x' direct='y'><alt-xml/></field>"
+                                    "</class>\n<include href='broken'/>\n<include href='b'/>");
+    Ref<Error> error;
+    const auto mapping =
+        QXXMLMarshallingMapping::initWithDocument(document.get(), {.collectsFaults = true}, &error);
+    ASSERT_TRUE(mapping);
+    std::string told;
+    for (const QXXMLFinding& fault : mapping->faults())
+        told += std::to_string(fault.fault->code()) + ' ' + fault.place.documentName.str() + ':' +
+                std::to_string(fault.place.line) +
+                (fault.includedFrom.empty() ? "\n" : " from 5\n");
+    EXPECT_EQ(told, "-202 :1\n-203 :2\n-201 :2\n-202 :3\n-203 :3\n-203 :3\n-219 :3\n"
+                    "68 :4\n-203 b:2 from 5\n-205 b:2 from 5\n");
+    EXPECT_EQ(error->code(), -202);
+    EXPECT_EQ(mapping->mappingForClassName("A")->fields().size(), 1U);
+    EXPECT_FALSE(mapping->mappingForClassName("B")->copyWithZone()); // reports to nobody now
 }
 
 TEST_F(MarshallingMapping, FailsForASlotThatHoldsAnErrorAlready) {

@@ -13,6 +13,7 @@
 namespace support {
 
 inline constexpr const char* libraryErrors = QX_SOURCE_DIR "/src/model/Errors.h";
+inline constexpr const char* findingTexts = QX_SOURCE_DIR "/src/check/FindingTexts.h";
 inline constexpr const char* parserErrors = QX_SOURCE_DIR "/src/xml/ParseFailure.h";
 
 // What the groups of the pattern match, for each of its matches.

@@ -101,6 +101,12 @@ void addReading(CLI::App& command, Options& options) {
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
+void addChecking(CLI::App& command, Options& options) {
+    addMapping(command, options);
+    command.add_flag("--notes", options.notes, "Print what is only worth a note, too");
+    command.add_flag("--json", options.json, "Print an array of findings as JSON");
+}
+
 void addInferring(CLI::App& command, Options& options) {
     command
         .add_option("DOCUMENT", options.documents, "The paths of documents; - is standard input")
@@ -114,8 +120,9 @@ void addInferring(CLI::App& command, Options& options) {
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
-// Defines the commands; the one that was called is left in `chosen`.
-void define(CLI::App& tool, Options& options, Command& chosen) {
+// Defines the commands; the one that was called is left in `chosen`, what it says of its exit in
+// `status`.
+void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     tool.require_subcommand(1);
     tool.set_version_flag("--version", "qxxml " + std::string(qx::libraryVersionText()),
                           "Print the version and exit");
@@ -147,6 +154,12 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
     command = add("roundtrip", "Read a document, write its object and print that", roundtrip);
     addReading(*command, options);
     command->add_flag("--pretty", options.pretty, "Print one element a line");
+    addSearch(*command, options);
+
+    command = add("check", "Tell what a mapping does that its author may not want", nullptr);
+    command->callback(
+        [&] { chosen = [&status](const Options& given) { return check(given, status); }; });
+    addChecking(*command, options);
     addSearch(*command, options);
 
     command = add("infer", "Print a mapping that fits documents which have none", infer);
@@ -189,7 +202,8 @@ int runCommandLine(int argc, const char* const* argv) try {
     Options options;
     Command command = nullptr;
     CLI::App tool("Tries mapping documents on XML documents.", "qxxml");
-    define(tool, options, command);
+    int status = 0;
+    define(tool, options, command, status);
     try {
         tool.parse(argc, argv);
     } catch (const CLI::ParseError& error) {
@@ -197,7 +211,7 @@ int runCommandLine(int argc, const char* const* argv) try {
     }
     print(command(options));
     flushOutput();
-    return 0;
+    return status;
 } catch (const std::bad_alloc&) {
     std::fputs("qxxml: error 12: Out of memory\n", stderr);
     return failed;

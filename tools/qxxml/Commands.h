@@ -23,4 +23,7 @@ std::string graph(const Options& options);
 // The path that a name resolves to, and the places that were looked at up to there.
 std::string where(const Options& options);
 
+// What is wrong with the mapping; sets the exit status to 1 where that is more than notes.
+std::string check(const Options& options, int& status);
+
 } // namespace qxxml

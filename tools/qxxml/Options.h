@@ -24,6 +24,8 @@ struct Options {
     bool svg = false;
     bool keepOrder = false;
     bool matchNamespaces = false;
+    bool json = false;
+    bool notes = false;
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;

@@ -37,21 +37,25 @@ Session::Session(const Options& options) : _options(options) {
     standFor(options.application);
     _repository = QXXMLFileSystemDataRepository::init<ToolRepository>();
     _repository->searchFirst(options.searchPaths);
-    if (!options.mapping.empty()) {
-        const auto folder = std::filesystem::path(options.mapping).parent_path();
-        _repository->searchFirst({folder.empty() ? "." : folder.string()});
-    }
     QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_repository);
+}
+
+qx::Ref<QXXMLMarshallingMapping> Session::resolveMapping(QXXMLMappingOptions options) const {
+    qx::Ref<qx::Error> error;
+    const auto document = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
+    if (!document)
+        throw Failure(error, _options.mapping);
+    const auto folder = std::filesystem::path(_options.mapping).parent_path();
+    options.includeFolder = folder.empty() ? "." : folder.string();
+    auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), options, &error);
+    if (!mapping)
+        throw Failure(error, _repository->failedPath());
+    return mapping;
 }
 
 qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
     qx::Ref<qx::Error> error;
-    const auto mapping = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
-    if (!mapping)
-        throw Failure(error, _options.mapping);
-    auto marshaller = QXXMLMarshaller::initWithMappingXML(mapping.get(), &error);
-    if (!marshaller)
-        throw Failure(error, _repository->failedPath());
+    auto marshaller = QXXMLMarshaller::initWithMapping(resolveMapping());
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);

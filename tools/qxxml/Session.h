@@ -18,7 +18,10 @@ public:
     explicit Session(const Options& options);
 
     ToolRepository& repository() const noexcept { return *_repository; }
-    // Made from the mapping document, whose own folder is searched first for includes.
+    // The mapping document, whose own folder is searched last for includes, resolved. What the
+    // options say of that folder is not looked at.
+    qx::Ref<QXXMLMarshallingMapping> resolveMapping(QXXMLMappingOptions options = {}) const;
+    // Made from that.
     qx::Ref<QXXMLMarshaller> makeMarshaller() const;
     // The object that the marshaller reads from the document; null where no class handles it.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;

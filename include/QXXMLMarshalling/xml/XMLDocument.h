@@ -103,6 +103,11 @@ public:
     // Appends an element (only one), a comment or a processing instruction.
     void addChild(Ref<XMLNode> child);
 
+    // What messages call the document: the path of the file that it was read from, until the host
+    // says something else; null for one that was read from anything else, or made by hand.
+    const String& documentName() const noexcept { return _documentName; }
+    void setDocumentName(const String& name) { _documentName = name; }
+
     // The XML declaration's parts as read or set; null where not given.
     const String& version() const noexcept { return _version; }
     void setVersion(const String& version) { _version = version; }
@@ -150,6 +155,7 @@ private:
     struct Pending;
     std::unique_ptr<Pending> _pending; // of a document that was parsed
     XMLNode* _firstChild = nullptr;
+    String _documentName;
     String _version;
     String _encoding;
     String _standalone;

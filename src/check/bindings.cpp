@@ -1,0 +1,156 @@
+// The bindings of one field by itself: words that are none, names and locations that nothing uses.
+
+#include "check/Rules.h"
+#include "xml/XMLCharacters.h"
+
+#include <set>
+
+namespace qx::detail {
+
+namespace {
+
+constexpr std::string_view nodes[] = {"attribute", "element", "text"};
+constexpr std::string_view collections[] = {"array", "vector", "collection", "set"};
+
+// One field, whose findings are added to the check.
+class BindingCheck {
+public:
+    BindingCheck(MappingCheck& check, const ClassPlan& type, const FieldPlan& field)
+        : _check(check), _type(type), _field(field), _bindings(field.mapping->bindToMappings()) {}
+
+    void run() {
+        checkWords();
+        checkThatItIsRead();
+        checkNames();
+        checkAlternatives();
+        checkLocations();
+        const bool isObject = _field.kind == BindingKind::element ||
+                              _field.kind == BindingKind::flattened ||
+                              _field.kind == BindingKind::automatic;
+        if (!_field.isContainer && (!isObject || _field.isCollection()))
+            _check.add(findings::containerOfNoObject, ofField());
+    }
+
+private:
+    void checkWords();
+    void checkThatItIsRead();
+    void checkNames();
+    void checkName(const String& name, const Subject& subject);
+    void checkAlternatives();
+    void checkLocations();
+
+    Subject ofField() const { return Subject::of(*_field.mapping); }
+    Subject ofBinding(std::size_t number) const {
+        return Subject::of(*_field.mapping, *_bindings[number]);
+    }
+
+    MappingCheck& _check;
+    const ClassPlan& _type;
+    const FieldPlan& _field;
+    const std::vector<Ref<QXXMLBindToMapping>>& _bindings;
+};
+
+void BindingCheck::checkWords() {
+    if (_field.collection == CollectionKind::unknown)
+        _check.suggest(_check.nearest(_field.mapping->collection(), collections),
+                       findings::unknownCollection, ofField(), _field.mapping->collection(),
+                       _type.mapping->className());
+    if (_bindings.empty() || _field.isCollection() || _field.kind != BindingKind::automatic)
+        return;
+    const String& node = _bindings.front()->node();
+    if (!node.isEmpty())
+        return _check.suggest(_check.nearest(node, nodes), findings::unknownNode, ofBinding(0),
+                              node);
+    const ClassPlan* const type = _field.typeClass;
+    if (type == nullptr)
+        return _check.add(findings::nodeLeftOpen, ofBinding(0));
+    // An object is written under its class's name, and read from the field's.
+    const String written = type->elementName.isEmpty() ? type->namelessName : type->elementName;
+    if (_field.isContainer && written != _field.xmlName())
+        _check.suggest("node=\"element\"", findings::writtenAsClass, ofBinding(0), written);
+}
+
+void BindingCheck::checkThatItIsRead() {
+    const bool isCollection = _field.isCollection();
+    if (_bindings.empty() && (!isCollection || _field.hasType()))
+        return _field.isRequired && !isCollection
+                   ? _check.add(findings::requiredWithoutBinding, ofField(),
+                                _type.mapping->className())
+                   : _check.add(findings::fieldWithoutBinding, ofField());
+    if (!isCollection || _field.typeClass == nullptr)
+        return;
+    bool isNamed = false;
+    for (const BindingPlan& binding : _field.bindings)
+        isNamed = isNamed || !binding.bindTo.isEmpty();
+    if (!isNamed)
+        _check.add(findings::itemsWithoutName, ofBinding(0), _field.typeClass->className.string());
+}
+
+void BindingCheck::checkNames() {
+    for (std::size_t i = 0; i < _bindings.size(); ++i) {
+        checkName(_bindings[i]->bindTo(), ofBinding(i));
+        checkName(_bindings[i]->location(), ofBinding(i));
+    }
+}
+
+void BindingCheck::checkName(const String& name, const Subject& subject) {
+    if (!name.isEmpty() && !isXMLName(name))
+        _check.add(findings::noXMLName, subject, name);
+}
+
+void BindingCheck::checkAlternatives() {
+    const bool skipsNameless =
+        _field.isCollection() ? !_field.hasSimpleType() : _field.kind == BindingKind::text;
+    const bool isFlattened = _field.kind == BindingKind::flattened && !_field.isCollection();
+    // Fields of these kinds look at the location, too.
+    const bool usesLocation = _field.isCollection() ? _field.hasType()
+                                                    : _field.kind == BindingKind::attribute ||
+                                                          _field.kind == BindingKind::automatic;
+    std::set<std::pair<std::string_view, std::string_view>> tried;
+    for (std::size_t i = 0; i < _field.bindings.size(); ++i) {
+        const BindingPlan& binding = _field.bindings[i];
+        const std::string_view location = usesLocation ? binding.location.view() : "";
+        const bool isSkipped = skipsNameless && binding.bindTo.isEmpty();
+        const bool isNew = isSkipped || tried.emplace(binding.name.view(), location).second;
+        if (i == 0)
+            continue;
+        if (isFlattened)
+            _check.add(findings::alternativeOfFlattened, ofBinding(i));
+        else if (isSkipped)
+            _check.add(findings::alternativeWithoutName, ofBinding(i));
+        else if (!isNew)
+            _check.add(findings::nameTriedBefore, ofBinding(i));
+    }
+}
+
+void BindingCheck::checkLocations() {
+    for (std::size_t i = 0; i < _field.bindings.size(); ++i) {
+        const String& location = _field.bindings[i].location;
+        if (location.isEmpty())
+            continue;
+        if (_field.isCollection()) {
+            if (!_field.hasType() && i == 0)
+                _check.add(findings::locationOnlyWritten, ofBinding(i), location);
+            else if (!_field.hasType())
+                _check.add(findings::locationNotUsed, ofBinding(i), location);
+        } else if (_field.kind == BindingKind::automatic) {
+            _check.add(findings::locationOnlyRead, ofBinding(i), location);
+        } else if (_field.kind != BindingKind::attribute) {
+            _check.add(findings::locationNotUsed, ofBinding(i), location);
+        }
+    }
+}
+
+} // namespace
+
+void checkBindings(MappingCheck& check) {
+    for (const ClassPlan* type : check.classes()) {
+        const String& element = type->mapping->mapTo();
+        if (!element.isEmpty() && !isXMLName(element))
+            check.add(findings::noXMLName, Subject::of(*type->mapping), element);
+        for (const FieldPlan& field : type->fields)
+            BindingCheck(check, *type, field).run();
+    }
+}
+
+} // namespace qx::detail

@@ -1,0 +1,47 @@
+#include "marshaller/ReadingContext.h"
+
+namespace qx::detail {
+
+namespace {
+
+const QXXMLClassMapping* classOf(const ReadingSpot& spot) {
+    if (spot.field != nullptr)
+        if (const auto holder = spot.field->mapping->classMapping())
+            return holder.get();
+    return spot.classPlan != nullptr ? spot.classPlan->mapping : nullptr;
+}
+
+DocumentPlace placeOf(const QXXMLMappingPlace& place) {
+    return {place.documentName, place.line, place.column};
+}
+
+} // namespace
+
+ReadingContext::ReadingContext(IndexedXML& document, const QXXMLMarshallingMapping* mapping,
+                               const ReadingSpot& spot)
+    : _places(document.places()), _number(spot.number), _mapping(mapping),
+      _field(spot.field != nullptr ? spot.field->mapping : nullptr), _class(classOf(spot)) {}
+
+void ReadingContext::tell(const Ref<Error>& error, IndexedXML& document,
+                          const QXXMLMarshallingMapping* mapping, const ReadingSpot& spot) {
+    if (error && !ErrorDetails::hasContext(*error))
+        ErrorDetails::setContext(*error, std::make_unique<ReadingContext>(document, mapping, spot));
+}
+
+MappingNote ReadingContext::mapping() const {
+    MappingNote note;
+    const QXXMLMapping* const node =
+        _field ? static_cast<const QXXMLMapping*>(_field.get()) : _class.get();
+    if (_field)
+        note.field = _field->name();
+    if (_class)
+        note.className = _class->className();
+    if (node == nullptr)
+        return note;
+    note.place = placeOf(node->place());
+    for (const QXXMLMappingPlace& include : node->includedFrom())
+        note.includes.push_back(placeOf(include));
+    return note;
+}
+
+} // namespace qx::detail

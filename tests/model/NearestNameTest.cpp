@@ -1,0 +1,60 @@
+// The suggestion beside an unknown name.
+
+#include "base/NearestName.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <vector>
+
+namespace {
+
+using qx::nearestName;
+
+TEST(NearestName, IsWhatTheWriterMeantOrNothing) {
+    const std::vector<std::string_view> known = {
+        "price", "prices",  "quantity",      "id",        "feed",  "boolean",
+        "int",   "integer", "auto-complete", "po:number", "größe", "order"};
+    const std::pair<const char*, const char*> cases[] = {
+        {"pirce", "price"},            // neighbours swapped
+        {"prce", "price"},             // a character less
+        {"pricess", "prices"},         // the nearer of two
+        {"PRICE", "price"},            // case comes before edits
+        {"atom:feed", "feed"},         // another prefix
+        {"a:number", "po:number"},     //
+        {"number", "po:number"},       // or none
+        {"bool", "boolean"},           // the beginning
+        {"complete", "auto-complete"}, // the end
+        {"integr", "integer"},         //
+        {"autoComplete", "auto-complete"},
+        {"qunatiyt", "quantity"}, // two swaps
+        {"grösse", ""},           // two edits are too many for so few letters
+        {"größ", "größe"},
+        {"GRÖßE", "größe"},
+        {"ic", ""}, // nothing is left of so short a name
+        {"ix", ""},
+        {"ID", "id"},
+        {"ord", "order"},
+        {"double", ""},
+        {"price", "prices"}, // itself is no suggestion
+        {"", ""},
+        {":", ""},
+    };
+    for (const auto& [wanted, expected] : cases)
+        EXPECT_EQ(nearestName(wanted, known), expected) << wanted;
+}
+
+TEST(NearestName, IsFoundInBoundedTimeWhateverTheNamesAre) {
+    const std::string endless(1'000'000, 'a');
+    const std::string wide = std::string(60, 'a');
+    std::vector<std::string> many;
+    for (int i = 0; i < 200'000; ++i)
+        many.push_back(wide.substr(0, 54) + std::to_string(i));
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(nearestName(endless, std::vector(1000, endless.substr(1))), "");
+    EXPECT_EQ(nearestName(wide, many), "");
+    EXPECT_EQ(nearestName("\xff\xfe", std::vector<std::string>{"ab"}), "");
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
+}
+
+} // namespace
