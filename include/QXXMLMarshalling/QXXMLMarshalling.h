@@ -32,6 +32,7 @@
 #include <QXXMLMarshalling/base/Key.h>
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/base/String.h>
+#include <QXXMLMarshalling/base/Version.h>
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/Log.h>
 #include <QXXMLMarshalling/host/ProcessInfo.h>

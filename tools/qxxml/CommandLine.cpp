@@ -3,6 +3,9 @@
 #include "qxxml/Commands.h"
 #include "qxxml/Failure.h"
 #include "qxxml/Output.h"
+#include "qxxml/pages/Usage.h"
+
+#include <QXXMLMarshalling/base/Version.h>
 
 #include <CLI/CLI.hpp>
 
@@ -137,7 +140,8 @@ void addInferring(CLI::App& command, Options& options) {
 // `status`.
 void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     tool.require_subcommand(1);
-    tool.set_version_flag("--version", "qxxml " QX_VERSION, "Print the version and exit");
+    tool.set_version_flag("--version", "qxxml " + std::string(qx::libraryVersionText()),
+                          "Print the version and exit");
     const auto add = [&](const char* name, const char* purpose, Command command) {
         CLI::App* const added = tool.add_subcommand(name, purpose);
         added->callback([&chosen, command] { chosen = command; });
@@ -146,6 +150,11 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     CLI::App* command =
         add("describe", "Resolve a mapping with its includes and print its description", describe);
     addMapping(*command, options);
+    addSearch(*command, options);
+
+    command = add("graph", "Print a mapping as a graph for Graphviz", graph);
+    addMapping(*command, options);
+    command->add_flag("--svg", options.svg, "Print the picture itself, which dot draws");
     addSearch(*command, options);
 
     command = add("read", "Read a document into an object and print it as JSON", nullptr);
@@ -181,6 +190,17 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
         ->option_text(" ")
         ->required();
     addSearch(*command, options);
+
+    const auto usage = [&tool] { return Usage(tool); };
+    add("manual", "Print the manual page, which \"man -l -\" shows",
+        [usage](const Options&) { return manualPage(usage()); });
+
+    command = add("completion", "Print what lets a shell complete the command line",
+                  [usage](const Options& given) { return completionScript(usage(), given.name); });
+    command->add_option("SHELL", options.name, "The shell that it is for")
+        ->option_text("bash|zsh|fish")
+        ->required()
+        ->check(CLI::IsMember({"bash", "zsh", "fish"}));
 }
 
 // Help and version are asked for; anything else is wrong usage.

@@ -21,6 +21,7 @@ struct Options {
     bool noDoctype = false;
     bool pretty = false;
     bool classes = false;
+    bool svg = false;
     bool keepOrder = false;
     bool matchNamespaces = false;
     bool json = false;
