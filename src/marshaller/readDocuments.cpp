@@ -7,6 +7,7 @@
 
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
+#include "marshaller/NoUndo.h"
 #include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
@@ -85,20 +86,6 @@ qx::XMLParser::Parsed parsed(const QXXMLMarshaller& marshaller, Ref<qx::Data> da
                 : nullptr;
 }
 
-// What the reading of the new object does is no change of the one that is there.
-class NoUndo {
-public:
-    explicit NoUndo(Ref<qx::UndoManager> manager) : _manager(std::move(manager)) {
-        _manager->disableUndoRegistration();
-    }
-    ~NoUndo() { _manager->enableUndoRegistration(); }
-    NoUndo(const NoUndo&) = delete;
-    NoUndo& operator=(const NoUndo&) = delete;
-
-private:
-    const Ref<qx::UndoManager> _manager;
-};
-
 qx::Object& present(qx::Object* object) {
     if (object == nullptr)
         throw qx::Exception(qx::Exception::invalidArgument, "there is no object to read into");
@@ -126,7 +113,7 @@ bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& docum
     Ref<Error> problem;
     Ref<qx::Object> fresh;
     {
-        const NoUndo noUndo(marshaller.undoManager());
+        const qx::detail::NoUndo noUndo(marshaller.undoManager());
         fresh = objectOf(marshaller, document, typeOf(object), &problem);
     }
     bool isRead = fresh.get() != nullptr;

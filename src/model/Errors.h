@@ -99,6 +99,10 @@ inline constexpr ErrorText namespaceOfTwoPrefixes{
     -225, "The namespace: %@ would have two prefixes: %@ and: %@", "Invalid Mapping"};
 inline constexpr ErrorText readingCancelled{-226, "The reading was cancelled",
                                             "The program asked for it."};
+inline constexpr ErrorText changeCannotBeSaved{
+    -230, "The document cannot be changed to say the new value of: %@", invalidValue};
+inline constexpr ErrorText encodingCannotBeKept{
+    -231, "The document cannot be changed in its encoding: %@", invalidXML};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 
