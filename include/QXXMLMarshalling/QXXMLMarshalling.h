@@ -16,12 +16,14 @@
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
+#include <QXXMLMarshalling/QXXMLDocumentFile.h>
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
 #include <QXXMLMarshalling/QXXMLFileSystemDataRepository.h>
 #include <QXXMLMarshalling/QXXMLMapping.h>
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
+#include <QXXMLMarshalling/QXXMLUpdate.h>
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/base/Export.h>

@@ -27,9 +27,11 @@ class DocumentUpdate;
 
 class QX_API QXXMLUpdate {
 public:
-    // A place in the original that says something else now: its line and column, both from 1, what
-    // stood there and what stands there now, as text in UTF-8. The key path begins at the root.
+    // A place in the original that says something else now: its offset in bytes of the text as
+    // UTF-8, without a byte-order mark, its line and column, both from 1; what stood there and what
+    // stands there now. The key path begins at the root.
     struct Edit {
+        std::size_t offset = 0;
         std::size_t line = 0;
         std::size_t column = 0;
         qx::String keyPath;

@@ -54,8 +54,6 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
 }
 
 bool DocumentUpdate::prepare(Ref<Error>* error) {
-    const DocumentEncoding encoding = encodingOf(_original);
-    _markSize = encoding.markSize;
     _source = TracedReading::of(*_marshaller, _original, error);
     if (!_source || !_after.write(*_marshaller, _object, error))
         return false;
@@ -63,8 +61,7 @@ bool DocumentUpdate::prepare(Ref<Error>* error) {
     const ClassPlan& is = *_after.trace()[0].plan;
     if (&was != &is)
         return fail(error, errors::rootOfOtherClass, was.className.string(), is.className.string());
-    if (!encoding.name.isNull())
-        _encoder = std::make_unique<TextEncoder>(encoding.name);
+    _encoding = std::make_unique<SourceEncoding>(_original);
     prepareWriter();
     return true;
 }
@@ -72,7 +69,7 @@ bool DocumentUpdate::prepare(Ref<Error>* error) {
 void DocumentUpdate::prepareWriter() {
     _markup = std::make_unique<SourceMarkup>(_source->index());
     _layout = std::make_unique<SourceLayout>(_source->index(), *_markup);
-    _writer = std::make_unique<NewXML>(*_layout, _after.trace(), _encoder.get());
+    _writer = std::make_unique<NewXML>(*_layout, _after.trace(), _encoding->encoder());
     _source->forEachDouble(
         [&](const ClassPlan* plan, const std::string& text) { _writer->countAsTaken(plan, text); });
 }
@@ -97,7 +94,8 @@ bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit
     }
     const std::string_view text = _markup->text();
     const auto size = static_cast<EditList::Offset>(text.size());
-    if (!encode(edits.applied(text, 0, size), update, error))
+    update._bytes = _encoding->encoded(edits.applied(text, 0, size), text, error);
+    if (!update._bytes)
         return false;
     culprit = edits.edits().front().shown;
     Ref<Error> problem; // of what was written: the edits are to blame
@@ -105,26 +103,6 @@ bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit
     if (!again || !check(*again, update, culprit))
         return false;
     listEdits(plan, edits, update);
-    return true;
-}
-
-// Where the original's bytes are what its text gives in its encoding, so are those of each part
-// that stays.
-bool DocumentUpdate::encode(std::string_view text, QXXMLUpdate& update, Ref<Error>* error) const {
-    std::string bytes(_original.substr(0, _markSize));
-    if (_encoder == nullptr) {
-        bytes += text;
-        update._bytes = make<Data>(std::move(bytes));
-        return true;
-    }
-    try {
-        if (bytes + _encoder->encoded(_markup->text()) != _original)
-            return fail(error, errors::encodingCannotBeKept, encodingOf(_original).name);
-        bytes += _encoder->encoded(text);
-    } catch (const Exception& exception) {
-        return fail(error, errors::encodingCannotBeKept, exception.reason());
-    }
-    update._bytes = make<Data>(std::move(bytes));
     return true;
 }
 
@@ -160,7 +138,7 @@ void DocumentUpdate::listEdits(const UpdatePlan& plan, const EditList& edits,
     TextPosition place(_markup->text());
     for (const SourceEdit& edit : edits.edits()) {
         place.moveTo(edit.begin);
-        update._edits.push_back({place.line(), place.column(), edit.keyPath,
+        update._edits.push_back({edit.begin, place.line(), place.column(), edit.keyPath,
                                  String(_markup->text().substr(edit.begin, edit.end - edit.begin)),
                                  String(edit.text)});
     }

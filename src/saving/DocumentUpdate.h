@@ -5,9 +5,9 @@
 
 #include <QXXMLMarshalling/QXXMLUpdate.h>
 
+#include "saving/SourceEncoding.h"
 #include "saving/TracedObject.h"
 #include "saving/UpdatePlan.h"
-#include "xml/Encoding.h"
 
 namespace qx::detail {
 
@@ -25,7 +25,6 @@ private:
     void prepareWriter();
     // Carries out the plan. False with an error, or with the object or field in the way.
     bool carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit, Ref<Error>* error);
-    bool encode(std::string_view text, QXXMLUpdate& update, Ref<Error>* error) const;
     // Whether the reading says what the object says.
     bool check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const;
     void listEdits(const UpdatePlan& plan, const EditList& edits, QXXMLUpdate& update) const;
@@ -35,8 +34,7 @@ private:
     const Value _object;
     std::unique_ptr<TracedReading> _source;
     TracedWriting _after;
-    std::size_t _markSize = 0;
-    std::unique_ptr<TextEncoder> _encoder; // null for UTF-8
+    std::unique_ptr<SourceEncoding> _encoding;
     std::unique_ptr<SourceMarkup> _markup;
     std::unique_ptr<SourceLayout> _layout;
     std::unique_ptr<NewXML> _writer;

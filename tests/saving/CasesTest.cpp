@@ -101,6 +101,10 @@ const bool added = [] {
         support::addCases("tests/marshaller/" + std::string(page) + ".md",
                           {"mapping", "prefixes", "document", "given"},
                           {"object", "written", "error"}, checkUnedited);
+    for (const char* page : {"mapping-format", "round-trip"})
+        support::addCases("docs/" + std::string(page) + ".md",
+                          {"mapping", "prefixes", "document", "given"},
+                          {"object", "written", "error"}, checkUnedited);
     return true;
 }();
 

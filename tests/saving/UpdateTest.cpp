@@ -5,7 +5,7 @@
 #include "support/Scenario.h"
 #include "support/TemporaryFolder.h"
 
-#include <QXXMLMarshalling/QXXMLUpdate.h>
+#include <QXXMLMarshalling/QXXMLDocumentFile.h>
 
 namespace {
 
@@ -118,4 +118,80 @@ TEST_F(Update, AFileIsReplacedOnlyWhereSomethingWasEdited) {
     EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, qx::Value(), path).error()->code(), -211);
     EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, Row{}, path).error()->code(), -211);
     EXPECT_EQ(folder.read("sheet.xml"), "<sheet><!-- mine --><title>b</title></sheet>");
+}
+
+TEST_F(Update, ADocumentFileSavesRevertsAndTellsWhetherItIsEdited) {
+    const TemporaryFolder folder;
+    const std::string path =
+        folder.write("sheet.xml", "<sheet>\n<!-- mine -->\n<title>a</title>\n</sheet>\n");
+    qx::Ref<qx::Error> error;
+    const auto file = QXXMLDocumentFile::open(path, marshaller, &error);
+    ASSERT_TRUE(file) << support::told(error);
+    EXPECT_EQ(file->root<Row>(), nullptr);
+    Sheet& sheet = *file->root<Sheet>();
+    EXPECT_FALSE(file->isEdited());
+    sheet.title = "b";
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_TRUE(file->save());
+    EXPECT_FALSE(file->isEdited());
+    sheet.title = "c";
+    EXPECT_TRUE(file->revert());
+    EXPECT_EQ(sheet.title, "b");
+    sheet.title = "d";
+    EXPECT_TRUE(file->saveAs(folder.path("other.xml")));
+    EXPECT_EQ(folder.read("other.xml"), "<sheet>\n<!-- mine -->\n<title>d</title>\n</sheet>\n");
+    EXPECT_EQ(folder.read("sheet.xml"), "<sheet>\n<!-- mine -->\n<title>b</title>\n</sheet>\n");
+    sheet.title = "\x01";
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_FALSE(file->save(&error));
+    EXPECT_EQ(error->code(), 517);
+    EXPECT_EQ(folder.read("other.xml"), "<sheet>\n<!-- mine -->\n<title>d</title>\n</sheet>\n");
+}
+
+TEST_F(Update, AFileThatChangedMeanwhileIsSeenAndMerged) {
+    using Changed = QXXMLDocumentFile::Changed;
+    const TemporaryFolder folder;
+    const std::string base = "<sheet>\n<title>a</title>\n<row id='1'>x</row>\n</sheet>\n";
+    const auto file = QXXMLDocumentFile::open(folder.write("s.xml", base), marshaller);
+    Sheet& sheet = *file->root<Sheet>();
+    sheet.rows[0].text = "y";
+    folder.write("s.xml", "<sheet>\n<!-- theirs -->\n<title>b</title>\n<row id='1'>x</row>\n"
+                          "</sheet>\n");
+    qx::Ref<qx::Error> error;
+    EXPECT_FALSE(file->save(&error));
+    EXPECT_EQ(error->code(), -232);
+    EXPECT_TRUE(file->save(&error, Changed::carryOver)) << support::told(error);
+    EXPECT_EQ(folder.read("s.xml"),
+              "<sheet>\n<!-- theirs -->\n<title>b</title>\n<row id='1'>y</row>\n</sheet>\n");
+    EXPECT_EQ(sheet.title, "b");
+    EXPECT_FALSE(file->isEdited());
+    sheet.title = "mine";
+    const std::string theirs = "<sheet>\n<title>theirs</title>\n</sheet>\n";
+    folder.write("s.xml", theirs);
+    EXPECT_FALSE(file->save(&error, Changed::carryOver));
+    EXPECT_EQ(support::told(error),
+              "-233: The file and the object have both changed: title (Invalid Value)");
+    EXPECT_EQ(folder.read("s.xml"), theirs);
+    EXPECT_TRUE(file->save(&error, Changed::overwrite));
+    EXPECT_EQ(folder.read("s.xml"),
+              "<sheet>\n<!-- theirs -->\n<title>mine</title>\n<row id='1'>y</row>\n</sheet>\n");
+}
+
+TEST_F(Update, AnUndoManagersMarkTellsWhetherADocumentFileIsEdited) {
+    const TemporaryFolder folder;
+    const auto records = scenario::marshaller("<Note xml='note'><text node='element'/></Note>");
+    const auto file = QXXMLDocumentFile::open(folder.write("n.xml", "<note/>"), records);
+    const auto note = file->root<QXGenericRecord>();
+    const auto manager = qx::make<qx::UndoManager>();
+    note->setUndoManager(manager);
+    file->setUndoManager(manager);
+    note->setValueForKey("a", "text");
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_TRUE(file->save());
+    EXPECT_FALSE(file->isEdited());
+    EXPECT_EQ(folder.read("n.xml"), "<note><text>a</text></note>");
+    manager->undo();
+    EXPECT_TRUE(file->isEdited());
+    manager->redo();
+    EXPECT_FALSE(file->isEdited());
 }

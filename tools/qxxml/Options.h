@@ -12,7 +12,8 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
-    std::vector<std::string> documents; // what `infer` goes by
+    std::vector<std::string> documents;   // what `infer` goes by
+    std::vector<std::string> assignments; // KEYPATH=VALUE each, for `set`
 
     bool strict = false;
     bool discardUnknown = false;
@@ -23,6 +24,8 @@ struct Options {
     bool classes = false;
     bool keepOrder = false;
     bool matchNamespaces = false;
+    bool inPlace = false;
+    bool diff = false;
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;
