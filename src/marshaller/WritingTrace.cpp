@@ -82,9 +82,15 @@ std::uint64_t WritingTrace::hashOf(Number number) const {
             hash = mixed(hash, _shown[inside].hash);
     });
     if (const KeptList* const kept = shown.kind == Kind::object ? keptOf(number) : nullptr)
-        for (const auto* all : {&kept->children, &kept->attributes})
-            for (const Kept& each : *all)
-                hash = mixed(hash, hashOfText(each.text));
+        hash = mixed(hash, kept->hash());
+    return hash;
+}
+
+std::uint64_t WritingTrace::KeptList::hash() const noexcept {
+    std::uint64_t hash = 0;
+    for (const auto* all : {&children, &attributes})
+        for (const Kept& each : *all)
+            hash = mixed(hash, hashOfText(each.text));
     return hash;
 }
 

@@ -56,6 +56,7 @@ public:
     };
     struct KeptList {
         std::vector<Kept> children, attributes, declarations;
+        std::uint64_t hash() const noexcept; // of children and attributes
     };
 
     explicit WritingTrace(bool keepsUnknown) noexcept : _keepsUnknown(keepsUnknown) {}

@@ -33,8 +33,10 @@ std::vector<bool> longestRise(const std::vector<std::size_t>& numbers) {
 
 class Matcher {
 public:
-    Matcher(const std::vector<ListItem>& before, const std::vector<ListItem>& now)
-        : _before(before), _now(now), _was(now.size(), none), _isMatched(before.size()) {}
+    Matcher(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
+            const Likeness& likeness)
+        : _before(before), _now(now), _was(now.size(), none), _likeness(likeness),
+          _isMatched(before.size()) {}
 
     ListMatching run() {
         Part all{0, _before.size(), 0, _now.size()};
@@ -42,7 +44,7 @@ public:
         matchUnique(all);
         matchByKey([](const ListItem& item) { return std::to_string(item.hash); }, true);
         matchByKey([](const ListItem& item) { return item.key; }, false);
-        matchByPlace();
+        matchGaps();
         return {_was, longestRise(_was)};
     }
 
@@ -127,44 +129,73 @@ private:
             found->second.pop_back();
         }
     }
-    // Of those that stand behind the same item that has its place.
-    void matchByPlace() {
+    // Of those that stand between the same two that have their place.
+    void matchGaps() {
         const std::vector<bool> stays = longestRise(_was);
-        std::size_t before = 0;
-        for (std::size_t i = 0; i < _now.size(); ++i) {
-            if (_was[i] != none) {
-                if (stays[i])
-                    before = _was[i] + 1;
+        std::size_t before = 0, now = 0;
+        for (std::size_t i = 0; i <= _now.size(); ++i) {
+            if (i < _now.size() && !stays[i])
                 continue;
-            }
-            while (before < _before.size() && _isMatched[before] && !isAnchor(before, stays))
-                ++before;
-            if (before < _before.size() && !_isMatched[before] &&
-                _before[before].kind == _now[i].kind)
-                pair(before++, i);
+            const std::size_t end = i < _now.size() ? _was[i] : _before.size();
+            matchGap(before, end, now, i);
+            before = end + 1;
+            now = i + 1;
         }
     }
-    bool isAnchor(std::size_t before, const std::vector<bool>& stays) {
-        if (_anchors.empty()) {
-            _anchors.resize(_before.size());
-            for (std::size_t i = 0; i < _now.size(); ++i)
-                if (stays[i])
-                    _anchors[_was[i]] = true;
+    void matchGap(std::size_t before, std::size_t beforeEnd, std::size_t now, std::size_t nowEnd) {
+        std::vector<std::size_t> old, fresh;
+        for (; now < nowEnd; ++now)
+            if (_was[now] == none)
+                fresh.push_back(now);
+        for (; before < beforeEnd && !fresh.empty(); ++before)
+            if (!_isMatched[before])
+                old.push_back(before);
+        constexpr std::size_t most = 4096;
+        if (_likeness && old.size() * fresh.size() <= most)
+            return matchAlike(old, fresh);
+        for (std::size_t i = 0; i < std::min(old.size(), fresh.size()); ++i)
+            if (_before[old[i]].kind == _now[fresh[i]].kind)
+                pair(old[i], fresh[i]);
+    }
+    // The pairs in order that have most in common in sum; any pair is better than none.
+    void matchAlike(const std::vector<std::size_t>& old, const std::vector<std::size_t>& fresh) {
+        const std::size_t width = fresh.size() + 1;
+        std::vector<std::size_t> best((old.size() + 1) * width);
+        const auto gain = [&](std::size_t i, std::size_t j) -> std::size_t {
+            const bool isSameKind = _before[old[i]].kind == _now[fresh[j]].kind;
+            return isSameKind ? 1 + 2 * _likeness(old[i], fresh[j]) : 0;
+        };
+        std::vector<std::size_t> gains(old.size() * fresh.size());
+        for (std::size_t i = old.size(); i-- > 0;)
+            for (std::size_t j = fresh.size(); j-- > 0;) {
+                const std::size_t with = gains[i * fresh.size() + j] = gain(i, j);
+                best[i * width + j] =
+                    std::max({best[(i + 1) * width + j], best[i * width + j + 1],
+                              with != 0 ? with + best[(i + 1) * width + j + 1] : 0});
+            }
+        for (std::size_t i = 0, j = 0; i < old.size() && j < fresh.size();) {
+            const std::size_t with = gains[i * fresh.size() + j];
+            if (with != 0 && best[i * width + j] == with + best[(i + 1) * width + j + 1])
+                pair(old[i++], fresh[j++]);
+            else if (best[i * width + j] == best[(i + 1) * width + j])
+                ++i;
+            else
+                ++j;
         }
-        return _anchors[before];
     }
 
     const std::vector<ListItem>& _before;
     const std::vector<ListItem>& _now;
     std::vector<std::size_t> _was;
+    const Likeness& _likeness;
     std::vector<bool> _isMatched;
-    std::vector<bool> _anchors;
 };
 
 } // namespace
 
-ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now) {
-    return Matcher(before, now).run();
+ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
+                   const Likeness& likeness) {
+    return Matcher(before, now, likeness).run();
 }
 
 } // namespace qx::detail

@@ -6,9 +6,12 @@
 // 1. Equal ends.
 // 2. Between them items that are alone of their kind in both lists, as many as keep their order.
 // 3. Between those, again equal ends, then equal items one after another.
-// 4. What is left, anywhere, if it is equal: it has moved. Then by key, then by place.
+// 4. What is left, anywhere, if it is equal: it has moved. Then by key.
+// 5. Of what then is left between two that have kept their place, those that are alike, in their
+//    order; where that is much, by place alone.
 
 #include <cstdint>
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -28,6 +31,10 @@ struct ListMatching {
     std::vector<bool> stays;
 };
 
-ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now);
+// How much an item before has in common with one now, both by their number.
+using Likeness = std::function<std::size_t(std::size_t before, std::size_t now)>;
+
+ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
+                   const Likeness& likeness = nullptr);
 
 } // namespace qx::detail

@@ -123,6 +123,27 @@ void UpdatePlan::findKeys(std::vector<ListItem>& before, std::vector<ListItem>& 
             item.key.clear();
 }
 
+// How many fields of two objects of a class say the same, and keep the same.
+std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
+    const auto& before = _source.before;
+    const auto& after = _source.after;
+    if (isText(is) || before[was].kind == WritingTrace::Kind::text)
+        return 0;
+    std::size_t alike = 0;
+    Shown other = was + 1;
+    for (Shown field = is + 1; field < after[is].next; field = after[field].next) {
+        const bool isEmpty = after[field].next == field + 1;
+        alike += !isEmpty && after[field].hash == before[other].hash ? 1 : 0;
+        other = before[other].next;
+    }
+    const auto* const kept = after.keptOf(is);
+    const auto* const wasKept = before.keptOf(was);
+    const bool keepsTheSame = kept != nullptr && wasKept != nullptr &&
+                              kept->children.size() + kept->attributes.size() != 0 &&
+                              kept->hash() == wasKept->hash();
+    return alike + (keepsTheSame ? 2 : 0);
+}
+
 void UpdatePlan::arrangeList(const Context& context, const List& list, std::size_t ordinal) {
     std::vector<ListItem> before, now;
     for (const Shown value : list.was)
@@ -130,7 +151,9 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
     for (const Shown value : list.is)
         now.push_back(itemOf(_source.after, value));
     findKeys(before, now, list);
-    const ListMatching matching = match(before, now);
+    const ListMatching matching = match(before, now, [&](std::size_t was, std::size_t is) {
+        return likeness(list.was[was], list.is[is]);
+    });
     std::vector<bool> isThere(list.was.size());
     std::size_t previous = ListMatching::none; // that has kept its place
     std::size_t first = 0;

@@ -102,6 +102,7 @@ private:
     bool findEntries(const Context& context, List& list) const;
     void findKeys(std::vector<ListItem>& before, std::vector<ListItem>& now,
                   const List& list) const;
+    std::size_t likeness(Shown was, Shown is) const;
     void arrangeList(const Context& context, const List& list, std::size_t ordinal);
     void fillList(const Context& context, const List& list, std::size_t ordinal);
     bool removeWrapper(const List& list);
