@@ -67,7 +67,9 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     if (!_marshaller->saveUnknownXML())
         return fail(error, errors::unknownFields, unknown.written(), target.source.elementName());
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
-    // host's log at all is asked of the warnings.
+    // host's log at all is asked of the warnings. Who has a reading traced has heard of it.
+    if (_trace != nullptr)
+        return keepChildren(target, *unknown.names(), *unknown.written(), error);
     if (hostHasLogWarning())
         logDebug("*** Warning: Unbound fields: %@", unknown.written());
     else
@@ -126,7 +128,8 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     if (!_marshaller->saveUnknownXML())
         return fail(error, errors::unknownAttributes, unknown.written(),
                     target.source.elementName());
-    logWarningOrLine("Unbound attributes: %@", unknown.written());
+    if (_trace == nullptr)
+        logWarningOrLine("Unbound attributes: %@", unknown.written());
     return keepAttributes(target, *unknown.names(), error);
 }
 

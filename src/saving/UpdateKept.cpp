@@ -110,7 +110,7 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
                 _source.writer.attributeValue(kept->node->stringValue().view(), quote),
                 context.after);
         else
-            add(spot.begin - 1, spot.end, {}, context.after);
+            add(blanksBefore(spot.begin), spot.end, {}, context.after);
     }
     const SourceMarkup::Spot& tag = _source.markup[context.entry];
     if (!tag.isPlaced())

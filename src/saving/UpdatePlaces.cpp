@@ -62,12 +62,6 @@ void UpdatePlan::insertAttribute(const Context& context, Entry element, Shown va
             behind = attribute;
     }
     const std::string_view text = _source.markup.text();
-    const auto blanksBefore = [&](SourceMarkup::Offset place) {
-        SourceMarkup::Offset begin = place;
-        while (begin > 0 && std::string_view(" \t\r\n").find(text[begin - 1]) != text.npos)
-            --begin;
-        return begin;
-    };
     Entry last = none;
     for (Entry entry = _source.index.content(element); entry < _source.index.firstChild(element);
          ++entry)
@@ -110,6 +104,13 @@ void UpdatePlan::insertChild(const std::string& printed, const Place& place, Sho
     Opening& opening = _openings.try_emplace(place.opened, Opening{{}, {}, shown}).first->second;
     opening.content += text;
     opening.line = place.line;
+}
+
+// Beside text nothing is laid out.
+void UpdatePlan::openWithText(Entry element, const std::string& text, Shown shown) {
+    Opening& opening = _openings.try_emplace(element, Opening{{}, {}, shown}).first->second;
+    opening.content.insert(0, text);
+    opening.line.reset();
 }
 
 void UpdatePlan::replaceElement(Entry element, Shown object, const String* name) {
@@ -321,7 +322,6 @@ void UpdatePlan::joinRemovals() {
 void UpdatePlan::finishOpenings() {
     for (auto& [element, opening] : _openings) {
         const SourceMarkup::Spot& spot = _source.markup[element];
-        const std::string_view text = _source.markup.text();
         const std::string name = _source.document.writtenName(element).str();
         std::string closing;
         if (opening.line) {
@@ -334,10 +334,8 @@ void UpdatePlan::finishOpenings() {
             add(spot.insideBegin, spot.insideEnd, opening.content + closing, opening.shown);
             continue;
         }
-        SourceMarkup::Offset begin = spot.end - 2;
-        while (std::string_view(" \t\r\n").find(text[begin - 1]) != text.npos)
-            --begin;
-        add(begin, spot.end, ">" + opening.content + closing + "</" + name + ">", opening.shown);
+        add(blanksBefore(spot.end - 2), spot.end,
+            ">" + opening.content + closing + "</" + name + ">", opening.shown);
     }
 }
 

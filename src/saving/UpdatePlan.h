@@ -113,6 +113,7 @@ private:
 
     // UpdateTexts.cpp
     void setAttribute(Entry attribute, Shown value);
+    SourceMarkup::Offset blanksBefore(SourceMarkup::Offset place) const;
     void removeAttribute(Entry attribute, Entry element, Shown field);
     void setText(Entry element, bool isOwn, std::string_view was, std::string_view now,
                  Shown value);
@@ -123,6 +124,7 @@ private:
     void insertValue(const Context& context, Shown value, Shown field, std::size_t ordinal);
     void insertAttribute(const Context& context, Entry element, Shown value, std::size_t ordinal);
     void insertChild(const std::string& printed, const Place& place, Shown shown);
+    void openWithText(Entry element, const std::string& text, Shown shown);
     void replaceElement(Entry element, Shown object, const String* name);
     void removeElement(Entry element, Shown shown);
     // The part of the text that goes with an element, its comments too where they are to.

@@ -68,10 +68,14 @@ void UpdatePlan::removeAttribute(Entry attribute, Entry element, Shown field) {
         !_source.after[field].field->location().isEmpty();
     if (isWrapper && _source.index.contentEnd(element) == element + 2)
         return removeElement(element, field);
-    SourceMarkup::Offset begin = spot.begin;
-    while (blanks.find(_source.markup.text()[begin - 1]) != blanks.npos)
-        --begin;
-    add(begin, spot.end, {}, field);
+    add(blanksBefore(spot.begin), spot.end, {}, field);
+}
+
+// Where the white space before a place begins.
+SourceMarkup::Offset UpdatePlan::blanksBefore(SourceMarkup::Offset place) const {
+    while (place > 0 && blanks.find(_source.markup.text()[place - 1]) != blanks.npos)
+        --place;
+    return place;
 }
 
 void UpdatePlan::setText(Entry element, bool isOwn, std::string_view was, std::string_view now,
@@ -121,7 +125,7 @@ bool UpdatePlan::setPieces(Entry element, std::string_view was, std::string_view
         if (!spot.isEmptyTag())
             add(spot.insideEnd, spot.insideEnd, _source.writer.text(now), value);
         else
-            _openings[element] = {_source.writer.text(now), std::nullopt, value};
+            openWithText(element, _source.writer.text(now), value);
         return true;
     }
     const std::size_t start = commonStart(was, now);

@@ -163,6 +163,17 @@ void define(CLI::App& tool, Options& options, Command& chosen) {
     addSaving(*command, options);
     addSearch(*command, options);
 
+    command =
+        add("update",
+            "Save an object into a document, as JSON like that of read, and change nothing else",
+            update);
+    addReading(*command, options);
+    command->add_option("OBJECT", options.object, "The path of the JSON; - is standard input")
+        ->option_text(" ")
+        ->required();
+    addSaving(*command, options);
+    addSearch(*command, options);
+
     command = add("infer", "Print a mapping that fits documents which have none", infer);
     addInferring(*command, options);
 

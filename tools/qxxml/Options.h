@@ -13,6 +13,7 @@ struct Options {
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
     std::vector<std::string> documents;   // what `infer` goes by
+    std::string object;                   // path of the JSON for `update`; "-" likewise
     std::vector<std::string> assignments; // KEYPATH=VALUE each, for `set`
 
     bool strict = false;
