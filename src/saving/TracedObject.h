@@ -74,7 +74,8 @@ void TracedReading::forEachDouble(Take take) {
                            .str());
         else
             take(plan,
-                 _document->writtenName(use.entry).str() + "=" + _document->value(use.entry).str());
+                 (_document->writtenName(use.entry) + "=" + _document->value(use.entry).view())
+                     .str());
     }
 }
 

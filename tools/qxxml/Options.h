@@ -12,7 +12,7 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
-    std::vector<std::string> documents; // what `infer` and `check` go by
+    std::vector<std::string> documents;   // what `infer` and `check` go by
     std::string object;                   // path of the JSON for `update`; "-" likewise
     std::vector<std::string> assignments; // KEYPATH=VALUE each, for `set`
 
