@@ -45,10 +45,10 @@ const bool documents = support::addCases(
             EXPECT_EQ(told(check.findings(), true), expected.text);
             return;
         }
-        for (const std::string& path : expected.options) {
-            if (path.starts_with('/'))
+        for (const std::string& path : expected.options)
+            if (path.starts_with('/')) {
                 EXPECT_EQ(check.why(path).str() + "\n", expected.text);
-        }
+            }
     });
 
 } // namespace
