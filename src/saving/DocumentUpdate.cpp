@@ -55,7 +55,7 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
 
 bool DocumentUpdate::prepare(Ref<Error>* error) {
     _source = TracedReading::of(*_marshaller, _original, error);
-    if (!_source || !_after.write(*_marshaller, _object, error))
+    if (!_source || !_after.write(*_marshaller, _object, _source->written().size(), error))
         return false;
     const ClassPlan& was = *_source->written()[0].plan;
     const ClassPlan& is = *_after.trace()[0].plan;

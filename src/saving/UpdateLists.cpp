@@ -71,7 +71,8 @@ namespace {
 
 ListItem itemOf(const WritingTrace& trace, WritingTrace::Number value) {
     const WritingTrace::Shown& shown = trace[value];
-    return {shown.hash, reinterpret_cast<std::uintptr_t>(shown.plan)};
+    const bool isObject = shown.kind == WritingTrace::Kind::object;
+    return {shown.hash, isObject ? reinterpret_cast<std::uintptr_t>(shown.plan) : 0};
 }
 
 // The text of the item's field, where it has one.
