@@ -142,8 +142,13 @@ void DocumentUpdate::listEdits(const UpdatePlan& plan, const EditList& edits,
                                  String(_markup->text().substr(edit.begin, edit.end - edit.begin)),
                                  String(edit.text)});
     }
-    for (const Shown shown : _anew)
+    Shown end = 0; // of the one before: what stands inside went with it
+    for (const Shown shown : _anew) {
+        if (shown < end)
+            continue;
         update._writtenAnew.push_back(_after.trace().keyPath(shown));
+        end = _after.trace()[shown].next;
+    }
     for (const Shown shown : plan.rewritten())
         update._writtenAnew.push_back(_after.trace().keyPath(shown));
 }
