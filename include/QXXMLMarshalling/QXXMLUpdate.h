@@ -11,9 +11,9 @@
 //
 // The document is read once more and what was read is written; so is the object. Where the two
 // differ the object was edited, and that is carried to the text. Objects of the mapping's classes
-// are made for that, which register no undo; a progress handler hears of those readings, too. The result is read again before it is handed out: it
-// says what the object says, or there is an error. Whatever the rules of reading and writing drop
-// or put elsewhere touches nothing.
+// are made for that, which register no undo; a progress handler hears of those readings, too. The
+// result is read again before it is handed out: it says what the object says, or there is an error.
+// Whatever the rules of reading and writing drop or put elsewhere touches nothing.
 //
 // One thread at a time, as for the marshaller. The object is read only.
 

@@ -88,14 +88,15 @@ bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& eleme
         held = {false, held.keepsZero()};
     }
     const Value& value = held.value();
-    if (_trace != nullptr)
-        _trace->hold(value);
     if (const auto array = value.as<Array>())
         return writeCollection(*this, field, element, *array, error);
     if (value.isNull() || (value.isObject() && value.classNameForMarshalling().isNull()))
         return fail(error, errors::noClassName, object.isa().name());
     _omitsZero = _marshaller->omitsZeroAttributes() && !held.keepsZero();
-    return bindingOf(field).write(*this, field, element, value, error);
+    const bool isWritten = bindingOf(field).write(*this, field, element, value, error);
+    if (_trace != nullptr)
+        _trace->hold(value);
+    return isWritten;
 }
 
 } // namespace qx::detail

@@ -178,7 +178,7 @@ bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& el
             _trace->enterField(field);
         const bool isWritten = writeField(field, element, object, &problem);
         if (_trace != nullptr)
-            _trace->leaveField();
+            _trace->leave();
         if (isWritten)
             continue;
         if (error != nullptr)

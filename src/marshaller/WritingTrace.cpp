@@ -61,7 +61,7 @@ String WritingTrace::keyPath(Number number) const {
         const Number field = shown.kind == Kind::field ? none : shown.around;
         if (field == none || !_shown[field].isList)
             continue;
-        path = "[" + std::to_string(shown.item) + "]" + (path.empty() ? "" : ".") + path;
+        path = "[" + std::to_string(shown.count) + "]" + (path.empty() ? "" : ".") + path;
     }
     return String(path);
 }
@@ -74,9 +74,10 @@ void WritingTrace::hash() {
 std::uint64_t WritingTrace::hashOf(Number number) const {
     const Shown& shown = _shown[number];
     std::uint64_t hash = static_cast<std::uint64_t>(shown.kind) + (shown.isList ? 16 : 0);
-    hash = mixed(hash, reinterpret_cast<std::uintptr_t>(shown.plan));
     if (shown.kind == Kind::text)
         return mixed(hash, hashOfText(text(number)));
+    if (shown.kind == Kind::object)
+        hash = mixed(hash, reinterpret_cast<std::uintptr_t>(shown.plan));
     forEachInside(number, [&](Number inside) {
         if (!_shown[inside].isHidden)
             hash = mixed(hash, _shown[inside].hash);
@@ -97,15 +98,15 @@ std::uint64_t WritingTrace::KeptList::hash() const noexcept {
 WritingTrace::Number WritingTrace::add(Shown shown) {
     shown.around = _open.empty() ? none : _open.back();
     shown.next = size() + 1;
-    if (shown.around != none)
-        shown.item = _shown[shown.around].items++;
+    if (shown.around != none && _shown[shown.around].kind == Kind::field)
+        shown.count = _shown[shown.around].count++;
     _shown.push_back(shown);
     return shown.next - 1;
 }
 
 void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element,
                                const Object& object, ObjectAccess& access) {
-    Shown shown{Kind::object};
+    Shown shown(Kind::object);
     shown.plan = &plan;
     shown.element = element;
     shown.object = object.isa().isStruct() ? nullptr : &object;
@@ -133,34 +134,18 @@ void WritingTrace::leave() {
 }
 
 void WritingTrace::enterField(const FieldPlan& field) {
-    Shown shown{Kind::field};
+    Shown shown(Kind::field);
     shown.field = &field;
     _open.push_back(add(shown));
 }
 
 void WritingTrace::hold(const Value& value) {
-    if (value.isNull() || value.isObject())
-        return;
-    addText(value.description(), true);
-}
-
-// The value that was held counts only where nothing shows it.
-void WritingTrace::leaveField() {
-    const Number field = _open.back();
-    const Number held = field + 1;
-    const bool isHeld = held < size() && _shown[held].kind == Kind::text && _shown[held].isHidden;
-    if (isHeld && held + 1 == size() - 1 && _shown[held + 1].kind == Kind::text) {
-        _shown[held] = _shown[held + 1];
-        _shown[held].next = held + 1;
-        _shown[held].item = 0;
-        _shown[field].items = 1;
-        _shown.pop_back();
-    }
-    leave();
+    if (_open.back() == size() - 1 && !value.isNull() && !value.isObject())
+        addText(value.description(), true);
 }
 
 void WritingTrace::addText(std::string_view text, bool isHidden) {
-    Shown shown{Kind::text};
+    Shown shown(Kind::text);
     shown.isHidden = isHidden;
     shown.begin = _texts.size();
     shown.size = text.size();
@@ -199,8 +184,8 @@ void WritingTrace::replaceContent(const XMLDraft::Element* element) {
 
 void WritingTrace::forget(Number count) {
     if (count < size())
-        --_shown[_open.back()].items;
-    _shown.resize(count);
+        --_shown[_open.back()].count;
+    _shown.erase(_shown.begin() + count, _shown.end());
     std::erase_if(_kept, [&](const auto& entry) { return entry.first >= count; });
 }
 

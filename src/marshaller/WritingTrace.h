@@ -34,20 +34,28 @@ public:
     static constexpr Number none = UINT32_MAX;
 
     enum class Kind : std::uint8_t { object, field, text };
+    // Kept small: a writing shows as many as it goes over values.
     struct Shown {
+        explicit Shown(Kind which) noexcept : kind(which) {}
+
         Kind kind;
-        bool isList = false;                  // of a field: it holds an array
-        bool isHidden = false;                // of a value
-        Number next = 0;                      // the entry after everything inside
-        Number around = none;                 // the entry that this one stands in
-        const ClassPlan* plan = nullptr;      // of an object
-        const FieldPlan* field = nullptr;     // of a field
-        XMLDraft::Element* element = nullptr; // that holds an object's fields
-        const Object* object = nullptr;       // null of a plain struct, which may have moved on
-        std::size_t begin = 0, size = 0;      // of a text
-        std::size_t item = 0;                 // of a value: its number in the field
-        std::size_t items = 0;                // of a field: how many values it has
-        std::uint64_t hash = 0;               // of all that is shown inside, kept XML included
+        bool isList = false;   // of a field: it holds an array
+        bool isHidden = false; // of a value
+        Number next = 0;       // the entry after everything inside
+        Number around = none;  // the entry that this one stands in
+        // Of a value its number in the field; of a field, how many values it has.
+        std::uint32_t count = 0;
+        union {
+            const ClassPlan* plan = nullptr; // of an object
+            const FieldPlan* field;          // of a field
+            std::size_t begin;               // of a text
+        };
+        union {
+            XMLDraft::Element* element = nullptr; // that holds an object's fields
+            std::size_t size;                     // of a text
+        };
+        const Object* object = nullptr; // null of a plain struct, which may have moved on
+        std::uint64_t hash = 0;         // of all that is shown inside, kept XML included
     };
     // A node of the unknown XML of an object, and its text.
     struct Kept {
@@ -60,6 +68,8 @@ public:
     };
 
     explicit WritingTrace(bool keepsUnknown) noexcept : _keepsUnknown(keepsUnknown) {}
+    // About how many entries there will be.
+    void reserve(std::size_t entries) { _shown.reserve(entries); }
 
     const Shown& operator[](Number number) const noexcept { return _shown[number]; }
     Number size() const noexcept { return static_cast<Number>(_shown.size()); }
@@ -86,9 +96,8 @@ public:
                      ObjectAccess& access);
     void leave();
     void enterField(const FieldPlan& field);
-    // The value of the field that is open: hidden, if nothing else comes of it.
+    // The value of the field that is open, which was written: hidden, if nothing came of it.
     void hold(const Value& value);
-    void leaveField();
     void markList() { _shown[_open.back()].isList = true; }
     void addText(std::string_view text, bool isHidden);
     // Takes the place of all children in the element.

@@ -55,7 +55,7 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
 
 bool DocumentUpdate::prepare(Ref<Error>* error) {
     _source = TracedReading::of(*_marshaller, _original, error);
-    if (!_source || !_after.write(*_marshaller, _object, error))
+    if (!_source || !_after.write(*_marshaller, _object, _source->written().size(), error))
         return false;
     const ClassPlan& was = *_source->written()[0].plan;
     const ClassPlan& is = *_after.trace()[0].plan;
@@ -142,8 +142,13 @@ void DocumentUpdate::listEdits(const UpdatePlan& plan, const EditList& edits,
                                  String(_markup->text().substr(edit.begin, edit.end - edit.begin)),
                                  String(edit.text)});
     }
-    for (const Shown shown : _anew)
+    Shown end = 0; // of the one before: what stands inside went with it
+    for (const Shown shown : _anew) {
+        if (shown < end)
+            continue;
         update._writtenAnew.push_back(_after.trace().keyPath(shown));
+        end = _after.trace()[shown].next;
+    }
     for (const Shown shown : plan.rewritten())
         update._writtenAnew.push_back(_after.trace().keyPath(shown));
 }

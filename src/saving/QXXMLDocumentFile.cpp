@@ -126,8 +126,10 @@ bool QXXMLDocumentFile::carryOver(const QXXMLUpdate& update, const Ref<Data>& th
             *error = std::move(problem);
         return false;
     }
-    return qx::writeFileAtomically(_path, bytes->view(), error) &&
-           (_marshaller->readStringInto(_root, *bytes, error) && (setBase(bytes), true));
+    if (!write(_path, bytes, error) || !_marshaller->readStringInto(_root, *bytes, error))
+        return false;
+    setBase(bytes);
+    return true;
 }
 
 const qx::Class& QXXMLDocumentFile::describedClass() const {

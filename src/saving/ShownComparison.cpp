@@ -15,10 +15,12 @@ ShownComparison::Shown ShownComparison::firstDifference() {
 ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
     const auto& is = _wanted[wanted];
     const auto& other = _found[found];
-    if (is.kind != other.kind || is.plan != other.plan || is.field != other.field)
+    if (is.kind != other.kind)
         return wanted;
     if (is.kind == Kind::text)
         return _wanted.text(wanted) == _found.text(found) ? none : wanted;
+    if (is.kind == Kind::object ? is.plan != other.plan : is.field != other.field)
+        return wanted;
     if (is.kind == Kind::object && !keepTheSame(wanted, found))
         return wanted;
     Shown a = wanted + 1, b = found + 1;

@@ -115,6 +115,7 @@ std::size_t SourceMarkup::startTag(std::size_t at) {
 }
 
 void SourceMarkup::tokenise() {
+    _tokens.reserve(_spots.size());
     std::size_t at = startTag(skipProlog());
     while (!_open.empty() && at < text().size()) {
         const std::string_view rest = text().substr(at);

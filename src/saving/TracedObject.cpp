@@ -9,9 +9,11 @@
 namespace qx::detail {
 
 bool TracedWriting::write(const QXXMLMarshaller& marshaller, const Value& object,
-                          Ref<Error>* error) {
+                          std::size_t expectedEntries, Ref<Error>* error) {
     _object = object;
-    if (!Marshalling(marshaller, _draft, _trace).marshallObject(object, error))
+    _trace.reserve(expectedEntries);
+    _draft = std::make_unique<XMLDraft>();
+    if (!Marshalling(marshaller, *_draft, _trace).marshallObject(object, error))
         return false;
     _trace.hash();
     return true;
@@ -34,8 +36,12 @@ std::unique_ptr<TracedReading> TracedReading::of(QXXMLMarshaller& marshaller, XM
     if (!object && !problem)
         fail(&problem, errors::noDefinitionForElement,
              [&] { return document.quoted(document.root()); });
-    if (!problem && traced->_written.write(marshaller, object, &problem))
+    // Mostly a field and a value for each use.
+    const std::size_t entries = 2 * traced->_read.uses().size() + 1;
+    if (!problem && traced->_written.write(marshaller, object, entries, &problem)) {
+        traced->_written.keepTraceOnly();
         return traced;
+    }
     *error = std::move(problem);
     return nullptr;
 }

@@ -22,13 +22,19 @@ public:
     TracedWriting& operator=(const TracedWriting&) = delete;
 
     // False with an error of marshalling.
-    bool write(const QXXMLMarshaller& marshaller, const Value& object, Ref<Error>* error);
+    bool write(const QXXMLMarshaller& marshaller, const Value& object, std::size_t expectedEntries,
+               Ref<Error>* error);
     const WritingTrace& trace() const noexcept { return _trace; }
+    // Lets go of all but what the trace itself says: nothing is printed from the draft.
+    void keepTraceOnly() {
+        _draft.reset();
+        _object = {};
+    }
 
 private:
     const Ref<const QXXMLMarshallingMapping> _mapping; // has the names in the draft
     Value _object;
-    XMLDraft _draft;
+    std::unique_ptr<XMLDraft> _draft;
     WritingTrace _trace;
 };
 

@@ -71,7 +71,8 @@ namespace {
 
 ListItem itemOf(const WritingTrace& trace, WritingTrace::Number value) {
     const WritingTrace::Shown& shown = trace[value];
-    return {shown.hash, reinterpret_cast<std::uintptr_t>(shown.plan)};
+    const bool isObject = shown.kind == WritingTrace::Kind::object;
+    return {shown.hash, isObject ? reinterpret_cast<std::uintptr_t>(shown.plan) : 0};
 }
 
 // The text of the item's field, where it has one.
@@ -154,7 +155,6 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
     const ListMatching matching = match(before, now, [&](std::size_t was, std::size_t is) {
         return likeness(list.was[was], list.is[is]);
     });
-    std::vector<bool> isThere(list.was.size());
     std::size_t previous = ListMatching::none; // that has kept its place
     std::size_t first = 0;
     for (std::size_t i = 0; i < list.is.size() && first == 0; ++i)
@@ -164,7 +164,6 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
         const std::size_t was = matching.was[i];
         if (was != ListMatching::none && matching.stays[i]) {
             previous = was;
-            isThere[was] = true;
             compareValue(context, list.uses[was], list.was[was], list.is[i], ordinal);
             continue;
         }
@@ -179,17 +178,23 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
                                      : printed(list, list.is[i], parentOf(beside), place.line);
         insertChild(text, place, list.is[i]);
     }
-    std::vector<bool> hasMoved(list.was.size());
+    removeItems(list, matching);
+}
+
+// Those that are gone, and the places of those that have moved.
+void UpdatePlan::removeItems(const List& list, const ListMatching& matching) {
+    enum class Fate : std::uint8_t { gone, moved, stays };
+    std::vector<Fate> fates(list.was.size());
     for (std::size_t i = 0; i < list.is.size(); ++i)
-        if (matching.was[i] != ListMatching::none && !matching.stays[i])
-            hasMoved[matching.was[i]] = true;
+        if (matching.was[i] != ListMatching::none)
+            fates[matching.was[i]] = matching.stays[i] ? Fate::stays : Fate::moved;
     for (std::size_t i = 0; i < list.was.size(); ++i) {
         const Entry entry = use(list.uses[i]).entry;
-        if (isThere[i])
+        if (fates[i] == Fate::stays)
             continue;
         if (!_source.markup[entry].isPlaced() || parentOf(entry) == none)
             return fail(list.field);
-        const auto [begin, end] = regionOf(entry, hasMoved[i]);
+        const auto [begin, end] = regionOf(entry, fates[i] == Fate::moved);
         _edits->add({begin, end, {}, list.field, _source.before.keyPath(list.was[i])});
     }
 }

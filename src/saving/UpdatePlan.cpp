@@ -111,9 +111,10 @@ void UpdatePlan::compareValue(const Context& context, std::uint32_t number, Show
     const bool wasText = was == none || before[was].kind == WritingTrace::Kind::text;
     if (wasText && isText(is)) {
         const std::string_view text = was != none ? before.text(was) : std::string_view();
+        const bool isOwn = taken.form == Form::text || taken.form == Form::flattened;
         if (taken.form == Form::attribute)
             return setAttribute(taken.entry, is);
-        return setText(taken.entry, taken.form == Form::text, text, _source.after.text(is), is);
+        return setText(taken.entry, isOwn, text, _source.after.text(is), is);
     }
     const bool isSameClass =
         !wasText && !isText(is) && taken.made != none && before[was].plan == _source.after[is].plan;

@@ -106,6 +106,7 @@ private:
     void arrangeList(const Context& context, const List& list, std::size_t ordinal);
     void fillList(const Context& context, const List& list, std::size_t ordinal);
     bool removeWrapper(const List& list);
+    void removeItems(const List& list, const ListMatching& matching);
     std::string moved(const Context& context, const List& list, std::size_t was, Shown is,
                       std::size_t ordinal);
     std::string printed(const List& list, Shown item, Entry inside,
@@ -117,6 +118,11 @@ private:
     void removeAttribute(Entry attribute, Entry element, Shown field);
     void setText(Entry element, bool isOwn, std::string_view was, std::string_view now,
                  Shown value);
+    struct Piece {
+        Entry entry;
+        std::string text;
+    };
+    std::vector<Piece> piecesOf(Entry element, std::string& all) const;
     bool setPieces(Entry element, std::string_view was, std::string_view now, Shown value);
     void setPiece(Entry piece, std::string_view was, std::string_view now, Shown value);
 

@@ -98,26 +98,26 @@ void UpdatePlan::setText(Entry element, bool isOwn, std::string_view was, std::s
     add(spot.insideBegin, spot.insideEnd, _source.writer.text(wanted), value);
 }
 
-// Where the text stands in one or more pieces, with comments and the like between them, only those
-// that change are touched. False where a piece has no place of its own.
-bool UpdatePlan::setPieces(Entry element, std::string_view was, std::string_view now, Shown value) {
-    struct Piece {
-        Entry entry;
-        std::string text;
-    };
+// The texts inside an element, as reading joins them.
+std::vector<UpdatePlan::Piece> UpdatePlan::piecesOf(Entry element, std::string& all) const {
     std::vector<Piece> pieces;
-    std::string all;
     const XMLIndex& index = _source.index;
-    Entry parent = element;
     std::string room;
     for (Entry at = element + 1; at < index.contentEnd(element); ++at) {
-        parent = parentOf(at);
-        if (index[at].nodeKind() != XMLNodeKind::text ||
-            XMLIndex::isLayout(index[at], index[parent]))
+        const bool isText = index[at].nodeKind() == XMLNodeKind::text;
+        if (!isText || XMLIndex::isLayout(index[at], index[parentOf(at)]))
             continue;
         pieces.push_back({at, std::string(index.value(index[at], room))});
         all += pieces.back().text;
     }
+    return pieces;
+}
+
+// Where the text stands in one or more pieces, with comments and the like between them, only those
+// that change are touched. False where a piece has no place of its own.
+bool UpdatePlan::setPieces(Entry element, std::string_view was, std::string_view now, Shown value) {
+    std::string all;
+    const std::vector<Piece> pieces = piecesOf(element, all);
     if (all != was)
         return false;
     if (pieces.empty()) {

@@ -12,9 +12,12 @@ namespace qxxml {
 
 namespace {
 
+// All white space is content: where it was layout, it was dropped before the text was made.
 qx::Ref<qx::XMLElement> parsed(const std::string& xml) {
+    qx::XMLParseOptions options;
+    options.keepWhiteSpace = true;
     qx::Ref<qx::Error> error;
-    const auto document = qx::XMLDocument::initWithData(xml, {}, &error);
+    const auto document = qx::XMLDocument::initWithData(xml, options, &error);
     if (!document)
         throw Failure(error, "JSON");
     qx::Ref<qx::XMLElement> root(document->rootElement());
