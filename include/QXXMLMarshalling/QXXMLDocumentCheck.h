@@ -18,8 +18,8 @@
 
 class QX_API QXXMLDocumentCheck {
 public:
-    // Documents are read and written by the marshaller, with its options, but that nothing fails for
-    // being unknown. Its report handler is taken away.
+    // Documents are read and written by the marshaller, with its options, but that nothing fails
+    // for being unknown. Its report handler is taken away.
     explicit QXXMLDocumentCheck(qx::Ref<QXXMLMarshaller> marshaller);
     ~QXXMLDocumentCheck();
     QXXMLDocumentCheck(const QXXMLDocumentCheck&) = delete;
