@@ -44,6 +44,7 @@ protected:
 
 private:
     friend class QXXMLMapping;
+    friend class qx::detail::MappingSource;
     friend qx::Ref<QXXMLDocumentMapping> qx::make<QXXMLDocumentMapping>();
 
     QXXMLDocumentMapping() = default;

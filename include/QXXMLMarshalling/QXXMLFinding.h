@@ -21,10 +21,10 @@ struct QX_API QXXMLFinding {
     qx::String kind;
     // What is the matter and what comes of it, in the user's language.
     qx::String text;
-    // What was probably meant, a name or a word of the mapping language; null where nothing is
-    // near.
+    // What may have been meant, in a few words of English: did you mean "price"? Null where nothing
+    // is near.
     qx::String suggestion;
-    // The element of the mapping, and the includes that led to its document, the nearest first.
+    // The element of the mapping, or of a document; the includes that led there, the nearest first.
     QXXMLMappingPlace place;
     std::vector<QXXMLMappingPlace> includedFrom;
     // The class and the field that it is about, by their "name"; null where it is about none.

@@ -23,7 +23,9 @@
 // find what was taken out of the document or added to it is not said, and a list that is being
 // filled stays as it was found. Getters may let go of the marshaller and of what is being written.
 
+#include <QXXMLMarshalling/QXXMLFieldValues.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
+#include <QXXMLMarshalling/QXXMLReport.h>
 #include <QXXMLMarshalling/detail/TypedObject.h>
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/CountedSet.h>
@@ -43,6 +45,7 @@ class NamespaceTable;
 namespace detail {
 class NamespaceMatching;
 class ReadingProgress;
+class Reporting;
 } // namespace detail
 } // namespace qx
 
@@ -148,6 +151,20 @@ public:
     };
     using ProgressHandler = qx::detail::UniqueFunction<bool(const Progress&)>;
     void setProgressHandler(ProgressHandler handler);
+
+    // What reading and writing pass over is told to the handler, and no more logged: unbound
+    // children and attributes above all. It may use the marshaller as setters may, and replace the
+    // handler. Null for none.
+    void setReportHandler(QXXMLReport::Handler handler);
+    // How many errors a reading with a slot collects before it ends, 1 at first. More than one
+    // leave out the field or item that fails; the call answers null all the same, the error is the
+    // first in the document, and all() lists them. What ends a reading at once (-224, -226) still
+    // does, and single steps end at their first error. What keeps the partial object hands it out,
+    // too, and reads on to the end, for all calls that answer neither a Result nor a reload.
+    std::size_t maximumErrors() const noexcept { return _maximumErrors; }
+    void setMaximumErrors(std::size_t count) noexcept { _maximumErrors = count; }
+    bool keepsPartial() const noexcept { return _keepsPartial; }
+    void setKeepsPartial(bool keeps) noexcept { _keepsPartial = keeps; }
 
     // A new document, version "1.0" and encoding "UTF-8", whose root represents the object; null
     // with one of the errors of marshallObject and of the fields. Kept unknown XML is moved, not
@@ -435,6 +452,7 @@ protected:
 private:
     friend class qx::detail::NamespaceMatching;
     friend class qx::detail::ReadingProgress;
+    friend class qx::detail::Reporting;
 
     bool matchNamespaces(NamespacePrefixes prefixes, bool matches, qx::Ref<qx::Error>* error);
     // The object of a document whose root is to be of that C++ type.
@@ -474,18 +492,10 @@ private:
     Limit _maximumKeptNodes{10'000, 64};
     qx::XMLParseOptions _parseOptions;
     std::shared_ptr<ProgressHandler> _progressHandler;
+    std::shared_ptr<QXXMLReport::Handler> _reportHandler;
+    std::size_t _maximumErrors = 1;
+    bool _keepsPartial = false;
     bool _matchesNamespaces = false;
     NamespacePrefixes _namespacePrefixes;
     std::shared_ptr<const qx::NamespaceTable> _namespaces; // null: names are matched as written
 };
-
-// Converts the value by the field's type and sets it under the key. False with
-//   -221  "<%@>: Unable to convert value to integer: %@"            (logged as a warning, too)
-//   -222  "Unable to set value: %@ for key: %@ in class: %@"
-QX_API bool TakeValueForKey(qx::Object& object, qx::Key key, const qx::Value& value,
-                            const QXXMLFieldMapping& field, qx::Ref<qx::Error>* error = nullptr);
-
-// The text under which a value is written: "true" or "false" for a field of type "boolean", else
-// the value's description.
-QX_API qx::String StringValueOfObjectWithMapping(const qx::Value& value,
-                                                 const QXXMLFieldMapping& field);

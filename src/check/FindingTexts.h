@@ -182,6 +182,72 @@ inline constexpr FindingText valueNotTaken(
     "wrong-property", error,
     "The property %@ of the class %@ of the program does not take the field's values");
 
+// What documents have, and what writing them again gives. A count comes last.
+inline constexpr FindingText unboundElement("unbound", warning,
+                                            "No field took the element %@ in %@, %@ in all");
+inline constexpr FindingText unboundAttribute("unbound", warning,
+                                              "No field took the attribute %@ of %@, %@ in all");
+inline constexpr FindingText
+    elementInWrapper("dropped", warning,
+                     "The element %@ in the wrapper %@ is no item and is dropped, %@ in all");
+inline constexpr FindingText
+    attributeOfWrapper("dropped", warning,
+                       "The attribute %@ of the wrapper %@ is dropped, %@ in all");
+inline constexpr FindingText
+    elementInText("dropped", warning, "Of the element %@ in %@ only the text is kept, %@ in all");
+inline constexpr FindingText attributeOfText(
+    "dropped", warning,
+    "The attribute %@ of %@, of which only the text is taken, is dropped, %@ in all");
+inline constexpr FindingText unboundText("dropped", warning, "Text in %@ is dropped, %@ in all");
+inline constexpr FindingText unknownRoot("unknown-root", error,
+                                         "No class maps to the root element %@, %@ in all");
+inline constexpr FindingText fieldNeverFound("never-found", note,
+                                             "The field was found in none of %@ objects");
+inline constexpr FindingText notWritten("not-written", error,
+                                        "What was read cannot be written: %@ (%@ in all)");
+inline constexpr FindingText lostInWriting("round-trip", warning,
+                                           "Written again, %@ is lost, %@ in all");
+inline constexpr FindingText changedInWriting("round-trip", warning,
+                                              "Written again, %@ has another text, %@ in all");
+inline constexpr FindingText addedInWriting("round-trip", warning,
+                                            "Written again, there is one more %@, %@ in all");
+inline constexpr FindingText
+    movedInWriting("round-trip", note,
+                   "Written again, %@ stands elsewhere among its siblings, %@ in all");
+inline constexpr FindingText remarksLost("round-trip", note,
+                                         "Written again, %@ is lost, %@ in all");
+
+// Why a node is bound or not.
+inline constexpr FindingText becameObject("why", note, "it became an object of the class %@ (%@)");
+inline constexpr FindingText takenByField("why", note,
+                                          "the field %@ of the class %@ (%@) took it: %@");
+inline constexpr FindingText
+    takenAsItem("why", note, "the field %@ of the class %@ (%@) took it as an item: %@");
+inline constexpr FindingText takenAsWrapper("why", note,
+                                            "the field %@ of the class %@ (%@) looked into it: %@");
+inline constexpr FindingText
+    takenAsFlattened("why", note, "the field %@ of the class %@ (%@) is flattened into it: %@");
+inline constexpr FindingText takenAsText("why", note,
+                                         "the field %@ of the class %@ (%@) took its text: %@");
+inline constexpr FindingText noFieldForElement("why", note,
+                                               "no field of the class %@ takes an element %@");
+inline constexpr FindingText noFieldForAttribute("why", note,
+                                                 "no field of the class %@ takes an attribute %@");
+inline constexpr FindingText
+    nameTakenElsewhere("why", note, "a field of the class %@ has the name %@, but took another");
+inline constexpr FindingText perhapsMeant("why", note, "there is one for %@");
+inline constexpr FindingText keptAsUnknown("why", note, "it is kept as unknown XML");
+inline constexpr FindingText dropped("why", note, "it is dropped");
+inline constexpr FindingText
+    onlyTextTaken("why", note, "of the element %@ around it only the text is taken, by %@");
+inline constexpr FindingText
+    onlyItemsTaken("why", note, "of the element %@ around it only the items are taken, by %@");
+inline constexpr FindingText insideOfUntaken("why", note, "it stands in %@, and of that:");
+inline constexpr FindingText noClassForRoot("why", note, "no class maps to the root element %@");
+
 } // namespace findings
+
+// The suggestion of a name, or of an attribute with its value; null for null.
+String suggestionOf(const String& meant);
 
 } // namespace qx::detail

@@ -45,7 +45,7 @@ Subject Subject::of(const QXXMLFieldMapping& field, const QXXMLBindToMapping& bi
 MappingCheck::MappingCheck(const QXXMLMarshallingMapping& mapping)
     : _mapping(mapping), _plan(MappingPlan::of(&mapping)), _findings(mapping.faults()) {
     _documents.push_back(mapping.mapping());
-    for (const auto& included : mapping._includes->included())
+    for (const auto& included : includes().included())
         _documents.push_back(included.get());
     // A class whose name is taken has no plan.
     for (const auto& type : mapping.mapping()->classMappings())
@@ -60,13 +60,21 @@ String MappingCheck::nearestClass(std::string_view wanted) {
     return nearest(wanted, names);
 }
 
-void MappingCheck::store(const String& suggestion, const FindingText& text, const Subject& subject,
+String suggestionOf(const String& meant) {
+    if (meant.isNull())
+        return nullptr;
+    const bool isQuoted = meant.view().find('"') != std::string_view::npos;
+    const std::string_view quote = isQuoted ? "" : "\"";
+    return String::concat({"did you mean ", quote, meant.view(), quote, "?"});
+}
+
+void MappingCheck::store(const String& meant, const FindingText& text, const Subject& subject,
                          std::span<const Value> arguments) {
     QXXMLFinding finding;
     finding.severity = text.severity;
     finding.kind = text.kind;
     finding.text = format(localizedText(text.message), arguments);
-    finding.suggestion = suggestion;
+    finding.suggestion = suggestionOf(meant);
     finding.place = {subject.source->name(), subject.line, subject.column};
     finding.includedFrom = subject.source->chain();
     finding.className = subject.className;
@@ -82,8 +90,9 @@ std::vector<QXXMLFinding> MappingCheck::run() {
     for (const QXXMLDocumentMapping* document : _documents)
         order.emplace(MappingSource::of(*document).name(), order.size());
     const auto keyOf = [&](const QXXMLFinding& finding) {
-        return std::tuple(order[finding.place.documentName], finding.place.line,
-                          finding.place.column);
+        const auto document = order.find(finding.place.documentName);
+        return std::tuple(document != order.end() ? document->second : order.size(),
+                          finding.place.line, finding.place.column);
     };
     std::stable_sort(
         _findings.begin(), _findings.end(),

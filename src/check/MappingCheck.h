@@ -43,7 +43,7 @@ public:
 
     // What the rules ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
-    const IncludeLoader& includes() const noexcept { return *_mapping._includes; }
+    const IncludeLoader& includes() const { return MappingPlan::includesOf(_mapping); }
     const std::vector<const QXXMLDocumentMapping*>& documents() const { return _documents; }
     const std::vector<const ClassPlan*>& classes() const noexcept { return _classes; }
     bool hasFaults() const noexcept { return !_mapping.faults().empty(); }
@@ -53,12 +53,12 @@ public:
     void add(const FindingText& text, const Subject& subject, const Arguments&... arguments) {
         suggest(nullptr, text, subject, arguments...);
     }
-    // The same with a suggestion, which may be null.
+    // The same with what was perhaps meant, a name or name="value", which may be null.
     template <class... Arguments>
-    void suggest(const String& suggestion, const FindingText& text, const Subject& subject,
+    void suggest(const String& meant, const FindingText& text, const Subject& subject,
                  const Arguments&... arguments) {
         const std::array<Value, sizeof...(Arguments)> values{Value(arguments)...};
-        store(suggestion, text, subject, values);
+        store(meant, text, subject, values);
     }
     // The nearest of the names; null where none is near, or too many were looked for.
     template <class Names>
@@ -73,7 +73,7 @@ public:
     String nearestClass(std::string_view wanted);
 
 private:
-    void store(const String& suggestion, const FindingText& text, const Subject& subject,
+    void store(const String& meant, const FindingText& text, const Subject& subject,
                std::span<const Value> arguments);
 
     const QXXMLMarshallingMapping& _mapping;

@@ -31,12 +31,22 @@ public:
     // here inherit it.
     void collectFaults(std::vector<QXXMLFinding>* faults) noexcept { _faults = faults; }
     bool collectsFaults() const noexcept { return _faults != nullptr; }
-    void addFault(Ref<Error> fault, const QXXMLMappingPlace& place) const;
+    // The fault knows its place.
+    void addFault(Ref<Error> fault) const;
+
+    // Tells the error, if any, that it is about this element, unless it knows its place already.
+    void locate(const Ref<Error>& error, const XMLElement& element) const;
+    // Tells the error, if any, that it is about the document which the include names, or about the
+    // include itself.
+    static void locate(const Ref<Error>& error, const QXXMLDocumentMapping& includer,
+                       std::size_t number);
 
 protected:
     const Class& describedClass() const override;
 
 private:
+    class FaultContext;
+
     String _name;
     Ref<MappingSource> _includer; // null for the outermost document
     QXXMLMappingPlace _place;     // of the include

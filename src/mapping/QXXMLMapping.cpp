@@ -56,7 +56,11 @@ bool QXXMLMapping::readElement(XMLElement* element, Ref<Error>* error,
         return qx::fail(error, qx::errors::nestedTooDeep, deepestNode, kept->name());
     _source = source;
     const Deeper deeper(*source);
-    return initXML(*kept, error);
+    if (initXML(*kept, error))
+        return true;
+    if (error != nullptr)
+        _source->locate(*error, *kept);
+    return false;
 }
 
 bool QXXMLMapping::initXML(XMLElement& element, Ref<Error>* error) {
@@ -74,7 +78,8 @@ bool QXXMLMapping::initXML(XMLElement& element, Ref<Error>* error) {
 bool QXXMLMapping::goesOn(bool succeeded, Ref<Error>* error) const {
     if (succeeded || error == nullptr || !*error || !_source->collectsFaults())
         return succeeded;
-    _source->addFault(std::exchange(*error, nullptr), place());
+    _source->locate(*error, *_element);
+    _source->addFault(std::exchange(*error, nullptr));
     return true;
 }
 

@@ -35,21 +35,33 @@ bool Unmarshalling::readField(const FieldPlan& field, const Target& target, Erro
             *error = std::move(problem);
     }
     if (error != nullptr && *error && !ErrorDetails::hasContext(**error))
-        locate(error, {placeOf(field, target), &field, nullptr});
-    return false;
+        locate(error, {placeOf(field, target, (*error)->code()), &field, currentClass()});
+    const bool isTooMany =
+        error != nullptr && *error && (*error)->code() == errors::tooManyChildren.code;
+    if (!passOver(error))
+        return false;
+    // One error is enough for them.
+    if (isTooMany)
+        for (const BindingPlan& binding : field.bindings)
+            for (std::size_t i = target.source.all(binding.name).size(); i > 0; --i)
+                target.bound.fields.add(binding.name);
+    return true;
 }
 
-// What the field was read from, as far as it can be found again: the attribute, the child that was
-// one too many, or the child; else the element.
-Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Target& target) const {
+// What the field was read from, as far as it can be found again: the attribute or the child, or the
+// child that is one too many; else the element.
+Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Target& target,
+                                             int code) const {
     ChildLookup& source = target.source;
+    const bool isTooMany =
+        code == errors::tooManyChildren.code || code == errors::tooManyElementsForField.code;
     const bool mayBeAttribute =
         field.kind == BindingKind::attribute || field.kind == BindingKind::automatic;
     for (const BindingPlan& binding : field.bindings) {
         const String& around = binding.location;
         const auto holder =
             around.isEmpty() ? ChildLookup::Found{source.element(), false} : source.find(around);
-        if (holder.several)
+        if (holder.several && isTooMany)
             return source.all(around)[1];
         const Number attribute = mayBeAttribute && !field.isCollection() && holder.first != none
                                      ? _document.attribute(holder.first, binding.name)
@@ -60,7 +72,7 @@ Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Targe
                                ? ChildLookup::Found()
                                : source.find(binding.name);
         if (child.first != none)
-            return child.several ? source.all(binding.name)[1] : child.first;
+            return child.several && isTooMany ? source.all(binding.name)[1] : child.first;
     }
     return source.element();
 }
@@ -76,6 +88,8 @@ bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& eleme
         held = {false, held.keepsZero()};
     }
     const Value& value = held.value();
+    if (_trace != nullptr)
+        _trace->hold(value);
     if (const auto array = value.as<Array>())
         return writeCollection(*this, field, element, *array, error);
     if (value.isNull() || (value.isObject() && value.classNameForMarshalling().isNull()))

@@ -9,6 +9,8 @@
 #include "marshaller/ElementWriter.h"
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/OutputNames.h"
+#include "marshaller/Reporting.h"
+#include "marshaller/WritingTrace.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -19,6 +21,8 @@ public:
 
     // Writes into the draft, into nodes where there is none.
     explicit Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft = nullptr);
+    // Tells the trace, which outlives the call, and writes what that says; into a draft.
+    Marshalling(const QXXMLMarshaller& marshaller, XMLDraft& draft, WritingTrace& trace);
     // Writes nodes that go into this element.
     Marshalling(const QXXMLMarshaller& marshaller, const XMLElement& inside);
 
@@ -40,6 +44,8 @@ public:
     // The class that the mapping has for the value; null for strings and numbers.
     const ClassPlan* classOf(const Value& value) const;
     ElementWriter& output() noexcept { return _output; }
+    // Null where nobody wants one.
+    WritingTrace* trace() const noexcept { return _trace; }
     // While it lives, an element is open that declares this: what is made is made inside it.
     class Opened {
     public:
@@ -73,10 +79,12 @@ public:
     bool isToBeWritten(const Value& item);
     // Whether the field that is being written is left out as an attribute: nothing requires it, and
     // it is empty or zero. Numbers are cut to integers first.
-    bool isLeftOut(const FieldPlan& field, const Value& value,
-                   const FieldText& text) const noexcept {
-        return _omitsZero && !field.isRequired &&
-               ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
+    bool isLeftOut(const FieldPlan& field, const Value& value, const FieldText& text) const {
+        const bool isLeft = _omitsZero && !field.isRequired &&
+                            ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
+        if (isLeft && _reports.isOn())
+            _reports.tellOmitted(field);
+        return isLeft;
     }
 
 private:
@@ -95,7 +103,9 @@ private:
     const MappingPlan& _plan;
     ObjectAccess _access;
     ElementWriter _output;
+    WritingTrace* _trace = nullptr;
     std::unique_ptr<OutputNames> _names; // null: names are written as the mapping has them
+    const Reporting _reports;
     std::size_t _depth = 0;
     bool _omitsZero = true; // of the field that is being written
 };

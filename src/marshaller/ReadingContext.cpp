@@ -1,5 +1,7 @@
 #include "marshaller/ReadingContext.h"
 
+#include "marshaller/Suggestion.h"
+
 namespace qx::detail {
 
 namespace {
@@ -17,15 +19,22 @@ DocumentPlace placeOf(const QXXMLMappingPlace& place) {
 
 } // namespace
 
-ReadingContext::ReadingContext(IndexedXML& document, const QXXMLMarshallingMapping* mapping,
-                               const ReadingSpot& spot)
-    : _places(document.places()), _number(spot.number), _mapping(mapping),
-      _field(spot.field != nullptr ? spot.field->mapping : nullptr), _class(classOf(spot)) {}
+ReadingContext::ReadingContext(int code, IndexedXML& document,
+                               const QXXMLMarshallingMapping* mapping, const ReadingSpot& spot)
+    : _code(code), _places(document.places()), _number(spot.number), _mapping(mapping),
+      _field(spot.field != nullptr ? spot.field->mapping : nullptr), _class(classOf(spot)),
+      _object(spot.classPlan != nullptr ? spot.classPlan->mapping : nullptr) {}
 
 void ReadingContext::tell(const Ref<Error>& error, IndexedXML& document,
                           const QXXMLMarshallingMapping* mapping, const ReadingSpot& spot) {
     if (error && !ErrorDetails::hasContext(*error))
-        ErrorDetails::setContext(*error, std::make_unique<ReadingContext>(document, mapping, spot));
+        ErrorDetails::setContext(
+            *error, std::make_unique<ReadingContext>(error->code(), document, mapping, spot));
+}
+
+String ReadingContext::suggestion() const {
+    return suggestionFor(
+        {_code, *_places, _number, _mapping.get(), _field.get(), _class.get(), _object.get()});
 }
 
 MappingNote ReadingContext::mapping() const {

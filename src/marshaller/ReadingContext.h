@@ -15,12 +15,13 @@ namespace qx::detail {
 struct ReadingSpot {
     IndexedXML::Number number = IndexedXML::none; // of an element, or of what stands in one
     const FieldPlan* field = nullptr;
-    const ClassPlan* classPlan = nullptr;
+    const ClassPlan* classPlan = nullptr; // of the object
 };
 
 class ReadingContext final : public ErrorContext {
 public:
-    ReadingContext(IndexedXML& document, const QXXMLMarshallingMapping* mapping,
+    // Of an error of that code.
+    ReadingContext(int code, IndexedXML& document, const QXXMLMarshallingMapping* mapping,
                    const ReadingSpot& spot);
     // Tells the error in the slot, which knows no place of its own yet.
     static void tell(const Ref<Error>& error, IndexedXML& document,
@@ -28,14 +29,17 @@ public:
 
     SourcePlace source() const override { return _places->placeOf(_number); }
     MappingNote mapping() const override;
+    String suggestion() const override;
     IndexedXML::Number order() const { return _places->orderOf(_number); }
 
 private:
+    const int _code;
     const std::shared_ptr<const DocumentPlaces> _places;
     const IndexedXML::Number _number;
     const Ref<const QXXMLMarshallingMapping> _mapping;
     const Ref<const QXXMLFieldMapping> _field;
-    const Ref<const QXXMLClassMapping> _class; // of the field, or by itself
+    const Ref<const QXXMLClassMapping> _class;  // that has the field, or is alone concerned
+    const Ref<const QXXMLClassMapping> _object; // that of the object
 };
 
 } // namespace qx::detail

@@ -15,7 +15,7 @@ namespace qx::detail {
 Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()), _document(document),
       _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
-      _classes(_plan.classCount() + 1), _classKnown(_plan.classCount() + 1) {
+      _reports(marshaller), _classes(_plan.classCount() + 1), _classKnown(_plan.classCount() + 1) {
     if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
         document.matchBy(*table);
 }
@@ -184,9 +184,10 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
     const bool isWhole = walk.broken().isNull()
                              ? keepNamespaces(rest, error) && validate(&plan, rest, error)
                              : fail(error, errors::noExtends, walk.broken());
-    if (!isWhole)
-        locate(error, {source->element(), nullptr, &plan});
-    return isWhole;
+    if (isWhole)
+        return true;
+    locate(error, {source->element(), nullptr, &plan});
+    return passOver(error);
 }
 
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
@@ -253,8 +254,10 @@ private:
 
 } // namespace
 
-Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress* progress) {
-    _progress = progress;
+Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress& progress,
+                                ErrorCollector& collector) {
+    _progress = &progress;
+    _collector = &collector;
     const ReadingGroup group(_marshaller->undoManager());
     const BulkObjects bulk;
     startWith(error);
@@ -267,9 +270,15 @@ Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress
 Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
                          ReadingTrace* trace) {
     ReadingProgress progress(marshaller, document.size());
+    ErrorCollector collector(marshaller, error);
     Unmarshalling reading(marshaller, document);
     reading.setTrace(trace);
-    auto object = reading.read(document.root(), error, &progress);
+    auto object = reading.read(document.root(), error, progress, collector);
+    if (collector.count() != 0) {
+        collector.giveTo(error);
+        if (!collector.keepsPartial())
+            return nullptr;
+    }
     // Without a slot a collection leaves out what fails.
     return progress.isCancelled() ? nullptr : object;
 }

@@ -15,11 +15,13 @@
 
 #include "marshaller/ChildLookup.h"
 #include "marshaller/ConsumedNames.h"
+#include "marshaller/ErrorCollector.h"
 #include "marshaller/NamespaceMatching.h"
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/ReadingContext.h"
 #include "marshaller/ReadingProgress.h"
 #include "marshaller/ReadingTrace.h"
+#include "marshaller/Reporting.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -51,8 +53,9 @@ public:
 
     // From here on it is told what becomes of each entry; it outlives the call.
     void setTrace(ReadingTrace* trace) noexcept { _trace = trace; }
-    // In an undo group of its own.
-    Ref<Object> read(Number element, ErrorSlot error, ReadingProgress* progress = nullptr);
+    // In an undo group of its own. Errors that the collector takes leave out what failed.
+    Ref<Object> read(Number element, ErrorSlot error, ReadingProgress& progress,
+                     ErrorCollector& collector);
     // `nodes` are those that are kept of the element.
     Ref<Object> unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error);
     // `source` may be shared with the object that this one is flattened into.
@@ -78,6 +81,12 @@ public:
             ReadingContext::tell(*error, _document, _mapping.get(), spot);
     }
 
+    // Whether the reading goes on without what has failed: the error in the slot is collected.
+    bool passOver(ErrorSlot error) {
+        return _collector != nullptr && error != nullptr && *error && mayPassOver() &&
+               _collector->take(*error);
+    }
+
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
@@ -88,6 +97,11 @@ public:
     const ClassPlan* classForElement(Number element) const {
         return _plan.classForElement(_document.name(element));
     }
+    // The class whose fields are being read; null in single steps.
+    const ClassPlan* currentClass() const noexcept {
+        return _frame != nullptr ? _frame->plan : nullptr;
+    }
+    const Reporting& reports() const noexcept { return _reports; }
     // An argument of an error: the node as it is quoted.
     auto quoted(Number node) {
         return [this, node] { return _document.quoted(node); };
@@ -113,7 +127,9 @@ private:
     class LentNames;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
-    Number placeOf(const FieldPlan& field, const Target& target) const;
+    Number placeOf(const FieldPlan& field, const Target& target, int code) const;
+    // What ends a reading as a whole goes on failing.
+    bool mayPassOver() const noexcept { return !_budget.isSpent() && !_progress->isCancelled(); }
     bool mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error);
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
@@ -133,6 +149,8 @@ private:
     ReadingBudget _budget;
     ObjectAccess _access;
     ReadingProgress* _progress = nullptr;
+    ErrorCollector* _collector = nullptr;
+    const Reporting _reports;
     ReadingTrace* _trace = nullptr;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;

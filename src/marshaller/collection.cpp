@@ -95,6 +95,22 @@ bool findItemsByType(Unmarshalling& reading, const FieldPlan& field, const Targe
     return true;
 }
 
+void tellSkipped(Unmarshalling& reading, const Target& target, const Items& items,
+                 Unmarshalling::Number node) {
+    if (reading.reports().isOn() && items.wrapper != Unmarshalling::none &&
+        reading.document().isElement(node))
+        reading.reports().tell(Reporting::Kind::skippedItem, reading.document(), items.wrapper,
+                               node, &target.object);
+}
+
+void tellWrapper(Unmarshalling& reading, const FieldPlan& field, const Target& target,
+                 const Items& items) {
+    const ClassPlan* const plan = reading.currentClass();
+    if (reading.reports().isOn() && items.wrapper != Unmarshalling::none && plan != nullptr)
+        reading.reports().tellWrapper(reading.document(), items.wrapper, *plan, field,
+                                      &target.object);
+}
+
 // Calls make(Number) for each item, and sets the list of the values that were made.
 template <class Make>
 bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& target,
@@ -116,12 +132,17 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
         const Value item = make(node);
         reading.setWrapper(Unmarshalling::none);
         if ((error != nullptr && *error) || reading.budget().isSpent()) {
-            reading.locate(error, {node, &field, nullptr});
-            return false;
+            reading.locate(error, {node, &field, reading.currentClass()});
+            if (!reading.passOver(error))
+                return false;
+            if (!items.areCounted && reading.document().isElement(node))
+                target.bound.fields.add(reading.document().name(node));
+            continue;
         }
         if (item.isNull()) {
             if (trace != nullptr)
                 trace->forget(uses);
+            tellSkipped(reading, target, items, node);
             continue;
         }
         if (!items.areCounted)
@@ -135,8 +156,10 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
 }
 
 // The text of an item.
-Value readText(Unmarshalling& reading, const FieldPlan& field, Unmarshalling::Number node,
-               Ref<Error>* error) {
+Value readText(Unmarshalling& reading, const FieldPlan& field, const Target& target,
+               Unmarshalling::Number node, Ref<Error>* error) {
+    if (reading.reports().isOn())
+        reading.reports().tellInside(reading.document(), node, &target.object);
     if (!reading.budget().takeVisits(1, node, error) || !reading.budget().takeText(node, error))
         return nullptr;
     return itemOf(field, reading.document().text(node), error);
@@ -153,6 +176,7 @@ bool readCollection(Unmarshalling& reading, const FieldPlan& field, const Target
     Items items;
     if (!findItems(reading, field, target, items, error))
         return false;
+    tellWrapper(reading, field, target, items);
     return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
         return Value(reading.unmarshallNode(node, target.source.nodes(), error));
     });
@@ -165,10 +189,11 @@ bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const 
     Items items;
     if (!findItemsByType(reading, field, target, items, error))
         return false;
+    tellWrapper(reading, field, target, items);
     return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
         return field.typeClass != nullptr
                    ? Value(reading.build(*field.typeClass, node, target.source.nodes(), error))
-                   : readText(reading, field, node, error);
+                   : readText(reading, field, target, node, error);
     });
 }
 
@@ -196,6 +221,9 @@ WrittenElement elementForItems(Marshalling& writing, const FieldPlan& field,
 
 bool writeCollection(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
                      const Array& array, Ref<Error>* error) {
+    WritingTrace* const trace = writing.trace();
+    if (trace != nullptr)
+        trace->markList();
     if (array.isEmpty() && !field.isRequired)
         return true;
     if (field.hasType() && !field.hasItemType())
@@ -212,12 +240,15 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
             continue;
         }
         Ref<Error> problem;
+        const WritingTrace::Number shown = trace != nullptr ? trace->size() : 0;
         const auto child = field.typeClass != nullptr
                                ? writing.element(*field.typeClass, field.bindTo(), item, &problem)
                                : writing.marshallObject(item, &problem);
         if (child) {
             if (writing.isToBeWritten(item))
                 writing.output().addChild(target, child);
+            else if (trace != nullptr)
+                trace->forget(shown);
         } else if (error != nullptr && problem) {
             *error = std::move(problem);
             return false;

@@ -35,6 +35,8 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshallin
     const ClassPlan* plan = field.typeClass != nullptr || isText ? field.typeClass : classOfElement;
     if (plan != nullptr)
         return reading.build(*plan, child, target.source.nodes(), error);
+    if (reading.reports().isOn())
+        reading.reports().tellInside(reading.document(), child, &target.object);
     return reading.budget().takeText(child, error) ? reading.document().text(child) : Value();
 }
 

@@ -7,6 +7,7 @@
 
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
+#include "marshaller/NoUndo.h"
 #include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
@@ -107,20 +108,6 @@ Source sourceOfFile(const QXXMLMarshaller& marshaller, const String& path, Ref<E
     return source;
 }
 
-// What the reading of the new object does is no change of the one that is there.
-class NoUndo {
-public:
-    explicit NoUndo(Ref<qx::UndoManager> manager) : _manager(std::move(manager)) {
-        _manager->disableUndoRegistration();
-    }
-    ~NoUndo() { _manager->enableUndoRegistration(); }
-    NoUndo(const NoUndo&) = delete;
-    NoUndo& operator=(const NoUndo&) = delete;
-
-private:
-    const Ref<qx::UndoManager> _manager;
-};
-
 qx::Object& present(qx::Object* object) {
     if (object == nullptr)
         throw qx::Exception(qx::Exception::invalidArgument, "there is no object to read into");
@@ -148,10 +135,10 @@ bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& docum
     Ref<Error> problem;
     Ref<qx::Object> fresh;
     {
-        const NoUndo noUndo(marshaller.undoManager());
+        const qx::detail::NoUndo noUndo(marshaller.undoManager());
         fresh = objectOf(marshaller, document, typeOf(object), &problem);
     }
-    bool isRead = fresh.get() != nullptr;
+    bool isRead = fresh && !problem; // part of a document is none to reload
     if (isRead && !qx::detail::Reloading::isOfSameClass(object, *fresh))
         isRead = qx::fail(&problem, qx::errors::rootOfOtherClass, fresh->classNameForMarshalling(),
                           object.classNameForMarshalling());
@@ -245,6 +232,7 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
     const auto match = table ? qx::XMLSplitter::Match::localNames : qx::XMLSplitter::Match::names;
     qx::XMLPieces pieces(source, elementName, match, qx::detail::parsingOf(*this));
     qx::detail::ReadingProgress progress(*this, source.size());
+    qx::detail::ErrorCollector collector(*this, error);
     const String name = source.name();
     while (const auto piece = goesOn ? pieces.next(&failure) : nullptr) {
         if (!progress.startPiece(pieces.bytesRead(), &failure))
@@ -256,22 +244,30 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
             document.matchAsWritten();
         qx::detail::Unmarshalling reading(*this, document);
         document.forEachOutermost(elementName, [&](qx::IndexedXML::Number item) {
-            const auto object = reading.read(item, &failure, &progress);
-            if (!object && !failure)
+            const std::size_t before = collector.count();
+            auto object = reading.read(item, &failure, progress, collector);
+            if (!object && !failure && collector.count() == before)
                 qx::fail(&failure, qx::errors::noDefinitionForElement,
                          [&] { return document.quoted(item); });
-            auto visited = object ? visitor(object) : qx::detail::Visited{false, failure};
-            failure = std::move(visited.error);
+            const bool isWhole = object && collector.count() == before;
+            if (isWhole || (object && collector.keepsPartial())) {
+                auto visited = visitor(object);
+                failure = std::move(visited.error);
+                goesOn = visited.goesOn;
+            }
             reading.locate(&failure, {.number = item});
-            return goesOn = visited.goesOn;
+            goesOn = goesOn && (!failure || reading.passOver(&failure));
+            collector.settle(before);
+            return goesOn;
         });
     }
-    if (failure && error != nullptr) {
-        if (failure->documentName().isNull())
-            ErrorDetails::nameDocument(&failure, name);
+    if (failure && failure->documentName().isNull())
+        ErrorDetails::nameDocument(&failure, name);
+    if (!collector.giveTo(&failure))
+        return true;
+    if (error != nullptr)
         *error = failure;
-    }
-    return !failure;
+    return false;
 }
 
 bool QXXMLMarshaller::readBytesInto(qx::Object* object, qx::XMLBytes xml, Ref<Error>* error) {

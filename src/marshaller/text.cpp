@@ -30,6 +30,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     if (!reading.budget().takeText(holder, error))
         return false;
     const bool isChild = holder != source.element();
+    if (isChild && reading.reports().isOn())
+        reading.reports().tellInside(reading.document(), holder, &target.object);
     Value text = isChild ? reading.document().text(holder) : source.stringValue();
     if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
         trace->take(isChild ? ReadingTrace::Form::child : ReadingTrace::Form::text, field, holder,
@@ -45,7 +47,12 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 // Whatever stood in the element before goes: earlier children too.
 bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
            const Value& value, Ref<Error>*) {
-    writing.output().setText(element, FieldText(value, field.valueType));
+    const FieldText text(value, field.valueType);
+    if (WritingTrace* const trace = writing.trace(); trace != nullptr) {
+        trace->replaceContent(element.drafted);
+        trace->addText(text.view(), text.isEmpty()); // which adds no node
+    }
+    writing.output().setText(element, text);
     return true;
 }
 

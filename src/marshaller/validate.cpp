@@ -6,6 +6,8 @@
 #include "host/Log.h"
 #include "model/Errors.h"
 
+#include <algorithm>
+
 namespace qx::detail {
 
 namespace {
@@ -24,30 +26,54 @@ public:
             _names = make<CountedSet>();
             _written = document.isMatched() ? make<CountedSet>() : _names;
         }
-        if (_first == IndexedXML::none)
-            _first = node;
+        const std::size_t known = _names->count();
         _names->add(name);
+        if (_names->count() != known)
+            _firsts.push_back(node);
         if (_written != _names)
             _written->add(document.writtenName(node));
     }
     // As they are matched, and as they stand in the document.
     const Ref<CountedSet>& names() const noexcept { return _names; }
     const Ref<CountedSet>& written() const noexcept { return _written; }
-    // The first node that is left.
-    IndexedXML::Number first() const noexcept { return _first; }
+    // The first node that is left of each name.
+    const std::vector<IndexedXML::Number>& firsts() const noexcept { return _firsts; }
+    std::size_t countOf(const IndexedXML& document, IndexedXML::Number node) const {
+        return _names->countFor(document.name(node));
+    }
 
 private:
     ConsumedNames& _bound;
     Ref<CountedSet> _names;
     Ref<CountedSet> _written;
-    IndexedXML::Number _first = IndexedXML::none;
+    std::vector<IndexedXML::Number> _firsts;
 };
 
 } // namespace
 
+namespace {
+
+// Whether some field takes the text of the class's own element.
+bool takesText(const ClassPlan& plan) {
+    ExtendsWalk walk(plan);
+    do {
+        const auto takes = [](const FieldPlan& field) {
+            return !field.isCollection() && (field.kind == BindingKind::text ||
+                                             (!field.isContainer && field.typeClass == nullptr));
+        };
+        if (std::ranges::any_of(walk.current().fields, takes))
+            return true;
+    } while (walk.next());
+    return false;
+}
+
+} // namespace
+
 bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorSlot error) {
-    if (_marshaller->isLenient() && !_marshaller->saveUnknownXML())
+    if (_marshaller->isLenient() && !_marshaller->saveUnknownXML() && !_reports.isOn())
         return true;
+    if (_reports.isOn() && plan != nullptr && !takesText(*plan))
+        _reports.tellTexts(_document, target.source.element(), &target.object);
     if (_use == Use::document) {
         const bool allBound = plan != nullptr && hasBoundAllChildren(*plan, target);
         return (allBound || validateChildren(target, error)) && validateAttributes(target, error);
@@ -64,10 +90,10 @@ bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& tar
            target.bound.fields.size() == target.source.childCount();
 }
 
-// False: what no field consumed is an error, there.
+// What no field consumed is an error, there.
 bool Unmarshalling::refuse(Number unknown, ErrorSlot error) {
     locate(error, {unknown, nullptr, _frame != nullptr ? _frame->plan : nullptr});
-    return false;
+    return passOver(error);
 }
 
 bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
@@ -75,17 +101,22 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     target.source.forEachChild([&](Number child) { unknown.see(_document, child); });
     if (!unknown.names())
         return true;
-    if (!_marshaller->saveUnknownXML()) {
+    if (!_marshaller->saveUnknownXML() && !_marshaller->isLenient()) {
         fail(error, errors::unknownFields, unknown.written(), target.source.elementName());
-        return refuse(unknown.first(), error);
+        return refuse(unknown.firsts().front(), error);
     }
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
-    // host's log at all is asked of the warnings.
-    if (hostHasLogWarning())
+    // host's log at all is asked of the warnings. Who has a reading traced hears of it there.
+    if (_reports.isOn() && _trace == nullptr)
+        for (const Number node : unknown.firsts())
+            _reports.tell(Reporting::Kind::unboundChild, _document, target.source.element(), node,
+                          &target.object, unknown.countOf(_document, node));
+    else if (_trace == nullptr && hostHasLogWarning())
         logDebug("*** Warning: Unbound fields: %@", unknown.written());
-    else
+    else if (_trace == nullptr)
         log("Unbound fields: %@", unknown.written());
-    return keepChildren(target, *unknown.names(), *unknown.written(), error);
+    return !_marshaller->saveUnknownXML() ||
+           keepChildren(target, *unknown.names(), *unknown.written(), error);
 }
 
 // A name that is left is kept with all its elements, those that were consumed included; under the
@@ -136,12 +167,17 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
         return false;
     if (!unknown.names())
         return true;
-    if (!_marshaller->saveUnknownXML()) {
+    if (!_marshaller->saveUnknownXML() && !_marshaller->isLenient()) {
         fail(error, errors::unknownAttributes, unknown.written(), target.source.elementName());
-        return refuse(unknown.first(), error);
+        return refuse(unknown.firsts().front(), error);
     }
-    logWarningOrLine("Unbound attributes: %@", unknown.written());
-    return keepAttributes(target, *unknown.names(), error);
+    if (_reports.isOn() && _trace == nullptr)
+        for (const Number node : unknown.firsts())
+            _reports.tell(Reporting::Kind::unboundAttribute, _document, element, node,
+                          &target.object);
+    else if (_trace == nullptr)
+        logWarningOrLine("Unbound attributes: %@", unknown.written());
+    return !_marshaller->saveUnknownXML() || keepAttributes(target, *unknown.names(), error);
 }
 
 bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names, ErrorSlot error) {

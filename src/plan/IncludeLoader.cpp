@@ -6,6 +6,7 @@
 #include "files/Files.h"
 #include "files/Paths.h"
 #include "mapping/MappingSource.h"
+#include "model/ErrorDetails.h"
 
 #include <algorithm>
 #include <utility>
@@ -24,15 +25,9 @@ constexpr std::size_t mostIncludes = 10'000;
 } // namespace
 
 bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
-    if (!loadWithIncludes(document, error))
-        return false;
-    const MappingSource& source = MappingSource::of(document);
-    if (source.collectsFaults())
-        _classes.forEachRepeated([](const QXXMLClassMapping& mapping, Ref<Error> fault) {
-            MappingSource::of(mapping).addFault(std::move(fault), mapping.place());
-        });
+    const bool isLoaded = loadWithIncludes(document, error);
     _classes = {};
-    return true;
+    return isLoaded;
 }
 
 // A document's classes are checked once its includes are there, those of its includes before it. A
@@ -40,8 +35,14 @@ bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
 bool IncludeLoader::loadWithIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error) {
     const std::size_t begin = _classes.count();
     _classes.add(document);
-    return loadIncludes(document, error) &&
-           (MappingSource::of(document).collectsFaults() || _classes.areDistinctFrom(begin, error));
+    if (!loadIncludes(document, error))
+        return false;
+    if (!MappingSource::of(document).collectsFaults())
+        return _classes.areDistinctFrom(begin, error);
+    _classes.tellRepeatedFrom(begin, [](const QXXMLClassMapping& mapping, Ref<Error> fault) {
+        MappingSource::of(mapping).addFault(std::move(fault));
+    });
+    return true;
 }
 
 bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error) {
@@ -51,9 +52,11 @@ bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error
     for (std::size_t i = 0; i < document.includes().size(); ++i) {
         if (loadInclude(*manager, document, i, error))
             continue;
+        if (error != nullptr)
+            MappingSource::locate(*error, document, i);
         if (!source.collectsFaults())
             return false;
-        source.addFault(std::exchange(*error, nullptr), document.includePlace(i));
+        source.addFault(std::exchange(*error, nullptr));
     }
     return true;
 }
@@ -103,6 +106,7 @@ Ref<XMLDocument> IncludeLoader::findInFolder(const String& href, Ref<Error>* err
         return nullptr;
     const auto data = readFile(path, error, ReadableFiles::regular);
     auto document = data ? XMLDocument::initWithData(*data, {}, error) : nullptr;
+    ErrorDetails::nameDocument(error, path);
     if (document)
         document->setDocumentName(path);
     return document;

@@ -5,6 +5,7 @@
 // its includes among it, is thus one stretch of the list, and has to name no class and no element
 // twice in itself. Each class is looked at once, however deep the includes nest.
 
+#include "mapping/MappingSource.h"
 #include "model/Errors.h"
 #include "plan/MappingPlan.h"
 
@@ -34,12 +35,18 @@ public:
         return isRefused(*std::find_if(_repeated.begin(), _repeated.end(), isIn), begin, error);
     }
 
-    // Calls visit(QXXMLClassMapping&, Ref<Error>) for each class that repeats a name.
+    // Calls visit(QXXMLClassMapping&, Ref<Error>) for each class behind the first `begin` ones that
+    // has no names of its own, once.
     template <class Visit>
-    void forEachRepeated(Visit visit) const {
-        for (const Repeated& repeated : _repeated) {
+    void tellRepeatedFrom(std::size_t begin, Visit visit) {
+        if (_latestRepeated <= begin)
+            return;
+        for (Repeated& repeated : _repeated) {
+            if (repeated.isTold || repeated.latest() <= begin)
+                continue;
+            repeated.isTold = true;
             Ref<Error> error;
-            isRefused(repeated, 0, &error);
+            isRefused(repeated, begin, &error);
             visit(*repeated.mapping, std::move(error));
         }
     }
@@ -51,15 +58,20 @@ private:
         const QXXMLClassMapping* mapping;
         std::size_t sameClass; // the latest class before it that has its name
         std::size_t sameElement;
+        bool isTold = false; // see tellRepeatedFrom
         std::size_t latest() const noexcept { return std::max(sameClass, sameElement); }
     };
 
     static bool isRefused(const Repeated& repeated, std::size_t begin, Ref<Error>* error) {
-        const String& className = repeated.mapping->className();
+        const QXXMLClassMapping& mapping = *repeated.mapping;
         if (repeated.sameClass > begin)
-            return fail(error, errors::classRedefined, className);
-        return fail(error, errors::elementRedefined, MappingPlan::elementNameOf(*repeated.mapping),
-                    className);
+            fail(error, errors::classRedefined, mapping.className());
+        else
+            fail(error, errors::elementRedefined, MappingPlan::elementNameOf(mapping),
+                 mapping.className());
+        if (error != nullptr)
+            MappingSource::of(mapping).locate(*error, MappingSource::elementOf(mapping));
+        return false;
     }
 
     void add(const QXXMLClassMapping& mapping) {

@@ -10,6 +10,7 @@
 #include "files/SystemErrors.h"
 #include "host/Directories.h"
 #include "host/Log.h"
+#include "model/ErrorDetails.h"
 #include "model/Errors.h"
 #include "repository/NameLookUp.h"
 
@@ -195,6 +196,7 @@ Ref<XMLDocument> QXXMLFileSystemDataRepository::documentNamed(const String& name
     if (size != nullptr)
         *size = data ? data->size() : 0;
     auto document = data ? XMLDocument::initWithData(*data, {}, error) : nullptr;
+    qx::detail::ErrorDetails::nameDocument(error, path);
     if (document)
         document->setDocumentName(path);
     return document;

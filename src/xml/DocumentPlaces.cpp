@@ -92,7 +92,7 @@ std::string DocumentPlaces::stepTo(Number number) const {
     const Step& step = _steps[number];
     if (_tree && step.parent == none)
         return qx::pathOf(_tree->element(number));
-    const std::string name = index()->name(entry).str();
+    const std::string name = nameOf(number).str();
     switch (entry.nodeKind()) {
     case XMLNodeKind::element:
         return "/" + name + (step.position != 0 ? "[" + std::to_string(step.position) + "]" : "");
@@ -100,6 +100,8 @@ std::string DocumentPlaces::stepTo(Number number) const {
         return "/@" + name;
     case XMLNodeKind::processingInstruction:
         return "/?" + name;
+    case XMLNodeKind::text:
+        return "/text()";
     default:
         return {};
     }
@@ -117,11 +119,12 @@ String DocumentPlaces::pathOf(Number number) const {
 
 std::size_t DocumentPlaces::beginOf(Number number) const {
     const XMLIndexEntry& entry = (*index())[number];
-    if (entry.nodeKind() == XMLNodeKind::element)
+    const bool isText = entry.nodeKind() == XMLNodeKind::text;
+    if (entry.nodeKind() == XMLNodeKind::element || (isText && !entry.has(XMLIndexEntry::isAside)))
         return entry.begin;
     if (entry.nodeKind() != XMLNodeKind::attribute || entry.has(XMLIndexEntry::isAside))
         return beginOf(_steps[number].parent);
-    // Behind the name come blanks, the equals sign, more blanks and the quote.
+    // Behind the name of an attribute come blanks, the equals sign, more blanks and the quote.
     const std::string_view text = index()->text();
     std::size_t at = entry.begin - 1;
     while (at > 0 && (isWhite(text[at - 1]) || text[at - 1] == '='))
@@ -180,8 +183,23 @@ String DocumentPlaces::nameOf(Number number) const {
     return hasName ? index()->name(entry) : String();
 }
 
+String DocumentPlaces::textOf(Number number) const {
+    if (index() == nullptr || number >= index()->entries().size())
+        return nullptr;
+    if ((*index())[number].nodeKind() == XMLNodeKind::element) {
+        const Number first = index()->firstChild(number);
+        if (first == index()->contentEnd(number))
+            return "";
+        number = first;
+    }
+    std::string room;
+    return String(index()->value((*index())[number], room));
+}
+
 std::vector<String> DocumentPlaces::attributesOf(Number element) const {
     std::vector<String> names;
+    if (nameOf(element).isNull())
+        return names;
     const Number end = index()->firstChild(element);
     for (Number at = index()->content(element); at < end; ++at)
         if ((*index())[at].nodeKind() == XMLNodeKind::attribute)
@@ -193,6 +211,8 @@ std::vector<String> DocumentPlaces::childrenOf(Number element) const {
     // Suggestions need no more.
     constexpr std::size_t most = 1'000;
     std::vector<String> names;
+    if (nameOf(element).isNull())
+        return names;
     const Number end = index()->contentEnd(element);
     Number at = index()->firstChild(element);
     for (; at < end && names.size() < most; at = index()->siblingOf(at))

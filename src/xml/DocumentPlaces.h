@@ -31,6 +31,8 @@ public:
     Number orderOf(Number number) const;
     // The names, as written, of an entry, and of the attributes and the child elements in it.
     String nameOf(Number number) const;
+    // Of an attribute, or of the first text in an element.
+    String textOf(Number number) const;
     std::vector<String> attributesOf(Number element) const;
     std::vector<String> childrenOf(Number element) const;
 

@@ -1,6 +1,7 @@
 // Where errors of reading say that they came about, and how they are shown to people.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
+#include <QXXMLMarshalling/model/Class.h>
 
 #include "support/TemporaryFolder.h"
 #include "support/Texts.h"
@@ -45,7 +46,8 @@ TEST(Places, OfAFileHaveItsName) {
                                    ":3:5 /points/p[2]/@x\n"
                                    "        <p x='b'/></points>\n"
                                    "           ^\n"
-                                   "  by points.map.xml:6:3, field \"x\" of class \"Point\"");
+                                   "  by points.map.xml:6:3, field \"x\" of class \"Point\"\n"
+                                   "  it takes a whole number");
     const auto document = XMLDocument::initWithContentsOfFile(path);
     for (const bool hasNodes : {false, true}) {
         if (hasNodes)
@@ -114,7 +116,8 @@ TEST(Reports, CutLongLinesAroundTheMark) {
                                    "       " +
                                    std::string(50, ' ') +
                                    "^\n"
-                                   "  by points.map.xml:6:3, field \"x\" of class \"Point\"");
+                                   "  by points.map.xml:6:3, field \"x\" of class \"Point\"\n"
+                                   "  it takes a whole number");
 }
 
 TEST(Reports, QuoteLittleOfALongElement) {
@@ -126,4 +129,42 @@ TEST(Reports, QuoteLittleOfALongElement) {
     const std::string short_ = error->shortDescription().str();
     EXPECT_LT(short_.size(), 250U);
     EXPECT_EQ(short_.find('\n'), std::string::npos);
+}
+
+enum class Fix { none, flat, full };
+struct Sample {
+    bool isGood = false;
+    Fix fix = Fix::none;
+    std::optional<unsigned> count;
+    double height = 0;
+};
+
+TEST(Suggestions, NameWhatAMemberTakes) {
+    const auto registration =
+        Class::define<Sample>("Sample")
+            .property<&Sample::isGood>("good")
+            .property<&Sample::fix>("fix")
+            .property<&Sample::count>("count")
+            .property<&Sample::height>("height")
+            .names({{Fix::none, "none"}, {Fix::flat, "2d"}, {Fix::full, "full"}})
+            .registration();
+    const auto marshaller = marshallerFor(R"(<class name="Sample">
+<field name="good"><bind-xml node="attribute"/></field>
+<field name="fix"><bind-xml node="attribute"/></field>
+<field name="count"><bind-xml node="attribute"/></field>
+<field name="height"><bind-xml node="element"/></field></class>)");
+    const std::pair<const char*, const char*> cases[] = {
+        {"good='ja'", "it takes \"true\", \"false\""},
+        {"good='ture'", "did you mean \"true\"?"},
+        {"fix='Full'", "did you mean \"full\"?"},
+        {"fix='x'", "it takes \"none\", \"2d\", \"full\""},
+        {"count='-1'", "it takes a whole number from zero on"},
+        {"><height>1,5</height", "it takes a number"},
+    };
+    for (const auto& [content, suggestion] : cases) {
+        const auto read = marshaller->readString<Sample>(std::string("<sample ") + content +
+                                                         (content[0] == '>' ? "></sample>" : "/>"));
+        ASSERT_FALSE(read) << content;
+        EXPECT_EQ(read.error()->suggestion(), suggestion) << content;
+    }
 }

@@ -184,6 +184,47 @@ TEST_F(MarshallingMapping, LooksBesideTheOutermostFileForWhatNoRepositoryHas) {
                     .empty());
 }
 
+TEST_F(MarshallingMapping, TellsWhereAFaultIsAndWhatWasMeant) {
+    repository->documents = {{"misspelt", "\n<class nmae='B'/>"},
+                             {"outer", "<include href='misspelt'/>"},
+                             {"broken", "broken"},
+                             {"twice", "<class name='A'/>\n  <class name='A'/>"}};
+    const std::pair<const char*, const char*> cases[] = {
+        {"<class name='A'><field name='f' lazy='yes'/></class>",
+         "Boolean attribute: lazy has an illegal value: yes\n"
+         "  at main.xml:1:26 /mapping/class/field\n"
+         "  did you mean \"true\" or \"false\"?"},
+        {"<include href='outer'/>",
+         "Required attribute: name not found in element: <class nmae=\"B\"></class>\n"
+         "  at misspelt:2:1 /mapping/class\n"
+         "  by misspelt:2:1\n"
+         "    included by outer:1:10\n"
+         "    included by main.xml:1:10\n"
+         "  did you mean \"name\" by \"nmae\"?"},
+        {"<include href='twice'/>",
+         "Class redefined: A\n  at twice:2:3 /mapping/class[2]\n  by twice:2:3\n"
+         "    included by main.xml:1:10"},
+        {"\n<include href='ring'/>",
+         "Unable to load included file: ring\n  at ring:1:10 /mapping/include\n  by ring:1:10\n"
+         "    included by main.xml:2:1"},
+    };
+    repository->documents["ring"] = "<include href='ring'/>";
+    for (const auto& [content, expected] : cases) {
+        const auto document = mappingOf(content);
+        document->setDocumentName("main.xml");
+        Ref<Error> error;
+        EXPECT_FALSE(QXXMLMarshallingMapping::initWithDocument(document.get(), &error));
+        EXPECT_EQ(error->report(), expected);
+    }
+    Ref<Error> error;
+    const auto document = mappingOf("<include href='broken'/>");
+    document->setDocumentName("main.xml");
+    EXPECT_FALSE(QXXMLMarshallingMapping::initWithDocument(document.get(), &error));
+    EXPECT_EQ(error->documentName(), "broken");
+    EXPECT_EQ(error->mappingPlace().documentName, "main.xml");
+    EXPECT_EQ(error->mappingPlace().column, 10U);
+}
+
 TEST_F(MarshallingMapping, CollectsAllFaultsOfADocumentAndItsIncludesInOneRun) {
     repository->documents = {{"b", "\n<class name='B'><field name='f' lazy='no'/></class>"
                                    "<class name='A'/>"},
@@ -199,9 +240,11 @@ TEST_F(MarshallingMapping, CollectsAllFaultsOfADocumentAndItsIncludesInOneRun) {
     for (const QXXMLFinding& fault : mapping->faults())
         told += std::to_string(fault.fault->code()) + ' ' + fault.place.documentName.str() + ':' +
                 std::to_string(fault.place.line) +
-                (fault.includedFrom.empty() ? "\n" : " from 5\n");
+                (fault.includedFrom.empty()
+                     ? "\n"
+                     : " from " + std::to_string(fault.includedFrom.front().line) + '\n');
     EXPECT_EQ(told, "-202 :1\n-203 :2\n-201 :2\n-202 :3\n-203 :3\n-203 :3\n-219 :3\n"
-                    "68 :4\n-203 b:2 from 5\n-205 b:2 from 5\n");
+                    "68 broken:1 from 4\n-203 b:2 from 5\n-205 b:2 from 5\n");
     EXPECT_EQ(error->code(), -202);
     EXPECT_EQ(mapping->mappingForClassName("A")->fields().size(), 1U);
     EXPECT_FALSE(mapping->mappingForClassName("B")->copyWithZone()); // reports to nobody now

@@ -74,6 +74,18 @@ void addMapping(CLI::App& command, Options& options) {
         ->required();
 }
 
+void addMatching(CLI::App& command, Options& options) {
+    command
+        .add_option("--prefix", options.prefixes,
+                    "Match names by namespace: the mapping has this prefix, or none, for the "
+                    "namespace of that URI; may be given more than once")
+        ->option_text("[PREFIX]=URI")
+        ->allow_extra_args(false)
+        ->check(CLI::Validator(checkPrefix, ""));
+    command.add_flag("--match-namespaces", options.matchNamespaces,
+                     "The same for the namespaces that the class mappings declare");
+}
+
 void addReading(CLI::App& command, Options& options) {
     addMapping(command, options);
     command.add_option("DOCUMENT", options.document, "The path of a document; - is standard input")
@@ -87,15 +99,7 @@ void addReading(CLI::App& command, Options& options) {
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
                      "Do not write namespace declarations");
-    command
-        .add_option("--prefix", options.prefixes,
-                    "Match names by namespace: the mapping has this prefix, or none, for the "
-                    "namespace of that URI; may be given more than once")
-        ->option_text("[PREFIX]=URI")
-        ->allow_extra_args(false)
-        ->check(CLI::Validator(checkPrefix, ""));
-    command.add_flag("--match-namespaces", options.matchNamespaces,
-                     "The same for the namespaces that the class mappings declare");
+    addMatching(command, options);
     command.add_flag("--keep-white-space", options.keepWhiteSpace,
                      "Keep the white space between elements");
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
@@ -103,8 +107,33 @@ void addReading(CLI::App& command, Options& options) {
 
 void addChecking(CLI::App& command, Options& options) {
     addMapping(command, options);
-    command.add_flag("--notes", options.notes, "Print what is only worth a note, too");
+    command
+        .add_option("DOCUMENT", options.documents,
+                    "The paths of documents to try the mapping on; - is standard input")
+        ->option_text("...");
+    command
+        .add_option("--why", options.why,
+                    "Tell why this node of the last document is bound or not, and nothing else")
+        ->option_text("PATH");
+    command.add_flag("--notes", options.notes, "Print the notes on the mapping, too");
     command.add_flag("--json", options.json, "Print an array of findings as JSON");
+    command.add_flag("--discard-unknown", options.discardUnknown,
+                     "Do not keep XML that the mapping does not describe");
+    addMatching(command, options);
+    command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
+}
+
+// What is wrong with an assignment; nothing when it is empty.
+std::string checkAssignment(const std::string& assignment) {
+    const std::size_t equals = assignment.find('=');
+    if (equals == std::string::npos || equals == 0)
+        return "KEYPATH=VALUE is expected, not \"" + assignment + "\"";
+    return {};
+}
+
+void addSaving(CLI::App& command, Options& options) {
+    command.add_flag("--in-place", options.inPlace, "Write the document, and print nothing");
+    command.add_flag("--diff", options.diff, "Print the lines that change");
 }
 
 void addInferring(CLI::App& command, Options& options) {
@@ -156,10 +185,34 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     command->add_flag("--pretty", options.pretty, "Print one element a line");
     addSearch(*command, options);
 
-    command = add("check", "Tell what a mapping does that its author may not want", nullptr);
+    command = add("check",
+                  "Tell what a mapping does, by itself and to documents, that its "
+                  "author may not want",
+                  nullptr);
     command->callback(
         [&] { chosen = [&status](const Options& given) { return check(given, status); }; });
     addChecking(*command, options);
+    addSearch(*command, options);
+
+    command =
+        add("set", "Set values in a document by their key paths, and change nothing else", set);
+    addReading(*command, options);
+    command->add_option("ASSIGNMENT", options.assignments, "Key paths with their new values")
+        ->option_text("KEYPATH=VALUE...")
+        ->required()
+        ->check(CLI::Validator(checkAssignment, ""));
+    addSaving(*command, options);
+    addSearch(*command, options);
+
+    command =
+        add("update",
+            "Save an object into a document, as JSON like that of read, and change nothing else",
+            update);
+    addReading(*command, options);
+    command->add_option("OBJECT", options.object, "The path of the JSON; - is standard input")
+        ->option_text(" ")
+        ->required();
+    addSaving(*command, options);
     addSearch(*command, options);
 
     command = add("infer", "Print a mapping that fits documents which have none", infer);

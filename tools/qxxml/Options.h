@@ -12,7 +12,9 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
-    std::vector<std::string> documents; // what `infer` goes by
+    std::vector<std::string> documents;   // what `infer` and `check` go by
+    std::string object;                   // path of the JSON for `update`; "-" likewise
+    std::vector<std::string> assignments; // KEYPATH=VALUE each, for `set`
 
     bool strict = false;
     bool discardUnknown = false;
@@ -26,6 +28,9 @@ struct Options {
     bool matchNamespaces = false;
     bool json = false;
     bool notes = false;
+    std::string why; // the path of the node that `check` is asked about
+    bool inPlace = false;
+    bool diff = false;
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;

@@ -6,7 +6,9 @@
 #include "qxxml/Failure.h"
 
 #include <filesystem>
+#include <fstream>
 #include <iostream>
+#include <sstream>
 
 namespace qxxml {
 
@@ -49,13 +51,14 @@ qx::Ref<QXXMLMarshallingMapping> Session::resolveMapping(QXXMLMappingOptions opt
     options.includeFolder = folder.empty() ? "." : folder.string();
     auto mapping = QXXMLMarshallingMapping::initWithDocument(document.get(), options, &error);
     if (!mapping)
-        throw Failure(error, _repository->failedPath());
+        throw Failure(error, error->documentName().str());
     return mapping;
 }
 
-qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
+qx::Ref<QXXMLMarshaller> Session::makeMarshaller(qx::Ref<QXXMLMarshallingMapping> mapping) const {
     qx::Ref<qx::Error> error;
-    auto marshaller = QXXMLMarshaller::initWithMapping(resolveMapping());
+    auto marshaller = QXXMLMarshaller::initWithMapping(std::move(mapping));
+    marshaller->setParseOptions(parseOptions());
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);
@@ -88,6 +91,23 @@ void Session::readEach(QXXMLMarshaller& marshaller, const std::string& elementNa
     qx::Ref<qx::Error> error;
     if (!marshaller.unmarshallEach(path, elementName, visit, &error))
         throw Failure(error, file());
+}
+
+std::string Session::readBytes(QXXMLMarshaller& marshaller) const {
+    marshaller.setParseOptions(parseOptions());
+    std::ostringstream bytes;
+    std::ifstream document;
+    if (!isStandardInput())
+        document.open(_options.document, std::ios::binary);
+    std::istream& source = isStandardInput() ? std::cin : document;
+    if (source.peek() != std::istream::traits_type::eof())
+        bytes << source.rdbuf();
+    if (!isStandardInput() && bytes.str().empty()) {
+        qx::Ref<qx::Error> error; // why it cannot be read
+        qx::XMLDocument::initWithContentsOfFile(_options.document, {}, &error);
+        throw Failure(error, file());
+    }
+    return bytes.str();
 }
 
 qx::XMLParseOptions Session::parseOptions() const {

@@ -21,19 +21,25 @@ public:
     // The mapping document, whose own folder is searched last for includes, resolved. What the
     // options say of that folder is not looked at.
     qx::Ref<QXXMLMarshallingMapping> resolveMapping(QXXMLMappingOptions options = {}) const;
-    // Made from that.
-    qx::Ref<QXXMLMarshaller> makeMarshaller() const;
+    // Made from that, or from the one that is given.
+    qx::Ref<QXXMLMarshaller> makeMarshaller() const { return makeMarshaller(resolveMapping()); }
+    qx::Ref<QXXMLMarshaller> makeMarshaller(qx::Ref<QXXMLMarshallingMapping> mapping) const;
     // The object that the marshaller reads from the document; null where no class handles it.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
+
+    // The document's bytes; the marshaller parses them as the options say from here on.
+    std::string readBytes(QXXMLMarshaller& marshaller) const;
 
     // Calls visit(object) for each outermost element of that name.
     void readEach(QXXMLMarshaller& marshaller, const std::string& elementName,
                   const std::function<void(const qx::Ref<qx::Object>&)>& visit) const;
 
+    const Options& options() const noexcept { return _options; }
+    // The document as messages call it.
+    std::string file() const { return isStandardInput() ? "<stdin>" : _options.document; }
+
 private:
     qx::XMLParseOptions parseOptions() const;
-    // As messages call it.
-    std::string file() const { return isStandardInput() ? "<stdin>" : _options.document; }
     bool isStandardInput() const { return _options.document == "-"; }
 
     const Options& _options;

@@ -16,12 +16,4 @@ void ToolRepository::searchFirst(const std::vector<std::string>& folders) {
         searchPaths()->insert(position++, folder);
 }
 
-qx::Ref<qx::XMLDocument> ToolRepository::documentNamed(const qx::String& name, std::uint64_t* size,
-                                                       qx::Ref<qx::Error>* error) {
-    auto document = QXXMLFileSystemDataRepository::documentNamed(name, size, error);
-    if (error != nullptr && *error)
-        _failedPath = pathForResourceNamed(name).str();
-    return document;
-}
-
 } // namespace qxxml

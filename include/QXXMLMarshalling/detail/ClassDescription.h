@@ -4,6 +4,7 @@
 // captureless function pointer. Hosts use them through Class::define (Class.h).
 
 #include <QXXMLMarshalling/detail/TakeOver.h>
+#include <QXXMLMarshalling/detail/TakenTexts.h>
 #include <QXXMLMarshalling/model/Property.h>
 #include <QXXMLMarshalling/model/ValueTraits.h>
 
@@ -154,6 +155,7 @@ void describeGetter(Property& property) {
         property.lend = &lendMember<T, Member>;
     property.keepsZero = isOptional<V> || !std::derived_from<T, Object>;
     property.objects = takenObjects<V>();
+    property.texts = &takenTexts<V>;
 }
 
 template <class T, auto Member>
@@ -215,6 +217,7 @@ Property accessorProperty(std::string_view name) {
     if constexpr (std::is_arithmetic_v<V> || std::is_enum_v<V>)
         property.takeOver = &takeOverAccessors<T, Getter, Setter>;
     property.objects = takenObjects<SetterValue<Setter>>();
+    property.texts = &takenTexts<SetterValue<Setter>>;
     return property;
 }
 
@@ -251,6 +254,7 @@ Property boundProperty(std::string_view name, V (T::*getter)() const, void (T::*
     };
     property.keepsZero = isOptional<Stored<V>> || !std::derived_from<T, Object>;
     property.objects = takenObjects<Stored<V>>();
+    property.texts = &takenTexts<Stored<V>>;
     return property;
 }
 

@@ -15,6 +15,7 @@ namespace qx {
 namespace detail {
 class TakeOver;
 struct TakenObjects;
+struct TakenTexts;
 } // namespace detail
 
 // A property of instances. `get` and `set` are handed the property, for the members it stores.
@@ -36,6 +37,8 @@ struct Property {
     bool keepsZero = false;
     // Of which classes objects have to be; null for a property that takes no objects, or any.
     const detail::TakenObjects* objects = nullptr;
+    // The texts that its type takes; null where nothing is known of them.
+    detail::TakenTexts (*texts)() = nullptr;
     // Member function pointers that were only known at run time.
     Member getter{};
     Member setter{};
