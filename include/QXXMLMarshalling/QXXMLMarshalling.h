@@ -31,6 +31,7 @@
 #include <QXXMLMarshalling/base/Key.h>
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/base/String.h>
+#include <QXXMLMarshalling/files/FileWriting.h>
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/Log.h>
 #include <QXXMLMarshalling/host/ProcessInfo.h>

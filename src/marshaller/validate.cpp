@@ -110,7 +110,8 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     if (_reports.isOn())
         for (const Number node : unknown.firsts())
             _reports.tell(Reporting::Kind::unboundChild, _document, target.source.element(), node,
-                          &target.object, unknown.countOf(_document, node));
+                          &target.object, unknown.countOf(_document, node),
+                          _marshaller->saveUnknownXML());
     else if (hostHasLogWarning())
         logDebug("*** Warning: Unbound fields: %@", unknown.written());
     else
@@ -176,7 +177,7 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     else
         for (const Number node : unknown.firsts())
             _reports.tell(Reporting::Kind::unboundAttribute, _document, element, node,
-                          &target.object);
+                          &target.object, 1, _marshaller->saveUnknownXML());
     return !_marshaller->saveUnknownXML() || keepAttributes(target, *unknown.names(), error);
 }
 

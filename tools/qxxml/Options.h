@@ -25,6 +25,11 @@ struct Options {
     bool matchNamespaces = false;
     bool json = false;
     bool notes = false;
+    bool oneLine = false;
+    bool quiet = false;
+    bool verbose = false;
+    std::size_t errors = 1; // how many a reading collects
+    std::string output;     // the file for the result; empty for standard output
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;

@@ -4,6 +4,7 @@
 // for, and the marshaller that the options ask for. It sets up the process, so there is one.
 
 #include "qxxml/Options.h"
+#include "qxxml/Summary.h"
 #include "qxxml/ToolRepository.h"
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
@@ -16,14 +17,18 @@ class Session {
 public:
     // The options must outlive the session.
     explicit Session(const Options& options);
+    // Tells on the standard error what was passed over.
+    ~Session();
+    Session(const Session&) = delete;
+    Session& operator=(const Session&) = delete;
 
     ToolRepository& repository() const noexcept { return *_repository; }
     // The mapping document, whose own folder is searched last for includes, resolved. What the
     // options say of that folder is not looked at.
     qx::Ref<QXXMLMarshallingMapping> resolveMapping(QXXMLMappingOptions options = {}) const;
-    // Made from that.
+    // Made from that. It is used no longer than the session is there.
     qx::Ref<QXXMLMarshaller> makeMarshaller() const;
-    // The object that the marshaller reads from the document; null where no class handles it.
+    // The object that the marshaller reads from the document; never null.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
 
     // Calls visit(object) for each outermost element of that name.
@@ -37,6 +42,8 @@ private:
     bool isStandardInput() const { return _options.document == "-"; }
 
     const Options& _options;
+    // The summary is that of the marshallers' handlers.
+    const std::unique_ptr<Summary> _summary = std::make_unique<Summary>();
     qx::Ref<ToolRepository> _repository;
 };
 
