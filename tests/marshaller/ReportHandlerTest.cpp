@@ -68,8 +68,9 @@ TEST(ReportHandler, HearsOfAllThatNoFieldTakes) {
         Ref<Error> error;
         const Ref<Object> object = marshaller->readString(document, &error);
         ASSERT_TRUE(object) << error->report().view();
-        EXPECT_EQ(heard, saves ? std::regex_replace(
-                                     reading, std::regex("((child [xy]|attribute [aq] ).*)"), "$1 kept")
+        EXPECT_EQ(heard, saves ? std::regex_replace(reading,
+                                                    std::regex("((child [xy]|attribute [aq] ).*)"),
+                                                    "$1 kept")
                                : reading);
         heard.clear();
         EXPECT_FALSE(marshaller->writeString(object).isNull());
