@@ -1,11 +1,12 @@
-# The shared library, put together from one object library per folder of src/.
+# The library, put together from one object library per folder of src/.
 #
-# The folders are layers. Each is compiled once; the shared library takes all of them, and a test takes
+# The folders are layers. Each is compiled once; the library takes all of them, and a test takes
 # the folder it is about with the folders below it: a layer that calls upward does not link.
 
-find_package(LibXml2 REQUIRED)
-find_package(ICU REQUIRED COMPONENTS uc i18n)
-find_package(Threads REQUIRED)
+# Global: a project that takes this one in links them, too, where the library is static.
+find_package(LibXml2 REQUIRED GLOBAL)
+find_package(ICU REQUIRED COMPONENTS uc GLOBAL)
+find_package(Threads REQUIRED GLOBAL)
 
 # qx_read_layers(): QX_LAYERS, the folders from the ground up, and for each QX_BELOW_<folder>, the folders
 # that it may use, those that they use included.
@@ -38,8 +39,8 @@ target_compile_features(qx_headers INTERFACE cxx_std_20)
 
 # What linking the objects asks for, whoever links them.
 add_library(qx_dependencies INTERFACE)
-target_link_libraries(qx_dependencies INTERFACE
-    LibXml2::LibXml2 ICU::uc ICU::i18n Threads::Threads ${CMAKE_DL_LIBS})
+set(QX_DEPENDENCIES LibXml2::LibXml2 ICU::uc Threads::Threads ${CMAKE_DL_LIBS})
+target_link_libraries(qx_dependencies INTERFACE ${QX_DEPENDENCIES})
 
 file(GLOB_RECURSE qx_unclaimed RELATIVE "${PROJECT_SOURCE_DIR}/src" CONFIGURE_DEPENDS
     "${PROJECT_SOURCE_DIR}/src/*.cpp")
@@ -69,10 +70,26 @@ endif()
 if(TARGET qx_xml)
     target_link_libraries(qx_xml PRIVATE LibXml2::LibXml2)
 endif()
-if(TARGET qx_host AND QX_BUILD_TREE_SHARE)
-    target_compile_definitions(qx_host PRIVATE
-        QX_FRAMEWORK_SHARE_DIR="${PROJECT_SOURCE_DIR}/share")
-endif()
+
+# The translated texts, compiled in: see src/host/EmbeddedFiles.h. English needs none.
+file(GLOB texts RELATIVE "${PROJECT_SOURCE_DIR}/share" CONFIGURE_DEPENDS
+    "${PROJECT_SOURCE_DIR}/share/*.lproj/Localizable.strings")
+list(FILTER texts EXCLUDE REGEX "^en\\.lproj/")
+set(entries)
+foreach(name IN LISTS texts)
+    set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/share/${name}")
+    file(READ "${PROJECT_SOURCE_DIR}/share/${name}" text)
+    string(APPEND entries "    if (name == \"${name}\")\n        return R\"qx(${text})qx\";\n")
+endforeach()
+set(embedded "${PROJECT_BINARY_DIR}/generated/EmbeddedFiles.cpp")
+file(CONFIGURE OUTPUT "${embedded}" @ONLY CONTENT [==[
+#include "host/EmbeddedFiles.h"
+
+std::string_view qx::embeddedFile([[maybe_unused]] std::string_view name) {
+@entries@    return {};
+}
+]==])
+target_sources(qx_host PRIVATE "${embedded}")
 
 # qx_link_layers(TARGET LAYER...): links the objects of the given layers that have sources.
 function(qx_link_layers target)
@@ -90,25 +107,45 @@ if(NOT QX_BUILT_LAYERS)
     return()
 endif()
 
-add_library(QXXMLMarshalling SHARED)
+add_library(QXXMLMarshalling)
 add_library(QXXMLMarshalling::QXXMLMarshalling ALIAS QXXMLMarshalling)
 foreach(layer IN LISTS QX_BUILT_LAYERS)
     target_sources(QXXMLMarshalling PRIVATE $<TARGET_OBJECTS:qx_${layer}>)
 endforeach()
+# While the major number is 0, each minor version may break what was compiled with another.
+set(QX_SOVERSION ${PROJECT_VERSION_MAJOR})
+if(PROJECT_VERSION_MAJOR EQUAL 0)
+    set(QX_SOVERSION 0.${PROJECT_VERSION_MINOR})
+endif()
 set_target_properties(QXXMLMarshalling PROPERTIES
     LINKER_LANGUAGE CXX
     VERSION ${PROJECT_VERSION}
-    SOVERSION ${PROJECT_VERSION_MAJOR})
+    SOVERSION ${QX_SOVERSION})
 target_include_directories(QXXMLMarshalling INTERFACE
-    "$<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>"
-    "$<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>")
+    "$<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>")
 target_compile_features(QXXMLMarshalling INTERFACE cxx_std_20)
-target_link_libraries(QXXMLMarshalling PRIVATE $<BUILD_INTERFACE:qx_dependencies>)
-if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" OR NOT (QX_SANITIZE OR QX_SANITIZE_THREADS OR QX_FUZZ))
-    # Clang leaves its sanitizers' symbols to the program.
-    target_link_options(QXXMLMarshalling PRIVATE -Wl,-z,defs)
+target_link_libraries(QXXMLMarshalling PRIVATE ${QX_DEPENDENCIES})
+
+get_target_property(type QXXMLMarshalling TYPE)
+if(type STREQUAL "SHARED_LIBRARY")
+    set(QX_SHARED ON)
+    # Templates of the standard library stay our own: their visibility is not ours to set.
+    set(exports "${PROJECT_SOURCE_DIR}/cmake/exports.map")
+    target_link_options(QXXMLMarshalling PRIVATE "-Wl,--version-script,${exports}")
+    set_property(TARGET QXXMLMarshalling PROPERTY LINK_DEPENDS "${exports}")
+    if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" OR NOT (QX_SANITIZE OR QX_SANITIZE_THREADS OR QX_FUZZ))
+        # Clang leaves its sanitizers' symbols to the program.
+        target_link_options(QXXMLMarshalling PRIVATE -Wl,-z,defs)
+    endif()
+else()
+    set(QX_SHARED OFF)
+    # Nothing calls what translates and logs, it announces itself: programs ask for it by this name.
+    set(QX_STATIC_ANCHOR "-Wl,-u,qxHostServices")
+    target_link_options(QXXMLMarshalling INTERFACE "${QX_STATIC_ANCHOR}")
 endif()
 
-# <libdir>/../share/QXXMLMarshalling, as installed.
-file(MAKE_DIRECTORY "${CMAKE_BINARY_DIR}/share")
-file(CREATE_LINK "${PROJECT_SOURCE_DIR}/share" "${CMAKE_BINARY_DIR}/share/QXXMLMarshalling" SYMBOLIC)
+if(PROJECT_IS_TOP_LEVEL)
+    # <libdir>/../share/QXXMLMarshalling, as installed.
+    file(MAKE_DIRECTORY "${CMAKE_BINARY_DIR}/share")
+    file(CREATE_LINK "${PROJECT_SOURCE_DIR}/share" "${CMAKE_BINARY_DIR}/share/QXXMLMarshalling" SYMBOLIC)
+endif()

@@ -7,7 +7,7 @@ endif()
 
 # tools/qxxml: everything but main.cpp is an object library, so that tests reach it.
 file(GLOB_RECURSE sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/tools/qxxml/*.cpp")
-if(QX_BUILD_TOOLS AND sources)
+if(QX_WITH_TOOLS AND sources)
     find_package(CLI11 REQUIRED)
     find_package(nlohmann_json REQUIRED)
     set(main ${sources})
@@ -15,25 +15,29 @@ if(QX_BUILD_TOOLS AND sources)
     list(FILTER sources EXCLUDE REGEX "/main\\.cpp$")
     add_executable(qxxml ${main})
     target_include_directories(qxxml PRIVATE "${PROJECT_SOURCE_DIR}/tools")
-    target_compile_definitions(qxxml PRIVATE QX_VERSION="${PROJECT_VERSION}")
     target_link_libraries(qxxml PRIVATE
         QXXMLMarshalling qx_warnings CLI11::CLI11 nlohmann_json::nlohmann_json)
     if(sources)
         add_library(qx_tool OBJECT ${sources})
         target_include_directories(qx_tool PUBLIC "${PROJECT_SOURCE_DIR}/tools")
-        target_compile_definitions(qx_tool PRIVATE QX_VERSION="${PROJECT_VERSION}")
         target_link_libraries(qx_tool
             PUBLIC qx_headers CLI11::CLI11 nlohmann_json::nlohmann_json PRIVATE qx_warnings)
         target_link_libraries(qxxml PRIVATE qx_tool)
     endif()
-    set_target_properties(qxxml PROPERTIES
-        INSTALL_RPATH "$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+
+    # The tool prints its own manual page and completions.
+    if(NOT CMAKE_CROSSCOMPILING)
+        set(QX_TOOL_PAGES "${PROJECT_BINARY_DIR}/pages")
+        add_custom_command(TARGET qxxml POST_BUILD VERBATIM
+            COMMAND "${CMAKE_COMMAND}" "-DTOOL=$<TARGET_FILE:qxxml>" "-DFOLDER=${QX_TOOL_PAGES}"
+                -P "${PROJECT_SOURCE_DIR}/cmake/QxToolPages.cmake")
+    endif()
 endif()
 
 # examples/<name>/*.cpp -> example_<name>
 file(GLOB_RECURSE sources RELATIVE "${PROJECT_SOURCE_DIR}/examples" CONFIGURE_DEPENDS
     "${PROJECT_SOURCE_DIR}/examples/*.cpp")
-if(QX_BUILD_EXAMPLES)
+if(QX_WITH_EXAMPLES)
     add_custom_target(examples)
     if(TARGET qxxml)
         add_dependencies(examples qxxml) # demos call it too
@@ -53,9 +57,9 @@ if(QX_BUILD_EXAMPLES)
     endforeach()
 endif()
 
-# bench/*.cpp -> bench; figures of an unoptimised build mean nothing.
+# bench/*.cpp -> bench
 file(GLOB_RECURSE sources CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/bench/*.cpp")
-if(QX_BUILD_BENCH AND sources AND CMAKE_BUILD_TYPE MATCHES "^Rel")
+if(QX_WITH_BENCH AND sources)
     find_package(benchmark REQUIRED)
     # bench/peers_<peer>.cpp measures another library, where the machine has it.
     find_package(pugixml QUIET)

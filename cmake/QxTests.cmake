@@ -6,8 +6,8 @@
 # tests/checks/*.sh       -> scripts, called with the build folder and the source folder
 # examples/<name>/demo    -> run on this build, called with the build folder
 
-find_package(GTest REQUIRED)
 include(GoogleTest)
+find_package(GTest REQUIRED)
 
 # A script that lacks what it needs on this machine ends with 77.
 function(qx_add_script_test name label)
@@ -39,6 +39,9 @@ target_link_libraries(test_support PRIVATE qx_headers qx_warnings GTest::gtest)
 file(GLOB_RECURSE sources RELATIVE "${PROJECT_SOURCE_DIR}/tests" CONFIGURE_DEPENDS
     "${PROJECT_SOURCE_DIR}/tests/*.cpp")
 list(FILTER sources EXCLUDE REGEX "^(support|programs|checks|data)/")
+if(NOT QX_WITH_TOOLS)
+    list(FILTER sources EXCLUDE REGEX "^tools/")
+endif()
 set(test_targets)
 foreach(source IN LISTS sources)
     cmake_path(GET source PARENT_PATH folder)
@@ -104,7 +107,7 @@ if(TARGET QXXMLMarshalling)
         target_link_libraries(program_${name} PRIVATE LibXml2::LibXml2)
     endforeach()
 
-    if(QX_BUILD_EXAMPLES)
+    if(QX_WITH_EXAMPLES)
         file(GLOB demos CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/examples/*/demo")
         foreach(demo IN LISTS demos)
             cmake_path(GET demo PARENT_PATH folder)
@@ -120,3 +123,5 @@ foreach(check IN LISTS checks)
     qx_add_script_test(check_${name} checks
         bash "${check}" "${CMAKE_BINARY_DIR}" "${PROJECT_SOURCE_DIR}")
 endforeach()
+# It compiles the library once more.
+set_tests_properties(check_install PROPERTIES TIMEOUT 900)

@@ -1,5 +1,6 @@
-// Any document as a mapping: it is refused with an error, or resolves, twice alike, to classes that
-// are found under their names, and can be described.
+// Any document as a mapping: it is refused with an error, the first of all those that a check
+// finds, or resolves, twice alike, to classes that are found under their names, and can be
+// described.
 
 #include "Support.h"
 
@@ -26,8 +27,15 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     qx::Ref<qx::Error> secondError;
     const auto second = QXXMLMarshallingMapping::initWithDocument(document.get(), &secondError);
     fuzz::require(!mapping == !second, "a mapping resolves twice, or never");
+    const auto whole =
+        QXXMLMarshallingMapping::initWithDocument(document.get(), {.collectsFaults = true});
+    fuzz::require(whole && whole->faults().empty() == (mapping.get() != nullptr),
+                  "faults are collected where there are any");
+    fuzz::require(whole->check().size() >= whole->faults().size(), "a check tells all faults");
     if (!mapping) {
         fuzz::requireError(error);
+        fuzz::require(whole->faults().front().fault->description() == error->description(),
+                      "the first fault is the error of a mapping that collects none");
         fuzz::require(secondError && error->description() == secondError->description(),
                       "the error is the same each time");
         return 0;

@@ -24,7 +24,7 @@ struct QX_API QXXMLFinding {
     // What may have been meant, in a few words of English: did you mean "price"? Null where nothing
     // is near.
     qx::String suggestion;
-    // The element of the mapping, and the includes that led to its document, the nearest first.
+    // The element of the mapping, or of a document; the includes that led there, the nearest first.
     QXXMLMappingPlace place;
     std::vector<QXXMLMappingPlace> includedFrom;
     // The class and the field that it is about, by their "name"; null where it is about none.

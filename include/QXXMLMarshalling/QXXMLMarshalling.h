@@ -16,6 +16,7 @@
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
+#include <QXXMLMarshalling/QXXMLDocumentCheck.h>
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldValues.h>
@@ -31,6 +32,7 @@
 #include <QXXMLMarshalling/base/Key.h>
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/base/String.h>
+#include <QXXMLMarshalling/base/Version.h>
 #include <QXXMLMarshalling/files/FileWriting.h>
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/Log.h>

@@ -15,7 +15,6 @@
 namespace qx::detail {
 class ClassPlan;
 class IncludeLoader;
-class MappingCheck;
 class MappingPlan;
 } // namespace qx::detail
 
@@ -86,7 +85,6 @@ protected:
     const qx::Class& describedClass() const override;
 
 private:
-    friend class qx::detail::MappingCheck;
     friend class qx::detail::MappingPlan;
     friend qx::Ref<QXXMLMarshallingMapping> qx::make<QXXMLMarshallingMapping>();
 

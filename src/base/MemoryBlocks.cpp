@@ -9,15 +9,17 @@ namespace qx {
 namespace {
 
 // A host may keep a few of many objects, and one text of each document, but seldom a few nodes.
-constexpr std::size_t nodeBlockSize = 64 * 1024 - 64;
-constexpr std::size_t objectBlockSize = 8 * 1024 - 64;
-constexpr std::size_t textBlockSize = 1024 - 16;
+constexpr std::size_t smallestBlock = 512 - 16;
+constexpr std::size_t largestNodeBlock = 64 * 1024 - 64;
+constexpr std::size_t largestObjectBlock = 8 * 1024 - 64;
 
 // Without destructors, so that they can be used until the very end of the thread.
-[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks nodesOfThread(nodeBlockSize);
 [[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
-    objectsOfThread(objectBlockSize);
-[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks textsOfThread(textBlockSize);
+    nodesOfThread(smallestBlock, largestNodeBlock);
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
+    objectsOfThread(smallestBlock, largestObjectBlock);
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks textsOfThread(smallestBlock,
+                                                                                     smallestBlock);
 
 } // namespace
 
@@ -47,7 +49,9 @@ void MemoryBlocks::begin(std::size_t whole) {
     // So that what follows the address in front is aligned.
     constexpr std::size_t start = 2 * anyScalar - header;
     static_assert(start >= sizeof(Block));
-    const std::size_t size = hasRetired ? start + whole : std::max(_blockSize, start + whole);
+    const std::size_t usual = std::clamp(_sizeOfRun / 64, _smallest, _largest);
+    const std::size_t size = hasRetired ? start + whole : std::max(usual, start + whole);
+    _sizeOfRun += size;
     auto* const memory = static_cast<char*>(::operator new(size));
     _block = new (memory) Block{hasRetired ? 1 : reserve};
     _isReserved = !hasRetired;

@@ -15,8 +15,9 @@
 //    come to zero. Once the block is full, or its thread ends, the thread takes back what the
 //    reserve is more than the things that were cut: from then on `live` counts those alive.
 // 3. Whoever brings `live` to zero frees the block, be it a release or the retirement itself.
-// 4. One live thing keeps its whole block allocated: some hundred nodes, some dozen objects, a
-//    kilobyte of texts. So what lives differently long does not share blocks.
+// 4. One live thing keeps its whole block allocated. So what lives differently long does not share
+//    blocks, and those of objects and nodes are small at first: in a run of things that are made
+//    together a new one has at most a 64th of what the run took before.
 // 5. What is made while a thread ends, after its blocks were retired, gets a block for itself.
 // 6. Under the address sanitizer each thing has memory of its own, without an owner in front: only
 //    then does it see the use of what is dead.
@@ -43,7 +44,8 @@ class MemoryBlocks {
 public:
     static constexpr std::size_t anyScalar = __STDCPP_DEFAULT_NEW_ALIGNMENT__;
 
-    constexpr explicit MemoryBlocks(std::size_t blockSize) noexcept : _blockSize(blockSize) {}
+    constexpr MemoryBlocks(std::size_t smallest, std::size_t largest) noexcept
+        : _smallest(smallest), _largest(largest) {}
     MemoryBlocks(const MemoryBlocks&) = delete;
     MemoryBlocks& operator=(const MemoryBlocks&) = delete;
 
@@ -51,6 +53,8 @@ public:
     static MemoryBlocks& ofNodes() noexcept;
     static MemoryBlocks& ofTexts() noexcept;
     static MemoryBlocks& ofObjects() noexcept;
+
+    void beginRun() noexcept { _sizeOfRun = 0; }
 
     // Aligned like pointers, or for any scalar with a Unit of that size. Only small sizes are worth
     // a block: at most 4 KiB.
@@ -85,7 +89,9 @@ private:
     void retire() noexcept;
     static void giveUp(Block* block, std::uint32_t things) noexcept;
 
-    const std::size_t _blockSize;
+    const std::size_t _smallest;
+    const std::size_t _largest;
+    std::size_t _sizeOfRun = 0; // of its blocks together
     Block* _block = nullptr;
     bool _isReserved = false; // whether more than what is alive is counted for the block
     char* _next = nullptr;

@@ -15,7 +15,12 @@ constexpr std::size_t largestShare = 1024;
 
 } // namespace
 
-BulkObjects::BulkObjects() noexcept { ++bulks; }
+BulkObjects::BulkObjects() noexcept {
+    if (bulks++ == 0) {
+        MemoryBlocks::ofObjects().beginRun();
+        MemoryBlocks::ofNodes().beginRun();
+    }
+}
 BulkObjects::~BulkObjects() { --bulks; }
 
 namespace detail {

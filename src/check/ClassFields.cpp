@@ -29,16 +29,6 @@ bool holdsChildren(const ClassPlan& type) {
     });
 }
 
-// Objects that are flattened into a flattened one are left alone.
-bool flattenedTakesChild(const FieldPlan& field, const String& name) {
-    if (field.typeClass == nullptr)
-        return false;
-    const auto fields = fieldsAsRead(*field.typeClass);
-    return std::any_of(fields.begin(), fields.end(), [&](const ClassField& inner) {
-        return inner.field->kind != BindingKind::flattened && takesChild(*inner.field, name);
-    });
-}
-
 } // namespace
 
 std::vector<ClassField> fieldsAsRead(const ClassPlan& type) {
@@ -91,17 +81,31 @@ bool writesChildren(const FieldPlan& field) {
     return false;
 }
 
-bool takesChild(const FieldPlan& field, const String& name) {
-    if (!takesChildren(field))
-        return false;
-    if (field.kind == BindingKind::flattened && !field.isCollection())
-        return flattenedTakesChild(field, name);
-    if (field.bindings.empty())
-        return true;
-    return std::any_of(field.bindings.begin(), field.bindings.end(), [&](const auto& binding) {
-        const bool isAny = field.isCollection() && !field.hasType() && binding.bindTo.isEmpty();
-        return isAny || binding.name == name || (field.isCollection() && binding.location == name);
-    });
+// Objects that are flattened into a flattened one are left alone.
+bool addTakenChildren(const std::vector<ClassField>& fields, std::unordered_set<String>& names) {
+    for (const auto& [owner, field] : fields) {
+        if (field->kind == BindingKind::flattened && !field->isCollection()) {
+            if (field->typeClass == nullptr)
+                continue;
+            for (const auto& [inner, taken] : fieldsAsRead(*field->typeClass))
+                if (taken->kind != BindingKind::flattened && takesChildren(*taken))
+                    for (const BindingPlan& binding : taken->bindings)
+                        names.insert(binding.name);
+            continue;
+        }
+        if (!takesChildren(*field))
+            continue;
+        if (field->bindings.empty())
+            return false;
+        for (const BindingPlan& binding : field->bindings) {
+            if (field->isCollection() && !field->hasType() && binding.bindTo.isEmpty())
+                return false;
+            names.insert(binding.name);
+            if (field->isCollection())
+                names.insert(binding.location);
+        }
+    }
+    return true;
 }
 
 bool takesMappedChildren(const FieldPlan& field) {

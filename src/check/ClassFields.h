@@ -4,6 +4,8 @@
 
 #include "plan/ClassPlan.h"
 
+#include <unordered_set>
+
 namespace qx::detail {
 
 struct ClassField {
@@ -21,8 +23,8 @@ std::vector<ClassField> fieldsAsWritten(const ClassPlan& type);
 bool takesChildren(const FieldPlan& field);
 // Whether it may write some.
 bool writesChildren(const FieldPlan& field);
-// Whether it takes, or opens, children of that name.
-bool takesChild(const FieldPlan& field, const String& name);
+// The names of child elements that some of the fields take, or open; false where that may be any.
+bool addTakenChildren(const std::vector<ClassField>& fields, std::unordered_set<String>& names);
 // Whether it takes children that a class maps to by their name.
 bool takesMappedChildren(const FieldPlan& field);
 

@@ -184,37 +184,38 @@ inline constexpr FindingText valueNotTaken(
 
 // What documents have, and what writing them again gives. A count comes last.
 inline constexpr FindingText unboundElement("unbound", warning,
-                                            "No field took the element %@ in %@: %@ times");
+                                            "No field took the element %@ in %@, %@ in all");
 inline constexpr FindingText unboundAttribute("unbound", warning,
-                                              "No field took the attribute %@ of %@: %@ times");
+                                              "No field took the attribute %@ of %@, %@ in all");
 inline constexpr FindingText
     elementInWrapper("dropped", warning,
-                     "The element %@ in the wrapper %@ is no item and is dropped: %@ times");
+                     "The element %@ in the wrapper %@ is no item and is dropped, %@ in all");
 inline constexpr FindingText
     attributeOfWrapper("dropped", warning,
-                       "The attribute %@ of the wrapper %@ is dropped: %@ times");
+                       "The attribute %@ of the wrapper %@ is dropped, %@ in all");
 inline constexpr FindingText
-    elementInText("dropped", warning, "Of the element %@ in %@ only the text is kept: %@ times");
+    elementInText("dropped", warning, "Of the element %@ in %@ only the text is kept, %@ in all");
 inline constexpr FindingText attributeOfText(
     "dropped", warning,
-    "The attribute %@ of %@, of which only the text is taken, is dropped: %@ times");
-inline constexpr FindingText unboundText("dropped", warning, "Text in %@ is dropped: %@ times");
+    "The attribute %@ of %@, of which only the text is taken, is dropped, %@ in all");
+inline constexpr FindingText unboundText("dropped", warning, "Text in %@ is dropped, %@ in all");
 inline constexpr FindingText unknownRoot("unknown-root", error,
-                                         "No class maps to the root element %@: %@ documents");
+                                         "No class maps to the root element %@, %@ in all");
 inline constexpr FindingText fieldNeverFound("never-found", note,
                                              "The field was found in none of %@ objects");
 inline constexpr FindingText notWritten("not-written", error,
-                                        "What was read cannot be written: %@ (%@ documents)");
+                                        "What was read cannot be written: %@ (%@ in all)");
 inline constexpr FindingText lostInWriting("round-trip", warning,
-                                           "Written again, %@ is lost: %@ times");
+                                           "Written again, %@ is lost, %@ in all");
 inline constexpr FindingText changedInWriting("round-trip", warning,
-                                              "Written again, %@ has another text: %@ times");
+                                              "Written again, %@ has another text, %@ in all");
 inline constexpr FindingText addedInWriting("round-trip", warning,
-                                            "Written again, there is one more %@: %@ times");
+                                            "Written again, there is one more %@, %@ in all");
 inline constexpr FindingText
     movedInWriting("round-trip", note,
-                   "Written again, %@ stands elsewhere among its siblings: %@ times");
-inline constexpr FindingText remarksLost("round-trip", note, "Written again, %@ is lost: %@ times");
+                   "Written again, %@ stands elsewhere among its siblings, %@ in all");
+inline constexpr FindingText remarksLost("round-trip", note,
+                                         "Written again, %@ is lost, %@ in all");
 
 // Why a node is bound or not.
 inline constexpr FindingText becameObject("why", note, "it became an object of the class %@ (%@)");
@@ -246,7 +247,7 @@ inline constexpr FindingText noClassForRoot("why", note, "no class maps to the r
 
 } // namespace findings
 
-// The suggestion of a name, or of name="value"; null for null.
+// The suggestion of a name, or of an attribute with its value; null for null.
 String suggestionOf(const String& meant);
 
 } // namespace qx::detail

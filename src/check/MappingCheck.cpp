@@ -45,7 +45,7 @@ Subject Subject::of(const QXXMLFieldMapping& field, const QXXMLBindToMapping& bi
 MappingCheck::MappingCheck(const QXXMLMarshallingMapping& mapping)
     : _mapping(mapping), _plan(MappingPlan::of(&mapping)), _findings(mapping.faults()) {
     _documents.push_back(mapping.mapping());
-    for (const auto& included : mapping._includes->included())
+    for (const auto& included : includes().included())
         _documents.push_back(included.get());
     // A class whose name is taken has no plan.
     for (const auto& type : mapping.mapping()->classMappings())

@@ -43,7 +43,7 @@ public:
 
     // What the rules ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
-    const IncludeLoader& includes() const noexcept { return *_mapping._includes; }
+    const IncludeLoader& includes() const { return MappingPlan::includesOf(_mapping); }
     const std::vector<const QXXMLDocumentMapping*>& documents() const { return _documents; }
     const std::vector<const ClassPlan*>& classes() const noexcept { return _classes; }
     bool hasFaults() const noexcept { return !_mapping.faults().empty(); }

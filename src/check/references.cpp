@@ -57,7 +57,7 @@ void checkExtends(MappingCheck& check, const ClassPlan& type) {
 // ancestors' among them.
 class FlattenedRings {
 public:
-    explicit FlattenedRings(const MappingCheck& check) : _states(check.classes().size() + 1) {
+    explicit FlattenedRings(const MappingCheck& check) : _states(check.plan().classCount()) {
         for (const ClassPlan* type : check.classes())
             visit(*type);
     }
@@ -90,7 +90,7 @@ private:
         }
     }
     void open(const ClassPlan& type, std::vector<Step>& steps) {
-        if (type.index >= _states.size() || state(type) != State::unseen)
+        if (state(type) != State::unseen)
             return;
         state(type) = State::open;
         Step step{&type, {}};

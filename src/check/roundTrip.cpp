@@ -25,6 +25,13 @@ public:
         : _check(check), _type(type), _fields(fieldsAsRead(type)) {
         const Class* const described = Class::named(type.classNameToInstantiate.view());
         _keepsZero = described != nullptr && described->isStruct();
+        _takesAny = !addTakenChildren(_fields, _taken);
+        constexpr std::size_t enough = 2; // to find one beside a given one
+        for (const auto& [owner, field] : _fields) {
+            _takers += takesChildren(*field) ? 1 : 0;
+            if (_mapped.size() < enough && takesMappedChildren(*field))
+                _mapped.push_back(field);
+        }
     }
 
     void run() {
@@ -46,12 +53,11 @@ private:
     void checkUntyped(const FieldPlan& field);
     void checkTexts();
 
-    // Another field of which that is true; null where there is none.
-    template <class Condition>
-    const FieldPlan* other(const FieldPlan& than, Condition condition) const {
-        for (const ClassField& field : _fields)
-            if (field.field != &than && condition(*field.field))
-                return field.field;
+    // Another field that takes children that a class maps to; null where there is none.
+    const FieldPlan* otherMapped(const FieldPlan& than) const {
+        for (const FieldPlan* field : _mapped)
+            if (field != &than)
+                return field;
         return nullptr;
     }
     static Subject of(const FieldPlan& field) {
@@ -64,6 +70,12 @@ private:
     const ClassPlan& _type;
     const std::vector<ClassField> _fields;
     bool _keepsZero;
+    // Of all fields: the names of children that are taken, how many fields take some, and the first
+    // of those that take children which a class maps to.
+    std::unordered_set<String> _taken;
+    bool _takesAny;
+    std::size_t _takers = 0;
+    std::vector<const FieldPlan*> _mapped;
 };
 
 void RoundTripCheck::checkSingle(const FieldPlan& field) {
@@ -85,8 +97,7 @@ void RoundTripCheck::checkSingle(const FieldPlan& field) {
 
 void RoundTripCheck::checkAttribute(const FieldPlan& field) {
     const String& location = field.location();
-    const auto takesIt = [&](const FieldPlan& other) { return takesChild(other, location); };
-    if (isXMLName(location) && other(field, takesIt) == nullptr)
+    if (isXMLName(location) && !_takesAny && !_taken.contains(location))
         _check.add(findings::locationKept, of(field), location);
     const bool isNumber = field.valueType == ValueType::integer;
     if ((isNumber || field.valueType == ValueType::boolean) && !field.isRequired && !_keepsZero)
@@ -102,7 +113,7 @@ void RoundTripCheck::checkElement(const FieldPlan& field) {
 }
 
 void RoundTripCheck::checkFlattened(const FieldPlan& field) {
-    if (field.typeClass != nullptr && other(field, takesChildren) != nullptr)
+    if (field.typeClass != nullptr && _takers > 1)
         _check.add(findings::flattenedKeeps, of(field));
 }
 
@@ -116,7 +127,7 @@ void RoundTripCheck::checkCollection(const FieldPlan& field) {
 }
 
 void RoundTripCheck::checkUntyped(const FieldPlan& field) {
-    const FieldPlan* const taken = other(field, takesMappedChildren);
+    const FieldPlan* const taken = otherMapped(field);
     if (field.bindTo().isEmpty()) {
         if (taken != nullptr)
             _check.add(findings::takesChildrenOf, of(field), taken->key.string());

@@ -23,14 +23,20 @@ struct OpenBundles {
     Ref<Bundle> main;                 // set by the host
 };
 
-// The resources of a program or library that lies in `folder`: <folder>/../share/<name>. Null when
-// there is no such folder.
+// The resources of a program or library that lies in `folder`: <folder>/../share/<name>; for
+// lib/x86_64-linux-gnu and the like, the share beside lib. Null when there is no such folder.
 String sharedFolder(const String& folder, std::string_view name) {
     if (folder.isNull())
         return nullptr;
-    const String share = appendingPathComponent(directoryOf(folder), "share");
-    const String path = appendingPathComponent(share, name);
-    return isDirectory(path) ? path : String();
+    const auto below = [name](const String& prefix) {
+        const String path = appendingPathComponent(appendingPathComponent(prefix, "share"), name);
+        return isDirectory(path) ? path : String();
+    };
+    const String parent = directoryOf(folder);
+    String found = below(parent);
+    if (found.isNull() && parent.view().ends_with("/lib"))
+        found = below(directoryOf(parent));
+    return found;
 }
 
 // Null where the program's file cannot be told.
@@ -54,13 +60,7 @@ String findFrameworkFolder() {
     const String file = sharedObjectHolding(&anchor);
     String folder = file.isNull() ? folderOfProgram() : String(directoryOf(file));
     String installed = sharedFolder(folder, frameworkName);
-    if (!installed.isNull())
-        return installed;
-#ifdef QX_FRAMEWORK_SHARE_DIR
-    if (isDirectory(QX_FRAMEWORK_SHARE_DIR))
-        return QX_FRAMEWORK_SHARE_DIR;
-#endif
-    return folder;
+    return installed.isNull() ? folder : installed;
 }
 
 // Looked for once: the library does not move.

@@ -2,6 +2,7 @@
 
 #include "base/Immortal.h"
 #include "files/Files.h"
+#include "host/EmbeddedFiles.h"
 #include "host/LoadedFile.h"
 #include "host/Log.h"
 #include "host/StringsFile.h"
@@ -45,9 +46,19 @@ struct Language {
     std::vector<Value> problems;
 };
 
-// Adds the texts of a file, in place of those that are there.
+// Adds texts in place of those that are there.
+void replaceTexts(StringsFile::Texts texts, Language& language) {
+    texts.merge(language.texts);
+    std::swap(texts, language.texts);
+}
+
+// Adds the texts of a file. The library's own come before those of its files: a file that is
+// missing or older leaves them.
 void readStrings(std::string_view name, Language& language) {
-    const String path = String::concat({language.folder, "/", name, ".lproj/Localizable.strings"});
+    const String file = String::concat({name, ".lproj/Localizable.strings"});
+    if (language.folder == frameworkFolder())
+        replaceTexts(parseStrings(embeddedFile(file)).texts, language);
+    const String path = String::concat({language.folder, "/", file});
     if (!fileExists(path))
         return;
     Ref<Error> error;
@@ -56,10 +67,9 @@ void readStrings(std::string_view name, Language& language) {
         language.problems.emplace_back(error);
         return;
     }
-    StringsFile file = parseStrings(data->view());
-    file.texts.merge(language.texts);
-    std::swap(file.texts, language.texts);
-    for (const std::size_t line : file.faultyLines)
+    StringsFile texts = parseStrings(data->view());
+    replaceTexts(std::move(texts.texts), language);
+    for (const std::size_t line : texts.faultyLines)
         language.problems.emplace_back(String::concat(
             {"Unable to read the text in line ", std::to_string(line), " of ", path}));
 }
@@ -136,3 +146,7 @@ String frameworkText(std::string_view englishText) {
 } // namespace
 
 } // namespace qx
+
+// What a program that is linked with the static library asks for, so that this file is linked, too.
+extern "C" const char qxHostServices;
+const char qxHostServices = 0;

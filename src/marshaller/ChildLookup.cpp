@@ -101,7 +101,7 @@ std::vector<ChildLookup::Number> ChildLookup::all() const {
     return numbers;
 }
 
-String ChildLookup::stringValue() const {
+Value ChildLookup::stringValue() const {
     if (_isWhole)
         return _document.text(_element);
     std::string text;

@@ -62,8 +62,8 @@ public:
                 visit(child.number);
     }
 
-    // The text of the children, concatenated.
-    String stringValue() const;
+    // The text of the children, concatenated: see IndexedXML::text.
+    Value stringValue() const;
 
     // Takes the child, the first of its name, out: of the copy, else of the element itself.
     void take(Number child);

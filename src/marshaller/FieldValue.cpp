@@ -1,6 +1,7 @@
 #include "marshaller/FieldValue.h"
 
 #include "base/Scan.h"
+#include "base/Unicode.h"
 #include "host/Log.h"
 #include "marshaller/ObjectAccess.h"
 #include "model/Errors.h"
@@ -11,13 +12,14 @@ namespace qx::detail {
 
 namespace {
 
-Value booleanOf(const String& text) {
-    return text.equalsIgnoringCase("true") || text.equalsIgnoringCase("yes") || text == "1";
+Value booleanOf(std::string_view text) {
+    return unicode::equalIgnoringCase(text, "true") || unicode::equalIgnoringCase(text, "yes") ||
+           text == "1";
 }
 
 // Null with -221 where there is no integer.
-Value integerOf(const FieldPlan& field, const String& text, Ref<Error>* error) {
-    if (const auto integer = scanInteger(text))
+Value integerOf(const FieldPlan& field, const Value& text, Ref<Error>* error) {
+    if (const auto integer = scanInteger(text.view()))
         return *integer;
     logWarningOrLine(errors::notAnInteger.message, field.xmlName(), text);
     fail(error, errors::notAnInteger, field.xmlName(), text);
@@ -31,19 +33,18 @@ bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref
         field.valueType == ValueType::boolean || field.valueType == ValueType::integer;
     if (!value.isString() || !isConverted)
         return ObjectAccess::set(object, key, std::move(value), error);
-    const String text = value.string();
     if (field.valueType == ValueType::boolean)
-        return ObjectAccess::set(object, key, booleanOf(text), error);
-    if (text.isEmpty())
+        return ObjectAccess::set(object, key, booleanOf(value.view()), error);
+    if (value.view().empty())
         return ObjectAccess::set(object, key, nullptr, error);
-    Value integer = integerOf(field, text, error);
+    Value integer = integerOf(field, value, error);
     return !integer.isNull() && ObjectAccess::set(object, key, std::move(integer), error);
 }
 
-Value itemOf(const FieldPlan& field, const String& text, Ref<Error>* error) {
+Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error) {
     switch (field.valueType) {
     case ValueType::boolean:
-        return booleanOf(text);
+        return booleanOf(text.view());
     case ValueType::integer:
         return integerOf(field, text, error);
     default:

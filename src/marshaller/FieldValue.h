@@ -18,7 +18,7 @@ namespace qx::detail {
 bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error);
 
 // The text as an item of a collection of a simple type; null with -221 as above.
-Value itemOf(const FieldPlan& field, const String& text, Ref<Error>* error);
+Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error);
 
 // The text under which a value is written: "true" or "false" for a boolean field, else the value's
 // description. It needs the value as long as it is used.

@@ -14,6 +14,7 @@ namespace {
 
 constexpr int missing = -202;
 constexpr int noClassOfType = -207;
+constexpr int unknownCollection = -208;
 constexpr int severalChildren = -210;
 constexpr int noClass = -211;
 constexpr int unknownChildren = -214;
@@ -103,6 +104,13 @@ String nearestClass(const Failed& failed, const String& wanted) {
     return nearest.empty() ? String() : String("did you mean class " + quoted(nearest) + "?");
 }
 
+String forUnknownCollection(const Failed& failed) {
+    constexpr std::string_view words[] = {"array", "vector", "collection", "set"};
+    const std::string nearest(
+        failed.field != nullptr ? nearestName(failed.field->collection().view(), words) : "");
+    return nearest.empty() ? String() : String("did you mean " + quoted(nearest) + "?");
+}
+
 // The first that is not there of the classes that the class of the object extends.
 String forMissingAncestor(const Failed& failed) {
     const QXXMLClassMapping* mapping = failed.classOfObject;
@@ -188,6 +196,8 @@ String suggestionFor(const Failed& failed) {
         return forMissing(failed);
     case noClassOfType:
         return failed.field != nullptr ? nearestClass(failed, failed.field->type()) : String();
+    case unknownCollection:
+        return forUnknownCollection(failed);
     case severalChildren:
         return "collection=\"array\" takes several";
     case noClass:

@@ -13,8 +13,7 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, ChildLookup& sourc
     const ClassPlan* plan = reading.classForElement(source.element());
     if (plan != nullptr)
         return reading.build(*plan, source, false, error);
-    return reading.budget().takeText(source.element(), error) ? Value(source.stringValue())
-                                                              : Value();
+    return reading.budget().takeText(source.element(), error) ? source.stringValue() : Value();
 }
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,

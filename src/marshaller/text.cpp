@@ -32,12 +32,12 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
     const bool isChild = holder != source.element();
     if (isChild && reading.reports().isOn())
         reading.reports().tellInside(reading.document(), holder, &target.object);
-    const String text = isChild ? reading.document().text(holder) : source.stringValue();
+    Value text = isChild ? reading.document().text(holder) : source.stringValue();
     if (ReadingTrace* const trace = reading.trace(); trace != nullptr)
         trace->take(isChild ? ReadingTrace::Form::child : ReadingTrace::Form::text, field, holder,
                     number);
-    if (!text.isEmpty())
-        return takeValue(target.object, field, field.key, text, error);
+    if (!text.view().empty())
+        return takeValue(target.object, field, field.key, std::move(text), error);
     if (field.isRequired)
         return fail(error, errors::requiredTextMissing, field.key.string(),
                     reading.quoted(source.element()));

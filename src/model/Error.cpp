@@ -37,7 +37,7 @@ Error::~Error() = default;
 String Error::domain() const { return _domain; }
 
 String Error::localizedDescription() const {
-    return _text != nullptr ? format(localizedText(_text->message), _arguments) : _message;
+    return _text != nullptr ? qx::format(localizedText(_text->message), _arguments) : _message;
 }
 
 String Error::localizedFailureReason() const {

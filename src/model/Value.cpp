@@ -12,34 +12,39 @@
 
 namespace qx {
 
-Value::Value(String&& text) noexcept : _kind(text.isNull() ? Kind::null : Kind::string) {
-    _payload.text = std::move(text).detach();
+Value::Value(String&& text) noexcept : _cell(text.isNull() ? Kind::null : Kind::string) {
+    _cell.word.text = std::move(text).detach();
 }
 
-Value::Value(const Object* object) noexcept : _kind(object != nullptr ? Kind::object : Kind::null) {
+Value::Value(const Object* object) noexcept : _cell(object != nullptr ? Kind::object : Kind::null) {
     if (object != nullptr)
         object->retain();
-    _payload.object = const_cast<Object*>(object);
+    _cell.word.object = const_cast<Object*>(object);
 }
 
-Value::Value(const Value& other) noexcept : _payload(other._payload), _kind(other._kind) {
-    if (_kind == Kind::object)
-        _payload.object->retain();
-    else if (_kind == Kind::string)
-        _payload.text = other.string().detach();
-}
-
-void Value::releasePayload() noexcept {
-    if (_kind == Kind::object) {
-        _payload.object->release();
-    } else if (_kind == Kind::string) {
-        String::adopt(_payload.text);
-        _kind = Kind::null;
+// The cell is the other's already.
+void Value::share(const Value& other) {
+    if (isObject()) {
+        _cell.word.object->retain();
+    } else if (_cell.word.form == Form::counted) {
+        _cell.word.text = String::shared(_cell.word.text).detach();
+    } else if (_cell.word.form == Form::lent) {
+        _cell = Cell(Kind::null);
+        *this = Value(other.view());
     }
 }
 
-String Value::string() const noexcept {
-    return isString() ? String::shared(_payload.text) : String();
+void Value::releaseCounted() noexcept {
+    if (isObject())
+        _cell.word.object->release();
+    else
+        String::adopt(_cell.word.text);
+}
+
+String Value::string() const {
+    if (!isString())
+        return {};
+    return _cell.word.form == Form::counted ? String::shared(_cell.word.text) : String(view());
 }
 
 bool Value::isNullOrMarker() const noexcept { return isNull() || object() == Null::marker(); }
@@ -78,33 +83,33 @@ bool equal(std::int64_t integer, double real) {
 } // namespace
 
 bool Value::boolValue() const noexcept {
-    switch (_kind) {
+    switch (kind()) {
     case Kind::null:
         return false;
     case Kind::boolean:
-        return _payload.boolean;
+        return _cell.word.boolean;
     case Kind::integer:
-        return _payload.integer != 0;
+        return _cell.word.integer != 0;
     case Kind::real:
-        return _payload.real != 0;
+        return _cell.word.real != 0;
     case Kind::string:
-        return textIsTrue(_payload.text->view());
+        return textIsTrue(view());
     case Kind::object:
-        return _payload.object != Null::marker();
+        return _cell.word.object != Null::marker();
     }
     return false;
 }
 
 std::int64_t Value::intValue() const noexcept {
-    switch (_kind) {
+    switch (kind()) {
     case Kind::boolean:
-        return _payload.boolean ? 1 : 0;
+        return _cell.word.boolean ? 1 : 0;
     case Kind::integer:
-        return _payload.integer;
+        return _cell.word.integer;
     case Kind::real:
-        return saturated(_payload.real);
+        return saturated(_cell.word.real);
     case Kind::string:
-        return scanInteger(_payload.text->view()).value_or(0);
+        return scanInteger(view()).value_or(0);
     case Kind::null:
     case Kind::object:
         return 0;
@@ -113,15 +118,15 @@ std::int64_t Value::intValue() const noexcept {
 }
 
 double Value::doubleValue() const noexcept {
-    switch (_kind) {
+    switch (kind()) {
     case Kind::boolean:
-        return _payload.boolean ? 1 : 0;
+        return _cell.word.boolean ? 1 : 0;
     case Kind::integer:
-        return static_cast<double>(_payload.integer);
+        return static_cast<double>(_cell.word.integer);
     case Kind::real:
-        return _payload.real;
+        return _cell.word.real;
     case Kind::string:
-        return scanReal(_payload.text->view()).value_or(0);
+        return scanReal(view()).value_or(0);
     case Kind::null:
     case Kind::object:
         return 0;
@@ -130,46 +135,46 @@ double Value::doubleValue() const noexcept {
 }
 
 String Value::description() const {
-    switch (_kind) {
+    switch (kind()) {
     case Kind::null:
         return "(null)";
     case Kind::boolean:
-        return _payload.boolean ? "1" : "0";
+        return _cell.word.boolean ? "1" : "0";
     case Kind::integer:
-        return std::to_string(_payload.integer);
+        return std::to_string(_cell.word.integer);
     case Kind::real:
-        return describeReal(_payload.real);
+        return describeReal(_cell.word.real);
     case Kind::string:
         return string();
     case Kind::object:
-        return _payload.object->description();
+        return _cell.word.object->description();
     }
     return {};
 }
 
 String Value::descriptionWithLocale(const Object* locale, std::size_t indent) const {
-    return isObject() ? _payload.object->descriptionWithLocale(locale, indent) : description();
+    return isObject() ? _cell.word.object->descriptionWithLocale(locale, indent) : description();
 }
 
 bool Value::isEqual(const Value& other) const {
     if (isNumber() && other.isNumber()) {
-        const bool realHere = _kind == Kind::real;
-        const bool realThere = other._kind == Kind::real;
+        const bool realHere = kind() == Kind::real;
+        const bool realThere = other.kind() == Kind::real;
         if (realHere && realThere)
-            return _payload.real == other._payload.real;
+            return _cell.word.real == other._cell.word.real;
         if (realHere)
-            return equal(other.intValue(), _payload.real);
+            return equal(other.intValue(), _cell.word.real);
         if (realThere)
-            return equal(intValue(), other._payload.real);
+            return equal(intValue(), other._cell.word.real);
         return intValue() == other.intValue();
     }
-    if (_kind != other._kind)
+    if (kind() != other.kind())
         return false;
-    if (_kind == Kind::string)
-        return _payload.text->view() == other._payload.text->view();
-    if (_kind == Kind::object)
-        return _payload.object == other._payload.object ||
-               _payload.object->isEqual(*other._payload.object);
+    if (kind() == Kind::string)
+        return view() == other.view();
+    if (kind() == Kind::object)
+        return _cell.word.object == other._cell.word.object ||
+               _cell.word.object->isEqual(*other._cell.word.object);
     return true;
 }
 
@@ -197,37 +202,38 @@ std::weak_ordering order(std::int64_t integer, double real) {
 
 std::weak_ordering Value::compare(const Value& other) const noexcept {
     if (isNumber() && other.isNumber()) {
-        if (_kind == Kind::real)
-            return other._kind == Kind::real ? orderOfReals(_payload.real, other._payload.real)
-                                             : 0 <=> order(other.intValue(), _payload.real);
-        return other._kind == Kind::real ? order(intValue(), other._payload.real)
-                                         : intValue() <=> other.intValue();
+        if (kind() == Kind::real)
+            return other.kind() == Kind::real ? orderOfReals(_cell.word.real, other._cell.word.real)
+                                              : 0 <=> order(other.intValue(), _cell.word.real);
+        return other.kind() == Kind::real ? order(intValue(), other._cell.word.real)
+                                          : intValue() <=> other.intValue();
     }
     if (isString() && other.isString())
         return view() <=> other.view();
     // Booleans, integers and doubles have one place among the kinds.
     const auto place = [](const Value& value) {
-        return value.isNumber() ? Kind::real : value._kind;
+        return value.isNumber() ? Kind::real : value.kind();
     };
     return place(*this) <=> place(other);
 }
 
 bool Value::isSameAs(const Value& other) const noexcept {
-    if (_kind != other._kind)
+    if (kind() != other.kind() || _cell.word.form != other._cell.word.form)
         return false;
-    switch (_kind) {
+    switch (kind()) {
     case Kind::null:
         return true;
     case Kind::boolean:
-        return _payload.boolean == other._payload.boolean;
+        return _cell.word.boolean == other._cell.word.boolean;
     case Kind::integer:
-        return _payload.integer == other._payload.integer;
+        return _cell.word.integer == other._cell.word.integer;
     case Kind::real:
-        return _payload.real == other._payload.real;
+        return _cell.word.real == other._cell.word.real;
     case Kind::string:
-        return _payload.text == other._payload.text;
+        return _cell.word.form >= Form::inside ? view() == other.view()
+                                               : view().data() == other.view().data();
     case Kind::object:
-        return _payload.object == other._payload.object;
+        return _cell.word.object == other._cell.word.object;
     }
     return false;
 }
@@ -236,7 +242,7 @@ bool Value::isSameAs(const Value& other) const noexcept {
 String Value::classNameForMarshalling() const {
     static const Key number("<number>");
     static const Key text("<string>");
-    switch (_kind) {
+    switch (kind()) {
     case Kind::null:
         return {};
     case Kind::boolean:
@@ -246,7 +252,7 @@ String Value::classNameForMarshalling() const {
     case Kind::string:
         return text;
     case Kind::object:
-        return _payload.object->classNameForMarshalling();
+        return _cell.word.object->classNameForMarshalling();
     }
     return {};
 }

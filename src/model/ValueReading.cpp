@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/detail/ValueReading.h>
 
 #include "base/Base64.h"
+#include "base/Unicode.h"
 #include "base/WhiteSpace.h"
 
 #include <charconv>
@@ -36,12 +37,14 @@ bool readBoolean(const Value& value, bool& result) {
         result = value.boolValue();
         return true;
     }
-    const String text = value.string();
+    if (!value.isString())
+        return false;
+    const std::string_view text = value.view();
     for (const auto* yes : {"true", "yes", "1"})
-        if (text.equalsIgnoringCase(yes))
+        if (unicode::equalIgnoringCase(text, yes))
             return result = true;
     for (const auto* no : {"false", "no", "0"}) {
-        if (text.equalsIgnoringCase(no)) {
+        if (unicode::equalIgnoringCase(text, no)) {
             result = false;
             return true;
         }
@@ -104,7 +107,7 @@ bool readText(const Value& value, String& result) {
 bool readBytes(const Value& value, std::vector<std::byte>& result) {
     if (!value.isString())
         return false;
-    const auto bytes = decodeBase64(value.string());
+    const auto bytes = decodeBase64(value.view());
     if (!bytes)
         return false;
     const auto* first = reinterpret_cast<const std::byte*>(bytes->data());

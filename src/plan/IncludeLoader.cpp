@@ -25,15 +25,9 @@ constexpr std::size_t mostIncludes = 10'000;
 } // namespace
 
 bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
-    if (!loadWithIncludes(document, error))
-        return false;
-    const MappingSource& source = MappingSource::of(document);
-    if (source.collectsFaults())
-        _classes.forEachRepeated([](const QXXMLClassMapping& mapping, Ref<Error> fault) {
-            MappingSource::of(mapping).addFault(std::move(fault));
-        });
+    const bool isLoaded = loadWithIncludes(document, error);
     _classes = {};
-    return true;
+    return isLoaded;
 }
 
 // A document's classes are checked once its includes are there, those of its includes before it. A
@@ -41,8 +35,14 @@ bool IncludeLoader::load(QXXMLDocumentMapping& document, Ref<Error>* error) {
 bool IncludeLoader::loadWithIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error) {
     const std::size_t begin = _classes.count();
     _classes.add(document);
-    return loadIncludes(document, error) &&
-           (MappingSource::of(document).collectsFaults() || _classes.areDistinctFrom(begin, error));
+    if (!loadIncludes(document, error))
+        return false;
+    if (!MappingSource::of(document).collectsFaults())
+        return _classes.areDistinctFrom(begin, error);
+    _classes.tellRepeatedFrom(begin, [](const QXXMLClassMapping& mapping, Ref<Error> fault) {
+        MappingSource::of(mapping).addFault(std::move(fault));
+    });
+    return true;
 }
 
 bool IncludeLoader::loadIncludes(const QXXMLDocumentMapping& document, Ref<Error>* error) {

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 
 #include "base/Immortal.h"
+#include "plan/IncludeLoader.h"
 
 #include <algorithm>
 
@@ -15,6 +16,10 @@ const MappingPlan& MappingPlan::of(const QXXMLMarshallingMapping* mapping) {
         MappingPlan plan{*QXXMLDocumentMapping::initWithXML(nullptr)};
     };
     return immortal<None>().plan;
+}
+
+const IncludeLoader& MappingPlan::includesOf(const QXXMLMarshallingMapping& mapping) {
+    return *mapping._includes;
 }
 
 String MappingPlan::elementNameOf(const QXXMLClassMapping& mapping) {

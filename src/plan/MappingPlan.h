@@ -15,10 +15,14 @@ class QXXMLMarshallingMapping;
 
 namespace qx::detail {
 
+class IncludeLoader;
+
 class MappingPlan {
 public:
     // That of the mapping; of a null one a plan without classes.
     static const MappingPlan& of(const QXXMLMarshallingMapping* mapping);
+    // What the mapping was made of.
+    static const IncludeLoader& includesOf(const QXXMLMarshallingMapping& mapping);
     // The classes of the document are to have names of their own.
     explicit MappingPlan(const QXXMLDocumentMapping& document);
     MappingPlan(const MappingPlan&) = delete;

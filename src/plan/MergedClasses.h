@@ -35,12 +35,18 @@ public:
         return isRefused(*std::find_if(_repeated.begin(), _repeated.end(), isIn), begin, error);
     }
 
-    // Calls visit(QXXMLClassMapping&, Ref<Error>) for each class that repeats a name.
+    // Calls visit(QXXMLClassMapping&, Ref<Error>) for each class behind the first `begin` ones that
+    // has no names of its own, once.
     template <class Visit>
-    void forEachRepeated(Visit visit) const {
-        for (const Repeated& repeated : _repeated) {
+    void tellRepeatedFrom(std::size_t begin, Visit visit) {
+        if (_latestRepeated <= begin)
+            return;
+        for (Repeated& repeated : _repeated) {
+            if (repeated.isTold || repeated.latest() <= begin)
+                continue;
+            repeated.isTold = true;
             Ref<Error> error;
-            isRefused(repeated, 0, &error);
+            isRefused(repeated, begin, &error);
             visit(*repeated.mapping, std::move(error));
         }
     }
@@ -52,6 +58,7 @@ private:
         const QXXMLClassMapping* mapping;
         std::size_t sameClass; // the latest class before it that has its name
         std::size_t sameElement;
+        bool isTold = false; // see tellRepeatedFrom
         std::size_t latest() const noexcept { return std::max(sameClass, sameElement); }
     };
 

@@ -2,14 +2,18 @@
 
 #include <QXXMLMarshalling/model/Null.h>
 
+#include "model/LentText.h"
+
 namespace qx::detail {
 
 bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) {
     const bool isUnheard = (record._isCacheBehind || !record._contents) &&
                            record.tracking().isIdle() && !record.hasObserversOrWeakRefs() &&
                            &record.isa() == &QXGenericRecord::classObject();
-    return isUnheard && !value.isNull() && !key.view().starts_with('@') &&
-           contents(record)->add(key.string(), std::move(value));
+    if (!isUnheard || value.isNull() || key.view().starts_with('@'))
+        return false;
+    value = LentText::kept(std::move(value));
+    return contents(record)->add(key.string(), std::move(value));
 }
 
 const Ref<Dictionary>& RecordFilling::contents(QXGenericRecord& record) {

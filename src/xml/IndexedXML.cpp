@@ -1,7 +1,7 @@
 #include "xml/IndexedXML.h"
 
 #include "base/KnownName.h"
-#include "base/TextBlocks.h"
+#include "model/LentText.h"
 #include "xml/MatchedNames.h"
 #include "xml/XMLNodeMaker.h"
 
@@ -134,10 +134,10 @@ void IndexedXML::matchBy(const NamespaceTable& table) {
     _matched = MatchedNames(index(), _root, around, table, _interned).takeNumbers();
 }
 
-String IndexedXML::value(Number number) {
+Value IndexedXML::value(Number number) {
     const XMLIndexEntry& entry = index()[number];
     if (entry.end - entry.begin <= longestUnshared)
-        return textInBlock(index().value(entry, _room));
+        return detail::LentText::of(index().value(entry, _room));
     String& value = _longTexts[number];
     if (value.isNull())
         value = index().value(entry, _room);
@@ -151,7 +151,7 @@ bool IndexedXML::hasPlainText(Number element) {
     return first == end || (index().siblingOf(first) == end && !isElement(first));
 }
 
-String IndexedXML::text(Number element) {
+Value IndexedXML::text(Number element) {
     expand(element);
     const Number first = index().firstChild(element);
     const Number end = index().contentEnd(element);
@@ -163,11 +163,11 @@ String IndexedXML::text(Number element) {
         return value(first);
     if (const auto known = _longTexts.find(element); known != _longTexts.end())
         return known->second;
-    std::string joined;
-    appendText(element, joined);
-    if (joined.size() <= longestUnshared)
-        return textInBlock(joined);
-    return _longTexts.try_emplace(element, joined).first->second;
+    _joined.clear();
+    appendText(element, _joined);
+    if (_joined.size() <= longestUnshared)
+        return detail::LentText::of(_joined);
+    return _longTexts.try_emplace(element, _joined).first->second;
 }
 
 void IndexedXML::appendText(Number element, std::string& text) {

@@ -97,10 +97,11 @@ public:
             at = isFound ? index().siblingOf(at) : at + 1;
         }
     }
-    // Of a text, attribute or declaration. Whoever asks for a long one gets the same.
-    String value(Number number);
+    // Of a text, attribute or declaration, good until something else is asked for; a copy is good
+    // for ever. Whoever asks for a long one gets the same.
+    Value value(Number number);
     // All text inside an element, concatenated. Likewise.
-    String text(Number element);
+    Value text(Number element);
     // The attribute of that name, which is interned; none where there is none.
     Number attribute(Number element, const String& name);
     // Whether text() finds at most one text without going far.
@@ -157,6 +158,7 @@ private:
     bool _isAsWritten = false;
     std::vector<std::uint32_t> _matched; // then: of each entry, its name's number
     std::string _room;
+    std::string _joined;
     std::unordered_map<Number, String> _longTexts; // of attributes, texts and elements
     // Of elements with many attributes, by name.
     std::unordered_map<Number, std::unordered_map<const void*, Number>> _attributes;

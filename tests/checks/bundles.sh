@@ -89,3 +89,7 @@ for kind in -no-pie -pie; do
 done
 cp -- usr/bin/Client gone/Client
 [[ $(gone/Client gone remove) == 'main nothing' ]] || { echo "a removed folder holds something" >&2; exit 1; }
+# In the folder of an architecture, too.
+mkdir usr/lib/x86_64-linux-gnu
+mv -- usr/lib/libthing.so usr/lib/x86_64-linux-gnu/
+[[ $(LD_LIBRARY_PATH=$root/usr/lib/x86_64-linux-gnu usr/bin/Client usr/plugins) == "thing $root/usr/share/thing"* ]]

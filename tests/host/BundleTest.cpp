@@ -1,6 +1,7 @@
 #include <QXXMLMarshalling/host/Bundle.h>
 
 #include <QXXMLMarshalling/base/Exception.h>
+#include <QXXMLMarshalling/base/Version.h>
 #include <QXXMLMarshalling/model/Data.h>
 
 #include "support/FileSandbox.h"
@@ -80,6 +81,8 @@ TEST_F(BundleTest, WhatEndsWithTheMainBundleMayAskForBundles) {
 TEST_F(BundleTest, TheLibrarysOwnBundleHoldsItsResources) {
     const auto bundle = Bundle::frameworkBundle();
     EXPECT_EQ(bundle->bundleIdentifier(), "org.qxxml.QXXMLMarshalling");
+    EXPECT_EQ(bundle->objectForInfoDictionaryKey("CFBundleShortVersionString"),
+              Value(String(libraryVersionText())));
     EXPECT_FALSE(bundle->pathForResource("de.lproj/Localizable", "strings").isNull());
     EXPECT_EQ(Bundle::bundleWithIdentifier("org.qxxml.QXXMLMarshalling"), bundle);
 }

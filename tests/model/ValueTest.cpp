@@ -8,10 +8,13 @@
 #include <QXXMLMarshalling/model/Format.h>
 #include <QXXMLMarshalling/model/Null.h>
 
+#include "model/LentText.h"
+
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cmath>
+#include <numeric>
 
 namespace {
 
@@ -96,6 +99,29 @@ TEST(ValueTest, AnyValueIsANumberAndATruth) {
     for (const auto& [value, integer, boolean] : cases) {
         EXPECT_EQ(value.intValue(), integer) << value.description().view();
         EXPECT_EQ(value.boolValue(), boolean) << value.description().view();
+    }
+}
+
+TEST(ValueTest, ATextIsTheSameWhereverItsBytesLie) {
+    for (std::size_t size = 0; size <= 20; ++size) {
+        std::string text(size, '\0');
+        std::iota(text.begin(), text.end(), '\0');
+        const Value inside = text, shared = String(text);
+        const std::vector<Value> grown = {inside, shared, detail::LentText::of(text)};
+        std::string bytes = text;
+        Value lent = detail::LentText::of(bytes);
+        const Value copy = lent, kept = detail::LentText::kept(std::move(lent));
+        bytes.assign(size, 'x');
+        Value moved = copy;
+        moved = Value(std::move(moved));
+        for (const Value& value :
+             {inside, shared, grown[0], grown[1], grown[2], copy, kept, moved}) {
+            EXPECT_EQ(value.view(), text);
+            EXPECT_EQ(value.string(), text);
+            EXPECT_EQ(value, inside);
+            EXPECT_TRUE(value.isSameAs(Value(value)));
+        }
+        EXPECT_FALSE(inside.isSameAs(Value(text + "x")));
     }
 }
 
@@ -253,7 +279,7 @@ TEST(ValueTest, FormatsTakeTheirArgumentsInOrderOrByPosition) {
         {"%@%@%@%@ %", "a-2255%@ %"},    {"%0$@ %9$@", "%0$@ %9$@"},
         {"%2$u", "18446744073709551614"}};
     for (const auto& [text, expected] : cases)
-        EXPECT_EQ(format(text, arguments), expected) << text;
+        EXPECT_EQ(qx::format(text, arguments), expected) << text;
 }
 
 } // namespace

@@ -3,6 +3,9 @@
 #include "qxxml/Commands.h"
 #include "qxxml/Failure.h"
 #include "qxxml/Output.h"
+#include "qxxml/pages/Usage.h"
+
+#include <QXXMLMarshalling/base/Version.h>
 
 #include <CLI/CLI.hpp>
 
@@ -103,6 +106,18 @@ void addOutput(CLI::App& command, Options& options) {
         ->option_text("FILE");
 }
 
+void addMatching(CLI::App& command, Options& options) {
+    command
+        .add_option("--prefix", options.prefixes,
+                    "Match names by namespace: the mapping has this prefix, or none, for the "
+                    "namespace of that URI; may be given more than once")
+        ->option_text("[PREFIX]=URI")
+        ->allow_extra_args(false)
+        ->check(CLI::Validator(checkPrefix, ""));
+    command.add_flag("--match-namespaces", options.matchNamespaces,
+                     "The same for the namespaces that the class mappings declare");
+}
+
 void addReading(CLI::App& command, Options& options) {
     addMapping(command, options);
     addTelling(command, options);
@@ -124,15 +139,7 @@ void addReading(CLI::App& command, Options& options) {
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
                      "Do not write namespace declarations");
-    command
-        .add_option("--prefix", options.prefixes,
-                    "Match names by namespace: the mapping has this prefix, or none, for the "
-                    "namespace of that URI; may be given more than once")
-        ->option_text("[PREFIX]=URI")
-        ->allow_extra_args(false)
-        ->check(CLI::Validator(checkPrefix, ""));
-    command.add_flag("--match-namespaces", options.matchNamespaces,
-                     "The same for the namespaces that the class mappings declare");
+    addMatching(command, options);
     command.add_flag("--keep-white-space", options.keepWhiteSpace,
                      "Keep the white space between elements");
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
@@ -140,8 +147,20 @@ void addReading(CLI::App& command, Options& options) {
 
 void addChecking(CLI::App& command, Options& options) {
     addMapping(command, options);
-    command.add_flag("--notes", options.notes, "Print what is only worth a note, too");
+    command
+        .add_option("DOCUMENT", options.documents,
+                    "The paths of documents to try the mapping on; - is standard input")
+        ->option_text("...");
+    command
+        .add_option("--why", options.why,
+                    "Tell why this node of the last document is bound or not, and nothing else")
+        ->option_text("PATH");
+    command.add_flag("--notes", options.notes, "Print the notes on the mapping, too");
     command.add_flag("--json", options.json, "Print an array of findings as JSON");
+    command.add_flag("--discard-unknown", options.discardUnknown,
+                     "Do not keep XML that the mapping does not describe");
+    addMatching(command, options);
+    command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
 void addInferring(CLI::App& command, Options& options) {
@@ -161,7 +180,8 @@ void addInferring(CLI::App& command, Options& options) {
 // `status`.
 void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     tool.require_subcommand(1);
-    tool.set_version_flag("--version", "qxxml " QX_VERSION, "Print the version and exit");
+    tool.set_version_flag("--version", "qxxml " + std::string(qx::libraryVersionText()),
+                          "Print the version and exit");
     const auto add = [&](const char* name, const char* purpose, Command command) {
         CLI::App* const added = tool.add_subcommand(name, purpose);
         added->callback([&chosen, command] { chosen = command; });
@@ -171,6 +191,11 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
         add("describe", "Resolve a mapping with its includes and print its description", describe);
     addMapping(*command, options);
     addTelling(*command, options);
+    addSearch(*command, options);
+
+    command = add("graph", "Print a mapping as a graph for Graphviz", graph);
+    addMapping(*command, options);
+    command->add_flag("--svg", options.svg, "Print the picture itself, which dot draws");
     addSearch(*command, options);
 
     command = add("read", "Read a document into an object and print it as JSON", nullptr);
@@ -189,7 +214,10 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     addOutput(*command, options);
     addSearch(*command, options);
 
-    command = add("check", "Tell what a mapping does that its author may not want", nullptr);
+    command = add("check",
+                  "Tell what a mapping does, by itself and to documents, that its "
+                  "author may not want",
+                  nullptr);
     command->callback(
         [&] { chosen = [&status](const Options& given) { return check(given, status); }; });
     addChecking(*command, options);
@@ -206,6 +234,17 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
         ->option_text(" ")
         ->required();
     addSearch(*command, options);
+
+    const auto usage = [&tool] { return Usage(tool); };
+    add("manual", "Print the manual page, which \"man -l -\" shows",
+        [usage](const Options&) { return manualPage(usage()); });
+
+    command = add("completion", "Print what lets a shell complete the command line",
+                  [usage](const Options& given) { return completionScript(usage(), given.name); });
+    command->add_option("SHELL", options.name, "The shell that it is for")
+        ->option_text("bash|zsh|fish")
+        ->required()
+        ->check(CLI::IsMember({"bash", "zsh", "fish"}));
 }
 
 // Help and version are asked for; anything else is wrong usage.

@@ -18,6 +18,8 @@ std::string readEach(const Options& options);
 std::string infer(const Options& options);
 // The document, read into an object and written from it.
 std::string roundtrip(const Options& options);
+// The mapping as a graph for Graphviz; with --svg it has dot print the picture, and gives nothing.
+std::string graph(const Options& options);
 // The path that a name resolves to, and the places that were looked at up to there.
 std::string where(const Options& options);
 

@@ -28,7 +28,7 @@ public:
         case qx::Value::Kind::real:
             return value.doubleValue();
         case qx::Value::Kind::string:
-            return value.string().view();
+            return value.view();
         case qx::Value::Kind::object:
             break;
         }

@@ -12,7 +12,7 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
-    std::vector<std::string> documents; // what `infer` goes by
+    std::vector<std::string> documents; // what `infer` and `check` go by
 
     bool strict = false;
     bool discardUnknown = false;
@@ -21,6 +21,7 @@ struct Options {
     bool noDoctype = false;
     bool pretty = false;
     bool classes = false;
+    bool svg = false;
     bool keepOrder = false;
     bool matchNamespaces = false;
     bool json = false;
@@ -30,6 +31,7 @@ struct Options {
     bool verbose = false;
     std::size_t errors = 1; // how many a reading collects
     std::string output;     // the file for the result; empty for standard output
+    std::string why; // the path of the node that `check` is asked about
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;

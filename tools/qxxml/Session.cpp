@@ -62,9 +62,10 @@ qx::Ref<QXXMLMarshallingMapping> Session::resolveMapping(QXXMLMappingOptions opt
     return mapping;
 }
 
-qx::Ref<QXXMLMarshaller> Session::makeMarshaller() const {
+qx::Ref<QXXMLMarshaller> Session::makeMarshaller(qx::Ref<QXXMLMarshallingMapping> mapping) const {
     qx::Ref<qx::Error> error;
-    auto marshaller = QXXMLMarshaller::initWithMapping(resolveMapping());
+    auto marshaller = QXXMLMarshaller::initWithMapping(std::move(mapping));
+    marshaller->setParseOptions(parseOptions());
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);

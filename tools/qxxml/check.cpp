@@ -3,24 +3,17 @@
 #include "qxxml/Json.h"
 #include "qxxml/Session.h"
 
+#include <QXXMLMarshalling/QXXMLDocumentCheck.h>
+
 #include <algorithm>
+#include <iostream>
+#include <iterator>
 
 namespace qxxml {
 
 namespace {
 
 using Severity = QXXMLFinding::Severity;
-
-// A fault quotes the element that it is about, however large that is.
-std::string shortened(const std::string& text) {
-    constexpr std::size_t longest = 240;
-    if (text.size() <= longest)
-        return text;
-    std::size_t end = longest;
-    while (end > 0 && (text[end] & 0xC0) == 0x80) // inside of a character
-        --end;
-    return text.substr(0, end) + "...";
-}
 
 std::string textOf(const QXXMLMappingPlace& place) {
     return place.documentName.str() + ":" + std::to_string(place.line) + ":" +
@@ -29,7 +22,7 @@ std::string textOf(const QXXMLMappingPlace& place) {
 
 // FILE:LINE:COLUMN: SEVERITY: TEXT [CLASS.FIELD], and what belongs to it on lines of their own.
 std::string textOf(const QXXMLFinding& finding) {
-    std::string text = shortened(finding.description().str());
+    std::string text = finding.description().str();
     if (!finding.className.isNull())
         text += " [" + finding.className.str() +
                 (finding.fieldName.isNull() ? "" : "." + finding.fieldName.str()) + "]";
@@ -78,31 +71,82 @@ std::string summaryOf(const std::vector<QXXMLFinding>& findings) {
     return text + "\n";
 }
 
-std::string textOf(const std::vector<QXXMLFinding>& findings, const Options& options) {
-    std::vector<QXXMLFinding> shown = findings;
-    if (!options.notes)
-        std::erase_if(shown, [](const auto& each) { return each.severity == Severity::note; });
-    if (options.json) {
-        auto list = nlohmann::ordered_json::array();
-        for (const QXXMLFinding& finding : shown)
-            list.push_back(jsonOf(finding));
-        return qxxml::textOf(list) + "\n";
-    }
+std::string textOf(const std::vector<QXXMLFinding>& shown, const std::string& summary) {
     std::string text;
     for (const QXXMLFinding& finding : shown)
         text += textOf(finding);
-    return text + summaryOf(findings);
+    return text + summary;
+}
+
+std::string jsonTextOf(const std::vector<QXXMLFinding>& shown) {
+    auto list = nlohmann::ordered_json::array();
+    for (const QXXMLFinding& finding : shown)
+        list.push_back(jsonOf(finding));
+    return qxxml::textOf(list) + "\n";
+}
+
+// A document that cannot be read is a finding like others.
+QXXMLFinding findingOf(const qx::Ref<qx::Error>& error, const std::string& document) {
+    QXXMLFinding finding;
+    finding.severity = Severity::error;
+    finding.kind = "fault";
+    finding.fault = error;
+    finding.place.documentName = document;
+    if (!error)
+        return finding;
+    finding.text = error->shortDescription();
+    finding.suggestion = error->suggestion();
+    finding.place = error->place();
+    finding.className = error->mappingClass();
+    finding.fieldName = error->mappingField();
+    if (finding.place.documentName.isNull())
+        finding.place.documentName = document;
+    return finding;
+}
+
+// Reads the documents; what cannot be read is added to the findings.
+void addDocuments(QXXMLDocumentCheck& check, const std::vector<std::string>& documents,
+                  std::vector<QXXMLFinding>& findings) {
+    for (const std::string& document : documents) {
+        qx::Ref<qx::Error> error;
+        const bool isRead =
+            document == "-"
+                ? check.addData(std::string(std::istreambuf_iterator<char>(std::cin), {}),
+                                "<stdin>", &error)
+                : check.addFile(document, &error);
+        if (!isRead)
+            findings.push_back(findingOf(error, document));
+    }
 }
 
 } // namespace
 
+// A mapping with faults reads nothing.
 std::string check(const Options& options, int& status) {
     const Session session(options);
     const auto mapping = session.resolveMapping({.collectsFaults = true});
-    const auto findings = mapping->check();
-    const bool isSound = count(findings, Severity::error) + count(findings, Severity::warning) == 0;
-    status = isSound ? 0 : 1;
-    return textOf(findings, options);
+    std::vector<QXXMLFinding> findings = mapping->check();
+    std::vector<QXXMLFinding> ofDocuments;
+    if (mapping->faults().empty()) {
+        QXXMLDocumentCheck documents(session.makeMarshaller(mapping));
+        addDocuments(documents, options.documents, ofDocuments);
+        if (!options.why.empty()) {
+            const qx::String reason = documents.why(options.why);
+            if (reason.isNull())
+                throw Failure("260: " + message("There is no node of the path: %@", options.why));
+            return reason.str() + "\n";
+        }
+        const auto found = documents.findings();
+        ofDocuments.insert(ofDocuments.end(), found.begin(), found.end());
+    }
+    const auto isNote = [](const auto& finding) { return finding.severity == Severity::note; };
+    auto shown = findings;
+    if (!options.notes)
+        std::erase_if(shown, isNote);
+    shown.insert(shown.end(), ofDocuments.begin(), ofDocuments.end());
+    findings.insert(findings.end(), ofDocuments.begin(), ofDocuments.end());
+    status = std::all_of(findings.begin(), findings.end(), isNote) ? 0 : 1;
+    return options.json ? jsonTextOf(shown) : textOf(shown, summaryOf(findings));
 }
 
 } // namespace qxxml

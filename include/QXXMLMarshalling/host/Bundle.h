@@ -8,6 +8,9 @@
 //     framework bundle   this library's: ../share/QXXMLMarshalling beside its own folder
 //     of a class         ../share/<name> beside the folder of its lib<name>.so, else that folder;
 //                        for a class of the program itself, the main bundle
+//
+// Beside a folder of an architecture, lib/x86_64-linux-gnu, say, the share beside lib counts, too.
+// A library that is linked in statically lies where the program lies.
 
 #include <QXXMLMarshalling/model/Dictionary.h>
 

@@ -162,8 +162,8 @@ public:
     // A description that is not taken, since the type has one, leaves an empty registration.
     [[nodiscard]] ClassRegistration registration() {
         bool isTaken = false;
-        const Class& described = detail::publish(std::exchange(_draft, {}), true, &isTaken);
-        return ClassRegistration(isTaken ? &described : nullptr);
+        const Class* const described = &detail::publish(std::exchange(_draft, {}), true, &isTaken);
+        return ClassRegistration(isTaken ? described : nullptr);
     }
 
     // Data members, under their own names.

@@ -1,7 +1,8 @@
 #pragma once
 
 // What key-value access carries: null, a boolean, a 64-bit integer, a double, a string or an
-// object. 16 bytes; copying shares strings and objects.
+// object. 16 bytes; copying shares strings and objects. A text of at most 14 bytes that comes as a
+// view, a C string or a std::string lies in the value itself.
 //
 // Conversions, and what any other kind answers:
 //   boolValue()    numbers: not zero. Strings: after blanks, a sign and zeros, one of Y y T t 1-9.
@@ -10,7 +11,8 @@
 //                  start, else 0. Everything else: 0.
 //   doubleValue()  likewise.
 //   string()       the text of a string; the null string for every other kind.
-//   view()         the same without a count of its own, as long as the value lives and keeps it.
+//   view()         the same without a String: bytes of the value, as long as it stays and keeps
+//                  them.
 //   object()       the object; null for every other kind.
 //   get<T>()       what qx::ValueTraits<T> makes of it (ValueTraits.h), and nothing else: raises.
 //   tryGet<T>()    the same in a std::optional: none.
@@ -25,7 +27,9 @@
 #include <compare>
 #include <concepts>
 #include <cstdint>
+#include <cstring>
 #include <optional>
+#include <string_view>
 #include <typeinfo>
 #include <utility>
 
@@ -37,6 +41,7 @@ struct ValueTraits;
 namespace detail {
 template <class T>
 std::optional<T> copiedAs(const Value& value); // ContainerTraits.h
+class LentText;
 [[noreturn]] QX_API void raiseNotOfType(const Value& value, const std::type_info& type);
 } // namespace detail
 
@@ -46,71 +51,77 @@ public:
 
     Value() noexcept = default;
     Value(std::nullptr_t) noexcept {}
-    Value(std::same_as<bool> auto value) noexcept : _kind(Kind::boolean) {
-        _payload.boolean = value;
+    Value(std::same_as<bool> auto value) noexcept : _cell(Kind::boolean) {
+        _cell.word.boolean = value;
     }
     // Unsigned values above the signed 64-bit range become the nearest double.
     template <std::integral Integer>
     requires(!std::same_as<Integer, bool>) Value(Integer value)
-    noexcept : _kind(Kind::integer) {
+    noexcept : _cell(Kind::integer) {
         if constexpr (std::unsigned_integral<Integer> && sizeof(Integer) == 8) {
             if (value > static_cast<Integer>(INT64_MAX)) {
-                _kind = Kind::real;
-                _payload.real = static_cast<double>(value);
+                _cell.word.kind = Kind::real;
+                _cell.word.real = static_cast<double>(value);
                 return;
             }
         }
-        _payload.integer = static_cast<std::int64_t>(value);
+        _cell.word.integer = static_cast<std::int64_t>(value);
     }
-    Value(std::floating_point auto value) noexcept : _kind(Kind::real) {
-        _payload.real = static_cast<double>(value);
+    Value(std::floating_point auto value) noexcept : _cell(Kind::real) {
+        _cell.word.real = static_cast<double>(value);
     }
     // A null string gives a null value.
     Value(const String& text) noexcept : Value(String(text)) {}
     Value(String&& text) noexcept;
-    Value(const char* text) : Value(String(text)) {}
-    Value(std::string_view text) : Value(String(text)) {}
-    Value(const std::string& text) : Value(String(text)) {}
+    // A null pointer gives a null value.
+    Value(const char* text) : Value(text != nullptr ? Value(std::string_view(text)) : Value()) {}
+    Value(std::string_view text) {
+        if (text.size() <= mostInside)
+            _cell = Cell(text);
+        else
+            *this = Value(String(text));
+    }
+    Value(const std::string& text) : Value(std::string_view(text)) {}
     // A null reference gives a null value.
     template <std::derived_from<Object> T>
     Value(const Ref<T>& object) noexcept : Value(object.get()) {}
     template <std::derived_from<Object> T>
-    Value(Ref<T>&& object) noexcept : _kind(object ? Kind::object : Kind::null) {
-        _payload.object = object.detach();
+    Value(Ref<T>&& object) noexcept : _cell(object ? Kind::object : Kind::null) {
+        _cell.word.object = object.detach();
     }
     Value(const Object* object) noexcept;
 
-    Value(const Value& other) noexcept;
-    Value(Value&& other) noexcept : _payload(other._payload), _kind(other._kind) {
-        other._kind = Kind::null;
+    Value(const Value& other) : _cell(other._cell) {
+        if (other.kind() >= Kind::string)
+            share(other);
     }
+    Value(Value&& other) noexcept : _cell(std::exchange(other._cell, Cell(Kind::null))) {}
     ~Value() {
-        if (_kind >= Kind::string)
-            releasePayload();
+        if (kind() >= Kind::string && _cell.word.form == Form::counted)
+            releaseCounted();
     }
     Value& operator=(Value other) noexcept {
-        std::swap(_payload, other._payload);
-        std::swap(_kind, other._kind);
+        std::swap(_cell, other._cell);
         return *this;
     }
 
-    Kind kind() const noexcept { return _kind; }
-    bool isNull() const noexcept { return _kind == Kind::null; }
+    Kind kind() const noexcept { return _cell.word.kind; }
+    bool isNull() const noexcept { return kind() == Kind::null; }
     // True for booleans, integers and doubles.
-    bool isNumber() const noexcept { return _kind >= Kind::boolean && _kind <= Kind::real; }
-    bool isString() const noexcept { return _kind == Kind::string; }
-    bool isObject() const noexcept { return _kind == Kind::object; }
+    bool isNumber() const noexcept { return kind() >= Kind::boolean && kind() <= Kind::real; }
+    bool isString() const noexcept { return kind() == Kind::string; }
+    bool isObject() const noexcept { return kind() == Kind::object; }
     // True for null and for the null marker (Null.h).
     bool isNullOrMarker() const noexcept;
 
     bool boolValue() const noexcept;
     std::int64_t intValue() const noexcept;
     double doubleValue() const noexcept;
-    String string() const noexcept;
+    String string() const;
     std::string_view view() const noexcept {
-        return isString() ? _payload.text->view() : std::string_view();
+        return isString() ? viewOfText() : std::string_view();
     }
-    Object* object() const noexcept { return isObject() ? _payload.object : nullptr; }
+    Object* object() const noexcept { return isObject() ? _cell.word.object : nullptr; }
     // The object as class T, or null where the value is no object of that class.
     template <class T>
     Ref<T> as() const noexcept {
@@ -155,20 +166,63 @@ public:
     String classNameForMarshalling() const;
 
 private:
-    void releasePayload() noexcept;
+    friend class detail::LentText;
+
+    //     word   | kind | form |      | size  | number, text or object, 8 bytes |
+    //     text   | kind | size | up to 14 bytes                                 |
+    //
+    // Of a string and an object: a count is held of what `word` points to; nothing is, and the
+    // text's bytes are somebody else's; beyond, the bytes lie in the value, and `form` is `inside`
+    // and how many they are.
+    enum class Form : std::uint8_t { counted, lent, inside };
+    static constexpr std::size_t mostInside = 14;
+    struct Word {
+        Kind kind;
+        Form form;
+        std::uint32_t size; // of a lent text
+        union {
+            bool boolean;
+            std::int64_t integer;
+            double real;
+            detail::StringRep* text;
+            const char* lent;
+            Object* object;
+        };
+    };
+    struct ShortText {
+        Kind kind;
+        Form form;
+        char bytes[mostInside];
+    };
+    union Cell {
+        Word word;
+        ShortText text; // kind and form may be read by either name
+
+        explicit Cell(Kind kind) noexcept : word{kind, Form::counted, 0, {.integer = 0}} {}
+        explicit Cell(std::string_view inside) noexcept
+            : text{Kind::string, formOf(inside.size()), {}} {
+            if (!inside.empty())
+                std::memcpy(text.bytes, inside.data(), inside.size());
+        }
+    };
+    static Form formOf(std::size_t size) noexcept {
+        return static_cast<Form>(static_cast<std::size_t>(Form::inside) + size);
+    }
+
+    std::string_view viewOfText() const noexcept {
+        if (_cell.word.form == Form::counted)
+            return _cell.word.text->view();
+        if (_cell.word.form == Form::lent)
+            return {_cell.word.lent, _cell.word.size};
+        return {_cell.text.bytes,
+                static_cast<std::size_t>(_cell.word.form) - static_cast<std::size_t>(Form::inside)};
+    }
+    void share(const Value& other);
+    void releaseCounted() noexcept;
     std::weak_ordering compare(const Value& other) const noexcept;
 
-    union Payload {
-        bool boolean;
-        std::int64_t integer;
-        double real;
-        detail::StringRep* text;
-        Object* object;
-    };
-    Payload _payload{.integer = 0};
-    Kind _kind = Kind::null;
+    Cell _cell{Kind::null};
 };
-
 static_assert(sizeof(Value) == 16);
 
 template <class... Arguments>
