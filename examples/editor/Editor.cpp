@@ -54,9 +54,11 @@ void print(std::ostream& out, const qx::Value& value, const std::string& label,
 
 } // namespace
 
-Editor::Editor(qx::Ref<QXXMLMarshaller> marshaller, qx::Ref<qx::Object> document, std::ostream& out)
-    : _marshaller(std::move(marshaller)), _document(std::move(document)), _out(out),
-      _watcher(_document, out) {
+Editor::Editor(qx::Ref<QXXMLMarshaller> marshaller, qx::Ref<QXXMLDocumentFile> file,
+               std::ostream& out)
+    : _marshaller(std::move(marshaller)), _file(std::move(file)), _document(_file->root()),
+      _out(out), _watcher(_document, out) {
+    _file->setUndoManager(_undoManager);
     giveUndoManager(_document, _undoManager);
 }
 
@@ -68,13 +70,13 @@ void Editor::perform(const std::string& line) {
         bool isStep; // can be undone
     };
     static const std::map<std::string, Entry> commands = {
-        {"show", {&Editor::show, false}},    {"set", {&Editor::set, true}},
-        {"unset", {&Editor::unset, true}},   {"new", {&Editor::makeObject, true}},
-        {"add", {&Editor::addItem, true}},   {"remove", {&Editor::removeItem, true}},
-        {"finish", {&Editor::finish, true}}, {"begin", {&Editor::begin, false}},
-        {"end", {&Editor::end, false}},      {"undo", {&Editor::undo, false}},
-        {"redo", {&Editor::redo, false}},    {"watch", {&Editor::watch, false}},
-        {"save", {&Editor::save, false}},
+        {"show", {&Editor::show, false}},         {"set", {&Editor::set, true}},
+        {"unset", {&Editor::unset, true}},        {"new", {&Editor::makeObject, true}},
+        {"add", {&Editor::addItem, true}},        {"remove", {&Editor::removeItem, true}},
+        {"finish", {&Editor::finish, true}},      {"begin", {&Editor::begin, false}},
+        {"end", {&Editor::end, false}},           {"undo", {&Editor::undo, false}},
+        {"redo", {&Editor::redo, false}},         {"watch", {&Editor::watch, false}},
+        {"edited", {&Editor::tellEdited, false}}, {"save", {&Editor::save, false}},
     };
     Command command{line, {}, {}, {}};
     std::istringstream words(line);
@@ -170,8 +172,12 @@ void Editor::redo(const Command&) {
 
 void Editor::watch(const Command& command) { _watcher.watchPath(command.path); }
 
+void Editor::tellEdited(const Command&) {
+    _out << "    " << (_file->isEdited() ? "yes" : "no") << '\n';
+}
+
 void Editor::save(const Command& command) {
     qx::Ref<qx::Error> error;
-    if (!_marshaller->writeFile(_document, command.path, &error))
+    if (!_file->saveAs(command.path, &error))
         throw std::runtime_error(error->localizedDescription().str());
 }

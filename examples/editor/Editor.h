@@ -11,20 +11,21 @@
 //     finish PATH            have a task finish itself
 //     begin NAME … end       the commands between them are undone together
 //     undo, redo
+//     edited                 tell whether anything was edited since the document was saved
 //     watch PATH             tell of changes of the value at the path, whichever object changed
-//     save FILE
+//     save FILE              what was edited changes in the document's text, and nothing else
 //
 // Each change that the editor observes is printed, whoever makes it: commands, undo and redo alike.
 
 #include "Paths.h"
 #include "Watcher.h"
 
-#include <QXXMLMarshalling/QXXMLMarshaller.h>
+#include <QXXMLMarshalling/QXXMLDocumentFile.h>
 
 class Editor {
 public:
-    // Opens a document that the marshaller has read: gives its objects an undo manager.
-    Editor(qx::Ref<QXXMLMarshaller> marshaller, qx::Ref<qx::Object> document, std::ostream& out);
+    // Edits what was read from the file: gives its objects an undo manager.
+    Editor(qx::Ref<QXXMLMarshaller> marshaller, qx::Ref<QXXMLDocumentFile> file, std::ostream& out);
     // Forgets what could be undone: it keeps objects of the document alive.
     ~Editor();
     Editor(const Editor&) = delete;
@@ -49,12 +50,14 @@ private:
     void undo(const Command& command);
     void redo(const Command& command);
     void watch(const Command& command);
+    void tellEdited(const Command& command);
     void save(const Command& command);
 
     void assign(const Place& place, const qx::Value& value);
     qx::Ref<qx::Object> newObject(const std::string& className);
 
     qx::Ref<QXXMLMarshaller> _marshaller;
+    qx::Ref<QXXMLDocumentFile> _file;
     qx::Ref<qx::Object> _document;
     qx::Ref<qx::UndoManager> _undoManager = qx::make<qx::UndoManager>();
     std::ostream& _out;

@@ -59,7 +59,7 @@ int main(int argc, char** argv) {
         QXXMLMarshaller::initWithMappingFile(QX_EXAMPLE_DIR "/mapping.xml", &error);
     if (!marshaller)
         return fail(error);
-    const auto project = marshaller->readFile(argv[1], &error);
+    const auto project = QXXMLDocumentFile::open(argv[1], marshaller, &error);
     if (!project)
         return fail(error);
 

@@ -1,12 +1,13 @@
 // Reads a purchase order, tells what is in it, changes the quantity of an article and writes the
-// order to another file: with all that this program knows nothing of.
+// order to another file: with all that this program knows nothing of. Without one the order's own
+// file is changed, and nothing else in it.
 //
-//     example_purchase_order ORDER NEW_ORDER ARTICLE QUANTITY
+//     example_purchase_order ORDER [NEW_ORDER] ARTICLE QUANTITY
 
 #include "Item.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
-#include <QXXMLMarshalling/QXXMLMarshaller.h>
+#include <QXXMLMarshalling/QXXMLUpdate.h>
 #include <QXXMLMarshalling/host/Log.h>
 #include <QXXMLMarshalling/model/Error.h>
 #include <QXXMLMarshalling/model/Format.h>
@@ -93,9 +94,10 @@ int fail(const qx::Ref<qx::Error>& error) {
 
 int main(int argc, char** argv) {
     int quantity = 0;
-    const std::string_view number = argc == 5 ? argv[4] : "";
+    const bool isAnother = argc == 5;
+    const std::string_view number = argc == 4 || argc == 5 ? argv[argc - 1] : "";
     if (std::from_chars(number.data(), number.data() + number.size(), quantity).ec != std::errc()) {
-        std::cerr << "usage: example_purchase_order ORDER NEW_ORDER ARTICLE QUANTITY\n";
+        std::cerr << "usage: example_purchase_order ORDER [NEW_ORDER] ARTICLE QUANTITY\n";
         return 2;
     }
     registerItem();
@@ -109,7 +111,11 @@ int main(int argc, char** argv) {
     if (!order)
         return fail(error);
     printOrder(*order);
-    if (!changeQuantity(*order, argv[3], quantity))
+    if (!changeQuantity(*order, argv[argc - 2], quantity))
         return fail("the order has no such article");
+    if (!isAnother) {
+        const auto update = QXXMLUpdate::updateFile(*marshaller, order, argv[1]);
+        return update ? 0 : fail(update.error());
+    }
     return marshaller->writeFile(order, argv[2], &error) ? 0 : fail(error);
 }

@@ -17,6 +17,7 @@
 #include <QXXMLMarshalling/QXXMLDataRepository.h>
 #include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
 #include <QXXMLMarshalling/QXXMLDocumentCheck.h>
+#include <QXXMLMarshalling/QXXMLDocumentFile.h>
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldMapping.h>
 #include <QXXMLMarshalling/QXXMLFieldValues.h>
@@ -26,6 +27,7 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/QXXMLReport.h>
+#include <QXXMLMarshalling/QXXMLUpdate.h>
 #include <QXXMLMarshalling/QXXMLVolatileDataRepository.h>
 #include <QXXMLMarshalling/base/Exception.h>
 #include <QXXMLMarshalling/base/Export.h>

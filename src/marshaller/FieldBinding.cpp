@@ -88,6 +88,8 @@ bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& eleme
         held = {false, held.keepsZero()};
     }
     const Value& value = held.value();
+    if (_trace != nullptr)
+        _trace->hold(value);
     if (const auto array = value.as<Array>())
         return writeCollection(*this, field, element, *array, error);
     if (value.isNull() || (value.isObject() && value.classNameForMarshalling().isNull()))

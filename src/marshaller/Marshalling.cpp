@@ -19,6 +19,12 @@ Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft)
         _names = std::make_unique<OutputNames>(std::move(table));
 }
 
+Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft& draft, WritingTrace& trace)
+    : Marshalling(marshaller, &draft) {
+    _trace = &trace;
+    _names.reset();
+}
+
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller, const XMLElement& inside)
     : Marshalling(marshaller) {
     if (!_names)
@@ -97,6 +103,8 @@ WrittenElement Marshalling::newElement(const String& name, std::size_t attribute
 
 void Marshalling::addTextElement(const WrittenElement& parent, const String& name,
                                  const FieldText& text) {
+    if (_trace != nullptr)
+        _trace->addText(text.view(), false);
     if (!_names)
         return _output.addChild(parent, name, text);
     const Opened opened(*this);
@@ -107,6 +115,11 @@ void Marshalling::addTextElement(const WrittenElement& parent, const String& nam
 
 void Marshalling::addAttribute(const WrittenElement& element, const String& name,
                                const FieldText& text) {
+    if (_trace != nullptr) {
+        const XMLDraft::Node* const last = element.drafted->lastAttribute;
+        _output.addAttribute(element, name, text);
+        return _trace->addText(text.view(), element.drafted->lastAttribute == last);
+    }
     if (!_names)
         return _output.addAttribute(element, name, text);
     const OutputNames::Name written = _names->attributeName(name);
@@ -129,6 +142,8 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
         ~Deeper() { --depth; }
     } const deeper(_depth);
 
+    if (_trace != nullptr)
+        _trace->enterObject(plan, element.drafted, object, _access);
     std::vector<const ClassPlan*> ancestors;
     ExtendsWalk walk(plan);
     do {
@@ -146,16 +161,25 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
         restoreXML(element, object);
         return true;
     };
-    return std::all_of(ancestors.rbegin(), ancestors.rend(),
-                       [&](const ClassPlan* ancestor) { return finish(*ancestor); }) &&
-           finish(plan);
+    const bool isWritten =
+        std::all_of(ancestors.rbegin(), ancestors.rend(),
+                    [&](const ClassPlan* ancestor) { return finish(*ancestor); }) &&
+        finish(plan);
+    if (_trace != nullptr)
+        _trace->leave();
+    return isWritten;
 }
 
 bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
                                  Object& object, ErrorSlot error) {
     for (const FieldPlan& field : plan.fields) {
         Ref<Error> problem;
-        if (writeField(field, element, object, &problem))
+        if (_trace != nullptr)
+            _trace->enterField(field);
+        const bool isWritten = writeField(field, element, object, &problem);
+        if (_trace != nullptr)
+            _trace->leaveField();
+        if (isWritten)
             continue;
         if (error != nullptr)
             *error = std::move(problem);
@@ -181,7 +205,7 @@ Ref<XMLNode> keptNode(const Value& kept, XMLNodeKind kind) {
 } // namespace
 
 void Marshalling::restoreXML(const WrittenElement& element, const Object& object) {
-    if (!_access.mayKeepXML(object))
+    if (_trace != nullptr || !_access.mayKeepXML(object))
         return;
     if (_marshaller->saveUnknownXML())
         restoreUnknownXML(element, object);

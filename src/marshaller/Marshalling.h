@@ -10,6 +10,7 @@
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/OutputNames.h"
 #include "marshaller/Reporting.h"
+#include "marshaller/WritingTrace.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -20,6 +21,8 @@ public:
 
     // Writes into the draft, into nodes where there is none.
     explicit Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft = nullptr);
+    // Tells the trace, which outlives the call, and writes what that says; into a draft.
+    Marshalling(const QXXMLMarshaller& marshaller, XMLDraft& draft, WritingTrace& trace);
     // Writes nodes that go into this element.
     Marshalling(const QXXMLMarshaller& marshaller, const XMLElement& inside);
 
@@ -41,6 +44,8 @@ public:
     // The class that the mapping has for the value; null for strings and numbers.
     const ClassPlan* classOf(const Value& value) const;
     ElementWriter& output() noexcept { return _output; }
+    // Null where nobody wants one.
+    WritingTrace* trace() const noexcept { return _trace; }
     // While it lives, an element is open that declares this: what is made is made inside it.
     class Opened {
     public:
@@ -98,6 +103,7 @@ private:
     const MappingPlan& _plan;
     ObjectAccess _access;
     ElementWriter _output;
+    WritingTrace* _trace = nullptr;
     std::unique_ptr<OutputNames> _names; // null: names are written as the mapping has them
     const Reporting _reports;
     std::size_t _depth = 0;

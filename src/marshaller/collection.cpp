@@ -221,6 +221,9 @@ WrittenElement elementForItems(Marshalling& writing, const FieldPlan& field,
 
 bool writeCollection(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
                      const Array& array, Ref<Error>* error) {
+    WritingTrace* const trace = writing.trace();
+    if (trace != nullptr)
+        trace->markList();
     if (array.isEmpty() && !field.isRequired)
         return true;
     if (field.hasType() && !field.hasItemType())
@@ -237,12 +240,15 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
             continue;
         }
         Ref<Error> problem;
+        const WritingTrace::Number shown = trace != nullptr ? trace->size() : 0;
         const auto child = field.typeClass != nullptr
                                ? writing.element(*field.typeClass, field.bindTo(), item, &problem)
                                : writing.marshallObject(item, &problem);
         if (child) {
             if (writing.isToBeWritten(item))
                 writing.output().addChild(target, child);
+            else if (trace != nullptr)
+                trace->forget(shown);
         } else if (error != nullptr && problem) {
             *error = std::move(problem);
             return false;

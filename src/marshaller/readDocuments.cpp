@@ -7,6 +7,7 @@
 
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
+#include "marshaller/NoUndo.h"
 #include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
@@ -107,20 +108,6 @@ Source sourceOfFile(const QXXMLMarshaller& marshaller, const String& path, Ref<E
     return source;
 }
 
-// What the reading of the new object does is no change of the one that is there.
-class NoUndo {
-public:
-    explicit NoUndo(Ref<qx::UndoManager> manager) : _manager(std::move(manager)) {
-        _manager->disableUndoRegistration();
-    }
-    ~NoUndo() { _manager->enableUndoRegistration(); }
-    NoUndo(const NoUndo&) = delete;
-    NoUndo& operator=(const NoUndo&) = delete;
-
-private:
-    const Ref<qx::UndoManager> _manager;
-};
-
 qx::Object& present(qx::Object* object) {
     if (object == nullptr)
         throw qx::Exception(qx::Exception::invalidArgument, "there is no object to read into");
@@ -148,7 +135,7 @@ bool fill(QXXMLMarshaller& marshaller, qx::Object& object, qx::IndexedXML& docum
     Ref<Error> problem;
     Ref<qx::Object> fresh;
     {
-        const NoUndo noUndo(marshaller.undoManager());
+        const qx::detail::NoUndo noUndo(marshaller.undoManager());
         fresh = objectOf(marshaller, document, typeOf(object), &problem);
     }
     bool isRead = fresh && !problem; // part of a document is none to reload

@@ -47,7 +47,12 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 // Whatever stood in the element before goes: earlier children too.
 bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
            const Value& value, Ref<Error>*) {
-    writing.output().setText(element, FieldText(value, field.valueType));
+    const FieldText text(value, field.valueType);
+    if (WritingTrace* const trace = writing.trace(); trace != nullptr) {
+        trace->replaceContent(element.drafted);
+        trace->addText(text.view(), text.isEmpty()); // which adds no node
+    }
+    writing.output().setText(element, text);
     return true;
 }
 

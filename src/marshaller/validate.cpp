@@ -106,15 +106,15 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
         return refuse(unknown.firsts().front(), error);
     }
     // Although it is worded as a warning, it goes to the host's debug log; whether there is a
-    // host's log at all is asked of the warnings.
-    if (_reports.isOn())
+    // host's log at all is asked of the warnings. Who has a reading traced hears of it there.
+    if (_reports.isOn() && _trace == nullptr)
         for (const Number node : unknown.firsts())
             _reports.tell(Reporting::Kind::unboundChild, _document, target.source.element(), node,
                           &target.object, unknown.countOf(_document, node),
                           _marshaller->saveUnknownXML());
-    else if (hostHasLogWarning())
+    else if (_trace == nullptr && hostHasLogWarning())
         logDebug("*** Warning: Unbound fields: %@", unknown.written());
-    else
+    else if (_trace == nullptr)
         log("Unbound fields: %@", unknown.written());
     return !_marshaller->saveUnknownXML() ||
            keepChildren(target, *unknown.names(), *unknown.written(), error);
@@ -172,12 +172,12 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
         fail(error, errors::unknownAttributes, unknown.written(), target.source.elementName());
         return refuse(unknown.firsts().front(), error);
     }
-    if (!_reports.isOn())
-        logWarningOrLine("Unbound attributes: %@", unknown.written());
-    else
+    if (_reports.isOn() && _trace == nullptr)
         for (const Number node : unknown.firsts())
             _reports.tell(Reporting::Kind::unboundAttribute, _document, element, node,
                           &target.object, 1, _marshaller->saveUnknownXML());
+    else if (_trace == nullptr)
+        logWarningOrLine("Unbound attributes: %@", unknown.written());
     return !_marshaller->saveUnknownXML() || keepAttributes(target, *unknown.names(), error);
 }
 

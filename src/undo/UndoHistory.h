@@ -49,6 +49,7 @@ struct UndoItemGroup : UndoItem {
     // Stays when it is empty: a stack, a group that is open or performed.
     bool stays = true;
     std::uint64_t identifier = 0;
+    std::uint64_t leadsTo = 0; // of an entry: the position that performing it ends at
     String actionName;
 
     void append(UndoItem& item) noexcept;

@@ -183,6 +183,17 @@ bool UndoManager::canUndo() const noexcept {
 
 bool UndoManager::canRedo() const noexcept { return _state->history.redoStack().count != 0; }
 
+void UndoManager::setSavedMark() {
+    const Ref<UndoManager> kept(this);
+    if (_state->outermostOpenedByItself && _state->open.size() == 1)
+        _state->closeGroup();
+    _state->savedPosition = _state->position;
+}
+
+bool UndoManager::isAtSavedMark() const noexcept {
+    return _state->position == _state->savedPosition && !_state->openGroupsHoldActions();
+}
+
 void UndoManager::removeAllActions() {
     const Ref<UndoManager> kept(this);
     State& state = *_state;

@@ -42,6 +42,11 @@ struct UndoManager::State {
     std::size_t disabled = 0;
     std::size_t levels = 0;
     std::uint64_t lastIdentifier = 0;
+    // Where among all that was done the objects are: a number that each new entry takes anew, and
+    // that undo and redo come back to.
+    std::uint64_t position = 0;
+    std::uint64_t savedPosition = 0;
+    std::uint64_t lastPosition = 0;
 
     UndoItemGroup& destination() noexcept {
         return doing == Doing::undo ? history.redoStack() : history.undoStack();
@@ -94,6 +99,9 @@ struct UndoManager::State {
         if (open.size() > floor) {
             open.back()->append(*group.release());
         } else {
+            group->leadsTo = position;
+            if (doing == Doing::nothing)
+                position = ++lastPosition;
             destination().append(*group.release());
             trim();
         }

@@ -48,13 +48,24 @@ bool UndoManager::State::Performance::perform(UndoItemGroup& from, UndoItemGroup
 void UndoManager::State::Performance::run() {
     std::exception_ptr thrown;
     if (perform(*_group, _performed, thrown))
-        end();
+        finish();
     else
         takeBack();
     // Ends arguments of the host, when nothing here is in use any more.
     _state.history.removeContents(_performed);
     if (thrown)
         std::rethrow_exception(thrown);
+}
+
+// A group inside an open one is no entry: redoing it leads to where nothing was before.
+void UndoManager::State::Performance::finish() noexcept {
+    UndoHistory& history = _state.history;
+    const bool isEntry = &_stack == &history.undoStack() || &_stack == &history.redoStack();
+    const std::uint64_t before = _state.position;
+    if (!isEntry)
+        _state.position = ++_state.lastPosition;
+    end();
+    _state.position = isEntry ? _group->leadsTo : before;
 }
 
 void UndoManager::State::Performance::closeGroupsAbove(std::size_t level) noexcept {

@@ -26,6 +26,7 @@ private:
     bool perform(UndoItemGroup& from, UndoItemGroup& to, std::exception_ptr& thrown) noexcept;
     void closeGroupsAbove(std::size_t level) noexcept;
     void takeBack() noexcept;
+    void finish() noexcept;
     void end() noexcept;
 
     State& _state;

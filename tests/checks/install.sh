@@ -17,6 +17,7 @@ work=$(mktemp -d)
 trap 'rm -rf -- "$work"' EXIT
 compiler=$(cached CMAKE_CXX_COMPILER)
 launcher=$(cached QX_CCACHE)
+export CCACHE_BASEDIR= # it would change the paths that must not be found
 [[ -x $launcher ]] || launcher=
 flags=-O0
 [[ $(cached QX_SANITIZE) != ON ]] || flags+=" -fsanitize=address,undefined"

@@ -1,5 +1,6 @@
 // The samples in C++ of the pages in docs/ are compiled and run: a block headed "cpp NAME" stands
 // between "// sample: NAME" and "// end of sample" in the file of the page's name in docs/samples/.
+// A name with a dot is that of a whole file, which tests/checks/tutorial.sh compiles.
 
 #include "support/Page.h"
 
@@ -19,7 +20,8 @@ std::map<std::string, std::string> samplesIn(const char* folder, const char* end
     for (const auto& file : std::filesystem::directory_iterator(folder))
         if (file.path().extension() == ending)
             for (const auto& block : support::blocksOf(file.path(), opening, closing))
-                if (block.heading.starts_with(beginning)) {
+                if (block.heading.starts_with(beginning) &&
+                    block.heading.find('.') == std::string::npos) {
                     const auto name = block.heading.substr(beginning.size());
                     auto& sample = samples[file.path().stem().string() + " " + name];
                     EXPECT_EQ(sample, "") << file.path() << ": " << name << " stands twice";

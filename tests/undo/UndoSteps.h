@@ -9,6 +9,7 @@
 //     later COMMAND                    the command as an undo action
 //     register NAME|null MESSAGE VALUE the message as an undo action
 //     can                              says what can be done: undo, redo or nothing
+//     save                             sets the saved mark, which "saved" says whether it is at
 //     level, names                     say how many groups are open, the names to undo and redo
 
 #include "support/ObjectSteps.h"
@@ -51,6 +52,8 @@ public:
             const std::string redo = manager->canRedo() ? "redo" : "nothing";
             say(!manager->canUndo() ? redo : manager->canRedo() ? "undo redo" : "undo");
         });
+        know("save", [this](auto&) { manager->setSavedMark(); });
+        know("saved", [this](auto&) { say(manager->isAtSavedMark() ? "yes" : "no"); });
         know("level", [this](auto&) { say(std::to_string(manager->groupingLevel())); });
         know("names", [this](auto&) {
             for (const qx::Value name : {manager->undoActionName(), manager->redoActionName()})

@@ -163,6 +163,19 @@ void addChecking(CLI::App& command, Options& options) {
     command.add_flag("--no-doctype", options.noDoctype, "Fail at a document that has a DOCTYPE");
 }
 
+// What is wrong with an assignment; nothing when it is empty.
+std::string checkAssignment(const std::string& assignment) {
+    const std::size_t equals = assignment.find('=');
+    if (equals == std::string::npos || equals == 0)
+        return "KEYPATH=VALUE is expected, not \"" + assignment + "\"";
+    return {};
+}
+
+void addSaving(CLI::App& command, Options& options) {
+    command.add_flag("--in-place", options.inPlace, "Write the document, and print nothing");
+    command.add_flag("--diff", options.diff, "Print the lines that change");
+}
+
 void addInferring(CLI::App& command, Options& options) {
     command
         .add_option("DOCUMENT", options.documents, "The paths of documents; - is standard input")
@@ -221,6 +234,27 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     command->callback(
         [&] { chosen = [&status](const Options& given) { return check(given, status); }; });
     addChecking(*command, options);
+    addSearch(*command, options);
+
+    command =
+        add("set", "Set values in a document by their key paths, and change nothing else", set);
+    addReading(*command, options);
+    command->add_option("ASSIGNMENT", options.assignments, "Key paths with their new values")
+        ->option_text("KEYPATH=VALUE...")
+        ->required()
+        ->check(CLI::Validator(checkAssignment, ""));
+    addSaving(*command, options);
+    addSearch(*command, options);
+
+    command =
+        add("update",
+            "Save an object into a document, as JSON like that of read, and change nothing else",
+            update);
+    addReading(*command, options);
+    command->add_option("OBJECT", options.object, "The path of the JSON; - is standard input")
+        ->option_text(" ")
+        ->required();
+    addSaving(*command, options);
     addSearch(*command, options);
 
     command = add("infer", "Print a mapping that fits documents which have none", infer);

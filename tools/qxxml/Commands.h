@@ -20,6 +20,10 @@ std::string infer(const Options& options);
 std::string roundtrip(const Options& options);
 // The mapping as a graph for Graphviz; with --svg it has dot print the picture, and gives nothing.
 std::string graph(const Options& options);
+// The document with the values of some key paths set, and nothing else changed (Saving.h).
+std::string set(const Options& options);
+// The document with what an object says as JSON, likewise.
+std::string update(const Options& options);
 // The path that a name resolves to, and the places that were looked at up to there.
 std::string where(const Options& options);
 

@@ -12,7 +12,9 @@ struct Options {
     std::string document; // path of the document; "-" is standard input
     std::string name;     // what `where` looks for
     std::string each; // the name of the elements to read one by one; empty for the whole document
-    std::vector<std::string> documents; // what `infer` and `check` go by
+    std::vector<std::string> documents;   // what `infer` and `check` go by
+    std::string object;                   // path of the JSON for `update`; "-" likewise
+    std::vector<std::string> assignments; // KEYPATH=VALUE each, for `set`
 
     bool strict = false;
     bool discardUnknown = false;
@@ -32,6 +34,8 @@ struct Options {
     std::size_t errors = 1; // how many a reading collects
     std::string output;     // the file for the result; empty for standard output
     std::string why; // the path of the node that `check` is asked about
+    bool inPlace = false;
+    bool diff = false;
 
     // PREFIX=URI each, an empty prefix for names without one.
     std::vector<std::string> prefixes;

@@ -7,7 +7,9 @@
 
 #include <cstdio>
 #include <filesystem>
+#include <fstream>
 #include <iostream>
+#include <sstream>
 
 namespace qxxml {
 
@@ -108,6 +110,23 @@ void Session::readEach(QXXMLMarshaller& marshaller, const std::string& elementNa
     qx::Ref<qx::Error> error;
     if (!marshaller.unmarshallEach(path, elementName, visit, &error))
         throw Failure(error, file());
+}
+
+std::string Session::readBytes(QXXMLMarshaller& marshaller) const {
+    marshaller.setParseOptions(parseOptions());
+    std::ostringstream bytes;
+    std::ifstream document;
+    if (!isStandardInput())
+        document.open(_options.document, std::ios::binary);
+    std::istream& source = isStandardInput() ? std::cin : document;
+    if (source.peek() != std::istream::traits_type::eof())
+        bytes << source.rdbuf();
+    if (!isStandardInput() && bytes.str().empty()) {
+        qx::Ref<qx::Error> error; // why it cannot be read
+        qx::XMLDocument::initWithContentsOfFile(_options.document, {}, &error);
+        throw Failure(error, file());
+    }
+    return bytes.str();
 }
 
 qx::XMLParseOptions Session::parseOptions() const {

@@ -32,14 +32,19 @@ public:
     // The object that the marshaller reads from the document; never null.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
 
+    // The document's bytes; the marshaller parses them as the options say from here on.
+    std::string readBytes(QXXMLMarshaller& marshaller) const;
+
     // Calls visit(object) for each outermost element of that name.
     void readEach(QXXMLMarshaller& marshaller, const std::string& elementName,
                   const std::function<void(const qx::Ref<qx::Object>&)>& visit) const;
 
+    const Options& options() const noexcept { return _options; }
+    // The document as messages call it.
+    std::string file() const { return isStandardInput() ? "<stdin>" : _options.document; }
+
 private:
     qx::XMLParseOptions parseOptions() const;
-    // As messages call it.
-    std::string file() const { return isStandardInput() ? "<stdin>" : _options.document; }
     bool isStandardInput() const { return _options.document == "-"; }
 
     const Options& _options;

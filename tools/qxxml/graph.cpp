@@ -2,8 +2,6 @@
 // to the classes that fields hold and that classes extend. A mapping with includes is drawn by its
 // documents.
 
-#include <QXXMLMarshalling/QXXMLDataRepositoryManager.h>
-
 #include "qxxml/Commands.h"
 #include "qxxml/Failure.h"
 #include "qxxml/Session.h"
@@ -11,6 +9,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <map>
+#include <set>
 
 #include <sys/wait.h>
 
@@ -80,19 +79,20 @@ std::string placesOf(const QXXMLFieldMapping& field) {
     return places;
 }
 
-// A document of the mapping, and what it includes.
+// A document of the mapping: its classes, and the documents that it includes.
 struct Document {
     std::string name;
-    std::vector<qx::String> classes;
-    std::vector<std::string> includes;
+    std::vector<const QXXMLClassMapping*> classes;
+    std::set<std::size_t> includes;
 };
 
 class Graph {
 public:
-    Graph(const QXXMLMarshallingMapping& mapping, const std::string& file) : _mapping(mapping) {
-        for (const auto& node : mapping.mapping()->classMappings())
+    explicit Graph(const QXXMLMarshallingMapping& mapping) : _mapping(mapping) {
+        for (const auto& node : mapping.mapping()->classMappings()) {
             _numbers.emplace(node->className().str(), _numbers.size());
-        addDocument(file, mapping.document());
+            addToDocument(*node);
+        }
     }
 
     std::string text() const {
@@ -104,46 +104,45 @@ public:
             text += documentText(i);
         for (const auto& node : _mapping.mapping()->classMappings())
             text += edgesOf(*node);
-        for (const Document& document : _documents)
-            for (const std::string& included : document.includes)
-                text += "    " + quoted("document " + document.name) + " -> " +
-                        quoted("document " + included) + " [label=\"includes\", style=dotted];\n";
+        for (std::size_t i = 0; i < _documents.size(); ++i)
+            for (const std::size_t included : _documents[i].includes)
+                text += "    document_" + std::to_string(i) + " -> document_" +
+                        std::to_string(included) + " [label=\"includes\", style=dotted];\n";
         return text + "}\n";
     }
 
 private:
-    // The documents were all read a moment ago, when the mapping was resolved.
-    void addDocument(const std::string& name, qx::XMLDocument* document) {
-        const auto known = [&name](const Document& other) { return other.name == name; };
-        if (std::any_of(_documents.begin(), _documents.end(), known))
-            return;
-        const std::size_t place = _documents.size();
-        _documents.push_back({name, {}, {}});
-        const auto own = QXXMLDocumentMapping::initWithXML(
-            document != nullptr ? document->rootElement() : nullptr);
-        if (!own)
-            return;
-        for (const auto& node : own->classMappings())
-            _documents[place].classes.push_back(node->className());
-        for (const qx::String& included : own->includes()) {
-            _documents[place].includes.push_back(included.str());
-            addDocument(
-                included.str(),
-                QXXMLDataRepositoryManager::defaultManager()->documentNamed(included).get());
+    std::size_t documentNamed(const qx::String& name) {
+        const auto known =
+            std::find_if(_documents.begin(), _documents.end(),
+                         [&](const auto& other) { return name == std::string_view(other.name); });
+        if (known == _documents.end())
+            return _documents.push_back({name.str(), {}, {}}), _documents.size() - 1;
+        return static_cast<std::size_t>(known - _documents.begin());
+    }
+
+    // A document without classes is there where one that has some is reached over it.
+    void addToDocument(const QXXMLClassMapping& node) {
+        std::size_t inner = documentNamed(node.place().documentName);
+        _documents[inner].classes.push_back(&node);
+        for (const QXXMLMappingPlace& place : node.includedFrom()) {
+            const std::size_t outer = documentNamed(place.documentName);
+            _documents[outer].includes.insert(inner);
+            inner = outer;
         }
     }
 
     std::string documentText(std::size_t index) const {
         const Document& document = _documents[index];
         std::string tables;
-        for (const qx::String& name : document.classes)
-            if (const auto* node = _mapping.mappingForClassName(name))
-                tables += tableOf(*node);
+        for (const auto* node : document.classes)
+            tables += tableOf(*node);
         if (_documents.size() == 1)
             return tables;
-        return "    subgraph cluster_" + std::to_string(index) + " {\n    " +
-               quoted("document " + document.name) +
-               " [shape=note, label=" + quoted(document.name) + "];\n" + tables + "    }\n";
+        const std::string number = std::to_string(index);
+        return "    subgraph cluster_" + number + " {\n    document_" + number +
+               " [shape=note, label=" + quoted(document.name.substr(document.name.rfind('/') + 1)) +
+               "];\n" + tables + "    }\n";
     }
 
     std::string nodeOf(const QXXMLClassMapping& node) const {
@@ -216,7 +215,7 @@ private:
 
     const QXXMLMarshallingMapping& _mapping;
     std::map<std::string, std::size_t> _numbers;
-    std::vector<Document> _documents; // the given one first
+    std::vector<Document> _documents;
 };
 
 // Has Graphviz draw the picture on standard output.
@@ -237,8 +236,7 @@ void draw(const std::string& text) {
 
 std::string graph(const Options& options) {
     const auto marshaller = Session(options).makeMarshaller();
-    const std::string file = options.mapping.substr(options.mapping.rfind('/') + 1);
-    std::string text = Graph(*marshaller->mapping(), file).text();
+    std::string text = Graph(*marshaller->mapping()).text();
     if (!options.svg)
         return text;
     draw(text);

@@ -96,6 +96,13 @@ public:
     bool canUndo() const noexcept;
     bool canRedo() const noexcept;
 
+    // The mark says what was saved: set where all was saved, it is left by a change that is
+    // registered, and reached again by undo() and redo(). At first it stands where the manager
+    // begins. Setting it ends the group that opened by itself; what another open group holds counts
+    // as changed until it is undone.
+    void setSavedMark();
+    bool isAtSavedMark() const noexcept;
+
     // Forgets all actions, those in open groups too; the groups stay open, but for the one that
     // opened by itself. Registration stays enabled or disabled as it is.
     void removeAllActions();

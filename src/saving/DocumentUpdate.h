@@ -1,0 +1,44 @@
+#pragma once
+
+// One update of a document's text: planned, carried out, read again and compared. What does not
+// come back as it should is written anew, with as little around it as will do.
+
+#include <QXXMLMarshalling/QXXMLUpdate.h>
+
+#include "saving/SourceEncoding.h"
+#include "saving/TracedObject.h"
+#include "saving/UpdatePlan.h"
+
+namespace qx::detail {
+
+class DocumentUpdate {
+public:
+    // The original is lent for the time of the update.
+    DocumentUpdate(QXXMLMarshaller& marshaller, XMLBytes original, const Value& object);
+
+    Result<QXXMLUpdate> run();
+
+private:
+    using Shown = WritingTrace::Number;
+
+    bool prepare(Ref<Error>* error);
+    void prepareWriter();
+    // Carries out the plan. False with an error, or with the object or field in the way.
+    bool carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit, Ref<Error>* error);
+    // Whether the reading says what the object says.
+    bool check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const;
+    void listEdits(const UpdatePlan& plan, const EditList& edits, QXXMLUpdate& update) const;
+
+    const Ref<QXXMLMarshaller> _marshaller;
+    const std::string_view _original;
+    const Value _object;
+    std::unique_ptr<TracedReading> _source;
+    TracedWriting _after;
+    std::unique_ptr<SourceEncoding> _encoding;
+    std::unique_ptr<SourceMarkup> _markup;
+    std::unique_ptr<SourceLayout> _layout;
+    std::unique_ptr<NewXML> _writer;
+    std::set<Shown> _anew;
+};
+
+} // namespace qx::detail

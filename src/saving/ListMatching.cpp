@@ -1,0 +1,201 @@
+#include "saving/ListMatching.h"
+
+#include <algorithm>
+#include <unordered_map>
+
+namespace qx::detail {
+
+namespace {
+
+constexpr std::size_t none = ListMatching::none;
+
+// For each number the longest rising row through all: those that are not in it have moved.
+std::vector<bool> longestRise(const std::vector<std::size_t>& numbers) {
+    std::vector<std::size_t> ends;                           // of rows, by their length
+    std::vector<std::size_t> previous(numbers.size(), none); // in the row
+    for (std::size_t i = 0; i < numbers.size(); ++i) {
+        if (numbers[i] == none)
+            continue;
+        const auto place =
+            std::lower_bound(ends.begin(), ends.end(), numbers[i],
+                             [&](std::size_t end, std::size_t n) { return numbers[end] < n; });
+        previous[i] = place != ends.begin() ? *(place - 1) : none;
+        if (place != ends.end())
+            *place = i;
+        else
+            ends.push_back(i);
+    }
+    std::vector<bool> isIn(numbers.size());
+    for (std::size_t at = ends.empty() ? none : ends.back(); at != none; at = previous[at])
+        isIn[at] = true;
+    return isIn;
+}
+
+class Matcher {
+public:
+    Matcher(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
+            const Likeness& likeness)
+        : _before(before), _now(now), _was(now.size(), none), _likeness(likeness),
+          _isMatched(before.size()) {}
+
+    ListMatching run() {
+        Part all{0, _before.size(), 0, _now.size()};
+        trim(all);
+        matchUnique(all);
+        matchByKey([](const ListItem& item) { return std::to_string(item.hash); }, true);
+        matchByKey([](const ListItem& item) { return item.key; }, false);
+        matchGaps();
+        return {_was, longestRise(_was)};
+    }
+
+private:
+    // Of both lists.
+    struct Part {
+        std::size_t before, beforeEnd, now, nowEnd;
+    };
+
+    void pair(std::size_t before, std::size_t now) {
+        _was[now] = before;
+        _isMatched[before] = true;
+    }
+    bool areEqual(std::size_t before, std::size_t now) const {
+        return _before[before].hash == _now[now].hash;
+    }
+    void trim(Part& part) {
+        while (part.before < part.beforeEnd && part.now < part.nowEnd &&
+               areEqual(part.before, part.now))
+            pair(part.before++, part.now++);
+        while (part.before < part.beforeEnd && part.now < part.nowEnd &&
+               areEqual(part.beforeEnd - 1, part.nowEnd - 1))
+            pair(--part.beforeEnd, --part.nowEnd);
+    }
+    void matchUnique(const Part& part) {
+        struct Count {
+            std::size_t before = 0, now = 0, place = 0;
+        };
+        std::unordered_map<std::uint64_t, Count> counts;
+        for (std::size_t i = part.before; i < part.beforeEnd; ++i) {
+            Count& count = counts[_before[i].hash];
+            ++count.before;
+            count.place = i;
+        }
+        for (std::size_t i = part.now; i < part.nowEnd; ++i)
+            ++counts[_now[i].hash].now;
+        std::vector<std::size_t> places(_now.size(), none);
+        for (std::size_t i = part.now; i < part.nowEnd; ++i)
+            if (const Count& count = counts[_now[i].hash]; count.before == 1 && count.now == 1)
+                places[i] = count.place;
+        const std::vector<bool> isIn = longestRise(places);
+        Part between{part.before, part.beforeEnd, part.now, part.nowEnd};
+        for (std::size_t i = part.now; i <= part.nowEnd; ++i) {
+            if (i < part.nowEnd && !isIn[i])
+                continue;
+            between.beforeEnd = i < part.nowEnd ? places[i] : part.beforeEnd;
+            between.nowEnd = i;
+            matchBetween(between);
+            if (i == part.nowEnd)
+                break;
+            pair(places[i], i);
+            between.before = places[i] + 1;
+            between.now = i + 1;
+        }
+    }
+    void matchBetween(Part part) {
+        trim(part);
+        std::unordered_map<std::uint64_t, std::vector<std::size_t>> places;
+        for (std::size_t i = part.beforeEnd; part.now < part.nowEnd && i-- > part.before;)
+            places[_before[i].hash].push_back(i);
+        for (std::size_t i = part.now; i < part.nowEnd; ++i) {
+            const auto found = places.find(_now[i].hash);
+            if (found == places.end() || found->second.empty())
+                continue;
+            pair(found->second.back(), i);
+            found->second.pop_back();
+        }
+    }
+    // Of those that are left; equal ones one after another.
+    template <class KeyOf>
+    void matchByKey(KeyOf keyOf, bool isOfAnyKind) {
+        std::unordered_map<std::string, std::vector<std::size_t>> places;
+        for (std::size_t i = _before.size(); i-- > 0;)
+            if (std::string key = keyOf(_before[i]); !_isMatched[i] && !key.empty())
+                places[std::move(key)].push_back(i);
+        for (std::size_t i = 0; i < _now.size() && !places.empty(); ++i) {
+            const auto found = _was[i] == none ? places.find(keyOf(_now[i])) : places.end();
+            if (found == places.end() || found->second.empty() ||
+                (!isOfAnyKind && _before[found->second.back()].kind != _now[i].kind))
+                continue;
+            pair(found->second.back(), i);
+            found->second.pop_back();
+        }
+    }
+    // Of those that stand between the same two that have their place.
+    void matchGaps() {
+        const std::vector<bool> stays = longestRise(_was);
+        std::size_t before = 0, now = 0;
+        for (std::size_t i = 0; i <= _now.size(); ++i) {
+            if (i < _now.size() && !stays[i])
+                continue;
+            const std::size_t end = i < _now.size() ? _was[i] : _before.size();
+            matchGap(before, end, now, i);
+            before = end + 1;
+            now = i + 1;
+        }
+    }
+    void matchGap(std::size_t before, std::size_t beforeEnd, std::size_t now, std::size_t nowEnd) {
+        std::vector<std::size_t> old, fresh;
+        for (; now < nowEnd; ++now)
+            if (_was[now] == none)
+                fresh.push_back(now);
+        for (; before < beforeEnd && !fresh.empty(); ++before)
+            if (!_isMatched[before])
+                old.push_back(before);
+        constexpr std::size_t most = 4096;
+        if (_likeness && old.size() * fresh.size() <= most)
+            return matchAlike(old, fresh);
+        for (std::size_t i = 0; i < std::min(old.size(), fresh.size()); ++i)
+            if (_before[old[i]].kind == _now[fresh[i]].kind)
+                pair(old[i], fresh[i]);
+    }
+    // The pairs in order that have most in common in sum; any pair is better than none.
+    void matchAlike(const std::vector<std::size_t>& old, const std::vector<std::size_t>& fresh) {
+        const std::size_t width = fresh.size() + 1;
+        std::vector<std::size_t> best((old.size() + 1) * width);
+        const auto gain = [&](std::size_t i, std::size_t j) -> std::size_t {
+            const bool isSameKind = _before[old[i]].kind == _now[fresh[j]].kind;
+            return isSameKind ? 1 + 2 * _likeness(old[i], fresh[j]) : 0;
+        };
+        std::vector<std::size_t> gains(old.size() * fresh.size());
+        for (std::size_t i = old.size(); i-- > 0;)
+            for (std::size_t j = fresh.size(); j-- > 0;) {
+                const std::size_t with = gains[i * fresh.size() + j] = gain(i, j);
+                best[i * width + j] =
+                    std::max({best[(i + 1) * width + j], best[i * width + j + 1],
+                              with != 0 ? with + best[(i + 1) * width + j + 1] : 0});
+            }
+        for (std::size_t i = 0, j = 0; i < old.size() && j < fresh.size();) {
+            const std::size_t with = gains[i * fresh.size() + j];
+            if (with != 0 && best[i * width + j] == with + best[(i + 1) * width + j + 1])
+                pair(old[i++], fresh[j++]);
+            else if (best[i * width + j] == best[(i + 1) * width + j])
+                ++i;
+            else
+                ++j;
+        }
+    }
+
+    const std::vector<ListItem>& _before;
+    const std::vector<ListItem>& _now;
+    std::vector<std::size_t> _was;
+    const Likeness& _likeness;
+    std::vector<bool> _isMatched;
+};
+
+} // namespace
+
+ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
+                   const Likeness& likeness) {
+    return Matcher(before, now, likeness).run();
+}
+
+} // namespace qx::detail

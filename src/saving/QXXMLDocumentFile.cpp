@@ -1,0 +1,135 @@
+#include <QXXMLMarshalling/QXXMLDocumentFile.h>
+
+#include "files/AtomicWrite.h"
+#include "files/Files.h"
+#include "marshaller/DocumentParsing.h"
+#include "model/Errors.h"
+#include "model/LibraryClass.h"
+#include "saving/SourceEncoding.h"
+#include "saving/TextMerge.h"
+#include "xml/XMLParser.h"
+
+using qx::Data;
+using qx::Error;
+using qx::Ref;
+using qx::String;
+
+QXXMLDocumentFile::~QXXMLDocumentFile() = default;
+
+Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMarshaller> marshaller,
+                                               Ref<Error>* error) {
+    qx::detail::reset(error);
+    auto text = qx::readFile(path, error);
+    if (!text)
+        return nullptr;
+    Ref<Error> problem;
+    auto root = marshaller->readString(*text, &problem);
+    if (problem || !root) {
+        if (error != nullptr)
+            *error = std::move(problem);
+        return nullptr;
+    }
+    auto file = qx::make<QXXMLDocumentFile>();
+    file->_path = path;
+    file->_marshaller = std::move(marshaller);
+    file->_text = std::move(text);
+    file->_root = std::move(root);
+    return file;
+}
+
+void QXXMLDocumentFile::setUndoManager(Ref<qx::UndoManager> manager) {
+    _undoManager = std::move(manager);
+}
+
+void QXXMLDocumentFile::setBase(Ref<Data> text) {
+    _text = std::move(text);
+    if (_undoManager)
+        _undoManager->setSavedMark();
+}
+
+bool QXXMLDocumentFile::isEdited() const {
+    if (_undoManager)
+        return !_undoManager->isAtSavedMark();
+    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    return !update || !update->edits().empty();
+}
+
+bool QXXMLDocumentFile::write(const String& path, const Ref<Data>& bytes, Ref<Error>* error) {
+    if (!qx::writeFileAtomically(path, bytes->view(), error))
+        return false;
+    setBase(bytes);
+    return true;
+}
+
+bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
+    qx::detail::reset(error);
+    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    if (!update) {
+        if (error != nullptr)
+            *error = update.error();
+        return false;
+    }
+    const auto theirs = qx::readFile(_path, error);
+    if (!theirs)
+        return false;
+    const bool isSame = theirs->view() == _text->view();
+    if (!isSame && changed == Changed::refuse)
+        return qx::fail(error, qx::errors::fileHasChanged, _path);
+    if (!isSame && changed == Changed::carryOver)
+        return carryOver(*update, theirs, error);
+    if (isSame && update->edits().empty()) {
+        setBase(_text);
+        return true;
+    }
+    return write(_path, update->bytes(), error);
+}
+
+bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
+    qx::detail::reset(error);
+    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    if (!update && error != nullptr)
+        *error = update.error();
+    if (!update || !write(path, update->bytes(), error))
+        return false;
+    _path = path;
+    return true;
+}
+
+bool QXXMLDocumentFile::revert(Ref<Error>* error) {
+    qx::detail::reset(error);
+    auto text = qx::readFile(_path, error);
+    if (!text || !_marshaller->readStringInto(_root, *text, error))
+        return false;
+    setBase(std::move(text));
+    return true;
+}
+
+// The merged text is read before anything is written: a text that was carried to a wrong place may
+// be none.
+bool QXXMLDocumentFile::carryOver(const QXXMLUpdate& update, const Ref<Data>& theirs,
+                                  Ref<Error>* error) {
+    const auto options = qx::detail::parsingOf(*_marshaller);
+    const auto base = qx::XMLParser::parse(_text, options, error);
+    const auto now = base ? qx::XMLParser::parse(theirs, options, error) : nullptr;
+    if (!now)
+        return false;
+    String conflict;
+    const auto merged = qx::detail::carriedOver(base->index().text(), update.edits(),
+                                                now->index().text(), conflict);
+    if (!merged)
+        return qx::fail(error, qx::errors::bothHaveChanged, conflict);
+    const auto bytes =
+        qx::detail::SourceEncoding(theirs->view()).encoded(*merged, now->index().text(), error);
+    Ref<Error> problem;
+    if (!bytes || !_marshaller->readString(*bytes, &problem) || problem) {
+        if (problem && error != nullptr)
+            *error = std::move(problem);
+        return false;
+    }
+    return qx::writeFileAtomically(_path, bytes->view(), error) &&
+           (_marshaller->readStringInto(_root, *bytes, error) && (setBase(bytes), true));
+}
+
+const qx::Class& QXXMLDocumentFile::describedClass() const {
+    return qx::libraryClass<QXXMLDocumentFile>("QXXMLDocumentFile");
+}

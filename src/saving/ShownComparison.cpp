@@ -1,0 +1,84 @@
+#include "saving/ShownComparison.h"
+
+#include <algorithm>
+
+namespace qx::detail {
+
+using Kind = WritingTrace::Kind;
+
+ShownComparison::Shown ShownComparison::firstDifference() {
+    if (_wanted.size() == 0 || _found.size() == 0)
+        return _wanted.size() == _found.size() ? none : 0;
+    return compare(0, 0);
+}
+
+ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
+    const auto& is = _wanted[wanted];
+    const auto& other = _found[found];
+    if (is.kind != other.kind || is.plan != other.plan || is.field != other.field)
+        return wanted;
+    if (is.kind == Kind::text)
+        return _wanted.text(wanted) == _found.text(found) ? none : wanted;
+    if (is.kind == Kind::object && !keepTheSame(wanted, found))
+        return wanted;
+    Shown a = wanted + 1, b = found + 1;
+    while (true) {
+        while (a < is.next && _wanted[a].isHidden)
+            a = _wanted[a].next;
+        while (b < other.next && _found[b].isHidden)
+            b = _found[b].next;
+        if (a >= is.next || b >= other.next)
+            return a >= is.next && b >= other.next ? none : wanted;
+        if (const Shown different = compare(a, b); different != none)
+            return different;
+        a = _wanted[a].next;
+        b = _found[b].next;
+    }
+}
+
+std::vector<std::string> ShownComparison::kept(const WritingTrace& trace, Shown object,
+                                               bool attributes) const {
+    std::vector<std::string> texts;
+    if (const auto* const list = trace.keptOf(object))
+        for (const auto& each : attributes ? list->attributes : list->children)
+            if (!_isDouble(trace[object].plan, each.text))
+                texts.push_back(each.text);
+    return texts;
+}
+
+// Attributes have no order; children have one among those of a name.
+bool ShownComparison::keepTheSame(Shown wanted, Shown found) const {
+    for (const bool attributes : {false, true}) {
+        auto is = kept(_wanted, wanted, attributes);
+        auto other = kept(_found, found, attributes);
+        std::sort(is.begin(), is.end());
+        std::sort(other.begin(), other.end());
+        if (is != other)
+            return false;
+    }
+    return true;
+}
+
+void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) {
+    // Both show the same, but for hidden values, which stand one in a field.
+    Shown b = 0;
+    for (Shown a = 0; a < _wanted.size() && b < _found.size(); ++a, ++b) {
+        const bool isHidden = _wanted[a].isHidden;
+        const bool isOther = _found[b].isHidden;
+        if (isHidden && isOther) {
+            if (_wanted[a].kind != _found[b].kind || _wanted.text(a) != _found.text(b))
+                visit(a);
+            a = _wanted[a].next - 1;
+            b = _found[b].next - 1;
+        } else if (isHidden) {
+            visit(a);
+            a = _wanted[a].next - 1;
+            --b;
+        } else if (isOther) {
+            b = _found[b].next - 1;
+            --a;
+        }
+    }
+}
+
+} // namespace qx::detail

@@ -1,0 +1,59 @@
+#pragma once
+
+// How a document is laid out: what stands before an element on its line, and the habits that what
+// is new in it follows: line ends, indentation, quotes, the tags of empty elements.
+
+#include "saving/SourceMarkup.h"
+
+#include <optional>
+#include <string>
+#include <unordered_map>
+
+namespace qx::detail {
+
+class SourceLayout {
+public:
+    using Number = SourceMarkup::Number;
+    using Offset = SourceMarkup::Offset;
+
+    // Both must outlive this.
+    SourceLayout(const XMLIndex& index, const SourceMarkup& markup);
+
+    // The line break and the blanks before a place, where nothing else stands before it on its
+    // line; null where something does.
+    std::optional<std::string_view> lineStart(Offset place) const;
+    // The same for what is to stand inside the element, which has nothing inside yet.
+    std::optional<std::string> lineStartInside(Number element) const;
+    // Whether white space inside the element is its content: beside other text, and where xml:space
+    // says so.
+    bool isInline(Number element) const;
+    // Where the comments before an element begin that stand on lines of their own.
+    Offset withComments(Offset begin) const;
+    // Behind the element and the comments behind it on its line.
+    Offset behind(Number entry) const;
+    // Whether nothing but a line's or an element's end stands behind the place.
+    bool endsLine(Offset place) const;
+    // What goes with the element: its line, where it has that to itself.
+    std::pair<Offset, Offset> region(Number entry, Offset begin) const;
+
+    // The indentation of one level.
+    const std::string& unit() const noexcept { return _unit; }
+    char quote() const noexcept { return _quote; }
+    std::string_view newline() const noexcept { return _newline; }
+    // "/>", " />", or nothing where empty elements have an end tag.
+    std::string_view emptyTag() const noexcept { return _emptyTag; }
+
+private:
+    void findUnit(Number root);
+    bool hasInlineText(Number element) const;
+
+    const XMLIndex& _index;
+    const SourceMarkup& _markup;
+    mutable std::unordered_map<Number, bool> _inline; // what was asked for
+    std::string_view _newline = "\n";
+    std::string _unit = "    ";
+    char _quote = '"';
+    std::string_view _emptyTag = "/>";
+};
+
+} // namespace qx::detail

@@ -1,0 +1,218 @@
+#include "saving/SourceMarkup.h"
+
+#include "xml/XMLCharacters.h"
+
+#include <unordered_map>
+
+namespace qx::detail {
+
+namespace {
+
+constexpr std::size_t npos = std::string_view::npos;
+constexpr std::string_view nameEnds = " \t\r\n=/>?";
+
+std::size_t behind(std::string_view text, std::string_view part, std::size_t from) {
+    const std::size_t at = text.find(part, from);
+    return at != npos ? at + part.size() : text.size();
+}
+
+// A DOCTYPE's end: its declarations may hold brackets in quotes and in comments.
+std::size_t behindDoctype(std::string_view text, std::size_t at) {
+    bool isInside = false;
+    while (at < text.size()) {
+        const char c = text[at];
+        if (text.substr(at).starts_with("<!--"))
+            at = behind(text, "-->", at + 4);
+        else if (text.substr(at).starts_with("<?"))
+            at = behind(text, "?>", at + 2);
+        else if (c == '"' || c == '\'')
+            at = behind(text, text.substr(at, 1), at + 1);
+        else if (c == '>' && !isInside)
+            return at + 1;
+        else {
+            isInside = c == '[' || (isInside && c != ']');
+            ++at;
+        }
+    }
+    return at;
+}
+
+} // namespace
+
+SourceMarkup::SourceMarkup(const XMLIndex& index)
+    : _index(index), _spots(index.entries().size()), _parents(_spots.size(), none) {
+    findParents();
+    tokenise();
+    place();
+}
+
+void SourceMarkup::findParents() {
+    std::vector<Number> open;
+    for (Number at = 0; at < _parents.size(); ++at) {
+        while (!open.empty() && _index[open.back()].next <= at)
+            open.pop_back();
+        _parents[at] = open.empty() ? none : open.back();
+        if (_index[at].nodeKind() == XMLNodeKind::element)
+            open.push_back(at);
+    }
+}
+
+// Where the root element begins.
+std::size_t SourceMarkup::skipProlog() const {
+    std::size_t at = text().find('<');
+    while (at < text().size()) {
+        const std::string_view rest = text().substr(at);
+        if (rest.starts_with("<?"))
+            at = behind(text(), "?>", at);
+        else if (rest.starts_with("<!--"))
+            at = behind(text(), "-->", at + 4);
+        else if (rest.starts_with("<!"))
+            at = behindDoctype(text(), at + 2);
+        else
+            return at;
+        at = text().find('<', at);
+    }
+    return text().size();
+}
+
+std::string_view SourceMarkup::nameAt(std::size_t begin) const {
+    const std::size_t end = text().find_first_of(nameEnds, begin);
+    return text().substr(begin, end - begin);
+}
+
+void SourceMarkup::add(XMLNodeKind kind, std::size_t begin, std::size_t end) {
+    Token token{kind, {}};
+    token.spot = {static_cast<Offset>(begin), static_cast<Offset>(end), static_cast<Offset>(begin),
+                  static_cast<Offset>(end)};
+    token.next = static_cast<std::uint32_t>(_tokens.size()) + 1;
+    _tokens.push_back(token);
+}
+
+std::size_t SourceMarkup::startTag(std::size_t at) {
+    add(XMLNodeKind::element, at, at);
+    Token& token = _tokens.back();
+    token.attributes = static_cast<std::uint32_t>(_attributes.size());
+    std::size_t next = at + 1 + nameAt(at + 1).size();
+    while (next < text().size()) {
+        next = text().find_first_not_of(" \t\r\n", next);
+        if (text()[next] == '>' || text()[next] == '/')
+            break;
+        const std::string_view name = nameAt(next);
+        const std::size_t quote = text().find_first_of("\"'", next + name.size());
+        const std::size_t close = text().find(text()[quote], quote + 1);
+        _attributes.push_back({{static_cast<Offset>(next), static_cast<Offset>(close + 1),
+                                static_cast<Offset>(quote + 1), static_cast<Offset>(close)},
+                               name});
+        next = close + 1;
+    }
+    token.attributesEnd = static_cast<std::uint32_t>(_attributes.size());
+    const bool isEmpty = text()[next] == '/';
+    next += isEmpty ? 2 : 1;
+    token.spot.insideBegin = token.spot.insideEnd = token.spot.end = static_cast<Offset>(next);
+    if (!isEmpty)
+        _open.push_back(static_cast<std::uint32_t>(_tokens.size() - 1));
+    return next;
+}
+
+void SourceMarkup::tokenise() {
+    std::size_t at = startTag(skipProlog());
+    while (!_open.empty() && at < text().size()) {
+        const std::string_view rest = text().substr(at);
+        if (rest.starts_with("</")) {
+            Token& token = _tokens[_open.back()];
+            token.spot.insideEnd = static_cast<Offset>(at);
+            at = behind(text(), ">", at);
+            token.spot.end = static_cast<Offset>(at);
+            token.next = static_cast<std::uint32_t>(_tokens.size());
+            _open.pop_back();
+        } else if (rest.starts_with("<!--")) {
+            const std::size_t begin = std::exchange(at, behind(text(), "-->", at + 4));
+            add(XMLNodeKind::comment, begin, at);
+        } else if (rest.starts_with("<?")) {
+            const std::size_t begin = std::exchange(at, behind(text(), "?>", at));
+            add(XMLNodeKind::processingInstruction, begin, at);
+        } else if (rest.front() == '<' && !rest.starts_with("<![")) {
+            at = startTag(at);
+        } else {
+            const std::size_t begin = at;
+            while (at < text().size() &&
+                   (text()[at] != '<' || text().substr(at).starts_with("<![")))
+                at = text()[at] == '<' ? behind(text(), "]]>", at)
+                                       : std::min(text().find('<', at), text().size());
+            add(XMLNodeKind::text, begin, at);
+        }
+    }
+}
+
+void SourceMarkup::place() {
+    if (_spots.empty())
+        return;
+    Number root = 0;
+    while (root < _spots.size() && _index[root].nodeKind() != XMLNodeKind::element)
+        root = _index.siblingOf(root);
+    if (root == _spots.size())
+        return;
+    _pairs.emplace_back(root, 0);
+    while (!_pairs.empty()) {
+        const auto [element, token] = _pairs.back();
+        _pairs.pop_back();
+        _spots[element] = _tokens[token].spot;
+        placeAttributes(element, _tokens[token]);
+        placeChildren(element, token);
+    }
+}
+
+void SourceMarkup::placeAttributes(Number element, const Token& token) {
+    std::unordered_map<std::string_view, const Attribute*> byName;
+    for (std::uint32_t i = token.attributes; i < token.attributesEnd; ++i)
+        byName.emplace(_attributes[i].name, &_attributes[i]);
+    for (Number at = _index.content(element); !byName.empty() && at < _index.firstChild(element);
+         ++at) {
+        const String& name = _index.name(_index[at]);
+        const bool isDeclaration = _index[at].nodeKind() == XMLNodeKind::namespaceDeclaration;
+        const std::string declared =
+            name.isEmpty() ? "xmlns" : String::concat({"xmlns:", name}).str();
+        const auto found = byName.find(isDeclaration ? std::string_view(declared) : name.view());
+        if (found != byName.end())
+            _spots[at] = found->second->spot;
+    }
+}
+
+// Places none of them where they are not all the text's own.
+void SourceMarkup::placeChildren(Number element, std::uint32_t token) {
+    std::uint32_t child = token + 1;
+    const std::uint32_t end = _tokens[token].next;
+    const std::size_t before = _pairs.size();
+    Number at = _index.firstChild(element);
+    const Number atEnd = _index.contentEnd(element);
+    std::vector<std::pair<Number, std::uint32_t>> leaves;
+    while (at < atEnd || child < end) {
+        const bool isText = child < end && _tokens[child].kind == XMLNodeKind::text;
+        const bool hasText = at < atEnd && _index[at].nodeKind() == XMLNodeKind::text;
+        if (isText || hasText) {
+            if (isText && hasText)
+                leaves.emplace_back(at, child);
+            at = hasText ? _index.siblingOf(at) : at;
+            child = isText ? _tokens[child].next : child;
+            continue;
+        }
+        const bool fits = at < atEnd && child < end &&
+                          _index[at].nodeKind() == _tokens[child].kind &&
+                          (_tokens[child].kind != XMLNodeKind::element ||
+                           nameAt(_tokens[child].spot.begin + 1) == _index.name(_index[at]).view());
+        if (!fits) {
+            _pairs.resize(before);
+            return;
+        }
+        if (_tokens[child].kind == XMLNodeKind::element)
+            _pairs.emplace_back(at, child);
+        else
+            leaves.emplace_back(at, child);
+        at = _index.siblingOf(at);
+        child = _tokens[child].next;
+    }
+    for (const auto& [entry, leaf] : leaves)
+        _spots[entry] = _tokens[leaf].spot;
+}
+
+} // namespace qx::detail

@@ -1,0 +1,128 @@
+// Unknown XML that a program has changed on an object. What a field took, too, is none of it.
+
+#include "saving/UpdatePlan.h"
+
+#include <algorithm>
+#include <unordered_map>
+
+namespace qx::detail {
+
+using Form = ReadingTrace::Form;
+using Kept = WritingTrace::Kept;
+
+namespace {
+
+bool areEqual(const std::vector<Kept>& a, const std::vector<Kept>& b) {
+    return std::equal(a.begin(), a.end(), b.begin(), b.end(),
+                      [](const Kept& x, const Kept& y) { return x.text == y.text; });
+}
+
+} // namespace
+
+void UpdatePlan::compareKept(const Context& context) {
+    static const WritingTrace::KeptList nothing;
+    const auto* before = _source.before.keptOf(context.before);
+    const auto* after = _source.after.keptOf(context.after);
+    const WritingTrace::KeptList& was = before != nullptr ? *before : nothing;
+    const WritingTrace::KeptList& is = after != nullptr ? *after : nothing;
+    if (!areEqual(was.children, is.children))
+        compareKeptChildren(context, was, is);
+    if (!areEqual(was.attributes, is.attributes))
+        compareKeptAttributes(context, was, is);
+}
+
+// The object lists them by name, each name's in the order of the document.
+std::vector<UpdatePlan::Entry> UpdatePlan::entriesOfKept(const Context& context,
+                                                         const std::vector<Kept>& kept) const {
+    std::unordered_map<String, std::vector<Entry>> byName;
+    const auto uses = usesOf(context.owner, nullptr);
+    for (auto number = uses.rbegin(); number != uses.rend(); ++number)
+        if (use(*number).form != Form::declaration)
+            byName[_source.document.writtenName(use(*number).entry)].push_back(use(*number).entry);
+    std::vector<Entry> entries;
+    for (const Kept& each : kept) {
+        std::vector<Entry>& named = byName[each.node->name()];
+        entries.push_back(named.empty() ? none : named.back());
+        if (!named.empty())
+            named.pop_back();
+    }
+    return entries;
+}
+
+void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
+                                     const WritingTrace::KeptList& is) {
+    const ClassPlan* const plan = _source.after[context.after].plan;
+    const std::vector<Entry> entries = entriesOfKept(context, was.children);
+    const auto itemsOf = [&](const std::vector<Kept>& all) {
+        std::vector<ListItem> items;
+        for (const Kept& each : all)
+            items.push_back({std::hash<std::string>()(each.text),
+                             std::hash<std::string_view>()(each.node->name().view())});
+        return items;
+    };
+    const ListMatching matching = match(itemsOf(was.children), itemsOf(is.children));
+    std::vector<bool> isThere(was.children.size());
+    for (std::size_t i = 0; i < is.children.size(); ++i) {
+        const std::string& text = is.children[i].text;
+        const std::size_t before = matching.was[i];
+        if (before == ListMatching::none) {
+            if (!_source.writer.isTaken(plan, text))
+                insertChild(text, placeInside(context.entry), context.after);
+            continue;
+        }
+        isThere[before] = true;
+        if (text == was.children[before].text ||
+            _source.writer.isTaken(plan, was.children[before].text))
+            continue;
+        const Entry entry = entries[before];
+        if (entry == none || !_source.markup[entry].isPlaced())
+            return fail(context.after);
+        add(_source.markup[entry].begin, _source.markup[entry].end, text, context.after);
+    }
+    for (std::size_t i = 0; i < isThere.size(); ++i) {
+        if (isThere[i] || _source.writer.isTaken(plan, was.children[i].text))
+            continue;
+        if (entries[i] == none)
+            return fail(context.after);
+        removeElement(entries[i], context.after);
+    }
+}
+
+void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
+                                       const WritingTrace::KeptList& is) {
+    const std::vector<Entry> entries = entriesOfKept(context, was.attributes);
+    std::unordered_map<String, const Kept*> now;
+    for (const Kept& each : is.attributes)
+        now.emplace(each.node->name(), &each);
+    for (std::size_t i = 0; i < was.attributes.size(); ++i) {
+        const auto found = now.find(was.attributes[i].node->name());
+        const Kept* const kept = found != now.end() ? found->second : nullptr;
+        if (found != now.end())
+            now.erase(found);
+        if (kept != nullptr && kept->text == was.attributes[i].text)
+            continue;
+        if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
+            return fail(context.after);
+        const SourceMarkup::Spot& spot = _source.markup[entries[i]];
+        const char quote = _source.markup.text()[spot.end - 1];
+        if (kept != nullptr)
+            add(spot.insideBegin, spot.insideEnd,
+                _source.writer.attributeValue(kept->node->stringValue().view(), quote),
+                context.after);
+        else
+            add(blanksBefore(spot.begin), spot.end, {}, context.after);
+    }
+    const SourceMarkup::Spot& tag = _source.markup[context.entry];
+    if (!tag.isPlaced())
+        return now.empty() ? void() : fail(context.after);
+    const auto nameEnd =
+        tag.begin + 1 +
+        static_cast<SourceMarkup::Offset>(_source.document.writtenName(context.entry).size());
+    for (const Kept& each : is.attributes)
+        if (now.contains(each.node->name()))
+            add(nameEnd, nameEnd,
+                _source.writer.attribute(each.node->name().view(), each.node->stringValue().view()),
+                context.after);
+}
+
+} // namespace qx::detail

@@ -1,0 +1,273 @@
+// Collections: which items are new, gone or moved, and where they stand.
+
+#include "saving/UpdatePlan.h"
+
+#include <algorithm>
+#include <unordered_set>
+#include <utility>
+
+namespace qx::detail {
+
+using Form = ReadingTrace::Form;
+
+// Both lists of items; what each was read from, and the wrapper around them.
+struct UpdatePlan::List {
+    std::vector<Shown> was, is;
+    std::vector<std::uint32_t> uses; // of what was
+    Entry wrapper = none;
+    std::uint32_t binding = 0;
+    const FieldPlan* plan = nullptr;
+    Shown field = none; // in the later writing
+};
+
+void UpdatePlan::compareList(const Context& context, Shown before, Shown after,
+                             std::size_t ordinal) {
+    List list;
+    list.was = _source.before.shownValues(before);
+    list.is = _source.after.shownValues(after);
+    list.plan = _source.after[after].field;
+    list.field = after;
+    if (!findEntries(context, list))
+        return fail(after);
+    if (list.is.empty() && removeWrapper(list))
+        return;
+    if (list.was.empty())
+        return fillList(context, list, ordinal);
+    arrangeList(context, list, ordinal);
+}
+
+// By place, or, where a setter has sorted them, by the objects themselves. False where it does not
+// show which is which.
+bool UpdatePlan::findEntries(const Context& context, List& list) const {
+    std::unordered_map<const Object*, std::uint32_t> byObject;
+    for (const std::uint32_t number : usesOf(context.owner, list.plan)) {
+        const ReadingTrace::Use& taken = use(number);
+        list.binding = taken.binding;
+        if (taken.form == Form::wrapper)
+            list.wrapper = taken.entry;
+        else if (taken.form == Form::item || taken.form == Form::child)
+            list.uses.push_back(number);
+        if (taken.made != ReadingTrace::none)
+            byObject.emplace(_source.read.owners()[taken.made].object, number);
+    }
+    if (list.uses.size() != list.was.size())
+        return false;
+    for (std::size_t i = 0; i < list.was.size(); ++i) {
+        const WritingTrace::Shown& shown = _source.before[list.was[i]];
+        const bool isObject = shown.kind == WritingTrace::Kind::object;
+        if (isObject != (use(list.uses[i]).made != ReadingTrace::none))
+            return false;
+        if (!isObject || shown.object == nullptr)
+            continue;
+        const auto found = byObject.find(shown.object);
+        if (found == byObject.end())
+            return false;
+        list.uses[i] = found->second;
+    }
+    return true;
+}
+
+namespace {
+
+ListItem itemOf(const WritingTrace& trace, WritingTrace::Number value) {
+    const WritingTrace::Shown& shown = trace[value];
+    return {shown.hash, reinterpret_cast<std::uintptr_t>(shown.plan)};
+}
+
+// The text of the item's field, where it has one.
+std::string_view textOfField(const WritingTrace& trace, WritingTrace::Number item,
+                             std::size_t ordinal) {
+    WritingTrace::Number field = item + 1;
+    for (std::size_t i = 0; i < ordinal; ++i)
+        field = trace[field].next;
+    const WritingTrace::Number value = field + 1;
+    const bool hasText = value < trace[field].next && !trace[value].isHidden &&
+                         trace[value].kind == WritingTrace::Kind::text;
+    return hasText ? trace.text(value) : std::string_view();
+}
+
+bool setKeys(const WritingTrace& trace, const std::vector<WritingTrace::Number>& values,
+             std::size_t ordinal, std::vector<ListItem>& items) {
+    std::unordered_set<std::string_view> seen;
+    for (std::size_t i = 0; i < values.size(); ++i) {
+        const std::string_view text = textOfField(trace, values[i], ordinal);
+        if (text.empty() || !seen.insert(text).second)
+            return false;
+        items[i].key = text;
+    }
+    return true;
+}
+
+} // namespace
+
+// The first attribute in the mapping's order that all items have, each its own.
+void UpdatePlan::findKeys(std::vector<ListItem>& before, std::vector<ListItem>& now,
+                          const List& list) const {
+    if (now.empty() || before.empty() || now.front().kind == 0)
+        return;
+    const auto isOfKind = [&](const ListItem& item) { return item.kind == now.front().kind; };
+    if (!std::all_of(before.begin(), before.end(), isOfKind) ||
+        !std::all_of(now.begin(), now.end(), isOfKind))
+        return;
+    std::size_t ordinal = 0;
+    const Shown first = list.is.front();
+    for (Shown field = first + 1; field < _source.after[first].next;
+         field = _source.after[field].next, ++ordinal) {
+        if (_source.after[field].field->kind == BindingKind::attribute &&
+            setKeys(_source.before, list.was, ordinal, before) &&
+            setKeys(_source.after, list.is, ordinal, now))
+            return;
+    }
+    for (auto* items : {&before, &now})
+        for (ListItem& item : *items)
+            item.key.clear();
+}
+
+// How many fields of two objects of a class say the same, and keep the same.
+std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
+    const auto& before = _source.before;
+    const auto& after = _source.after;
+    if (isText(is) || before[was].kind == WritingTrace::Kind::text)
+        return 0;
+    std::size_t alike = 0;
+    Shown other = was + 1;
+    for (Shown field = is + 1; field < after[is].next; field = after[field].next) {
+        const bool isEmpty = after[field].next == field + 1;
+        alike += !isEmpty && after[field].hash == before[other].hash ? 1 : 0;
+        other = before[other].next;
+    }
+    const auto* const kept = after.keptOf(is);
+    const auto* const wasKept = before.keptOf(was);
+    const bool keepsTheSame = kept != nullptr && wasKept != nullptr &&
+                              kept->children.size() + kept->attributes.size() != 0 &&
+                              kept->hash() == wasKept->hash();
+    return alike + (keepsTheSame ? 2 : 0);
+}
+
+void UpdatePlan::arrangeList(const Context& context, const List& list, std::size_t ordinal) {
+    std::vector<ListItem> before, now;
+    for (const Shown value : list.was)
+        before.push_back(itemOf(_source.before, value));
+    for (const Shown value : list.is)
+        now.push_back(itemOf(_source.after, value));
+    findKeys(before, now, list);
+    const ListMatching matching = match(before, now, [&](std::size_t was, std::size_t is) {
+        return likeness(list.was[was], list.is[is]);
+    });
+    std::vector<bool> isThere(list.was.size());
+    std::size_t previous = ListMatching::none; // that has kept its place
+    std::size_t first = 0;
+    for (std::size_t i = 0; i < list.is.size() && first == 0; ++i)
+        first = matching.stays[i] ? matching.was[i] + 1 : 0;
+    const std::size_t front = first != 0 ? first - 1 : 0;
+    for (std::size_t i = 0; i < list.is.size(); ++i) {
+        const std::size_t was = matching.was[i];
+        if (was != ListMatching::none && matching.stays[i]) {
+            previous = was;
+            isThere[was] = true;
+            compareValue(context, list.uses[was], list.was[was], list.is[i], ordinal);
+            continue;
+        }
+        const Entry beside =
+            use(list.uses[previous != ListMatching::none ? previous : front]).entry;
+        if (!_source.markup[beside].isPlaced() || parentOf(beside) == none)
+            return fail(list.is[i]);
+        const Place place =
+            previous != ListMatching::none ? placeBehind(beside) : placeBefore(beside);
+        const std::string text = was != ListMatching::none
+                                     ? moved(context, list, was, list.is[i], ordinal)
+                                     : printed(list, list.is[i], parentOf(beside), place.line);
+        insertChild(text, place, list.is[i]);
+    }
+    std::vector<bool> hasMoved(list.was.size());
+    for (std::size_t i = 0; i < list.is.size(); ++i)
+        if (matching.was[i] != ListMatching::none && !matching.stays[i])
+            hasMoved[matching.was[i]] = true;
+    for (std::size_t i = 0; i < list.was.size(); ++i) {
+        const Entry entry = use(list.uses[i]).entry;
+        if (isThere[i])
+            continue;
+        if (!_source.markup[entry].isPlaced() || parentOf(entry) == none)
+            return fail(list.field);
+        const auto [begin, end] = regionOf(entry, hasMoved[i]);
+        _edits->add({begin, end, {}, list.field, _source.before.keyPath(list.was[i])});
+    }
+}
+
+// The item's own text, with its comments and what has changed in it.
+std::string UpdatePlan::moved(const Context& context, const List& list, std::size_t was, Shown is,
+                              std::size_t ordinal) {
+    const Entry entry = use(list.uses[was]).entry;
+    const SourceMarkup::Spot& spot = _source.markup[entry];
+    if (!spot.isPlaced()) {
+        fail(is);
+        return {};
+    }
+    EditList own;
+    EditList* const outer = std::exchange(_edits, &own);
+    auto openings = std::exchange(_openings, {});
+    compareValue(context, list.uses[was], list.was[was], is, ordinal);
+    finishOpenings();
+    _openings = std::move(openings);
+    _edits = outer;
+    if (own.arrange() != nullptr)
+        fail(is);
+    const auto begin = _source.layout.isInline(parentOf(entry))
+                           ? spot.begin
+                           : _source.layout.withComments(spot.begin);
+    return own.applied(_source.markup.text(), begin, spot.end);
+}
+
+// Under the name by which the others were read.
+std::string UpdatePlan::printed(const List& list, Shown item, Entry inside,
+                                const std::optional<std::string>& line) {
+    const FieldPlan& plan = *list.plan;
+    const bool isTyped = plan.hasType() && list.binding < plan.bindings.size();
+    const BindingPlan* const binding = isTyped ? &plan.bindings[list.binding] : nullptr;
+    const NewXML::Around around = this->around(inside, line);
+    if (isText(item))
+        return _source.writer.element(binding != nullptr ? binding->name : plan.xmlName(),
+                                      _source.after.text(item), around);
+    const bool isNamed = binding != nullptr && list.binding != 0 && !binding->bindTo.isEmpty();
+    return _source.writer.element(*_source.after[item].element,
+                                  isNamed ? &binding->bindTo : nullptr, around);
+}
+
+// The first items: in the wrapper that is there, or in a new one.
+void UpdatePlan::fillList(const Context& context, const List& list, std::size_t ordinal) {
+    const FieldPlan& plan = *list.plan;
+    const bool isNew = list.wrapper == none;
+    const bool isWrapped =
+        !plan.location().isEmpty() || (!plan.hasType() && !plan.bindTo().isEmpty() &&
+                                       plan.bindings.front().classOfBindTo == nullptr);
+    Place place = isNew ? placeFor(context, ordinal) : placeInside(list.wrapper);
+    const Entry inside = isNew ? context.entry : list.wrapper;
+    if (!isNew || !isWrapped) {
+        for (const Shown item : list.is)
+            insertChild(printed(list, item, inside, place.line), place, item);
+        return;
+    }
+    std::optional<std::string> line = place.line;
+    if (line)
+        *line += _source.layout.unit();
+    std::string items;
+    for (const Shown item : list.is)
+        items += (line ? *line : "") + printed(list, item, inside, line);
+    const String& name = !plan.location().isEmpty() ? plan.location() : plan.bindTo();
+    insertChild(_source.writer.wrapper(name, items, around(inside, place.line)), place, list.field);
+}
+
+// The last item goes with its wrapper, where that holds nothing else.
+bool UpdatePlan::removeWrapper(const List& list) {
+    if (list.wrapper == none || list.plan->isRequired || !_source.markup[list.wrapper].isPlaced() ||
+        _source.index.firstChild(list.wrapper) != list.wrapper + 1)
+        return false;
+    std::size_t children = 0;
+    _source.document.forEachChild(list.wrapper, [&](Entry) { ++children; });
+    if (children != list.was.size())
+        return false;
+    removeElement(list.wrapper, list.field);
+    return true;
+}
+
+} // namespace qx::detail

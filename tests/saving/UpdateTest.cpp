@@ -1,0 +1,197 @@
+// Saving into documents in other encodings, of large size, plain structs, files.
+
+#include "Edits.h"
+
+#include "support/Scenario.h"
+#include "support/TemporaryFolder.h"
+
+#include <QXXMLMarshalling/QXXMLDocumentFile.h>
+
+namespace {
+
+struct Row {
+    int id = 0;
+    std::string text;
+};
+struct Sheet {
+    std::string title;
+    std::vector<Row> rows;
+};
+
+constexpr const char* mapping = "<Sheet xml='sheet'><title node='element'/>"
+                                "<rows type='Row' collection='array' name='row'/></Sheet>"
+                                "<Row><id type='int' node='attribute'/><text node='text'/></Row>";
+
+class Update : public testing::Test {
+protected:
+    void SetUp() override {
+        qx::Class::define<Sheet>("Sheet").members<&Sheet::title, &Sheet::rows>();
+        qx::Class::define<Row>("Row").members<&Row::id, &Row::text>();
+    }
+    void TearDown() override {
+        qx::Class::forget("Sheet");
+        qx::Class::forget("Row");
+    }
+    std::string saved(const std::string& document, void (*edit)(Sheet&)) {
+        auto sheet = marshaller->readString<Sheet>(document);
+        EXPECT_TRUE(sheet) << support::told(sheet.error());
+        edit(*sheet);
+        const auto update = QXXMLUpdate::updatedText(*marshaller, document, *sheet);
+        return update ? std::string(update->bytes()->view()) : support::told(update.error());
+    }
+
+    qx::Ref<QXXMLMarshaller> marshaller = scenario::marshaller(mapping);
+};
+
+std::string inUTF16(std::string_view text, bool isBigEndian) {
+    std::string bytes;
+    for (const char c : text) {
+        bytes += isBigEndian ? '\0' : c;
+        bytes += isBigEndian ? c : '\0';
+    }
+    return bytes;
+}
+
+} // namespace
+
+TEST_F(Update, KeepsTheEncodingAndRefersToWhatItLacks) {
+    const auto edit = [](Sheet& sheet) {
+        sheet.title = "\xC3\xA9\xE2\x82\xAC";
+        sheet.rows[0].text += "!";
+    };
+    EXPECT_EQ(
+        saved("<?xml version='1.0' encoding='ISO-8859-1'?><!-- \xE4 --><sheet>\r\n<title>\xE4"
+              "</title>\r\n<row id='1'>\xFC</row></sheet>\r\n",
+              edit),
+        "<?xml version='1.0' encoding='ISO-8859-1'?><!-- \xE4 --><sheet>\r\n<title>\xE9&#8364;"
+        "</title>\r\n<row id='1'>\xFC!</row></sheet>\r\n");
+    EXPECT_EQ(saved("\xEF\xBB\xBF<sheet><title/><row id='01'/></sheet>", edit),
+              "\xEF\xBB\xBF<sheet><title>\xC3\xA9\xE2\x82\xAC</title><row id='01'>!</row></sheet>");
+    for (const bool isBig : {false, true}) {
+        const std::string mark = isBig ? "\xFE\xFF" : "\xFF\xFE";
+        const auto rename = [](Sheet& sheet) { sheet.title = "new"; };
+        EXPECT_EQ(saved(mark + inUTF16("<sheet>\r\n\t<title>old</title></sheet>", isBig), rename),
+                  mark + inUTF16("<sheet>\r\n\t<title>new</title></sheet>", isBig));
+    }
+}
+
+TEST_F(Update, LineEndsAndBlanksAreThoseOfTheDocument) {
+    EXPECT_EQ(saved("<sheet>\r\n\t<title>a</title>\r\n\t<row id='1'>x</row>\r\n</sheet>",
+                    [](Sheet& sheet) {
+                        sheet.title = "a\nb";
+                        sheet.rows.push_back({2, "\n"});
+                    }),
+              "<sheet>\r\n\t<title>a\r\nb</title>\r\n\t<row id='1'>x</row>\r\n\t<row id='2'>&#10;"
+              "</row>\r\n</sheet>");
+    EXPECT_EQ(saved("<sheet xml:space='preserve'>\n<row id='1'/>\n</sheet>",
+                    [](Sheet& sheet) {
+                        sheet.rows.push_back({2, "x"});
+                    }),
+              "<sheet xml:space='preserve'>\n<row id='1'/><row id='2'>x</row>\n</sheet>");
+}
+
+TEST_F(Update, OneValueInALargeDocumentIsOneLine) {
+    std::string document = "<sheet>\n";
+    for (int i = 0; i < 20'000; ++i)
+        document += "  <row id=\"" + std::to_string(i) + "\">some text in row</row><!-- row -->\n";
+    document += "</sheet>\n";
+    auto sheet = marshaller->readString<Sheet>(document);
+    sheet->rows[12'345].text = "another";
+    std::rotate(sheet->rows.begin(), sheet->rows.begin() + 1, sheet->rows.begin() + 3);
+    const auto update = QXXMLUpdate::updatedText(*marshaller, document, *sheet);
+    ASSERT_TRUE(update) << support::told(update.error());
+    ASSERT_EQ(update->edits().size(), 3U);
+    EXPECT_EQ(update->edits()[2].line, 12'347U);
+    EXPECT_EQ(update->edits()[2].keyPath, "rows[12345].text");
+    EXPECT_EQ(update->edits()[2].newText, "another");
+}
+
+TEST_F(Update, AFileIsReplacedOnlyWhereSomethingWasEdited) {
+    const TemporaryFolder folder;
+    const std::string path =
+        folder.write("sheet.xml", "<sheet><!-- mine --><title>a</title></sheet>");
+    Sheet sheet{"b", {}};
+    EXPECT_TRUE(QXXMLUpdate::updateFile(*marshaller, sheet, path));
+    EXPECT_EQ(folder.read("sheet.xml"), "<sheet><!-- mine --><title>b</title></sheet>");
+    EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, sheet, folder.path("none")).error()->code(),
+              260);
+    EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, qx::Value(), path).error()->code(), -211);
+    EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, Row{}, path).error()->code(), -211);
+    EXPECT_EQ(folder.read("sheet.xml"), "<sheet><!-- mine --><title>b</title></sheet>");
+}
+
+TEST_F(Update, ADocumentFileSavesRevertsAndTellsWhetherItIsEdited) {
+    const TemporaryFolder folder;
+    const std::string path =
+        folder.write("sheet.xml", "<sheet>\n<!-- mine -->\n<title>a</title>\n</sheet>\n");
+    qx::Ref<qx::Error> error;
+    const auto file = QXXMLDocumentFile::open(path, marshaller, &error);
+    ASSERT_TRUE(file) << support::told(error);
+    EXPECT_EQ(file->root<Row>(), nullptr);
+    Sheet& sheet = *file->root<Sheet>();
+    EXPECT_FALSE(file->isEdited());
+    sheet.title = "b";
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_TRUE(file->save());
+    EXPECT_FALSE(file->isEdited());
+    sheet.title = "c";
+    EXPECT_TRUE(file->revert());
+    EXPECT_EQ(sheet.title, "b");
+    sheet.title = "d";
+    EXPECT_TRUE(file->saveAs(folder.path("other.xml")));
+    EXPECT_EQ(folder.read("other.xml"), "<sheet>\n<!-- mine -->\n<title>d</title>\n</sheet>\n");
+    EXPECT_EQ(folder.read("sheet.xml"), "<sheet>\n<!-- mine -->\n<title>b</title>\n</sheet>\n");
+    sheet.title = "\x01";
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_FALSE(file->save(&error));
+    EXPECT_EQ(error->code(), 517);
+    EXPECT_EQ(folder.read("other.xml"), "<sheet>\n<!-- mine -->\n<title>d</title>\n</sheet>\n");
+}
+
+TEST_F(Update, AFileThatChangedMeanwhileIsSeenAndMerged) {
+    using Changed = QXXMLDocumentFile::Changed;
+    const TemporaryFolder folder;
+    const std::string base = "<sheet>\n<title>a</title>\n<row id='1'>x</row>\n</sheet>\n";
+    const auto file = QXXMLDocumentFile::open(folder.write("s.xml", base), marshaller);
+    Sheet& sheet = *file->root<Sheet>();
+    sheet.rows[0].text = "y";
+    folder.write("s.xml", "<sheet>\n<!-- theirs -->\n<title>b</title>\n<row id='1'>x</row>\n"
+                          "</sheet>\n");
+    qx::Ref<qx::Error> error;
+    EXPECT_FALSE(file->save(&error));
+    EXPECT_EQ(error->code(), -232);
+    EXPECT_TRUE(file->save(&error, Changed::carryOver)) << support::told(error);
+    EXPECT_EQ(folder.read("s.xml"),
+              "<sheet>\n<!-- theirs -->\n<title>b</title>\n<row id='1'>y</row>\n</sheet>\n");
+    EXPECT_EQ(sheet.title, "b");
+    EXPECT_FALSE(file->isEdited());
+    sheet.title = "mine";
+    const std::string theirs = "<sheet>\n<title>theirs</title>\n</sheet>\n";
+    folder.write("s.xml", theirs);
+    EXPECT_FALSE(file->save(&error, Changed::carryOver));
+    EXPECT_EQ(support::told(error),
+              "-233: The file and the object have both changed: title (Invalid Value)");
+    EXPECT_EQ(folder.read("s.xml"), theirs);
+    EXPECT_TRUE(file->save(&error, Changed::overwrite));
+    EXPECT_EQ(folder.read("s.xml"),
+              "<sheet>\n<!-- theirs -->\n<title>mine</title>\n<row id='1'>y</row>\n</sheet>\n");
+}
+
+TEST_F(Update, AnUndoManagersMarkTellsWhetherADocumentFileIsEdited) {
+    const TemporaryFolder folder;
+    const auto records = scenario::marshaller("<Note xml='note'><text node='element'/></Note>");
+    const auto file = QXXMLDocumentFile::open(folder.write("n.xml", "<note/>"), records);
+    const auto note = file->root<QXGenericRecord>();
+    const auto manager = qx::make<qx::UndoManager>();
+    note->setUndoManager(manager);
+    file->setUndoManager(manager);
+    note->setValueForKey("a", "text");
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_TRUE(file->save());
+    EXPECT_FALSE(file->isEdited());
+    EXPECT_EQ(folder.read("n.xml"), "<note><text>a</text></note>");
+    manager->undo();
+    EXPECT_TRUE(file->isEdited());
+    manager->redo();
+    EXPECT_FALSE(file->isEdited());
+}
