@@ -33,7 +33,7 @@ struct Options {
     bool verbose = false;
     std::size_t errors = 1; // how many a reading collects
     std::string output;     // the file for the result; empty for standard output
-    std::string why; // the path of the node that `check` is asked about
+    std::string why;        // the path of the node that `check` is asked about
     bool inPlace = false;
     bool diff = false;
 

@@ -26,7 +26,8 @@ public:
     // The mapping document, whose own folder is searched last for includes, resolved. What the
     // options say of that folder is not looked at.
     qx::Ref<QXXMLMarshallingMapping> resolveMapping(QXXMLMappingOptions options = {}) const;
-    // Made from that, or from the one that is given. It is used no longer than the session is there.
+    // Made from that, or from the one that is given. It is used no longer than the session is
+    // there.
     qx::Ref<QXXMLMarshaller> makeMarshaller() const { return makeMarshaller(resolveMapping()); }
     qx::Ref<QXXMLMarshaller> makeMarshaller(qx::Ref<QXXMLMarshallingMapping> mapping) const;
     // The object that the marshaller reads from the document; never null.
