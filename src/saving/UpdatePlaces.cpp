@@ -262,7 +262,7 @@ NewXML::Around UpdatePlan::around(Entry element, const std::optional<std::string
         _source.document.forEachOfKind(
             XMLNodeKind::namespaceDeclaration, *at, [&](Entry declaration) {
                 declared.push_back({_source.document.writtenName(declaration),
-                                    _source.document.value(declaration)});
+                                    _source.document.value(declaration).string()});
             });
         _names->enter(declared);
     }

@@ -83,7 +83,7 @@ void UpdatePlan::setText(Entry element, bool isOwn, std::string_view was, std::s
     const SourceMarkup::Spot& spot = _source.markup[element];
     if (!spot.isPlaced())
         return fail(value);
-    const String raw = _source.document.text(element);
+    const String raw = _source.document.text(element).string();
     const std::string wanted = withBlanksOf(raw.view(), was, now);
     if (raw.view() == wanted)
         return;

@@ -45,9 +45,10 @@ const bool documents = support::addCases(
             EXPECT_EQ(told(check.findings(), true), expected.text);
             return;
         }
-        for (const std::string& path : expected.options)
+        for (const std::string& path : expected.options) {
             if (path.starts_with('/'))
                 EXPECT_EQ(check.why(path).str() + "\n", expected.text);
+        }
     });
 
 } // namespace
@@ -69,5 +70,5 @@ TEST(RoundTripPage, WhatItWarnsOfIsFoundAndWhatItAdvisesIsNot) {
             << findings[0];
         EXPECT_EQ(findings[1].find("warning"), std::string::npos) << section << '\n' << findings[1];
     }
-    EXPECT_GE(pairs, 10U);
+    EXPECT_GE(pairs, 8U);
 }
