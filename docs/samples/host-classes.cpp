@@ -10,7 +10,9 @@
 
 #include <cstdio>
 #include <filesystem>
+#include <fstream>
 #include <iostream>
+#include <sstream>
 
 namespace {
 
@@ -59,6 +61,28 @@ bool addStop(QXXMLMarshaller* marshaller, const std::string& path) {
     return marshaller->writeFile(*tour, path);
     // end of sample
 }
+
+// sample: report
+void show(const qx::Error& error, std::ostream& to) {
+    for (const auto& each : error.all())
+        to << each->report().view() << '\n';
+}
+
+void openTour(QXXMLMarshaller& marshaller, const char* path, std::ostream& messages) {
+    marshaller.setMaximumErrors(20);
+    if (const auto tour = marshaller.readFile<Tour>(path); !tour)
+        show(*tour.error(), messages);
+}
+// end of sample
+
+// sample: unknown
+void listUnknown(QXXMLMarshaller& marshaller, std::vector<std::string>& names) {
+    marshaller.setReportHandler([&names](const QXXMLReport& report) {
+        if (report.kind == QXXMLReport::Kind::unboundChild)
+            names.push_back(report.name.str() + " in line " + std::to_string(report.place().line));
+    });
+}
+// end of sample
 
 // sample: shapes
 struct Shape {
@@ -458,4 +482,19 @@ TEST_F(HostClasses, CannotTakeANameThatIsTaken) {
     describeProduct();
     qx::Class::define<Impostor>("Product");
     EXPECT_TRUE(qx::Class::named("Product")->create().as<Product>());
+}
+
+TEST_F(HostClasses, AreReadWithErrorsThatAreShown) {
+    describeTour();
+    const auto marshaller = scenario::marshaller(tourMapping);
+    std::vector<std::string> unknown;
+    listUnknown(*marshaller, unknown);
+    const std::string path = std::filesystem::temp_directory_path() / "qx-tour.xml";
+    std::ofstream(path) << "<tour>\n<start lat='x' lon='y'/>\n<note/></tour>";
+    std::ostringstream messages;
+    openTour(*marshaller, path.c_str(), messages);
+    std::filesystem::remove(path);
+    EXPECT_EQ(unknown, std::vector<std::string>{"note in line 3"});
+    EXPECT_NE(messages.str().find("qx-tour.xml:2:8 /tour/start/@lat\n"), std::string::npos);
+    EXPECT_NE(messages.str().find(":2:16 /tour/start/@lon\n"), std::string::npos);
 }

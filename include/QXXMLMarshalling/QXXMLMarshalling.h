@@ -35,6 +35,7 @@
 #include <QXXMLMarshalling/base/Ref.h>
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/base/Version.h>
+#include <QXXMLMarshalling/files/FileWriting.h>
 #include <QXXMLMarshalling/host/Bundle.h>
 #include <QXXMLMarshalling/host/Log.h>
 #include <QXXMLMarshalling/host/ProcessInfo.h>

@@ -17,8 +17,8 @@ class ErrorContext;
 class QX_API QXXMLReport {
 public:
     enum class Kind : std::uint8_t {
-        // No field took them. Kept on the object if the marshaller keeps unknown XML and the object
-        // can; lost of an element that is read as a text, and of a wrapper.
+        // No field took them. Kept if the marshaller keeps unknown XML and the object can; lost of
+        // an element that is read as a text, and of a wrapper.
         unboundChild, // a child element, or a processing instruction under its target
         unboundAttribute,
         // Text beside child elements that no field takes. Lost.
@@ -37,6 +37,8 @@ public:
     qx::String elementName;
     // How many of that name the element has too many.
     std::size_t count = 1;
+    // Whether the object is given it, to be written again.
+    bool isKept = false;
     // The object that is read; null of what is written. Lent for the call.
     qx::Object* object = nullptr;
 

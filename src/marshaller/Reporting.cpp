@@ -8,7 +8,7 @@
 namespace qx::detail {
 
 void Reporting::tell(Kind kind, IndexedXML& document, Number element, Number node, Object* object,
-                     std::size_t count) const {
+                     std::size_t count, bool isKept) const {
     const ReadingContext context(0, document, nullptr, {.number = node});
     QXXMLReport report;
     report.kind = kind;
@@ -16,6 +16,7 @@ void Reporting::tell(Kind kind, IndexedXML& document, Number element, Number nod
         report.name = document.writtenName(node);
     report.elementName = document.writtenName(element);
     report.count = count;
+    report.isKept = isKept;
     report.object = object;
     report.context = &context;
     (*_handler)(report);

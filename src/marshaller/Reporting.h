@@ -22,7 +22,7 @@ public:
 
     // Of what is read: a node in the element.
     void tell(Kind kind, IndexedXML& document, Number element, Number node, Object* object,
-              std::size_t count = 1) const;
+              std::size_t count = 1, bool isKept = false) const;
     // The attributes and child elements of an element of which nothing but its text is read.
     void tellInside(IndexedXML& document, Number element, Object* object) const;
     // The texts in an element that are no layout.

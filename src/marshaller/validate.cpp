@@ -110,7 +110,8 @@ bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
     if (_reports.isOn() && _trace == nullptr)
         for (const Number node : unknown.firsts())
             _reports.tell(Reporting::Kind::unboundChild, _document, target.source.element(), node,
-                          &target.object, unknown.countOf(_document, node));
+                          &target.object, unknown.countOf(_document, node),
+                          _marshaller->saveUnknownXML());
     else if (_trace == nullptr && hostHasLogWarning())
         logDebug("*** Warning: Unbound fields: %@", unknown.written());
     else if (_trace == nullptr)
@@ -174,7 +175,7 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     if (_reports.isOn() && _trace == nullptr)
         for (const Number node : unknown.firsts())
             _reports.tell(Reporting::Kind::unboundAttribute, _document, element, node,
-                          &target.object);
+                          &target.object, 1, _marshaller->saveUnknownXML());
     else if (_trace == nullptr)
         logWarningOrLine("Unbound attributes: %@", unknown.written());
     return !_marshaller->saveUnknownXML() || keepAttributes(target, *unknown.names(), error);

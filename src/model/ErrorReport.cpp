@@ -151,8 +151,6 @@ String Error::report(Style style) const {
     text += mappingLines(context.mapping());
     if (const String suggestion = context.suggestion(); !suggestion.isEmpty())
         text.append("\n  ").append(strong).append(oneLine(suggestion.view())).append(normal);
-    for (const auto& other : ErrorDetails::othersOf(*this))
-        text.append("\n").append(other->report(style).view());
     return text;
 }
 

@@ -8,23 +8,24 @@
 namespace {
 
 const bool added = [] {
-    for (const char* page : {"mapping-format", "round-trip"})
+    for (const char* page : {"mapping-format", "round-trip", "errors"})
         cases::addPage("docs/" + std::string(page) + ".md", {kinds::record, kinds::host});
     return true;
 }();
 
 } // namespace
 
-// Rows such as "| -204 | `Too many … %@` | …": the table is the whole of what documents can raise.
+// Below a heading such as "## -204" stand items such as "- `Too many … %@`: …": they are the whole
+// of what documents can raise.
 TEST(Pages, ListEveryError) {
     std::set<std::string> listed, known;
-    std::ifstream page(QX_SOURCE_DIR "/docs/mapping-format.md");
+    std::ifstream page(QX_SOURCE_DIR "/docs/errors.md");
+    std::string section;
     for (std::string line; std::getline(page, line);)
-        if (line.rfind("| -", 0) == 0) {
-            const auto start = line.find('`') + 1;
-            listed.insert(line.substr(2, line.find(' ', 2) - 1) +
-                          line.substr(start, line.find('`', start) - start));
-        }
+        if (line.starts_with("## -"))
+            section = line.substr(3);
+        else if (line.starts_with("- `") && section != "-2000")
+            listed.insert(section + " " + line.substr(3, line.find('`', 3) - 3));
     for (const auto& [code, message] : support::errorRows(support::libraryErrors))
         if (std::stoi(code) < 0 && std::stoi(code) > -1000)
             known.insert(code + " " + message);

@@ -10,9 +10,12 @@
 #include <CLI/CLI.hpp>
 
 #include <cstdio>
+#include <cstdlib>
 #include <functional>
 #include <new>
 #include <sstream>
+
+#include <unistd.h>
 
 namespace qxxml {
 
@@ -26,6 +29,23 @@ constexpr int wrongUsage = 2;
 // Standard error may be gone as well: there is nobody left to tell.
 int fail(const std::string& message) {
     std::fputs(("qxxml: error " + message + "\n").c_str(), stderr);
+    return failed;
+}
+
+// Colours are for people who see them, and who did not say that they want none.
+bool showsColours() {
+    const char* const refused = std::getenv("NO_COLOR");
+    const char* const terminal = std::getenv("TERM");
+    return ::isatty(STDERR_FILENO) != 0 && (refused == nullptr || *refused == '\0') &&
+           (terminal == nullptr || std::string_view(terminal) != "dumb");
+}
+
+int fail(const Failure& failure, const Options& options) {
+    const auto form = options.json      ? Failure::Form::json
+                      : options.oneLine ? Failure::Form::oneLine
+                      : showsColours()  ? Failure::Form::coloured
+                                        : Failure::Form::text;
+    std::fputs(failure.text(form).c_str(), stderr);
     return failed;
 }
 
@@ -74,6 +94,18 @@ void addMapping(CLI::App& command, Options& options) {
         ->required();
 }
 
+// How what goes wrong is told.
+void addTelling(CLI::App& command, Options& options) {
+    command.add_flag("--json", options.json, "Tell errors and warnings as JSON, an object a line");
+    command.add_flag("--one-line", options.oneLine,
+                     "Tell errors as editors read them: FILE:LINE:COLUMN: error CODE: MESSAGE");
+}
+
+void addOutput(CLI::App& command, Options& options) {
+    command.add_option("-o,--output", options.output, "Write to this file, once all went well")
+        ->option_text("FILE");
+}
+
 void addMatching(CLI::App& command, Options& options) {
     command
         .add_option("--prefix", options.prefixes,
@@ -88,13 +120,21 @@ void addMatching(CLI::App& command, Options& options) {
 
 void addReading(CLI::App& command, Options& options) {
     addMapping(command, options);
+    addTelling(command, options);
+    command.add_flag("--quiet", options.quiet, "Do not tell what no field takes")
+        ->excludes(command.add_flag("--verbose", options.verbose,
+                                    "Tell each place of it, instead of one line for all"));
+    command
+        .add_option("--errors", options.errors,
+                    "Go on until there are that many errors, and tell them all")
+        ->option_text("NUMBER")
+        ->check(CLI::PositiveNumber);
     command.add_option("DOCUMENT", options.document, "The path of a document; - is standard input")
         ->option_text(" ")
         ->required();
     command.add_flag("--strict", options.strict,
-                     "Fail at a document, or an item of an untyped collection, that no class "
-                     "handles; with --discard-unknown, at any XML that the mapping does not "
-                     "describe");
+                     "Fail at an item of an untyped collection that no class handles; with "
+                     "--discard-unknown, at child elements and attributes that no field takes");
     command.add_flag("--discard-unknown", options.discardUnknown,
                      "Do not keep XML that the mapping does not describe");
     command.add_flag("--no-namespace-uris", options.noNamespaceURIs,
@@ -163,6 +203,7 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     CLI::App* command =
         add("describe", "Resolve a mapping with its includes and print its description", describe);
     addMapping(*command, options);
+    addTelling(*command, options);
     addSearch(*command, options);
 
     command = add("graph", "Print a mapping as a graph for Graphviz", graph);
@@ -183,6 +224,7 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
     command = add("roundtrip", "Read a document, write its object and print that", roundtrip);
     addReading(*command, options);
     command->add_flag("--pretty", options.pretty, "Print one element a line");
+    addOutput(*command, options);
     addSearch(*command, options);
 
     command = add("check",
@@ -217,6 +259,8 @@ void define(CLI::App& tool, Options& options, Command& chosen, int& status) {
 
     command = add("infer", "Print a mapping that fits documents which have none", infer);
     addInferring(*command, options);
+    addTelling(*command, options);
+    addOutput(*command, options);
 
     command =
         add("where", "Print the file that a name resolves to, and where it was looked for", where);
@@ -249,10 +293,7 @@ int endParsing(const CLI::App& tool, const CLI::ParseError& error) {
     return wrongUsage;
 }
 
-} // namespace
-
-int runCommandLine(int argc, const char* const* argv) try {
-    Options options;
+int run(int argc, const char* const* argv, Options& options) {
     Command command = nullptr;
     CLI::App tool("Tries mapping documents on XML documents.", "qxxml");
     int status = 0;
@@ -262,14 +303,29 @@ int runCommandLine(int argc, const char* const* argv) try {
     } catch (const CLI::ParseError& error) {
         return endParsing(tool, error);
     }
-    print(command(options));
+    const std::string text = command(options);
+    if (!options.output.empty())
+        save(text, options.output);
+    else
+        print(text);
     flushOutput();
     return status;
-} catch (const std::bad_alloc&) {
-    std::fputs("qxxml: error 12: Out of memory\n", stderr);
-    return failed;
-} catch (const std::exception& problem) {
-    return fail(problem.what());
+}
+
+} // namespace
+
+int runCommandLine(int argc, const char* const* argv) {
+    Options options;
+    try {
+        return run(argc, argv, options);
+    } catch (const std::bad_alloc&) {
+        std::fputs("qxxml: error 12: Out of memory\n", stderr);
+        return failed;
+    } catch (const Failure& failure) {
+        return fail(failure, options);
+    } catch (const std::exception& problem) {
+        return fail(problem.what());
+    }
 }
 
 } // namespace qxxml

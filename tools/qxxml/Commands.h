@@ -10,7 +10,7 @@ namespace qxxml {
 
 // The resolved mapping's description, without the addresses of objects: the same on every run.
 std::string describe(const Options& options);
-// The document's object as JSON, see Json.h; "null" for a document that no class handles.
+// The document's object as JSON, see Json.h.
 std::string read(const Options& options);
 // An object a line as JSON, of each of the document's elements of one name.
 std::string readEach(const Options& options);

@@ -28,7 +28,12 @@ struct Options {
     bool matchNamespaces = false;
     bool json = false;
     bool notes = false;
-    std::string why; // the path of the node that `check` is asked about
+    bool oneLine = false;
+    bool quiet = false;
+    bool verbose = false;
+    std::size_t errors = 1; // how many a reading collects
+    std::string output;     // the file for the result; empty for standard output
+    std::string why;        // the path of the node that `check` is asked about
     bool inPlace = false;
     bool diff = false;
 

@@ -1,5 +1,7 @@
 #include "qxxml/Output.h"
 
+#include <QXXMLMarshalling/files/FileWriting.h>
+
 #include "qxxml/Failure.h"
 
 #include <cerrno>
@@ -27,6 +29,12 @@ void flushOutput() {
     errno = 0;
     if (std::fflush(stdout) != 0)
         fail();
+}
+
+void save(std::string_view text, const std::string& path) {
+    qx::Ref<qx::Error> error;
+    if (!qx::writeFileAtomically(path, text, &error))
+        throw Failure(error, path);
 }
 
 } // namespace qxxml

@@ -3,12 +3,15 @@
 // Standard output. What did not arrive whole is a failure; some of it only shows when it is
 // flushed.
 
+#include <string>
 #include <string_view>
 
 namespace qxxml {
 
-// Both throw Failure.
+// All throw Failure.
 void print(std::string_view text);
 void flushOutput();
+// To a file instead, which is replaced as a whole.
+void save(std::string_view text, const std::string& path);
 
 } // namespace qxxml

@@ -5,6 +5,7 @@
 
 #include "qxxml/Failure.h"
 
+#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
@@ -42,6 +43,14 @@ Session::Session(const Options& options) : _options(options) {
     QXXMLDataRepositoryManager::defaultManager()->setPersistentRepository(_repository);
 }
 
+Session::~Session() {
+    try {
+        std::fputs(_summary->text(_options.json).c_str(), stderr);
+    } catch (const std::bad_alloc&) {
+        std::fputs("qxxml: warning: something was passed over\n", stderr);
+    }
+}
+
 qx::Ref<QXXMLMarshallingMapping> Session::resolveMapping(QXXMLMappingOptions options) const {
     qx::Ref<qx::Error> error;
     const auto document = qx::XMLDocument::initWithContentsOfFile(_options.mapping, {}, &error);
@@ -62,6 +71,13 @@ qx::Ref<QXXMLMarshaller> Session::makeMarshaller(qx::Ref<QXXMLMarshallingMapping
     marshaller->setLenient(!_options.strict);
     marshaller->setSaveUnknownXML(!_options.discardUnknown);
     marshaller->setUsingNamespaceURIs(!_options.noNamespaceURIs);
+    marshaller->setMaximumErrors(_options.errors);
+    marshaller->setReportHandler([this](const QXXMLReport& report) {
+        if (_options.verbose)
+            std::fputs(lineOf(report).c_str(), stderr);
+        else if (!_options.quiet)
+            _summary->add(report);
+    });
     if (!marshaller->setNamespacePrefixes(prefixes(_options.prefixes), &error) ||
         !marshaller->setMatchesNamespaces(_options.matchNamespaces, &error))
         throw Failure(error, _options.mapping);
@@ -77,10 +93,13 @@ qx::Ref<qx::Object> Session::readObject(QXXMLMarshaller& marshaller) const {
             : qx::XMLDocument::initWithContentsOfFile(_options.document, parsing, &error);
     if (!document)
         throw Failure(error, file());
-    auto object = marshaller.unmarshall(document, &error);
-    if (error)
-        throw Failure(error, file());
-    return object;
+    if (isStandardInput())
+        document->setDocumentName(file());
+    // One that asks for a class fails where none handles the root.
+    const auto object = marshaller.unmarshall<qx::Object>(document);
+    if (!object)
+        throw Failure(object.error(), file());
+    return *object;
 }
 
 void Session::readEach(QXXMLMarshaller& marshaller, const std::string& elementName,

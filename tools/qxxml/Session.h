@@ -4,6 +4,7 @@
 // for, and the marshaller that the options ask for. It sets up the process, so there is one.
 
 #include "qxxml/Options.h"
+#include "qxxml/Summary.h"
 #include "qxxml/ToolRepository.h"
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
@@ -16,15 +17,20 @@ class Session {
 public:
     // The options must outlive the session.
     explicit Session(const Options& options);
+    // Tells on the standard error what was passed over.
+    ~Session();
+    Session(const Session&) = delete;
+    Session& operator=(const Session&) = delete;
 
     ToolRepository& repository() const noexcept { return *_repository; }
     // The mapping document, whose own folder is searched last for includes, resolved. What the
     // options say of that folder is not looked at.
     qx::Ref<QXXMLMarshallingMapping> resolveMapping(QXXMLMappingOptions options = {}) const;
-    // Made from that, or from the one that is given.
+    // Made from that, or from the one that is given. It is used no longer than the session is
+    // there.
     qx::Ref<QXXMLMarshaller> makeMarshaller() const { return makeMarshaller(resolveMapping()); }
     qx::Ref<QXXMLMarshaller> makeMarshaller(qx::Ref<QXXMLMarshallingMapping> mapping) const;
-    // The object that the marshaller reads from the document; null where no class handles it.
+    // The object that the marshaller reads from the document; never null.
     qx::Ref<qx::Object> readObject(QXXMLMarshaller& marshaller) const;
 
     // The document's bytes; the marshaller parses them as the options say from here on.
@@ -43,6 +49,8 @@ private:
     bool isStandardInput() const { return _options.document == "-"; }
 
     const Options& _options;
+    // The summary is that of the marshallers' handlers.
+    const std::unique_ptr<Summary> _summary = std::make_unique<Summary>();
     qx::Ref<ToolRepository> _repository;
 };
 

@@ -95,15 +95,15 @@ public:
     std::vector<Ref<const Error>> all() const;
 
     // The error for people: the short description, then, as far as they are known, a line each for
-    // the place, the text there with a mark below it, the place in the mapping, and the suggestion;
-    // behind it the errors that were collected. No line break ends it.
+    // the place, the text there with a mark below it, the place in the mapping, and the suggestion.
+    // No line break ends it. Those that were collected have reports of their own, see all().
     //
     //     Unable to set value: twelve for key: price in class: Item
     //       at order.xml:12:11 /order/items/item[2]/@price
     //         <item price="twelve"/>
     //               ^
     //       by order.map.xml:8:13, field "price" of class "Item"
-    //       a number was expected
+    //       it takes a number
     //
     // Long lines are cut around the mark. Colours are those of terminals.
     enum class Style : std::uint8_t { plain, coloured };

@@ -65,7 +65,8 @@ private:
 template <class Answer>
 void run(const std::string& page, std::size_t least, Answer answer) {
     // What the parser's version decides: the column and the text of its error.
-    static const std::regex parserError("(qxxml: error 76: [^:\n]+:[0-9]+):[0-9]+: .+");
+    static const std::regex parserError(
+        "(qxxml: error 76: [^:\n]+:[0-9]+):[0-9]+: .+(\n(! )?    .*)*");
     Shell home;
     const auto blocks = support::blocksOf(QX_SOURCE_DIR "/" + page);
     for (const auto& block : blocks)
