@@ -70,7 +70,7 @@ bool takesText(const ClassPlan& plan) {
 } // namespace
 
 bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorSlot error) {
-    if (_marshaller->isLenient() && !_marshaller->saveUnknownXML() && !_reports.isOn())
+    if (_marshaller->isLenient() && !_marshaller->saveUnknownXML())
         return true;
     if (_reports.isOn() && plan != nullptr && !takesText(*plan))
         _reports.tellTexts(_document, target.source.element(), &target.object);
