@@ -13,8 +13,8 @@ String sharedObjectHolding(const void* address);
 // The path without symbolic links, "." and ".."; null when nothing is there.
 String realPath(const String& path);
 
-// The folder of the framework bundle: share/QXXMLMarshalling beside the library's folder, else this folder;
-// of a static library, the same with the program's folder.
+// The folder of the framework bundle: share/QXXMLMarshalling beside the library's folder, else this
+// folder; of a static library, the same with the program's folder.
 const String& frameworkFolder();
 
 } // namespace qx

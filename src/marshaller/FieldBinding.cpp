@@ -34,8 +34,12 @@ bool Unmarshalling::readField(const FieldPlan& field, const Target& target, Erro
         if (error != nullptr)
             *error = std::move(problem);
     }
+    return passOverField(field, target, error);
+}
+
+bool Unmarshalling::passOverField(const FieldPlan& field, const Target& target, ErrorSlot error) {
     if (error != nullptr && *error && !ErrorDetails::hasContext(**error))
-        locate(error, {placeOf(field, target, (*error)->code()), &field, currentClass()});
+        locate(error, placeOf(field, target, (*error)->code()), &field, currentClass());
     const bool isTooMany =
         error != nullptr && *error && (*error)->code() == errors::tooManyChildren.code;
     if (!passOver(error))

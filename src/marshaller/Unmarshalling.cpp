@@ -42,6 +42,12 @@ private:
     ConsumedNames* _names;
 };
 
+void Unmarshalling::locate(ErrorSlot error, Number number, const FieldPlan* field,
+                           const ClassPlan* plan) {
+    if (error != nullptr && *error && error->get() != _earlier)
+        ReadingContext::tell(*error, _document, _mapping.get(), {number, field, plan});
+}
+
 Ref<Object> Unmarshalling::unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error) {
     const bool isElement = node != none && _document.isElement(node);
     const ClassPlan* plan = isElement ? classForElement(node) : nullptr;
@@ -87,7 +93,7 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
                                  ErrorSlot error) {
     const Number wrapper = std::exchange(_wrapper, none);
     if (!mayBuild(plan, source, error)) {
-        locate(error, {source.element(), nullptr, &plan});
+        locate(error, source.element(), nullptr, &plan);
         return nullptr;
     }
     Ref<Object> object = allocate(plan);
@@ -165,7 +171,7 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
         for (const FieldPlan& field : walk.current().fields) {
             if (!field.isContainer && !copied) {
                 if (!_budget.takeVisits(source->childCount(), source->element(), error)) {
-                    locate(error, {source->element(), &field, &plan});
+                    locate(error, source->element(), &field, &plan);
                     return false;
                 }
                 copy = ChildLookup::copyOf(*source);
@@ -186,7 +192,7 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
                              : fail(error, errors::noExtends, walk.broken());
     if (isWhole)
         return true;
-    locate(error, {source->element(), nullptr, &plan});
+    locate(error, source->element(), nullptr, &plan);
     return passOver(error);
 }
 
@@ -263,7 +269,7 @@ Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress
     startWith(error);
     auto object = unmarshallNode(element, IndexedXML::Nodes::own, error);
     if (!object)
-        locate(error, {.number = element});
+        locate(error, element);
     return object;
 }
 

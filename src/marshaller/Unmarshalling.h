@@ -76,10 +76,8 @@ public:
         _earlier = error != nullptr ? error->get() : nullptr;
     }
     // Tells the error that a step has left in the slot where it came about, unless it knows.
-    void locate(ErrorSlot error, const ReadingSpot& spot) {
-        if (error != nullptr && *error && error->get() != _earlier)
-            ReadingContext::tell(*error, _document, _mapping.get(), spot);
-    }
+    void locate(ErrorSlot error, Number number, const FieldPlan* field = nullptr,
+                const ClassPlan* plan = nullptr);
 
     // Whether the reading goes on without what has failed: the error in the slot is collected.
     bool passOver(ErrorSlot error) {
@@ -127,6 +125,10 @@ private:
     class LentNames;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
+    // What is to be done where a field has failed: whether the reading goes on. It stands apart,
+    // so that a level of nested objects takes less of the stack.
+    [[gnu::noinline]] bool passOverField(const FieldPlan& field, const Target& target,
+                                         ErrorSlot error);
     Number placeOf(const FieldPlan& field, const Target& target, int code) const;
     // What ends a reading as a whole goes on failing.
     bool mayPassOver() const noexcept { return !_budget.isSpent() && !_progress->isCancelled(); }

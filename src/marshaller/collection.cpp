@@ -132,7 +132,7 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
         const Value item = make(node);
         reading.setWrapper(Unmarshalling::none);
         if ((error != nullptr && *error) || reading.budget().isSpent()) {
-            reading.locate(error, {node, &field, reading.currentClass()});
+            reading.locate(error, node, &field, reading.currentClass());
             if (!reading.passOver(error))
                 return false;
             if (!items.areCounted && reading.document().isElement(node))

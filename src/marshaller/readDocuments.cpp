@@ -255,7 +255,7 @@ bool QXXMLMarshaller::readEach(qx::ByteSource& source, const String& elementName
                 failure = std::move(visited.error);
                 goesOn = visited.goesOn;
             }
-            reading.locate(&failure, {.number = item});
+            reading.locate(&failure, item);
             goesOn = goesOn && (!failure || reading.passOver(&failure));
             collector.settle(before);
             return goesOn;

@@ -133,7 +133,7 @@ Ref<Object> QXXMLMarshaller::unmarshallElement(qx::XMLNode* element, Ref<Error>*
     Unmarshalling reading(*this, document);
     reading.startWith(error);
     auto object = reading.unmarshallNode(document.root(), IndexedXML::Nodes::own, error);
-    reading.locate(error, {.number = document.root()});
+    reading.locate(error, document.root());
     return object;
 }
 

@@ -92,7 +92,7 @@ bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& tar
 
 // What no field consumed is an error, there.
 bool Unmarshalling::refuse(Number unknown, ErrorSlot error) {
-    locate(error, {unknown, nullptr, _frame != nullptr ? _frame->plan : nullptr});
+    locate(error, unknown, nullptr, _frame != nullptr ? _frame->plan : nullptr);
     return passOver(error);
 }
 

@@ -103,10 +103,10 @@ inline constexpr ErrorText changeCannotBeSaved{
     -230, "The document cannot be changed to say the new value of: %@", invalidValue};
 inline constexpr ErrorText encodingCannotBeKept{
     -231, "The document cannot be changed in its encoding: %@", invalidXML};
-inline constexpr ErrorText fileHasChanged{
-    -232, "The file has changed since it was read: %@", "Another program has written it."};
-inline constexpr ErrorText bothHaveChanged{
-    -233, "The file and the object have both changed: %@", invalidValue};
+inline constexpr ErrorText fileHasChanged{-232, "The file has changed since it was read: %@",
+                                          "Another program has written it."};
+inline constexpr ErrorText bothHaveChanged{-233, "The file and the object have both changed: %@",
+                                           invalidValue};
 inline constexpr ErrorText areaIsNoDirectory{
     -2000, "Application support area is not a directory: %@", "Unable to write XML to user area"};
 

@@ -6,9 +6,9 @@
 
 #include <iostream>
 
-static_assert(QXXMLMARSHALLING_VERSION ==
-              QXXMLMARSHALLING_VERSION_MAJOR * 10000 + QXXMLMARSHALLING_VERSION_MINOR * 100 +
-                  QXXMLMARSHALLING_VERSION_PATCH);
+static_assert(QXXMLMARSHALLING_VERSION == QXXMLMARSHALLING_VERSION_MAJOR * 10000 +
+                                              QXXMLMARSHALLING_VERSION_MINOR * 100 +
+                                              QXXMLMARSHALLING_VERSION_PATCH);
 
 int main() {
     if (qx::libraryVersion() != QXXMLMARSHALLING_VERSION)
