@@ -101,8 +101,9 @@ void addTelling(CLI::App& command, Options& options) {
                      "Tell errors as editors read them: FILE:LINE:COLUMN: error CODE: MESSAGE");
 }
 
-void addOutput(CLI::App& command, Options& options) {
-    command.add_option("-o,--output", options.output, "Write to this file, once all went well")
+CLI::Option* addOutput(CLI::App& command, Options& options) {
+    return command
+        .add_option("-o,--output", options.output, "Write to this file, once all went well")
         ->option_text("FILE");
 }
 
@@ -172,7 +173,9 @@ std::string checkAssignment(const std::string& assignment) {
 }
 
 void addSaving(CLI::App& command, Options& options) {
-    command.add_flag("--in-place", options.inPlace, "Write the document, and print nothing");
+    CLI::Option* const inPlace =
+        command.add_flag("--in-place", options.inPlace, "Write the document, and print nothing");
+    addOutput(command, options)->excludes(inPlace);
     command.add_flag("--diff", options.diff, "Print the lines that change");
 }
 

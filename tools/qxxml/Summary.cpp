@@ -14,7 +14,7 @@ constexpr std::size_t mostEntries = 500;
 std::string withCommas(std::size_t number) {
     std::string text = std::to_string(number);
     for (std::size_t at = text.size(); at > 3; at -= 3)
-        text.insert(at - 3, ",");
+        text.insert(at - 3, 1, ',');
     return text;
 }
 
