@@ -153,8 +153,7 @@ public:
     void setProgressHandler(ProgressHandler handler);
 
     // What reading and writing pass over is told to the handler, and no more logged: unbound
-    // children and attributes above all. It may use the marshaller as setters may, and replace the
-    // handler. Null for none.
+    // children and attributes above all. It may do what the handler above may. Null for none.
     void setReportHandler(QXXMLReport::Handler handler);
     // How many errors a reading with a slot collects before it ends, 1 at first. More than one
     // leave out the field or item that fails; the call answers null all the same, the error is the
