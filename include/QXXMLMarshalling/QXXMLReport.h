@@ -17,10 +17,10 @@ class ErrorContext;
 class QX_API QXXMLReport {
 public:
     enum class Kind : std::uint8_t {
-        // No field took them. Kept if the object can; lost of an element that is read as a text,
-        // and
-        // of a wrapper. A lenient marshaller that keeps no unknown XML tells only of the latter
-        // two.
+        // No field took them. They are kept if the object can keep them; inside of a wrapper, and
+        // of
+        // an element that is read as a text, they are lost. A lenient marshaller that keeps no
+        // unknown XML tells only of those.
         unboundChild, // a child element, or a processing instruction under its target
         unboundAttribute,
         // Text beside child elements that no field takes. Lost.

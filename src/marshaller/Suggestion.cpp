@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 
 #include "base/NearestName.h"
+#include "model/Errors.h"
 #include "plan/MappingPlan.h"
 
 #include <algorithm>
@@ -11,16 +12,6 @@
 namespace qx::detail {
 
 namespace {
-
-constexpr int missing = -202;
-constexpr int noClassOfType = -207;
-constexpr int unknownCollection = -208;
-constexpr int severalChildren = -210;
-constexpr int noClass = -211;
-constexpr int unknownChildren = -214;
-constexpr int unknownAttributes = -215;
-constexpr int noInteger = -221;
-constexpr int refusedValue = -222;
 
 // They may go in a circle.
 constexpr std::size_t mostAncestors = 64;
@@ -192,22 +183,22 @@ String suggestionFor(const Failed& failed) {
     if (failed.mapping == nullptr || failed.mapping->mapping() == nullptr)
         return nullptr;
     switch (failed.code) {
-    case missing:
+    case errors::requiredAttributeMissing.code:
         return forMissing(failed);
-    case noClassOfType:
+    case errors::noMappingForClass.code:
         return failed.field != nullptr ? nearestClass(failed, failed.field->type()) : String();
-    case unknownCollection:
+    case errors::unknownCollectionClass.code:
         return forUnknownCollection(failed);
-    case severalChildren:
+    case errors::tooManyChildren.code:
         return "collection=\"array\" takes several";
-    case noClass:
+    case errors::noDefinitionForElement.code:
         return forUnknownElement(failed);
-    case unknownChildren:
-    case unknownAttributes:
-        return forUnknown(failed, failed.code == unknownAttributes);
-    case noInteger:
+    case errors::unknownFields.code:
+    case errors::unknownAttributes.code:
+        return forUnknown(failed, failed.code == errors::unknownAttributes.code);
+    case errors::notAnInteger.code:
         return "it takes a whole number";
-    case refusedValue:
+    case errors::unableToSetValue.code:
         return forRefused(failed);
     default:
         return nullptr;

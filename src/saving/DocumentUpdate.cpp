@@ -17,8 +17,9 @@ constexpr int mostAttempts = 6;
 
 } // namespace
 
-DocumentUpdate::DocumentUpdate(QXXMLMarshaller& marshaller, XMLBytes original, const Value& object)
-    : _marshaller(&marshaller), _original(original.view()), _object(object), _after(marshaller) {}
+DocumentUpdate::DocumentUpdate(QXXMLMarshaller& marshaller, Ref<Data> original, const Value& object)
+    : _marshaller(&marshaller), _original(std::move(original)), _object(object),
+      _after(marshaller) {}
 
 Result<QXXMLUpdate> DocumentUpdate::run() {
     Ref<Error> error;
@@ -61,7 +62,7 @@ bool DocumentUpdate::prepare(Ref<Error>* error) {
     const ClassPlan& is = *_after.trace()[0].plan;
     if (&was != &is)
         return fail(error, errors::rootOfOtherClass, was.className.string(), is.className.string());
-    _encoding = std::make_unique<SourceEncoding>(_original);
+    _encoding = std::make_unique<SourceEncoding>(_original->view());
     prepareWriter();
     return true;
 }
@@ -89,7 +90,7 @@ bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit
     }
     plan.joinRemovals();
     if (edits.isEmpty()) {
-        update._bytes = make<Data>(_original);
+        update._bytes = _original;
         return check(*_source, update, culprit);
     }
     const std::string_view text = _markup->text();
@@ -99,7 +100,7 @@ bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit
         return false;
     culprit = edits.edits().front().shown;
     Ref<Error> problem; // of what was written: the edits are to blame
-    const auto again = TracedReading::of(*_marshaller, *update._bytes, &problem);
+    const auto again = TracedReading::of(*_marshaller, update._bytes, &problem);
     if (!again || !check(*again, update, culprit))
         return false;
     listEdits(plan, edits, update);

@@ -13,8 +13,7 @@ namespace qx::detail {
 
 class DocumentUpdate {
 public:
-    // The original is lent for the time of the update.
-    DocumentUpdate(QXXMLMarshaller& marshaller, XMLBytes original, const Value& object);
+    DocumentUpdate(QXXMLMarshaller& marshaller, Ref<Data> original, const Value& object);
 
     Result<QXXMLUpdate> run();
 
@@ -30,7 +29,7 @@ private:
     void listEdits(const UpdatePlan& plan, const EditList& edits, QXXMLUpdate& update) const;
 
     const Ref<QXXMLMarshaller> _marshaller;
-    const std::string_view _original;
+    const Ref<Data> _original;
     const Value _object;
     std::unique_ptr<TracedReading> _source;
     TracedWriting _after;

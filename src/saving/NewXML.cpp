@@ -7,27 +7,6 @@
 
 namespace qx::detail {
 
-namespace {
-
-std::string reference(char32_t c) {
-    switch (c) {
-    case '&':
-        return "&amp;";
-    case '<':
-        return "&lt;";
-    case '>':
-        return "&gt;";
-    case '"':
-        return "&quot;";
-    case '\'':
-        return "&apos;";
-    default:
-        return "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";";
-    }
-}
-
-} // namespace
-
 NewXML::NewXML(const SourceLayout& layout, const WritingTrace& shown, TextEncoder* encoder)
     : _layout(layout), _shown(shown), _encoder(encoder) {
     for (WritingTrace::Number at = 0; at < shown.size(); ++at)
@@ -48,7 +27,7 @@ std::string NewXML::escaped(std::string_view value, std::string_view special, ch
         const bool isLacking = _encoder != nullptr && (c >= 0x80 || _encoder->lacksASCII()) &&
                                !_encoder->canEncode(c, character);
         if (isSpecial || isLacking)
-            result += reference(c);
+            result += referenceTo(c);
         else if (c == '\n')
             result += _layout.newline();
         else

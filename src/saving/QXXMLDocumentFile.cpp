@@ -5,6 +5,7 @@
 #include "marshaller/DocumentParsing.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
+#include "saving/DocumentUpdate.h"
 #include "saving/SourceEncoding.h"
 #include "saving/TextMerge.h"
 #include "xml/XMLParser.h"
@@ -50,7 +51,8 @@ void QXXMLDocumentFile::setBase(Ref<Data> text) {
 bool QXXMLDocumentFile::isEdited() const {
     if (_undoManager)
         return !_undoManager->isAtSavedMark();
-    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    const Ref<const QXXMLDocumentFile> self(this); // getters may let go of it
+    const auto update = qx::detail::DocumentUpdate(*_marshaller, _text, _root).run();
     return !update || !update->edits().empty();
 }
 
@@ -63,7 +65,8 @@ bool QXXMLDocumentFile::write(const String& path, const Ref<Data>& bytes, Ref<Er
 
 bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     qx::detail::reset(error);
-    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    const Ref<const QXXMLDocumentFile> self(this); // getters may let go of it
+    const auto update = qx::detail::DocumentUpdate(*_marshaller, _text, _root).run();
     if (!update) {
         if (error != nullptr)
             *error = update.error();
@@ -86,7 +89,8 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
 
 bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
     qx::detail::reset(error);
-    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    const Ref<const QXXMLDocumentFile> self(this); // getters may let go of it
+    const auto update = qx::detail::DocumentUpdate(*_marshaller, _text, _root).run();
     if (!update && error != nullptr)
         *error = update.error();
     if (!update || !write(path, update->bytes(), error))
@@ -97,6 +101,7 @@ bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
 
 bool QXXMLDocumentFile::revert(Ref<Error>* error) {
     qx::detail::reset(error);
+    const Ref<const QXXMLDocumentFile> self(this);
     auto text = qx::readFile(_path, error);
     if (!text || !_marshaller->readStringInto(_root, *text, error))
         return false;

@@ -10,7 +10,9 @@ using qx::Result;
 
 Result<QXXMLUpdate> QXXMLUpdate::updatedText(QXXMLMarshaller& marshaller, qx::XMLBytes original,
                                              const qx::Value& object) {
-    return qx::detail::DocumentUpdate(marshaller, original, object).run();
+    // A copy: getters may change what the caller holds.
+    auto bytes = qx::make<qx::Data>(original.view());
+    return qx::detail::DocumentUpdate(marshaller, std::move(bytes), object).run();
 }
 
 Result<QXXMLUpdate> QXXMLUpdate::updateFile(QXXMLMarshaller& marshaller, const qx::Value& object,
@@ -19,7 +21,7 @@ Result<QXXMLUpdate> QXXMLUpdate::updateFile(QXXMLMarshaller& marshaller, const q
     const auto original = qx::readFile(path, &error);
     if (!original)
         return error;
-    auto update = updatedText(marshaller, *original, object);
+    auto update = qx::detail::DocumentUpdate(marshaller, original, object).run();
     const bool isToBeWritten = update && !update->edits().empty();
     if (isToBeWritten && !qx::writeFileAtomically(path, update->bytes()->view(), &error))
         return error;

@@ -19,10 +19,10 @@ bool TracedWriting::write(const QXXMLMarshaller& marshaller, const Value& object
     return true;
 }
 
-std::unique_ptr<TracedReading> TracedReading::of(QXXMLMarshaller& marshaller, XMLBytes bytes,
+std::unique_ptr<TracedReading> TracedReading::of(QXXMLMarshaller& marshaller, Ref<const Data> bytes,
                                                  Ref<Error>* error) {
     std::unique_ptr<TracedReading> traced(new TracedReading(marshaller));
-    traced->_parsed = XMLParser::parseCopy(bytes, parsingOf(marshaller), error);
+    traced->_parsed = XMLParser::parse(std::move(bytes), parsingOf(marshaller), error);
     if (!traced->_parsed)
         return nullptr;
     traced->_document = std::make_unique<IndexedXML>(*traced->_parsed);

@@ -42,7 +42,7 @@ private:
 class TracedReading {
 public:
     // Null with an error of reading or of writing.
-    static std::unique_ptr<TracedReading> of(QXXMLMarshaller& marshaller, XMLBytes bytes,
+    static std::unique_ptr<TracedReading> of(QXXMLMarshaller& marshaller, Ref<const Data> bytes,
                                              Ref<Error>* error);
 
     const XMLIndex& index() const noexcept { return _parsed->index(); }

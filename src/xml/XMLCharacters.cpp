@@ -82,6 +82,23 @@ void appendCharacter(char32_t c, std::string& text) {
     add(0x80U | (c & 0x3FU));
 }
 
+std::string referenceTo(char32_t c) {
+    switch (c) {
+    case '&':
+        return "&amp;";
+    case '<':
+        return "&lt;";
+    case '>':
+        return "&gt;";
+    case '"':
+        return "&quot;";
+    case '\'':
+        return "&apos;";
+    default:
+        return "&#" + std::to_string(static_cast<std::uint32_t>(c)) + ";";
+    }
+}
+
 bool isXMLCharacter(char32_t c) noexcept {
     if (c < 0x20)
         return c == '\t' || c == '\n' || c == '\r';

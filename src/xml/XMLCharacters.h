@@ -20,6 +20,10 @@ char32_t decodeCharacter(std::string_view text, std::size_t& position) noexcept;
 // Adds the code point in UTF-8.
 void appendCharacter(char32_t c, std::string& text);
 
+// What stands for the character in a document: its entity where it has one, "&lt;" and its like,
+// else its number, "&#10;".
+std::string referenceTo(char32_t c);
+
 bool isXMLCharacter(char32_t c) noexcept;
 // UTF-8 whose every character XML allows in some place of a document.
 bool isXMLText(std::string_view text) noexcept;

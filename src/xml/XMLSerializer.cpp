@@ -24,25 +24,6 @@ constexpr std::array<bool, 256> plainBytes = [] {
     return plain;
 }();
 
-std::string_view reference(char c) {
-    switch (c) {
-    case '&':
-        return "&amp;";
-    case '<':
-        return "&lt;";
-    case '>':
-        return "&gt;";
-    case '"':
-        return "&quot;";
-    case '\t':
-        return "&#9;";
-    case '\n':
-        return "&#10;";
-    default:
-        return "&#13;";
-    }
-}
-
 } // namespace
 
 void XMLSerializer::write(const XMLNode& node) {
@@ -258,7 +239,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
         if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
             (c == '"' && where == Where::attribute) || (c == '\t' && where == Where::attribute) ||
             (c == '\n' && escapesBreaks))
-            replace(start, at, reference(byte));
+            replace(start, at, referenceTo(static_cast<unsigned char>(byte)));
         else if (isChecked() && !isXMLCharacter(c))
             refuse(c < 0x80 ? "a text holds a control character"
                             : "a text holds what is no XML character",

@@ -5,7 +5,10 @@
 #include "support/Scenario.h"
 #include "support/TemporaryFolder.h"
 
+#include <QXXMLMarshalling/QXMappedObject.h>
 #include <QXXMLMarshalling/QXXMLDocumentFile.h>
+
+#include <functional>
 
 namespace {
 
@@ -17,6 +20,21 @@ struct Sheet {
     std::string title;
     std::vector<Row> rows;
 };
+
+// Lets go of all that saves it when it is asked for its title.
+struct Closer : QXMappedObject {
+    static std::function<void()> close;
+    std::string title() const {
+        if (close)
+            std::exchange(close, nullptr)();
+        return _title;
+    }
+    void setTitle(const std::string& title) { _title = title; }
+
+private:
+    std::string _title;
+};
+std::function<void()> Closer::close;
 
 constexpr const char* mapping = "<Sheet xml='sheet'><title node='element'/>"
                                 "<rows type='Row' collection='array' name='row'/></Sheet>"
@@ -118,6 +136,29 @@ TEST_F(Update, AFileIsReplacedOnlyWhereSomethingWasEdited) {
     EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, qx::Value(), path).error()->code(), -211);
     EXPECT_EQ(QXXMLUpdate::updateFile(*marshaller, Row{}, path).error()->code(), -211);
     EXPECT_EQ(folder.read("sheet.xml"), "<sheet><!-- mine --><title>b</title></sheet>");
+}
+
+TEST_F(Update, GettersMayLetGoOfWhatIsBeingSaved) {
+    qx::Class::define<Closer, QXMappedObject>("Closer").property<&Closer::title, &Closer::setTitle>(
+        "title");
+    const TemporaryFolder folder;
+    const std::string path = folder.write("closer.xml", "<closer title='old'/>");
+    auto closers = scenario::marshaller("<Closer xml='closer'><title node='attribute'/></Closer>");
+    auto file = QXXMLDocumentFile::open(path, closers);
+    ASSERT_TRUE(file);
+    const auto root = file->root();
+    root->setValueForKey("new", "title");
+    Closer::close = [&] { file = nullptr; };
+    EXPECT_TRUE(file->save());
+    EXPECT_FALSE(file);
+    EXPECT_EQ(folder.read("closer.xml"), "<closer title='new'/>");
+    auto bytes = std::make_unique<std::string>("<closer title='a long title of long ago'/>");
+    Closer::close = [&] { bytes = nullptr, closers = nullptr; };
+    const auto update = QXXMLUpdate::updatedText(*closers, *bytes, root);
+    ASSERT_TRUE(update);
+    EXPECT_EQ(update->bytes()->view(), "<closer title='new'/>");
+    EXPECT_FALSE(bytes);
+    qx::Class::forget("Closer");
 }
 
 TEST_F(Update, ADocumentFileSavesRevertsAndTellsWhetherItIsEdited) {
