@@ -14,18 +14,13 @@ public:
     // Refers to the bytes, as long as they stay. Each copy of the value has bytes of its own; one
     // that is moved refers to them, too.
     static Value of(std::string_view text) {
-        if (text.size() <= Value::mostInside || text.size() > UINT32_MAX)
+        if (text.size() <= Value::Cell::mostInside || text.size() > UINT32_MAX)
             return text;
-        Value value;
-        value._cell.word.kind = Value::Kind::string;
-        value._cell.word.form = Value::Form::lent;
-        value._cell.word.size = static_cast<std::uint32_t>(text.size());
-        value._cell.word.lent = text.data();
-        return value;
+        return Value(Value::Cell::lent(text));
     }
     // The value to keep: a lent text gets bytes in a block.
     static Value kept(Value&& value) {
-        const bool isLent = value.isString() && value._cell.word.form == Value::Form::lent;
+        const bool isLent = value.isString() && value._cell.form() == Value::Form::lent;
         return isLent ? Value(textInBlock(value.view())) : std::move(value);
     }
 };

@@ -12,39 +12,38 @@
 
 namespace qx {
 
-Value::Value(String&& text) noexcept : _cell(text.isNull() ? Kind::null : Kind::string) {
-    _cell.word.text = std::move(text).detach();
-}
+Value::Value(String&& text) noexcept : _cell(std::move(text).detach()) {}
 
-Value::Value(const Object* object) noexcept : _cell(object != nullptr ? Kind::object : Kind::null) {
+Value::Value(const Object* object) noexcept : _cell(object) {
     if (object != nullptr)
         object->retain();
-    _cell.word.object = const_cast<Object*>(object);
 }
+
+Value::Cell Value::counted(std::string_view text) { return Cell(String(text).detach()); }
 
 // The cell is the other's already.
 void Value::share(const Value& other) {
     if (isObject()) {
-        _cell.word.object->retain();
-    } else if (_cell.word.form == Form::counted) {
-        _cell.word.text = String::shared(_cell.word.text).detach();
-    } else if (_cell.word.form == Form::lent) {
-        _cell = Cell(Kind::null);
+        _cell.object()->retain();
+    } else if (_cell.form() == Form::counted) {
+        _cell = Cell(String::shared(_cell.text()).detach());
+    } else if (_cell.form() == Form::lent) {
+        _cell = Cell();
         *this = Value(other.view());
     }
 }
 
 void Value::releaseCounted() noexcept {
     if (isObject())
-        _cell.word.object->release();
+        _cell.object()->release();
     else
-        String::adopt(_cell.word.text);
+        String::adopt(_cell.text());
 }
 
 String Value::string() const {
     if (!isString())
         return {};
-    return _cell.word.form == Form::counted ? String::shared(_cell.word.text) : String(view());
+    return _cell.form() == Form::counted ? String::shared(_cell.text()) : String(view());
 }
 
 bool Value::isNullOrMarker() const noexcept { return isNull() || object() == Null::marker(); }
@@ -87,15 +86,15 @@ bool Value::boolValue() const noexcept {
     case Kind::null:
         return false;
     case Kind::boolean:
-        return _cell.word.boolean;
+        return _cell.boolean();
     case Kind::integer:
-        return _cell.word.integer != 0;
+        return _cell.integer() != 0;
     case Kind::real:
-        return _cell.word.real != 0;
+        return _cell.real() != 0;
     case Kind::string:
         return textIsTrue(view());
     case Kind::object:
-        return _cell.word.object != Null::marker();
+        return _cell.object() != Null::marker();
     }
     return false;
 }
@@ -103,11 +102,11 @@ bool Value::boolValue() const noexcept {
 std::int64_t Value::intValue() const noexcept {
     switch (kind()) {
     case Kind::boolean:
-        return _cell.word.boolean ? 1 : 0;
+        return _cell.boolean() ? 1 : 0;
     case Kind::integer:
-        return _cell.word.integer;
+        return _cell.integer();
     case Kind::real:
-        return saturated(_cell.word.real);
+        return saturated(_cell.real());
     case Kind::string:
         return scanInteger(view()).value_or(0);
     case Kind::null:
@@ -120,11 +119,11 @@ std::int64_t Value::intValue() const noexcept {
 double Value::doubleValue() const noexcept {
     switch (kind()) {
     case Kind::boolean:
-        return _cell.word.boolean ? 1 : 0;
+        return _cell.boolean() ? 1 : 0;
     case Kind::integer:
-        return static_cast<double>(_cell.word.integer);
+        return static_cast<double>(_cell.integer());
     case Kind::real:
-        return _cell.word.real;
+        return _cell.real();
     case Kind::string:
         return scanReal(view()).value_or(0);
     case Kind::null:
@@ -139,21 +138,21 @@ String Value::description() const {
     case Kind::null:
         return "(null)";
     case Kind::boolean:
-        return _cell.word.boolean ? "1" : "0";
+        return _cell.boolean() ? "1" : "0";
     case Kind::integer:
-        return std::to_string(_cell.word.integer);
+        return std::to_string(_cell.integer());
     case Kind::real:
-        return describeReal(_cell.word.real);
+        return describeReal(_cell.real());
     case Kind::string:
         return string();
     case Kind::object:
-        return _cell.word.object->description();
+        return _cell.object()->description();
     }
     return {};
 }
 
 String Value::descriptionWithLocale(const Object* locale, std::size_t indent) const {
-    return isObject() ? _cell.word.object->descriptionWithLocale(locale, indent) : description();
+    return isObject() ? _cell.object()->descriptionWithLocale(locale, indent) : description();
 }
 
 bool Value::isEqual(const Value& other) const {
@@ -161,11 +160,11 @@ bool Value::isEqual(const Value& other) const {
         const bool realHere = kind() == Kind::real;
         const bool realThere = other.kind() == Kind::real;
         if (realHere && realThere)
-            return _cell.word.real == other._cell.word.real;
+            return _cell.real() == other._cell.real();
         if (realHere)
-            return equal(other.intValue(), _cell.word.real);
+            return equal(other.intValue(), _cell.real());
         if (realThere)
-            return equal(intValue(), other._cell.word.real);
+            return equal(intValue(), other._cell.real());
         return intValue() == other.intValue();
     }
     if (kind() != other.kind())
@@ -173,8 +172,8 @@ bool Value::isEqual(const Value& other) const {
     if (kind() == Kind::string)
         return view() == other.view();
     if (kind() == Kind::object)
-        return _cell.word.object == other._cell.word.object ||
-               _cell.word.object->isEqual(*other._cell.word.object);
+        return _cell.object() == other._cell.object() ||
+               _cell.object()->isEqual(*other._cell.object());
     return true;
 }
 
@@ -203,9 +202,9 @@ std::weak_ordering order(std::int64_t integer, double real) {
 std::weak_ordering Value::compare(const Value& other) const noexcept {
     if (isNumber() && other.isNumber()) {
         if (kind() == Kind::real)
-            return other.kind() == Kind::real ? orderOfReals(_cell.word.real, other._cell.word.real)
-                                              : 0 <=> order(other.intValue(), _cell.word.real);
-        return other.kind() == Kind::real ? order(intValue(), other._cell.word.real)
+            return other.kind() == Kind::real ? orderOfReals(_cell.real(), other._cell.real())
+                                              : 0 <=> order(other.intValue(), _cell.real());
+        return other.kind() == Kind::real ? order(intValue(), other._cell.real())
                                           : intValue() <=> other.intValue();
     }
     if (isString() && other.isString())
@@ -218,22 +217,22 @@ std::weak_ordering Value::compare(const Value& other) const noexcept {
 }
 
 bool Value::isSameAs(const Value& other) const noexcept {
-    if (kind() != other.kind() || _cell.word.form != other._cell.word.form)
+    if (kind() != other.kind() || _cell.form() != other._cell.form())
         return false;
     switch (kind()) {
     case Kind::null:
         return true;
     case Kind::boolean:
-        return _cell.word.boolean == other._cell.word.boolean;
+        return _cell.boolean() == other._cell.boolean();
     case Kind::integer:
-        return _cell.word.integer == other._cell.word.integer;
+        return _cell.integer() == other._cell.integer();
     case Kind::real:
-        return _cell.word.real == other._cell.word.real;
+        return _cell.real() == other._cell.real();
     case Kind::string:
-        return _cell.word.form >= Form::inside ? view() == other.view()
-                                               : view().data() == other.view().data();
+        return _cell.form() >= Form::inside ? view() == other.view()
+                                            : view().data() == other.view().data();
     case Kind::object:
-        return _cell.word.object == other._cell.word.object;
+        return _cell.object() == other._cell.object();
     }
     return false;
 }
@@ -252,7 +251,7 @@ String Value::classNameForMarshalling() const {
     case Kind::string:
         return text;
     case Kind::object:
-        return _cell.word.object->classNameForMarshalling();
+        return _cell.object()->classNameForMarshalling();
     }
     return {};
 }

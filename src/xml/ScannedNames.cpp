@@ -18,19 +18,31 @@ ScannedNames::ScannedNames(std::string_view text, std::size_t longest, std::vect
     : _text(text), _longest(longest), _seed(String::hashOf("names of a document")), _slots(256),
       _texts(texts) {}
 
-ScannedNames::Number ScannedNames::add(std::string_view text, std::uint32_t hash) {
+ScannedNames::Name& ScannedNames::findLong(std::string_view text) {
+    const std::uint32_t hash = String::hashOf(text);
+    const std::size_t mask = _slots.size() - 1;
+    for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
+        Name& name = _names[_slots[slot] - 1];
+        if (_text.substr(name.begin, name.size) == text)
+            return name;
+    }
+    return add(text, {UINT64_MAX, UINT64_MAX}, hash);
+}
+
+ScannedNames::Name& ScannedNames::add(std::string_view text, const ShortName& bytes,
+                                      std::uint32_t hash) {
     require(text.size() <= _longest && _URIs + _names.size() < xmlLimits::names);
-    Name name{static_cast<std::uint32_t>(text.data() - _text.data()),
-              static_cast<std::uint32_t>(text.size()), hash};
+    Name name{bytes, static_cast<std::uint32_t>(text.data() - _text.data()),
+              static_cast<std::uint32_t>(text.size()), hash, 0};
     if (!text.empty())
         takeApart(name, text);
     if ((_names.size() + 1) * 2 > _slots.size())
         grow();
     _texts.push_back(knownName(text));
-    const auto number = static_cast<Number>(_names.size());
+    name.number = static_cast<Number>(_names.size());
     _names.push_back(name);
-    fill(number);
-    return number;
+    fill(name.number);
+    return _names.back();
 }
 
 // What stands behind its colon is a name of its own.
@@ -49,7 +61,7 @@ void ScannedNames::takeApart(Name& name, std::string_view text) {
         require(local != "xml" && local != "xmlns");
         name.meaning = Meaning::prefixNamespace;
     }
-    name.local = numberOf(local.data(), local.size());
+    name.local = find(local.data(), local.size()).number;
 }
 
 void ScannedNames::countURI() { require(++_URIs + _names.size() <= xmlLimits::names); }

@@ -5,8 +5,8 @@
 //
 //     _slots  | 0 | 2 | 0 | 1 | ...   by hash: a number plus one, 0 where free; open addressing, at
 //                                     most half full
-//     _names  | "b" | "a:b" | ...     place in the text, last use as an attribute; of a prefixed
-//                                     one the local name has an entry, too
+//     _names  | "b" | "a:b" | ...     its bytes or its place in the text, last use as an
+//                                     attribute; of a prefixed one the local name has an entry, too
 //     _texts  | "b" | "a:b" | ...     the index's, interned where some code knows them
 //
 // 1. Numbers stay. A reference to a Name is good until the next name is looked up.
@@ -15,12 +15,11 @@
 
 #include <QXXMLMarshalling/base/String.h>
 
+#include "xml/ByteRuns.h"
 #include "xml/XMLIndex.h"
 #include "xml/XMLLimits.h"
 
-#include <bit>
 #include <cstdint>
-#include <cstring>
 #include <vector>
 
 namespace qx {
@@ -37,9 +36,11 @@ public:
     // What a name means as an attribute's.
     enum class Meaning : std::uint8_t { plain, space, defaultNamespace, prefixNamespace };
     struct Name {
+        ShortName bytes; // of a long one what no short one has
         std::uint32_t begin;
         std::uint32_t size;
         std::uint32_t hash;
+        Number number;
         std::uint32_t usedAt = 0;      // the element that had it last as an attribute
         Number local = none;           // with a prefix: the number of the name behind the colon
         std::uint32_t localUsedAt = 0; // the element that had an attribute of this local name last
@@ -51,64 +52,41 @@ public:
 
     Name& operator[](Number number) noexcept { return _names[number]; }
 
-    // The number of the name at that place of the text. A new name is looked at in full: throws
-    // Refused for what is none, and beyond a limit.
-    Number numberOf(const char* begin, std::size_t size) {
-        const std::uint32_t hash = hashOf(begin, size);
+    // The name at that place of the text. A new one is looked at in full: throws Refused for what
+    // is none, and beyond a limit.
+    Name& find(const char* begin, std::size_t size) {
+        return size <= ShortName::longest ? find(begin, size, ShortName::of(begin, size))
+                                          : findLong({begin, size});
+    }
+    // The same of one whose bytes are at hand.
+    Name& find(const char* begin, std::size_t size, const ShortName& bytes) {
+        const std::uint32_t hash = hashOf(bytes);
         const std::size_t mask = _slots.size() - 1;
         for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
-            const Name& name = _names[_slots[slot] - 1];
-            if (name.size == size && std::memcmp(_text.data() + name.begin, begin, size) == 0)
-                return _slots[slot] - 1;
+            Name& name = _names[_slots[slot] - 1];
+            if (name.bytes == bytes)
+                return name;
         }
-        return add({begin, size}, hash);
+        return add({begin, size}, bytes, hash);
     }
     // The empty prefix, that of a default namespace.
-    Number numberOfNoPrefix() { return numberOf(_text.data() + _text.size(), 0); }
+    Number numberOfNoPrefix() { return find(_text.data() + _text.size(), 0).number; }
 
     // The URI of each declaration counts as one more name. Throws Refused beyond the limit.
     void countURI();
 
 private:
-    static constexpr bool isLittleEndian = std::endian::native == std::endian::little;
-
     static constexpr std::uint64_t mixed(std::uint64_t hash) noexcept {
         hash *= 0x9E3779B97F4A7C15U;
         return hash ^ hash >> 32U;
     }
-    static std::uint64_t wordAt(const char* place) noexcept {
-        std::uint64_t word = 0;
-        std::memcpy(&word, place, sizeof word);
-        return word;
+    // The last word is mixed twice: once would leave the slot untouched by what only the last bytes
+    // differ in, whatever the seed, and a document could have all its names meet in one.
+    std::uint32_t hashOf(const ShortName& bytes) const noexcept {
+        return static_cast<std::uint32_t>(mixed(mixed(mixed(_seed ^ bytes.lower) ^ bytes.upper)));
     }
-    // The first eight bytes, as far as it has them. A word is read whole where the text goes on
-    // that far: a copy of a few bytes, read as a word, would have to wait for them.
-    std::uint64_t startOf(const char* begin, std::size_t size) const noexcept {
-        if (size >= 8)
-            return wordAt(begin);
-        if (_text.data() + _text.size() - begin >= 8) {
-            const std::uint64_t kept = (std::uint64_t(1) << (8 * size)) - 1;
-            return wordAt(begin) & (isLittleEndian ? kept : ~(~std::uint64_t(0) >> (8 * size)));
-        }
-        std::uint64_t word = 0;
-        std::memcpy(&word, begin, size);
-        return word;
-    }
-    std::uint32_t hashOf(const char* begin, std::size_t size) const noexcept {
-        // Twice: once would leave the slot untouched by what only the last bytes differ in,
-        // whatever the seed, and a document could have all its names meet in one.
-        const auto add = [](std::uint64_t hash, std::uint64_t word) {
-            return mixed(mixed(hash ^ word));
-        };
-        std::uint64_t hash = add(_seed + size, startOf(begin, size));
-        if (size > 8) {
-            for (std::size_t at = 8; at + 8 < size; at += 8)
-                hash = add(hash, wordAt(begin + at));
-            hash = add(hash, wordAt(begin + size - 8));
-        }
-        return static_cast<std::uint32_t>(hash);
-    }
-    Number add(std::string_view text, std::uint32_t hash);
+    Name& findLong(std::string_view text);
+    Name& add(std::string_view text, const ShortName& bytes, std::uint32_t hash);
     void takeApart(Name& name, std::string_view text);
     void fill(Number number);
     void grow();

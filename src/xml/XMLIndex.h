@@ -31,6 +31,7 @@
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/xml/XMLNode.h>
 
+#include "base/BulkArray.h"
 #include "xml/TextPosition.h"
 
 #include <span>
@@ -87,7 +88,9 @@ public:
 
     std::string_view text() const noexcept { return _text; }
     const TextOrigin& origin() const noexcept { return _origin; }
-    std::span<const XMLIndexEntry> entries() const noexcept { return _entries; }
+    std::span<const XMLIndexEntry> entries() const noexcept {
+        return {_entries.data(), _entries.size()};
+    }
     const XMLIndexEntry& operator[](Number number) const noexcept { return _entries[number]; }
 
     // The entries inside an element: attributes and declarations, then, from firstChild on, its
@@ -139,7 +142,7 @@ private:
 
     std::string_view _text;
     TextOrigin _origin;
-    std::vector<XMLIndexEntry> _entries;
+    BulkArray<XMLIndexEntry> _entries;
     std::vector<String> _names;
     std::string _aside;
     bool _isLevelled = false;

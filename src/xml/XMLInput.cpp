@@ -1,5 +1,6 @@
 #include "xml/XMLInput.h"
 
+#include "base/BulkArray.h"
 #include "xml/AttributeCounts.h"
 #include "xml/Encoding.h"
 #include "xml/ParseFailure.h"
@@ -11,8 +12,11 @@ namespace qx {
 void XMLInput::read(std::string_view bytes, bool copies) {
     const bool isConverted = decodeBytes(bytes);
     checkStart();
-    if (!isConverted && copies)
+    if (!isConverted && copies) {
+        _own.reserve(_text.size());
+        askForLargePages(_own.data(), _text.size());
         _text = _own = _text;
+    }
     checkTags();
 }
 

@@ -4,59 +4,12 @@
 #include "xml/XMLLimits.h"
 
 #include <algorithm>
-#include <array>
 #include <cstring>
+#include <tuple>
 
 namespace qx {
 
 namespace {
-
-// What a byte may be part of. Bytes beyond ASCII count as parts of names: a name is looked at in
-// full when it is new.
-enum : std::uint8_t {
-    whiteByte = 1,
-    nameByte = 2,
-    textByte = 4,      // plain in text
-    attributeByte = 8, // plain in an attribute's value
-    markupByte = 16,   // plain in comments, instructions and CDATA
-};
-
-constexpr std::array<std::uint8_t, 256> byteClasses() {
-    std::array<std::uint8_t, 256> classes{};
-    for (unsigned c = 0x20; c < 0x80; ++c)
-        classes[c] = textByte | attributeByte | markupByte;
-    for (const unsigned char c : {' ', '\t', '\n', '\r'})
-        classes[c] |= whiteByte;
-    classes['\t'] |= textByte | markupByte;
-    classes['\n'] |= textByte | markupByte;
-    for (const unsigned char c : {'<', '&', ']'})
-        classes[c] &= static_cast<std::uint8_t>(~textByte);
-    for (const unsigned char c : {'<', '&', '"', '\''})
-        classes[c] &= static_cast<std::uint8_t>(~attributeByte);
-    for (const unsigned char c : {'-', '?', ']'})
-        classes[c] &= static_cast<std::uint8_t>(~markupByte);
-    for (unsigned c = 'a'; c <= 'z'; ++c)
-        classes[c] |= nameByte;
-    for (unsigned c = 'A'; c <= 'Z'; ++c)
-        classes[c] |= nameByte;
-    for (unsigned c = '0'; c <= '9'; ++c)
-        classes[c] |= nameByte;
-    for (const unsigned char c : {'-', '.', '_', ':'})
-        classes[c] |= nameByte;
-    for (unsigned c = 0x80; c < 0x100; ++c)
-        classes[c] = nameByte;
-    return classes;
-}
-constexpr auto classes = byteClasses();
-
-bool is(char c, std::uint8_t kind) noexcept {
-    return (classes[static_cast<unsigned char>(c)] & kind) != 0;
-}
-
-void skip(const char*& at, std::uint8_t kind) noexcept {
-    while (is(*at, kind))
-        ++at;
-}
 
 constexpr std::string_view xmlNamespace = "http://www.w3.org/XML/1998/namespace";
 constexpr std::string_view xmlnsNamespace = "http://www.w3.org/2000/xmlns/";
@@ -64,6 +17,8 @@ constexpr std::string_view xmlnsNamespace = "http://www.w3.org/2000/xmlns/";
 // The C parser has had limits of its own near these; it decides there.
 constexpr std::size_t longestName = 10'000;
 constexpr std::size_t largestPiece = 10'000'000;
+
+constexpr std::ptrdiff_t emptyCData = 12;
 
 } // namespace
 
@@ -80,77 +35,88 @@ bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options) {
 }
 
 XMLScanner::XMLScanner(XMLIndex& index, const XMLParseOptions& options)
-    : _text(index.text()), _at(_text.data()), _end(_text.data() + _text.size()),
-      _maximumDepth(options.maximumDepth),
+    : _text(index.text()), _end(_text.data() + _text.size()), _maximumDepth(options.maximumDepth),
       _maximumSize(std::min(options.maximumTextSize, largestPiece)),
-      _keepsWhiteSpace(options.keepWhiteSpace), _index(index), _entries(index._entries),
+      _keepsWhiteSpace(options.keepWhiteSpace), _index(index),
       _names(_text, std::min(longestName, _maximumSize), index._names) {
     // Most entries stand for more bytes than this.
     constexpr std::size_t bytesOfEntry = 16;
-    _entries.reserve(_text.size() / bytesOfEntry + 16);
+    makeRoom(_text.size() / bytesOfEntry + 16);
 }
 
-bool XMLScanner::skipWhite() noexcept {
-    const char* const start = _at;
-    skip(_at, whiteByte);
-    return _at != start;
+namespace {
+
+const char* afterWhite(const char* at) noexcept {
+    while (is(*at, whiteByte))
+        ++at;
+    return at;
 }
 
-inline XMLIndexEntry& XMLScanner::add(XMLNodeKind kind, const char* begin, Number name) {
-    if (_entries.size() == _entries.capacity()) [[unlikely]]
-        makeRoom();
-    return _entries.emplace_back(XMLIndexEntry::of(kind, name, offset(begin)));
+} // namespace
+
+inline XMLIndexEntry& XMLScanner::add(const XMLIndexEntry& entry) {
+    if (_next == _last) [[unlikely]]
+        makeMoreRoom(entry.begin);
+    return *_next++ = entry;
+}
+
+// What has no entries inside.
+inline XMLIndexEntry& XMLScanner::addLeaf(XMLNodeKind kind, Number name, const char* begin,
+                                          const char* end) {
+    const Number next = entryCount() + 1;
+    XMLIndexEntry entry{offset(begin), offset(end), next, XMLIndexEntry::of(kind, name, 0).bits};
+    entry.setIf(_needsWork, XMLIndexEntry::needsWork);
+    require(entry.end - entry.begin <= _maximumSize);
+    return add(entry);
+}
+
+void XMLScanner::makeRoom(std::size_t entries) {
+    const Number count = entryCount();
+    auto& all = _index._entries;
+    all.resize(entries);
+    _first = all.data();
+    _next = _first + count;
+    _last = _first + entries;
 }
 
 // For the rest of the text, taken to be like what has been read, and a bit more: doubling would
 // double what a dense document takes.
-void XMLScanner::makeRoom() {
-    const double read = static_cast<double>(offset(_at)) + 1;
-    const double expected =
-        static_cast<double>(_entries.size()) * (static_cast<double>(_text.size()) / read);
-    const std::size_t least = _entries.size() + _entries.size() / 8;
-    _entries.reserve(
-        std::clamp(static_cast<std::size_t>(expected * 1.05), least, _text.size() + 16));
-}
-
-inline void XMLScanner::finish(XMLIndexEntry& entry, const char* end) {
-    entry.end = offset(end);
-    entry.next = static_cast<std::uint32_t>(_entries.size());
-    entry.setIf(_needsWork, XMLIndexEntry::needsWork);
-    require(entry.end - entry.begin <= _maximumSize);
+void XMLScanner::makeMoreRoom(std::uint32_t place) {
+    const std::size_t count = entryCount();
+    const double read = static_cast<double>(place) + 1;
+    const double expected = static_cast<double>(count) * (static_cast<double>(_text.size()) / read);
+    makeRoom(std::clamp(static_cast<std::size_t>(expected * 1.05), count + count / 8,
+                        _text.size() + 16));
 }
 
 void XMLScanner::scanDocument() {
-    if (startsWith("<?xml") && is(_at[5], whiteByte))
-        scanDeclaration();
-    scanMisc();
-    require(*_at == '<');
-    scanRoot();
-    scanMisc();
-    require(_at == _end);
+    Place at = _text.data();
+    if (startsWith(at, "<?xml") && is(at[5], whiteByte))
+        at = scanDeclaration(at);
+    at = scanMisc(at);
+    require(*at == '<');
+    at = scanMisc(scanRoot(at));
+    require(at == _end);
+    _index._entries.resize(entryCount());
 }
 
 // version="1.0", then encoding and standalone if they are there, in this order.
-void XMLScanner::scanDeclaration() {
-    _at += 5;
+XMLScanner::Place XMLScanner::scanDeclaration(Place at) {
+    at += 5;
     const auto value = [&](std::string_view name) -> std::string_view {
-        const char* const before = _at;
-        if (!skipWhite() || !startsWith(name)) {
-            _at = before;
+        const Place begin = afterWhite(at);
+        if (begin == at || !startsWith(begin, name))
             return {};
-        }
-        _at += name.size();
-        skipWhite();
-        expect('=');
-        skipWhite();
-        const char quote = *_at;
+        at = afterWhite(expect(afterWhite(begin + name.size()), '='));
+        const char quote = *at;
         require(quote == '"' || quote == '\'');
-        const char* const begin = ++_at;
-        while (is(*_at, nameByte) && *_at != ':')
-            ++_at;
-        expect(quote);
-        require(_at - begin > 1);
-        return {begin, static_cast<std::size_t>(_at - begin - 1)};
+        const Place first = ++at;
+        while (is(*at, nameByte) && *at != ':')
+            ++at;
+        const std::string_view found(first, static_cast<std::size_t>(at - first));
+        at = expect(at, quote);
+        require(!found.empty());
+        return found;
     };
     require(value("version") == "1.0");
     const std::string_view encoding = value("encoding");
@@ -160,86 +126,84 @@ void XMLScanner::scanDeclaration() {
                         [](char c) { return static_cast<unsigned char>(c) < 0x80; }));
     const std::string_view standalone = value("standalone");
     require(standalone.empty() || standalone == "yes" || standalone == "no");
-    skipWhite();
-    expect('?');
-    expect('>');
+    at = expect(expect(afterWhite(at), '?'), '>');
     _index._version = "1.0";
     if (!standalone.empty())
         _index._standalone = standalone;
+    return at;
 }
 
 // Comments, instructions and white space around the root.
-void XMLScanner::scanMisc() {
+XMLScanner::Place XMLScanner::scanMisc(Place at) {
     while (true) {
-        skipWhite();
-        if (startsWith("<!--"))
-            scanComment();
-        else if (startsWith("<?"))
-            scanInstruction();
+        at = afterWhite(at);
+        if (startsWith(at, "<!--"))
+            at = scanComment(at);
+        else if (startsWith(at, "<?"))
+            at = scanInstruction(at);
         else
-            return;
+            return at;
     }
 }
 
-void XMLScanner::scanRoot() {
-    scanElementStart();
+XMLScanner::Place XMLScanner::scanRoot(Place at) {
+    at = scanElementStart(at);
     while (!_open.empty()) {
-        if (*_at != '<')
-            scanText();
-        else if (_at[1] == '/')
-            scanEndTag();
-        else if (_at[1] == '!' || _at[1] == '?')
-            scanMarkup();
+        if (*at != '<')
+            at = scanText(at);
+        else if (at[1] == '/')
+            at = scanEndTag(at);
+        else if (at[1] == '!' || at[1] == '?')
+            at = scanMarkup(at);
         else
-            scanElementStart();
+            at = scanElementStart(at);
     }
+    return at;
 }
 
-void XMLScanner::scanMarkup() {
-    if (startsWith("<!--"))
-        scanComment();
-    else if (startsWith("<![CDATA["))
-        scanText();
-    else if (_at[1] == '?')
-        scanInstruction();
-    else
-        throw Refused();
+XMLScanner::Place XMLScanner::scanMarkup(Place at) {
+    if (startsWith(at, "<!--"))
+        return scanComment(at);
+    if (startsWith(at, "<![CDATA["))
+        return scanText(at);
+    require(at[1] == '?');
+    return scanInstruction(at);
 }
 
-void XMLScanner::scanElementStart() {
+inline XMLScanner::Place XMLScanner::scanElementStart(Place at) {
     require(_open.size() < _maximumDepth);
-    const char* const begin = _at++;
-    const auto number = static_cast<Number>(_entries.size());
-    const Number name = scanName();
-    require(_names[name].meaning == Meaning::plain || _names[name].meaning == Meaning::space);
-    add(XMLNodeKind::element, begin, name);
+    const Place begin = at++;
+    const Name& name = scanName(at);
+    require(name.meaning == Meaning::plain || name.meaning == Meaning::space);
+    const Number number = entryCount();
+    add(XMLIndexEntry::of(XMLNodeKind::element, name.number, offset(begin)));
     const Open outer =
         _open.empty() ? Open{0, 0, _keepsWhiteSpace, _keepsWhiteSpace} : _open.back();
     _open.push_back({number, outer.namespaces, outer.preservesSpace, outer.preservesSpace});
     ++_element;
-    if (*_at != '>')
-        scanAttributes();
-    if (*_at == '/') {
-        ++_at;
-        expect('>');
-        endElement();
-    } else {
-        expect('>');
-    }
+    if (*at != '>')
+        at = scanAttributes(at);
+    const bool isEmpty = *at == '/';
+    at = expect(isEmpty ? at + 1 : at, '>');
+    if (isEmpty)
+        endElement(at);
+    return at;
 }
 
-void XMLScanner::scanAttributes() {
-    for (std::size_t count = 0; skipWhite() && is(*_at, nameByte); ++count) {
+XMLScanner::Place XMLScanner::scanAttributes(Place at) {
+    for (std::size_t count = 0;; ++count) {
+        const Place begin = afterWhite(at);
+        if (begin == at || !is(*begin, nameByte))
+            return begin;
         require(count < xmlLimits::attributes);
-        scanAttribute();
+        at = scanAttribute(begin);
     }
 }
 
 // A name="value". An attribute of the same name before it, or of the same local name with another
 // prefix, is a fault or may be one.
-void XMLScanner::scanAttribute() {
-    const Number number = scanName();
-    Name& name = _names[number];
+inline XMLScanner::Place XMLScanner::scanAttribute(Place at) {
+    Name& name = scanName(at);
     require(name.usedAt != _element);
     name.usedAt = _element;
     if (name.local != ScannedNames::none) {
@@ -247,29 +211,28 @@ void XMLScanner::scanAttribute() {
         require(local.localUsedAt != _element);
         local.localUsedAt = _element;
     }
-    skipWhite();
-    expect('=');
-    skipWhite();
-    const char quote = *_at;
+    at = afterWhite(expect(afterWhite(at), '='));
+    const char quote = *at;
     require(quote == '"' || quote == '\'');
-    XMLIndexEntry& entry = add(XMLNodeKind::attribute, ++_at, number);
+    const Place begin = ++at;
     _needsWork = false;
     while (true) {
-        skip(_at, attributeByte);
-        if (*_at == quote)
+        at = endOfRun<attributeByte>(at, _end);
+        if (*at == quote)
             break;
-        if (*_at == '"' || *_at == '\'')
-            ++_at;
-        else if (*_at == '&')
-            scanReference();
-        else if (is(*_at, whiteByte))
-            _needsWork = true, ++_at;
+        if (*at == '"' || *at == '\'')
+            ++at;
+        else if (*at == '&')
+            at = scanReference(at);
+        else if (is(*at, whiteByte))
+            _needsWork = true, ++at;
         else
-            scanBeyondASCII();
+            at = scanBeyondASCII(at);
     }
-    finish(entry, _at++);
+    XMLIndexEntry& entry = addLeaf(XMLNodeKind::attribute, name.number, begin, at);
     if (name.meaning != Meaning::plain)
         takeMeaning(entry, name);
+    return at + 1;
 }
 
 void XMLScanner::takeMeaning(XMLIndexEntry& entry, const Name& name) {
@@ -293,169 +256,176 @@ void XMLScanner::takeDeclaration(XMLIndexEntry& entry, const Name& name) {
     entry.bits = XMLIndexEntry::of(XMLNodeKind::namespaceDeclaration, prefix, 0).bits;
 }
 
-void XMLScanner::scanEndTag() {
-    const Name& name = _names[_entries[_open.back().number].name()];
-    _at += 2;
-    require(static_cast<std::size_t>(_end - _at) > name.size &&
-            std::memcmp(_at, _text.data() + name.begin, name.size) == 0);
-    _at += name.size;
-    if (*_at != '>')
-        skipWhite();
-    expect('>');
-    endElement();
+inline XMLScanner::Place XMLScanner::scanEndTag(Place at) {
+    const Name& name = _names[_first[_open.back().number].name()];
+    at += 2;
+    require((name.size <= ShortName::longest && name.bytes.standsAt(at, _end, name.size)) ||
+            (static_cast<std::size_t>(_end - at) > name.size &&
+             std::memcmp(at, _text.data() + name.begin, name.size) == 0));
+    at = expect(afterWhite(at + name.size), '>');
+    endElement(at);
+    return at;
 }
 
-inline void XMLScanner::endElement() {
-    XMLIndexEntry& element = _entries[_open.back().number];
-    element.end = offset(_at);
-    element.next = static_cast<std::uint32_t>(_entries.size());
+inline void XMLScanner::endElement(Place end) {
+    XMLIndexEntry& element = _first[_open.back().number];
+    element.end = offset(end);
+    element.next = entryCount();
     element.setIf(_open.back().keepsLayout, XMLIndexEntry::keepsLayout);
     _open.pop_back();
 }
 
-inline void XMLScanner::scanBlanks(bool& hasLineEnd) {
-    for (; is(*_at, whiteByte); ++_at) {
-        if (*_at == '\n')
-            hasLineEnd = true;
-        else if (*_at == '\r')
-            hasLineEnd = _needsWork = true;
+// Up to where there are no more blanks, and whether there was a line end among them.
+inline std::pair<XMLScanner::Place, bool> XMLScanner::scanBlanks(Place at) {
+    bool hasLineEnd = false;
+    while (true) {
+        const Place begin = at;
+        at = endOfRun<blankByte>(at, _end);
+        hasLineEnd = hasLineEnd || *begin == '\n' || std::find(begin, at, '\n') != at;
+        if (*at != '\r')
+            return {at, hasLineEnd};
+        hasLineEnd = _needsWork = true;
+        ++at;
     }
 }
 
 // One text, up to the next markup that is no CDATA.
-void XMLScanner::scanText() {
-    const char* const begin = _at;
+inline XMLScanner::Place XMLScanner::scanText(Place at) {
+    const Place begin = at;
     _needsWork = false;
-    bool hasLineEnd = false;
-    scanBlanks(hasLineEnd);
-    bool isBlank = hasLineEnd && *_at == '<';
+    bool isBlank = false;
+    if (is(*at, whiteByte)) {
+        std::tie(at, isBlank) = scanBlanks(at);
+        isBlank = isBlank && *at == '<';
+    }
     while (true) {
-        skip(_at, textByte);
-        if (*_at == '<') {
-            if (!startsWith("<![CDATA["))
+        if (*at != '<')
+            at = endOfRun<textByte>(at, _end);
+        if (*at == '<') {
+            if (at[1] != '!' || !startsWith(at, "<![CDATA["))
                 break;
-            const bool isAlone = begin == _at;
-            const bool isEmpty = scanCData();
-            if (isAlone && isEmpty)
-                return; // what follows is a text of its own
+            const Place inside = std::exchange(at, scanCData(at));
+            if (inside == begin && at - inside == emptyCData)
+                return at; // what follows is a text of its own
             isBlank = false;
-        } else if (*_at == '&') {
-            scanReference();
-        } else if (*_at == ']') {
-            require(!startsWith("]]>"));
-            ++_at;
-        } else if (*_at == '\r') {
+        } else if (*at == '&') {
+            at = scanReference(at);
+        } else if (*at == ']') {
+            require(!startsWith(at, "]]>"));
+            ++at;
+        } else if (*at == '\r') {
             _needsWork = true;
-            ++_at;
+            ++at;
         } else {
-            scanBeyondASCII();
+            at = scanBeyondASCII(at);
         }
     }
-    XMLIndexEntry& entry = add(XMLNodeKind::text, begin, 0);
-    entry.setIf(isBlank, XMLIndexEntry::isBlank);
+    addLeaf(XMLNodeKind::text, 0, begin, at).setIf(isBlank, XMLIndexEntry::isBlank);
     _open.back().keepsLayout |= !isBlank;
-    finish(entry, _at);
+    return at;
 }
 
-// The characters up to the closing mark, and behind it.
-void XMLScanner::scanUpTo(std::string_view closing) {
+// Behind the closing mark.
+XMLScanner::Place XMLScanner::scanBehind(std::string_view closing, Place at) {
     while (true) {
-        skip(_at, markupByte);
-        if (*_at == closing.front() && startsWith(closing))
-            break;
-        if (*_at == '\r')
+        at = endOfRun<markupByte>(at, _end);
+        if (*at == closing.front() && startsWith(at, closing))
+            return at + closing.size();
+        if (*at == '\r')
             _needsWork = true;
-        if (is(*_at, textByte | attributeByte) || *_at == '\r')
-            ++_at;
+        if (is(*at, textByte | attributeByte) || *at == '\r')
+            ++at;
         else
-            scanBeyondASCII();
+            at = scanBeyondASCII(at);
     }
-    _at += closing.size();
 }
 
-// Whether it is empty.
-bool XMLScanner::scanCData() {
+XMLScanner::Place XMLScanner::scanCData(Place at) {
     _needsWork = true;
-    _at += 9;
-    const char* const begin = _at;
-    scanUpTo("]]>");
-    return _at - begin == 3;
+    return scanBehind("]]>", at + 9);
 }
 
-void XMLScanner::scanComment() {
-    const char* const begin = _at;
+XMLScanner::Place XMLScanner::scanComment(Place at) {
+    const Place begin = at;
     _needsWork = false;
-    _at += 4;
-    scanUpTo("--");
-    expect('>');
-    finish(add(XMLNodeKind::comment, begin, 0), _at);
+    at = expect(scanBehind("--", at + 4), '>');
+    addLeaf(XMLNodeKind::comment, 0, begin, at);
+    return at;
 }
 
-void XMLScanner::scanInstruction() {
-    const char* const begin = _at;
+XMLScanner::Place XMLScanner::scanInstruction(Place at) {
+    const Place begin = at;
     _needsWork = false;
-    _at += 2;
-    const char* const target = _at;
-    const Number name = scanName();
-    const std::string_view text(target, static_cast<std::size_t>(_at - target));
+    at += 2;
+    const Place target = at;
+    const Number name = scanNameByBytes(at).number;
+    const std::string_view text(target, static_cast<std::size_t>(at - target));
     require(text.find(':') == std::string_view::npos);
     require(text.size() != 3 || (text[0] | 0x20) != 'x' || (text[1] | 0x20) != 'm' ||
             (text[2] | 0x20) != 'l');
-    require(startsWith("?>") || is(*_at, whiteByte));
-    scanUpTo("?>");
-    finish(add(XMLNodeKind::processingInstruction, begin, name), _at);
+    require(startsWith(at, "?>") || is(*at, whiteByte));
+    at = scanBehind("?>", at);
+    addLeaf(XMLNodeKind::processingInstruction, name, begin, at);
+    return at;
 }
 
-void XMLScanner::scanReference() {
+XMLScanner::Place XMLScanner::scanReference(Place at) {
     _needsWork = true;
-    ++_at;
-    if (*_at == '#')
-        return scanCharacterReference();
-    for (const std::string_view name : {"lt;", "gt;", "amp;", "quot;", "apos;"}) {
-        if (startsWith(name)) {
-            _at += name.size();
-            return;
-        }
-    }
+    ++at;
+    if (*at == '#')
+        return scanCharacterReference(at);
+    for (const std::string_view name : {"lt;", "gt;", "amp;", "quot;", "apos;"})
+        if (startsWith(at, name))
+            return at + name.size();
     throw Refused();
 }
 
-void XMLScanner::scanCharacterReference() {
-    ++_at;
-    const bool isHexadecimal = *_at == 'x';
+XMLScanner::Place XMLScanner::scanCharacterReference(Place at) {
+    ++at;
+    const bool isHexadecimal = *at == 'x';
     if (isHexadecimal)
-        ++_at;
+        ++at;
     const char32_t base = isHexadecimal ? 16 : 10;
     char32_t c = 0;
-    const char* const digits = _at;
-    for (; *_at != ';'; ++_at) {
+    const Place digits = at;
+    for (; *at != ';'; ++at) {
         char32_t digit = base;
-        if (*_at >= '0' && *_at <= '9')
-            digit = static_cast<char32_t>(*_at - '0');
-        else if ((*_at | 0x20) >= 'a' && (*_at | 0x20) <= 'f')
-            digit = static_cast<char32_t>((*_at | 0x20) - 'a' + 10);
+        if (*at >= '0' && *at <= '9')
+            digit = static_cast<char32_t>(*at - '0');
+        else if ((*at | 0x20) >= 'a' && (*at | 0x20) <= 'f')
+            digit = static_cast<char32_t>((*at | 0x20) - 'a' + 10);
         require(digit < base && c <= 0x10FFFF);
         c = c * base + digit;
     }
-    require(_at != digits && isXMLCharacter(c));
-    ++_at;
+    require(at != digits && isXMLCharacter(c));
+    return at + 1;
 }
 
 // One character beyond ASCII; anything else that no loop takes is a fault.
-void XMLScanner::scanBeyondASCII() {
-    require(static_cast<unsigned char>(*_at) >= 0x80);
+XMLScanner::Place XMLScanner::scanBeyondASCII(Place at) {
+    require(static_cast<unsigned char>(*at) >= 0x80);
     std::size_t position = 0;
     const char32_t c = decodeCharacter(
-        {_at, std::min<std::size_t>(4, static_cast<std::size_t>(_end - _at))}, position);
+        {at, std::min<std::size_t>(4, static_cast<std::size_t>(_end - at))}, position);
     require(isXMLCharacter(c));
-    _at += position;
+    return at + position;
 }
 
-XMLScanner::Number XMLScanner::scanName() {
-    const char* const begin = _at;
-    skip(_at, nameByte);
-    require(_at != begin);
-    return _names.numberOf(begin, static_cast<std::size_t>(_at - begin));
+inline XMLScanner::Name& XMLScanner::scanName(Place& at) {
+    ShortName bytes;
+    const std::size_t size = ShortName::read(at, _end, bytes);
+    if (size == 0) [[unlikely]]
+        return scanNameByBytes(at);
+    at += size;
+    return _names.find(at - size, size, bytes);
+}
+
+XMLScanner::Name& XMLScanner::scanNameByBytes(Place& at) {
+    const Place begin = at;
+    while (is(*at, nameByte))
+        ++at;
+    require(at != begin);
+    return _names.find(begin, static_cast<std::size_t>(at - begin));
 }
 
 } // namespace qx

@@ -40,59 +40,64 @@ private:
 
     XMLScanner(XMLIndex& index, const XMLParseOptions& options);
 
+    // Each is given the place where it begins, which is there, and answers where it ends.
+    using Place = const char*;
     void scanDocument();
-    void scanDeclaration();
-    void scanMisc();
-    void scanRoot();
-    void scanElementStart();
-    void scanAttributes();
-    void scanAttribute();
+    Place scanDeclaration(Place at);
+    Place scanMisc(Place at);
+    Place scanRoot(Place at);
+    Place scanElementStart(Place at);
+    Place scanAttributes(Place at);
+    Place scanAttribute(Place at);
+    Place scanEndTag(Place at);
+    Place scanText(Place at);
+    std::pair<Place, bool> scanBlanks(Place at);
+    Place scanMarkup(Place at);
+    Place scanCData(Place at);
+    Place scanComment(Place at);
+    Place scanInstruction(Place at);
+    Place scanBehind(std::string_view closing, Place at);
+    Place scanReference(Place at);
+    Place scanCharacterReference(Place at);
+    Place scanBeyondASCII(Place at);
+    // These move the place.
+    Name& scanName(Place& at);
+    Name& scanNameByBytes(Place& at);
+
     void takeMeaning(XMLIndexEntry& entry, const Name& name);
     void takeDeclaration(XMLIndexEntry& entry, const Name& name);
-    void scanEndTag();
-    void endElement();
-    void scanText();
-    void scanBlanks(bool& hasLineEnd);
-    void scanUpTo(std::string_view closing);
-    bool scanCData();
-    void scanMarkup();
-    void scanComment();
-    void scanInstruction();
-    void scanReference();
-    void scanCharacterReference();
-    void scanBeyondASCII();
+    void endElement(Place end);
 
-    Number scanName();
-
-    XMLIndexEntry& add(XMLNodeKind kind, const char* begin, Number name);
-    void makeRoom();
-    void finish(XMLIndexEntry& entry, const char* end);
-    std::uint32_t offset(const char* at) const noexcept {
+    XMLIndexEntry& add(const XMLIndexEntry& entry);
+    XMLIndexEntry& addLeaf(XMLNodeKind kind, Number name, Place begin, Place end);
+    Number entryCount() const noexcept { return static_cast<Number>(_next - _first); }
+    void makeRoom(std::size_t entries);
+    void makeMoreRoom(std::uint32_t place);
+    std::uint32_t offset(Place at) const noexcept {
         return static_cast<std::uint32_t>(at - _text.data());
     }
-    bool startsWith(std::string_view markup) const noexcept {
-        return static_cast<std::size_t>(_end - _at) >= markup.size() &&
-               std::string_view(_at, markup.size()) == markup;
+    bool startsWith(Place at, std::string_view markup) const noexcept {
+        return static_cast<std::size_t>(_end - at) >= markup.size() &&
+               std::string_view(at, markup.size()) == markup;
     }
     void require(bool condition) const {
         if (!condition) [[unlikely]]
             throw Refused();
     }
-    void expect(char c) {
-        require(*_at == c);
-        ++_at;
+    Place expect(Place at, char c) const {
+        require(*at == c);
+        return at + 1;
     }
-    // Whether any was there.
-    bool skipWhite() noexcept;
 
     const std::string_view _text;
-    const char* _at;
     const char* const _end; // a zero byte stands there
     const std::size_t _maximumDepth;
     const std::size_t _maximumSize;
     const bool _keepsWhiteSpace;
     XMLIndex& _index;
-    std::vector<XMLIndexEntry>& _entries;
+    XMLIndexEntry* _first = nullptr;
+    XMLIndexEntry* _next = nullptr;
+    XMLIndexEntry* _last = nullptr;
     std::vector<Open> _open;
     ScannedNames _names;
     std::uint32_t _element = 0; // counts the start tags

@@ -21,13 +21,13 @@
 // objects. NaN comes before the other numbers, and no object before another.
 
 #include <QXXMLMarshalling/base/String.h>
+#include <QXXMLMarshalling/detail/ValueCell.h>
 #include <QXXMLMarshalling/model/Object.h>
 
 #include <array>
 #include <compare>
 #include <concepts>
 #include <cstdint>
-#include <cstring>
 #include <optional>
 #include <string_view>
 #include <typeinfo>
@@ -47,57 +47,38 @@ class LentText;
 
 class QX_API Value {
 public:
-    enum class Kind : std::uint8_t { null, boolean, integer, real, string, object };
+    using Kind = ValueKind;
 
     Value() noexcept = default;
     Value(std::nullptr_t) noexcept {}
-    Value(std::same_as<bool> auto value) noexcept : _cell(Kind::boolean) {
-        _cell.word.boolean = value;
-    }
+    Value(std::same_as<bool> auto value) noexcept : _cell(static_cast<bool>(value)) {}
     // Unsigned values above the signed 64-bit range become the nearest double.
     template <std::integral Integer>
     requires(!std::same_as<Integer, bool>) Value(Integer value)
-    noexcept : _cell(Kind::integer) {
-        if constexpr (std::unsigned_integral<Integer> && sizeof(Integer) == 8) {
-            if (value > static_cast<Integer>(INT64_MAX)) {
-                _cell.word.kind = Kind::real;
-                _cell.word.real = static_cast<double>(value);
-                return;
-            }
-        }
-        _cell.word.integer = static_cast<std::int64_t>(value);
-    }
-    Value(std::floating_point auto value) noexcept : _cell(Kind::real) {
-        _cell.word.real = static_cast<double>(value);
-    }
+    noexcept : _cell(cellOf(value)) {}
+    Value(std::floating_point auto value) noexcept : _cell(static_cast<double>(value)) {}
     // A null string gives a null value.
     Value(const String& text) noexcept : Value(String(text)) {}
     Value(String&& text) noexcept;
     // A null pointer gives a null value.
     Value(const char* text) : Value(text != nullptr ? Value(std::string_view(text)) : Value()) {}
-    Value(std::string_view text) {
-        if (text.size() <= mostInside)
-            _cell = Cell(text);
-        else
-            *this = Value(String(text));
-    }
+    Value(std::string_view text)
+        : _cell(text.size() <= Cell::mostInside ? Cell::inside(text) : counted(text)) {}
     Value(const std::string& text) : Value(std::string_view(text)) {}
     // A null reference gives a null value.
     template <std::derived_from<Object> T>
     Value(const Ref<T>& object) noexcept : Value(object.get()) {}
     template <std::derived_from<Object> T>
-    Value(Ref<T>&& object) noexcept : _cell(object ? Kind::object : Kind::null) {
-        _cell.word.object = object.detach();
-    }
+    Value(Ref<T>&& object) noexcept : _cell(static_cast<const Object*>(object.detach())) {}
     Value(const Object* object) noexcept;
 
     Value(const Value& other) : _cell(other._cell) {
         if (other.kind() >= Kind::string)
             share(other);
     }
-    Value(Value&& other) noexcept : _cell(std::exchange(other._cell, Cell(Kind::null))) {}
+    Value(Value&& other) noexcept : _cell(std::exchange(other._cell, Cell())) {}
     ~Value() {
-        if (kind() >= Kind::string && _cell.word.form == Form::counted)
+        if (kind() >= Kind::string && _cell.form() == Form::counted)
             releaseCounted();
     }
     Value& operator=(Value other) noexcept {
@@ -105,7 +86,7 @@ public:
         return *this;
     }
 
-    Kind kind() const noexcept { return _cell.word.kind; }
+    Kind kind() const noexcept { return _cell.kind(); }
     bool isNull() const noexcept { return kind() == Kind::null; }
     // True for booleans, integers and doubles.
     bool isNumber() const noexcept { return kind() >= Kind::boolean && kind() <= Kind::real; }
@@ -121,7 +102,7 @@ public:
     std::string_view view() const noexcept {
         return isString() ? viewOfText() : std::string_view();
     }
-    Object* object() const noexcept { return isObject() ? _cell.word.object : nullptr; }
+    Object* object() const noexcept { return isObject() ? _cell.object() : nullptr; }
     // The object as class T, or null where the value is no object of that class.
     template <class T>
     Ref<T> as() const noexcept {
@@ -168,60 +149,27 @@ public:
 private:
     friend class detail::LentText;
 
-    //     word   | kind | form |      | size  | number, text or object, 8 bytes |
-    //     text   | kind | size | up to 14 bytes                                 |
-    //
-    // Of a string and an object: a count is held of what `word` points to; nothing is, and the
-    // text's bytes are somebody else's; beyond, the bytes lie in the value, and `form` is `inside`
-    // and how many they are.
-    enum class Form : std::uint8_t { counted, lent, inside };
-    static constexpr std::size_t mostInside = 14;
-    struct Word {
-        Kind kind;
-        Form form;
-        std::uint32_t size; // of a lent text
-        union {
-            bool boolean;
-            std::int64_t integer;
-            double real;
-            detail::StringRep* text;
-            const char* lent;
-            Object* object;
-        };
-    };
-    struct ShortText {
-        Kind kind;
-        Form form;
-        char bytes[mostInside];
-    };
-    union Cell {
-        Word word;
-        ShortText text; // kind and form may be read by either name
+    using Cell = detail::ValueCell;
+    using Form = Cell::Form;
 
-        explicit Cell(Kind kind) noexcept : word{kind, Form::counted, 0, {.integer = 0}} {}
-        explicit Cell(std::string_view inside) noexcept
-            : text{Kind::string, formOf(inside.size()), {}} {
-            if (!inside.empty())
-                std::memcpy(text.bytes, inside.data(), inside.size());
-        }
-    };
-    static Form formOf(std::size_t size) noexcept {
-        return static_cast<Form>(static_cast<std::size_t>(Form::inside) + size);
+    explicit Value(Cell cell) noexcept : _cell(cell) {}
+    template <std::integral Integer>
+    static Cell cellOf(Integer value) noexcept {
+        if constexpr (std::unsigned_integral<Integer> && sizeof(Integer) == 8)
+            if (value > static_cast<Integer>(INT64_MAX))
+                return Cell(static_cast<double>(value));
+        return Cell(static_cast<std::int64_t>(value));
     }
+    static Cell counted(std::string_view text);
 
     std::string_view viewOfText() const noexcept {
-        if (_cell.word.form == Form::counted)
-            return _cell.word.text->view();
-        if (_cell.word.form == Form::lent)
-            return {_cell.word.lent, _cell.word.size};
-        return {_cell.text.bytes,
-                static_cast<std::size_t>(_cell.word.form) - static_cast<std::size_t>(Form::inside)};
+        return _cell.form() == Form::counted ? _cell.text()->view() : _cell.view();
     }
     void share(const Value& other);
     void releaseCounted() noexcept;
     std::weak_ordering compare(const Value& other) const noexcept;
 
-    Cell _cell{Kind::null};
+    Cell _cell;
 };
 static_assert(sizeof(Value) == 16);
 

@@ -1,0 +1,196 @@
+#pragma once
+
+// Where runs of bytes of one kind end, sixteen bytes at a time where the processor can look at as
+// many together. A zero byte stands at `end`, and is of no kind: every run ends there at the
+// latest.
+
+#include <array>
+#include <bit>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
+namespace qx {
+
+// What a byte may be part of. Bytes beyond ASCII count as parts of names: a name is looked at in
+// full when it is new.
+enum ByteKind : std::uint8_t {
+    whiteByte = 1,
+    nameByte = 2,
+    textByte = 4,      // plain in text
+    attributeByte = 8, // plain in an attribute's value
+    markupByte = 16,   // plain in comments, instructions and CDATA
+    blankByte = 32,    // white, and no carriage return
+};
+
+inline constexpr std::array<std::uint8_t, 256> byteKinds = [] {
+    std::array<std::uint8_t, 256> kinds{};
+    for (unsigned c = 0x20; c < 0x80; ++c)
+        kinds[c] = textByte | attributeByte | markupByte;
+    for (const unsigned char c : {' ', '\t', '\n', '\r'})
+        kinds[c] |= c == '\r' ? whiteByte : whiteByte | blankByte;
+    kinds['\t'] |= textByte | markupByte;
+    kinds['\n'] |= textByte | markupByte;
+    for (const unsigned char c : {'<', '&', ']'})
+        kinds[c] &= static_cast<std::uint8_t>(~textByte);
+    for (const unsigned char c : {'<', '&', '"', '\''})
+        kinds[c] &= static_cast<std::uint8_t>(~attributeByte);
+    for (const unsigned char c : {'-', '?', ']'})
+        kinds[c] &= static_cast<std::uint8_t>(~markupByte);
+    for (unsigned c = 'a'; c <= 'z'; ++c)
+        kinds[c] |= nameByte;
+    for (unsigned c = 'A'; c <= 'Z'; ++c)
+        kinds[c] |= nameByte;
+    for (unsigned c = '0'; c <= '9'; ++c)
+        kinds[c] |= nameByte;
+    for (const unsigned char c : {'-', '.', '_', ':'})
+        kinds[c] |= nameByte;
+    for (unsigned c = 0x80; c < 0x100; ++c)
+        kinds[c] = nameByte;
+    return kinds;
+}();
+
+inline bool is(char c, std::uint8_t kinds) noexcept {
+    return (byteKinds[static_cast<unsigned char>(c)] & kinds) != 0;
+}
+
+#if defined(__SSE2__)
+
+// Sixteen bytes.
+class ByteBlock {
+public:
+    static constexpr std::size_t size = 16;
+
+    static bool fits(const char* at, const char* end) noexcept {
+        return end - at >= static_cast<std::ptrdiff_t>(size);
+    }
+    explicit ByteBlock(const char* at) noexcept
+        : _bytes(_mm_loadu_si128(reinterpret_cast<const __m128i*>(at))) {}
+
+    // How many bytes from the first on are of the kind, or fewer, where the next one may be, too.
+    template <ByteKind kind>
+    std::size_t run() const noexcept {
+        return firstIn(stops<kind>());
+    }
+    // How many come before what ends a name: a blank or a control character, "/", "=" or ">".
+    std::size_t untilNameEnds() const noexcept {
+        return firstIn(_mm_or_si128(
+            _mm_or_si128(equal('/'), equal('=')),
+            _mm_or_si128(equal('>'),
+                         _mm_cmpeq_epi8(_mm_min_epu8(_bytes, _mm_set1_epi8(' ')), _bytes))));
+    }
+    // The first bytes, zeros behind them.
+    ByteBlock first(std::size_t count) const noexcept {
+        static constexpr std::array<std::uint8_t, 2 * size> ones = [] {
+            std::array<std::uint8_t, 2 * size> bytes{};
+            for (std::size_t i = 0; i < size; ++i)
+                bytes[i] = 0xFF;
+            return bytes;
+        }();
+        return ByteBlock(_mm_and_si128(
+            _bytes, _mm_loadu_si128(reinterpret_cast<const __m128i*>(&ones[size - count]))));
+    }
+    std::uint64_t lowerWord() const noexcept {
+        return static_cast<std::uint64_t>(_mm_cvtsi128_si64(_bytes));
+    }
+    std::uint64_t upperWord() const noexcept {
+        return static_cast<std::uint64_t>(_mm_cvtsi128_si64(_mm_unpackhi_epi64(_bytes, _bytes)));
+    }
+
+private:
+    explicit ByteBlock(__m128i bytes) noexcept : _bytes(bytes) {}
+
+    __m128i equal(char c) const noexcept { return _mm_cmpeq_epi8(_bytes, _mm_set1_epi8(c)); }
+    template <ByteKind kind>
+    __m128i stops() const noexcept {
+        // Control characters, and what is beyond ASCII, whose sign it is.
+        const __m128i unusual = _mm_cmplt_epi8(_bytes, _mm_set1_epi8(' '));
+        const auto any = [&](char a, char b, char c) {
+            return _mm_or_si128(_mm_or_si128(unusual, equal(a)), _mm_or_si128(equal(b), equal(c)));
+        };
+        if constexpr (kind == textByte)
+            return any('<', '&', ']');
+        else if constexpr (kind == attributeByte)
+            return _mm_or_si128(any('<', '&', '"'), equal('\''));
+        else if constexpr (kind == markupByte)
+            return any('-', '?', ']');
+        else if constexpr (kind == blankByte)
+            return _mm_andnot_si128(
+                _mm_or_si128(equal(' '), _mm_or_si128(equal('\n'), equal('\t'))),
+                _mm_set1_epi8(-1));
+    }
+    static std::size_t firstIn(__m128i marks) noexcept {
+        const auto mask = static_cast<std::uint32_t>(_mm_movemask_epi8(marks));
+        return static_cast<std::size_t>(std::countr_zero(mask | 1U << size));
+    }
+
+    __m128i _bytes;
+};
+
+#endif
+
+template <ByteKind kind>
+const char* endOfRun(const char* at, [[maybe_unused]] const char* end) noexcept {
+    while (true) {
+#if defined(__SSE2__)
+        if (ByteBlock::fits(at, end)) {
+            const std::size_t run = ByteBlock(at).run<kind>();
+            at += run;
+            if (run == ByteBlock::size)
+                continue;
+        }
+#endif
+        if (!is(*at, kind))
+            return at;
+        ++at;
+    }
+}
+
+// A name of at most 15 bytes as two words, zeros behind it.
+struct ShortName {
+    static constexpr std::size_t longest = 15;
+
+    std::uint64_t lower = 0;
+    std::uint64_t upper = 0;
+    bool operator==(const ShortName&) const = default;
+
+    static ShortName of(const char* begin, std::size_t size) noexcept {
+        std::array<std::uint64_t, 2> words{};
+        std::memcpy(words.data(), begin, size);
+        return {words[0], words[1]};
+    }
+    // How long the name is that begins there, which is not looked at closely; 0 where none does, or
+    // none that is short, or it stands near the end.
+    static std::size_t read([[maybe_unused]] const char* at, [[maybe_unused]] const char* end,
+                            [[maybe_unused]] ShortName& name) noexcept {
+#if defined(__SSE2__)
+        if (ByteBlock::fits(at, end)) {
+            const ByteBlock block(at);
+            const std::size_t size = block.untilNameEnds();
+            if (size <= longest) {
+                const ByteBlock bytes = block.first(size);
+                name = {bytes.lowerWord(), bytes.upperWord()};
+                return size;
+            }
+        }
+#endif
+        return 0;
+    }
+    // Whether it begins there; false also near the end.
+    bool standsAt([[maybe_unused]] const char* at, [[maybe_unused]] const char* end,
+                  [[maybe_unused]] std::size_t size) const noexcept {
+#if defined(__SSE2__)
+        if (ByteBlock::fits(at, end)) {
+            const ByteBlock bytes = ByteBlock(at).first(size);
+            return ((bytes.lowerWord() ^ lower) | (bytes.upperWord() ^ upper)) == 0;
+        }
+#endif
+        return false;
+    }
+};
+
+} // namespace qx
