@@ -1,5 +1,6 @@
 #include "files/Files.h"
 
+#include "base/BulkArray.h"
 #include "files/Descriptor.h"
 #include "files/Paths.h"
 #include "files/SystemErrors.h"
@@ -20,6 +21,8 @@ namespace {
 int readToEnd(int descriptor, std::size_t expected, std::size_t limit, std::string& bytes) {
     constexpr std::size_t smallestGrowth = 64 * 1024;
     std::size_t filled = 0;
+    bytes.reserve(expected + 1);
+    askForLargePages(bytes.data(), bytes.capacity());
     bytes.resize(expected + 1);
     while (true) {
         if (filled > limit)

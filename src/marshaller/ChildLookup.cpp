@@ -10,15 +10,16 @@ constexpr std::size_t scanLimit = 256;
 } // namespace
 
 ChildLookup::ChildLookup(IndexedXML& document, Number element, Nodes nodes, std::size_t lookups)
-    : _document(document), _element(element), _nodes(nodes), _lookups(lookups) {
-    document.forEachChild(element, [&](Number child) {
+    : _document(document), _element(element), _attributes(document.attributesOf(element)),
+      _nodes(nodes), _lookups(lookups) {
+    document.forEachChildFrom(_attributes.end, element, [&](Number child) {
         add(document.isElement(child) ? identity(document.name(child)) : nullptr, child);
     });
 }
 
 ChildLookup::ChildLookup(const ChildLookup& other, Nodes nodes)
-    : _document(other._document), _element(other._element), _nodes(nodes), _isCopy(true),
-      _isWhole(other._isWhole), _lookups(other._lookups) {
+    : _document(other._document), _element(other._element), _attributes(other._attributes),
+      _nodes(nodes), _isCopy(true), _isWhole(other._isWhole), _lookups(other._lookups) {
     for (const Child& child : other.children())
         if (child.number != none)
             add(child.name, child.number);

@@ -38,6 +38,19 @@ public:
     const String& elementName() const noexcept { return _document.writtenName(_element); }
     Nodes nodes() const noexcept { return _nodes; }
     bool isCopy() const noexcept { return _isCopy; }
+    // Whether namespaces are declared on it.
+    bool hasDeclarations() const noexcept { return _attributes.haveDeclarations; }
+    // Calls visit(Number) for each of its attributes.
+    template <class Visit>
+    void forEachAttribute(Visit visit) const {
+        for (Number at = _attributes.begin; at < _attributes.end; ++at)
+            if (_document.kind(at) == XMLNodeKind::attribute)
+                visit(at);
+    }
+    // Its attribute of that name, which is interned; none where there is none.
+    Number attribute(const String& name) const {
+        return _document.attribute(_element, _attributes, name);
+    }
     // How many children the element has.
     std::size_t childCount() const noexcept { return children().size(); }
     // Says that another object will look that many names up, too.
@@ -109,6 +122,7 @@ private:
 
     IndexedXML& _document;
     const Number _element;
+    const IndexedXML::Attributes _attributes;
     const Nodes _nodes;
     const bool _isCopy = false;
     bool _isWhole = true; // no child was taken

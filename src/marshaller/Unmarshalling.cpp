@@ -196,8 +196,19 @@ bool Unmarshalling::readFields(const ClassPlan& plan, const Target& target, Erro
     return passOver(error);
 }
 
+Value Unmarshalling::textOf(Number element, ErrorSlot error) {
+    const Number only = _document.onlyText(element);
+    if (only != none)
+        return _document.value(only);
+    return _budget.takeText(element, error) ? _document.text(element) : Value();
+}
+
 bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
     const Number element = target.source.element();
+    const bool hasWrapper =
+        _frame != nullptr && _frame->wrapper != none && _frame->element == element;
+    if (!target.source.hasDeclarations() && !hasWrapper)
+        return true;
     Ref<Array> kept;
     bool fits = true;
     const auto keep = [&](Number declaration, Number holder) {
@@ -213,7 +224,7 @@ bool Unmarshalling::keepNamespaces(const Target& target, ErrorSlot error) {
     };
     _document.forEachOfKind(XMLNodeKind::namespaceDeclaration, element,
                             [&](Number declaration) { keep(declaration, element); });
-    if (_frame != nullptr && _frame->wrapper != none && _frame->element == element)
+    if (hasWrapper)
         for (const Number declaration : declarationsAround(element))
             keep(declaration, _frame->wrapper);
     if (!kept || !fits)

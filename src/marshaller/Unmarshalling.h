@@ -88,6 +88,8 @@ public:
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
+    // The text inside an element, put together; null with -224 where that is too much.
+    Value textOf(Number element, ErrorSlot error);
     IndexedXML& document() noexcept { return _document; }
     // Null where nobody wants one.
     ReadingTrace* trace() const noexcept { return _trace; }

@@ -23,7 +23,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
                             reading.quoted(source.element()));
             holder = found.first;
         }
-        const auto attribute = holder != Unmarshalling::none
+        const auto attribute = holder == source.element() ? source.attribute(binding.name)
+                               : holder != Unmarshalling::none
                                    ? reading.document().attribute(holder, binding.name)
                                    : Unmarshalling::none;
         if (attribute == Unmarshalling::none)

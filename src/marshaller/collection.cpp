@@ -160,9 +160,9 @@ Value readText(Unmarshalling& reading, const FieldPlan& field, const Target& tar
                Unmarshalling::Number node, Ref<Error>* error) {
     if (reading.reports().isOn())
         reading.reports().tellInside(reading.document(), node, &target.object);
-    if (!reading.budget().takeVisits(1, node, error) || !reading.budget().takeText(node, error))
-        return nullptr;
-    return itemOf(field, reading.document().text(node), error);
+    const Value text =
+        reading.budget().takeVisits(1, node, error) ? reading.textOf(node, error) : Value();
+    return text.isNull() ? Value() : itemOf(field, text, error);
 }
 
 } // namespace

@@ -37,7 +37,7 @@ Value valueOf(Unmarshalling& reading, const FieldPlan& field, const Unmarshallin
         return reading.build(*plan, child, target.source.nodes(), error);
     if (reading.reports().isOn())
         reading.reports().tellInside(reading.document(), child, &target.object);
-    return reading.budget().takeText(child, error) ? reading.document().text(child) : Value();
+    return reading.textOf(child, error);
 }
 
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,

@@ -160,7 +160,7 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     const Number element = target.source.element();
     Unknown unknown(target.bound.attributes);
     std::size_t seen = 0;
-    _document.forEachOfKind(XMLNodeKind::attribute, element, [&](Number attribute) {
+    target.source.forEachAttribute([&](Number attribute) {
         unknown.see(_document, attribute);
         ++seen;
     });
@@ -194,7 +194,7 @@ bool Unmarshalling::keepAttributes(const Target& target, const CountedSet& names
         if (_trace != nullptr)
             _trace->keep(ReadingTrace::Form::keptAttribute, attribute);
     };
-    _document.forEachOfKind(XMLNodeKind::attribute, target.source.element(), keep);
+    target.source.forEachAttribute(keep);
     return fits && _access.setKept(target.object, KeptXML::attributes, kept, error);
 }
 

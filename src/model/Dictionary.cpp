@@ -82,7 +82,7 @@ void Dictionary::set(const String& key, Value value) {
 bool Dictionary::add(const String& key, Value&& value) {
     refuseNull(key, value);
     const std::size_t position = positionOf(key);
-    if (position == nameindex::none) {
+    if (position == nameindex::none) [[likely]] {
         changed();
         append(key, std::move(value));
         return true;
@@ -97,13 +97,13 @@ bool Dictionary::add(const String& key, Value&& value) {
 constexpr std::size_t usualSize = 4;
 
 inline void Dictionary::append(const String& key, Value&& value) {
-    if (_index ? nameindex::isFull(*_index, _entries.size())
-               : _entries.size() >= nameindex::scanLimit)
+    const std::size_t size = _entries.size();
+    if (_index ? nameindex::isFull(*_index, size) : size >= nameindex::scanLimit)
         makeRoom();
-    if (_entries.empty())
+    if (size == 0)
         _entries.reserve(usualSize);
     _entries.emplace_back(key, std::move(value));
-    if (_index)
+    if (_index) [[unlikely]]
         nameindex::add(*_index, key, _entries.size() - 1);
     ++_count;
 }

@@ -16,12 +16,9 @@ bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) 
     return contents(record)->add(key.string(), std::move(value));
 }
 
-const Ref<Dictionary>& RecordFilling::contents(QXGenericRecord& record) {
-    if (!record._contents) {
-        record._contents = make<Dictionary>();
-        record._isCacheBehind = record.tracking().isIdle();
-    }
-    return record._contents;
+void RecordFilling::makeContents(QXGenericRecord& record) {
+    record._contents = make<Dictionary>();
+    record._isCacheBehind = record.tracking().isIdle();
 }
 
 void RecordFilling::completeCache(const QXGenericRecord& record, Dictionary& cache) {

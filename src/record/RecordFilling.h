@@ -32,9 +32,16 @@ public:
     // The same for a key that is known to be no property of the record.
     static bool addContent(QXGenericRecord& record, Key key, Value&& value);
     // Made when there are none.
-    static const Ref<Dictionary>& contents(QXGenericRecord& record);
+    static const Ref<Dictionary>& contents(QXGenericRecord& record) {
+        if (!record._contents) [[unlikely]]
+            makeContents(record);
+        return record._contents;
+    }
     // Gives the change cache the notes that it lacks.
     static void completeCache(const QXGenericRecord& record, Dictionary& cache);
+
+private:
+    static void makeContents(QXGenericRecord& record);
 };
 
 } // namespace qx::detail

@@ -25,6 +25,7 @@ enum ByteKind : std::uint8_t {
     attributeByte = 8, // plain in an attribute's value
     markupByte = 16,   // plain in comments, instructions and CDATA
     blankByte = 32,    // white, and no carriage return
+    tagByte = 64,      // no quote in a tag, and not where it begins or ends
 };
 
 inline constexpr std::array<std::uint8_t, 256> byteKinds = [] {
@@ -51,6 +52,8 @@ inline constexpr std::array<std::uint8_t, 256> byteKinds = [] {
         kinds[c] |= nameByte;
     for (unsigned c = 0x80; c < 0x100; ++c)
         kinds[c] = nameByte;
+    for (unsigned c = 1; c < 0x100; ++c)
+        kinds[c] |= c == '"' || c == '\'' || c == '<' || c == '>' ? 0 : tagByte;
     return kinds;
 }();
 
@@ -118,6 +121,9 @@ private:
             return _mm_or_si128(any('<', '&', '"'), equal('\''));
         else if constexpr (kind == markupByte)
             return any('-', '?', ']');
+        else if constexpr (kind == tagByte)
+            return _mm_or_si128(_mm_or_si128(equal('"'), equal('\'')),
+                                _mm_or_si128(_mm_or_si128(equal('<'), equal('>')), equal(0)));
         else if constexpr (kind == blankByte)
             return _mm_andnot_si128(
                 _mm_or_si128(equal(' '), _mm_or_si128(equal('\n'), equal('\t'))),

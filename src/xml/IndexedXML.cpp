@@ -152,15 +152,10 @@ bool IndexedXML::hasPlainText(Number element) {
 }
 
 Value IndexedXML::text(Number element) {
-    expand(element);
-    const Number first = index().firstChild(element);
-    const Number end = index().contentEnd(element);
-    if (first == end)
+    if (const Number only = onlyText(element); only != none)
+        return value(only);
+    if (index().firstChild(element) == index().contentEnd(element))
         return "";
-    const XMLIndexEntry& only = index()[first];
-    if (only.next == end && only.nodeKind() == XMLNodeKind::text &&
-        !XMLIndex::isLayout(only, index()[element]))
-        return value(first);
     if (const auto known = _longTexts.find(element); known != _longTexts.end())
         return known->second;
     _joined.clear();
@@ -197,21 +192,11 @@ void IndexedXML::appendText(Number element, std::string& text) {
     }
 }
 
-IndexedXML::Number IndexedXML::attribute(Number element, const String& name) {
-    constexpr Number mostScanned = 64;
-    expand(element);
-    const Number begin = index().content(element);
-    const Number end = index().firstChild(element);
-    const auto isAttribute = [this](Number at) { return kind(at) == XMLNodeKind::attribute; };
-    if (end - begin <= mostScanned) {
-        for (Number at = begin; at < end; ++at)
-            if (this->name(at).isSameAs(name) && isAttribute(at))
-                return at;
-        return none;
-    }
+IndexedXML::Number IndexedXML::attributeOfMany(Number element, const Attributes& all,
+                                               const String& name) {
     const auto [known, isNew] = _attributes.try_emplace(element);
-    for (Number at = begin; isNew && at < end; ++at)
-        if (isAttribute(at))
+    for (Number at = all.begin; isNew && at < all.end; ++at)
+        if (kind(at) == XMLNodeKind::attribute)
             known->second.try_emplace(this->name(at).view().data(), at);
     const auto found = known->second.find(name.view().data());
     return found != known->second.end() ? found->second : none;

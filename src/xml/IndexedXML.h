@@ -72,10 +72,7 @@ public:
     template <class Visit>
     void forEachChild(Number element, Visit visit) {
         expand(element);
-        const Number end = index().contentEnd(element);
-        for (Number at = index().firstChild(element); at < end; at = index().siblingOf(at))
-            if (!XMLIndex::isLayout(index()[at], index()[element]))
-                visit(at);
+        forEachChildFrom(index().firstChild(element), element, visit);
     }
     template <class Visit>
     void forEachOfKind(XMLNodeKind kind, Number element, Visit visit) {
@@ -83,6 +80,32 @@ public:
         const Number end = index().firstChild(element);
         for (Number at = index().content(element); at < end; ++at)
             if (index()[at].nodeKind() == kind)
+                visit(at);
+    }
+    // Where the attributes and declarations of an element stand.
+    struct Attributes {
+        Number begin = 0;
+        Number end = 0; // where the children begin
+        bool haveDeclarations = false;
+    };
+    Attributes attributesOf(Number element) {
+        expand(element);
+        Attributes all{index().content(element), index().content(element), false};
+        for (const Number end = index().contentEnd(element); all.end < end; ++all.end) {
+            const XMLNodeKind kind = this->kind(all.end);
+            if (kind != XMLNodeKind::attribute && kind != XMLNodeKind::namespaceDeclaration)
+                break;
+            all.haveDeclarations |= kind == XMLNodeKind::namespaceDeclaration;
+        }
+        return all;
+    }
+    // Calls visit(Number) for each child, which stand from there on.
+    template <class Visit>
+    void forEachChildFrom(Number first, Number element, Visit visit) const {
+        const XMLIndexEntry& parent = index()[element];
+        const Number end = index().contentEnd(element);
+        for (Number at = first; at < end; at = index().siblingOf(at))
+            if (!XMLIndex::isLayout(index()[at], parent))
                 visit(at);
     }
     // Calls visit(Number) for each element of that name that stands in no other of that name, until
@@ -102,8 +125,30 @@ public:
     Value value(Number number);
     // All text inside an element, concatenated. Likewise.
     Value text(Number element);
+    // The text that is all an element holds; none where it holds nothing or anything else.
+    Number onlyText(Number element) {
+        expand(element);
+        const Number first = index().firstChild(element);
+        const Number end = index().contentEnd(element);
+        const bool isIt = first != end && index().siblingOf(first) == end &&
+                          kind(first) == XMLNodeKind::text &&
+                          !XMLIndex::isLayout(index()[first], index()[element]);
+        return isIt ? first : none;
+    }
     // The attribute of that name, which is interned; none where there is none.
-    Number attribute(Number element, const String& name);
+    Number attribute(Number element, const String& name) {
+        return attribute(element, attributesOf(element), name);
+    }
+    // Likewise, of the element whose attributes these are.
+    Number attribute(Number element, const Attributes& all, const String& name) {
+        constexpr Number mostScanned = 64;
+        if (all.end - all.begin > mostScanned)
+            return attributeOfMany(element, all, name);
+        for (Number at = all.begin; at < all.end; ++at)
+            if (this->name(at).isSameAs(name) && kind(at) == XMLNodeKind::attribute)
+                return at;
+        return none;
+    }
     // Whether text() finds at most one text without going far.
     bool hasPlainText(Number element);
 
@@ -145,6 +190,7 @@ private:
     void findRoot() noexcept;
     void internNames();
     void appendText(Number element, std::string& text);
+    Number attributeOfMany(Number element, const Attributes& all, const String& name);
     NodePool& pool(Nodes nodes);
 
     std::optional<XMLDocumentContent::Reader> _reader;

@@ -23,13 +23,19 @@ std::size_t countCodePoints(const char* from, const char* to) noexcept {
     return count;
 }
 
-// Most lines begin with some, and most places are found behind them.
-const char* skipBlanks(const char* from, const char* to) noexcept {
-    while (to - from >= 8 && std::memcmp(from, "        ", 8) == 0)
-        from += 8;
-    while (from != to && *from == ' ')
-        ++from;
-    return from;
+std::size_t countLineEnds(const char* from, const char* to) noexcept {
+    std::size_t count = 0;
+    constexpr std::uint64_t lowBits = 0x0101010101010101U;
+    for (; to - from >= 8; from += 8) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, from, 8);
+        // A byte that is a line end becomes zero, which alone has no bit below the highest set,
+        // nor that one.
+        const std::uint64_t other = word ^ lowBits * '\n';
+        const std::uint64_t others = (((other & ~(lowBits << 7)) + (lowBits * 0x7F)) | other) >> 7;
+        count += 8 - static_cast<std::size_t>(((others & lowBits) * lowBits) >> 56);
+    }
+    return count + static_cast<std::size_t>(std::count(from, to, '\n'));
 }
 
 } // namespace
@@ -52,14 +58,12 @@ void TextPosition::advance(std::size_t offset) noexcept {
     const char* from = _text.data() + _at.offset;
     const char* const to = _text.data() + offset;
     _at.offset = offset;
-    while (from != to) {
-        const void* lineEnd = std::memchr(from, '\n', static_cast<std::size_t>(to - from));
-        if (lineEnd == nullptr)
-            break;
-        ++_at.line;
-        const char* const start = static_cast<const char*>(lineEnd) + 1;
-        from = skipBlanks(start, to);
-        _at.column = static_cast<std::size_t>(from - start) + 1;
+    if (const std::size_t lines = countLineEnds(from, to); lines != 0) {
+        _at.line += lines;
+        _at.column = 1;
+        from = to;
+        while (from[-1] != '\n')
+            --from;
     }
     _at.column += countCodePoints(from, to);
 }

@@ -1,8 +1,7 @@
 #include "xml/XMLSplitter.h"
 
 #include "base/WhiteSpace.h"
-
-#include <array>
+#include "xml/ByteRuns.h"
 
 namespace qx {
 
@@ -22,14 +21,6 @@ std::size_t endOf(std::string_view mark, std::string_view text, std::size_t from
     return at != std::string_view::npos ? at + mark.size() : at;
 }
 
-// What ends the plain run of bytes in a tag.
-constexpr std::array<bool, 256> tagMarks() {
-    std::array<bool, 256> marks{};
-    for (const unsigned char c : {'"', '\'', '<', '>'})
-        marks[c] = true;
-    return marks;
-}
-
 std::string_view localPart(std::string_view name) noexcept {
     return name.substr(name.find(':') + 1);
 }
@@ -46,8 +37,9 @@ bool XMLSplitter::isItemName(std::string_view name) const noexcept {
 
 void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
     _text = text;
-    while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext()) {
-    }
+    do
+        goOverInside();
+    while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext());
     _text = {};
 }
 
@@ -96,6 +88,43 @@ bool XMLSplitter::pass(End end) {
     if (_depth == 0)
         _cut = end;
     return true;
+}
+
+// The next byte from there on that may mean something in a tag; it may stand behind the text.
+inline std::size_t XMLSplitter::nextMark(std::size_t from) const noexcept {
+    const char* const begin = _text.data();
+    return static_cast<std::size_t>(endOfRun<tagByte>(begin + from, begin + _text.size()) - begin);
+}
+
+// The tags inside an item and the texts between them, as far as they are whole: most of a document.
+// What is something else, or ends an item, is looked at one by one.
+void XMLSplitter::goOverInside() {
+    if (_depth == 0 || _seen > _at)
+        return;
+    while (true) {
+        std::size_t at = _at;
+        while (at < _text.size() && _text[at] != '<')
+            at = nextMark(at + 1);
+        const char next = at + 1 < _text.size() ? _text[at + 1] : '!';
+        if (next == '!' || next == '?' || (next == '/' && _depth == 1))
+            return;
+        std::size_t end = nextMark(at + 1);
+        while (next != '/' && end < _text.size() && (_text[end] == '"' || _text[end] == '\'')) {
+            const char quote = _text[end];
+            do
+                end = nextMark(end + 1);
+            while (end < _text.size() && _text[end] != quote && _text[end] != '<');
+            if (end < _text.size() && _text[end] == quote)
+                end = nextMark(end + 1);
+        }
+        if (end >= _text.size() || _text[end] != '>')
+            return;
+        if (next == '/')
+            --_depth;
+        else
+            _depth += _text[end - 1] == '/' ? 0 : 1;
+        _at = end + 1;
+    }
 }
 
 bool XMLSplitter::goOverNext() {
@@ -174,11 +203,8 @@ bool XMLSplitter::goOverInstruction() {
 
 // Behind the ">" that no quotes hold. No "<" may come before.
 XMLSplitter::End XMLSplitter::endOfTag() {
-    static constexpr auto marks = tagMarks();
-    for (std::size_t at = resume(1); at < _text.size(); ++at) {
+    for (std::size_t at = nextMark(resume(1)); at < _text.size(); at = nextMark(at + 1)) {
         const char c = _text[at];
-        if (!marks[static_cast<unsigned char>(c)])
-            continue;
         if (c == '<') {
             fail();
             return none;
@@ -232,8 +258,10 @@ bool XMLSplitter::goOverStartTag() {
 }
 
 bool XMLSplitter::goOverEndTag() {
-    const std::size_t mark = _text.find_first_of("<>", resume(1));
-    if (mark == none)
+    std::size_t mark = nextMark(resume(1));
+    while (mark < _text.size() && _text[mark] != '<' && _text[mark] != '>')
+        mark = nextMark(mark + 1);
+    if (mark >= _text.size())
         return pass(none);
     if (_text[mark] == '<')
         return fail();

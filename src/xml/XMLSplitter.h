@@ -31,7 +31,8 @@ public:
     XMLSplitter(String itemName, Match match);
 
     // Goes on until a cut at `enough` bytes or more, or as far as whole tags reach. Always shown
-    // with what it was shown before, from the last removal on.
+    // with what it was shown before, from the last removal on. Part of a text that a zero byte
+    // follows.
     void goOver(std::string_view text, std::size_t enough);
     // The last place found where the text can be cut; 0 where there is none.
     std::size_t cut() const noexcept { return _cut; }
@@ -71,6 +72,7 @@ private:
     // Where something ends; none where the text ends before.
     using End = std::size_t;
 
+    void goOverInside();
     bool goOverNext();
     bool goOverDeclaration();
     bool goOverInstruction();
@@ -78,6 +80,7 @@ private:
     bool goOverEndTag();
     bool endElement(End end);
     End behind(std::string_view mark, std::size_t from) const;
+    std::size_t nextMark(std::size_t from) const noexcept;
     End endOfTag();
     End endOfDoctype() const;
     static std::string reopened(std::string_view tag, std::size_t nameSize);
