@@ -1,13 +1,8 @@
 #include "marshaller/ChildLookup.h"
 
+#include <algorithm>
+
 namespace qx::detail {
-
-namespace {
-
-// Look-ups times children up to which scanning costs no more than an index.
-constexpr std::size_t scanLimit = 256;
-
-} // namespace
 
 ChildLookup::ChildLookup(IndexedXML& document, Number element, Nodes nodes, std::size_t lookups)
     : _document(document), _element(element), _attributes(document.attributesOf(element)),
@@ -25,26 +20,26 @@ ChildLookup::ChildLookup(const ChildLookup& other, Nodes nodes)
             add(child.name, child.number);
 }
 
-void ChildLookup::addToMany(const Child& child) {
-    if (_many.empty())
-        _many.assign(_few.begin(), _few.end());
-    _many.push_back(child);
+void ChildLookup::makeRoom() {
+    std::vector<Child> more(2 * _room);
+    std::ranges::copy(children(), more.begin());
+    _many.swap(more);
+    _children = _many.data();
+    _room = _many.size();
 }
 
 std::unique_ptr<ChildLookup> ChildLookup::copyOf(const ChildLookup& other) {
     return std::unique_ptr<ChildLookup>(new ChildLookup(other, Nodes::copied));
 }
 
-void ChildLookup::indexIfWorthIt() {
-    if (_isIndexed || _lookups * children().size() <= scanLimit || _lookups < 2)
-        return;
-    _isIndexed = true;
+void ChildLookup::makeIndex() {
+    _runs = std::make_unique<std::unordered_map<Name, Run>>();
     const auto all = children();
     for (std::uint32_t i = 0; i < all.size(); ++i) {
         const Child& child = all[i];
         if (child.number == none || child.name == nullptr)
             continue;
-        Run& run = _runs[child.name];
+        Run& run = (*_runs)[child.name];
         if (run.first == none)
             run.first = i;
         else
@@ -57,9 +52,9 @@ template <class Visit>
 void ChildLookup::forEachNamed(const String& name, Visit visit) {
     indexIfWorthIt();
     const Name wanted = identity(name);
-    if (_isIndexed) {
-        const auto run = _runs.find(wanted);
-        std::uint32_t at = run != _runs.end() ? run->second.first : none;
+    if (isIndexed()) {
+        const auto run = _runs->find(wanted);
+        std::uint32_t at = run != _runs->end() ? run->second.first : none;
         while (at != none && visit(children()[at].number))
             at = children()[at].next;
         return;
@@ -119,13 +114,13 @@ void ChildLookup::take(Number child) {
     _isWhole = false;
     if (!_isCopy)
         _document.detach(child);
-    if (_isIndexed) {
-        const auto run = _runs.find(identity(_document.name(child)));
+    if (isIndexed()) {
+        const auto run = _runs->find(identity(_document.name(child)));
         Child& first = children()[run->second.first];
         first.number = none;
         run->second.first = first.next;
         if (first.next == none)
-            _runs.erase(run);
+            _runs->erase(run);
         return;
     }
     for (Child& listed : children())

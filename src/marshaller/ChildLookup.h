@@ -30,6 +30,8 @@ public:
     // `nodes` are those that are kept of the element; `lookups` is how many names will be looked
     // up.
     ChildLookup(IndexedXML& document, Number element, Nodes nodes, std::size_t lookups);
+    ChildLookup(const ChildLookup&) = delete;
+    ChildLookup& operator=(const ChildLookup&) = delete;
     // A private copy of what is left in the other.
     static std::unique_ptr<ChildLookup> copyOf(const ChildLookup& other);
 
@@ -92,9 +94,9 @@ private:
     static Name identity(const String& name) noexcept { return name.view().data(); }
 
     struct Child {
-        Name name;                 // of an element; null for other kinds
-        Number number;             // none: taken
-        std::uint32_t next = none; // of the same name, where there is an index
+        Name name;          // of an element; null for other kinds
+        Number number;      // none: taken
+        std::uint32_t next; // of the same name, where there is an index, else none
     };
     // Of the elements of one name: where they begin and end in the list.
     struct Run {
@@ -102,20 +104,22 @@ private:
         std::uint32_t last = none;
     };
 
-    std::span<Child> children() noexcept {
-        return _many.empty() ? std::span(_few.data(), _count) : std::span(_many);
-    }
-    std::span<const Child> children() const noexcept {
-        return const_cast<ChildLookup*>(this)->children();
-    }
+    std::span<Child> children() noexcept { return {_children, _count}; }
+    std::span<const Child> children() const noexcept { return {_children, _count}; }
     void add(Name name, Number number) {
-        if (_many.empty() && _count < _few.size())
-            _few[_count++] = {name, number};
-        else
-            addToMany({name, number});
+        if (_count == _room) [[unlikely]]
+            makeRoom();
+        _children[_count++] = {name, number, none};
     }
-    void addToMany(const Child& child);
-    void indexIfWorthIt();
+    void makeRoom();
+    bool isIndexed() const noexcept { return _runs != nullptr; }
+    // Look-ups times children up to which scanning costs no more than an index.
+    static constexpr std::size_t scanLimit = 256;
+    void indexIfWorthIt() {
+        if (_lookups * _count > scanLimit && _lookups >= 2 && !isIndexed()) [[unlikely]]
+            makeIndex();
+    }
+    void makeIndex();
     // Calls visit(Number) for each child element of that name until it says false.
     template <class Visit>
     void forEachNamed(const String& name, Visit visit);
@@ -126,14 +130,15 @@ private:
     const Nodes _nodes;
     const bool _isCopy = false;
     bool _isWhole = true; // no child was taken
-    bool _isIndexed = false;
     std::size_t _lookups;
     // The children: most elements have few, which take no memory of their own. Reading orders takes
     // 6 % fewer instructions for it (bench/orders_bench.cpp, read).
-    std::size_t _count = 0;
     std::array<Child, 8> _few;
-    std::vector<Child> _many;            // all, where they are more
-    std::unordered_map<Name, Run> _runs; // where it is indexed
+    std::vector<Child> _many; // where they are more
+    Child* _children = _few.data();
+    std::size_t _count = 0;
+    std::size_t _room = _few.size();
+    std::unique_ptr<std::unordered_map<Name, Run>> _runs; // where it is indexed
 
     ChildLookup(const ChildLookup& other, Nodes nodes);
 };

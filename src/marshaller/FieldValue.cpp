@@ -28,7 +28,7 @@ Value integerOf(const FieldPlan& field, const Value& text, Ref<Error>* error) {
 
 } // namespace
 
-bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error) {
+bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error) {
     const bool isConverted =
         field.valueType == ValueType::boolean || field.valueType == ValueType::integer;
     if (!value.isString() || !isConverted)

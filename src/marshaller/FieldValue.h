@@ -15,7 +15,7 @@ namespace qx::detail {
 // False with
 //   -221  "<%@>: Unable to convert value to integer: %@"            (logged as a warning, too)
 //   -222  "Unable to set value: %@ for key: %@ in class: %@"
-bool takeValue(Object& object, const FieldPlan& field, Key key, Value value, Ref<Error>* error);
+bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error);
 
 // The text as an item of a collection of a simple type; null with -221 as above.
 Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error);

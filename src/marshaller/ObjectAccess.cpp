@@ -5,7 +5,6 @@
 #include "base/Immortal.h"
 #include "host/Log.h"
 #include "model/Errors.h"
-#include "record/RecordFilling.h"
 
 #include <algorithm>
 #include <mutex>
@@ -79,11 +78,7 @@ ObjectAccess::Held ObjectAccess::getContent(const QXGenericRecord& record, Key k
     return value->isObject() ? Held(*value, false) : Held(*value);
 }
 
-bool ObjectAccess::set(Object& object, Key key, Value value, Ref<Error>* error) {
-    QXGenericRecord* record = plainRecord(object);
-    if (record != nullptr && RecordFilling::add(*record, key, std::move(value)))
-        return true;
-    // NOLINTNEXTLINE(bugprone-use-after-move): it was left alone
+bool ObjectAccess::setOrRefuse(Object& object, Key key, const Value& value, Ref<Error>* error) {
     return setProperty(object, key, value) == SetOutcome::set || refuse(object, key, value, error);
 }
 

@@ -8,7 +8,10 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Error.h>
 
+#include "record/RecordFilling.h"
+
 #include <unordered_map>
+#include <utility>
 
 namespace qx::detail {
 
@@ -69,7 +72,12 @@ public:
     Value getKept(const Object& object, KeptXML what);
     // Sets and reports what the object does not take:
     //   -222  "Unable to set value: %@ for key: %@ in class: %@"
-    static bool set(Object& object, Key key, Value value, Ref<Error>* error);
+    static bool set(Object& object, Key key, Value&& value, Ref<Error>* error) {
+        QXGenericRecord* const record = plainRecord(object);
+        return (record != nullptr && RecordFilling::add(*record, key, std::move(value))) ||
+               // NOLINTNEXTLINE(bugprone-use-after-move): it was left alone
+               setOrRefuse(object, key, value, error);
+    }
     // The same, but that an object without such a key drops the value: the log says so, once for
     // each class.
     bool setKept(Object& object, KeptXML what, Value value, Ref<Error>* error);
@@ -86,6 +94,7 @@ public:
 
 private:
     static Held getContent(const QXGenericRecord& record, Key key);
+    static bool setOrRefuse(Object& object, Key key, const Value& value, Ref<Error>* error);
     static SetOutcome setProperty(Object& object, Key key, const Value& value);
 
     static const Class* const records;

@@ -127,7 +127,7 @@ void Reloading::takeField(const FieldPlan& field, Object& held, Object& fresh) {
     if (_problem || merged.isSameAs(*before))
         return;
     registerUndo(held, key);
-    ObjectAccess::set(held, key, merged, &_problem);
+    ObjectAccess::set(held, key, Value(merged), &_problem);
 }
 
 void Reloading::takeMember(const Property& property, Object& held, Object& fresh) {

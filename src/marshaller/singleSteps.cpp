@@ -268,7 +268,7 @@ bool QXXMLMarshaller::validateBoundFields(const CountedSet& boundFields,
 
 bool TakeValueForKey(Object& object, qx::Key key, const qx::Value& value,
                      const QXXMLFieldMapping& field, Ref<Error>* error) {
-    return takeValue(object, FieldPlan::withoutClasses(field), key, value, error);
+    return takeValue(object, FieldPlan::withoutClasses(field), key, qx::Value(value), error);
 }
 
 qx::String StringValueOfObjectWithMapping(const qx::Value& value, const QXXMLFieldMapping& field) {

@@ -72,18 +72,21 @@ void reportThrown(Key key, const char* what) noexcept {
 
 } // namespace
 
-ChangeScope::~ChangeScope() noexcept(false) {
-    if (std::uncaught_exceptions() == _exceptions) {
-        announceEnd();
-        return;
-    }
+void ObjectInternals::tellEndOfFailedChange(Key key, const std::function<void()>& tell) noexcept {
     try {
-        announceEnd();
+        tell();
     } catch (const std::exception& exception) {
-        reportThrown(_key, exception.what());
+        reportThrown(key, exception.what());
     } catch (...) {
-        reportThrown(_key, "an exception of its own");
+        reportThrown(key, "an exception of its own");
     }
+}
+
+ChangeScope::~ChangeScope() noexcept(false) {
+    if (std::uncaught_exceptions() == _exceptions)
+        announceEnd();
+    else
+        ObjectInternals::tellEndOfFailedChange(_key, [this] { announceEnd(); });
 }
 
 void ChangeScope::announceEnd() {

@@ -4,6 +4,8 @@
 #include <QXXMLMarshalling/model/ChangeScope.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "model/ObjectExtras.h"
+
 namespace qx {
 
 Value Object::valueForKey(Key key) const {
@@ -24,6 +26,25 @@ void Object::setValueForKey(const Value& value, Key key) {
     }
 }
 
+namespace {
+
+// As in a ChangeScope, which costs more where nothing is thrown: it asks for exceptions on the way.
+bool setAndTell(Object& object, const Property& property, const Value& value) {
+    object.willChangeValueForKey(property.key);
+    bool isSet = false;
+    try {
+        isSet = property.set(property, object, value);
+    } catch (...) {
+        ObjectInternals::tellEndOfFailedChange(property.key,
+                                               [&] { object.didChangeValueForKey(property.key); });
+        throw;
+    }
+    object.didChangeValueForKey(property.key);
+    return isSet;
+}
+
+} // namespace
+
 SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
     // Whoever is told before the change may let the last reference go.
     const Ref<Object> kept(hasObserversOrWeakRefs() ? this : nullptr);
@@ -43,8 +64,7 @@ SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
         return SetOutcome::refused;
     if (!type.automaticallyNotifiesObserversForKey(key))
         return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
-    const ChangeScope scope(*this, key);
-    return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
+    return setAndTell(*this, *property, value) ? SetOutcome::set : SetOutcome::refused;
 }
 
 Value Object::valueForUndefinedKey(Key key) const {

@@ -18,10 +18,10 @@ public:
             return text;
         return Value(Value::Cell::lent(text));
     }
-    // The value to keep: a lent text gets bytes in a block.
-    static Value kept(Value&& value) {
-        const bool isLent = value.isString() && value._cell.form() == Value::Form::lent;
-        return isLent ? Value(textInBlock(value.view())) : std::move(value);
+    // Of a value that is to be kept: a lent text gets bytes in a block.
+    static void keep(Value& value) {
+        if (value.isString() && value._cell.form() == Value::Form::lent)
+            value = Value(textInBlock(value.view()));
     }
 };
 

@@ -4,6 +4,7 @@
 
 #include <QXXMLMarshalling/model/WeakRef.h>
 
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -59,6 +60,10 @@ struct ObjectInternals {
     // Does nothing when the listener was told already.
     static void removeEndListener(Object& object, EndListener& listener) noexcept;
     static void tellEndListeners(Object& object) noexcept;
+
+    // Tells of the end of a change that an exception has ended. What an observer throws at that is
+    // only reported.
+    static void tellEndOfFailedChange(Key key, const std::function<void()>& tell) noexcept;
 };
 
 } // namespace qx

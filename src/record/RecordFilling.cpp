@@ -12,7 +12,7 @@ bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) 
                            &record.isa() == &QXGenericRecord::classObject();
     if (!isUnheard || value.isNull() || key.view().starts_with('@'))
         return false;
-    value = LentText::kept(std::move(value));
+    LentText::keep(value);
     return contents(record)->add(key.string(), std::move(value));
 }
 

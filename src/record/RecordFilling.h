@@ -26,8 +26,7 @@ class RecordFilling {
 public:
     // False when the value has to be set by key-value access; it is left alone then.
     static bool add(QXGenericRecord& record, Key key, Value&& value) {
-        const bool isContent = !key.namesProperty() || record.isa().property(key) == nullptr;
-        return isContent && addContent(record, key, std::move(value));
+        return !namesProperty(record, key) && addContent(record, key, std::move(value));
     }
     // The same for a key that is known to be no property of the record.
     static bool addContent(QXGenericRecord& record, Key key, Value&& value);
@@ -41,6 +40,9 @@ public:
     static void completeCache(const QXGenericRecord& record, Dictionary& cache);
 
 private:
+    static bool namesProperty(const QXGenericRecord& record, Key key) {
+        return key.namesProperty() && record.isa().property(key) != nullptr;
+    }
     static void makeContents(QXGenericRecord& record);
 };
 

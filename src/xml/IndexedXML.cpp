@@ -1,7 +1,6 @@
 #include "xml/IndexedXML.h"
 
 #include "base/KnownName.h"
-#include "model/LentText.h"
 #include "xml/MatchedNames.h"
 #include "xml/XMLNodeMaker.h"
 
@@ -34,13 +33,6 @@ private:
     XMLNodeMaker _maker;
     std::unordered_map<XMLIndex::Number, Ref<XMLNode>> _nodes;
 };
-
-namespace {
-
-// Texts up to this are as fast made again as looked up.
-constexpr std::size_t longestUnshared = 256;
-
-} // namespace
 
 Ref<XMLNode> NodePool::attribute(XMLIndex::Number holder, XMLIndex::Number number) {
     if (auto known = find(number))
@@ -134,13 +126,10 @@ void IndexedXML::matchBy(const NamespaceTable& table) {
     _matched = MatchedNames(index(), _root, around, table, _interned).takeNumbers();
 }
 
-Value IndexedXML::value(Number number) {
-    const XMLIndexEntry& entry = index()[number];
-    if (entry.end - entry.begin <= longestUnshared)
-        return detail::LentText::of(index().value(entry, _room));
+Value IndexedXML::sharedValue(Number number) {
     String& value = _longTexts[number];
     if (value.isNull())
-        value = index().value(entry, _room);
+        value = index().value(index()[number], _room);
     return value;
 }
 

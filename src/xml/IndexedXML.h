@@ -4,6 +4,7 @@
 // everything as it stood at the start, and the nodes behind its entries where somebody needs one.
 // Used by one thread at a time.
 
+#include "model/LentText.h"
 #include "xml/DocumentPlaces.h"
 #include "xml/XMLDocumentContent.h"
 #include "xml/XMLTreeIndexer.h"
@@ -122,7 +123,12 @@ public:
     }
     // Of a text, attribute or declaration, good until something else is asked for; a copy is good
     // for ever. Whoever asks for a long one gets the same.
-    Value value(Number number);
+    Value value(Number number) {
+        const XMLIndexEntry& entry = index()[number];
+        return entry.end - entry.begin <= longestUnshared
+                   ? detail::LentText::of(index().value(entry, _room))
+                   : sharedValue(number);
+    }
     // All text inside an element, concatenated. Likewise.
     Value text(Number element);
     // The text that is all an element holds; none where it holds nothing or anything else.
@@ -177,6 +183,9 @@ public:
     const std::shared_ptr<const DocumentPlaces>& places();
 
 private:
+    // Texts up to this are as fast made again as looked up.
+    static constexpr std::size_t longestUnshared = 256;
+
     const XMLIndex& index() const noexcept { return *_index; }
     void expand(Number element) {
         if (_tree)
@@ -190,6 +199,7 @@ private:
     void findRoot() noexcept;
     void internNames();
     void appendText(Number element, std::string& text);
+    Value sharedValue(Number number);
     Number attributeOfMany(Number element, const Attributes& all, const String& name);
     NodePool& pool(Nodes nodes);
 
