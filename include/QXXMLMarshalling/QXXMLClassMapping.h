@@ -63,7 +63,7 @@ private:
     friend qx::Ref<QXXMLClassMapping> qx::make<QXXMLClassMapping>();
 
     QXXMLClassMapping() = default;
-    bool readFlag(const char* name, bool& flag, qx::Ref<qx::Error>* error);
+    bool readFlag(qx::Key name, bool& flag, qx::Ref<qx::Error>* error);
     bool readMapTo(qx::Ref<qx::Error>* error);
 
     qx::String _className;

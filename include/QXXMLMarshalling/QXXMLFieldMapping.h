@@ -84,7 +84,7 @@ private:
     bool hasFlag(Flag flag) const noexcept {
         return (_flags & static_cast<std::uint32_t>(flag)) != 0;
     }
-    bool readFlag(const char* name, Flag flag, bool defaultValue, qx::Ref<qx::Error>* error);
+    bool readFlag(qx::Key name, Flag flag, bool defaultValue, qx::Ref<qx::Error>* error);
     bool readBindings(qx::Ref<qx::Error>* error);
 
     qx::String _name;

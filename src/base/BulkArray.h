@@ -13,7 +13,7 @@
 
 namespace qx {
 
-// Asks for large pages for memory that nobody has written to yet.
+// Asks for large pages for memory of its own that is not all written to yet.
 void askForLargePages(void* memory, std::size_t size) noexcept;
 
 template <class T>
@@ -60,7 +60,7 @@ private:
             throw std::bad_alloc();
         _data = static_cast<T*>(memory);
         _capacity = capacity;
-        askForLargePages(_data + _size, (capacity - _size) * sizeof(T));
+        askForLargePages(_data, capacity * sizeof(T));
     }
 
     T* _data = nullptr;

@@ -1,5 +1,7 @@
 #include "base/TextBuffer.h"
 
+#include "base/BulkArray.h"
+
 #include <algorithm>
 
 namespace qx {
@@ -19,6 +21,7 @@ TextBuffer::~TextBuffer() {
 void TextBuffer::grow(std::size_t count) {
     const std::size_t capacity = std::max({firstCapacity, _size + count, 2 * _capacity});
     _rep = String::resized(_rep, capacity);
+    askForLargePages(_rep, sizeof *_rep + capacity);
     _capacity = capacity;
 }
 

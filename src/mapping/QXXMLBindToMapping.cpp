@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 
+#include "mapping/MappingWords.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
 #include "model/Printing.h"
@@ -25,20 +26,21 @@ Ref<QXXMLBindToMapping> QXXMLBindToMapping::initWithMinimalXML(XMLElement* eleme
 }
 
 bool QXXMLBindToMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    const auto& words = qx::detail::mappingWords();
     if (!QXXMLMapping::initXML(element, error) ||
-        !extractStringAttribute("name", element, false, _bindTo, error) ||
-        !extractStringAttribute("location", element, false, _location, error))
+        !extractStringAttribute(words.name, element, false, _bindTo, error) ||
+        !extractStringAttribute(words.location, element, false, _location, error))
         return false;
     if (_minimal)
         return true;
-    if (!extractStringAttribute("type", element, false, _type, error) ||
-        !extractStringAttribute("node", element, false, _node, error) ||
-        !extractStringAttribute("references", element, false, _references, error) ||
-        !extractStringAttribute("matches", element, false, _matches, error) ||
-        !extractStringAttribute("QName-prefix", element, false, _qNamePrefix, error) ||
-        !extractStringAttribute("auto-naming", element, false, _autoNaming, error))
+    if (!extractStringAttribute(words.type, element, false, _type, error) ||
+        !extractStringAttribute(words.node, element, false, _node, error) ||
+        !extractStringAttribute(words.references, element, false, _references, error) ||
+        !extractStringAttribute(words.matches, element, false, _matches, error) ||
+        !extractStringAttribute(words.qNamePrefix, element, false, _qNamePrefix, error) ||
+        !extractStringAttribute(words.autoNaming, element, false, _autoNaming, error))
         return false;
-    const auto classes = element.elementsForName(qx::Key("class"));
+    const auto classes = element.elementsForName(words.classes);
     if (classes.size() > 1)
         return goesOn(qx::fail(error, qx::errors::tooManyClassElements, &element), error);
     if (!classes.empty())

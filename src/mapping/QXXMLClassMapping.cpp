@@ -1,5 +1,6 @@
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 
+#include "mapping/MappingWords.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
 
@@ -16,29 +17,31 @@ Ref<QXXMLClassMapping> QXXMLClassMapping::initWithXML(XMLElement* element, Ref<E
 }
 
 bool QXXMLClassMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    const auto& words = qx::detail::mappingWords();
     return QXXMLMapping::initXML(element, error) &&
-           goesOn(extractStringAttribute("name", element, true, _className, error), error) &&
-           extractStringAttribute("extends", element, false, _extends, error) &&
-           readFlag("auto-complete", _autocomplete, error) &&
-           readFlag("self-first", _selfFirst, error) &&
-           extractStringAttribute("type", element, false, _type, error) && readMapTo(error) &&
-           processFields(element.elementsForName(Key("field")), error);
+           goesOn(extractStringAttribute(words.name, element, true, _className, error), error) &&
+           extractStringAttribute(words.extends, element, false, _extends, error) &&
+           readFlag(words.autoComplete, _autocomplete, error) &&
+           readFlag(words.selfFirst, _selfFirst, error) &&
+           extractStringAttribute(words.type, element, false, _type, error) && readMapTo(error) &&
+           processFields(element.elementsForName(words.field), error);
 }
 
-bool QXXMLClassMapping::readFlag(const char* name, bool& flag, Ref<Error>* error) {
+bool QXXMLClassMapping::readFlag(Key name, bool& flag, Ref<Error>* error) {
     return goesOn(extractBooleanAttribute(name, element(), false, flag, error), error);
 }
 
 bool QXXMLClassMapping::readMapTo(Ref<Error>* error) {
-    const auto mapTos = element().elementsForName(Key("map-to"));
+    const auto& words = qx::detail::mappingWords();
+    const auto mapTos = element().elementsForName(words.mapTo);
     if (mapTos.size() > 1 &&
         !goesOn(qx::fail(error, qx::errors::tooManyMapToElements, &element()), error))
         return false;
     if (mapTos.empty())
         return true;
-    return extractStringAttribute("xml", *mapTos.front(), false, _mapTo, error) &&
-           extractStringAttribute("ns-uri", *mapTos.front(), false, _nsURI, error) &&
-           extractStringAttribute("ns-prefix", *mapTos.front(), false, _nsPrefix, error);
+    return extractStringAttribute(words.xml, *mapTos.front(), false, _mapTo, error) &&
+           extractStringAttribute(words.nsURI, *mapTos.front(), false, _nsURI, error) &&
+           extractStringAttribute(words.nsPrefix, *mapTos.front(), false, _nsPrefix, error);
 }
 
 bool QXXMLClassMapping::processFields(const std::vector<XMLElement*>& elements, Ref<Error>* error) {

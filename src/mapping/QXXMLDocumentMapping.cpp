@@ -1,10 +1,10 @@
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 
+#include "mapping/MappingWords.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
 
 using qx::Error;
-using qx::Key;
 using qx::Ref;
 using qx::String;
 using qx::XMLElement;
@@ -16,16 +16,17 @@ Ref<QXXMLDocumentMapping> QXXMLDocumentMapping::initWithXML(XMLElement* root, Re
 }
 
 bool QXXMLDocumentMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    const auto& words = qx::detail::mappingWords();
     if (!QXXMLMapping::initXML(element, error))
         return false;
-    for (XMLElement* include : element.elementsForName(Key("include"))) {
-        String href = include->attributeValue(Key("href"));
+    for (XMLElement* include : element.elementsForName(words.include)) {
+        String href = include->attributeValue(words.href);
         if (href.isNull())
             continue;
         _includes.push_back(std::move(href));
         _includeElements.emplace_back(include);
     }
-    return processClasses(element.elementsForName(Key("class")), error);
+    return processClasses(element.elementsForName(words.classes), error);
 }
 
 bool QXXMLDocumentMapping::processClasses(const std::vector<XMLElement*>& elements,

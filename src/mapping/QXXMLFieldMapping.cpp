@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/QXXMLClassMapping.h>
 
+#include "mapping/MappingWords.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
 
@@ -18,24 +19,24 @@ Ref<QXXMLFieldMapping> QXXMLFieldMapping::initWithXML(XMLElement* element, Ref<E
 
 // The order of the steps decides which error a document with several faults gets.
 bool QXXMLFieldMapping::initXML(XMLElement& element, Ref<Error>* error) {
+    const auto& words = qx::detail::mappingWords();
     return QXXMLMapping::initXML(element, error) &&
-           goesOn(extractStringAttribute("name", element, true, _name, error), error) &&
-           extractStringAttribute("type", element, false, _type, error) &&
-           extractStringAttribute("handler", element, false, _handler, error) &&
-           extractStringAttribute("get-method", element, false, _getMethod, error) &&
-           extractStringAttribute("set-method", element, false, _setMethod, error) &&
-           extractStringAttribute("create-method", element, false, _createMethod, error) &&
-           extractStringAttribute("collection", element, false, _collection, error) &&
-           readFlag("required", Flag::required, false, error) &&
-           readFlag("container", Flag::container, true, error) &&
-           readFlag("lazy", Flag::lazy, false, error) &&
-           readFlag("direct", Flag::direct, false, error) &&
-           readFlag("transient", Flag::transient, false, error) &&
+           goesOn(extractStringAttribute(words.name, element, true, _name, error), error) &&
+           extractStringAttribute(words.type, element, false, _type, error) &&
+           extractStringAttribute(words.handler, element, false, _handler, error) &&
+           extractStringAttribute(words.getMethod, element, false, _getMethod, error) &&
+           extractStringAttribute(words.setMethod, element, false, _setMethod, error) &&
+           extractStringAttribute(words.createMethod, element, false, _createMethod, error) &&
+           extractStringAttribute(words.collection, element, false, _collection, error) &&
+           readFlag(words.required, Flag::required, false, error) &&
+           readFlag(words.container, Flag::container, true, error) &&
+           readFlag(words.lazy, Flag::lazy, false, error) &&
+           readFlag(words.direct, Flag::direct, false, error) &&
+           readFlag(words.transient, Flag::transient, false, error) &&
            goesOn(readBindings(error), error);
 }
 
-bool QXXMLFieldMapping::readFlag(const char* name, Flag flag, bool defaultValue,
-                                 Ref<Error>* error) {
+bool QXXMLFieldMapping::readFlag(qx::Key name, Flag flag, bool defaultValue, Ref<Error>* error) {
     bool value = false;
     const bool isRead = extractBooleanAttribute(name, element(), false, value, defaultValue, error);
     if (!goesOn(isRead, error))
@@ -46,7 +47,8 @@ bool QXXMLFieldMapping::readFlag(const char* name, Flag flag, bool defaultValue,
 }
 
 bool QXXMLFieldMapping::readBindings(Ref<Error>* error) {
-    const auto bindings = element().elementsForName(qx::Key("bind-xml"));
+    const auto& words = qx::detail::mappingWords();
+    const auto bindings = element().elementsForName(words.bindXML);
     if (bindings.size() > 1 &&
         !goesOn(qx::fail(error, qx::errors::tooManyBindXMLElements, &element()), error))
         return false;
@@ -56,7 +58,7 @@ bool QXXMLFieldMapping::readBindings(Ref<Error>* error) {
             return false;
         _bindToMappings.push_back(_bindToMapping);
     }
-    const auto alternatives = element().elementsForName(qx::Key("alt-xml"));
+    const auto alternatives = element().elementsForName(words.altXML);
     if (alternatives.empty())
         return true;
     if (bindings.empty())

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/model/Array.h>
 
 #include "mapping/MappingSource.h"
+#include "mapping/MappingWords.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
 
@@ -64,9 +65,9 @@ bool QXXMLMapping::readElement(XMLElement* element, Ref<Error>* error,
 }
 
 bool QXXMLMapping::initXML(XMLElement& element, Ref<Error>* error) {
-    static const Key descriptionKey("description");
+    const auto& words = qx::detail::mappingWords();
     _element = Ref<XMLElement>(&element);
-    const auto descriptions = element.elementsForName(descriptionKey);
+    const auto descriptions = element.elementsForName(words.description);
     if (descriptions.size() > 1 &&
         !goesOn(qx::fail(error, qx::errors::tooManyDescriptions, &element), error))
         return false;

@@ -142,9 +142,12 @@ bool ObjectAccess::mayKeepXML(const Object& object) {
     }
     const Dictionary* const contents = static_cast<const QXGenericRecord&>(object).contents().get();
     const auto keys = keptKeys();
-    return contents != nullptr && std::ranges::any_of(*contents, [&](const auto& entry) {
-               return entry.key == keys[0] || entry.key == keys[1] || entry.key == keys[2];
-           });
+    const auto isKept = [&](const String& key) {
+        const bool isOne = key.isSameAs(keys[0]) || key.isSameAs(keys[1]) || key.isSameAs(keys[2]);
+        return isOne || (!key.isInterned() && std::ranges::find(keys, key) != keys.end());
+    };
+    return contents != nullptr &&
+           std::ranges::any_of(*contents, [&](const auto& entry) { return isKept(entry.key); });
 }
 
 // A class that lacks a key raises when it is read by a key that it does not take; so it is asked

@@ -28,7 +28,12 @@ constexpr std::size_t none = static_cast<std::size_t>(-1);
 template <class NameOf>
 std::size_t scan(std::size_t entries, const String& name, NameOf nameOf) noexcept {
     for (std::size_t i = 0; i < entries; ++i)
-        if (nameOf(i) == name)
+        if (nameOf(i).isSameAs(name))
+            return i;
+    // Of two interned names that are not the same no more has to be looked at.
+    const bool isInterned = name.isInterned();
+    for (std::size_t i = 0; i < entries; ++i)
+        if (!(isInterned && nameOf(i).isInterned()) && nameOf(i) == name)
             return i;
     return none;
 }

@@ -26,6 +26,7 @@ enum ByteKind : std::uint8_t {
     markupByte = 16,   // plain in comments, instructions and CDATA
     blankByte = 32,    // white, and no carriage return
     tagByte = 64,      // no quote in a tag, and not where it begins or ends
+    writtenByte = 128, // written as it is, in texts and values alike
 };
 
 inline constexpr std::array<std::uint8_t, 256> byteKinds = [] {
@@ -52,6 +53,8 @@ inline constexpr std::array<std::uint8_t, 256> byteKinds = [] {
         kinds[c] |= nameByte;
     for (unsigned c = 0x80; c < 0x100; ++c)
         kinds[c] = nameByte;
+    for (unsigned c = 0x20; c < 0x80; ++c)
+        kinds[c] |= c == '<' || c == '>' || c == '&' || c == '"' ? 0 : writtenByte;
     for (unsigned c = 1; c < 0x100; ++c)
         kinds[c] |= c == '"' || c == '\'' || c == '<' || c == '>' ? 0 : tagByte;
     return kinds;
@@ -73,6 +76,10 @@ public:
     }
     explicit ByteBlock(const char* at) noexcept
         : _bytes(_mm_loadu_si128(reinterpret_cast<const __m128i*>(at))) {}
+    // Eight bytes, zeros behind them.
+    static ByteBlock half(const char* at) noexcept {
+        return ByteBlock(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(at)));
+    }
 
     // How many bytes from the first on are of the kind, or fewer, where the next one may be, too.
     template <ByteKind kind>
@@ -124,6 +131,8 @@ private:
         else if constexpr (kind == tagByte)
             return _mm_or_si128(_mm_or_si128(equal('"'), equal('\'')),
                                 _mm_or_si128(_mm_or_si128(equal('<'), equal('>')), equal(0)));
+        else if constexpr (kind == writtenByte)
+            return _mm_or_si128(any('<', '>', '&'), equal('"'));
         else if constexpr (kind == blankByte)
             return _mm_andnot_si128(
                 _mm_or_si128(equal(' '), _mm_or_si128(equal('\n'), equal('\t'))),
@@ -138,6 +147,28 @@ private:
 };
 
 #endif
+
+// Likewise, of a run that no zero byte ends.
+template <ByteKind kind>
+const char* endOfRunBefore(const char* at, const char* end) noexcept {
+#if defined(__SSE2__)
+    for (; ByteBlock::fits(at, end); at += ByteBlock::size) {
+        const std::size_t run = ByteBlock(at).run<kind>();
+        if (run != ByteBlock::size)
+            return at + run;
+    }
+    constexpr std::size_t half = ByteBlock::size / 2;
+    if (end - at >= static_cast<std::ptrdiff_t>(half)) {
+        const std::size_t run = ByteBlock::half(at).run<kind>();
+        at += run;
+        if (run != half)
+            return at;
+    }
+#endif
+    while (at != end && is(*at, kind))
+        ++at;
+    return at;
+}
 
 template <ByteKind kind>
 const char* endOfRun(const char* at, [[maybe_unused]] const char* end) noexcept {

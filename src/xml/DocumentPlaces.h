@@ -57,7 +57,7 @@ private:
 
     const std::shared_ptr<const ParsedDocument> _parsed;
     const std::shared_ptr<const XMLTreeIndexer> _tree;
-    const String _documentName;
+    const String _documentName{};
     mutable std::mutex _mutex; // guards the rest
     mutable std::vector<Step> _steps;
     mutable std::optional<TextPosition> _position;

@@ -2,6 +2,8 @@
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
+#include "base/BulkArray.h"
+
 #include <algorithm>
 #include <cstring>
 
@@ -11,9 +13,10 @@ static_assert(std::is_trivially_destructible_v<XMLDraft::Element> && sizeof(XMLD
 
 // What does not fit leaves the rest of the block unused: little, as blocks grow.
 void XMLDraft::grow(std::size_t size) {
-    constexpr std::size_t largestBlock = 1024 * 1024;
+    constexpr std::size_t largestBlock = 8 * 1024 * 1024;
     const std::size_t capacity = std::max(size, _blockSize);
     _blocks.push_back(std::make_unique_for_overwrite<std::byte[]>(capacity));
+    askForLargePages(_blocks.back().get(), capacity);
     _blockSize = std::min(2 * _blockSize, largestBlock);
     _next = _blocks.back().get();
     _left = capacity;

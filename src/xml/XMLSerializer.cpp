@@ -2,11 +2,11 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "xml/ByteRuns.h"
 #include "xml/Encoding.h"
 #include "xml/XMLCharacters.h"
 
 #include <algorithm>
-#include <array>
 
 namespace qx {
 
@@ -15,14 +15,6 @@ namespace {
 bool holds(std::string_view text, std::string_view part) {
     return text.find(part) != std::string_view::npos;
 }
-
-// Bytes that can be copied from text as they are.
-constexpr std::array<bool, 256> plainBytes = [] {
-    std::array<bool, 256> plain{};
-    for (std::size_t c = 0x20; c < 0x80; ++c)
-        plain[c] = c != '&' && c != '<' && c != '>' && c != '"';
-    return plain;
-}();
 
 } // namespace
 
@@ -219,21 +211,22 @@ void XMLSerializer::writeText(const XMLNode& text) {
 
 void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escapesBreaks,
                                  const XMLPlace& place) {
-    static constexpr std::array<bool, 256> none{};
     const bool lacksASCII = _encoder != nullptr && _encoder->lacksASCII();
-    const auto& plain = lacksASCII ? none : plainBytes;
+    const char* const end = text.data() + text.size();
     std::size_t written = 0;
     const auto replace = [&](std::size_t from, std::size_t to, std::string_view by) {
         _output += text.substr(written, from - written);
         _output += by;
         written = to;
     };
-    for (std::size_t at = 0; at < text.size();) {
+    std::size_t at = 0;
+    while (true) {
+        if (!lacksASCII)
+            at = static_cast<std::size_t>(endOfRunBefore<writtenByte>(text.data() + at, end) -
+                                          text.data());
+        if (at == text.size())
+            break;
         const char byte = text[at];
-        if (plain[static_cast<unsigned char>(byte)]) {
-            ++at;
-            continue;
-        }
         const std::size_t start = at;
         const char32_t c = decodeCharacter(text, at);
         if (c == '&' || c == '<' || c == '\r' || (c == '>' && where == Where::text) ||
