@@ -1,0 +1,57 @@
+#pragma once
+
+// Atom feeds as plain structs. What an entry says, its authors, and elements of other namespaces
+// stay in the members of type QXUnknownXML.
+
+#include <QXXMLMarshalling/QXUnknownXML.h>
+#include <QXXMLMarshalling/model/DateTime.h>
+
+namespace atom {
+
+struct Text {
+    std::optional<std::string> type; // "text" where it is not there, "html" or "xhtml"
+    std::string text;                // of "xhtml" without its markup
+    QXUnknownXML unknown;
+};
+struct Link {
+    std::optional<std::string> rel; // "alternate" where it is not there
+    std::string href;
+    QXUnknownXML unknown;
+};
+struct Entry {
+    std::string id;
+    Text title;
+    std::optional<qx::DateTime> updated;
+    std::vector<Link> links;
+    QXUnknownXML unknown;
+};
+struct Feed {
+    std::string id;
+    Text title;
+    std::optional<qx::DateTime> updated;
+    std::vector<Link> links;
+    std::vector<Entry> entries;
+    QXUnknownXML unknown;
+};
+
+inline void describeClasses() {
+    qx::Class::define<Text>("Text").members<&Text::type, &Text::text, &Text::unknown>();
+    qx::Class::define<Link>("Link").members<&Link::rel, &Link::href, &Link::unknown>();
+    qx::Class::define<Entry>("Entry")
+        .members<&Entry::id, &Entry::title, &Entry::updated, &Entry::links, &Entry::unknown>();
+    qx::Class::define<Feed>("Feed")
+        .members<&Feed::id, &Feed::title, &Feed::updated, &Feed::links, &Feed::entries,
+                 &Feed::unknown>();
+}
+
+// The feed's own title, or that of an entry. Null where neither has this id.
+inline Text* titleOf(Feed& feed, const std::string& id) {
+    if (feed.id == id)
+        return &feed.title;
+    for (Entry& entry : feed.entries)
+        if (entry.id == id)
+            return &entry.title;
+    return nullptr;
+}
+
+} // namespace atom
