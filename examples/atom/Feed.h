@@ -34,24 +34,9 @@ struct Feed {
     QXUnknownXML unknown;
 };
 
-inline void describeClasses() {
-    qx::Class::define<Text>("Text").members<&Text::type, &Text::text, &Text::unknown>();
-    qx::Class::define<Link>("Link").members<&Link::rel, &Link::href, &Link::unknown>();
-    qx::Class::define<Entry>("Entry")
-        .members<&Entry::id, &Entry::title, &Entry::updated, &Entry::links, &Entry::unknown>();
-    qx::Class::define<Feed>("Feed")
-        .members<&Feed::id, &Feed::title, &Feed::updated, &Feed::links, &Feed::entries,
-                 &Feed::unknown>();
-}
+void describeClasses();
 
 // The feed's own title, or that of an entry. Null where neither has this id.
-inline Text* titleOf(Feed& feed, const std::string& id) {
-    if (feed.id == id)
-        return &feed.title;
-    for (Entry& entry : feed.entries)
-        if (entry.id == id)
-            return &entry.title;
-    return nullptr;
-}
+Text* titleOf(Feed& feed, const std::string& id);
 
 } // namespace atom
