@@ -13,11 +13,12 @@ void describeClasses() {
 }
 
 Text* titleOf(Feed& feed, const std::string& id) {
+    const auto made = [](std::optional<Text>& title) { return title ? &*title : &title.emplace(); };
     if (feed.id == id)
-        return &feed.title;
+        return made(feed.title);
     for (Entry& entry : feed.entries)
         if (entry.id == id)
-            return &entry.title;
+            return made(entry.title);
     return nullptr;
 }
 

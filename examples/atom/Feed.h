@@ -20,14 +20,14 @@ struct Link {
 };
 struct Entry {
     std::string id;
-    Text title;
+    std::optional<Text> title;
     std::optional<qx::DateTime> updated;
     std::vector<Link> links;
     QXUnknownXML unknown;
 };
 struct Feed {
     std::string id;
-    Text title;
+    std::optional<Text> title;
     std::optional<qx::DateTime> updated;
     std::vector<Link> links;
     std::vector<Entry> entries;
@@ -36,7 +36,8 @@ struct Feed {
 
 void describeClasses();
 
-// The feed's own title, or that of an entry. Null where neither has this id.
+// The title of the feed, or of the entry, with this id; made where it has none. Null where there is
+// no such id.
 Text* titleOf(Feed& feed, const std::string& id);
 
 } // namespace atom

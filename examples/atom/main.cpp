@@ -11,10 +11,14 @@
 
 namespace {
 
+std::string textOf(const std::optional<atom::Text>& title) {
+    return title ? title->text : "without a title";
+}
+
 void tell(const atom::Feed& feed) {
-    std::cout << feed.title.text << '\n';
+    std::cout << textOf(feed.title) << '\n';
     for (const atom::Entry& entry : feed.entries) {
-        std::cout << "    " << entry.title.text << '\n';
+        std::cout << "    " << textOf(entry.title) << '\n';
         for (const atom::Link& link : entry.links)
             if (link.rel.value_or("alternate") == "alternate")
                 std::cout << "        " << link.href << '\n';
@@ -38,12 +42,12 @@ int main(int count, char** arguments) {
     const auto marshaller =
         QXXMLMarshaller::initWithMappingFile(QX_EXAMPLE_DIR "/mapping.xml", &error);
     if (!marshaller || !marshaller->setMatchesNamespaces(true, &error))
-        return fail(error->localizedDescription());
+        return fail(error->report());
     // What has no field is kept: nobody needs to hear of it.
     marshaller->setReportHandler([](const QXXMLReport&) {});
     auto feed = marshaller->readFile<atom::Feed>(arguments[1]);
     if (!feed)
-        return fail(feed.error()->localizedDescription());
+        return fail(feed.error()->report());
     if (count == 2)
         return tell(*feed), 0;
 
@@ -55,7 +59,7 @@ int main(int count, char** arguments) {
     title->text = arguments[3];
     const auto update = QXXMLUpdate::updateFile(*marshaller, *feed, arguments[1]);
     if (!update)
-        return fail(update.error()->localizedDescription());
+        return fail(update.error()->report());
     for (const auto& edit : update->edits())
         std::cout << "line " << edit.line << ": " << edit.keyPath.view() << '\n';
     return 0;

@@ -39,7 +39,7 @@ void tell(const gpx::Gpx& gpx) {
 }
 
 int fail(const qx::Ref<qx::Error>& error) {
-    std::cerr << "gpx: " << error->localizedDescription().view() << '\n';
+    std::cerr << "gpx: " << error->report().view() << '\n';
     return 1;
 }
 

@@ -37,12 +37,12 @@ int main(int count, char** arguments) {
     const auto marshaller =
         QXXMLMarshaller::initWithMappingFile(QX_EXAMPLE_DIR "/mapping.xml", &error);
     if (!marshaller)
-        return fail(error->localizedDescription());
+        return fail(error->report());
     // Most of a project is unknown here, which is as it should be.
     marshaller->setReportHandler([](const QXXMLReport&) {});
     auto project = marshaller->readFile<maven::Project>(arguments[1]);
     if (!project)
-        return fail(project.error()->localizedDescription());
+        return fail(project.error()->report());
     if (count == 2) {
         std::cout << project->artifactId << '\n';
         tell(*project);
@@ -56,7 +56,7 @@ int main(int count, char** arguments) {
         return fail("no version of " + std::string(arguments[2]) + " stands there");
     const auto update = QXXMLUpdate::updateFile(*marshaller, *project, arguments[1]);
     if (!update)
-        return fail(update.error()->localizedDescription());
+        return fail(update.error()->report());
     for (const auto& edit : update->edits())
         std::cout << "line " << edit.line << ": " << edit.keyPath.view() << '\n';
     return 0;

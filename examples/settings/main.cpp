@@ -29,12 +29,12 @@ int main(int count, char** arguments) {
     const auto marshaller =
         QXXMLMarshaller::initWithMappingFile(QX_EXAMPLE_DIR "/mapping.xml", &error);
     if (!marshaller)
-        return fail(error->localizedDescription());
+        return fail(error->report());
     // What the palette does not know is kept: nobody needs to hear of it.
     marshaller->setReportHandler([](const QXXMLReport&) {});
     const auto file = QXXMLDocumentFile::open(arguments[1], marshaller, &error);
     if (!file)
-        return fail(error->localizedDescription());
+        return fail(error->report());
     const auto& palette = file->root<settings::Settings>()->palette;
     if (count == 4) {
         settings::Shape* shape = settings::shapeNamed(palette, arguments[2]);
@@ -44,5 +44,5 @@ int main(int count, char** arguments) {
     }
     for (const auto& shape : palette)
         std::cout << shape->name << ", area " << shape->area() << '\n';
-    return file->save(&error) ? 0 : fail(error->localizedDescription());
+    return file->save(&error) ? 0 : fail(error->report());
 }
