@@ -50,7 +50,7 @@ if(TARGET qxxml)
     endif()
     if(QX_TOOL_PAGES)
         foreach(page
-            "qxxml.1|${CMAKE_INSTALL_MANDIR}/man1"
+            "qxxml.1.gz|${CMAKE_INSTALL_MANDIR}/man1"
             "qxxml|${CMAKE_INSTALL_DATADIR}/bash-completion/completions"
             "_qxxml|${CMAKE_INSTALL_DATADIR}/zsh/site-functions"
             "qxxml.fish|${CMAKE_INSTALL_DATADIR}/fish/vendor_completions.d")

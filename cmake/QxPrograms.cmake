@@ -29,7 +29,7 @@ if(QX_WITH_TOOLS AND sources)
     if(NOT CMAKE_CROSSCOMPILING)
         set(QX_TOOL_PAGES "${PROJECT_BINARY_DIR}/pages")
         add_custom_command(TARGET qxxml POST_BUILD VERBATIM
-            COMMAND "${CMAKE_COMMAND}" "-DTOOL=$<TARGET_FILE:qxxml>" "-DFOLDER=${QX_TOOL_PAGES}"
+            COMMAND "${CMAKE_COMMAND}" "-DTOOL=$<TARGET_FILE:qxxml>" "-DPAGES=${QX_TOOL_PAGES}"
                 -P "${PROJECT_SOURCE_DIR}/cmake/QxToolPages.cmake")
     endif()
 endif()
