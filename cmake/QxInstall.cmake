@@ -50,7 +50,7 @@ if(TARGET qxxml)
     endif()
     if(QX_TOOL_PAGES)
         foreach(page
-            "qxxml.1|${CMAKE_INSTALL_MANDIR}/man1"
+            "qxxml.1.gz|${CMAKE_INSTALL_MANDIR}/man1"
             "qxxml|${CMAKE_INSTALL_DATADIR}/bash-completion/completions"
             "_qxxml|${CMAKE_INSTALL_DATADIR}/zsh/site-functions"
             "qxxml.fish|${CMAKE_INSTALL_DATADIR}/fish/vendor_completions.d")
@@ -66,3 +66,5 @@ install(FILES LICENSE README.md CHANGELOG.md
     DESTINATION "${CMAKE_INSTALL_DOCDIR}" COMPONENT documentation)
 install(DIRECTORY docs/ DESTINATION "${CMAKE_INSTALL_DOCDIR}/docs" COMPONENT documentation
     FILES_MATCHING PATTERN "*.md" PATTERN "*.svg" PATTERN samples EXCLUDE PATTERN site EXCLUDE)
+# Pages link to them.
+install(DIRECTORY examples DESTINATION "${CMAKE_INSTALL_DOCDIR}" COMPONENT documentation)

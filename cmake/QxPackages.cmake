@@ -15,6 +15,7 @@ set(CPACK_THREADS 0)
 
 set(CPACK_DEB_COMPONENT_INSTALL ON)
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
+set(CPACK_DEBIAN_PACKAGE_RELEASE 1)
 set(CPACK_DEBIAN_PACKAGE_PRIORITY optional)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS "${CMAKE_LIBRARY_OUTPUT_DIRECTORY}")
@@ -27,6 +28,8 @@ set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_LIBRARY_DESCRIPTION "XML documents to objects and back
 What maps to what is read at run time, from a mapping document.
 This package holds the shared library and its translated texts.")
+set(CPACK_DEBIAN_LIBRARY_PACKAGE_CONTROL_EXTRA "${PROJECT_SOURCE_DIR}/cmake/debian/triggers")
+set(CPACK_DEBIAN_LIBRARY_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libqxxmlmarshalling-dev)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)
@@ -58,10 +61,29 @@ set(CPACK_COMPONENT_TOOL_DEPENDS library)
 set(CPACK_COMPONENT_HEADERS_GROUP development)
 set(CPACK_COMPONENT_DEVELOPMENT_GROUP development)
 
-# Each package tells its licence where Debian looks for it; other ways of installing have it once.
+# Each package tells its licence and its changes where Debian looks for them; other ways of installing
+# have them once.
+set(package_files "${PROJECT_BINARY_DIR}/debian")
+file(READ LICENSE package_licence)
+string(REGEX REPLACE "^.*authors\n\n" "" package_licence "${package_licence}")
+string(STRIP "${package_licence}" package_licence)
+string(REPLACE "\n" "\n " package_licence " ${package_licence}")
+string(REPLACE "\n \n" "\n .\n" package_licence "${package_licence}")
+string(TIMESTAMP package_date "%a, %d %b %Y %H:%M:%S +0000" UTC)
+configure_file(cmake/debian/copyright.in "${package_files}/copyright" @ONLY)
+configure_file(cmake/debian/changelog.in "${package_files}/changelog" @ONLY)
+foreach(packed "changelog.Debian|${package_files}/changelog" "changelog|${PROJECT_SOURCE_DIR}/CHANGELOG.md")
+    string(REPLACE "|" ";" packed "${packed}")
+    list(GET packed 0 name)
+    list(GET packed 1 file)
+    file(ARCHIVE_CREATE OUTPUT "${package_files}/${name}.gz" PATHS "${file}"
+        FORMAT raw COMPRESSION GZip COMPRESSION_LEVEL 9)
+endforeach()
 foreach(component library development tool documentation)
     string(TOUPPER ${component} upper)
-    install(FILES LICENSE RENAME copyright EXCLUDE_FROM_ALL COMPONENT ${component}
+    install(FILES "${package_files}/copyright" "${package_files}/changelog.gz"
+            "${package_files}/changelog.Debian.gz"
+        EXCLUDE_FROM_ALL COMPONENT ${component}
         DESTINATION "${CMAKE_INSTALL_DATADIR}/doc/${CPACK_DEBIAN_${upper}_PACKAGE_NAME}")
 endforeach()
 

@@ -29,12 +29,13 @@ if(QX_WITH_TOOLS AND sources)
     if(NOT CMAKE_CROSSCOMPILING)
         set(QX_TOOL_PAGES "${PROJECT_BINARY_DIR}/pages")
         add_custom_command(TARGET qxxml POST_BUILD VERBATIM
-            COMMAND "${CMAKE_COMMAND}" "-DTOOL=$<TARGET_FILE:qxxml>" "-DFOLDER=${QX_TOOL_PAGES}"
+            COMMAND "${CMAKE_COMMAND}" "-DTOOL=$<TARGET_FILE:qxxml>" "-DPAGES=${QX_TOOL_PAGES}"
                 -P "${PROJECT_SOURCE_DIR}/cmake/QxToolPages.cmake")
     endif()
 endif()
 
-# examples/<name>/*.cpp -> example_<name>
+# examples/<name>/*.cpp -> example_<name>: everything but main.cpp is an object library, so that tests
+# reach it.
 file(GLOB_RECURSE sources RELATIVE "${PROJECT_SOURCE_DIR}/examples" CONFIGURE_DEPENDS
     "${PROJECT_SOURCE_DIR}/examples/*.cpp")
 if(QX_WITH_EXAMPLES)
@@ -47,13 +48,22 @@ if(QX_WITH_EXAMPLES)
         string(REPLACE "-" "_" name "example_${folder}")
         if(NOT TARGET ${name})
             add_executable(${name})
-            target_include_directories(${name} PRIVATE "${PROJECT_SOURCE_DIR}/examples/${folder}")
             target_compile_definitions(${name} PRIVATE
                 QX_EXAMPLE_DIR="${PROJECT_SOURCE_DIR}/examples/${folder}")
             target_link_libraries(${name} PRIVATE QXXMLMarshalling qx_warnings)
             add_dependencies(examples ${name})
         endif()
-        target_sources(${name} PRIVATE "${PROJECT_SOURCE_DIR}/examples/${source}")
+        if(source MATCHES "/main\\.cpp$")
+            target_sources(${name} PRIVATE "${PROJECT_SOURCE_DIR}/examples/${source}")
+            continue()
+        endif()
+        if(NOT TARGET ${name}_parts)
+            add_library(${name}_parts OBJECT)
+            target_link_libraries(${name}_parts PUBLIC qx_headers PRIVATE qx_warnings)
+            target_link_libraries(${name} PRIVATE ${name}_parts)
+            list(APPEND QX_EXAMPLE_PARTS ${name}_parts)
+        endif()
+        target_sources(${name}_parts PRIVATE "${PROJECT_SOURCE_DIR}/examples/${source}")
     endforeach()
 endif()
 

@@ -19,8 +19,8 @@ SITE = pathlib.Path("build/docs")
 # The order of the pages in the margin; those that are not named come last.
 GROUPS = [
     ("Start", ["README", "tutorial", "cookbook"]),
-    ("Guides", ["mapping-format", "host-classes", "records", "saving", "round-trip", "repositories",
-                "large-documents", "performance", "qxxml"]),
+    ("Guides", ["mapping-format", "host-classes", "records", "saving", "formats", "round-trip",
+                "repositories", "large-documents", "performance", "qxxml"]),
     ("Coming from", ["from-generated-binders", "from-annotations", "from-dom-code"]),
     ("Inside", ["architecture"]),
 ]

@@ -3,7 +3,7 @@
 # indented in a comment is an example, shown as it stands.
 
 function escaped(text) {
-    gsub(/[\\@#&<>%"*~`|$]/, "\\\\&", text)
+    gsub(/[\\@#&<>%"*`|$]/, "\\\\&", text)
     return text
 }
 # One line of a comment, without its slashes.

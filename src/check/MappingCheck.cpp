@@ -73,7 +73,7 @@ void MappingCheck::store(const String& meant, const FindingText& text, const Sub
     QXXMLFinding finding;
     finding.severity = text.severity;
     finding.kind = text.kind;
-    finding.text = format(localizedText(text.message), arguments);
+    finding.text = qx::format(localizedText(text.message), arguments);
     finding.suggestion = suggestionOf(meant);
     finding.place = {subject.source->name(), subject.line, subject.column};
     finding.includedFrom = subject.source->chain();

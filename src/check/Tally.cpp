@@ -36,7 +36,7 @@ std::vector<QXXMLFinding> Tally::findings() const {
         QXXMLFinding finding;
         finding.severity = entry.text->severity;
         finding.kind = entry.text->kind;
-        finding.text = format(localizedText(entry.text->message), arguments);
+        finding.text = qx::format(localizedText(entry.text->message), arguments);
         finding.suggestion = suggestionOf(entry.meant);
         finding.place = entry.place;
         finding.className = entry.className;

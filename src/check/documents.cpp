@@ -168,7 +168,7 @@ void FoundFields::addFindings(const MappingPlan& plan, const QXXMLDocumentMappin
         QXXMLFinding finding;
         finding.severity = text.severity;
         finding.kind = text.kind;
-        finding.text = format(localizedText(text.message), arguments);
+        finding.text = qx::format(localizedText(text.message), arguments);
         finding.place = node.place();
         finding.includedFrom = node.includedFrom();
         finding.className = className;

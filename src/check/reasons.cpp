@@ -67,7 +67,7 @@ private:
     template <class... Arguments>
     static std::string line(const FindingText& text, const Arguments&... arguments) {
         const std::array<Value, sizeof...(Arguments)> values{Value(arguments)...};
-        return "\n    " + format(localizedText(text.message), values).str();
+        return "\n    " + qx::format(localizedText(text.message), values).str();
     }
 
     const TakenEntries& _taken;

@@ -133,7 +133,7 @@ String Error::shortDescription() const {
         return oneLine(_message.view());
     std::vector<Value> arguments;
     std::ranges::transform(_arguments, std::back_inserter(arguments), shortened);
-    return oneLine(format(localizedText(_text->message), arguments).view());
+    return oneLine(qx::format(localizedText(_text->message), arguments).view());
 }
 
 String Error::report(Style style) const {

@@ -77,7 +77,7 @@ names_no_folder "$work/shared-prefix" --exclude='*.so*' --exclude-dir=bin
 ! command -v pkg-config >/dev/null || pkg shared-pkg "$work/shared-prefix" "$compiler" "$flags"
 soname=$(readelf -d "$work/shared-prefix"/lib*/libQXXMLMarshalling.so | sed -n 's/.*soname: \[\(.*\)\]/\1/p')
 [[ $soname == "libQXXMLMarshalling.so.${version%.*}" ]] || fail "the library is called $soname"
-for file in bin/qxxml share/man/man1/qxxml.1 share/doc/QXXMLMarshalling/LICENSE share/QXXMLMarshalling/Info.plist; do
+for file in bin/qxxml share/man/man1/qxxml.1.gz share/doc/QXXMLMarshalling/LICENSE share/QXXMLMarshalling/Info.plist; do
     [[ -e $work/shared-prefix/$file ]] || fail "$file is not installed"
 done
 

@@ -2,7 +2,7 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include "../examples/mime-types/MimeType.cpp"
+#include "../examples/mime-types/MimeType.h"
 #include "support/Show.h"
 
 #include <gtest/gtest.h>
