@@ -162,7 +162,7 @@ Value readText(Unmarshalling& reading, const FieldPlan& field, const Target& tar
         reading.reports().tellInside(reading.document(), node, &target.object);
     if (!reading.budget().takeVisits(1, node, error) || !reading.budget().takeText(node, error))
         return nullptr;
-    return itemOf(field, reading.document().text(node), error);
+    return itemOf(field, reading.document().text(node), error, !reading.isCollecting());
 }
 
 } // namespace
@@ -250,8 +250,7 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
             else if (trace != nullptr)
                 trace->forget(shown);
         } else if (error != nullptr && problem) {
-            *error = std::move(problem);
-            return false;
+            return writing.failed(field, i, problem, error);
         }
     }
     return true;
