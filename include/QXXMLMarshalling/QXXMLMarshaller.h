@@ -153,13 +153,15 @@ public:
     void setProgressHandler(ProgressHandler handler);
 
     // What reading and writing pass over is told to the handler, and no more logged: unbound
-    // children and attributes above all. It may do what the handler above may. Null for none.
+    // children and attributes above all. It may do what the handler above may; another one that it
+    // sets is told from the next call on. Null for none.
     void setReportHandler(QXXMLReport::Handler handler);
     // How many errors a reading with a slot collects before it ends, 1 at first. More than one
     // leave out the field or item that fails; the call answers null all the same, the error is the
     // first in the document, and all() lists them. What ends a reading at once (-224, -226) still
-    // does, and single steps end at their first error. What keeps the partial object hands it out,
-    // too, and reads on to the end, for all calls that answer neither a Result nor a reload.
+    // does, and single steps end at their first error. Of -221 no line is logged for each then.
+    // What keeps the partial object hands it out, too, and reads on to the end, for all calls that
+    // answer neither a Result nor a reload.
     std::size_t maximumErrors() const noexcept { return _maximumErrors; }
     void setMaximumErrors(std::size_t count) noexcept { _maximumErrors = count; }
     bool keepsPartial() const noexcept { return _keepsPartial; }

@@ -100,6 +100,25 @@ std::size_t terminalWidth(std::string_view character) noexcept {
     return width == U_EA_WIDE || width == U_EA_FULLWIDTH ? 2 : 1;
 }
 
+std::string printable(std::string_view text) {
+    std::string shown;
+    shown.reserve(text.size());
+    const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
+    for (std::size_t next = 0, at = 0; at < text.size(); at = next) {
+        UChar32 point = 0;
+        U8_NEXT(bytes, next, text.size(), point);
+        const bool turns =
+            (point >= 0x202A && point <= 0x202E) || (point >= 0x2066 && point <= 0x2069);
+        if (point < 0 || turns)
+            shown += "\uFFFD";
+        else if (u_charType(point) == U_CONTROL_CHAR)
+            shown += ' ';
+        else
+            shown += text.substr(at, next - at);
+    }
+    return shown;
+}
+
 bool isWellFormed(std::string_view text) {
     const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
     for (std::size_t i = 0; i < text.size();) {

@@ -19,6 +19,10 @@ std::size_t endOfCharacters(std::string_view text, std::size_t count) noexcept;
 // wide ones.
 std::size_t terminalWidth(std::string_view character) noexcept;
 
+// The text as a terminal may be given it: a blank for each control character, those of 8 bits among
+// them, U+FFFD for what turns the direction of writing and for bytes that are no UTF-8.
+std::string printable(std::string_view text);
+
 bool isWellFormed(std::string_view text);
 // A half of a surrogate pair without the other becomes U+FFFD.
 std::string fromUTF16(std::u16string_view units);

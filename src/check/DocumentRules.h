@@ -12,9 +12,6 @@
 
 namespace qx::detail {
 
-// The names that fields of the class and its ancestors have for attributes, or for child elements.
-std::vector<std::string_view> namesTakenBy(const ClassPlan& type, XMLNodeKind kind);
-
 // Elements, attributes and texts in the root that no field took.
 void checkUntaken(const TakenEntries& taken, const DocumentPlaces& places, XMLIndex::Number root,
                   Tally& tally);
@@ -36,8 +33,9 @@ private:
 String reasonFor(std::string_view path, const TakenEntries& taken, const DocumentPlaces& places,
                  XMLIndex::Number root, bool keepsUnknown);
 
-// What of one tree is lost, changed or moved in another.
-void compareTrees(const XMLElement& original, const XMLElement& written, const String& documentName,
-                  Tally& tally);
+// What of the document that was read is lost, changed or moved in what was written. `original` is
+// the tree of the root.
+void compareTrees(const TakenEntries& taken, const DocumentPlaces& places, XMLIndex::Number root,
+                  const XMLElement& original, const XMLElement& written, Tally& tally);
 
 } // namespace qx::detail

@@ -44,6 +44,11 @@ inline constexpr FindingText classWithoutEffect("no-effect", note,
 inline constexpr FindingText prefixWithoutEffect("no-effect", warning,
                                                  "An ns-prefix without an ns-uri has no effect");
 inline constexpr FindingText strayText("stray-text", note, "Text in %@ has no meaning: %@");
+inline constexpr FindingText otherRoot("other-root", note,
+                                       "The root element is %@: it is read as a mapping");
+inline constexpr FindingText
+    wordAsRoot("other-root", warning,
+               "The root element is %@: it stands for the mapping, and has no meaning itself");
 inline constexpr FindingText unknownNode(
     "unknown-node", warning,
     "%@ is no node: an attribute or a child is read, and a text is written as an attribute");
@@ -181,6 +186,9 @@ inline constexpr FindingText objectNotTaken(
 inline constexpr FindingText valueNotTaken(
     "wrong-property", error,
     "The property %@ of the class %@ of the program does not take the field's values");
+inline constexpr FindingText valueWithoutName(
+    "unnamed-value", warning,
+    "The property %@ of the class %@ of the program begins as %@, which has no name to be read by");
 
 // What documents have, and what writing them again gives. A count comes last.
 inline constexpr FindingText unboundElement("unbound", warning,
@@ -235,7 +243,6 @@ inline constexpr FindingText noFieldForAttribute("why", note,
                                                  "no field of the class %@ takes an attribute %@");
 inline constexpr FindingText
     nameTakenElsewhere("why", note, "a field of the class %@ has the name %@, but took another");
-inline constexpr FindingText perhapsMeant("why", note, "there is one for %@");
 inline constexpr FindingText keptAsUnknown("why", note, "it is kept as unknown XML");
 inline constexpr FindingText dropped("why", note, "it is dropped");
 inline constexpr FindingText

@@ -1,9 +1,9 @@
 #include <QXXMLMarshalling/QXXMLDocumentCheck.h>
 
-#include "base/NearestName.h"
 #include "check/DocumentRules.h"
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
+#include "marshaller/TakenNames.h"
 #include "marshaller/Unmarshalling.h"
 #include "xml/XMLDocumentContent.h"
 #include "xml/XMLParser.h"
@@ -70,21 +70,18 @@ bool isRead(QXXMLMarshaller& marshaller, ReadDocument& document, bool& hasObject
 void tellUnknownRoot(const QXXMLMarshaller& marshaller, const ReadDocument& document,
                      Tally& tally) {
     const String name = document.parsed->index().name(document.parsed->index()[document.root]);
+    const QXXMLMarshallingMapping* const mapping = marshaller.mapping();
     tally.add(
-        findings::unknownRoot, {name}, nullptr,
+        findings::unknownRoot, {name}, {},
         [&] { return document.places->placeOf(document.root).place; },
         [&] {
-            std::vector<String> names;
-            if (marshaller.mapping() != nullptr)
-                for (const auto& type : marshaller.mapping()->mapping()->classMappings())
-                    names.push_back(MappingPlan::elementNameOf(*type));
-            const std::string_view near = qx::nearestName(name, names);
-            return near.empty() ? String() : String(near);
+            return mapping != nullptr ? qx::detail::suggestedElement(*mapping, name) : String();
         });
 }
 
 // Nodes that are kept are moved when they are written: what is compared has nodes of its own.
-void compareWritten(QXXMLMarshaller& marshaller, const ReadDocument& document, Tally& tally) {
+void compareWritten(QXXMLMarshaller& marshaller, const ReadDocument& document,
+                    const TakenEntries& taken, Tally& tally) {
     using qx::XMLDocumentContent;
     const PassingOver options(marshaller, marshaller.saveUnknownXML());
     const auto place = [&] { return document.places->placeOf(document.root).place; };
@@ -98,11 +95,11 @@ void compareWritten(QXXMLMarshaller& marshaller, const ReadDocument& document, T
             ? nullptr
             : XMLDocument::initWithData(written, qx::detail::parsingOf(marshaller), &error);
     if (!again)
-        return tally.add(findings::notWritten, {error ? error->shortDescription() : String()},
-                         nullptr, place);
+        return tally.add(findings::notWritten, {error ? error->shortDescription() : String()}, {},
+                         place);
     const auto original = XMLDocumentContent::document(document.parsed);
-    qx::detail::compareTrees(*original->rootElement(), *again->rootElement(),
-                             document.places->documentName(), tally);
+    qx::detail::compareTrees(taken, *document.places, document.root, *original->rootElement(),
+                             *again->rootElement(), tally);
 }
 
 } // namespace
@@ -153,7 +150,7 @@ bool QXXMLDocumentCheck::State::add(Parsed parsed, const String& name, Ref<Error
         const TakenEntries taken(document->parsed->index(), document->trace);
         checkUntaken(taken, *document->places, document->root, tally);
         fields.add(document->trace);
-        compareWritten(*marshaller, *document, tally);
+        compareWritten(*marshaller, *document, taken, tally);
     }
     last = std::move(document);
     return true;

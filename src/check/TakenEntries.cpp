@@ -34,6 +34,16 @@ const TakenEntries::Owner* TakenEntries::ownerOf(Number element) const {
     return owner != ReadingTrace::none ? &_trace.owners()[owner] : nullptr;
 }
 
+Tally::Concerned TakenEntries::concernedBy(Number entry) const {
+    if (const Owner* const owner = ownerOf(entry))
+        return {owner->plan->className.string()};
+    for (const Use* use : usesOf(entry))
+        if (use->field != nullptr)
+            if (const auto type = use->field->mapping->classMapping())
+                return {type->className(), use->field->key.string()};
+    return {};
+}
+
 bool TakenEntries::hasText(Number element) const {
     const auto uses = usesOf(element);
     return std::any_of(uses.begin(), uses.end(),

@@ -2,6 +2,7 @@
 
 // What one reading made of each element and attribute of a document, as its trace tells.
 
+#include "check/Tally.h"
 #include "marshaller/ReadingTrace.h"
 
 namespace qx::detail {
@@ -27,6 +28,8 @@ public:
     std::vector<const Use*> usesOf(Number entry) const;
     // The object that was made of the element, flattened ones apart; null where none was.
     const Owner* ownerOf(Number element) const;
+    // The class of which the element became an object, else the field that took it.
+    Tally::Concerned concernedBy(Number entry) const;
     // Whether a field took the text of an element that became an object.
     bool hasText(Number element) const;
 

@@ -6,21 +6,21 @@
 
 namespace qx::detail {
 
-void Tally::add(const FindingText& text, std::vector<String> arguments, const String& className,
+void Tally::add(const FindingText& text, std::vector<String> arguments, const Concerned& concerned,
                 const std::function<QXXMLMappingPlace()>& place,
-                const std::function<String()>& meant) {
+                const std::function<String()>& suggestion) {
     const auto [found, isNew] =
-        _numbers.try_emplace(Key(&text, arguments, className), _entries.size());
+        _numbers.try_emplace(Key(&text, arguments, concerned), _entries.size());
     if (isNew)
-        _entries.push_back(
-            {&text, std::move(arguments), className, meant ? meant() : String(), place(), 0});
+        _entries.push_back({&text, std::move(arguments), concerned,
+                            suggestion ? suggestion() : String(), place(), 0});
     ++_entries[found->second].count;
 }
 
 void Tally::add(const Tally& other) {
     for (const Entry& entry : other._entries) {
         const auto [found, isNew] = _numbers.try_emplace(
-            Key(entry.text, entry.arguments, entry.className), _entries.size());
+            Key(entry.text, entry.arguments, entry.concerned), _entries.size());
         if (isNew)
             _entries.push_back(entry);
         else
@@ -37,9 +37,10 @@ std::vector<QXXMLFinding> Tally::findings() const {
         finding.severity = entry.text->severity;
         finding.kind = entry.text->kind;
         finding.text = qx::format(localizedText(entry.text->message), arguments);
-        finding.suggestion = suggestionOf(entry.meant);
+        finding.suggestion = entry.suggestion;
         finding.place = entry.place;
-        finding.className = entry.className;
+        finding.className = entry.concerned.className;
+        finding.fieldName = entry.concerned.fieldName;
         all.push_back(std::move(finding));
     }
     return all;

@@ -1,5 +1,6 @@
 // The bindings of one field by itself: words that are none, names and locations that nothing uses.
 
+#include "base/WhiteSpace.h"
 #include "check/Rules.h"
 #include "xml/XMLCharacters.h"
 
@@ -11,6 +12,13 @@ namespace {
 
 constexpr std::string_view nodes[] = {"attribute", "element", "text"};
 constexpr std::string_view collections[] = {"array", "vector", "collection", "set"};
+
+// Words of other languages, and what stands for them here.
+constexpr std::pair<std::string_view, std::string_view> foreignNodes[] = {
+    {"attr", "attribute"}, {"@", "attribute"},     {"child", "element"}, {"tag", "element"},
+    {"elem", "element"},   {"content", "text"},    {"value", "text"},    {"cdata", "text"},
+    {"body", "text"},      {"characters", "text"}, {"#text", "text"},    {"text()", "text"},
+};
 
 // One field, whose findings are added to the check.
 class BindingCheck {
@@ -32,10 +40,13 @@ public:
     }
 
 private:
+    String suggestedCollection(const String& word);
+    String suggestedNode(const String& word);
     void checkWords();
     void checkThatItIsRead();
     void checkNames();
-    void checkName(const String& name, const Subject& subject);
+    static String trimmedName(std::string_view text);
+    String suggestedName(std::string_view name) const;
     void checkAlternatives();
     void checkLocations();
 
@@ -50,17 +61,30 @@ private:
     const std::vector<Ref<QXXMLBindToMapping>>& _bindings;
 };
 
+// All kinds of collection make an array.
+String BindingCheck::suggestedCollection(const String& word) {
+    const String near = _check.nearest(word, collections);
+    return near.isNull() ? String(collections[0]) : near;
+}
+
+String BindingCheck::suggestedNode(const String& word) {
+    const String lower = word.lowercased();
+    for (const auto& [foreign, ours] : foreignNodes)
+        if (lower == foreign)
+            return ours;
+    return _check.nearest(word, nodes);
+}
+
 void BindingCheck::checkWords() {
     if (_field.collection == CollectionKind::unknown)
-        _check.suggest(_check.nearest(_field.mapping->collection(), collections),
+        _check.suggest(suggestedCollection(_field.mapping->collection()),
                        findings::unknownCollection, ofField(), _field.mapping->collection(),
                        _type.mapping->className());
     if (_bindings.empty() || _field.isCollection() || _field.kind != BindingKind::automatic)
         return;
     const String& node = _bindings.front()->node();
     if (!node.isEmpty())
-        return _check.suggest(_check.nearest(node, nodes), findings::unknownNode, ofBinding(0),
-                              node);
+        return _check.suggest(suggestedNode(node), findings::unknownNode, ofBinding(0), node);
     const ClassPlan* const type = _field.typeClass;
     if (type == nullptr)
         return _check.add(findings::nodeLeftOpen, ofBinding(0));
@@ -88,14 +112,33 @@ void BindingCheck::checkThatItIsRead() {
 
 void BindingCheck::checkNames() {
     for (std::size_t i = 0; i < _bindings.size(); ++i) {
-        checkName(_bindings[i]->bindTo(), ofBinding(i));
-        checkName(_bindings[i]->location(), ofBinding(i));
+        const String& name = _bindings[i]->bindTo();
+        const String& location = _bindings[i]->location();
+        if (!name.isEmpty() && !isXMLName(name))
+            _check.suggest(suggestedName(name), findings::noXMLName, ofBinding(i), name);
+        if (!location.isEmpty() && !isXMLName(location))
+            _check.suggest(trimmedName(location), findings::noXMLName, ofBinding(i), location);
     }
 }
 
-void BindingCheck::checkName(const String& name, const Subject& subject) {
-    if (!name.isEmpty() && !isXMLName(name))
-        _check.add(findings::noXMLName, subject, name);
+String BindingCheck::trimmedName(std::string_view text) {
+    const std::string_view name = trimmed(text);
+    return isXMLName(name) ? String(name) : String();
+}
+
+// Names are no paths, nor do they say what kind of node they are of.
+String BindingCheck::suggestedName(std::string_view name) const {
+    const std::string_view plain = trimmed(name);
+    if (plain.starts_with('@') && isXMLName(plain.substr(1)))
+        return "name=\"" + std::string(plain.substr(1)) + "\" node=\"attribute\"";
+    const std::size_t slash = plain.find('/');
+    const bool looksInside =
+        _field.isCollection() ? _field.hasType() : _field.kind == BindingKind::attribute;
+    if (slash != std::string_view::npos && looksInside && isXMLName(plain.substr(0, slash)) &&
+        isXMLName(plain.substr(slash + 1)))
+        return "location=\"" + std::string(plain.substr(0, slash)) + "\" name=\"" +
+               std::string(plain.substr(slash + 1)) + "\"";
+    return trimmedName(name);
 }
 
 void BindingCheck::checkAlternatives() {

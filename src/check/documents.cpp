@@ -4,48 +4,15 @@
 
 #include <QXXMLMarshalling/model/Format.h>
 
-#include "base/NearestName.h"
 #include "base/WhiteSpace.h"
 #include "check/ClassFields.h"
+#include "marshaller/TakenNames.h"
 #include "model/Localizer.h"
 #include "xml/DocumentPlaces.h"
 
 #include <algorithm>
 
 namespace qx::detail {
-
-namespace {
-
-// Flattened objects take of the same element; of those that nest without end a few levels count.
-void addNames(const ClassPlan& type, XMLNodeKind kind, std::size_t levels,
-              std::vector<std::string_view>& names) {
-    for (const auto& [owner, field] : fieldsAsRead(type)) {
-        if (field->kind == BindingKind::flattened && !field->isCollection()) {
-            if (field->typeClass != nullptr && levels != 0)
-                addNames(*field->typeClass, kind, levels - 1, names);
-            continue;
-        }
-        const bool isAttribute = !field->isCollection() && (field->kind == BindingKind::attribute ||
-                                                            field->kind == BindingKind::automatic);
-        const bool isChild = field->isCollection() || field->kind != BindingKind::attribute;
-        for (const BindingPlan& binding : field->bindings) {
-            if (kind == XMLNodeKind::attribute ? isAttribute && binding.location.isEmpty()
-                                               : isChild)
-                names.push_back(binding.name);
-            if (kind == XMLNodeKind::element && !binding.location.isEmpty())
-                names.push_back(binding.location);
-        }
-    }
-}
-
-} // namespace
-
-std::vector<std::string_view> namesTakenBy(const ClassPlan& type, XMLNodeKind kind) {
-    constexpr std::size_t mostLevels = 4;
-    std::vector<std::string_view> names;
-    addNames(type, kind, mostLevels, names);
-    return names;
-}
 
 namespace {
 
@@ -71,6 +38,7 @@ private:
     void checkEntry(Number entry, Number element, Fate fate);
     void checkText(Number text, Number element);
     void add(const FindingText& text, Number entry, Number element);
+    String suggestionOf(Number entry, Number element) const;
 
     const String& nameOf(Number number) const { return _index.name(_index[number]); }
 
@@ -122,24 +90,39 @@ void UntakenCheck::checkText(Number text, Number element) {
     std::string room;
     if (isWhite(_index.value(_index[text], room)))
         return;
-    _tally.add(findings::unboundText, {nameOf(element)}, nullptr,
-               [&] { return _places.placeOf(element).place; });
+    _tally.add(findings::unboundText, {nameOf(element)}, {},
+               [&] { return _places.placeOf(text).place; });
 }
 
 void UntakenCheck::add(const FindingText& text, Number entry, Number element) {
-    const TakenEntries::Owner* const owner = _taken.ownerOf(element);
     _tally.add(
-        text, {nameOf(entry), nameOf(element)},
-        owner != nullptr ? owner->plan->className.string() : String(),
+        text, {nameOf(entry), nameOf(element)}, _taken.concernedBy(element),
         [&] { return _places.placeOf(entry).place; },
         [&]() -> String {
-            if (owner == nullptr || _suggestionsLeft == 0)
+            if (_suggestionsLeft == 0)
                 return nullptr;
             --_suggestionsLeft;
-            const auto names = namesTakenBy(*owner->plan, _index[entry].nodeKind());
-            const std::string_view near = nearestName(nameOf(entry), names);
-            return near.empty() ? String() : String(near);
+            return suggestionOf(entry, element);
         });
+}
+
+// By the names of the class that was made of the element, or of those that it is the wrapper for.
+String UntakenCheck::suggestionOf(Number entry, Number element) const {
+    const bool isAttribute = _index[entry].nodeKind() == XMLNodeKind::attribute;
+    UntakenNode node{nameOf(entry), isAttribute, {}};
+    if (!isAttribute)
+        node.children = _places.childrenOf(entry);
+    if (const TakenEntries::Owner* const owner = _taken.ownerOf(element))
+        return suggestionFor(node, TakenNames::of(*owner->plan));
+    for (const TakenEntries::Use* use : _taken.usesOf(element))
+        if (use->form == ReadingTrace::Form::wrapper) {
+            const TakenNames names = TakenNames::of(*use->field).in(nameOf(element));
+            const String near = suggestionFor(node, names);
+            return !near.isNull() || isAttribute || names.children.empty()
+                       ? near
+                       : "the mapping looks for " + quoted(names.children.front()) + " there";
+        }
+    return nullptr;
 }
 
 } // namespace

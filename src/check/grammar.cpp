@@ -35,17 +35,25 @@ struct ElementRule {
     std::string_view name; // empty for the root, whatever its name
     Words children;
     Words attributes;
+    std::string_view naming = {}; // the attribute that says what it is about
 };
+
+constexpr std::string_view rootName = "mapping";
 // A description is for people: nothing in it is looked at.
 constexpr ElementRule elementRules[] = {
     {"", ofRoot, {}},
-    {"include", {}, ofInclude},
-    {"class", inClass, ofClass},
-    {"map-to", {}, ofMapTo},
-    {"field", inField, ofField},
-    {"bind-xml", inBinding, ofBinding},
-    {"alt-xml", inAlternative, ofAlternative},
+    {"include", {}, ofInclude, "href"},
+    {"class", inClass, ofClass, "name"},
+    {"map-to", {}, ofMapTo, "xml"},
+    {"field", inField, ofField, "name"},
+    {"bind-xml", inBinding, ofBinding, "name"},
+    {"alt-xml", inAlternative, ofAlternative, "name"},
 };
+
+// Words that people write for the attribute that names.
+constexpr std::string_view namingWords[] = {
+    "name", "xml", "href",  "element", "attribute", "tag", "path", "xpath",    "id",
+    "key",  "ref", "class", "file",    "src",       "url", "uri",  "document", "schemaLocation"};
 
 bool has(Words words, std::string_view word) {
     return std::find(words.begin(), words.end(), word) != words.end();
@@ -57,6 +65,10 @@ const ElementRule* ruleOf(std::string_view name) {
     return found != std::end(elementRules) ? found : nullptr;
 }
 
+std::string_view shownName(const ElementRule& rule) {
+    return rule.name.empty() ? rootName : rule.name;
+}
+
 bool hasPrefix(std::string_view name) { return name.find(':') != std::string_view::npos; }
 
 class GrammarCheck {
@@ -64,14 +76,20 @@ public:
     GrammarCheck(MappingCheck& check, const MappingSource& source)
         : _check(check), _source(source) {}
 
-    void checkDocument(const XMLElement& root) { checkElement(root, elementRules[0]); }
+    void checkDocument(const XMLElement& root) {
+        if (root.name() != rootName && !root.name().isEmpty())
+            _check.add(ruleOf(root.name()) != nullptr ? findings::wordAsRoot : findings::otherRoot,
+                       at(root), root.name());
+        checkElement(root, elementRules[0]);
+    }
 
 private:
     void checkElement(const XMLElement& element, const ElementRule& rule);
-    void checkChild(const XMLElement& child, const XMLElement& element, const ElementRule& rule);
-    void checkUnknownChild(const XMLElement& child, const XMLElement& element,
-                           const ElementRule& rule);
+    void checkChild(const XMLElement& child, const ElementRule& rule);
+    void checkUnknownChild(const XMLElement& child, const ElementRule& rule);
     void checkAttribute(const String& name, const XMLElement& element, const ElementRule& rule);
+    static String namingMeantBy(const String& name, const XMLElement& element,
+                                const ElementRule& rule);
     void checkText(const XMLNode& text, const XMLElement& element);
 
     // Of an element that belongs to the class and the field that are open.
@@ -100,7 +118,7 @@ void GrammarCheck::checkElement(const XMLElement& element, const ElementRule& ru
         _check.add(findings::prefixWithoutEffect, at(element));
     for (const XMLNode& child : element.children()) {
         if (child.isElement())
-            checkChild(*child.asElement(), element, rule);
+            checkChild(*child.asElement(), rule);
         else if (child.kind() == XMLNodeKind::text)
             checkText(child, element);
     }
@@ -110,10 +128,9 @@ void GrammarCheck::checkElement(const XMLElement& element, const ElementRule& ru
         _fieldName = nullptr;
 }
 
-void GrammarCheck::checkChild(const XMLElement& child, const XMLElement& element,
-                              const ElementRule& rule) {
+void GrammarCheck::checkChild(const XMLElement& child, const ElementRule& rule) {
     if (!has(rule.children, child.name()))
-        return checkUnknownChild(child, element, rule);
+        return checkUnknownChild(child, rule);
     if (child.name() == "description")
         return;
     if (rule.name == "bind-xml")
@@ -122,20 +139,18 @@ void GrammarCheck::checkChild(const XMLElement& child, const XMLElement& element
 }
 
 // A prefix stands for somebody else's words, unless one of ours follows.
-void GrammarCheck::checkUnknownChild(const XMLElement& child, const XMLElement& element,
-                                     const ElementRule& rule) {
+void GrammarCheck::checkUnknownChild(const XMLElement& child, const ElementRule& rule) {
     const String& name = child.name();
     const bool isElsewhere = ruleOf(name) != nullptr;
     const String near = isElsewhere ? String() : _check.nearest(name, rule.children);
     if (hasPrefix(name) && near.isNull())
         return;
     if (!isElsewhere)
-        return _check.suggest(near, findings::unknownElement, at(child), name, element.name());
+        return _check.suggest(near, findings::unknownElement, at(child), name, shownName(rule));
     const auto* const place =
         std::find_if(std::begin(elementRules), std::end(elementRules),
                      [&](const ElementRule& other) { return has(other.children, name); });
-    _check.add(findings::misplacedElement, at(child), name, element.name(),
-               place->name.empty() ? std::string_view("mapping") : place->name);
+    _check.add(findings::misplacedElement, at(child), name, shownName(rule), shownName(*place));
 }
 
 void GrammarCheck::checkAttribute(const String& name, const XMLElement& element,
@@ -146,15 +161,29 @@ void GrammarCheck::checkAttribute(const String& name, const XMLElement& element,
             _check.add(findings::attributeWithoutEffect, subject, name, element.name());
         return;
     }
-    const String near = _check.nearest(name, rule.attributes);
+    String near = _check.nearest(name, rule.attributes);
     if (hasPrefix(name) && near.isNull())
         return;
+    if (near.isNull())
+        near = namingMeantBy(name, element, rule);
     const auto* const place =
         std::find_if(std::begin(elementRules), std::end(elementRules),
                      [&](const ElementRule& other) { return has(other.attributes, name); });
     if (place == std::end(elementRules))
-        return _check.suggest(near, findings::unknownAttribute, subject, name, element.name());
-    _check.suggest(near, findings::misplacedAttribute, subject, name, element.name(), place->name);
+        return _check.suggest(near, findings::unknownAttribute, subject, name, shownName(rule));
+    _check.suggest(near, findings::misplacedAttribute, subject, name, shownName(rule), place->name);
+}
+
+// An element that lacks its naming attribute may have it under another word.
+String GrammarCheck::namingMeantBy(const String& name, const XMLElement& element,
+                                   const ElementRule& rule) {
+    if (rule.naming.empty() || !has(namingWords, name) ||
+        !element.attributeValue(rule.naming).isNull())
+        return nullptr;
+    if (rule.name != "bind-xml" || (name != "attribute" && name != "element"))
+        return String(rule.naming);
+    const std::string value = element.attributeValue(name).str();
+    return "name=\"" + value + "\" node=\"" + name.str() + "\"";
 }
 
 void GrammarCheck::checkText(const XMLNode& text, const XMLElement& element) {

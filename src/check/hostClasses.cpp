@@ -9,6 +9,7 @@
 #include "check/Rules.h"
 
 #include <QXXMLMarshalling/detail/TakenObjects.h>
+#include <QXXMLMarshalling/detail/TakenTexts.h>
 
 namespace qx::detail {
 
@@ -58,6 +59,7 @@ public:
 
 private:
     void checkObject(const FieldPlan& field, const Property& property, const Subject& subject);
+    void checkFirstValue(const Property& property, Object& object, const Subject& subject);
     void checkValue(const FieldPlan& field, const Property& property, const Subject& subject);
 
     MappingCheck& _check;
@@ -89,14 +91,26 @@ void HostClassCheck::checkObject(const FieldPlan& field, const Property& propert
 // constructor and its conversions.
 void HostClassCheck::checkValue(const FieldPlan& field, const Property& property,
                                 const Subject& subject) {
+    const Ref<Object> object = _type.create();
+    if (object && property.get != nullptr && property.texts != nullptr)
+        checkFirstValue(property, *object, subject);
     Value value = exampleOf(field);
     if (field.isCollection())
         value = make<Array>(value.isNull() ? std::vector<Value>{} : std::vector<Value>{value});
     if (value.isNull())
         return;
-    const Ref<Object> object = _type.create();
     if (object && !property.set(property, *object, value))
         _check.add(findings::valueNotTaken, subject, field.key.string(), _type.name());
+}
+
+// A named enumeration gives a number where the value has no name.
+void HostClassCheck::checkFirstValue(const Property& property, Object& object,
+                                     const Subject& subject) {
+    if (property.texts().words.empty())
+        return;
+    const Value first = property.get(property, object);
+    if (first.kind() == Value::Kind::integer)
+        _check.add(findings::valueWithoutName, subject, property.key.string(), _type.name(), first);
 }
 
 } // namespace

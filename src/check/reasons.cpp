@@ -2,8 +2,8 @@
 
 #include <QXXMLMarshalling/model/Format.h>
 
-#include "base/NearestName.h"
 #include "check/DocumentRules.h"
+#include "marshaller/TakenNames.h"
 #include "model/Localizer.h"
 
 #include <algorithm>
@@ -156,15 +156,19 @@ void Reasons::tellUntaken(const std::vector<Number>& way, std::string& text) con
     switch (_taken.fateOf(element)) {
     case Fate::object: {
         const ClassPlan& type = *_taken.ownerOf(element)->plan;
-        const auto names = namesTakenBy(type, _index[entry].nodeKind());
+        const TakenNames taken = TakenNames::of(type);
+        const auto& names = isElement ? taken.children : taken.attributes;
         const bool isKnown = std::find(names.begin(), names.end(), nameOf(entry)) != names.end();
         text += line(isKnown     ? findings::nameTakenElsewhere
                      : isElement ? findings::noFieldForElement
                                  : findings::noFieldForAttribute,
                      type.className.string(), nameOf(entry));
-        const std::string_view near = nearestName(nameOf(entry), names);
-        if (!isKnown && !near.empty())
-            text += line(findings::perhapsMeant, String(near));
+        std::vector<String> children;
+        if (isElement)
+            children = _places.childrenOf(entry);
+        if (const String near = suggestionFor({nameOf(entry), !isElement, children}, taken);
+            !isKnown && !near.isNull())
+            text += "\n    " + near.str();
         text += line(_keepsUnknown ? findings::keptAsUnknown : findings::dropped);
         return;
     }

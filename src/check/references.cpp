@@ -16,7 +16,7 @@ constexpr std::string_view simpleTypes[] = {"boolean", "integer", "int", "string
 constexpr std::pair<std::string_view, std::string_view> foreignTypes[] = {
     {"bool", "boolean"},     {"long", "integer"},    {"short", "integer"},  {"byte", "integer"},
     {"unsigned", "integer"}, {"int32", "integer"},   {"int64", "integer"},  {"uint", "integer"},
-    {"double", "string"},    {"float", "string"},    {"decimal", "string"}, {"number", "string"},
+    {"double", "string"},    {"float", "string"},    {"decimal", "string"}, {"number", "integer"},
     {"date", "string"},      {"datetime", "string"}, {"text", "string"},    {"char", "string"},
 };
 

@@ -132,6 +132,21 @@ void MappingSource::addFault(Ref<Error> fault) const {
     _faults->push_back(std::move(finding));
 }
 
+MappingNote MappingSource::noteOf(const QXXMLFieldMapping* field, const QXXMLClassMapping* type) {
+    MappingNote note;
+    if (field != nullptr)
+        note.field = field->name();
+    if (type != nullptr)
+        note.className = type->className();
+    const QXXMLMapping* const node =
+        field != nullptr ? static_cast<const QXXMLMapping*>(field) : type;
+    if (node == nullptr)
+        return note;
+    note.place = node->place();
+    note.includes = node->includedFrom();
+    return note;
+}
+
 std::vector<QXXMLMappingPlace> MappingSource::chain() const {
     std::vector<QXXMLMappingPlace> places;
     for (const MappingSource* at = this; at->_includer; at = at->_includer.get())

@@ -7,6 +7,8 @@
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/QXXMLFinding.h>
 
+#include "model/ErrorDetails.h"
+
 namespace qx::detail {
 
 class MappingSource final : public Object {
@@ -22,6 +24,9 @@ public:
     // The document's nodes, which have this source. Where faults are collected, it is never null
     // and lacks what is faulty.
     Ref<QXXMLDocumentMapping> read(XMLElement* root, Ref<Error>* error);
+
+    // What an error says of a field, or else of a class; null for none.
+    static MappingNote noteOf(const QXXMLFieldMapping* field, const QXXMLClassMapping* type);
 
     const String& name() const noexcept { return _name; }
     // The places of the includes, the nearest first.

@@ -1,5 +1,7 @@
 #include <QXXMLMarshalling/QXXMLFinding.h>
 
+#include "base/Unicode.h"
+
 const char* QXXMLFinding::nameOf(Severity severity) noexcept {
     constexpr const char* names[] = {"note", "warning", "error"};
     return names[static_cast<std::size_t>(severity)];
@@ -11,5 +13,5 @@ qx::String QXXMLFinding::description() const {
         where += ':' + std::to_string(place.line) + ':' + std::to_string(place.column);
     if (!where.empty())
         where += ": ";
-    return qx::String::concat({where, nameOf(severity), ": ", text});
+    return qx::unicode::printable(qx::String::concat({where, nameOf(severity), ": ", text}));
 }

@@ -16,6 +16,7 @@ public:
     // and it stays there, where it is the last one that is wanted.
     bool take(Ref<Error>& slot);
     std::size_t count() const noexcept { return _errors.size(); }
+    bool isCollecting() const noexcept { return _most > 1; }
     bool keepsPartial() const noexcept { return _keepsPartial; }
     // Those from `begin` on let go of their document, which goes.
     void settle(std::size_t begin);

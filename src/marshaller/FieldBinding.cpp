@@ -53,10 +53,11 @@ bool Unmarshalling::passOverField(const FieldPlan& field, const Target& target, 
 }
 
 // What the field was read from, as far as it can be found again: the attribute or the child, or the
-// child that is one too many; else the element.
+// child that is one too many; else the wrapper around it, or the element.
 Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Target& target,
                                              int code) const {
     ChildLookup& source = target.source;
+    Number nearest = source.element();
     const bool isTooMany =
         code == errors::tooManyChildren.code || code == errors::tooManyElementsForField.code;
     const bool mayBeAttribute =
@@ -72,13 +73,15 @@ Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Targe
                                      : none;
         if (attribute != none)
             return attribute;
+        if (!around.isEmpty() && holder.first != none && nearest == source.element())
+            nearest = holder.first;
         const auto child = field.kind == BindingKind::attribute && !field.isCollection()
                                ? ChildLookup::Found()
                                : source.find(binding.name);
         if (child.first != none)
             return child.several && isTooMany ? source.all(binding.name)[1] : child.first;
     }
-    return source.element();
+    return nearest;
 }
 
 bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,

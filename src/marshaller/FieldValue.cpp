@@ -18,17 +18,19 @@ Value booleanOf(std::string_view text) {
 }
 
 // Null with -221 where there is no integer.
-Value integerOf(const FieldPlan& field, const Value& text, Ref<Error>* error) {
+Value integerOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bool isLogged) {
     if (const auto integer = scanInteger(text.view()))
         return *integer;
-    logWarningOrLine(errors::notAnInteger.message, field.xmlName(), text);
+    if (isLogged)
+        logWarningOrLine(errors::notAnInteger.message, field.xmlName(), text);
     fail(error, errors::notAnInteger, field.xmlName(), text);
     return nullptr;
 }
 
 } // namespace
 
-bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error) {
+bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error,
+               bool isLogged) {
     const bool isConverted =
         field.valueType == ValueType::boolean || field.valueType == ValueType::integer;
     if (!value.isString() || !isConverted)
@@ -37,16 +39,16 @@ bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, R
         return ObjectAccess::set(object, key, booleanOf(value.view()), error);
     if (value.view().empty())
         return ObjectAccess::set(object, key, nullptr, error);
-    Value integer = integerOf(field, value, error);
+    Value integer = integerOf(field, value, error, isLogged);
     return !integer.isNull() && ObjectAccess::set(object, key, std::move(integer), error);
 }
 
-Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error) {
+Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bool isLogged) {
     switch (field.valueType) {
     case ValueType::boolean:
         return booleanOf(text.view());
     case ValueType::integer:
-        return integerOf(field, text, error);
+        return integerOf(field, text, error, isLogged);
     default:
         return text;
     }

@@ -15,10 +15,11 @@ namespace qx::detail {
 // False with
 //   -221  "<%@>: Unable to convert value to integer: %@"            (logged as a warning, too)
 //   -222  "Unable to set value: %@ for key: %@ in class: %@"
-bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error);
+bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error,
+               bool isLogged = true);
 
 // The text as an item of a collection of a simple type; null with -221 as above.
-Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error);
+Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bool isLogged);
 
 // The text under which a value is written: "true" or "false" for a boolean field, else the value's
 // description. It needs the value as long as it is used.

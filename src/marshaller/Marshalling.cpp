@@ -5,6 +5,7 @@
 #include <QXXMLMarshalling/model/Dictionary.h>
 
 #include "marshaller/NamespaceMatching.h"
+#include "marshaller/WritingContext.h"
 #include "model/Errors.h"
 
 #include <algorithm>
@@ -135,7 +136,7 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
                               ErrorSlot error) {
     const std::size_t deepest = _marshaller->maximumDepth();
     if (_depth >= deepest)
-        return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
+        return failed(plan, errors::nestedTooDeep, deepest, error);
     struct Deeper {
         std::size_t& depth;
         explicit Deeper(std::size_t& counted) : depth(counted) { ++depth; }
@@ -154,7 +155,7 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
             return false;
     } while (walk.next());
     if (!walk.broken().isNull())
-        return fail(error, errors::noExtendsWhenMarshalling, walk.broken());
+        return failed(plan, errors::noExtendsWhenMarshalling, walk.broken(), error);
     const auto finish = [&](const ClassPlan& level) {
         if (!level.mapping->isSelfFirst() && !writeOwnFields(level, element, object, error))
             return false;
@@ -170,6 +171,35 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
     return isWritten;
 }
 
+bool Marshalling::failed(const ClassPlan& plan, const ErrorText& text, const Value& argument,
+                         ErrorSlot error) const {
+    if (error == nullptr)
+        return false;
+    if (&text == &errors::nestedTooDeep)
+        fail(error, text, argument, plan.className.string());
+    else
+        fail(error, text, argument);
+    WritingContext::tell(*error, _mapping.get(), nullptr, plan.mapping);
+    return false;
+}
+
+bool Marshalling::failed(const FieldPlan& field, const ClassPlan& plan, Ref<Error>& problem,
+                         ErrorSlot error) const {
+    WritingContext::tell(problem, _mapping.get(), field.mapping, plan.mapping);
+    WritingContext::tellKey(problem, field.key.view());
+    *error = std::move(problem);
+    return false;
+}
+
+bool Marshalling::failed(const FieldPlan& field, std::size_t item, Ref<Error>& problem,
+                         ErrorSlot error) const {
+    WritingContext::tell(problem, _mapping.get(), field.mapping,
+                         field.mapping->classMapping().get());
+    WritingContext::tellItem(problem, item);
+    *error = std::move(problem);
+    return false;
+}
+
 bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
                                  Object& object, ErrorSlot error) {
     for (const FieldPlan& field : plan.fields) {
@@ -181,9 +211,7 @@ bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& el
             _trace->leave();
         if (isWritten)
             continue;
-        if (error != nullptr)
-            *error = std::move(problem);
-        return false;
+        return error != nullptr && failed(field, plan, problem, error);
     }
     return true;
 }

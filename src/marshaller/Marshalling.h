@@ -75,6 +75,9 @@ public:
     void addAttribute(const WrittenElement& element, const String& name, const FieldText& text);
     // None when no child has that name.
     WrittenElement lastChildNamed(const WrittenElement& element, const String& name);
+    // Hands on what is wrong with that item of a collection; false.
+    [[gnu::noinline]] bool failed(const FieldPlan& field, std::size_t item, Ref<Error>& problem,
+                                  ErrorSlot error) const;
     // Whether an item of a collection is written (ObjectAccess.h).
     bool isToBeWritten(const Value& item);
     // Whether the field that is being written is left out as an attribute: nothing requires it, and
@@ -88,6 +91,11 @@ public:
     }
 
 private:
+    // False with an error that knows its place. What fails keeps off the stack of what recurses.
+    [[gnu::noinline]] bool failed(const ClassPlan& plan, const ErrorText& text,
+                                  const Value& argument, ErrorSlot error) const;
+    [[gnu::noinline]] bool failed(const FieldPlan& field, const ClassPlan& plan,
+                                  Ref<Error>& problem, ErrorSlot error) const;
     bool writeOwnFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                         ErrorSlot error);
     // The same, or else what its class declares.

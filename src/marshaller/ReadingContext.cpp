@@ -1,5 +1,6 @@
 #include "marshaller/ReadingContext.h"
 
+#include "mapping/MappingSource.h"
 #include "marshaller/Suggestion.h"
 
 namespace qx::detail {
@@ -11,10 +12,6 @@ const QXXMLClassMapping* classOf(const ReadingSpot& spot) {
         if (const auto holder = spot.field->mapping->classMapping())
             return holder.get();
     return spot.classPlan != nullptr ? spot.classPlan->mapping : nullptr;
-}
-
-DocumentPlace placeOf(const QXXMLMappingPlace& place) {
-    return {place.documentName, place.line, place.column};
 }
 
 } // namespace
@@ -38,19 +35,7 @@ String ReadingContext::suggestion() const {
 }
 
 MappingNote ReadingContext::mapping() const {
-    MappingNote note;
-    const QXXMLMapping* const node =
-        _field ? static_cast<const QXXMLMapping*>(_field.get()) : _class.get();
-    if (_field)
-        note.field = _field->name();
-    if (_class)
-        note.className = _class->className();
-    if (node == nullptr)
-        return note;
-    note.place = placeOf(node->place());
-    for (const QXXMLMappingPlace& include : node->includedFrom())
-        note.includes.push_back(placeOf(include));
-    return note;
+    return MappingSource::noteOf(_field.get(), _class.get());
 }
 
 } // namespace qx::detail

@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 
 #include "base/NearestName.h"
+#include "marshaller/TakenNames.h"
 #include "model/Errors.h"
 #include "plan/MappingPlan.h"
 
@@ -16,90 +17,31 @@ namespace {
 // They may go in a circle.
 constexpr std::size_t mostAncestors = 64;
 
-std::string quoted(std::string_view name) {
-    constexpr std::size_t longest = 60;
-    return "\"" + std::string(name.substr(0, longest)) + (name.size() > longest ? "..." : "") +
-           "\"";
-}
-
-std::string_view withoutPrefix(std::string_view name) { return name.substr(name.find(':') + 1); }
-
 bool contains(const std::vector<String>& names, const String& name) {
     return std::ranges::find(names, name) != names.end();
 }
 
-// The names that a class and its ancestors have in elements.
-struct KnownNames {
-    std::vector<String> attributes;
-    std::vector<String> children;
-};
-
-void addNames(const QXXMLFieldMapping& field, KnownNames& known) {
-    for (const auto& binding : field.bindToMappings()) {
-        const String& name = binding->bindTo().isEmpty() ? field.name() : binding->bindTo();
-        const bool isLocated = !binding->location().isEmpty();
-        if (isLocated)
-            known.children.push_back(binding->location());
-        const bool isCollection = !field.collection().isEmpty();
-        if (!isLocated && !isCollection && field.nodeType() != QXXMLNodeTypeElement &&
-            field.nodeType() != QXXMLNodeTypeText)
-            known.attributes.push_back(name);
-        if (!isLocated && (isCollection || field.nodeType() != QXXMLNodeTypeAttribute))
-            known.children.push_back(name);
-    }
-}
-
-KnownNames namesOf(const Failed& failed) {
-    KnownNames known;
-    const auto* mapping =
+// What the class of the object takes, or that which has the field.
+TakenNames namesOf(const Failed& failed) {
+    const auto* const type =
         failed.classOfObject != nullptr ? failed.classOfObject : failed.classOfField;
-    for (std::size_t i = 0; mapping != nullptr && i < mostAncestors; ++i) {
-        for (const auto& field : mapping->fields())
-            addNames(*field, known);
-        mapping = mapping->extends().isEmpty()
-                      ? nullptr
-                      : failed.mapping->mappingForClassName(mapping->extends());
-    }
-    return known;
-}
-
-// For a name of the document that the mapping does not have, by those that it has.
-String meantFor(const String& written, const std::vector<String>& known) {
-    const std::string nearest(nearestName(written.view(), known));
-    if (nearest.empty())
-        return nullptr;
-    if (withoutPrefix(nearest) == withoutPrefix(written.view()))
-        return "the document says " + quoted(written.view()) + ", the mapping " + quoted(nearest) +
-               ": map the prefix with --prefix";
-    return "did you mean " + quoted(nearest) + "?";
+    const ClassPlan* const plan =
+        type != nullptr ? MappingPlan::of(failed.mapping).planOf(*type) : nullptr;
+    return plan != nullptr ? TakenNames::of(*plan) : TakenNames();
 }
 
 String forUnknown(const Failed& failed, bool isAttribute) {
-    const KnownNames known = namesOf(failed);
-    const String name = failed.places.nameOf(failed.number);
-    if (name.isNull())
-        return nullptr;
-    if (contains(isAttribute ? known.children : known.attributes, name))
-        return "the mapping has " + quoted(name.view()) +
-               (isAttribute ? " as a child element" : " as an attribute");
-    if (contains(isAttribute ? known.attributes : known.children, name))
-        return "the mapping takes only one";
-    return meantFor(name, isAttribute ? known.attributes : known.children);
-}
-
-String nearestClass(const Failed& failed, const String& wanted) {
-    std::vector<String> names;
-    for (const auto& mapping : failed.mapping->mapping()->classMappings())
-        names.push_back(mapping->className());
-    const std::string nearest(nearestName(wanted.view(), names));
-    return nearest.empty() ? String() : String("did you mean class " + quoted(nearest) + "?");
+    const DocumentPlaces& places = failed.places;
+    auto children = isAttribute ? std::vector<String>() : places.childrenOf(failed.number);
+    return suggestionFor({places.nameOf(failed.number), isAttribute, std::move(children)},
+                         namesOf(failed));
 }
 
 String forUnknownCollection(const Failed& failed) {
     constexpr std::string_view words[] = {"array", "vector", "collection", "set"};
     const std::string nearest(
         failed.field != nullptr ? nearestName(failed.field->collection().view(), words) : "");
-    return nearest.empty() ? String() : String("did you mean " + quoted(nearest) + "?");
+    return "did you mean " + quoted(nearest.empty() ? words[0] : nearest) + "?";
 }
 
 // The first that is not there of the classes that the class of the object extends.
@@ -108,7 +50,7 @@ String forMissingAncestor(const Failed& failed) {
     for (std::size_t i = 0; i < mostAncestors && !mapping->extends().isEmpty(); ++i) {
         const auto* const parent = failed.mapping->mappingForClassName(mapping->extends());
         if (parent == nullptr)
-            return nearestClass(failed, mapping->extends());
+            return suggestedClass(*failed.mapping, mapping->extends());
         mapping = parent;
     }
     return nullptr;
@@ -117,20 +59,23 @@ String forMissingAncestor(const Failed& failed) {
 String forUnknownElement(const Failed& failed) {
     if (failed.field == nullptr && failed.classOfObject != nullptr)
         return forMissingAncestor(failed);
-    std::vector<String> names;
-    for (const auto& mapping : failed.mapping->mapping()->classMappings())
-        names.push_back(MappingPlan::elementNameOf(*mapping));
     const String name = failed.places.nameOf(failed.number);
-    return name.isNull() ? String() : meantFor(name, names);
+    return name.isNull() ? String() : suggestedElement(*failed.mapping, name);
 }
 
 // What is there, and no field takes, may be what is missing.
 String forMissing(const Failed& failed) {
-    if (failed.field == nullptr)
+    const FieldPlan* const field =
+        failed.field != nullptr ? MappingPlan::of(failed.mapping).planOf(*failed.field) : nullptr;
+    if (field == nullptr)
         return nullptr;
-    KnownNames wanted;
-    addNames(*failed.field, wanted);
-    const KnownNames known = namesOf(failed);
+    TakenNames wanted = TakenNames::of(*field);
+    TakenNames known = namesOf(failed);
+    const String around = failed.places.nameOf(failed.number);
+    if (TakenNames inside = wanted.in(around); !inside.isEmpty()) { // the wrapper is there
+        wanted = std::move(inside);
+        known = known.in(around);
+    }
     const bool isAttribute = !wanted.attributes.empty() && wanted.children.empty();
     auto there = isAttribute ? failed.places.attributesOf(failed.number)
                              : failed.places.childrenOf(failed.number);
@@ -186,7 +131,8 @@ String suggestionFor(const Failed& failed) {
     case errors::requiredAttributeMissing.code:
         return forMissing(failed);
     case errors::noMappingForClass.code:
-        return failed.field != nullptr ? nearestClass(failed, failed.field->type()) : String();
+        return failed.field != nullptr ? suggestedClass(*failed.mapping, failed.field->type())
+                                       : String();
     case errors::unknownCollectionClass.code:
         return forUnknownCollection(failed);
     case errors::tooManyChildren.code:

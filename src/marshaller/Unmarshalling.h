@@ -84,6 +84,10 @@ public:
         return _collector != nullptr && error != nullptr && *error && mayPassOver() &&
                _collector->take(*error);
     }
+    // Errors are told all at the end, and need no line of the log each.
+    bool isCollecting() const noexcept {
+        return _collector != nullptr && _collector->isCollecting();
+    }
 
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }

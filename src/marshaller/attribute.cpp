@@ -31,7 +31,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
             continue;
         target.bound.attributes.add(binding.name);
         const bool isTaken =
-            takeValue(target.object, field, field.key, reading.document().value(attribute), error);
+            takeValue(target.object, field, field.key, reading.document().value(attribute), error,
+                      !reading.isCollecting());
         if (ReadingTrace* const trace = reading.trace(); trace != nullptr && isTaken) {
             const auto number = static_cast<std::size_t>(&binding - field.bindings.data());
             if (holder != source.element())

@@ -162,7 +162,7 @@ Value readText(Unmarshalling& reading, const FieldPlan& field, const Target& tar
         reading.reports().tellInside(reading.document(), node, &target.object);
     const Value text =
         reading.budget().takeVisits(1, node, error) ? reading.textOf(node, error) : Value();
-    return text.isNull() ? Value() : itemOf(field, text, error);
+    return text.isNull() ? Value() : itemOf(field, text, error, !reading.isCollecting());
 }
 
 } // namespace
@@ -250,8 +250,7 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
             else if (trace != nullptr)
                 trace->forget(shown);
         } else if (error != nullptr && problem) {
-            *error = std::move(problem);
-            return false;
+            return writing.failed(field, i, problem, error);
         }
     }
     return true;

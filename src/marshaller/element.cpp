@@ -90,7 +90,8 @@ bool setElementValue(Unmarshalling& reading, const FieldPlan& field,
         if (Object* object = value.object();
             object != nullptr && !reading.adopt(*object, target.object, error))
             return false;
-        return takeValue(target.object, field, field.key, std::move(value), error);
+        return takeValue(target.object, field, field.key, std::move(value), error,
+                         !reading.isCollecting());
     }
     if (error == nullptr || (!problem && !field.isRequired))
         return true;

@@ -37,7 +37,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
         trace->take(isChild ? ReadingTrace::Form::child : ReadingTrace::Form::text, field, holder,
                     number);
     if (!text.view().empty())
-        return takeValue(target.object, field, field.key, std::move(text), error);
+        return takeValue(target.object, field, field.key, std::move(text), error,
+                         !reading.isCollecting());
     if (field.isRequired)
         return fail(error, errors::requiredTextMissing, field.key.string(),
                     reading.quoted(source.element()));

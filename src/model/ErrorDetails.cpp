@@ -25,6 +25,12 @@ void ErrorDetails::setContext(Error& error, std::unique_ptr<const ErrorContext> 
     of(error)._context = std::move(context);
 }
 
+void ErrorDetails::suggest(Error& error, String suggestion) {
+    const ErrorContext& before = contextOf(error);
+    setContext(error, std::make_unique<KnownContext>(before.source(), before.mapping(),
+                                                     std::move(suggestion)));
+}
+
 void ErrorDetails::setOthers(Error& error, std::vector<Ref<const Error>> others) {
     of(error)._others = std::move(others);
 }

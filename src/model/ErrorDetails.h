@@ -61,6 +61,8 @@ class ErrorDetails {
 public:
     // While nobody else has the error yet.
     static void setContext(Error& error, std::unique_ptr<const ErrorContext> context);
+    // Beside what its context answers so far.
+    static void suggest(Error& error, String suggestion);
     static void setOthers(Error& error, std::vector<Ref<const Error>> others);
     // One that answers nothing where the error has none.
     static const ErrorContext& contextOf(const Error& error);

@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Format.h>
 
 #include "base/Unicode.h"
+#include "base/WhiteSpace.h"
 #include "model/ErrorDetails.h"
 #include "model/Localizer.h"
 
@@ -22,17 +23,10 @@ constexpr std::size_t widestLine = 76;
 constexpr std::size_t mostBefore = 50;
 constexpr std::size_t tabWidth = 4;
 
-std::string oneLine(std::string_view text) {
-    std::string line(text);
-    std::ranges::replace_if(
-        line, [](char c) { return static_cast<unsigned char>(c) < ' ' || c == 0x7F; }, ' ');
-    return line;
-}
-
 Value shortened(const Value& argument) {
     if (!argument.isString() && !argument.isObject())
         return argument;
-    const std::string text = oneLine(argument.description().view());
+    const std::string text = unicode::printable(argument.description().view());
     const std::size_t end = unicode::endOfCharacters(text, longestArgument);
     return end == text.size() ? text : text.substr(0, end) + "...";
 }
@@ -43,7 +37,7 @@ struct Cell {
     std::size_t width;
 };
 
-// The characters of a line as a terminal shows them, with blanks for tabs and controls; `marked`
+// The characters of a line as a terminal shows them, with blanks for tabs; `marked`
 // becomes the cell of that column of the line.
 std::vector<Cell> cellsOf(std::string_view line, std::size_t column, std::size_t& marked) {
     std::vector<Cell> cells;
@@ -52,16 +46,15 @@ std::vector<Cell> cellsOf(std::string_view line, std::size_t column, std::size_t
         if (number == column)
             marked = cells.size();
         const std::size_t size = unicode::endOfCharacters(line, 1);
-        const bool isTab = line.front() == '\t';
-        const bool isControl = static_cast<unsigned char>(line.front()) < ' ';
-        const std::string_view character = line.substr(0, size);
-        if (isTab || isControl) {
-            const std::size_t blanks = isTab ? tabWidth - at % tabWidth : 1;
+        if (line.front() == '\t') {
+            const std::size_t blanks = tabWidth - at % tabWidth;
             cells.insert(cells.end(), blanks, {" ", 1});
             at += blanks;
         } else {
-            cells.push_back({std::string(character), unicode::terminalWidth(character)});
-            at += cells.back().width;
+            std::string character = unicode::printable(line.substr(0, size));
+            const std::size_t width = unicode::terminalWidth(character);
+            cells.push_back({std::move(character), width});
+            at += width;
         }
         line.remove_prefix(size);
         if (number < column)
@@ -95,7 +88,8 @@ std::string marked(const detail::SourcePlace& source, std::string_view before,
 }
 
 std::string written(const DocumentPlace& place) {
-    std::string text = oneLine(place.documentName.isNull() ? "" : place.documentName.view());
+    std::string text =
+        unicode::printable(place.documentName.isNull() ? "" : place.documentName.view());
     if (place.line != 0)
         text += (text.empty() ? "" : ":") + std::to_string(place.line) + ":" +
                 std::to_string(place.column);
@@ -105,7 +99,7 @@ std::string written(const DocumentPlace& place) {
 std::string placeLine(const detail::SourcePlace& source) {
     std::string line = written(source.place);
     if (!source.path.isEmpty())
-        line += (line.empty() ? "" : " ") + oneLine(source.path.view());
+        line += (line.empty() ? "" : " ") + unicode::printable(source.path.view());
     return line.empty() ? line : "\n  at " + line;
 }
 
@@ -114,7 +108,7 @@ std::string mappingLines(const detail::MappingNote& mapping) {
     const auto add = [&line](const char* separator, const char* kind, const String& name) {
         if (!name.isEmpty())
             line += (line.empty() ? "" : separator) + std::string(kind) + " \"" +
-                    oneLine(name.view()) + "\"";
+                    unicode::printable(name.view()) + "\"";
     };
     add(", ", "field", mapping.field);
     add(mapping.field.isEmpty() ? ", " : " of ", "class", mapping.className);
@@ -130,10 +124,10 @@ std::string mappingLines(const detail::MappingNote& mapping) {
 
 String Error::shortDescription() const {
     if (_text == nullptr)
-        return oneLine(_message.view());
+        return unicode::printable(_message.view());
     std::vector<Value> arguments;
     std::ranges::transform(_arguments, std::back_inserter(arguments), shortened);
-    return oneLine(qx::format(localizedText(_text->message), arguments).view());
+    return unicode::printable(qx::format(localizedText(_text->message), arguments).view());
 }
 
 String Error::report(Style style) const {
@@ -146,11 +140,14 @@ String Error::report(Style style) const {
     std::string text;
     text.append(strong).append(shortDescription().view()).append(normal);
     text += placeLine(source);
-    if (!source.excerpt.isNull())
+    if (!source.excerpt.isNull() && !isWhite(source.excerpt.view()))
         text += marked(source, red, normal);
     text += mappingLines(context.mapping());
     if (const String suggestion = context.suggestion(); !suggestion.isEmpty())
-        text.append("\n  ").append(strong).append(oneLine(suggestion.view())).append(normal);
+        text.append("\n  ")
+            .append(strong)
+            .append(unicode::printable(suggestion.view()))
+            .append(normal);
     return text;
 }
 

@@ -67,8 +67,15 @@ bool IncludeLoader::loadInclude(const QXXMLDataRepositoryManager& manager,
     const String& href = includer.includes()[number];
     const bool isCycle =
         std::any_of(_open.begin(), _open.end(), [&](const String* open) { return *open == href; });
-    if (isCycle || _open.size() == deepestInclude || _count == mostIncludes)
-        return fail(error, errors::unableToLoadInclude, href);
+    if (isCycle || _open.size() == deepestInclude || _count == mostIncludes) {
+        fail(error, errors::unableToLoadInclude, href);
+        if (isCycle && error != nullptr) {
+            MappingSource::locate(*error, includer, number);
+            ErrorDetails::suggest(**error, "it is being included already: take out the include "
+                                           "that leads back to it");
+        }
+        return false;
+    }
     ++_count;
     _open.push_back(&href);
     Ref<Error> problem;

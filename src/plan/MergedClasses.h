@@ -53,14 +53,25 @@ public:
 
 private:
     // Positions count from 1; 0 stands for none.
-    using Latest = std::unordered_map<String, std::size_t>;
+    struct Position {
+        std::size_t number = 0;
+        const QXXMLClassMapping* mapping = nullptr;
+    };
+    using Latest = std::unordered_map<String, Position>;
     struct Repeated {
         const QXXMLClassMapping* mapping;
         std::size_t sameClass; // the latest class before it that has its name
         std::size_t sameElement;
+        const QXXMLClassMapping* withClass; // those
+        const QXXMLClassMapping* withElement;
         bool isTold = false; // see tellRepeatedFrom
         std::size_t latest() const noexcept { return std::max(sameClass, sameElement); }
     };
+
+    static std::string written(const DocumentPlace& place) {
+        return (place.documentName.isNull() ? "" : place.documentName.str() + ":") +
+               std::to_string(place.line) + ":" + std::to_string(place.column);
+    }
 
     static bool isRefused(const Repeated& repeated, std::size_t begin, Ref<Error>* error) {
         const QXXMLClassMapping& mapping = *repeated.mapping;
@@ -69,19 +80,26 @@ private:
         else
             fail(error, errors::elementRedefined, MappingPlan::elementNameOf(mapping),
                  mapping.className());
-        if (error != nullptr)
+        if (error != nullptr) {
             MappingSource::of(mapping).locate(*error, MappingSource::elementOf(mapping));
+            const QXXMLClassMapping& first =
+                repeated.sameClass > begin ? *repeated.withClass : *repeated.withElement;
+            ErrorDetails::suggest(**error, "class \"" + first.className().str() + "\" stands at " +
+                                               written(first.place()) + ", too");
+        }
         return false;
     }
 
     void add(const QXXMLClassMapping& mapping) {
         ++_count;
-        const std::size_t sameClass = std::exchange(_byClassName[mapping.className()], _count);
-        const std::size_t sameElement =
-            std::exchange(_byElementName[MappingPlan::elementNameOf(mapping)], _count);
-        if (sameClass == 0 && sameElement == 0)
+        const Position here{_count, &mapping};
+        const Position sameClass = std::exchange(_byClassName[mapping.className()], here);
+        const Position sameElement =
+            std::exchange(_byElementName[MappingPlan::elementNameOf(mapping)], here);
+        if (sameClass.number == 0 && sameElement.number == 0)
             return;
-        _repeated.push_back({&mapping, sameClass, sameElement});
+        _repeated.push_back({&mapping, sameClass.number, sameElement.number, sameClass.mapping,
+                             sameElement.mapping});
         _latestRepeated = std::max(_latestRepeated, _repeated.back().latest());
     }
 

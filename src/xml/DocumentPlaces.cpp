@@ -120,7 +120,10 @@ String DocumentPlaces::pathOf(Number number) const {
 std::size_t DocumentPlaces::beginOf(Number number) const {
     const XMLIndexEntry& entry = (*index())[number];
     const bool isText = entry.nodeKind() == XMLNodeKind::text;
-    if (entry.nodeKind() == XMLNodeKind::element || (isText && !entry.has(XMLIndexEntry::isAside)))
+    if (isText && !entry.has(XMLIndexEntry::isAside))
+        return std::min(index()->text().find_first_not_of(whiteSpace, entry.begin),
+                        index()->text().size());
+    if (entry.nodeKind() == XMLNodeKind::element)
         return entry.begin;
     if (entry.nodeKind() != XMLNodeKind::attribute || entry.has(XMLIndexEntry::isAside))
         return beginOf(_steps[number].parent);

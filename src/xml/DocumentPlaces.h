@@ -25,7 +25,8 @@ public:
     DocumentPlaces& operator=(const DocumentPlaces&) = delete;
 
     const String& documentName() const noexcept { return _documentName; }
-    // Of an element or an attribute; of other entries that of the element around them.
+    // Of an element, an attribute, or a text at its first character that is no white space; of
+    // other entries that of the element around them.
     detail::SourcePlace placeOf(Number number) const;
     // Grows in the order of the document.
     Number orderOf(Number number) const;

@@ -67,6 +67,10 @@ inline constexpr ErrorText expansionTooLarge{
 } // namespace parseErrors
 
 struct ParseFailure {
+    bool isOfEncoding() const noexcept { return code == parseErrors::otherEncoding.code; }
+    // What may help, in a few words of English; null where there is nothing to say.
+    String suggestion() const;
+
     // The offset of a failure that came about where the parser stands.
     static constexpr std::size_t here = static_cast<std::size_t>(-1);
 

@@ -55,10 +55,12 @@ Ref<Error> XMLParser::errorOf(const ParseFailure& failure, std::string_view text
     detail::SourcePlace source;
     source.place.line = place.line();
     source.place.column = place.column();
-    detail::setExcerpt(source, text, failure.offset, origin.added);
+    if (!failure.isOfEncoding()) // what was decoded is not what was meant
+        detail::setExcerpt(source, text, failure.offset, origin.added);
     auto error = make<Error>(*failure.text, failure.arguments, failure.code, Error::parserDomain);
-    detail::ErrorDetails::setContext(*error,
-                                     std::make_unique<detail::KnownContext>(std::move(source)));
+    detail::ErrorDetails::setContext(
+        *error, std::make_unique<detail::KnownContext>(std::move(source), detail::MappingNote(),
+                                                       failure.suggestion()));
     return error;
 }
 

@@ -26,12 +26,25 @@ struct Leg {
     std::string text;
     std::vector<int> parts;
 };
+enum class Way { foot = 1, bike };
 struct Trip {
     int count = 0;
+    Way way{}; // without a name
+    Way back = Way::foot;
     std::string title;
     std::vector<Leg> legs;
     Leg first;
 };
+} // namespace
+
+template <>
+struct qx::EnumNames<Way> {
+    static constexpr auto table =
+        std::to_array<qx::EnumName<Way>>({{Way::foot, "foot"}, {Way::bike, "bike"}});
+};
+
+namespace {
+
 class Guide : public QXMappedObject {
 public:
     std::string name() const { return "Ada"; }
@@ -68,16 +81,37 @@ TEST(DocumentCheck, LeavesTheMarshallersOptionsAsTheyAre) {
     QXXMLDocumentCheck check(marshaller);
     EXPECT_TRUE(check.addData("<a/>", "a.xml"));
     EXPECT_EQ(told(check.findings(), true),
-              "1:1 error unknown-root: No class maps to the root element a, 1 in all\n");
+              "1:1 error unknown-root: No class maps to the root element a, 1 in all -> "
+              "the mapping holds no class\n");
     EXPECT_FALSE(marshaller->isLenient());
     EXPECT_TRUE(marshaller->saveUnknownXML());
+}
+
+TEST(MappingCheck, KnowsARootThatIsNoMapping) {
+    const auto notesOf = [](const char* text) {
+        const auto mapping = QXXMLMarshallingMapping::initWithDocument(support::parsed(text).get(),
+                                                                       {.collectsFaults = true});
+        QXXMLDataRepositoryManager::flushDefaultManager();
+        return told(mapping->check(), true);
+    };
+    EXPECT_EQ(notesOf("<mappings><class name='A'><map-to xml='a'/></class></mappings>"),
+              "1:1 note other-root: The root element is mappings: it is read as a mapping\n");
+    EXPECT_EQ(notesOf("<class name='A'><field name='f'/></class>"),
+              "1:1 warning other-root: The root element is class: it stands for the mapping, and "
+              "has no meaning itself\n"
+              "1:1 warning misplaced-attribute: The attribute name has no meaning on mapping, only "
+              "on class, and is passed over\n"
+              "1:1 warning no-classes: The mapping holds no class\n"
+              "1:17 warning misplaced-element: The element field has no meaning in mapping, only "
+              "in class, and is passed over\n");
 }
 
 TEST(MappingCheck, ComparesTheClassesOfTheProgram) {
     const auto leg =
         qx::Class::define<Leg>("CheckedLeg").members<&Leg::text, &Leg::parts>().registration();
     const auto trip = qx::Class::define<Trip>("CheckedTrip")
-                          .members<&Trip::count, &Trip::title, &Trip::legs, &Trip::first>()
+                          .members<&Trip::count, &Trip::title, &Trip::legs, &Trip::first,
+                                   &Trip::way, &Trip::back>()
                           .registration();
     const auto guide = qx::Class::define<Guide, QXMappedObject>("CheckedGuide")
                            .property<&Guide::name>("name")
@@ -87,7 +121,9 @@ TEST(MappingCheck, ComparesTheClassesOfTheProgram) {
         "<field name='count' type='boolean'><bind-xml name='c' node='attribute'/></field>\n"
         "<field name='titel'><bind-xml name='t' node='attribute'/></field>\n"
         "<field name='legs' type='CheckedLeg' collection='array'><bind-xml name='l'/></field>\n"
-        "<field name='first' type='Other'><bind-xml name='f' node='element'/></field></class>\n"
+        "<field name='first' type='Other'><bind-xml name='f' node='element'/></field>"
+        "<field name='way'><bind-xml name='w' node='attribute'/></field>"
+        "<field name='back'><bind-xml name='b' node='attribute'/></field></class>\n"
         "<class name='CheckedLeg'><field name='text'><bind-xml node='text'/></field>"
         "<field name='parts' type='int'><bind-xml name='p' node='attribute'/></field></class>\n"
         "<class name='Other'/>\n"
@@ -101,6 +137,8 @@ TEST(MappingCheck, ComparesTheClassesOfTheProgram) {
         "5:1 error wrong-property: The property first of the class CheckedTrip of the program "
         "takes "
         "no object of the class Other, but of: CheckedLeg [CheckedTrip.first]\n"
+        "5:77 warning unnamed-value: The property way of the class CheckedTrip of the program "
+        "begins as 0, which has no name to be read by [CheckedTrip.way]\n"
         "6:76 error wrong-property: The property parts of the class CheckedLeg of the program does "
         "not take the field's values [CheckedLeg.parts]\n"
         "8:49 error missing-property: The property name of the class CheckedGuide of the program "

@@ -10,15 +10,17 @@
 //     xml written      what is written
 //     text error       "CODE: message (reason)" of the mapping, of reading or of writing; the
 //                      reason may be left out
-//     text place       where it is: "LINE:COLUMN PATH" in the document, then a line each for
+//     text place       where it is: "LINE:COLUMN PATH" in the document, or the path from the object
+//                      that was to be written, then a line each for
 //                      "by LINE:COLUMN FIELD of CLASS" in the mapping, as far as that is known, and
 //                      for the suggestion
 //
 // What is read is also read into an object that is there.
 //
-// Options are "strict", "discard", "no-namespaces" and "by-namespace" (of the class mappings). Each
-// case runs on records, on host classes and on plain structs; where they differ, a block says for
-// which it is: "records", "hosts", "structs".
+// Options are "strict", "discard", "no-namespaces" and "by-namespace" (of the class mappings), and
+// "given" where nothing is read although the page has shown a document. Each case runs on records,
+// on host classes and on plain structs; where they differ, a block says for which it is: "records",
+// "hosts", "structs".
 
 #include "ObjectKinds.h"
 #include "support/Cases.h"
@@ -119,7 +121,8 @@ inline std::string placeOf(const qx::Error& error, bool isTree) {
     };
     const std::string path = error.path().str();
     const bool isKnown = !isTree || path.find('@') == std::string::npos;
-    std::string text = (isKnown ? told(error.place()) : "?") + " " + path + "\n";
+    const std::string place = isKnown ? told(error.place()) : "?";
+    std::string text = (place != "0:0" ? place + " " : "") + path + "\n";
     if (!error.mappingClass().isNull())
         text += "by " + told(error.mappingPlace()) +
                 (error.mappingField().isNull() ? "" : " " + error.mappingField().str()) + " of " +
@@ -153,7 +156,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
         marshaller->setLenient(!options.contains("strict"));
         marshaller->setSaveUnknownXML(!options.contains("discard"));
         marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
-        const auto source = given.find("document");
+        const auto source = options.contains("given") ? given.end() : given.find("document");
         const bool isRead = source != given.end();
         const auto document =
             isTree && isRead ? qx::XMLDocument::initWithData(source->second) : nullptr;
@@ -186,7 +189,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
     static const support::Words known = {"strict",  "discard", "no-namespaces", "by-namespace",
-                                         "records", "hosts",   "structs"};
+                                         "records", "hosts",   "structs",       "given"};
     for (const std::string& option : expectation.options)
         EXPECT_TRUE(known.contains(option)) << option << " is no option";
     const auto isFor = [&](const char* name) { return expectation.options.contains(name); };

@@ -7,7 +7,8 @@ namespace {
 using kinds::Kind;
 
 const bool added = [] {
-    for (const char* page : {"reading", "writing", "round-trips", "namespaces", "mistakes"})
+    for (const char* page :
+         {"reading", "writing", "round-trips", "namespaces", "mistakes", "unwritable"})
         cases::addPage("tests/marshaller/" + std::string(page) + ".md",
                        {Kind::record, Kind::host, Kind::plain});
     return true;

@@ -50,7 +50,7 @@ TEST(ReportHandler, HearsOfAllThatNoFieldTakes) {
         "child b x1 in title at 3:19 /order/title/b of Order\n"
         "attribute kind x1 in lines at 4:8 /order/lines/@kind of Order\n"
         "item foreign x1 in lines at 4:37 /order/lines/foreign of Order\n"
-        "text - x1 in lines at 4:47 /order/lines/text() of Order\n"
+        "text - x1 in lines at 4:48 /order/lines/text() of Order\n"
         "attribute q x1 in line at 4:23 /order/lines/line/@q of Line\n"
         "attribute id x1 in tag at 5:6 /order/tag/@id of Order\n"
         "item other x1 in things at 6:23 /order/things/other of Order\n"

@@ -203,10 +203,11 @@ TEST_F(MarshallingMapping, TellsWhereAFaultIsAndWhatWasMeant) {
          "  did you mean \"name\" by \"nmae\"?"},
         {"<include href='twice'/>",
          "Class redefined: A\n  at twice:2:3 /mapping/class[2]\n  by twice:2:3\n"
-         "    included by main.xml:1:10"},
+         "    included by main.xml:1:10\n  class \"A\" stands at twice:1:10, too"},
         {"\n<include href='ring'/>",
          "Unable to load included file: ring\n  at ring:1:10 /mapping/include\n  by ring:1:10\n"
-         "    included by main.xml:2:1"},
+         "    included by main.xml:2:1\n"
+         "  it is being included already: take out the include that leads back to it"},
     };
     repository->documents["ring"] = "<include href='ring'/>";
     for (const auto& [content, expected] : cases) {

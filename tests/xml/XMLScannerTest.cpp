@@ -1,7 +1,11 @@
 #include "xml/XMLScanner.h"
 
 #include <algorithm>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
 #include <gtest/gtest.h>
+#include <iostream>
 #include <random>
 
 #include "xml/XMLDocumentContent.h"
@@ -172,6 +176,27 @@ TEST(XMLScanner, AgreesOnChangedDocuments) {
         }
         expectSame(document);
     }
+}
+
+// scripts/conformance names the folder.
+TEST(XMLScanner, AgreesOnTheDocumentsOfAFolder) {
+    const char* const folder = std::getenv("QX_XML_FOLDER");
+    if (folder == nullptr)
+        GTEST_SKIP() << "QX_XML_FOLDER names none";
+    std::size_t scanned = 0, parsed = 0, refused = 0;
+    for (const auto& file : std::filesystem::recursive_directory_iterator(folder)) {
+        if (file.path().extension() != ".xml")
+            continue;
+        const testing::ScopedTrace place(file.path().c_str(), 1, "");
+        std::ifstream stream(file.path(), std::ios::binary);
+        const std::string document(std::istreambuf_iterator<char>(stream), {});
+        expectSame(document);
+        const bool isRead = XMLParser::parseCopy(document, {}, nullptr) != nullptr;
+        ++(!isRead ? refused : isScanned(document) ? scanned : parsed);
+    }
+    std::cout << scanned + parsed + refused << " documents: " << scanned << " read by the scanner, "
+              << parsed << " by the C parser alone, " << refused << " refused by both\n";
+    EXPECT_NE(scanned + parsed + refused, 0U);
 }
 
 } // namespace

@@ -14,4 +14,8 @@ void flushOutput();
 // To a file instead, which is replaced as a whole.
 void save(std::string_view text, const std::string& path);
 
+// A line for people with a blank for each control character, those of 8 bits among them: terminals
+// obey them.
+std::string harmless(std::string line);
+
 } // namespace qxxml

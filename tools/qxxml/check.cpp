@@ -1,6 +1,7 @@
 #include "qxxml/Commands.h"
 #include "qxxml/Failure.h"
 #include "qxxml/Json.h"
+#include "qxxml/Output.h"
 #include "qxxml/Session.h"
 
 #include <QXXMLMarshalling/QXXMLDocumentCheck.h>
@@ -24,10 +25,10 @@ std::string textOf(const QXXMLMappingPlace& place) {
 std::string textOf(const QXXMLFinding& finding) {
     std::string text = finding.description().str();
     if (!finding.className.isNull())
-        text += " [" + finding.className.str() +
-                (finding.fieldName.isNull() ? "" : "." + finding.fieldName.str()) + "]";
+        text += harmless(" [" + finding.className.str() +
+                         (finding.fieldName.isNull() ? "" : "." + finding.fieldName.str()) + "]");
     if (!finding.suggestion.isNull())
-        text += "\n    " + finding.suggestion.str();
+        text += "\n    " + harmless(finding.suggestion.str());
     for (const QXXMLMappingPlace& include : finding.includedFrom)
         text += "\n    " + message("included from %@", textOf(include));
     return text + "\n";

@@ -79,7 +79,8 @@ public:
     std::size_t line() const { return place().line; }
     std::size_t column() const { return place().column; }
     // Such as /orders/order[3]/lines/line[2]/@quantity: a number where several siblings have the
-    // name. Deep ones begin with "...".
+    // name. Of what was to be written the keys that lead to the value from the object, with the
+    // positions of items from 0: lines[1].quantity. Deep ones begin with "...".
     String path() const;
     // What of the mapping it was read or written by: the names of the field and of the class, where
     // that field, or else the class, stands in its mapping document, and the includes that led to
