@@ -16,9 +16,9 @@
 //
 // What is read is also read into an object that is there.
 //
-// Options are "strict", "discard", "no-namespaces" and "by-namespace" (of the class mappings). Each
-// case runs on records, on host classes and on plain structs; where they differ, a block says for
-// which it is: "records", "hosts", "structs".
+// Options are "strict", "discard", "exactly", "no-namespaces" and "by-namespace" (of the class
+// mappings). Each case runs on records, on host classes and on plain structs; where they differ, a
+// block says for which it is: "records", "hosts", "structs".
 
 #include "ObjectKinds.h"
 #include "support/Cases.h"
@@ -152,6 +152,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
         marshaller->setMatchesNamespaces(options.contains("by-namespace"), &error)) {
         marshaller->setLenient(!options.contains("strict"));
         marshaller->setSaveUnknownXML(!options.contains("discard"));
+        marshaller->setKeepsExactly(options.contains("exactly"));
         marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
         const auto source = given.find("document");
         const bool isRead = source != given.end();
@@ -185,8 +186,8 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
-    static const support::Words known = {"strict",  "discard", "no-namespaces", "by-namespace",
-                                         "records", "hosts",   "structs"};
+    static const support::Words known = {"strict",       "discard", "exactly", "no-namespaces",
+                                         "by-namespace", "records", "hosts",   "structs"};
     for (const std::string& option : expectation.options)
         EXPECT_TRUE(known.contains(option)) << option << " is no option";
     const auto isFor = [&](const char* name) { return expectation.options.contains(name); };
