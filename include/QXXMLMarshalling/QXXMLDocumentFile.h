@@ -72,9 +72,10 @@ private:
     QXXMLDocumentFile() = default;
     friend qx::Ref<QXXMLDocumentFile> qx::make<QXXMLDocumentFile>();
 
+    qx::Result<QXXMLUpdate> update(const qx::Ref<qx::Data>& text) const;
     bool write(const qx::String& path, const qx::Ref<qx::Data>& bytes, qx::Ref<qx::Error>* error);
-    bool carryOver(const QXXMLUpdate& update, const qx::Ref<qx::Data>& theirs,
-                   qx::Ref<qx::Error>* error);
+    bool carryOver(const qx::Ref<qx::Data>& text, const QXXMLUpdate& update,
+                   const qx::Ref<qx::Data>& theirs, qx::Ref<qx::Error>* error);
     void setBase(qx::Ref<qx::Data> text);
 
     qx::String _path;

@@ -63,6 +63,8 @@ public:
     // "lines[0].text" for a field of an owner; empty for the root without a field.
     String keyPath(std::uint32_t owner, const FieldPlan* field) const;
 
+    // About how many uses there will be.
+    void reserve(std::size_t uses) { _uses.reserve(uses); }
     // What the reading calls. The object that is entered was made of the use that came last.
     void enter(const ClassPlan& plan, Number element, const Object& object);
     void leave();

@@ -30,9 +30,8 @@ std::string reference(char32_t c) {
 
 NewXML::NewXML(const SourceLayout& layout, const WritingTrace& shown, TextEncoder* encoder)
     : _layout(layout), _shown(shown), _encoder(encoder) {
-    for (WritingTrace::Number at = 0; at < shown.size(); ++at)
-        if (shown.keptOf(at) != nullptr)
-            _objects[shown[at].element].push_back(at);
+    shown.forEachKeeping(
+        [&](WritingTrace::Number at) { _objects[shown[at].element].push_back(at); });
 }
 
 std::string NewXML::escaped(std::string_view value, std::string_view special, char quote) const {

@@ -19,6 +19,8 @@ QXXMLDocumentFile::~QXXMLDocumentFile() = default;
 Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMarshaller> marshaller,
                                                Ref<Error>* error) {
     qx::detail::reset(error);
+    if (!marshaller)
+        marshaller = QXXMLMarshaller::initWithMapping(nullptr);
     auto text = qx::readFile(path, error);
     if (!text)
         return nullptr;
@@ -47,10 +49,17 @@ void QXXMLDocumentFile::setBase(Ref<Data> text) {
         _undoManager->setSavedMark();
 }
 
+// Code of the host's may let go of the file while the object is read, or save it.
+qx::Result<QXXMLUpdate> QXXMLDocumentFile::update(const Ref<Data>& text) const {
+    const Ref<const QXXMLDocumentFile> kept(this);
+    return QXXMLUpdate::updatedText(*_marshaller, *text, _root);
+}
+
 bool QXXMLDocumentFile::isEdited() const {
     if (_undoManager)
         return !_undoManager->isAtSavedMark();
-    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    const Ref<Data> text = _text;
+    const auto update = this->update(text);
     return !update || !update->edits().empty();
 }
 
@@ -63,7 +72,9 @@ bool QXXMLDocumentFile::write(const String& path, const Ref<Data>& bytes, Ref<Er
 
 bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     qx::detail::reset(error);
-    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    const Ref<QXXMLDocumentFile> kept(this);
+    const Ref<Data> text = _text;
+    const auto update = this->update(text);
     if (!update) {
         if (error != nullptr)
             *error = update.error();
@@ -72,13 +83,13 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     const auto theirs = qx::readFile(_path, error);
     if (!theirs)
         return false;
-    const bool isSame = theirs->view() == _text->view();
+    const bool isSame = theirs->view() == text->view();
     if (!isSame && changed == Changed::refuse)
         return qx::fail(error, qx::errors::fileHasChanged, _path);
     if (!isSame && changed == Changed::carryOver)
-        return carryOver(*update, theirs, error);
+        return carryOver(text, *update, theirs, error);
     if (isSame && update->edits().empty()) {
-        setBase(_text);
+        setBase(text);
         return true;
     }
     return write(_path, update->bytes(), error);
@@ -86,17 +97,21 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
 
 bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
     qx::detail::reset(error);
-    const auto update = QXXMLUpdate::updatedText(*_marshaller, *_text, _root);
+    const Ref<QXXMLDocumentFile> kept(this);
+    const Ref<Data> text = _text;
+    const String to = path; // which may be the file's own
+    const auto update = this->update(text);
     if (!update && error != nullptr)
         *error = update.error();
-    if (!update || !write(path, update->bytes(), error))
+    if (!update || !write(to, update->bytes(), error))
         return false;
-    _path = path;
+    _path = to;
     return true;
 }
 
 bool QXXMLDocumentFile::revert(Ref<Error>* error) {
     qx::detail::reset(error);
+    const Ref<QXXMLDocumentFile> kept(this);
     auto text = qx::readFile(_path, error);
     if (!text || !_marshaller->readStringInto(_root, *text, error))
         return false;
@@ -106,10 +121,10 @@ bool QXXMLDocumentFile::revert(Ref<Error>* error) {
 
 // The merged text is read before anything is written: a text that was carried to a wrong place may
 // be none.
-bool QXXMLDocumentFile::carryOver(const QXXMLUpdate& update, const Ref<Data>& theirs,
-                                  Ref<Error>* error) {
+bool QXXMLDocumentFile::carryOver(const Ref<Data>& text, const QXXMLUpdate& update,
+                                  const Ref<Data>& theirs, Ref<Error>* error) {
     const auto options = qx::detail::parsingOf(*_marshaller);
-    const auto base = qx::XMLParser::parse(_text, options, error);
+    const auto base = qx::XMLParser::parse(text, options, error);
     const auto now = base ? qx::XMLParser::parse(theirs, options, error) : nullptr;
     if (!now)
         return false;

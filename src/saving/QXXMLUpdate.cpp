@@ -2,6 +2,7 @@
 
 #include "files/AtomicWrite.h"
 #include "files/Files.h"
+#include "model/Errors.h"
 #include "saving/DocumentUpdate.h"
 
 using qx::Error;
@@ -20,8 +21,13 @@ Result<QXXMLUpdate> QXXMLUpdate::updateFile(QXXMLMarshaller& marshaller, const q
     if (!original)
         return error;
     auto update = updatedText(marshaller, *original, object);
-    const bool isToBeWritten = update && !update->edits().empty();
-    if (isToBeWritten && !qx::writeFileAtomically(path, update->bytes()->view(), &error))
+    if (!update || update->edits().empty())
+        return update;
+    const auto now = qx::readFile(path, &error);
+    const bool isSame = now && now->view() == original->view();
+    if (now && !isSame)
+        qx::fail(&error, qx::errors::fileHasChanged, path);
+    if (!isSame || !qx::writeFileAtomically(path, update->bytes()->view(), &error))
         return error;
     return update;
 }

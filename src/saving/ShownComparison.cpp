@@ -15,6 +15,8 @@ ShownComparison::Shown ShownComparison::firstDifference() {
 ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
     const auto& is = _wanted[wanted];
     const auto& other = _found[found];
+    if (is.hash == other.hash)
+        return none;
     if (is.kind != other.kind)
         return wanted;
     if (is.kind == Kind::text)
@@ -61,7 +63,9 @@ bool ShownComparison::keepTheSame(Shown wanted, Shown found) const {
     return true;
 }
 
-void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) {
+void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) const {
+    if (!_wanted.hidesSome())
+        return;
     // Both show the same, but for hidden values, which stand one in a field.
     Shown b = 0;
     for (Shown a = 0; a < _wanted.size() && b < _found.size(); ++a, ++b) {

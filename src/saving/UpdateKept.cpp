@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace qx::detail {
 
@@ -62,12 +63,13 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
     };
     const ListMatching matching = match(itemsOf(was.children), itemsOf(is.children));
     std::vector<bool> isThere(was.children.size());
+    const Place end = placeInside(context.entry);
     for (std::size_t i = 0; i < is.children.size(); ++i) {
         const std::string& text = is.children[i].text;
         const std::size_t before = matching.was[i];
         if (before == ListMatching::none) {
             if (!_source.writer.isTaken(plan, text))
-                insertChild(text, placeInside(context.entry), context.after);
+                insertChild(text, end, context.after);
             continue;
         }
         isThere[before] = true;
@@ -91,14 +93,17 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
 void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
                                        const WritingTrace::KeptList& is) {
     const std::vector<Entry> entries = entriesOfKept(context, was.attributes);
-    std::unordered_map<String, const Kept*> now;
-    for (const Kept& each : is.attributes)
-        now.emplace(each.node->name(), &each);
+    std::unordered_map<String, std::vector<const Kept*>> now; // those of wrappers may share a name
+    for (auto each = is.attributes.rbegin(); each != is.attributes.rend(); ++each)
+        now[each->node->name()].push_back(&*each);
+    std::unordered_set<const Kept*> known;
     for (std::size_t i = 0; i < was.attributes.size(); ++i) {
-        const auto found = now.find(was.attributes[i].node->name());
-        const Kept* const kept = found != now.end() ? found->second : nullptr;
-        if (found != now.end())
-            now.erase(found);
+        auto& named = now[was.attributes[i].node->name()];
+        const Kept* const kept = !named.empty() ? named.back() : nullptr;
+        if (kept != nullptr) {
+            named.pop_back();
+            known.insert(kept);
+        }
         if (kept != nullptr && kept->text == was.attributes[i].text)
             continue;
         if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
@@ -113,13 +118,15 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
             add(blanksBefore(spot.begin), spot.end, {}, context.after);
     }
     const SourceMarkup::Spot& tag = _source.markup[context.entry];
+    if (known.size() == is.attributes.size())
+        return;
     if (!tag.isPlaced())
-        return now.empty() ? void() : fail(context.after);
+        return fail(context.after);
     const auto nameEnd =
         tag.begin + 1 +
         static_cast<SourceMarkup::Offset>(_source.document.writtenName(context.entry).size());
     for (const Kept& each : is.attributes)
-        if (now.contains(each.node->name()))
+        if (!known.contains(&each))
             add(nameEnd, nameEnd,
                 _source.writer.attribute(each.node->name().view(), each.node->stringValue().view()),
                 context.after);

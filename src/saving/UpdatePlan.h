@@ -100,8 +100,9 @@ private:
     struct List;
     void compareList(const Context& context, Shown before, Shown after, std::size_t ordinal);
     bool findEntries(const Context& context, List& list) const;
-    void findKeys(std::vector<ListItem>& before, std::vector<ListItem>& now,
-                  const List& list) const;
+    bool findObjects(List& list) const;
+    const Object* objectOf(std::uint32_t number) const;
+    ListKeys keysOf(const List& list) const;
     std::size_t likeness(Shown was, Shown is) const;
     void arrangeList(const Context& context, const List& list, std::size_t ordinal);
     void fillList(const Context& context, const List& list, std::size_t ordinal);
