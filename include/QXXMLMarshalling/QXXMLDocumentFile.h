@@ -8,6 +8,8 @@
 //     if (file->isEdited() && !file->save(&error)) report(*error);
 //
 // It holds the text as it was read or saved last: edits are what the object differs in from that.
+// Its readings keep unknown XML exactly (QXXMLMarshaller::setKeepsExactly), whatever the marshaller
+// does otherwise.
 // The object is the program's to change; one thread uses both, as with the marshaller.
 
 #include <QXXMLMarshalling/QXXMLUpdate.h>

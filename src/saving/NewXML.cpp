@@ -244,7 +244,7 @@ bool NewXML::appendContent(const XMLDraft::Element& element, const Around& aroun
         for (const auto& kept : _shown.keptOf(object)->children)
             if (!isTaken(_shown[object].plan, kept.text)) {
                 startLine();
-                output += kept.text;
+                output += markup(kept.text);
             }
     return isOnLines;
 }

@@ -14,6 +14,27 @@ using qx::Error;
 using qx::Ref;
 using qx::String;
 
+namespace {
+
+// What a field took, too, would grow old in the object while its value is edited: the file's
+// readings keep exactly.
+class ExactKeeping {
+public:
+    explicit ExactKeeping(Ref<QXXMLMarshaller> marshaller)
+        : _marshaller(std::move(marshaller)), _was(_marshaller->keepsExactly()) {
+        _marshaller->setKeepsExactly(true);
+    }
+    ~ExactKeeping() { _marshaller->setKeepsExactly(_was); }
+    ExactKeeping(const ExactKeeping&) = delete;
+    ExactKeeping& operator=(const ExactKeeping&) = delete;
+
+private:
+    const Ref<QXXMLMarshaller> _marshaller;
+    const bool _was;
+};
+
+} // namespace
+
 QXXMLDocumentFile::~QXXMLDocumentFile() = default;
 
 Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMarshaller> marshaller,
@@ -25,6 +46,7 @@ Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMars
     if (!text)
         return nullptr;
     Ref<Error> problem;
+    const ExactKeeping exact(marshaller);
     auto root = marshaller->readString(*text, &problem);
     if (problem || !root) {
         if (error != nullptr)
@@ -52,6 +74,7 @@ void QXXMLDocumentFile::setBase(Ref<Data> text) {
 // Code of the host's may let go of the file while the object is read, or save it.
 qx::Result<QXXMLUpdate> QXXMLDocumentFile::update(const Ref<Data>& text) const {
     const Ref<const QXXMLDocumentFile> kept(this);
+    const ExactKeeping exact(_marshaller);
     return QXXMLUpdate::updatedText(*_marshaller, *text, _root);
 }
 
@@ -112,6 +135,7 @@ bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
 bool QXXMLDocumentFile::revert(Ref<Error>* error) {
     qx::detail::reset(error);
     const Ref<QXXMLDocumentFile> kept(this);
+    const ExactKeeping exact(_marshaller);
     auto text = qx::readFile(_path, error);
     if (!text || !_marshaller->readStringInto(_root, *text, error))
         return false;
@@ -123,6 +147,7 @@ bool QXXMLDocumentFile::revert(Ref<Error>* error) {
 // be none.
 bool QXXMLDocumentFile::carryOver(const Ref<Data>& text, const QXXMLUpdate& update,
                                   const Ref<Data>& theirs, Ref<Error>* error) {
+    const ExactKeeping exact(_marshaller);
     const auto options = qx::detail::parsingOf(*_marshaller);
     const auto base = qx::XMLParser::parse(text, options, error);
     const auto now = base ? qx::XMLParser::parse(theirs, options, error) : nullptr;

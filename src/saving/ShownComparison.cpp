@@ -25,6 +25,7 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
         return wanted;
     if (is.kind == Kind::object && !keepTheSame(wanted, found))
         return wanted;
+    const bool isOfOtherForm = is.kind == Kind::field && is.isList != other.isList;
     Shown a = wanted + 1, b = found + 1;
     while (true) {
         while (a < is.next && _wanted[a].isHidden)
@@ -33,6 +34,8 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
             b = _found[b].next;
         if (a >= is.next || b >= other.next)
             return a >= is.next && b >= other.next ? none : wanted;
+        if (isOfOtherForm)
+            return wanted;
         if (const Shown different = compare(a, b); different != none)
             return different;
         a = _wanted[a].next;
@@ -72,7 +75,7 @@ void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) co
         const bool isHidden = _wanted[a].isHidden;
         const bool isOther = _found[b].isHidden;
         if (isHidden && isOther) {
-            if (_wanted[a].kind != _found[b].kind || _wanted.text(a) != _found.text(b))
+            if (_wanted[a].kind != _found[b].kind || _wanted[a].hash != _found[b].hash)
                 visit(a);
             a = _wanted[a].next - 1;
             b = _found[b].next - 1;

@@ -26,10 +26,31 @@ void UpdatePlan::compareKept(const Context& context) {
     const auto* after = _source.after.keptOf(context.after);
     const WritingTrace::KeptList& was = before != nullptr ? *before : nothing;
     const WritingTrace::KeptList& is = after != nullptr ? *after : nothing;
-    if (!areEqual(was.children, is.children))
+    if (!areEqual(was.children, is.children)) {
+        countDoubles(*_source.after[context.after].plan, was.children, is.children);
         compareKeptChildren(context, was, is);
-    if (!areEqual(was.attributes, is.attributes))
+    }
+    if (!areEqual(was.attributes, is.attributes)) {
+        countDoubles(*_source.after[context.after].plan, was.attributes, is.attributes);
         compareKeptAttributes(context, was, is);
+    }
+}
+
+// What a field took, too, is as old in the object as the object's reading. Where there are as many
+// of its name in both, it stands in the same place.
+void UpdatePlan::countDoubles(const ClassPlan& plan, const std::vector<Kept>& was,
+                              const std::vector<Kept>& is) {
+    std::unordered_map<String, std::vector<const Kept*>> before, now;
+    for (const Kept& each : was)
+        before[each.node->name()].push_back(&each);
+    for (const Kept& each : is)
+        now[each.node->name()].push_back(&each);
+    for (const auto& [name, named] : before) {
+        const auto& same = now[name];
+        for (std::size_t i = 0; i < named.size() && same.size() == named.size(); ++i)
+            if (_source.writer.isTaken(&plan, named[i]->text))
+                _source.writer.countAsTaken(&plan, same[i]->text);
+    }
 }
 
 // The object lists them by name, each name's in the order of the document.
@@ -69,7 +90,7 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
         const std::size_t before = matching.was[i];
         if (before == ListMatching::none) {
             if (!_source.writer.isTaken(plan, text))
-                insertChild(text, end, context.after);
+                insertChild(_source.writer.markup(text), end, context.after);
             continue;
         }
         isThere[before] = true;
@@ -79,7 +100,8 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
         const Entry entry = entries[before];
         if (entry == none || !_source.markup[entry].isPlaced())
             return fail(context.after);
-        add(_source.markup[entry].begin, _source.markup[entry].end, text, context.after);
+        add(_source.markup[entry].begin, _source.markup[entry].end, _source.writer.markup(text),
+            context.after);
     }
     for (std::size_t i = 0; i < isThere.size(); ++i) {
         if (isThere[i] || _source.writer.isTaken(plan, was.children[i].text))
@@ -104,7 +126,9 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
             named.pop_back();
             known.insert(kept);
         }
-        if (kept != nullptr && kept->text == was.attributes[i].text)
+        const bool isDouble =
+            _source.writer.isTaken(_source.after[context.after].plan, was.attributes[i].text);
+        if (isDouble || (kept != nullptr && kept->text == was.attributes[i].text))
             continue;
         if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
             return fail(context.after);

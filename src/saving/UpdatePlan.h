@@ -75,7 +75,7 @@ private:
         Entry first = none, last = none;
     };
     struct Place {
-        SourceMarkup::Offset at = 0;
+        SourceMarkup::Offset at = 0;     // none where there is no place
         std::optional<std::string> line; // starts what is new there
         Entry opened = none;             // what is new is all that stands in this element
     };
@@ -152,6 +152,8 @@ private:
 
     // UpdateKept.cpp
     void compareKept(const Context& context);
+    void countDoubles(const ClassPlan& plan, const std::vector<WritingTrace::Kept>& was,
+                      const std::vector<WritingTrace::Kept>& is);
     void compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
                              const WritingTrace::KeptList& is);
     void compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
