@@ -108,9 +108,7 @@ public:
     const ClassPlan* currentClass() const noexcept {
         return _frame != nullptr ? _frame->plan : nullptr;
     }
-    const Reporting& reports() const noexcept {
-        return _isQuiet ? _silent : _reports;
-    }
+    const Reporting& reports() const noexcept { return _isQuiet ? _silent : _reports; }
     // An argument of an error: the node as it is quoted.
     auto quoted(Number node) {
         return [this, node] { return _document.quoted(node); };
