@@ -8,6 +8,8 @@
 //     if (file->isEdited() && !file->save(&error)) report(*error);
 //
 // It holds the text as it was read or saved last: edits are what the object differs in from that.
+// Its readings keep unknown XML exactly (QXXMLMarshaller::setKeepsExactly), whatever the marshaller
+// does otherwise.
 // The object is the program's to change; one thread uses both, as with the marshaller.
 
 #include <QXXMLMarshalling/QXXMLUpdate.h>
@@ -72,9 +74,10 @@ private:
     QXXMLDocumentFile() = default;
     friend qx::Ref<QXXMLDocumentFile> qx::make<QXXMLDocumentFile>();
 
+    qx::Result<QXXMLUpdate> update(const qx::Ref<qx::Data>& text) const;
     bool write(const qx::String& path, const qx::Ref<qx::Data>& bytes, qx::Ref<qx::Error>* error);
-    bool carryOver(const QXXMLUpdate& update, const qx::Ref<qx::Data>& theirs,
-                   qx::Ref<qx::Error>* error);
+    bool carryOver(const qx::Ref<qx::Data>& text, const QXXMLUpdate& update,
+                   const qx::Ref<qx::Data>& theirs, qx::Ref<qx::Error>* error);
     void setBase(qx::Ref<qx::Data> text);
 
     qx::String _path;

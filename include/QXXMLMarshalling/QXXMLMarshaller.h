@@ -18,10 +18,9 @@
 //
 // An error slot must hold null when it is passed in; a failure fills it only when it was passed.
 // One thread uses a marshaller at a time; marshallers may share a resolved mapping. What C++
-// setters of host classes throw passes through every operation here. They may use the marshaller,
-// the document and its nodes while they are called by a reading. Whether the fields that follow
-// find what was taken out of the document or added to it is not said, and a list that is being
-// filled stays as it was found. Getters may let go of the marshaller and of what is being written.
+// setters of host classes throw passes through. They may use the marshaller, the document and its
+// nodes. Whether fields that follow find what they changed in the document is not said; a list
+// that is being filled stays as it was found. Getters may let go of what is being written.
 
 #include <QXXMLMarshalling/QXXMLFieldValues.h>
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
@@ -51,7 +50,7 @@ class Reporting;
 
 class QX_API QXXMLMarshaller : public qx::Object {
 public:
-    // Never fails; a null mapping counts as one that holds no class.
+    // Never fails; a null mapping holds no class.
     static qx::Ref<QXXMLMarshaller> initWithMapping(qx::Ref<QXXMLMarshallingMapping> mapping,
                                                     qx::Ref<qx::Error>* error = nullptr);
     // Null with the error of QXXMLMarshallingMapping::initWithDocument, which raises where the user
@@ -72,7 +71,7 @@ public:
     // open; made on the first call, then always the same.
     const qx::Ref<qx::UndoManager>& undoManager();
 
-    // Options, all true at first; each operation reads them when it runs.
+    // Options, true at first unless it says otherwise; each operation reads them when it runs.
     //
     // Lenient: unmarshalling passes over XML that the mapping does not describe.
     bool isLenient() const noexcept { return _lenient; }
@@ -82,13 +81,20 @@ public:
     // (QXUnknownXML.h brings them) keeps nothing of it, and the log says so, once for each class.
     bool saveUnknownXML() const noexcept { return _saveUnknownXML; }
     void setSaveUnknownXML(bool save) noexcept { _saveUnknownXML = save; }
+    // Of unknown XML only what no field took is kept, also what stands in wrappers; the object that
+    // the element is of keeps it, not one flattened into it. It is written where it stood: behind
+    // what the field writes that took the element before it, or behind as many of its items; at the
+    // start, if none was taken. A field with the element's text takes child elements with text, the
+    // others come behind it. Nodes know their places: one thread at a time reads a tree. Single
+    // steps that bind fields keep by name. False at first.
+    bool keepsExactly() const noexcept { return _keepsExactly; }
+    void setKeepsExactly(bool exactly) noexcept { _keepsExactly = exactly; }
     // Marshalling declares the namespaces of class mappings, and those that were read, which an
     // object keeps under the key "__namespaces".
     bool isUsingNamespaceURIs() const noexcept { return _usingNamespaceURIs; }
     void setUsingNamespaceURIs(bool use) noexcept { _usingNamespaceURIs = use; }
-    // Marshalling leaves out attributes that are not required and whose value is zero, false or
-    // empty; numbers are cut to integers first. Members of plain structs and std::optional members
-    // that hold a value are always written.
+    // Marshalling leaves out attributes that are not required and zero, false or empty; numbers are
+    // cut to integers first. Members of plain structs and std::optionals with a value are written.
     bool omitsZeroAttributes() const noexcept { return _omitsZeroAttributes; }
     void setOmitsZeroAttributes(bool omit) noexcept { _omitsZeroAttributes = omit; }
     // Names in documents are matched as they are written, prefix included. With a table from the
@@ -96,9 +102,8 @@ public:
     // in a namespace of the table has, for the mapping, the prefix that stands there, whatever the
     // document has for it; an empty one for names without. What is in another namespace, or in
     // none, does not match by a prefix of the table. Nothing is renamed in the document, in what is
-    // kept of it, or in messages. What is written has the prefixes that stand for the namespaces
-    // there, and declarations of those that are missing. Empty at first, then nothing of this is
-    // done. False, and all is left as it was, with
+    // kept of it, or in messages. What is written has the prefixes of the namespaces there, and
+    // declarations that are missing. Empty at first. False, and all is left as it was, with
     //   -225  "%@ cannot be the prefix of the namespace: %@"
     //   -225  "The prefix: %@ would stand for two namespaces: %@ and: %@"
     // Without a slot an error is logged.
@@ -110,8 +115,8 @@ public:
     //   -225  "The namespace: %@ would have two prefixes: %@ and: %@"
     bool matchesNamespaces() const noexcept { return _matchesNamespaces; }
     bool setMatchesNamespaces(bool matches, qx::Ref<qx::Error>* error = nullptr);
-    // How deep objects may nest, in both directions; 256 at first, 2,048 at most (more counts as
-    // that many). A level takes about a kilobyte of the thread's stack. Deeper objects end in
+    // How deep objects may nest, in both directions; 256 at first, 2,048 at most (more counts so).
+    // A level takes about a kilobyte of the thread's stack. Deeper objects end in
     //   -223  "Objects nest deeper than the limit of %@: %@"   (the limit, the class)
     std::size_t maximumDepth() const noexcept { return _maximumDepth; }
     void setMaximumDepth(std::size_t depth) noexcept {
@@ -127,8 +132,8 @@ public:
         std::size_t base;
         std::size_t perElement;
     };
-    // The objects that it makes; 10,000 and 16 at first. To make them it goes over at most 16 times
-    // as many nodes, and 64 times as many as there are.
+    // Objects; 10,000 and 16 at first. To make them it goes over at most 16 times as many nodes,
+    // and 64 times as many as there are.
     Limit maximumObjects() const noexcept { return _maximumObjects; }
     void setMaximumObjects(Limit limit) noexcept { _maximumObjects = limit; }
     // The unknown XML that objects keep, and the nodes that are copied for that; 10,000 and 64.
@@ -136,13 +141,11 @@ public:
     void setMaximumKeptNodes(Limit limit) noexcept { _maximumKeptNodes = limit; }
 
     // How readFile(), readString(), readStream() and unmarshallEach() parse. A document may nest at
-    // least as deep as its objects may, whatever the options say. Other operations that parse
-    // have options of their own.
+    // least as deep as its objects may, whatever the options say.
     const qx::XMLParseOptions& parseOptions() const noexcept { return _parseOptions; }
     void setParseOptions(const qx::XMLParseOptions& options) { _parseOptions = options; }
-    // Called with the bytes that have been gone over, about once a megabyte, while a text, a file
-    // or a stream is read, between two objects; `size` is 0 where it is not known. An answer of
-    // false ends the reading in
+    // Called about once a megabyte, between two objects, while a text, a file or a stream is read;
+    // `size` is 0 where it is not known. An answer of false ends the reading in
     //   -226  "The reading was cancelled"
     // It may use the marshaller as setters may, and replace the handler. Null for none.
     struct Progress {
@@ -152,16 +155,14 @@ public:
     using ProgressHandler = qx::detail::UniqueFunction<bool(const Progress&)>;
     void setProgressHandler(ProgressHandler handler);
 
-    // What reading and writing pass over is told to the handler, and no more logged: unbound
-    // children and attributes above all. It may do what the handler above may; another one that it
-    // sets is told from the next call on. Null for none.
+    // What reading and writing pass over, unbound XML above all, is told to the handler and not
+    // logged. It may do what the handler above may; one that it sets is told from the next call on.
+    // Null for none.
     void setReportHandler(QXXMLReport::Handler handler);
-    // How many errors a reading with a slot collects before it ends, 1 at first. More than one
-    // leave out the field or item that fails; the call answers null all the same, the error is the
-    // first in the document, and all() lists them. What ends a reading at once (-224, -226) still
-    // does, and single steps end at their first error. Of -221 no line is logged for each then.
-    // What keeps the partial object hands it out, too, and reads on to the end, for all calls that
-    // answer neither a Result nor a reload.
+    // How many errors a reading with a slot collects before it ends, 1 at first; single steps end
+    // at the first. Fields and items that fail are left out, and not logged; the answer is null all
+    // the same, the error is the first in the document, and all() lists them. -224 and -226 end it
+    // at once. Who keeps the partial object gets that, too, but for Results and reloads.
     std::size_t maximumErrors() const noexcept { return _maximumErrors; }
     void setMaximumErrors(std::size_t count) noexcept { _maximumErrors = count; }
     bool keepsPartial() const noexcept { return _keepsPartial; }
@@ -227,9 +228,9 @@ public:
     //     marshaller->unmarshallEach("orders.xml", "order", [](qx::Ref<qx::Object> order) { … });
     //     marshaller->unmarshallEach<Order>(stream, "order", [](Order order) { … }, &error);
     //
-    // Each object has an undo group of its own. The limits of parsing and reading count anew in
-    // each piece, of some 256 KB and whole elements, that is read. The document may be of any size,
-    // one element of that name (where names are matched by namespace, of that local name) of 2 GB.
+    // Each object has an undo group of its own. The limits count anew in each piece that is read,
+    // of some 256 KB and whole elements. The document may be of any size, one element of that name
+    // (where names are matched by namespace, of that local name) of 2 GB.
     template <class T = qx::Object, class Source, class Visit>
     bool unmarshallEach(Source&& source, const qx::String& elementName, Visit visit,
                         qx::Ref<qx::Error>* error = nullptr) {
@@ -242,7 +243,6 @@ public:
     // Read into an object that is there, so that it equals what the operations above would make of
     // the document: a reload. It is a plain struct that was described, an object, or a Ref to one.
     // True when it was done; the slot is set to null first.
-    //
     // - What the mapping has a field for is set, to what a new object has where the document does
     //   not say; what it has none for stays. Unknown XML that was kept gives way to the document's.
     // - Objects that it holds, and structs behind pointers, stay and are read into where the
@@ -250,8 +250,8 @@ public:
     //   Structs in objects that have an undo manager are replaced. While setters are called inside
     //   a list, a pointer or an optional of a struct, that member is empty; what they put there
     //   goes.
-    // - Observers hear of the keys whose values differ, and of those that hold structs. For an
-    //   object with an undo manager it is one group, which covers the objects that it holds, too.
+    // - Observers hear of the keys whose values differ, and of those that hold structs. An object
+    //   with an undo manager has one group, for the objects that it holds, too.
     //
     // The document is read into a new object first, which registers no undo: whatever fails there
     // leaves yours as it was, with the errors above or with
@@ -373,13 +373,11 @@ public:
     // by field costs more than binding them all. One that is told that the object is flattened
     // takes the children that it binds out of the element.
     //
-    // The object for the node's element name. Null for a node that no class maps to, with an error
-    // only from a marshaller that is not lenient:
+    // The object for the node's element name. Null where no class maps to it, if not lenient with
     //   -211  "No definition to handle element: %@"
     qx::Ref<qx::Object> unmarshallElement(qx::XMLNode* element,
                                           qx::Ref<qx::Error>* error = nullptr);
-    // The object of that class, whatever the element is called. Null for a null element, and when
-    // the slot holds an error already.
+    // The object of that class. Null for a null element, and when the slot holds an error already.
     qx::Ref<qx::Object> buildClassWithMapping(const QXXMLClassMapping& mapping,
                                               qx::XMLElement* element, bool isFlattened,
                                               qx::Ref<qx::Error>* error = nullptr);
@@ -484,6 +482,7 @@ private:
 
     qx::Ref<QXXMLMarshallingMapping> _mapping;
     bool _saveUnknownXML = true;
+    bool _keepsExactly = false;
     bool _lenient = true;
     bool _usingNamespaceURIs = true;
     bool _omitsZeroAttributes = true;

@@ -14,7 +14,8 @@ namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()),
-      _plan(MappingPlan::of(_mapping.get())), _output(draft), _reports(marshaller) {
+      _plan(MappingPlan::of(_mapping.get())), _output(draft),
+      _keepsExactly(marshaller.keepsExactly()), _reports(marshaller) {
     if (auto table = NamespaceMatching::keptOf(marshaller);
         table != nullptr && marshaller.isUsingNamespaceURIs())
         _names = std::make_unique<OutputNames>(std::move(table));
@@ -67,7 +68,7 @@ WrittenElement Marshalling::element(const ClassPlan& plan, const String& name, c
     if (_marshaller->isUsingNamespaceURIs() && !mapping.nsURI().isEmpty())
         _output.addDeclaration(element, mapping.nsPrefix().isNull() ? noPrefix : mapping.nsPrefix(),
                                mapping.nsURI());
-    if (!writeFields(plan, element, *object.object(), error))
+    if (!writeObject(plan, element, *object.object(), error))
         return {};
     return element;
 }
@@ -127,6 +128,51 @@ void Marshalling::addAttribute(const WrittenElement& element, const String& name
     if (written.declaration)
         declare(element, *written.declaration);
     _output.addAttribute(element, written.text, text);
+}
+
+bool Marshalling::writeObjectExactly(const ClassPlan& plan, const WrittenElement& element,
+                                     Object& object, ErrorSlot error) {
+    std::unique_ptr<KeptPlacing> placing;
+    if (_marshaller->saveUnknownXML() && _access.mayKeepXML(object))
+        placing = std::make_unique<KeptPlacing>(_output, _access.getKept(object, KeptXML::children),
+                                                _access.getKept(object, KeptXML::attributes));
+    const bool isEmpty = !placing || placing->isEmpty();
+    struct Scope {
+        Marshalling& writing;
+        KeptPlacing* placing;
+        const Object* placed;
+        ~Scope() {
+            writing._placing = placing;
+            writing._placed = placed;
+        }
+    } const scope{*this, _placing, _placed};
+    _placing = isEmpty ? nullptr : placing.get();
+    _placed = isEmpty ? nullptr : &object;
+    if (_placing != nullptr)
+        _placing->start(element);
+    if (!writeFields(plan, element, object, error))
+        return false;
+    if (_placing != nullptr)
+        _placing->finish(element);
+    return true;
+}
+
+void Marshalling::placeKept(const FieldPlan& field, const WrittenElement& element) {
+    if (_placing->needsWrapper())
+        _placing->placeInside(wrapperOf(field, element));
+    _placing->leaveField(element);
+}
+
+WrittenElement Marshalling::wrapperOf(const FieldPlan& field, const WrittenElement& element) {
+    const String& name = !field.location().isEmpty() ? field.location() : field.bindTo();
+    if (name.isEmpty())
+        return element;
+    if (auto wrapper = lastChildNamed(element, name))
+        return wrapper;
+    const Opened opened(*this);
+    auto wrapper = newElement(name, 0);
+    _output.addChild(element, wrapper);
+    return wrapper;
 }
 
 // A class that is self-first writes its fields before its ancestors', any other after them. Kept
@@ -206,7 +252,11 @@ bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& el
         Ref<Error> problem;
         if (_trace != nullptr)
             _trace->enterField(field);
+        if (_placing != nullptr)
+            _placing->enterField(field.key);
         const bool isWritten = writeField(field, element, object, &problem);
+        if (_placing != nullptr && isWritten)
+            placeKept(field, element);
         if (_trace != nullptr)
             _trace->leave();
         if (isWritten)
@@ -235,7 +285,7 @@ Ref<XMLNode> keptNode(const Value& kept, XMLNodeKind kind) {
 void Marshalling::restoreXML(const WrittenElement& element, const Object& object) {
     if (_trace != nullptr || !_access.mayKeepXML(object))
         return;
-    if (_marshaller->saveUnknownXML())
+    if (_marshaller->saveUnknownXML() && &object != _placed)
         restoreUnknownXML(element, object);
     restoreNamespaces(element, object);
 }

@@ -6,7 +6,7 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include "marshaller/ElementWriter.h"
+#include "marshaller/KeptPlacing.h"
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/OutputNames.h"
 #include "marshaller/Reporting.h"
@@ -33,7 +33,13 @@ public:
     // The same, if only the children of it will be taken, into an element that is being written.
     WrittenElement shell(const ClassPlan& plan, const WrittenElement& target, const Value& object,
                          ErrorSlot error);
-    // The fields of the class and its ancestors, with what was kept when the object was read.
+    // The fields of the class and its ancestors, with what was kept when the object was read, into
+    // an element that is the object's own; then into one of another object.
+    [[gnu::always_inline]] bool writeObject(const ClassPlan& plan, const WrittenElement& element,
+                                            Object& object, ErrorSlot error) {
+        return _keepsExactly && _trace == nullptr ? writeObjectExactly(plan, element, object, error)
+                                                  : writeFields(plan, element, object, error);
+    }
     bool writeFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                      ErrorSlot error);
     bool writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
@@ -46,6 +52,8 @@ public:
     ElementWriter& output() noexcept { return _output; }
     // Null where nobody wants one.
     WritingTrace* trace() const noexcept { return _trace; }
+    // Null where nothing that is kept has a place of its own.
+    KeptPlacing* placing() const noexcept { return _placing; }
     // While it lives, an element is open that declares this: what is made is made inside it.
     class Opened {
     public:
@@ -85,7 +93,7 @@ public:
     bool isLeftOut(const FieldPlan& field, const Value& value, const FieldText& text) const {
         const bool isLeft = _omitsZero && !field.isRequired &&
                             ((value.isNumber() && value.intValue() == 0) || text.isEmpty());
-        if (isLeft && _reports.isOn())
+        if (isLeft && _trace == nullptr && _reports.isOn())
             _reports.tellOmitted(field);
         return isLeft;
     }
@@ -102,6 +110,12 @@ private:
     std::vector<OutputNames::Declaration> declarationsOf(const ClassPlan& plan,
                                                          const Object& object);
     void declare(const WrittenElement& element, const OutputNames::Declaration& declaration);
+    // They stand apart, so that a level of nested objects takes less of the stack.
+    [[gnu::noinline]] void placeKept(const FieldPlan& field, const WrittenElement& element);
+    [[gnu::noinline]] bool writeObjectExactly(const ClassPlan& plan, const WrittenElement& element,
+                                              Object& object, ErrorSlot error);
+    // The wrapper around a field's items or its attribute, new where there is none.
+    WrittenElement wrapperOf(const FieldPlan& field, const WrittenElement& element);
     void restoreXML(const WrittenElement& element, const Object& object);
     void restoreUnknownXML(const WrittenElement& element, const Object& object);
     void restoreNamespaces(const WrittenElement& element, const Object& object);
@@ -112,6 +126,9 @@ private:
     ObjectAccess _access;
     ElementWriter _output;
     WritingTrace* _trace = nullptr;
+    const bool _keepsExactly;
+    KeptPlacing* _placing = nullptr;     // of the element that is open
+    const Object* _placed = nullptr;     // whose kept XML that is
     std::unique_ptr<OutputNames> _names; // null: names are written as the mapping has them
     const Reporting _reports;
     std::size_t _depth = 0;

@@ -15,13 +15,25 @@ std::uint32_t lastOf(const All& all) {
 
 void ReadingTrace::enter(const ClassPlan& plan, Number element, const Object& object) {
     const std::uint32_t use = _open.empty() ? none : lastOf(_uses);
-    _owners.push_back({element, &plan, &object, use});
+    _owners.push_back({element, &plan, &object, use, static_cast<std::uint32_t>(_uses.size()), 0});
     _open.push_back(lastOf(_owners));
     if (use != none)
         _uses[use].made = _open.back();
 }
 
-void ReadingTrace::leave() { _open.pop_back(); }
+void ReadingTrace::leave() {
+    _owners[_open.back()].usesEnd = static_cast<std::uint32_t>(_uses.size());
+    _open.pop_back();
+}
+
+void ReadingTrace::leaveAndForget() {
+    const std::uint32_t owner = current();
+    _open.pop_back();
+    if (_owners[owner].use != none)
+        _uses[_owners[owner].use].made = none;
+    _uses.resize(_owners[owner].firstUse);
+    _owners.resize(owner);
+}
 
 void ReadingTrace::take(Form form, const FieldPlan& field, Number entry, std::size_t binding,
                         std::size_t item) {

@@ -53,6 +53,8 @@ public:
         const ClassPlan* plan;
         const Object* object; // which may have moved on, where it is a struct
         std::uint32_t use;    // what it was made of; none for the root
+        // Its uses, with those of the objects inside; known once it is left.
+        std::uint32_t firstUse = 0, usesEnd = 0;
     };
 
     // In the order in which they came about. The mapping must outlive them.
@@ -61,9 +63,15 @@ public:
     // "lines[0].text" for a field of an owner; empty for the root without a field.
     String keyPath(std::uint32_t owner, const FieldPlan* field) const;
 
+    // About how many uses there will be.
+    void reserve(std::size_t uses) { _uses.reserve(uses); }
     // What the reading calls. The object that is entered was made of the use that came last.
     void enter(const ClassPlan& plan, Number element, const Object& object);
     void leave();
+    // Leaves the object, and keeps nothing of it but the use that it was made of.
+    void leaveAndForget();
+    // The owner that is being read; none where single steps are.
+    std::uint32_t current() const noexcept { return _open.empty() ? none : _open.back(); }
     void take(Form form, const FieldPlan& field, Number entry, std::size_t binding = 0,
               std::size_t item = 0);
     void keep(Form form, Number entry);

@@ -17,6 +17,8 @@ public:
 
     explicit Reporting(const QXXMLMarshaller& marshaller) noexcept
         : _handler(marshaller._reportHandler) {}
+    // To nobody.
+    Reporting() noexcept = default;
     // Whether anybody listens: ask before anything is looked for.
     bool isOn() const noexcept { return _handler != nullptr; }
 

@@ -15,7 +15,10 @@ namespace qx::detail {
 Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()), _document(document),
       _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
-      _reports(marshaller), _classes(_plan.classCount() + 1), _classKnown(_plan.classCount() + 1) {
+      _reports(marshaller), _keepsExactly(marshaller.keepsExactly()),
+      _ownTrace(_keepsExactly ? std::make_unique<ReadingTrace>() : nullptr),
+      _trace(_ownTrace.get()), _classes(_plan.classCount() + 1),
+      _classKnown(_plan.classCount() + 1) {
     if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
         document.matchBy(*table);
 }
@@ -40,6 +43,29 @@ public:
 private:
     std::size_t& _lent;
     ConsumedNames* _names;
+};
+
+// The trace knows the object while it is bound. Of its own trace a call needs no more than the
+// uses of the objects that are open.
+class Unmarshalling::Traced {
+public:
+    Traced(Unmarshalling& reading, const ClassPlan& plan, Number element, const Object& object)
+        : _trace(reading._trace), _isLasting(reading._isQuiet || reading.isInsideElement(element)) {
+        if (_trace != nullptr)
+            _trace->enter(plan, element, object);
+    }
+    ~Traced() {
+        if (_trace != nullptr && _isLasting)
+            _trace->leave();
+        else if (_trace != nullptr)
+            _trace->leaveAndForget();
+    }
+    Traced(const Traced&) = delete;
+    Traced& operator=(const Traced&) = delete;
+
+private:
+    ReadingTrace* const _trace;
+    const bool _isLasting;
 };
 
 void Unmarshalling::locate(ErrorSlot error, Number number, const FieldPlan* field,
@@ -115,14 +141,11 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, boo
         ~Restore() { current = outer; }
     } const restore{_frame, _frame};
     _frame = &frame;
-    if (_trace != nullptr)
-        _trace->enter(plan, source.element(), *object);
+    const Traced traced(*this, plan, source.element(), *object);
     const LentNames fields(*this);
     const LentNames attributes(*this);
     if (!readFields(plan, {*object, source, {*fields, *attributes}, isFlattened}, error))
         return nullptr;
-    if (_trace != nullptr)
-        _trace->leave();
     if (record != nullptr)
         record->setNotifyBindingsObservers(true);
     else if (isAsked && hooks->setNotifyBindingsObservers != nullptr)

@@ -26,6 +26,9 @@
 
 namespace qx::detail {
 
+class Leftovers;
+class UnknownNames;
+
 class Unmarshalling {
 public:
     using ErrorSlot = Ref<Error>*;
@@ -51,8 +54,12 @@ public:
     // The document must outlive the call.
     Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, Use use = Use::document);
 
-    // From here on it is told what becomes of each entry; it outlives the call.
-    void setTrace(ReadingTrace* trace) noexcept { _trace = trace; }
+    // From here on it is told what becomes of each entry; it outlives the call. The report handler
+    // and the log hear nothing then.
+    void setTrace(ReadingTrace* trace) noexcept {
+        _isQuiet = trace != nullptr;
+        _trace = _isQuiet ? trace : _ownTrace.get();
+    }
     // In an undo group of its own. Errors that the collector takes leave out what failed.
     Ref<Object> read(Number element, ErrorSlot error, ReadingProgress& progress,
                      ErrorCollector& collector);
@@ -97,6 +104,8 @@ public:
     IndexedXML& document() noexcept { return _document; }
     // Null where nobody wants one.
     ReadingTrace* trace() const noexcept { return _trace; }
+    // Whether only what no field took is kept.
+    bool keepsExactly() const noexcept { return _keepsExactly; }
     // The class that maps to an element of that name; null where none does.
     const ClassPlan* classForElement(Number element) const {
         return _plan.classForElement(_document.name(element));
@@ -105,7 +114,7 @@ public:
     const ClassPlan* currentClass() const noexcept {
         return _frame != nullptr ? _frame->plan : nullptr;
     }
-    const Reporting& reports() const noexcept { return _reports; }
+    const Reporting& reports() const noexcept { return _isQuiet ? _silent : _reports; }
     // An argument of an error: the node as it is quoted.
     auto quoted(Number node) {
         return [this, node] { return _document.quoted(node); };
@@ -129,8 +138,13 @@ private:
         Number wrapper;
     };
     class LentNames;
+    class Traced;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
+    // Whether the object that is being bound stands in that of another, which the element is of.
+    bool isInsideElement(Number element) const noexcept {
+        return _frame->parent != nullptr && _frame->parent->element == element;
+    }
     // What is to be done where a field has failed: whether the reading goes on. It stands apart,
     // so that a level of nested objects takes less of the stack.
     [[gnu::noinline]] bool passOverField(const FieldPlan& field, const Target& target,
@@ -142,6 +156,15 @@ private:
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
+    // Whether what is left is told from the trace, not from names: of objects that this call makes.
+    bool isExact(const ClassPlan* plan) const noexcept {
+        return _keepsExactly && plan != nullptr && _frame != nullptr &&
+               _marshaller->saveUnknownXML();
+    }
+    bool validateExactly(const Target& target, ErrorSlot error);
+    bool keepChildren(const Target& target, const Leftovers& left, ErrorSlot error);
+    bool keepAttributes(const Target& target, const Leftovers& left, ErrorSlot error);
+    void tellUnknown(Reporting::Kind kind, const UnknownNames& unknown, const Target& target);
     bool refuse(Number unknown, ErrorSlot error);
     bool validateChildren(const Target& target, ErrorSlot error);
     bool keepChildren(const Target& target, const CountedSet& names, const CountedSet& written,
@@ -159,6 +182,10 @@ private:
     ReadingProgress* _progress = nullptr;
     ErrorCollector* _collector = nullptr;
     const Reporting _reports;
+    const Reporting _silent;
+    const bool _keepsExactly;
+    bool _isQuiet = false;
+    const std::unique_ptr<ReadingTrace> _ownTrace; // of what is kept exactly
     ReadingTrace* _trace = nullptr;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;

@@ -3,8 +3,6 @@
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
-#include <algorithm>
-
 namespace qx::detail {
 
 namespace {
@@ -66,25 +64,33 @@ String WritingTrace::keyPath(Number number) const {
     return String(path);
 }
 
-void WritingTrace::hash() {
-    for (auto at = static_cast<Number>(_shown.size()); at-- > 0;)
-        _shown[at].hash = hashOf(at);
+std::uint64_t WritingTrace::hashOf(const Shown& shown) noexcept {
+    const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (shown.isList ? 16 : 0);
+    return shown.kind == Kind::object
+               ? mixed(mixed(own, reinterpret_cast<std::uintptr_t>(shown.plan)), shown.hash)
+               : mixed(own, shown.hash);
 }
 
-std::uint64_t WritingTrace::hashOf(Number number) const {
-    const Shown& shown = _shown[number];
-    std::uint64_t hash = static_cast<std::uint64_t>(shown.kind) + (shown.isList ? 16 : 0);
-    if (shown.kind == Kind::text)
-        return mixed(hash, hashOfText(text(number)));
-    if (shown.kind == Kind::object)
-        hash = mixed(hash, reinterpret_cast<std::uintptr_t>(shown.plan));
-    forEachInside(number, [&](Number inside) {
-        if (!_shown[inside].isHidden)
-            hash = mixed(hash, _shown[inside].hash);
-    });
-    if (const KeptList* const kept = shown.kind == Kind::object ? keptOf(number) : nullptr)
-        hash = mixed(hash, kept->hash());
-    return hash;
+void WritingTrace::mixInto(Number around, const Shown& shown) {
+    if (around == none)
+        _hash = shown.hash;
+    else if (!shown.isHidden)
+        _shown[around].hash = mixed(_shown[around].hash, shown.hash);
+}
+
+// What stands inside an entry comes behind it.
+void WritingTrace::hashAnew() {
+    for (Number at = size(); at-- > 0;) {
+        Shown& shown = _shown[at];
+        if (shown.kind == Kind::text)
+            continue;
+        const KeptList* const kept = shown.kind == Kind::object ? keptOf(at) : nullptr;
+        shown.hash = kept != nullptr ? kept->hash() : 0;
+        forEachInside(at, [&](Number inside) { mixInto(at, _shown[inside]); });
+        shown.hash = hashOf(shown);
+    }
+    _hash = size() != 0 ? _shown[0].hash : 0;
+    _isHashed = true;
 }
 
 std::uint64_t WritingTrace::KeptList::hash() const noexcept {
@@ -100,8 +106,35 @@ WritingTrace::Number WritingTrace::add(Shown shown) {
     shown.next = size() + 1;
     if (shown.around != none && _shown[shown.around].kind == Kind::field)
         shown.count = _shown[shown.around].count++;
-    _shown.push_back(shown);
+    if (_extent == Extent::all || shown.kind != Kind::text)
+        _shown.push_back(shown);
+    if (shown.kind == Kind::text)
+        mixInto(shown.around, shown);
     return shown.next - 1;
+}
+
+namespace {
+
+bool isAttribute(const WritingTrace::Shown& field) {
+    const bool mayBe =
+        field.field->kind == BindingKind::attribute || field.field->kind == BindingKind::automatic;
+    return mayBe && field.field->location().isEmpty() && !field.isList;
+}
+
+} // namespace
+
+// Objects that stand in one element are open one in the other.
+void WritingTrace::noteContent() {
+    const XMLDraft::Element* element = nullptr;
+    for (auto at = _open.rbegin(); at != _open.rend(); ++at) {
+        Shown& shown = _shown[*at];
+        if (shown.kind != Kind::object)
+            continue;
+        if (shown.hasContent || (element != nullptr && shown.element != element))
+            return;
+        element = shown.element;
+        shown.hasContent = true;
+    }
 }
 
 void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element,
@@ -110,6 +143,8 @@ void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element
     shown.plan = &plan;
     shown.element = element;
     shown.object = object.isa().isStruct() ? nullptr : &object;
+    if (!_open.empty() && _shown[_shown[_open.back()].around].element != element)
+        noteContent();
     const Number number = add(shown);
     _open.push_back(number);
     if (!access.mayKeepXML(object))
@@ -124,13 +159,21 @@ void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element
             for (const auto& entry : *children)
                 listAll(kept.children, entry.value, XMLNodeKind::element);
     }
-    if (!kept.children.empty() || !kept.attributes.empty() || !kept.declarations.empty())
+    _shown[number].hash = kept.hash();
+    const bool isEmpty =
+        kept.children.empty() && kept.attributes.empty() && kept.declarations.empty();
+    if (!isEmpty && _extent == Extent::all)
         _kept.emplace(number, std::move(kept));
 }
 
 void WritingTrace::leave() {
-    _shown[_open.back()].next = size();
+    Shown& shown = _shown[_open.back()];
+    shown.next = size();
+    shown.hash = hashOf(shown);
     _open.pop_back();
+    mixInto(shown.around, shown);
+    if (_extent == Extent::hash)
+        _shown.pop_back();
 }
 
 void WritingTrace::enterField(const FieldPlan& field) {
@@ -140,16 +183,25 @@ void WritingTrace::enterField(const FieldPlan& field) {
 }
 
 void WritingTrace::hold(const Value& value) {
-    if (_open.back() == size() - 1 && !value.isNull() && !value.isObject())
+    if (_shown[_open.back()].count == 0 && !value.isNull() && !value.isObject())
         addText(value.description(), true);
 }
 
 void WritingTrace::addText(std::string_view text, bool isHidden) {
     Shown shown(Kind::text);
     shown.isHidden = isHidden;
+    _hidesSome = _hidesSome || isHidden;
     shown.begin = _texts.size();
     shown.size = text.size();
-    _texts += text;
+    shown.hash = mixed(1, hashOfText(text));
+    if (_extent == Extent::all)
+        _texts += text;
+    const Shown& field = _shown[_open.back()];
+    if (isHidden)
+        _hiddenHash =
+            mixed(mixed(_hiddenHash, reinterpret_cast<std::uintptr_t>(field.field)), shown.hash);
+    if (!isHidden && !isAttribute(field))
+        noteContent();
     add(shown);
 }
 
@@ -162,12 +214,13 @@ void WritingTrace::replaceContent(const XMLDraft::Element* element) {
             break;
         outermost = shown.kind == Kind::object ? at : outermost;
     }
-    const auto isAttribute = [&](Number value) {
-        const FieldPlan* const field = _shown[_shown[value].around].field;
-        const bool mayBe =
-            field->kind == BindingKind::attribute || field->kind == BindingKind::automatic;
-        return mayBe && _shown[value].kind == Kind::text && field->location().isEmpty() &&
-               !_shown[_shown[value].around].isList;
+    if (!_shown[*outermost].hasContent)
+        return;
+    _isHashed = false;
+    if (_extent == Extent::hash)
+        return;
+    const auto isAttributeValue = [&](Number value) {
+        return _shown[value].kind == Kind::text && isAttribute(_shown[_shown[value].around]);
     };
     auto open = outermost.base(); // the entries that are open come in the same order
     for (Number at = *outermost + 1; at < size(); ++at) {
@@ -175,18 +228,21 @@ void WritingTrace::replaceContent(const XMLDraft::Element* element) {
         const bool isOpen = open != _open.end() && *open == at;
         open += isOpen ? 1 : 0;
         const bool isFlattened = shown.kind == Kind::object && shown.element == element;
-        if (shown.kind != Kind::field && !isOpen && !isFlattened && !isAttribute(at))
-            shown.isHidden = true;
+        if (shown.kind != Kind::field && !isOpen && !isFlattened && !isAttributeValue(at))
+            shown.isHidden = _hidesSome = true;
         if (shown.kind == Kind::object && !isOpen && !isFlattened)
             at = shown.next - 1;
     }
 }
 
 void WritingTrace::forget(Number count) {
-    if (count < size())
-        --_shown[_open.back()].count;
+    _isHashed = false;
+    if (count >= size())
+        return;
+    --_shown[_open.back()].count;
+    for (Number number = count; !_kept.empty() && number < size(); ++number)
+        _kept.erase(number);
     _shown.erase(_shown.begin() + count, _shown.end());
-    std::erase_if(_kept, [&](const auto& entry) { return entry.first >= count; });
 }
 
 } // namespace qx::detail

@@ -22,6 +22,8 @@
 #include "plan/ClassPlan.h"
 #include "xml/XMLDraft.h"
 
+#include <algorithm>
+#include <optional>
 #include <string>
 #include <unordered_map>
 #include <vector>
@@ -39,10 +41,11 @@ public:
         explicit Shown(Kind which) noexcept : kind(which) {}
 
         Kind kind;
-        bool isList = false;   // of a field: it holds an array
-        bool isHidden = false; // of a value
-        Number next = 0;       // the entry after everything inside
-        Number around = none;  // the entry that this one stands in
+        bool isList = false;     // of a field: it holds an array
+        bool isHidden = false;   // of a value
+        bool hasContent = false; // of an object: more than attributes stands in its element
+        Number next = 0;         // the entry after everything inside
+        Number around = none;    // the entry that this one stands in
         // Of a value its number in the field; of a field, how many values it has.
         std::uint32_t count = 0;
         union {
@@ -67,9 +70,16 @@ public:
         std::uint64_t hash() const noexcept; // of children and attributes
     };
 
-    explicit WritingTrace(bool keepsUnknown) noexcept : _keepsUnknown(keepsUnknown) {}
-    // About how many entries there will be.
-    void reserve(std::size_t entries) { _shown.reserve(entries); }
+    // One that has nothing but a hash lists what is open, no more.
+    enum class Extent : std::uint8_t { all, hash };
+    explicit WritingTrace(bool keepsUnknown, Extent extent = Extent::all) noexcept
+        : _keepsUnknown(keepsUnknown), _extent(extent) {}
+    // About how many entries there will be, with so many bytes of text.
+    void reserve(std::size_t entries, std::size_t textSize) {
+        _shown.reserve(entries);
+        _texts.reserve(textSize);
+    }
+    std::size_t textSize() const noexcept { return _texts.size(); }
 
     const Shown& operator[](Number number) const noexcept { return _shown[number]; }
     Number size() const noexcept { return static_cast<Number>(_shown.size()); }
@@ -78,6 +88,20 @@ public:
     }
     // Null where the object keeps nothing.
     const KeptList* keptOf(Number object) const;
+    // Calls visit(Number) for each object that keeps something, in their order.
+    template <class Visit>
+    void forEachKeeping(Visit visit) const {
+        std::vector<Number> objects;
+        for (const auto& entry : _kept)
+            objects.push_back(entry.first);
+        std::sort(objects.begin(), objects.end());
+        for (const Number object : objects)
+            visit(object);
+    }
+    // Of the hidden values and their fields, where the hash above is known without more work.
+    std::uint64_t hiddenHash() const noexcept { return _hiddenHash; }
+    // Whether there is a hidden value.
+    bool hidesSome() const noexcept { return _hidesSome; }
     // Calls visit(Number) for each entry directly inside.
     template <class Visit>
     void forEachInside(Number number, Visit visit) const {
@@ -88,8 +112,13 @@ public:
     std::vector<Number> shownValues(Number field) const;
     // "lines[0].text" for a field or an object.
     String keyPath(Number number) const;
-    // To be called once all is there.
-    void hash();
+    // Of all that is shown; known once the writing has ended. None where what was shown did not
+    // stay and there is nothing but a hash.
+    std::optional<std::uint64_t> hash() {
+        if (!_isHashed && _extent == Extent::all)
+            hashAnew();
+        return _isHashed ? std::optional(_hash) : std::nullopt;
+    }
 
     // What the writing calls.
     void enterObject(const ClassPlan& plan, XMLDraft::Element* element, const Object& object,
@@ -107,12 +136,22 @@ public:
 
 private:
     Number add(Shown shown);
-    std::uint64_t hashOf(Number number) const;
+    // Marks that more than attributes stands in the element that is open.
+    void noteContent();
+    void mixInto(Number around, const Shown& shown);
+    // With `hash` of what is inside.
+    static std::uint64_t hashOf(const Shown& shown) noexcept;
+    void hashAnew();
 
     const bool _keepsUnknown;
+    const Extent _extent;
+    std::uint64_t _hash = 0;
+    std::uint64_t _hiddenHash = 0;
+    bool _isHashed = true; // whether the hashes are right
     std::vector<Shown> _shown;
     std::vector<Number> _open;
     std::string _texts;
+    bool _hidesSome = false;
     std::unordered_map<Number, KeptList> _kept;
 };
 

@@ -14,6 +14,7 @@ using Form = ReadingTrace::Form;
 bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::Target& target,
           Ref<Error>* error) {
     ChildLookup& source = target.source;
+    auto emptyWrapper = Unmarshalling::none;
     for (const BindingPlan& binding : field.bindings) {
         auto holder = source.element();
         if (!binding.location.isEmpty()) {
@@ -27,8 +28,11 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
                                : holder != Unmarshalling::none
                                    ? reading.document().attribute(holder, binding.name)
                                    : Unmarshalling::none;
-        if (attribute == Unmarshalling::none)
+        if (attribute == Unmarshalling::none) {
+            if (emptyWrapper == Unmarshalling::none && holder != source.element())
+                emptyWrapper = holder;
             continue;
+        }
         target.bound.attributes.add(binding.name);
         const bool isTaken =
             takeValue(target.object, field, field.key, reading.document().value(attribute), error,
@@ -41,6 +45,9 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
         }
         return isTaken;
     }
+    // What else it holds is kept in it, so that the attribute may come back there.
+    if (emptyWrapper != Unmarshalling::none && reading.keepsExactly())
+        reading.trace()->take(Form::wrapper, field, emptyWrapper);
     if (field.isRequired)
         return fail(error, errors::requiredAttributeMissing,
                     field.bindings.empty() ? String() : field.bindings.back().name,

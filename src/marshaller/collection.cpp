@@ -24,11 +24,13 @@ struct Items {
 };
 
 // The wrapper's children. False where they are more than may be gone over.
-bool takeChildren(Unmarshalling& reading, Unmarshalling::Number wrapper, Items& items,
-                  Ref<Error>* error) {
+bool takeChildren(Unmarshalling& reading, const FieldPlan& field, Unmarshalling::Number wrapper,
+                  Items& items, Ref<Error>* error) {
     reading.document().forEachChild(
         wrapper, [&](Unmarshalling::Number child) { items.nodes.push_back(child); });
     items.wrapper = items.nodes.empty() ? Unmarshalling::none : wrapper;
+    if (items.nodes.empty() && reading.keepsExactly())
+        reading.trace()->take(Form::wrapper, field, wrapper);
     return reading.budget().takeVisits(items.nodes.size(), wrapper, error);
 }
 
@@ -44,7 +46,7 @@ bool findItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
             items.nodes = source.all(binding.bindTo);
         } else if (const auto wrapper = source.last(binding.bindTo);
                    wrapper != Unmarshalling::none) {
-            if (!takeChildren(reading, wrapper, items, error))
+            if (!takeChildren(reading, field, wrapper, items, error))
                 return false;
         }
         if (!items.nodes.empty()) {
@@ -230,6 +232,12 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
         return fail(error, errors::noMappingForDeclaredClass, field.mapping->type());
     const Marshalling::Opened opened(writing);
     const WrittenElement target = elementForItems(writing, field, element);
+    const bool isWrapped = target.node != element.node || target.drafted != element.drafted;
+    const auto placeKept = [&](std::size_t count) {
+        if (writing.placing() != nullptr)
+            writing.placing()->itemsAre(count, target, isWrapped);
+    };
+    placeKept(0);
     // An item's own accessors may change the array it stands in.
     for (std::size_t i = 0; i < array.count(); ++i) {
         // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
@@ -237,6 +245,7 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
         if (field.typeClass == nullptr && field.hasSimpleType()) {
             if (!item.isNullOrMarker())
                 writing.addTextElement(target, field.xmlName(), FieldText(item, field.valueType));
+            placeKept(i + 1);
             continue;
         }
         Ref<Error> problem;
@@ -252,6 +261,7 @@ bool writeCollection(Marshalling& writing, const FieldPlan& field, const Written
         } else if (error != nullptr && problem) {
             return writing.failed(field, i, problem, error);
         }
+        placeKept(i + 1);
     }
     return true;
 }

@@ -105,7 +105,7 @@ bool QXXMLMarshaller::bindFieldMappings(const QXXMLClassMapping& mapping, XMLEle
     const PlanOfClass plan(*this, mapping);
     Marshalling writing(*this, element);
     const Marshalling::Opened opened(writing, writing.keptDeclarations(object));
-    return writing.writeFields(*plan, target, object, error);
+    return writing.writeObject(*plan, target, object, error);
 }
 
 bool QXXMLMarshaller::mapField(const QXXMLFieldMapping& field, XMLElement& element, Object& object,

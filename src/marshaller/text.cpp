@@ -54,6 +54,8 @@ bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& e
         trace->addText(text.view(), text.isEmpty()); // which adds no node
     }
     writing.output().setText(element, text);
+    if (writing.placing() != nullptr)
+        writing.placing()->replaced(element);
     return true;
 }
 

@@ -4,52 +4,12 @@
 #include <QXXMLMarshalling/model/Dictionary.h>
 
 #include "host/Log.h"
+#include "marshaller/UnknownNames.h"
 #include "model/Errors.h"
 
 #include <algorithm>
 
 namespace qx::detail {
-
-namespace {
-
-// The names that occur more often than they were consumed, with how much more often. Uses up the
-// counts; null where no name is left.
-class Unknown {
-public:
-    explicit Unknown(ConsumedNames& bound) : _bound(bound) {}
-
-    void see(const IndexedXML& document, IndexedXML::Number node) {
-        const String& name = document.name(node);
-        if (name.isNull() || _bound.take(name))
-            return;
-        if (!_names) {
-            _names = make<CountedSet>();
-            _written = document.isMatched() ? make<CountedSet>() : _names;
-        }
-        const std::size_t known = _names->count();
-        _names->add(name);
-        if (_names->count() != known)
-            _firsts.push_back(node);
-        if (_written != _names)
-            _written->add(document.writtenName(node));
-    }
-    // As they are matched, and as they stand in the document.
-    const Ref<CountedSet>& names() const noexcept { return _names; }
-    const Ref<CountedSet>& written() const noexcept { return _written; }
-    // The first node that is left of each name.
-    const std::vector<IndexedXML::Number>& firsts() const noexcept { return _firsts; }
-    std::size_t countOf(const IndexedXML& document, IndexedXML::Number node) const {
-        return _names->countFor(document.name(node));
-    }
-
-private:
-    ConsumedNames& _bound;
-    Ref<CountedSet> _names;
-    Ref<CountedSet> _written;
-    std::vector<IndexedXML::Number> _firsts;
-};
-
-} // namespace
 
 namespace {
 
@@ -72,8 +32,10 @@ bool takesText(const ClassPlan& plan) {
 bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorSlot error) {
     if (_marshaller->isLenient() && !_marshaller->saveUnknownXML())
         return true;
-    if (_reports.isOn() && plan != nullptr && !takesText(*plan))
+    if (reports().isOn() && plan != nullptr && !takesText(*plan))
         _reports.tellTexts(_document, target.source.element(), &target.object);
+    if (isExact(plan))
+        return validateExactly(target, error);
     if (_use == Use::document) {
         const bool allBound = plan != nullptr && hasBoundAllChildren(*plan, target);
         return (allBound || validateChildren(target, error)) && validateAttributes(target, error);
@@ -96,26 +58,38 @@ bool Unmarshalling::refuse(Number unknown, ErrorSlot error) {
     return passOver(error);
 }
 
+// Although it is worded as a warning, what is said of children goes to the host's debug log;
+// whether there is a host's log at all is asked of the warnings. Who has a reading traced hears of
+// it there.
+void Unmarshalling::tellUnknown(Reporting::Kind kind, const UnknownNames& unknown,
+                                const Target& target) {
+    if (_isQuiet)
+        return;
+    const bool isChild = kind == Reporting::Kind::unboundChild;
+    if (_reports.isOn())
+        for (const Number node : unknown.firsts())
+            _reports.tell(kind, _document, target.source.element(), node, &target.object,
+                          isChild ? unknown.countOf(_document, node) : 1,
+                          _marshaller->saveUnknownXML());
+    else if (!isChild)
+        logWarningOrLine("Unbound attributes: %@", unknown.written());
+    else if (hostHasLogWarning())
+        logDebug("*** Warning: Unbound fields: %@", unknown.written());
+    else
+        log("Unbound fields: %@", unknown.written());
+}
+
 bool Unmarshalling::validateChildren(const Target& target, ErrorSlot error) {
-    Unknown unknown(target.bound.fields);
-    target.source.forEachChild([&](Number child) { unknown.see(_document, child); });
+    UnknownNames unknown;
+    target.source.forEachChild(
+        [&](Number child) { unknown.see(_document, child, target.bound.fields); });
     if (!unknown.names())
         return true;
     if (!_marshaller->saveUnknownXML() && !_marshaller->isLenient()) {
         fail(error, errors::unknownFields, unknown.written(), target.source.elementName());
         return refuse(unknown.firsts().front(), error);
     }
-    // Although it is worded as a warning, it goes to the host's debug log; whether there is a
-    // host's log at all is asked of the warnings. Who has a reading traced hears of it there.
-    if (_reports.isOn() && _trace == nullptr)
-        for (const Number node : unknown.firsts())
-            _reports.tell(Reporting::Kind::unboundChild, _document, target.source.element(), node,
-                          &target.object, unknown.countOf(_document, node),
-                          _marshaller->saveUnknownXML());
-    else if (_trace == nullptr && hostHasLogWarning())
-        logDebug("*** Warning: Unbound fields: %@", unknown.written());
-    else if (_trace == nullptr)
-        log("Unbound fields: %@", unknown.written());
+    tellUnknown(Reporting::Kind::unboundChild, unknown, target);
     return !_marshaller->saveUnknownXML() ||
            keepChildren(target, *unknown.names(), *unknown.written(), error);
 }
@@ -158,10 +132,10 @@ bool Unmarshalling::keepChildren(const Target& target, const CountedSet& names,
 
 bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
     const Number element = target.source.element();
-    Unknown unknown(target.bound.attributes);
+    UnknownNames unknown;
     std::size_t seen = 0;
     target.source.forEachAttribute([&](Number attribute) {
-        unknown.see(_document, attribute);
+        unknown.see(_document, attribute, target.bound.attributes);
         ++seen;
     });
     if (!_budget.takeVisits(seen, element, error))
@@ -172,12 +146,7 @@ bool Unmarshalling::validateAttributes(const Target& target, ErrorSlot error) {
         fail(error, errors::unknownAttributes, unknown.written(), target.source.elementName());
         return refuse(unknown.firsts().front(), error);
     }
-    if (_reports.isOn() && _trace == nullptr)
-        for (const Number node : unknown.firsts())
-            _reports.tell(Reporting::Kind::unboundAttribute, _document, element, node,
-                          &target.object, 1, _marshaller->saveUnknownXML());
-    else if (_trace == nullptr)
-        logWarningOrLine("Unbound attributes: %@", unknown.written());
+    tellUnknown(Reporting::Kind::unboundAttribute, unknown, target);
     return !_marshaller->saveUnknownXML() || keepAttributes(target, *unknown.names(), error);
 }
 

@@ -4,7 +4,6 @@
 
 #include "marshaller/NamespaceMatching.h"
 #include "model/Errors.h"
-#include "saving/ShownComparison.h"
 #include "xml/TextPosition.h"
 
 namespace qx::detail {
@@ -17,14 +16,17 @@ constexpr int mostAttempts = 6;
 
 } // namespace
 
-DocumentUpdate::DocumentUpdate(QXXMLMarshaller& marshaller, Ref<Data> original, const Value& object)
-    : _marshaller(&marshaller), _original(std::move(original)), _object(object),
+DocumentUpdate::DocumentUpdate(QXXMLMarshaller& marshaller, XMLBytes original, const Value& object)
+    : _marshaller(&marshaller), _original(make<Data>(original.view())), _object(object),
       _after(marshaller) {}
 
 Result<QXXMLUpdate> DocumentUpdate::run() {
     Ref<Error> error;
     if (!prepare(&error))
         return error;
+    if (_source->hash() == _after.hash())
+        return unchanged();
+    prepareWriter();
     const UpdateSource source{
         _source->index(),
         _source->document(),
@@ -45,29 +47,47 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
         if (error)
             return error;
         firstCulprit = attempt == 0 ? culprit : firstCulprit;
-        const Shown around = plan.objectAround(culprit);
-        if (around == WritingTrace::none)
+        if (!writeAnew(plan, culprit))
             break;
-        _anew.insert(around);
     }
     fail(&error, errors::changeCannotBeSaved, _after.trace().keyPath(firstCulprit));
     return error;
 }
 
+// All that could not be carried at once: each attempt takes a reading.
+bool DocumentUpdate::writeAnew(const UpdatePlan& plan, Shown culprit) {
+    std::set<Shown> around{plan.objectAround(culprit)};
+    for (const Shown failed : plan.failures())
+        around.insert(plan.objectAround(failed));
+    if (around.contains(WritingTrace::none))
+        return false;
+    _anew.merge(around);
+    return true;
+}
+
 bool DocumentUpdate::prepare(Ref<Error>* error) {
     _source = TracedReading::of(*_marshaller, _original, error);
-    if (!_source || !_after.write(*_marshaller, _object, _source->written().size(), error))
+    if (!_source)
+        return false;
+    const TracedWriting::Size size{_source->written().size(), _source->written().textSize()};
+    if (!_after.write(*_marshaller, _object, size, XMLDraft::Values::copied, error))
         return false;
     const ClassPlan& was = *_source->written()[0].plan;
     const ClassPlan& is = *_after.trace()[0].plan;
     if (&was != &is)
         return fail(error, errors::rootOfOtherClass, was.className.string(), is.className.string());
-    _encoding = std::make_unique<SourceEncoding>(_original->view());
-    prepareWriter();
     return true;
 }
 
+QXXMLUpdate DocumentUpdate::unchanged() const {
+    QXXMLUpdate update;
+    update._bytes = _original;
+    listUnshown(ShownComparison(_after.trace(), _source->written()), update);
+    return update;
+}
+
 void DocumentUpdate::prepareWriter() {
+    _encoding = std::make_unique<SourceEncoding>(_original->view());
     _markup = std::make_unique<SourceMarkup>(_source->index());
     _layout = std::make_unique<SourceLayout>(_source->index(), *_markup);
     _writer = std::make_unique<NewXML>(*_layout, _after.trace(), _encoding->encoder());
@@ -100,8 +120,17 @@ bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit
         return false;
     culprit = edits.edits().front().shown;
     Ref<Error> problem; // of what was written: the edits are to blame
-    const auto again = TracedReading::of(*_marshaller, update._bytes, &problem);
-    if (!again || !check(*again, update, culprit))
+    const auto again =
+        TracedReading::of(*_marshaller, update._bytes, &problem, WritingTrace::Extent::hash);
+    if (problem && problem->code() == errors::readingCancelled.code) {
+        *error = std::move(problem);
+        return false;
+    }
+    if (!again)
+        return false;
+    const bool isSame = again->hash() == _after.hash() &&
+                        again->written().hiddenHash() == _after.trace().hiddenHash();
+    if (!isSame && (!again->writeAll(*_marshaller, &problem) || !check(*again, update, culprit)))
         return false;
     listEdits(plan, edits, update);
     return true;
@@ -125,13 +154,17 @@ bool DocumentUpdate::check(TracedReading& reading, QXXMLUpdate& update, Shown& c
         culprit = different;
         return false;
     }
+    listUnshown(comparison, update);
+    return true;
+}
+
+void DocumentUpdate::listUnshown(const ShownComparison& comparison, QXXMLUpdate& update) const {
     comparison.forEachUnshown([&](Shown value) {
         update._unshown.push_back(
             {_after.trace().keyPath(value), _after.trace()[value].kind == WritingTrace::Kind::text
                                                 ? String(_after.trace().text(value))
                                                 : String()});
     });
-    return true;
 }
 
 void DocumentUpdate::listEdits(const UpdatePlan& plan, const EditList& edits,

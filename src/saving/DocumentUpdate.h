@@ -5,6 +5,7 @@
 
 #include <QXXMLMarshalling/QXXMLUpdate.h>
 
+#include "saving/ShownComparison.h"
 #include "saving/SourceEncoding.h"
 #include "saving/TracedObject.h"
 #include "saving/UpdatePlan.h"
@@ -13,7 +14,7 @@ namespace qx::detail {
 
 class DocumentUpdate {
 public:
-    DocumentUpdate(QXXMLMarshaller& marshaller, Ref<Data> original, const Value& object);
+    DocumentUpdate(QXXMLMarshaller& marshaller, XMLBytes original, const Value& object);
 
     Result<QXXMLUpdate> run();
 
@@ -22,10 +23,15 @@ private:
 
     bool prepare(Ref<Error>* error);
     void prepareWriter();
+    QXXMLUpdate unchanged() const;
     // Carries out the plan. False with an error, or with the object or field in the way.
     bool carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit, Ref<Error>* error);
+    // Has the smallest objects around what could not be carried written anew next time. False where
+    // one has none around it.
+    bool writeAnew(const UpdatePlan& plan, Shown culprit);
     // Whether the reading says what the object says.
     bool check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const;
+    void listUnshown(const ShownComparison& comparison, QXXMLUpdate& update) const;
     void listEdits(const UpdatePlan& plan, const EditList& edits, QXXMLUpdate& update) const;
 
     const Ref<QXXMLMarshaller> _marshaller;

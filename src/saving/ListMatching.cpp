@@ -16,9 +16,12 @@ std::vector<bool> longestRise(const std::vector<std::size_t>& numbers) {
     for (std::size_t i = 0; i < numbers.size(); ++i) {
         if (numbers[i] == none)
             continue;
-        const auto place =
-            std::lower_bound(ends.begin(), ends.end(), numbers[i],
-                             [&](std::size_t end, std::size_t n) { return numbers[end] < n; });
+        const bool isHighest = ends.empty() || numbers[ends.back()] < numbers[i];
+        const auto place = isHighest ? ends.end()
+                                     : std::lower_bound(ends.begin(), ends.end(), numbers[i],
+                                                        [&](std::size_t end, std::size_t n) {
+                                                            return numbers[end] < n;
+                                                        });
         previous[i] = place != ends.begin() ? *(place - 1) : none;
         if (place != ends.end())
             *place = i;
@@ -38,12 +41,19 @@ public:
         : _before(before), _now(now), _was(now.size(), none), _likeness(likeness),
           _isMatched(before.size()) {}
 
-    ListMatching run() {
+    // Where one item was changed in its place, there is no need of keys.
+    ListMatching run(const std::function<ListKeys()>& findKeys) {
         Part all{0, _before.size(), 0, _now.size()};
         trim(all);
         matchUnique(all);
-        matchByKey([](const ListItem& item) { return std::to_string(item.hash); }, true);
-        matchByKey([](const ListItem& item) { return item.key; }, false);
+        matchLeft([&](std::size_t i) { return _before[i].hash; },
+                  [&](std::size_t i) { return _now[i].hash; }, true);
+        if (_before.size() == _matched + 1 && _now.size() == _matched + 1)
+            matchGaps();
+        if (findKeys && _before.size() > _matched && _now.size() > _matched)
+            if (const ListKeys keys = findKeys(); !keys.now.empty())
+                matchLeft([&](std::size_t i) { return keys.before[i]; },
+                          [&](std::size_t i) { return keys.now[i]; }, false);
         matchGaps();
         return {_was, longestRise(_was)};
     }
@@ -57,6 +67,7 @@ private:
     void pair(std::size_t before, std::size_t now) {
         _was[now] = before;
         _isMatched[before] = true;
+        ++_matched;
     }
     bool areEqual(std::size_t before, std::size_t now) const {
         return _before[before].hash == _now[now].hash;
@@ -113,15 +124,17 @@ private:
             found->second.pop_back();
         }
     }
-    // Of those that are left; equal ones one after another.
-    template <class KeyOf>
-    void matchByKey(KeyOf keyOf, bool isOfAnyKind) {
-        std::unordered_map<std::string, std::vector<std::size_t>> places;
+    // Of those that are left; those of one key one after another.
+    template <class KeyBefore, class KeyNow>
+    void matchLeft(KeyBefore keyBefore, KeyNow keyNow, bool isOfAnyKind) {
+        if (_before.size() == _matched || _now.size() == _matched)
+            return;
+        std::unordered_map<decltype(keyNow(0)), std::vector<std::size_t>> places;
         for (std::size_t i = _before.size(); i-- > 0;)
-            if (std::string key = keyOf(_before[i]); !_isMatched[i] && !key.empty())
-                places[std::move(key)].push_back(i);
-        for (std::size_t i = 0; i < _now.size() && !places.empty(); ++i) {
-            const auto found = _was[i] == none ? places.find(keyOf(_now[i])) : places.end();
+            if (!_isMatched[i])
+                places[keyBefore(i)].push_back(i);
+        for (std::size_t i = 0; i < _now.size(); ++i) {
+            const auto found = _was[i] == none ? places.find(keyNow(i)) : places.end();
             if (found == places.end() || found->second.empty() ||
                 (!isOfAnyKind && _before[found->second.back()].kind != _now[i].kind))
                 continue;
@@ -189,13 +202,14 @@ private:
     std::vector<std::size_t> _was;
     const Likeness& _likeness;
     std::vector<bool> _isMatched;
+    std::size_t _matched = 0; // how many
 };
 
 } // namespace
 
 ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
-                   const Likeness& likeness) {
-    return Matcher(before, now, likeness).run();
+                   const Likeness& likeness, const std::function<ListKeys()>& findKeys) {
+    return Matcher(before, now, likeness).run(findKeys);
 }
 
 } // namespace qx::detail

@@ -12,15 +12,19 @@
 
 #include <cstdint>
 #include <functional>
-#include <string>
+#include <string_view>
 #include <vector>
 
 namespace qx::detail {
 
 struct ListItem {
-    std::uint64_t hash;   // equal ones are equal
-    std::uint64_t kind;   // items of two kinds never are one item
-    std::string key = {}; // which no other item of its list has; empty for none
+    std::uint64_t hash; // equal ones are equal
+    std::uint64_t kind; // items of two kinds never are one item
+};
+
+// Of each item a key that no other of its list has; both empty where there is none.
+struct ListKeys {
+    std::vector<std::string_view> before, now;
 };
 
 struct ListMatching {
@@ -34,7 +38,9 @@ struct ListMatching {
 // How much an item before has in common with one now, both by their number.
 using Likeness = std::function<std::size_t(std::size_t before, std::size_t now)>;
 
+// findKeys() is asked for keys where equality leaves items over.
 ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
-                   const Likeness& likeness = nullptr);
+                   const Likeness& likeness = nullptr,
+                   const std::function<ListKeys()>& findKeys = nullptr);
 
 } // namespace qx::detail

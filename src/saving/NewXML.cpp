@@ -9,9 +9,8 @@ namespace qx::detail {
 
 NewXML::NewXML(const SourceLayout& layout, const WritingTrace& shown, TextEncoder* encoder)
     : _layout(layout), _shown(shown), _encoder(encoder) {
-    for (WritingTrace::Number at = 0; at < shown.size(); ++at)
-        if (shown.keptOf(at) != nullptr)
-            _objects[shown[at].element].push_back(at);
+    shown.forEachKeeping(
+        [&](WritingTrace::Number at) { _objects[shown[at].element].push_back(at); });
 }
 
 std::string NewXML::escaped(std::string_view value, std::string_view special, char quote) const {
@@ -224,7 +223,7 @@ bool NewXML::appendContent(const XMLDraft::Element& element, const Around& aroun
         for (const auto& kept : _shown.keptOf(object)->children)
             if (!isTaken(_shown[object].plan, kept.text)) {
                 startLine();
-                output += kept.text;
+                output += markup(kept.text);
             }
     return isOnLines;
 }

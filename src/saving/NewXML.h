@@ -32,6 +32,8 @@ public:
     // Whether the text may stand in a CDATA section; and as it stands there.
     bool mayBeCDATA(std::string_view value) const;
     std::string lines(std::string_view value) const;
+    // Markup that is kept, as the document's encoding has it.
+    std::string markup(std::string_view text) const { return escaped(text, {}, 0); }
 
     // What stands around a new element: its line's start, null for one without lines, the names
     // of the mapping as they are in force there, null where they are written as they are, and

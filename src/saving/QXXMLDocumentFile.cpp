@@ -5,7 +5,6 @@
 #include "marshaller/DocumentParsing.h"
 #include "model/Errors.h"
 #include "model/LibraryClass.h"
-#include "saving/DocumentUpdate.h"
 #include "saving/SourceEncoding.h"
 #include "saving/TextMerge.h"
 #include "xml/XMLParser.h"
@@ -15,15 +14,39 @@ using qx::Error;
 using qx::Ref;
 using qx::String;
 
+namespace {
+
+// What a field took, too, would grow old in the object while its value is edited: the file's
+// readings keep exactly.
+class ExactKeeping {
+public:
+    explicit ExactKeeping(Ref<QXXMLMarshaller> marshaller)
+        : _marshaller(std::move(marshaller)), _was(_marshaller->keepsExactly()) {
+        _marshaller->setKeepsExactly(true);
+    }
+    ~ExactKeeping() { _marshaller->setKeepsExactly(_was); }
+    ExactKeeping(const ExactKeeping&) = delete;
+    ExactKeeping& operator=(const ExactKeeping&) = delete;
+
+private:
+    const Ref<QXXMLMarshaller> _marshaller;
+    const bool _was;
+};
+
+} // namespace
+
 QXXMLDocumentFile::~QXXMLDocumentFile() = default;
 
 Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMarshaller> marshaller,
                                                Ref<Error>* error) {
     qx::detail::reset(error);
+    if (!marshaller)
+        marshaller = QXXMLMarshaller::initWithMapping(nullptr);
     auto text = qx::readFile(path, error);
     if (!text)
         return nullptr;
     Ref<Error> problem;
+    const ExactKeeping exact(marshaller);
     auto root = marshaller->readString(*text, &problem);
     if (problem || !root) {
         if (error != nullptr)
@@ -48,11 +71,18 @@ void QXXMLDocumentFile::setBase(Ref<Data> text) {
         _undoManager->setSavedMark();
 }
 
+// Code of the host's may let go of the file while the object is read, or save it.
+qx::Result<QXXMLUpdate> QXXMLDocumentFile::update(const Ref<Data>& text) const {
+    const Ref<const QXXMLDocumentFile> kept(this);
+    const ExactKeeping exact(_marshaller);
+    return QXXMLUpdate::updatedText(*_marshaller, *text, _root);
+}
+
 bool QXXMLDocumentFile::isEdited() const {
     if (_undoManager)
         return !_undoManager->isAtSavedMark();
-    const Ref<const QXXMLDocumentFile> self(this); // getters may let go of it
-    const auto update = qx::detail::DocumentUpdate(*_marshaller, _text, _root).run();
+    const Ref<Data> text = _text;
+    const auto update = this->update(text);
     return !update || !update->edits().empty();
 }
 
@@ -65,8 +95,9 @@ bool QXXMLDocumentFile::write(const String& path, const Ref<Data>& bytes, Ref<Er
 
 bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     qx::detail::reset(error);
-    const Ref<const QXXMLDocumentFile> self(this); // getters may let go of it
-    const auto update = qx::detail::DocumentUpdate(*_marshaller, _text, _root).run();
+    const Ref<QXXMLDocumentFile> kept(this);
+    const Ref<Data> text = _text;
+    const auto update = this->update(text);
     if (!update) {
         if (error != nullptr)
             *error = update.error();
@@ -75,13 +106,13 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     const auto theirs = qx::readFile(_path, error);
     if (!theirs)
         return false;
-    const bool isSame = theirs->view() == _text->view();
+    const bool isSame = theirs->view() == text->view();
     if (!isSame && changed == Changed::refuse)
         return qx::fail(error, qx::errors::fileHasChanged, _path);
     if (!isSame && changed == Changed::carryOver)
-        return carryOver(*update, theirs, error);
+        return carryOver(text, *update, theirs, error);
     if (isSame && update->edits().empty()) {
-        setBase(_text);
+        setBase(text);
         return true;
     }
     return write(_path, update->bytes(), error);
@@ -89,19 +120,22 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
 
 bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
     qx::detail::reset(error);
-    const Ref<const QXXMLDocumentFile> self(this); // getters may let go of it
-    const auto update = qx::detail::DocumentUpdate(*_marshaller, _text, _root).run();
+    const Ref<QXXMLDocumentFile> kept(this);
+    const Ref<Data> text = _text;
+    const String to = path; // which may be the file's own
+    const auto update = this->update(text);
     if (!update && error != nullptr)
         *error = update.error();
-    if (!update || !write(path, update->bytes(), error))
+    if (!update || !write(to, update->bytes(), error))
         return false;
-    _path = path;
+    _path = to;
     return true;
 }
 
 bool QXXMLDocumentFile::revert(Ref<Error>* error) {
     qx::detail::reset(error);
-    const Ref<const QXXMLDocumentFile> self(this);
+    const Ref<QXXMLDocumentFile> kept(this);
+    const ExactKeeping exact(_marshaller);
     auto text = qx::readFile(_path, error);
     if (!text || !_marshaller->readStringInto(_root, *text, error))
         return false;
@@ -111,10 +145,11 @@ bool QXXMLDocumentFile::revert(Ref<Error>* error) {
 
 // The merged text is read before anything is written: a text that was carried to a wrong place may
 // be none.
-bool QXXMLDocumentFile::carryOver(const QXXMLUpdate& update, const Ref<Data>& theirs,
-                                  Ref<Error>* error) {
+bool QXXMLDocumentFile::carryOver(const Ref<Data>& text, const QXXMLUpdate& update,
+                                  const Ref<Data>& theirs, Ref<Error>* error) {
+    const ExactKeeping exact(_marshaller);
     const auto options = qx::detail::parsingOf(*_marshaller);
-    const auto base = qx::XMLParser::parse(_text, options, error);
+    const auto base = qx::XMLParser::parse(text, options, error);
     const auto now = base ? qx::XMLParser::parse(theirs, options, error) : nullptr;
     if (!now)
         return false;

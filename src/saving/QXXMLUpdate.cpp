@@ -2,6 +2,7 @@
 
 #include "files/AtomicWrite.h"
 #include "files/Files.h"
+#include "model/Errors.h"
 #include "saving/DocumentUpdate.h"
 
 using qx::Error;
@@ -10,9 +11,7 @@ using qx::Result;
 
 Result<QXXMLUpdate> QXXMLUpdate::updatedText(QXXMLMarshaller& marshaller, qx::XMLBytes original,
                                              const qx::Value& object) {
-    // A copy: getters may change what the caller holds.
-    auto bytes = qx::make<qx::Data>(original.view());
-    return qx::detail::DocumentUpdate(marshaller, std::move(bytes), object).run();
+    return qx::detail::DocumentUpdate(marshaller, original, object).run();
 }
 
 Result<QXXMLUpdate> QXXMLUpdate::updateFile(QXXMLMarshaller& marshaller, const qx::Value& object,
@@ -21,9 +20,14 @@ Result<QXXMLUpdate> QXXMLUpdate::updateFile(QXXMLMarshaller& marshaller, const q
     const auto original = qx::readFile(path, &error);
     if (!original)
         return error;
-    auto update = qx::detail::DocumentUpdate(marshaller, original, object).run();
-    const bool isToBeWritten = update && !update->edits().empty();
-    if (isToBeWritten && !qx::writeFileAtomically(path, update->bytes()->view(), &error))
+    auto update = updatedText(marshaller, *original, object);
+    if (!update || update->edits().empty())
+        return update;
+    const auto now = qx::readFile(path, &error);
+    const bool isSame = now && now->view() == original->view();
+    if (now && !isSame)
+        qx::fail(&error, qx::errors::fileHasChanged, path);
+    if (!isSame || !qx::writeFileAtomically(path, update->bytes()->view(), &error))
         return error;
     return update;
 }

@@ -15,6 +15,8 @@ ShownComparison::Shown ShownComparison::firstDifference() {
 ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
     const auto& is = _wanted[wanted];
     const auto& other = _found[found];
+    if (is.hash == other.hash)
+        return none;
     if (is.kind != other.kind)
         return wanted;
     if (is.kind == Kind::text)
@@ -23,6 +25,7 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
         return wanted;
     if (is.kind == Kind::object && !keepTheSame(wanted, found))
         return wanted;
+    const bool isOfOtherForm = is.kind == Kind::field && is.isList != other.isList;
     Shown a = wanted + 1, b = found + 1;
     while (true) {
         while (a < is.next && _wanted[a].isHidden)
@@ -31,6 +34,8 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
             b = _found[b].next;
         if (a >= is.next || b >= other.next)
             return a >= is.next && b >= other.next ? none : wanted;
+        if (isOfOtherForm)
+            return wanted;
         if (const Shown different = compare(a, b); different != none)
             return different;
         a = _wanted[a].next;
@@ -61,14 +66,16 @@ bool ShownComparison::keepTheSame(Shown wanted, Shown found) const {
     return true;
 }
 
-void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) {
+void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) const {
+    if (!_wanted.hidesSome())
+        return;
     // Both show the same, but for hidden values, which stand one in a field.
     Shown b = 0;
     for (Shown a = 0; a < _wanted.size() && b < _found.size(); ++a, ++b) {
         const bool isHidden = _wanted[a].isHidden;
         const bool isOther = _found[b].isHidden;
         if (isHidden && isOther) {
-            if (_wanted[a].kind != _found[b].kind || _wanted.text(a) != _found.text(b))
+            if (_wanted[a].kind != _found[b].kind || _wanted[a].hash != _found[b].hash)
                 visit(a);
             a = _wanted[a].next - 1;
             b = _found[b].next - 1;

@@ -15,14 +15,15 @@ public:
     using IsDouble = std::function<bool(const ClassPlan*, const std::string&)>;
     static constexpr Shown none = WritingTrace::none;
 
-    ShownComparison(const WritingTrace& wanted, const WritingTrace& found, IsDouble isDouble)
+    ShownComparison(const WritingTrace& wanted, const WritingTrace& found,
+                    IsDouble isDouble = nullptr)
         : _wanted(wanted), _found(found), _isDouble(std::move(isDouble)) {}
 
     // The first object or field of the wanted ones that is another in the found ones; none where
     // all are the same.
     Shown firstDifference();
     // Calls visit(value) for each value of the wanted ones that is hidden, and another there.
-    void forEachUnshown(const std::function<void(Shown)>& visit);
+    void forEachUnshown(const std::function<void(Shown)>& visit) const;
 
 private:
     Shown compare(Shown wanted, Shown found);

@@ -18,7 +18,7 @@ public:
     // The bytes of a text that came from the document's text, of which each part that is the same
     // has the same bytes. Null with
     //   -231  "The document cannot be changed in its encoding: %@"
-    Ref<Data> encoded(std::string_view text, std::string_view sourceText, Ref<Error>* error) const;
+    Ref<Data> encoded(std::string text, std::string_view sourceText, Ref<Error>* error) const;
 
 private:
     const std::string_view _bytes;

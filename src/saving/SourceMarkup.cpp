@@ -2,6 +2,9 @@
 
 #include "xml/XMLCharacters.h"
 
+#include <algorithm>
+#include <array>
+#include <span>
 #include <unordered_map>
 
 namespace qx::detail {
@@ -9,7 +12,12 @@ namespace qx::detail {
 namespace {
 
 constexpr std::size_t npos = std::string_view::npos;
-constexpr std::string_view nameEnds = " \t\r\n=/>?";
+constexpr auto endsName = [] {
+    std::array<bool, 256> ends{};
+    for (const char c : std::string_view(" \t\r\n=/>?"))
+        ends[static_cast<unsigned char>(c)] = true;
+    return ends;
+}();
 
 std::size_t behind(std::string_view text, std::string_view part, std::size_t from) {
     const std::size_t at = text.find(part, from);
@@ -44,6 +52,8 @@ SourceMarkup::SourceMarkup(const XMLIndex& index)
     findParents();
     tokenise();
     place();
+    _tokens = {};
+    _attributes = {};
 }
 
 void SourceMarkup::findParents() {
@@ -76,7 +86,9 @@ std::size_t SourceMarkup::skipProlog() const {
 }
 
 std::string_view SourceMarkup::nameAt(std::size_t begin) const {
-    const std::size_t end = text().find_first_of(nameEnds, begin);
+    std::size_t end = begin;
+    while (end < text().size() && !endsName[static_cast<unsigned char>(text()[end])])
+        ++end;
     return text().substr(begin, end - begin);
 }
 
@@ -163,19 +175,40 @@ void SourceMarkup::place() {
     }
 }
 
+// The index mostly lists them as the text does, declarations first.
 void SourceMarkup::placeAttributes(Number element, const Token& token) {
-    std::unordered_map<std::string_view, const Attribute*> byName;
-    for (std::uint32_t i = token.attributes; i < token.attributesEnd; ++i)
-        byName.emplace(_attributes[i].name, &_attributes[i]);
-    for (Number at = _index.content(element); !byName.empty() && at < _index.firstChild(element);
-         ++at) {
+    const std::size_t count = token.attributesEnd - token.attributes;
+    if (count == 0)
+        return;
+    const std::span all(_attributes.data() + token.attributes, count);
+    std::unordered_map<std::string_view, std::size_t> byName;
+    const auto find = [&](auto isNamed, std::string_view name, std::size_t expected) {
+        constexpr std::size_t fewAttributes = 8;
+        if (isNamed(all[expected]))
+            return expected;
+        if (count <= fewAttributes)
+            return static_cast<std::size_t>(std::ranges::find_if(all, isNamed) - all.begin());
+        if (byName.empty())
+            for (std::size_t i = 0; i < count; ++i)
+                byName.emplace(all[i].name, i);
+        const auto found = byName.find(name);
+        return found != byName.end() ? found->second : count;
+    };
+    std::size_t next = 0;
+    const auto place = [&](Number at, std::string_view name) {
+        const std::size_t found =
+            find([&](const Attribute& one) { return one.name == name; }, name, next);
+        if (found == count)
+            return;
+        _spots[at] = all[found].spot;
+        next = (found + 1) % count;
+    };
+    for (Number at = _index.content(element); at < _index.firstChild(element); ++at) {
         const String& name = _index.name(_index[at]);
-        const bool isDeclaration = _index[at].nodeKind() == XMLNodeKind::namespaceDeclaration;
-        const std::string declared =
-            name.isEmpty() ? "xmlns" : String::concat({"xmlns:", name}).str();
-        const auto found = byName.find(isDeclaration ? std::string_view(declared) : name.view());
-        if (found != byName.end())
-            _spots[at] = found->second->spot;
+        if (_index[at].nodeKind() != XMLNodeKind::namespaceDeclaration)
+            place(at, name.view());
+        else
+            place(at, name.isEmpty() ? std::string("xmlns") : "xmlns:" + name.str());
     }
 }
 
@@ -186,13 +219,13 @@ void SourceMarkup::placeChildren(Number element, std::uint32_t token) {
     const std::size_t before = _pairs.size();
     Number at = _index.firstChild(element);
     const Number atEnd = _index.contentEnd(element);
-    std::vector<std::pair<Number, std::uint32_t>> leaves;
+    _leaves.clear();
     while (at < atEnd || child < end) {
         const bool isText = child < end && _tokens[child].kind == XMLNodeKind::text;
         const bool hasText = at < atEnd && _index[at].nodeKind() == XMLNodeKind::text;
         if (isText || hasText) {
             if (isText && hasText)
-                leaves.emplace_back(at, child);
+                _leaves.emplace_back(at, child);
             at = hasText ? _index.siblingOf(at) : at;
             child = isText ? _tokens[child].next : child;
             continue;
@@ -208,11 +241,11 @@ void SourceMarkup::placeChildren(Number element, std::uint32_t token) {
         if (_tokens[child].kind == XMLNodeKind::element)
             _pairs.emplace_back(at, child);
         else
-            leaves.emplace_back(at, child);
+            _leaves.emplace_back(at, child);
         at = _index.siblingOf(at);
         child = _tokens[child].next;
     }
-    for (const auto& [entry, leaf] : leaves)
+    for (const auto& [entry, leaf] : _leaves)
         _spots[entry] = _tokens[leaf].spot;
 }
 

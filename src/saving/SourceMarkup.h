@@ -71,8 +71,10 @@ private:
     std::vector<Number> _parents;
     std::vector<Token> _tokens;
     std::vector<Attribute> _attributes;
-    std::vector<std::uint32_t> _open;                     // tokens of elements
-    std::vector<std::pair<Number, std::uint32_t>> _pairs; // that are still to be laid beside
+    std::vector<std::uint32_t> _open; // tokens of elements
+    // Of an entry and a token: elements that are still to be gone into, and what else an element
+    // has.
+    std::vector<std::pair<Number, std::uint32_t>> _pairs, _leaves;
 };
 
 } // namespace qx::detail

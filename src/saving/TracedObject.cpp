@@ -9,10 +9,10 @@
 namespace qx::detail {
 
 bool TracedWriting::write(const QXXMLMarshaller& marshaller, const Value& object,
-                          std::size_t expectedEntries, Ref<Error>* error) {
+                          const Size& expected, XMLDraft::Values values, Ref<Error>* error) {
     _object = object;
-    _trace.reserve(expectedEntries);
-    _draft = std::make_unique<XMLDraft>();
+    _trace.reserve(expected.entries, expected.texts);
+    _draft = std::make_unique<XMLDraft>(values);
     if (!Marshalling(marshaller, *_draft, _trace).marshallObject(object, error))
         return false;
     _trace.hash();
@@ -20,30 +20,41 @@ bool TracedWriting::write(const QXXMLMarshaller& marshaller, const Value& object
 }
 
 std::unique_ptr<TracedReading> TracedReading::of(QXXMLMarshaller& marshaller, Ref<const Data> bytes,
-                                                 Ref<Error>* error) {
-    std::unique_ptr<TracedReading> traced(new TracedReading(marshaller));
+                                                 Ref<Error>* error, WritingTrace::Extent extent) {
+    std::unique_ptr<TracedReading> traced(new TracedReading);
     traced->_parsed = XMLParser::parse(std::move(bytes), parsingOf(marshaller), error);
     if (!traced->_parsed)
         return nullptr;
     traced->_document = std::make_unique<IndexedXML>(*traced->_parsed);
     IndexedXML& document = *traced->_document;
+    traced->_read.reserve(traced->index().entries().size());
     Ref<Error> problem;
-    Ref<Object> object;
     {
         const NoUndo noUndo(marshaller.undoManager());
-        object = readDocument(marshaller, document, &problem, &traced->_read);
+        traced->_object = readDocument(marshaller, document, &problem, &traced->_read);
     }
-    if (!object && !problem)
+    if (!traced->_object && !problem)
         fail(&problem, errors::noDefinitionForElement,
              [&] { return document.quoted(document.root()); });
-    // Mostly a field and a value for each use.
-    const std::size_t entries = 2 * traced->_read.uses().size() + 1;
-    if (!problem && traced->_written.write(marshaller, object, entries, &problem)) {
-        traced->_written.keepTraceOnly();
+    if (!problem && traced->write(marshaller, extent, &problem))
         return traced;
-    }
     *error = std::move(problem);
     return nullptr;
+}
+
+bool TracedReading::write(const QXXMLMarshaller& marshaller, WritingTrace::Extent extent,
+                          Ref<Error>* error) {
+    const bool isAll = extent == WritingTrace::Extent::all;
+    // Mostly a field and a value for each use.
+    const TracedWriting::Size size{isAll ? 2 * _read.uses().size() + 1 : 0,
+                                   isAll ? index().text().size() / 2 : 0};
+    _written = std::make_unique<TracedWriting>(marshaller, extent);
+    if (!_written->write(marshaller, _object, size, XMLDraft::Values::dropped, error))
+        return false;
+    _written->keepTraceOnly();
+    if (isAll)
+        _object.reset();
+    return true;
 }
 
 // The elements that stand around what was taken, too.

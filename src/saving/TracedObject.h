@@ -16,15 +16,21 @@ namespace qx::detail {
 
 class TracedWriting {
 public:
-    explicit TracedWriting(const QXXMLMarshaller& marshaller)
-        : _mapping(marshaller.mapping()), _trace(marshaller.saveUnknownXML()) {}
+    explicit TracedWriting(const QXXMLMarshaller& marshaller,
+                           WritingTrace::Extent extent = WritingTrace::Extent::all)
+        : _mapping(marshaller.mapping()), _trace(marshaller.saveUnknownXML(), extent) {}
     TracedWriting(const TracedWriting&) = delete;
     TracedWriting& operator=(const TracedWriting&) = delete;
 
-    // False with an error of marshalling.
-    bool write(const QXXMLMarshaller& marshaller, const Value& object, std::size_t expectedEntries,
-               Ref<Error>* error);
+    // False with an error of marshalling. About so many entries and bytes of text are expected.
+    // With values, what is shown may be printed.
+    struct Size {
+        std::size_t entries, texts;
+    };
+    bool write(const QXXMLMarshaller& marshaller, const Value& object, const Size& expected,
+               XMLDraft::Values values, Ref<Error>* error);
     const WritingTrace& trace() const noexcept { return _trace; }
+    std::optional<std::uint64_t> hash() { return _trace.hash(); }
     // Lets go of all but what the trace itself says: nothing is printed from the draft.
     void keepTraceOnly() {
         _draft.reset();
@@ -41,37 +47,48 @@ private:
 // A text, what was read from it, and what writing makes of that.
 class TracedReading {
 public:
-    // Null with an error of reading or of writing.
-    static std::unique_ptr<TracedReading> of(QXXMLMarshaller& marshaller, Ref<const Data> bytes,
-                                             Ref<Error>* error);
+    // Null with an error of reading or of writing. With nothing but a hash of what is written, the
+    // rest may come later.
+    static std::unique_ptr<TracedReading>
+    of(QXXMLMarshaller& marshaller, Ref<const Data> bytes, Ref<Error>* error,
+       WritingTrace::Extent extent = WritingTrace::Extent::all);
+    bool writeAll(const QXXMLMarshaller& marshaller, Ref<Error>* error) {
+        return write(marshaller, WritingTrace::Extent::all, error);
+    }
 
     const XMLIndex& index() const noexcept { return _parsed->index(); }
     IndexedXML& document() noexcept { return *_document; }
     const ReadingTrace& read() const noexcept { return _read; }
-    const WritingTrace& written() const noexcept { return _written.trace(); }
+    const WritingTrace& written() const noexcept { return _written->trace(); }
+    std::optional<std::uint64_t> hash() { return _written->hash(); }
     // Calls take(plan, text) for each node that an object keeps although a field took it, or
     // something in it.
     template <class Take>
     void forEachDouble(Take take);
 
 private:
-    explicit TracedReading(const QXXMLMarshaller& marshaller) : _written(marshaller) {}
+    TracedReading() = default;
 
+    bool write(const QXXMLMarshaller& marshaller, WritingTrace::Extent extent, Ref<Error>* error);
     std::vector<bool> takenEntries() const;
 
     XMLParser::Parsed _parsed;
     std::unique_ptr<IndexedXML> _document;
     ReadingTrace _read;
-    TracedWriting _written;
+    Ref<Object> _object; // until all of it is written
+    std::unique_ptr<TracedWriting> _written;
 };
 
 template <class Take>
 void TracedReading::forEachDouble(Take take) {
     using Form = ReadingTrace::Form;
-    const std::vector<bool> taken = takenEntries();
+    std::vector<bool> taken;
     for (const ReadingTrace::Use& use : _read.uses()) {
-        const bool isKept = use.form == Form::keptChild || use.form == Form::keptAttribute;
-        if (!isKept || !taken[use.entry])
+        if (use.form != Form::keptChild && use.form != Form::keptAttribute)
+            continue;
+        if (taken.empty())
+            taken = takenEntries();
+        if (!taken[use.entry])
             continue;
         const ClassPlan* const plan = _read.owners()[use.owner].plan;
         if (use.form == Form::keptChild)

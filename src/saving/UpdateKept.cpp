@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace qx::detail {
 
@@ -25,10 +26,31 @@ void UpdatePlan::compareKept(const Context& context) {
     const auto* after = _source.after.keptOf(context.after);
     const WritingTrace::KeptList& was = before != nullptr ? *before : nothing;
     const WritingTrace::KeptList& is = after != nullptr ? *after : nothing;
-    if (!areEqual(was.children, is.children))
+    if (!areEqual(was.children, is.children)) {
+        countDoubles(*_source.after[context.after].plan, was.children, is.children);
         compareKeptChildren(context, was, is);
-    if (!areEqual(was.attributes, is.attributes))
+    }
+    if (!areEqual(was.attributes, is.attributes)) {
+        countDoubles(*_source.after[context.after].plan, was.attributes, is.attributes);
         compareKeptAttributes(context, was, is);
+    }
+}
+
+// What a field took, too, is as old in the object as the object's reading. Where there are as many
+// of its name in both, it stands in the same place.
+void UpdatePlan::countDoubles(const ClassPlan& plan, const std::vector<Kept>& was,
+                              const std::vector<Kept>& is) {
+    std::unordered_map<String, std::vector<const Kept*>> before, now;
+    for (const Kept& each : was)
+        before[each.node->name()].push_back(&each);
+    for (const Kept& each : is)
+        now[each.node->name()].push_back(&each);
+    for (const auto& [name, named] : before) {
+        const auto& same = now[name];
+        for (std::size_t i = 0; i < named.size() && same.size() == named.size(); ++i)
+            if (_source.writer.isTaken(&plan, named[i]->text))
+                _source.writer.countAsTaken(&plan, same[i]->text);
+    }
 }
 
 // The object lists them by name, each name's in the order of the document.
@@ -62,12 +84,13 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
     };
     const ListMatching matching = match(itemsOf(was.children), itemsOf(is.children));
     std::vector<bool> isThere(was.children.size());
+    const Place end = placeInside(context.entry);
     for (std::size_t i = 0; i < is.children.size(); ++i) {
         const std::string& text = is.children[i].text;
         const std::size_t before = matching.was[i];
         if (before == ListMatching::none) {
             if (!_source.writer.isTaken(plan, text))
-                insertChild(text, placeInside(context.entry), context.after);
+                insertChild(_source.writer.markup(text), end, context.after);
             continue;
         }
         isThere[before] = true;
@@ -77,7 +100,8 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
         const Entry entry = entries[before];
         if (entry == none || !_source.markup[entry].isPlaced())
             return fail(context.after);
-        add(_source.markup[entry].begin, _source.markup[entry].end, text, context.after);
+        add(_source.markup[entry].begin, _source.markup[entry].end, _source.writer.markup(text),
+            context.after);
     }
     for (std::size_t i = 0; i < isThere.size(); ++i) {
         if (isThere[i] || _source.writer.isTaken(plan, was.children[i].text))
@@ -91,15 +115,20 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
 void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
                                        const WritingTrace::KeptList& is) {
     const std::vector<Entry> entries = entriesOfKept(context, was.attributes);
-    std::unordered_map<String, const Kept*> now;
-    for (const Kept& each : is.attributes)
-        now.emplace(each.node->name(), &each);
+    std::unordered_map<String, std::vector<const Kept*>> now; // those of wrappers may share a name
+    for (auto each = is.attributes.rbegin(); each != is.attributes.rend(); ++each)
+        now[each->node->name()].push_back(&*each);
+    std::unordered_set<const Kept*> known;
     for (std::size_t i = 0; i < was.attributes.size(); ++i) {
-        const auto found = now.find(was.attributes[i].node->name());
-        const Kept* const kept = found != now.end() ? found->second : nullptr;
-        if (found != now.end())
-            now.erase(found);
-        if (kept != nullptr && kept->text == was.attributes[i].text)
+        auto& named = now[was.attributes[i].node->name()];
+        const Kept* const kept = !named.empty() ? named.back() : nullptr;
+        if (kept != nullptr) {
+            named.pop_back();
+            known.insert(kept);
+        }
+        const bool isDouble =
+            _source.writer.isTaken(_source.after[context.after].plan, was.attributes[i].text);
+        if (isDouble || (kept != nullptr && kept->text == was.attributes[i].text))
             continue;
         if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
             return fail(context.after);
@@ -113,13 +142,15 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
             add(blanksBefore(spot.begin), spot.end, {}, context.after);
     }
     const SourceMarkup::Spot& tag = _source.markup[context.entry];
+    if (known.size() == is.attributes.size())
+        return;
     if (!tag.isPlaced())
-        return now.empty() ? void() : fail(context.after);
+        return fail(context.after);
     const auto nameEnd =
         tag.begin + 1 +
         static_cast<SourceMarkup::Offset>(_source.document.writtenName(context.entry).size());
     for (const Kept& each : is.attributes)
-        if (now.contains(each.node->name()))
+        if (!known.contains(&each))
             add(nameEnd, nameEnd,
                 _source.writer.attribute(each.node->name().view(), each.node->stringValue().view()),
                 context.after);

@@ -39,7 +39,6 @@ void UpdatePlan::compareList(const Context& context, Shown before, Shown after,
 // By place, or, where a setter has sorted them, by the objects themselves. False where it does not
 // show which is which.
 bool UpdatePlan::findEntries(const Context& context, List& list) const {
-    std::unordered_map<const Object*, std::uint32_t> byObject;
     for (const std::uint32_t number : usesOf(context.owner, list.plan)) {
         const ReadingTrace::Use& taken = use(number);
         list.binding = taken.binding;
@@ -47,17 +46,34 @@ bool UpdatePlan::findEntries(const Context& context, List& list) const {
             list.wrapper = taken.entry;
         else if (taken.form == Form::item || taken.form == Form::child)
             list.uses.push_back(number);
-        if (taken.made != ReadingTrace::none)
-            byObject.emplace(_source.read.owners()[taken.made].object, number);
     }
     if (list.uses.size() != list.was.size())
         return false;
+    bool isSorted = false;
     for (std::size_t i = 0; i < list.was.size(); ++i) {
         const WritingTrace::Shown& shown = _source.before[list.was[i]];
         const bool isObject = shown.kind == WritingTrace::Kind::object;
         if (isObject != (use(list.uses[i]).made != ReadingTrace::none))
             return false;
-        if (!isObject || shown.object == nullptr)
+        isSorted = isSorted ||
+                   (isObject && shown.object != nullptr && shown.object != objectOf(list.uses[i]));
+    }
+    return !isSorted || findObjects(list);
+}
+
+// What was read as it; null of a text.
+const Object* UpdatePlan::objectOf(std::uint32_t number) const {
+    const std::uint32_t made = use(number).made;
+    return made != ReadingTrace::none ? _source.read.owners()[made].object : nullptr;
+}
+
+bool UpdatePlan::findObjects(List& list) const {
+    std::unordered_map<const Object*, std::uint32_t> byObject;
+    for (const std::uint32_t number : list.uses)
+        byObject.emplace(objectOf(number), number);
+    for (std::size_t i = 0; i < list.was.size(); ++i) {
+        const WritingTrace::Shown& shown = _source.before[list.was[i]];
+        if (shown.kind != WritingTrace::Kind::object || shown.object == nullptr)
             continue;
         const auto found = byObject.find(shown.object);
         if (found == byObject.end())
@@ -87,41 +103,44 @@ std::string_view textOfField(const WritingTrace& trace, WritingTrace::Number ite
     return hasText ? trace.text(value) : std::string_view();
 }
 
-bool setKeys(const WritingTrace& trace, const std::vector<WritingTrace::Number>& values,
-             std::size_t ordinal, std::vector<ListItem>& items) {
+// False where not all have one, each its own.
+bool findKeys(const WritingTrace& trace, const std::vector<WritingTrace::Number>& values,
+              std::size_t ordinal, std::vector<std::string_view>& keys) {
     std::unordered_set<std::string_view> seen;
-    for (std::size_t i = 0; i < values.size(); ++i) {
-        const std::string_view text = textOfField(trace, values[i], ordinal);
+    keys.clear();
+    for (const WritingTrace::Number value : values) {
+        const std::string_view text = textOfField(trace, value, ordinal);
         if (text.empty() || !seen.insert(text).second)
             return false;
-        items[i].key = text;
+        keys.push_back(text);
     }
     return true;
+}
+
+bool areOfKind(const WritingTrace& trace, const std::vector<WritingTrace::Number>& values,
+               std::uint64_t kind) {
+    return std::ranges::all_of(
+        values, [&](WritingTrace::Number value) { return itemOf(trace, value).kind == kind; });
 }
 
 } // namespace
 
 // The first attribute in the mapping's order that all items have, each its own.
-void UpdatePlan::findKeys(std::vector<ListItem>& before, std::vector<ListItem>& now,
-                          const List& list) const {
-    if (now.empty() || before.empty() || now.front().kind == 0)
-        return;
-    const auto isOfKind = [&](const ListItem& item) { return item.kind == now.front().kind; };
-    if (!std::all_of(before.begin(), before.end(), isOfKind) ||
-        !std::all_of(now.begin(), now.end(), isOfKind))
-        return;
-    std::size_t ordinal = 0;
+ListKeys UpdatePlan::keysOf(const List& list) const {
     const Shown first = list.is.front();
+    const std::uint64_t kind = itemOf(_source.after, first).kind;
+    if (kind == 0 || !areOfKind(_source.before, list.was, kind) ||
+        !areOfKind(_source.after, list.is, kind))
+        return {};
+    std::size_t ordinal = 0;
+    ListKeys keys;
     for (Shown field = first + 1; field < _source.after[first].next;
-         field = _source.after[field].next, ++ordinal) {
+         field = _source.after[field].next, ++ordinal)
         if (_source.after[field].field->kind == BindingKind::attribute &&
-            setKeys(_source.before, list.was, ordinal, before) &&
-            setKeys(_source.after, list.is, ordinal, now))
-            return;
-    }
-    for (auto* items : {&before, &now})
-        for (ListItem& item : *items)
-            item.key.clear();
+            findKeys(_source.before, list.was, ordinal, keys.before) &&
+            findKeys(_source.after, list.is, ordinal, keys.now))
+            return keys;
+    return {};
 }
 
 // How many fields of two objects of a class say the same, and keep the same.
@@ -151,10 +170,10 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
         before.push_back(itemOf(_source.before, value));
     for (const Shown value : list.is)
         now.push_back(itemOf(_source.after, value));
-    findKeys(before, now, list);
-    const ListMatching matching = match(before, now, [&](std::size_t was, std::size_t is) {
-        return likeness(list.was[was], list.is[is]);
-    });
+    const ListMatching matching = match(
+        before, now,
+        [&](std::size_t was, std::size_t is) { return likeness(list.was[was], list.is[is]); },
+        [&] { return keysOf(list); });
     std::size_t previous = ListMatching::none; // that has kept its place
     std::size_t first = 0;
     for (std::size_t i = 0; i < list.is.size() && first == 0; ++i)
@@ -164,7 +183,8 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
         const std::size_t was = matching.was[i];
         if (was != ListMatching::none && matching.stays[i]) {
             previous = was;
-            compareValue(context, list.uses[was], list.was[was], list.is[i], ordinal);
+            if (before[was].hash != now[i].hash || !_anew.empty())
+                compareValue(context, list.uses[was], list.was[was], list.is[i], ordinal);
             continue;
         }
         const Entry beside =

@@ -98,6 +98,8 @@ UpdatePlan::Entry UpdatePlan::attributeOf(const Context& context, Shown field) c
 }
 
 void UpdatePlan::insertChild(const std::string& printed, const Place& place, Shown shown) {
+    if (place.at == SourceMarkup::none)
+        return fail(shown);
     const std::string text = (place.line ? *place.line : "") + printed;
     if (place.opened == none)
         return add(place.at, place.at, text, shown);
@@ -169,6 +171,8 @@ UpdatePlan::Place UpdatePlan::placeBefore(Entry child) const {
 // At the end of what the element holds.
 UpdatePlan::Place UpdatePlan::placeInside(Entry element) const {
     const SourceMarkup::Spot& spot = _source.markup[element];
+    if (!spot.isPlaced())
+        return {SourceMarkup::none, std::nullopt, none};
     Entry last = none;
     _source.document.forEachChild(element, [&](Entry child) {
         if (_source.markup[child].isPlaced() && _source.document.kind(child) != XMLNodeKind::text)

@@ -1,6 +1,7 @@
 #include "saving/UpdatePlan.h"
 
 #include <algorithm>
+#include <numeric>
 
 namespace qx::detail {
 
@@ -9,11 +10,22 @@ using Form = ReadingTrace::Form;
 UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew)
     : _source(source), _anew(anew) {
     const auto& uses = source.read.uses();
+    const auto fieldOf = [&](std::uint32_t use) { return uses[use].field; };
+    // By owner in one pass, then each owner's by field.
+    std::vector<std::uint32_t> ends(source.read.owners().size() + 1);
+    for (const ReadingTrace::Use& use : uses)
+        ++ends[use.owner + 1];
+    std::partial_sum(ends.begin(), ends.end(), ends.begin());
+    _uses.resize(uses.size());
     for (std::uint32_t i = 0; i < uses.size(); ++i)
-        _uses.push_back(i);
-    std::stable_sort(_uses.begin(), _uses.end(), [&](std::uint32_t a, std::uint32_t b) {
-        return std::pair(uses[a].owner, uses[a].field) < std::pair(uses[b].owner, uses[b].field);
-    });
+        _uses[ends[uses[i].owner]++] = i;
+    std::size_t begin = 0;
+    for (const std::uint32_t end : std::span(ends).first(ends.size() - 1)) {
+        const auto own = std::span(_uses).subspan(begin, end - begin);
+        if (!std::ranges::is_sorted(own, {}, fieldOf))
+            std::ranges::stable_sort(own, {}, fieldOf);
+        begin = end;
+    }
 }
 
 void UpdatePlan::run() {

@@ -75,7 +75,7 @@ private:
         Entry first = none, last = none;
     };
     struct Place {
-        SourceMarkup::Offset at = 0;
+        SourceMarkup::Offset at = 0;     // none where there is no place
         std::optional<std::string> line; // starts what is new there
         Entry opened = none;             // what is new is all that stands in this element
     };
@@ -100,8 +100,9 @@ private:
     struct List;
     void compareList(const Context& context, Shown before, Shown after, std::size_t ordinal);
     bool findEntries(const Context& context, List& list) const;
-    void findKeys(std::vector<ListItem>& before, std::vector<ListItem>& now,
-                  const List& list) const;
+    bool findObjects(List& list) const;
+    const Object* objectOf(std::uint32_t number) const;
+    ListKeys keysOf(const List& list) const;
     std::size_t likeness(Shown was, Shown is) const;
     void arrangeList(const Context& context, const List& list, std::size_t ordinal);
     void fillList(const Context& context, const List& list, std::size_t ordinal);
@@ -151,6 +152,8 @@ private:
 
     // UpdateKept.cpp
     void compareKept(const Context& context);
+    void countDoubles(const ClassPlan& plan, const std::vector<WritingTrace::Kept>& was,
+                      const std::vector<WritingTrace::Kept>& is);
     void compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
                              const WritingTrace::KeptList& is);
     void compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,

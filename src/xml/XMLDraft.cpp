@@ -23,6 +23,10 @@ void XMLDraft::grow(std::size_t size) {
 }
 
 XMLDraft::Node* XMLDraft::newNode(Kind kind, const String* name, std::string_view value) {
+    const bool isKept = kind == Kind::keptChildren || kind == Kind::keptAttributes ||
+                        kind == Kind::keptDeclarations;
+    if (_values == Values::dropped && !isKept)
+        value = {};
     // What moves leaves a pointer.
     void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
     Node* const node = ::new (memory) Node{name, nullptr, 0, static_cast<std::uint8_t>(kind)};

@@ -69,7 +69,9 @@ public:
         bool isIndexed;       // its attributes are
     };
 
-    XMLDraft() noexcept = default;
+    // What is only to be looked at needs no values.
+    enum class Values : std::uint8_t { copied, dropped };
+    explicit XMLDraft(Values values = Values::copied) noexcept : _values(values) {}
     XMLDraft(const XMLDraft&) = delete;
     XMLDraft& operator=(const XMLDraft&) = delete;
 
@@ -153,6 +155,7 @@ private:
     Children& indexedChildren(const Element& element);
     static Ref<XMLElement> makeElement(const Element& draft);
 
+    const Values _values;
     std::vector<std::unique_ptr<std::byte[]>> _blocks;
     std::byte* _next = nullptr;
     std::size_t _left = 0;

@@ -4,6 +4,7 @@
 
 #include "base/MemoryBlocks.h"
 #include "model/ObjectExtras.h"
+#include "xml/KeptPlace.h"
 #include "xml/XMLSiblings.h"
 
 #include <optional>
@@ -323,6 +324,7 @@ Ref<XMLElement> XMLElement::copyAlone() const {
     auto element = Ref<XMLElement>::adopt(newElement(_name, _heldCount));
     element->_line = _line;
     element->_column = _column;
+    KeptPlace::copy(*this, *element);
     if (holdsText())
         element->holdText(_value);
     for (const HeldAttribute& attribute : held())

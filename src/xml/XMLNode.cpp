@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include "base/MemoryBlocks.h"
+#include "xml/KeptPlace.h"
 #include "xml/XMLSerializer.h"
 
 namespace qx {
@@ -77,6 +78,7 @@ void XMLNode::detach() {
 Ref<XMLNode> XMLNode::copy() const {
     auto copied = Ref<XMLNode>::adopt(new XMLNode(_kind, _name, _value));
     copied->_isLayout = _isLayout;
+    KeptPlace::copy(*this, *copied);
     return copied;
 }
 

@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
-# A program that saves a document is killed at each system call of the save, and each of them fails
-# once: what is found afterwards is the old document or the new one, whole. Where even the directories
-# are missing, a save that was killed while it made them is made up for by the next, which removes
-# whatever a killed one left.
+# A program that saves a document, new or with an edit, is killed at each system call of the save, and
+# each of them fails once: what is found afterwards is the old document or the new one, whole. Where
+# even the directories are missing, a save that was killed while it made them is made up for by the
+# next, which removes whatever a killed one left.
 #
 # usage: atomic-write.sh BUILD_DIR SOURCE_DIR
 set -euo pipefail
@@ -35,12 +35,15 @@ fail() {
     exit 1
 }
 
+how=new
+save() { "$program" "$folder/data" "$how"; }
+
 # One undisturbed run from a state gives the new document and, in `calls`, those of the save: "name
 # ordinal arguments", the ordinal counting the calls of that name from the start of the program, as
 # strace does. Calls for memory are left out: the sanitizers make another number of them each time.
 trace() {
     prepare "$1"
-    strace -o "$folder/trace" -- "$program" "$folder/data"
+    strace -o "$folder/trace" -- "$program" "$folder/data" "$how"
     cp -- "$area/a.xml" "$folder/new.xml"
     mapfile -t calls < <(awk '
         match($0, /^[a-z0-9_]+\(/) {
@@ -65,7 +68,8 @@ look() {
     fi
 }
 
-for start in nothing old; do
+for way in new:nothing update:old file:old new:old; do
+    how=${way%:*} start=${way#*:}
     trace "$start"
     [[ $start == old || ${calls[*]} == *mkdir* ]] || fail "no directory was made: ${calls[*]}"
     killed=0
@@ -75,16 +79,29 @@ for start in nothing old; do
         prepare "$start"
         status=0
         { strace -o /dev/null -e "trace=$name" -e "inject=$name:signal=KILL:when=$ordinal" \
-            -- "$program" "$folder/data" >/dev/null; } 2>/dev/null || status=$?
+            -- "$program" "$folder/data" "$how" >/dev/null; } 2>/dev/null || status=$?
         look
         [[ $state == "$start" || $state == new ]] || fail "killed at $name ($ordinal): $state"
         seen[$state]=1
         ((status != 137)) || killed=$((killed + 1))
-        "$program" "$folder/data" || fail "nothing is written after $call"
+        save || fail "nothing is written after $call"
         [[ $(ls -A -- "$area") == a.xml ]] || fail "killed at $call: $(ls -A -- "$area" | tr '\n' ' ')"
     done
     ((killed == ${#calls[@]})) || fail "killed only $killed of ${#calls[@]} times"
     [[ -n ${seen[$start]:-} && -n ${seen[new]:-} ]] || fail "every time: ${!seen[*]}"
+    [[ $start == old ]] || continue
+    for call in "${calls[@]}"; do
+        read -r name ordinal arguments <<<"$call"
+        # The sanitizers have pipes of their own.
+        [[ $name != pipe* && $name != close && ! ($name == write && $arguments != *'<'*) ]] || continue
+        prepare
+        expected=new
+        strace -o /dev/null -e "trace=$name" -e "inject=$name:error=EIO:when=$ordinal" \
+            -- "$program" "$folder/data" "$how" >/dev/null || expected=old
+        look
+        [[ $state == "$expected" ]] || fail "$how, EIO of $call: $state instead of $expected"
+        [[ $(ls -A -- "$area") == a.xml ]] || fail "EIO of $call leaves $(ls -A -- "$area" | tr '\n' ' ')"
+    done
 done
 
 # inject CALL ERROR: lets the first call within the save fail that begins with CALL, a pattern. What
@@ -99,7 +116,7 @@ inject() {
     read -r name ordinal _ <<<"$found"
     prepare
     said=$(strace -o /dev/null -e "trace=$name" -e "inject=$name:error=$2:when=$ordinal" \
-        -- "$program" "$folder/data") || true
+        -- "$program" "$folder/data" "$how") || true
     look
 }
 while IFS='|' read -r name error expected; do

@@ -17,10 +17,10 @@
 //
 // What is read is also read into an object that is there.
 //
-// Options are "strict", "discard", "no-namespaces" and "by-namespace" (of the class mappings), and
-// "given" where nothing is read although the page has shown a document. Each case runs on records,
-// on host classes and on plain structs; where they differ, a block says for which it is: "records",
-// "hosts", "structs".
+// Options are "strict", "discard", "exactly", "no-namespaces" and "by-namespace" (of the class
+// mappings), and "given" where nothing is read although the page has shown a document. Each case
+// runs on records, on host classes and on plain structs; where they differ, a block says for which
+// it is: "records", "hosts", "structs".
 
 #include "ObjectKinds.h"
 #include "support/Cases.h"
@@ -155,6 +155,7 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
         marshaller->setMatchesNamespaces(options.contains("by-namespace"), &error)) {
         marshaller->setLenient(!options.contains("strict"));
         marshaller->setSaveUnknownXML(!options.contains("discard"));
+        marshaller->setKeepsExactly(options.contains("exactly"));
         marshaller->setUsingNamespaceURIs(!options.contains("no-namespaces"));
         const auto source = options.contains("given") ? given.end() : given.find("document");
         const bool isRead = source != given.end();
@@ -188,8 +189,9 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
-    static const support::Words known = {"strict",  "discard", "no-namespaces", "by-namespace",
-                                         "records", "hosts",   "structs",       "given"};
+    static const support::Words known = {"strict",       "discard", "exactly", "no-namespaces",
+                                         "by-namespace", "records", "hosts",   "structs",
+                                         "given"};
     for (const std::string& option : expectation.options)
         EXPECT_TRUE(known.contains(option)) << option << " is no option";
     const auto isFor = [&](const char* name) { return expectation.options.contains(name); };

@@ -227,6 +227,22 @@ void marshalling() {
         s.text = buffer.text();
     });
 
+    tryMaking("updatedText", [](Stage& s) {
+        const auto lines = s.order->valueForKey("lines").as<qx::Array>();
+        if (lines->count() > 1)
+            lines->remove(0);
+        const auto update = QXXMLUpdate::updatedText(s.m, documentText, s.order);
+        s.error = update.error();
+        s.text = update ? update->bytes()->view() : std::string_view();
+    });
+    tryMaking("updatedText, keeping exactly", [](Stage& s) {
+        s.m.setKeepsExactly(true);
+        const auto order = s.m.readString(documentText);
+        const auto update = QXXMLUpdate::updatedText(s.m, documentText, order);
+        s.text = update ? update->bytes()->view() : std::string_view();
+        s.m.setKeepsExactly(false);
+    });
+
     const auto tryBinding = [](const std::string& name, auto bind) {
         tryMarshaller(name, true, [bind](Stage& s) { s.result = bind(s); });
     };

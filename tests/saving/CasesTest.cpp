@@ -34,6 +34,7 @@ struct Setup {
         marshaller->setMatchesNamespaces(e.options.contains("by-namespace"));
         marshaller->setLenient(!e.options.contains("strict"));
         marshaller->setSaveUnknownXML(!e.options.contains("discard"));
+        marshaller->setKeepsExactly(e.options.contains("exactly"));
         marshaller->setUsingNamespaceURIs(!e.options.contains("no-namespaces"));
     }
     static qx::Ref<qx::XMLDocument> mappingOf(const std::string& text) {
@@ -97,7 +98,7 @@ void checkUnedited(const Expectation& expectation) {
 const bool added = [] {
     support::addCases("tests/saving/saving.md", {"mapping", "prefixes", "document", "edits"},
                       {"diff", "saved", "notes", "error"}, checkUpdate);
-    for (const char* page : {"reading", "writing", "round-trips", "namespaces"})
+    for (const char* page : {"keeping", "reading", "writing", "round-trips", "namespaces"})
         support::addCases("tests/marshaller/" + std::string(page) + ".md",
                           {"mapping", "prefixes", "document", "given"},
                           {"object", "written", "error"}, checkUnedited);

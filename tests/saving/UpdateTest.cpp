@@ -236,3 +236,44 @@ TEST_F(Update, AnUndoManagersMarkTellsWhetherADocumentFileIsEdited) {
     manager->redo();
     EXPECT_FALSE(file->isEdited());
 }
+
+TEST_F(Update, UnknownXMLOfAProgramHasReferencesForWhatTheEncodingLacks) {
+    const auto records = scenario::marshaller("<Note xml='note'/>");
+    const std::string head = "<?xml version='1.0' encoding='US-ASCII'?>";
+    const auto note = records->readString(head + "<note><b/></note>");
+    const auto kept = note->valueForKey("unboundChildren").as<qx::Dictionary>();
+    kept->find("b")->as<qx::Array>()->replace(
+        0, qx::XMLElement::initWithName("b", "\xE2\x82\xAC\xC3\xA9"));
+    const auto update = QXXMLUpdate::updatedText(*records, head + "<note><b/></note>", note);
+    ASSERT_TRUE(update) << support::told(update.error());
+    EXPECT_EQ(update->bytes()->view(), head + "<note><b>&#8364;&#233;</b></note>");
+}
+
+TEST_F(Update, ADocumentFileIsSavedAgainAndAgainWhateverFieldsShare) {
+    const TemporaryFolder folder;
+    const auto records = scenario::marshaller(
+        "<Order xml='order'><day name='on' node='attribute' location='received'/>"
+        "<title node='element'/><to type='To' container='false' node='element'/>"
+        "<lines collection='array' name='line'/></Order>"
+        "<To><street node='element'/></To><Line xml='line'><text node='text'/></Line>");
+    std::string text = "<order><received on='1' by='x'/><title>2</title><street>3</street>"
+                       "<line>4</line><line>5</line></order>";
+    const auto file = QXXMLDocumentFile::open(folder.write("o.xml", text), records);
+    const auto edit = [&](const char* path, const char* before, const char* now) {
+        edits::apply(file->root(), std::string(path) + " = \"" + now + "\"");
+        qx::Ref<qx::Error> error;
+        EXPECT_TRUE(file->save(&error)) << path << support::told(error);
+        EXPECT_FALSE(file->isEdited()) << path;
+        text.replace(text.find(before), 1, now);
+        EXPECT_EQ(folder.read("o.xml"), text);
+    };
+    for (int round = 0; round < 2; ++round) {
+        edit("day", round == 0 ? "1" : "A", round == 0 ? "A" : "E");
+        edit("title", round == 0 ? "2" : "B", round == 0 ? "B" : "F");
+        edit("to.street", round == 0 ? "3" : "C", round == 0 ? "C" : "G");
+        edit("lines[1].text", round == 0 ? "5" : "D", round == 0 ? "D" : "H");
+    }
+    file->root()->valueForKey("lines").as<qx::Array>()->remove(0);
+    text.replace(text.find("<line>4</line>"), 14, "");
+    edit("title", "F", "K");
+}
