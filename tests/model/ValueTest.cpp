@@ -109,8 +109,9 @@ TEST(ValueTest, ATextIsTheSameWhereverItsBytesLie) {
         const Value inside = text, shared = String(text);
         const std::vector<Value> grown = {inside, shared, detail::LentText::of(text)};
         std::string bytes = text;
-        Value lent = detail::LentText::of(bytes);
-        const Value copy = lent, kept = detail::LentText::kept(std::move(lent));
+        Value kept = detail::LentText::of(bytes);
+        const Value copy = kept;
+        detail::LentText::keep(kept);
         bytes.assign(size, 'x');
         Value moved = copy;
         moved = Value(std::move(moved));
