@@ -155,8 +155,8 @@ public:
     using ProgressHandler = qx::detail::UniqueFunction<bool(const Progress&)>;
     void setProgressHandler(ProgressHandler handler);
 
-    // What reading and writing pass over, unbound XML above all, is told to the handler, if there is
-    // one, and not logged. It may do what the one above may; the next call tells one that it sets.
+    // What reading and writing pass over, unbound XML above all, is told to the handler, if any,
+    // and not logged. It may do what the one above may; the next call tells one that it sets.
     void setReportHandler(QXXMLReport::Handler handler);
     // How many errors a reading with a slot collects before it ends, 1 at first; single steps end
     // at the first. Fields and items that fail are left out, and not logged; the answer is null all
