@@ -2,6 +2,8 @@
 
 #include <QXXMLMarshalling/detail/Count.h>
 
+#include "base/BulkArray.h"
+
 #include <algorithm>
 
 namespace qx {
@@ -13,13 +15,17 @@ constexpr std::size_t smallestBlock = 512 - 16;
 constexpr std::size_t largestNodeBlock = 64 * 1024 - 64;
 constexpr std::size_t largestObjectBlock = 8 * 1024 - 64;
 
+// From here on a run of objects has blocks for which large pages are asked.
+constexpr std::size_t largeRun = 64 * 1024 * 1024;
+constexpr std::size_t objectBlockOfLargeRun = 4 * 1024 * 1024;
+
 // Without destructors, so that they can be used until the very end of the thread.
 [[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
-    nodesOfThread(smallestBlock, largestNodeBlock);
+    nodesOfThread(smallestBlock, largestNodeBlock, largestNodeBlock);
 [[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
-    objectsOfThread(smallestBlock, largestObjectBlock);
-[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks textsOfThread(smallestBlock,
-                                                                                     smallestBlock);
+    objectsOfThread(smallestBlock, largestObjectBlock, objectBlockOfLargeRun);
+[[gnu::tls_model("initial-exec")]] constinit thread_local MemoryBlocks
+    textsOfThread(smallestBlock, smallestBlock, smallestBlock);
 
 } // namespace
 
@@ -49,10 +55,13 @@ void MemoryBlocks::begin(std::size_t whole) {
     // So that what follows the address in front is aligned.
     constexpr std::size_t start = 2 * anyScalar - header;
     static_assert(start >= sizeof(Block));
-    const std::size_t usual = std::clamp(_sizeOfRun / 64, _smallest, _largest);
+    const std::size_t usual = _sizeOfRun < largeRun
+                                  ? std::clamp(_sizeOfRun / 64, _smallest, _largest)
+                                  : _largestOfLargeRun;
     const std::size_t size = hasRetired ? start + whole : std::max(usual, start + whole);
     _sizeOfRun += size;
     auto* const memory = static_cast<char*>(::operator new(size));
+    askForLargePages(memory, size);
     _block = new (memory) Block{hasRetired ? 1 : reserve};
     _isReserved = !hasRetired;
     _next = memory + start;

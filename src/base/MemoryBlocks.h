@@ -17,7 +17,8 @@
 // 3. Whoever brings `live` to zero frees the block, be it a release or the retirement itself.
 // 4. One live thing keeps its whole block allocated. So what lives differently long does not share
 //    blocks, and those of objects and nodes are small at first: in a run of things that are made
-//    together a new one has at most a 64th of what the run took before.
+//    together a new one has at most a 64th of what the run took before. From 64 MB on those of
+//    objects have 4 MB.
 // 5. What is made while a thread ends, after its blocks were retired, gets a block for itself.
 // 6. Under the address sanitizer each thing has memory of its own, without an owner in front: only
 //    then does it see the use of what is dead.
@@ -44,8 +45,9 @@ class MemoryBlocks {
 public:
     static constexpr std::size_t anyScalar = __STDCPP_DEFAULT_NEW_ALIGNMENT__;
 
-    constexpr MemoryBlocks(std::size_t smallest, std::size_t largest) noexcept
-        : _smallest(smallest), _largest(largest) {}
+    constexpr MemoryBlocks(std::size_t smallest, std::size_t largest,
+                           std::size_t largestOfLargeRun) noexcept
+        : _smallest(smallest), _largest(largest), _largestOfLargeRun(largestOfLargeRun) {}
     MemoryBlocks(const MemoryBlocks&) = delete;
     MemoryBlocks& operator=(const MemoryBlocks&) = delete;
 
@@ -91,6 +93,7 @@ private:
 
     const std::size_t _smallest;
     const std::size_t _largest;
+    const std::size_t _largestOfLargeRun;
     std::size_t _sizeOfRun = 0; // of its blocks together
     Block* _block = nullptr;
     bool _isReserved = false; // whether more than what is alive is counted for the block
