@@ -1,5 +1,6 @@
 // Random mappings, documents and edits: what is saved is well-formed, reads back as the edited
-// object, and keeps what the mapping does not know. QX_SAVING_ROUNDS says how many, and
+// object, keeps what the mapping does not know, and changes no more bytes than the edits ask for.
+// QX_SAVING_ROUNDS says how many, and
 // QX_SAVING_SEED from which on.
 
 #include "support/Scenario.h"
@@ -50,6 +51,10 @@ public:
         marshaller->setSaveUnknownXML(false);
         EXPECT_EQ(marshaller->writeString(again), marshaller->writeString(object));
         EXPECT_TRUE(update->writtenAnew().empty());
+        std::size_t changed = 0;
+        for (const QXXMLUpdate::Edit& one : update->edits())
+            changed += one.oldText.size() + one.newText.size();
+        EXPECT_LE(changed, _most);
     }
 
 private:
@@ -239,7 +244,12 @@ private:
                 change(object, field, isLikely(70) ? newValue(field) : qx::Value());
         }
     }
+    // Bytes that may change with the value: those of its text and tags, and of what it holds
+    // beside.
+    void allow(const qx::Value& value) { _most += 150 + 25 * support::show(value).size(); }
     void change(const qx::Value& object, const Field& field, const qx::Value& value) {
+        allow(object.object()->valueForKey(field.name));
+        allow(value);
         _isKept = _isKept && !object.object()->valueForKey(field.name).isObject() &&
                   field.location.empty();
         object.object()->setValueForKey(value, field.name);
@@ -255,9 +265,12 @@ private:
             _edits += field.name + "[" + std::to_string(at) + "] " + std::to_string(what) + "\n";
             if (what == 0) {
                 array.insert(at, newItem(field));
+                allow(array.at(at));
             } else if (at < array.count()) {
                 const qx::Value item = array.at(at);
                 array.remove(at);
+                allow(item);
+                allow(item);
                 _isKept = false;
                 if (what == 1)
                     array.insert(below(array.count() + 1), item);
@@ -277,7 +290,8 @@ private:
     std::vector<std::vector<Field>> _classes;
     std::string _lineEnd, _indent, _edits;
     std::size_t _noise = 0;
-    bool _isKept = true; // nothing was taken away that may hold unknown XML
+    std::size_t _most = 0; // bytes that the edits may change
+    bool _isKept = true;   // nothing was taken away that may hold unknown XML
 };
 
 unsigned numberOf(const char* variable, unsigned usual) {
