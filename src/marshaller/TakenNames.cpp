@@ -105,7 +105,7 @@ String suggestionFor(const UntakenNode& node, const TakenNames& names) {
         return "the mapping has " + name +
                (node.isAttribute ? " as a child element" : " as an attribute");
     if (contains(node.isAttribute ? names.attributes : names.children, node.name))
-        return "the mapping takes only one";
+        return node.isAttribute ? "its field took another" : "the mapping takes only one";
     for (const TakenNames::Inside& one : names.inside)
         if (one.name == node.name && one.isAttribute == node.isAttribute)
             return "the mapping looks for " + name + " in " + quoted(one.location);
