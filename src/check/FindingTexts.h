@@ -44,6 +44,11 @@ inline constexpr FindingText classWithoutEffect("no-effect", note,
 inline constexpr FindingText prefixWithoutEffect("no-effect", warning,
                                                  "An ns-prefix without an ns-uri has no effect");
 inline constexpr FindingText strayText("stray-text", note, "Text in %@ has no meaning: %@");
+inline constexpr FindingText strayContent("stray-text", warning, "Text in %@ has no meaning: %@");
+inline constexpr FindingText emptyName("no-xml-name", warning, "The name of the %@ is empty");
+inline constexpr FindingText
+    nodeOfCollection("no-effect", warning,
+                     "A collection takes child elements: the node %@ is passed over");
 inline constexpr FindingText otherRoot("other-root", note,
                                        "The root element is %@: it is read as a mapping");
 inline constexpr FindingText

@@ -80,6 +80,11 @@ void BindingCheck::checkWords() {
         _check.suggest(suggestedCollection(_field.mapping->collection()),
                        findings::unknownCollection, ofField(), _field.mapping->collection(),
                        _type.mapping->className());
+    if (_field.isCollection() && !_bindings.empty()) {
+        const auto node = _field.mapping->nodeType();
+        if (node == QXXMLNodeTypeAttribute || node == QXXMLNodeTypeText)
+            _check.add(findings::nodeOfCollection, ofBinding(0), _bindings.front()->node());
+    }
     if (_bindings.empty() || _field.isCollection() || _field.kind != BindingKind::automatic)
         return;
     const String& node = _bindings.front()->node();

@@ -3,6 +3,7 @@
 
 #include "base/WhiteSpace.h"
 #include "check/Rules.h"
+#include "xml/XMLCharacters.h"
 
 #include <algorithm>
 #include <span>
@@ -50,6 +51,16 @@ constexpr ElementRule elementRules[] = {
     {"alt-xml", inAlternative, ofAlternative, "name"},
 };
 
+// Words of other languages, and what stands for them here.
+constexpr std::pair<std::string_view, std::string_view> foreignAttributes[] = {
+    {"inherits", "extends"}, {"base", "extends"},
+    {"super", "extends"},    {"parent", "extends"},
+    {"class", "type"},       {"kind", "type"},
+    {"of", "type"},          {"mandatory", "required"},
+    {"list", "collection"},  {"multiple", "collection"},
+    {"wrapper", "location"},
+};
+
 // Words that people write for the attribute that names.
 constexpr std::string_view namingWords[] = {
     "name", "xml", "href",  "element", "attribute", "tag", "path", "xpath",    "id",
@@ -90,7 +101,7 @@ private:
     void checkAttribute(const String& name, const XMLElement& element, const ElementRule& rule);
     static String namingMeantBy(const String& name, const XMLElement& element,
                                 const ElementRule& rule);
-    void checkText(const XMLNode& text, const XMLElement& element);
+    void checkText(const XMLNode& text, const XMLElement& element, const ElementRule& rule);
 
     // Of an element that belongs to the class and the field that are open.
     Subject at(const XMLElement& element) const {
@@ -111,6 +122,9 @@ void GrammarCheck::checkElement(const XMLElement& element, const ElementRule& ru
         _fieldName = element.attributeValue("name");
     element.forEachAttribute(
         [&](const String& name, const String&) { checkAttribute(name, element, rule); });
+    if (const String name = element.attributeValue("name");
+        (rule.name == "class" || rule.name == "field") && !name.isNull() && name.isEmpty())
+        _check.add(findings::emptyName, at(element), rule.name);
     if (rule.name == "include" && element.attributeValue("href").isNull())
         _check.add(findings::includeWithoutName, at(element));
     if (rule.name == "map-to" && element.attributeValue("ns-uri").isEmpty() &&
@@ -120,7 +134,7 @@ void GrammarCheck::checkElement(const XMLElement& element, const ElementRule& ru
         if (child.isElement())
             checkChild(*child.asElement(), rule);
         else if (child.kind() == XMLNodeKind::text)
-            checkText(child, element);
+            checkText(child, element, rule);
     }
     if (rule.name == "class")
         _className = nullptr;
@@ -164,6 +178,9 @@ void GrammarCheck::checkAttribute(const String& name, const XMLElement& element,
     String near = _check.nearest(name, rule.attributes);
     if (hasPrefix(name) && near.isNull())
         return;
+    for (const auto& [foreign, ours] : foreignAttributes)
+        if (near.isNull() && name == foreign && has(rule.attributes, ours))
+            near = ours;
     if (near.isNull())
         near = namingMeantBy(name, element, rule);
     const auto* const place =
@@ -186,12 +203,17 @@ String GrammarCheck::namingMeantBy(const String& name, const XMLElement& element
     return "name=\"" + value + "\" node=\"" + name.str() + "\"";
 }
 
-void GrammarCheck::checkText(const XMLNode& text, const XMLElement& element) {
+// A name may stand as text where it ought to be an attribute.
+void GrammarCheck::checkText(const XMLNode& text, const XMLElement& element,
+                             const ElementRule& rule) {
     constexpr std::size_t longest = 40;
     const String value = text.stringValue();
     const std::string_view shown = trimmed(value);
     if (shown.empty())
         return;
+    if (!rule.naming.empty() && element.attributeValue(rule.naming).isNull() && isXMLName(shown))
+        return _check.suggest(String::concat({rule.naming, "=\"", shown, "\""}),
+                              findings::strayContent, at(element), shownName(rule), shown);
     std::size_t end = std::min(longest, shown.size());
     while (end < shown.size() && end > 0 && (shown[end] & 0xC0) == 0x80) // inside of a character
         --end;

@@ -3,9 +3,9 @@
 #include <QXXMLMarshalling/host/ProcessInfo.h>
 #include <QXXMLMarshalling/model/Format.h>
 
+#include "base/Unicode.h"
 #include "model/Warning.h"
 
-#include <algorithm>
 #include <ctime>
 #include <dlfcn.h>
 #include <link.h>
@@ -88,14 +88,12 @@ LogFunction hostLogWarning() noexcept {
 }
 
 void writeLogLine(std::string_view format, std::span<const Value> arguments) {
-    std::string line = String::concat({timestamp(), " ", ProcessInfo::processName(), "[",
-                                       std::to_string(ProcessInfo::processIdentifier()), "] ",
-                                       qx::format(format, arguments)})
-                           .str();
-    // A message that quotes XML may hold line breaks.
-    std::replace_if(
-        line.begin(), line.end(), [](char c) { return c == '\n' || c == '\r'; }, ' ');
-    line += '\n';
+    // A message that quotes XML may hold line breaks, and what a terminal obeys.
+    const std::string line =
+        unicode::printable(String::concat({timestamp(), " ", ProcessInfo::processName(), "[",
+                                           std::to_string(ProcessInfo::processIdentifier()), "] ",
+                                           qx::format(format, arguments)})) +
+        '\n';
     // In one call, so that lines of several threads and processes do not mix. There is nobody to
     // tell when it fails.
     [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, line.data(), line.size());

@@ -4,6 +4,7 @@
 #include "marshaller/ReadingContext.h"
 
 #include <algorithm>
+#include <unordered_map>
 
 namespace qx::detail {
 
@@ -26,10 +27,22 @@ void Reporting::tellInside(IndexedXML& document, Number element, Object* object)
     document.forEachOfKind(XMLNodeKind::attribute, element, [&](Number attribute) {
         tell(Kind::unboundAttribute, document, element, attribute, object);
     });
+    struct Alike {
+        Number first;
+        std::size_t count;
+    };
+    std::vector<Alike> children;
+    std::unordered_map<String, std::size_t> numbers;
     document.forEachChild(element, [&](Number child) {
-        if (document.isElement(child))
-            tell(Kind::unboundChild, document, element, child, object);
+        if (!document.isElement(child))
+            return;
+        const auto [known, isNew] = numbers.try_emplace(document.name(child), children.size());
+        if (isNew)
+            children.push_back({child, 0});
+        ++children[known->second].count;
     });
+    for (const Alike& alike : children)
+        tell(Kind::unboundChild, document, element, alike.first, object, alike.count);
 }
 
 void Reporting::tellTexts(IndexedXML& document, Number element, Object* object) const {

@@ -26,8 +26,10 @@ void addFields(const ClassPlan& type, std::size_t flattened, TakenNames& names);
 void addField(const FieldPlan& field, std::size_t flattened, TakenNames& names) {
     const bool isCollection = field.isCollection();
     if (field.kind == BindingKind::flattened && !isCollection) {
+        const std::size_t own = names.items.size();
         if (field.typeClass != nullptr && flattened != 0)
             addFields(*field.typeClass, flattened - 1, names);
+        names.items.resize(own);
         return;
     }
     const bool mayBeAttribute = !isCollection && (field.kind == BindingKind::attribute ||
@@ -45,6 +47,8 @@ void addField(const FieldPlan& field, std::size_t flattened, TakenNames& names) 
         }
         if (mayBeAttribute)
             names.attributes.push_back(binding.name);
+        if (isCollection && field.hasType())
+            names.items.push_back(binding.name);
         if (mayBeChild)
             names.children.push_back(binding.name);
     }
@@ -105,12 +109,12 @@ String suggestionFor(const UntakenNode& node, const TakenNames& names) {
         return "the mapping has " + name +
                (node.isAttribute ? " as a child element" : " as an attribute");
     if (contains(node.isAttribute ? names.attributes : names.children, node.name))
-        return "the mapping takes only one";
+        return node.isAttribute ? "its field took another" : "the mapping takes only one";
     for (const TakenNames::Inside& one : names.inside)
         if (one.name == node.name && one.isAttribute == node.isAttribute)
             return "the mapping looks for " + name + " in " + quoted(one.location);
     for (const String& child : node.children)
-        if (contains(names.children, child))
+        if (contains(names.items, child))
             return "the mapping looks for " + quoted(child) + " beside it: is location=" + name +
                    " missing?";
     return meantFor(node.name, node.isAttribute ? names.attributes : names.children);

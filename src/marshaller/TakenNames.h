@@ -18,6 +18,7 @@ struct TakenNames {
     };
     std::vector<String> attributes;
     std::vector<String> children; // locations among them
+    std::vector<String> items;    // of typed collections without a location, own or inherited
     std::vector<Inside> inside;
 
     // With those of its ancestors, and of objects that are flattened into it, a few levels deep.

@@ -84,8 +84,11 @@ private:
             MappingSource::of(mapping).locate(*error, MappingSource::elementOf(mapping));
             const QXXMLClassMapping& first =
                 repeated.sameClass > begin ? *repeated.withClass : *repeated.withElement;
-            ErrorDetails::suggest(**error, "class \"" + first.className().str() + "\" stands at " +
-                                               written(first.place()) + ", too");
+            const std::string place = written(first.place());
+            ErrorDetails::suggest(**error, place == written(mapping.place())
+                                               ? String("its document is included twice")
+                                               : String("class \"" + first.className().str() +
+                                                        "\" stands at " + place + ", too"));
         }
         return false;
     }

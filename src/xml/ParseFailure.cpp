@@ -22,7 +22,9 @@ constexpr Help helps[] = {
      "XML by itself knows amp, lt, gt, apos and quot; others are written as numbers: &#160;"},
     {38, "", "a \"<\" itself is written &lt;"},
     {39, "", "a value stands in \" or '"},
+    {62, "", "\"]]>\" in a text is written ]]&gt;"},
     {64, "", "nothing may stand before it, not even white space"},
+    {68, "StartTag", "a \"<\" itself is written &lt;"},
     {68, "xmlParseEntityRef", "an \"&\" itself is written &amp;"},
     {81, "", "does its first line name the right encoding?"},
 };

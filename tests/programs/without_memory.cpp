@@ -299,6 +299,39 @@ void marshalling() {
                        [bind = bind, i](Stage& s) { return bind(s, s.field(i)); });
 }
 
+// Errors of reading and of writing, with all that they know beside their texts.
+void failures() {
+    const auto marshaller = M::initWithMappingXML(
+        qx::XMLDocument::initWithData(
+            "<mapping><class name='Order'><map-to xml='order'/>"
+            "<field name='lines' type='Line' collection='array'><bind-xml name='line'/></field>"
+            "</class><class name='Line'><map-to xml='line'/><field name='count' type='int' "
+            "required='true'><bind-xml name='count' node='attribute'/></field><field name='part' "
+            "type='Prat'><bind-xml name='part' node='element'/></field></class></mapping>")
+            .get());
+    marshaller->setMaximumErrors(10);
+    const auto order = marshaller->readString("<order><line count='1'/><line count='2'/></order>");
+    order->valueForKey("lines").as<qx::Array>()->at(1).object()->setValueForKey("p", "part");
+    const auto reported = [](Stage& s) {
+        s.text.clear();
+        if (s.error)
+            for (const auto& each : s.error->all())
+                s.text.append(each->path().view()).append(each->report().view());
+    };
+    tryMarshaller("errors of reading", false, [&](Stage& s) {
+        marshaller->readString("<order><line count='a'/><line cuont='2'/></order>", &s.error);
+        reported(s);
+    });
+    tryMarshaller("errors of writing", false, [&](Stage& s) {
+        marshaller->writeString(order, &s.error);
+        reported(s);
+    });
+    tryMarshaller("errors of parsing", false, [&](Stage& s) {
+        marshaller->readString("<order>&nbsp;</order>", &s.error);
+        reported(s);
+    });
+}
+
 // Both sides of a pair change in one setter.
 class Person : public qx::UndoableObject {
 public:
@@ -441,6 +474,7 @@ int main() {
     failing::replaceParserMemory();
     parsing();
     marshalling();
+    failures();
     undoing();
     std::cout << faults << " faults\n";
     return faults == 0 ? 0 : 1;

@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Format.h>
 
 #include "qxxml/Json.h"
+#include "qxxml/Output.h"
 
 namespace qxxml {
 
@@ -17,7 +18,7 @@ std::string fileOf(const qx::Error& error, const std::string& file) {
 }
 
 std::string placeOf(const qx::Error& error, const std::string& file) {
-    return fileOf(error, file) + ":" + std::to_string(error.line()) + ":" +
+    return harmless(fileOf(error, file)) + ":" + std::to_string(error.line()) + ":" +
            std::to_string(error.column());
 }
 
@@ -42,8 +43,8 @@ std::string oneLineOf(const qx::Error& error, const std::string& file) {
     const std::string message =
         "error " + std::to_string(error.code()) + ": " + error.shortDescription().str();
     const qx::String suggestion = error.suggestion();
-    return (error.line() != 0 ? placeOf(error, file) : fileOf(error, file)) + ": " + message +
-           (suggestion.isNull() ? "" : " (" + suggestion.str() + ")") + "\n";
+    return (error.line() != 0 ? placeOf(error, file) : harmless(fileOf(error, file))) + ": " +
+           message + (suggestion.isNull() ? "" : harmless(" (" + suggestion.str() + ")")) + "\n";
 }
 
 Json jsonOf(const qx::DocumentPlace& place) {

@@ -1,6 +1,7 @@
 #include "qxxml/Summary.h"
 
 #include "qxxml/Json.h"
+#include "qxxml/Output.h"
 
 namespace qxxml {
 
@@ -85,9 +86,11 @@ void Summary::add(const QXXMLReport& report) {
 
 std::string Summary::lineOf(const Key& key, const Entry& entry) {
     const auto& [kind, isKept, name, element] = key;
-    std::string line = whatOf(kind, name) + " in " +
-                       (entry.elements == 1 ? "" : withCommas(entry.elements) + " ") + "`" +
-                       element + "`: " + fateOf(kind, isKept);
+    // Items are told one by one, whatever element they are in.
+    const std::string number = entry.elements == 1 ? "" : withCommas(entry.elements) + " ";
+    const bool isItem = kind == Kind::skippedItem;
+    std::string line = (isItem ? number : "") + whatOf(kind, name) + " in " +
+                       (isItem ? "" : number) + "`" + element + "`: " + fateOf(kind, isKept);
     if (entry.first.line != 0)
         line += (entry.elements == 1 ? ", at " : ", first at ") + textOf(entry.first);
     return "qxxml: warning: " + line + "\n";
@@ -120,7 +123,7 @@ std::string lineOf(const QXXMLReport& report) {
     const qx::DocumentPlace place = report.place();
     std::string line = "qxxml: warning: ";
     if (place.line != 0)
-        line += (place.documentName.isNull() ? "" : place.documentName.str() + ":") +
+        line += (place.documentName.isNull() ? "" : harmless(place.documentName.str()) + ":") +
                 textOf(place) + ": ";
     return line + whatOf(report.kind, report.name.isNull() ? "" : report.name.str()) + " in `" +
            report.elementName.str() + "`: " + fateOf(report.kind, report.isKept) + "\n";
