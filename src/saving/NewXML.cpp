@@ -202,7 +202,7 @@ void NewXML::appendAttributes(const XMLDraft::Element& element, const Around& ar
 bool NewXML::appendContent(const XMLDraft::Element& element, const Around& around,
                            std::string& output) {
     Around inside = around;
-    if (element.hasText || !around.line)
+    if (element.hasText || !around.line || around.isOnOneLine)
         inside.line = std::nullopt;
     else
         inside.line = *around.line + _layout.unit();

@@ -42,6 +42,7 @@ public:
         std::optional<std::string> line;
         OutputNames* names = nullptr;
         std::function<bool(const String& prefix, std::string_view URI)> isDeclared;
+        bool isOnOneLine = false; // all that is inside the element
     };
     // `name` takes the place of the element's own, where it is given.
     std::string element(const XMLDraft::Element& element, const String* name, const Around& around);

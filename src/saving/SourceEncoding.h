@@ -13,7 +13,7 @@ class SourceEncoding {
 public:
     explicit SourceEncoding(std::string_view bytes);
 
-    // Null for UTF-8.
+    // Null for UTF-8, and where there is none.
     TextEncoder* encoder() const noexcept { return _encoder.get(); }
     // The bytes of a text that came from the document's text, of which each part that is the same
     // has the same bytes. Null with
@@ -23,7 +23,8 @@ public:
 private:
     const std::string_view _bytes;
     const DocumentEncoding _encoding;
-    const std::unique_ptr<TextEncoder> _encoder;
+    std::unique_ptr<TextEncoder> _encoder;
+    String _failure; // why there is none
 };
 
 } // namespace qx::detail

@@ -85,6 +85,19 @@ bool SourceLayout::isInline(Number element) const {
     return known->second;
 }
 
+bool SourceLayout::isOnOneLine(Number element) const {
+    const auto [known, isNew] = _onOneLine.try_emplace(element);
+    if (!isNew)
+        return known->second;
+    const auto& spot = _markup[element];
+    const bool hasBreak =
+        _markup.text().substr(spot.begin, spot.end - spot.begin).find_first_of("\r\n") != npos;
+    for (Number at = _index.firstChild(element); at < _index.contentEnd(element) && !hasBreak;
+         at = _index.siblingOf(at))
+        known->second |= _index[at].nodeKind() == XMLNodeKind::element;
+    return known->second;
+}
+
 // White space without a line break counts as content when a document is read, but comments stand
 // behind such, too. Where there is only layout, xml:space has it kept.
 bool SourceLayout::hasInlineText(Number element) const {

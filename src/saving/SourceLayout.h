@@ -27,6 +27,8 @@ public:
     // Whether white space inside the element is its content: beside other text, and where xml:space
     // says so.
     bool isInline(Number element) const;
+    // Whether there are elements inside, and no line ends.
+    bool isOnOneLine(Number element) const;
     // Where the comments before an element begin that stand on lines of their own.
     Offset withComments(Offset begin) const;
     // Behind the element and the comments behind it on its line.
@@ -49,7 +51,7 @@ private:
 
     const XMLIndex& _index;
     const SourceMarkup& _markup;
-    mutable std::unordered_map<Number, bool> _inline; // what was asked for
+    mutable std::unordered_map<Number, bool> _inline, _onOneLine; // what was asked for
     std::string_view _newline = "\n";
     std::string _unit = "    ";
     char _quote = '"';

@@ -193,9 +193,10 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
             return fail(list.is[i]);
         const Place place =
             previous != ListMatching::none ? placeBehind(beside) : placeBefore(beside);
-        const std::string text = was != ListMatching::none
-                                     ? moved(context, list, was, list.is[i], ordinal)
-                                     : printed(list, list.is[i], parentOf(beside), place.line);
+        const std::string text =
+            was != ListMatching::none
+                ? moved(context, list, was, list.is[i], ordinal)
+                : printed(list, list.is[i], parentOf(beside), place.line, beside);
         insertChild(text, place, list.is[i]);
     }
     removeItems(list, matching);
@@ -243,13 +244,14 @@ std::string UpdatePlan::moved(const Context& context, const List& list, std::siz
     return own.applied(_source.markup.text(), begin, spot.end);
 }
 
-// Under the name by which the others were read.
+// Under the name by which the others were read, on one line if the item beside it is.
 std::string UpdatePlan::printed(const List& list, Shown item, Entry inside,
-                                const std::optional<std::string>& line) {
+                                const std::optional<std::string>& line, Entry beside) {
     const FieldPlan& plan = *list.plan;
     const bool isTyped = plan.hasType() && list.binding < plan.bindings.size();
     const BindingPlan* const binding = isTyped ? &plan.bindings[list.binding] : nullptr;
-    const NewXML::Around around = this->around(inside, line);
+    NewXML::Around around = this->around(inside, line);
+    around.isOnOneLine = beside != none && _source.layout.isOnOneLine(beside);
     if (isText(item))
         return _source.writer.element(binding != nullptr ? binding->name : plan.xmlName(),
                                       _source.after.text(item), around);

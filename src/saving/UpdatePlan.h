@@ -111,7 +111,7 @@ private:
     std::string moved(const Context& context, const List& list, std::size_t was, Shown is,
                       std::size_t ordinal);
     std::string printed(const List& list, Shown item, Entry inside,
-                        const std::optional<std::string>& line);
+                        const std::optional<std::string>& line, Entry beside = none);
 
     // UpdateTexts.cpp
     void setAttribute(Entry attribute, Shown value);

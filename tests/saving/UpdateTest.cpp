@@ -93,6 +93,13 @@ TEST_F(Update, KeepsTheEncodingAndRefersToWhatItLacks) {
     }
 }
 
+TEST_F(Update, WhatNoDocumentIsWrittenInIsRefused) {
+    const auto rename = [](Sheet& sheet) { sheet.title = "b"; };
+    EXPECT_EQ(saved("<?xml version='1.0' encoding='UTF-7'?><sheet><title>a</title></sheet>", rename)
+                  .find("-231"),
+              0);
+}
+
 TEST_F(Update, LineEndsAndBlanksAreThoseOfTheDocument) {
     EXPECT_EQ(saved("<sheet>\r\n\t<title>a</title>\r\n\t<row id='1'>x</row>\r\n</sheet>",
                     [](Sheet& sheet) {
