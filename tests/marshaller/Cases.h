@@ -189,9 +189,9 @@ inline Result run(const Expectation& expectation, qx::XMLDocument& mapping, bool
 
 // Compares what comes with the block, on that kind of object.
 inline void checkOn(kinds::Kind kind, const Expectation& expectation) {
-    static const support::Words known = {"strict",       "discard", "exactly", "no-namespaces",
-                                         "by-namespace", "records", "hosts",   "structs",
-                                         "given"};
+    static const support::Words known = {"strict",        "discard",      "exactly",
+                                         "no-namespaces", "by-namespace", "records",
+                                         "hosts",         "structs",      "given"};
     for (const std::string& option : expectation.options)
         EXPECT_TRUE(known.contains(option)) << option << " is no option";
     const auto isFor = [&](const char* name) { return expectation.options.contains(name); };

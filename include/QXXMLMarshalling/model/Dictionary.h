@@ -26,8 +26,7 @@ public:
         String key;
         Value value; // null: removed, the key keeps its place
         Entry() noexcept = default;
-        Entry(const String& aKey, Value&& aValue) noexcept
-            : key(aKey), value(std::move(aValue)) {}
+        Entry(const String& aKey, Value&& aValue) noexcept : key(aKey), value(std::move(aValue)) {}
     };
 
     Dictionary() noexcept = default;
