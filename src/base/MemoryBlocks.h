@@ -56,7 +56,12 @@ public:
     static MemoryBlocks& ofTexts() noexcept;
     static MemoryBlocks& ofObjects() noexcept;
 
-    void beginRun() noexcept { _sizeOfRun = 0; }
+    // A large block is not gone on with: what is made now may be little, and would keep it all.
+    void beginRun() noexcept {
+        if (_left > _largest)
+            retire();
+        _sizeOfRun = 0;
+    }
 
     // Aligned like pointers, or for any scalar with a Unit of that size. Only small sizes are worth
     // a block: at most 4 KiB.

@@ -38,7 +38,6 @@ struct Object::Extras {
     std::unique_ptr<ChangeListener> changeListener;
     Object* nextWaiting = nullptr; // of the ending objects that wait for their turn
     std::unique_ptr<ObjectAttachment> attachment;
-    std::shared_ptr<const void> place; // of a node that is kept (xml/KeptPlace.h)
 };
 
 // The extras for the rest of this folder, and for those above it.

@@ -1,22 +1,22 @@
 #include "xml/KeptPlace.h"
 
-#include "model/ObjectExtras.h"
+#include "xml/NodeAttachment.h"
 
 namespace qx {
 
 const KeptPlace* KeptPlace::of(const XMLNode& node) noexcept {
-    const auto* const extras = ObjectInternals::existingExtras(node);
-    return extras != nullptr ? static_cast<const KeptPlace*>(extras->place.get()) : nullptr;
+    const NodeAttachment* const attachment = NodeAttachment::of(node);
+    return attachment != nullptr ? attachment->place.get() : nullptr;
 }
 
 void KeptPlace::set(XMLNode& node, KeptPlace place) {
-    ObjectInternals::extras(node).place = std::make_shared<const KeptPlace>(std::move(place));
+    NodeAttachment::made(node).place = std::make_shared<const KeptPlace>(std::move(place));
 }
 
 void KeptPlace::copy(const XMLNode& node, XMLNode& copy) {
-    const auto* const extras = ObjectInternals::existingExtras(node);
-    if (extras != nullptr && extras->place)
-        ObjectInternals::extras(copy).place = extras->place;
+    if (const NodeAttachment* const attachment = NodeAttachment::of(node);
+        attachment != nullptr && attachment->place)
+        NodeAttachment::made(copy).place = attachment->place;
 }
 
 } // namespace qx

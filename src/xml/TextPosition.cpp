@@ -29,8 +29,7 @@ std::size_t countLineEnds(const char* from, const char* to) noexcept {
     for (; to - from >= 8; from += 8) {
         std::uint64_t word = 0;
         std::memcpy(&word, from, 8);
-        // A byte that is a line end becomes zero, which alone has no bit below the highest set,
-        // nor that one.
+        // A line end is a zero byte of `other`; of `others` each byte's lowest bit is set but its.
         const std::uint64_t other = word ^ lowBits * '\n';
         const std::uint64_t others = (((other & ~(lowBits << 7)) + (lowBits * 0x7F)) | other) >> 7;
         count += 8 - static_cast<std::size_t>(((others & lowBits) * lowBits) >> 56);

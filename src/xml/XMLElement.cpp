@@ -3,8 +3,7 @@
 #include <QXXMLMarshalling/base/Exception.h>
 
 #include "base/MemoryBlocks.h"
-#include "model/ObjectExtras.h"
-#include "xml/KeptPlace.h"
+#include "xml/NodeAttachment.h"
 #include "xml/XMLSiblings.h"
 
 #include <optional>
@@ -65,15 +64,15 @@ struct XMLElement::Indexes final : ObjectAttachment {
 };
 
 XMLElement::Indexes* XMLElement::indexes() const noexcept {
-    const auto* extras = ObjectInternals::existingExtras(*this);
-    return extras != nullptr ? static_cast<Indexes*>(extras->attachment.get()) : nullptr;
+    const NodeAttachment* const attachment = NodeAttachment::of(*this);
+    return attachment != nullptr ? static_cast<Indexes*>(attachment->indexes.get()) : nullptr;
 }
 
 XMLElement::Indexes& XMLElement::madeIndexes() {
-    auto& attachment = ObjectInternals::extras(*this).attachment;
-    if (!attachment)
-        attachment = std::make_unique<Indexes>();
-    return *indexes();
+    auto& indexes = NodeAttachment::made(*this).indexes;
+    if (!indexes)
+        indexes = std::make_unique<Indexes>();
+    return static_cast<Indexes&>(*indexes);
 }
 
 XMLNode* XMLElement::findNode(XMLNode* first, const String& name) const noexcept {

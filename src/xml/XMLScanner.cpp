@@ -401,14 +401,17 @@ XMLScanner::Place XMLScanner::scanCharacterReference(Place at) {
     return at + 1;
 }
 
-// One character beyond ASCII; anything else that no loop takes is a fault.
+// Characters beyond ASCII, one at least; anything else that no loop takes is a fault.
 XMLScanner::Place XMLScanner::scanBeyondASCII(Place at) {
     require(static_cast<unsigned char>(*at) >= 0x80);
-    std::size_t position = 0;
-    const char32_t c = decodeCharacter(
-        {at, std::min<std::size_t>(4, static_cast<std::size_t>(_end - at))}, position);
-    require(isXMLCharacter(c));
-    return at + position;
+    do {
+        std::size_t position = 0;
+        const char32_t c = decodeCharacter(
+            {at, std::min<std::size_t>(4, static_cast<std::size_t>(_end - at))}, position);
+        require(isXMLCharacter(c));
+        at += position;
+    } while (static_cast<unsigned char>(*at) >= 0x80);
+    return at;
 }
 
 inline XMLScanner::Name& XMLScanner::scanName(Place& at) {

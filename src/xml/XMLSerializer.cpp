@@ -221,7 +221,7 @@ void XMLSerializer::writeEscaped(std::string_view text, Where where, bool escape
     };
     std::size_t at = 0;
     while (true) {
-        if (!lacksASCII)
+        if (!lacksASCII && at < text.size() && is(text[at], writtenByte))
             at = static_cast<std::size_t>(endOfRunBefore<writtenByte>(text.data() + at, end) -
                                           text.data());
         if (at == text.size())

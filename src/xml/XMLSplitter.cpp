@@ -37,9 +37,8 @@ bool XMLSplitter::isItemName(std::string_view name) const noexcept {
 
 void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
     _text = text;
-    do
-        goOverInside();
-    while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext());
+    while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext()) {
+    }
     _text = {};
 }
 
@@ -94,37 +93,6 @@ bool XMLSplitter::pass(End end) {
 inline std::size_t XMLSplitter::nextMark(std::size_t from) const noexcept {
     const char* const begin = _text.data();
     return static_cast<std::size_t>(endOfRun<tagByte>(begin + from, begin + _text.size()) - begin);
-}
-
-// The tags inside an item and the texts between them, as far as they are whole: most of a document.
-// What is something else, or ends an item, is looked at one by one.
-void XMLSplitter::goOverInside() {
-    if (_depth == 0 || _seen > _at)
-        return;
-    while (true) {
-        std::size_t at = _at;
-        while (at < _text.size() && _text[at] != '<')
-            at = nextMark(at + 1);
-        const char next = at + 1 < _text.size() ? _text[at + 1] : '!';
-        if (next == '!' || next == '?' || (next == '/' && _depth == 1))
-            return;
-        std::size_t end = nextMark(at + 1);
-        while (next != '/' && end < _text.size() && (_text[end] == '"' || _text[end] == '\'')) {
-            const char quote = _text[end];
-            do
-                end = nextMark(end + 1);
-            while (end < _text.size() && _text[end] != quote && _text[end] != '<');
-            if (end < _text.size() && _text[end] == quote)
-                end = nextMark(end + 1);
-        }
-        if (end >= _text.size() || _text[end] != '>')
-            return;
-        if (next == '/')
-            --_depth;
-        else
-            _depth += _text[end - 1] == '/' ? 0 : 1;
-        _at = end + 1;
-    }
 }
 
 bool XMLSplitter::goOverNext() {

@@ -72,7 +72,6 @@ private:
     // Where something ends; none where the text ends before.
     using End = std::size_t;
 
-    void goOverInside();
     bool goOverNext();
     bool goOverDeclaration();
     bool goOverInstruction();

@@ -2,6 +2,7 @@
 // the marshaller and its options, no freed memory is used and no list loses an item.
 
 #include "ObjectKinds.h"
+#include "support/Meddling.h"
 #include "support/Scenario.h"
 
 #include <QXXMLMarshalling/QXGenericRecord.h>
@@ -15,24 +16,7 @@ namespace {
 
 using qx::Ref;
 using qx::Value;
-
-// Does `act` at the call of the host that `countdown` names, counted from 0.
-struct Meddling {
-    static inline std::function<void()> act;
-    static inline int countdown = -1;
-    static void call() {
-        if (countdown-- == 0)
-            act();
-    }
-    // Whether there were as many calls in the course of it.
-    template <class Course>
-    static bool during(int call, std::function<void()> what, Course course) {
-        act = std::move(what);
-        countdown = call;
-        course();
-        return std::exchange(countdown, -1) < 0;
-    }
-};
+using support::Meddling;
 
 class Meddler : public kinds::Host {
 public:

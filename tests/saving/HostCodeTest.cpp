@@ -2,6 +2,7 @@
 // handlers of the marshaller, do in the middle, no freed memory is used, and the file is a whole
 // document that says what the object said at some time.
 
+#include "support/Meddling.h"
 #include "support/Scenario.h"
 #include "support/TemporaryFolder.h"
 
@@ -14,15 +15,7 @@ namespace {
 
 using qx::Ref;
 using Changed = QXXMLDocumentFile::Changed;
-
-struct Meddling {
-    static inline std::function<void()> act;
-    static inline int countdown = -1;
-    static void call() {
-        if (countdown-- == 0)
-            act();
-    }
-};
+using support::Meddling;
 
 class Note : public QXMappedObject {
 public:
@@ -108,14 +101,14 @@ TEST_F(HostCode, MayDoAnythingWithTheFileWhileItIsSaved) {
         for (const auto& act : acts)
             for (int call = 0, isDone = 0; isDone == 0; call += 1 + call / 2) {
                 open();
-                Meddling::act = act;
-                Meddling::countdown = call;
                 Ref<qx::Error> error;
-                try {
-                    operation(&error);
-                } catch (const std::runtime_error&) {
-                }
-                isDone = std::exchange(Meddling::countdown, -1) >= 0 ? 1 : 0;
+                const bool hasActed = Meddling::during(call, act, [&] {
+                    try {
+                        operation(&error);
+                    } catch (const std::runtime_error&) {
+                    }
+                });
+                isDone = hasActed ? 0 : 1;
                 ASSERT_TRUE(isWhole())
                     << &operation - operations << " " << &act - acts << " " << call << "\n"
                     << folder.read("n.xml");
