@@ -38,6 +38,9 @@ bool readCollection(Unmarshalling& reading, const FieldPlan& field,
 // A collection whose items are of the class that "type" names.
 bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field,
                           const Unmarshalling::Target& target, Ref<Error>* error);
+// The text of an item, converted; null with -221, or with -224 where that is too much.
+Value itemText(Unmarshalling& reading, const FieldPlan& field, Object& owner,
+               Unmarshalling::Number node, Ref<Error>* error);
 bool writeCollection(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
                      const Array& array, Ref<Error>* error);
 

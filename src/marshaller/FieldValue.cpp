@@ -29,18 +29,23 @@ Value integerOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bo
 
 } // namespace
 
+bool convertText(const FieldPlan& field, Value& value, Ref<Error>* error, bool isLogged) {
+    if (!value.isString())
+        return true;
+    if (field.valueType == ValueType::boolean) {
+        value = booleanOf(value.view());
+    } else if (field.valueType == ValueType::integer) {
+        const bool isEmpty = value.view().empty();
+        value = isEmpty ? Value() : integerOf(field, value, error, isLogged);
+        return isEmpty || !value.isNull();
+    }
+    return true;
+}
+
 bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error,
                bool isLogged) {
-    const bool isConverted =
-        field.valueType == ValueType::boolean || field.valueType == ValueType::integer;
-    if (!value.isString() || !isConverted)
-        return ObjectAccess::set(object, key, std::move(value), error);
-    if (field.valueType == ValueType::boolean)
-        return ObjectAccess::set(object, key, booleanOf(value.view()), error);
-    if (value.view().empty())
-        return ObjectAccess::set(object, key, nullptr, error);
-    Value integer = integerOf(field, value, error, isLogged);
-    return !integer.isNull() && ObjectAccess::set(object, key, std::move(integer), error);
+    return convertText(field, value, error, isLogged) &&
+           ObjectAccess::set(object, key, std::move(value), error);
 }
 
 Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bool isLogged) {

@@ -11,9 +11,16 @@
 
 namespace qx::detail {
 
-// Converts a text by the field's type and sets it under the key; any other value is set as it is.
-// False with
+// Converts a text by the field's type; any other value stays. Without a text there is no integer,
+// but null. False with
 //   -221  "<%@>: Unable to convert value to integer: %@"            (logged as a warning, too)
+bool convertText(const FieldPlan& field, Value& value, Ref<Error>* error, bool isLogged);
+// Whether texts of the field are converted at all.
+inline bool convertsText(const FieldPlan& field) noexcept {
+    return field.valueType == ValueType::boolean || field.valueType == ValueType::integer;
+}
+
+// Converts the value and sets it under the key. False with -221 and
 //   -222  "Unable to set value: %@ for key: %@ in class: %@"
 bool takeValue(Object& object, const FieldPlan& field, Key key, Value&& value, Ref<Error>* error,
                bool isLogged = true);

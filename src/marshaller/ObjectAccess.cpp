@@ -52,11 +52,9 @@ ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
             property->keepsZero};
 }
 
-namespace {
-
 // Of a wrong class is an object, or the first such item of a list: that one is told, and the
 // classes that the property takes.
-bool refuse(const Object& object, Key key, const Value& value, Ref<Error>* error) {
+bool ObjectAccess::refuse(const Object& object, Key key, const Value& value, Ref<Error>* error) {
     const Class& type = object.isa();
     const Property* const property = type.property(key);
     const TakenObjects* const taken = property != nullptr ? property->objects : nullptr;
@@ -65,8 +63,6 @@ bool refuse(const Object& object, Key key, const Value& value, Ref<Error>* error
                           : fail(error, errors::objectOfWrongClass, wrong, key.string(),
                                  type.name(), taken->names);
 }
-
-} // namespace
 
 ObjectAccess::Held ObjectAccess::getContent(const QXGenericRecord& record, Key key) {
     if (key.namesProperty())

@@ -78,7 +78,9 @@ public:
                // NOLINTNEXTLINE(bugprone-use-after-move): it was left alone
                setOrRefuse(object, key, value, error);
     }
-    // The same, but that an object without such a key drops the value: the log says so, once for
+    // False, with -222 for a value that the object did not take.
+    static bool refuse(const Object& object, Key key, const Value& value, Ref<Error>* error);
+    // As set, but that an object without such a key drops the value: the log says so, once for
     // each class.
     bool setKept(Object& object, KeptXML what, Value value, Ref<Error>* error);
 

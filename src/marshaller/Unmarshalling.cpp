@@ -17,7 +17,7 @@ Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, 
       _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
       _reports(marshaller), _keepsExactly(marshaller.keepsExactly()),
       _ownTrace(_keepsExactly ? std::make_unique<ReadingTrace>() : nullptr),
-      _trace(_ownTrace.get()), _classes(_plan.classCount() + 1),
+      _trace(_ownTrace.get()), _usual(*this), _classes(_plan.classCount() + 1),
       _classKnown(_plan.classCount() + 1) {
     if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
         document.matchBy(*table);
@@ -84,10 +84,62 @@ Ref<Object> Unmarshalling::unmarshallNode(Number node, IndexedXML::Nodes nodes, 
     return fail(error, errors::noDefinitionForElement, quoted(node));
 }
 
+template <class Read>
+Ref<Object> Unmarshalling::buildWith(const ClassPlan& plan, const Counted& source,
+                                     StructObject* given, ErrorSlot error, Read read) {
+    const Number wrapper = std::exchange(_wrapper, none);
+    if (!mayBuild(plan, source, error)) {
+        locate(error, source.element, nullptr, &plan);
+        return nullptr;
+    }
+    Ref<Object> object = given != nullptr ? Ref<Object>(given) : allocate(plan);
+    // Whoever set it: a caller's earlier error stops the binding, too.
+    if (error != nullptr && *error)
+        return nullptr;
+    QXGenericRecord* const record = ObjectAccess::plainRecord(*object);
+    // A struct is asked for nothing: it moves on once it is bound.
+    const bool isAsked = record == nullptr && !object->isa().isStruct();
+    const ObjectHooks* const hooks = isAsked ? &_access.hooksOf(*object) : nullptr;
+    if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
+        ObjectAccess::send(*object, *hooks->setUndoManager, _marshaller->undoManager());
+
+    const Frame frame{&plan, source.element, _frame, _frame != nullptr ? _frame->depth + 1 : 1,
+                      wrapper};
+    struct Restore {
+        const Frame*& current;
+        const Frame* outer;
+        ~Restore() { current = outer; }
+    } const restore{_frame, _frame};
+    _frame = &frame;
+    const Traced traced(*this, plan, source.element, *object);
+    if (!read(*object))
+        return nullptr;
+    if (record != nullptr)
+        record->setNotifyBindingsObservers(true);
+    else if (isAsked && hooks->setNotifyBindingsObservers != nullptr)
+        ObjectAccess::send(*object, *hooks->setNotifyBindingsObservers, true);
+    return object;
+}
+
 Ref<Object> Unmarshalling::build(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
-                                 ErrorSlot error) {
+                                 ErrorSlot error, StructObject* given) {
+    UsualElement usual;
+    if (plan.usualForm && isPlain() && usual.find(_document, *plan.usualForm, element))
+        return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
+            return _usual.readFields({plan, usual, element, nodes}, object, error);
+        });
     ChildLookup source(_document, element, nodes, plan.bindingCount);
-    return build(plan, source, false, error);
+    return build(plan, source, false, error, given);
+}
+
+Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
+                                 ErrorSlot error, StructObject* given) {
+    const Counted counted{source.element(), source.childCount()};
+    return buildWith(plan, counted, given, error, [&](Object& object) {
+        const LentNames fields(*this);
+        const LentNames attributes(*this);
+        return readFields(plan, {object, source, {*fields, *attributes}, isFlattened}, error);
+    });
 }
 
 // A class that is flattened into itself, over whatever other classes, would never end.
@@ -99,8 +151,8 @@ bool Unmarshalling::isBeingBound(const ClassPlan& plan, Number element) const {
     return false;
 }
 
-bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error) {
-    const Number element = source.element();
+bool Unmarshalling::mayBuild(const ClassPlan& plan, const Counted& source, ErrorSlot error) {
+    const Number element = source.element;
     if (_progress != nullptr && !_progress->mayPass(_document.placeOf(element), error))
         return false;
     if (isBeingBound(plan, element))
@@ -111,54 +163,20 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const ChildLookup& source, E
     if (!_budget.takeObject(plan.className.string(), error))
         return false;
     if (depth < deepest)
-        return _budget.takeVisits(source.childCount(), element, error);
+        return _budget.takeVisits(source.children, element, error);
     return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
 }
 
-Ref<Object> Unmarshalling::build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
-                                 ErrorSlot error) {
-    const Number wrapper = std::exchange(_wrapper, none);
-    if (!mayBuild(plan, source, error)) {
-        locate(error, source.element(), nullptr, &plan);
-        return nullptr;
-    }
-    Ref<Object> object = allocate(plan);
-    // Whoever set it: a caller's earlier error stops the binding, too.
-    if (error != nullptr && *error)
-        return nullptr;
-    QXGenericRecord* const record = ObjectAccess::plainRecord(*object);
-    // A struct is asked for nothing: it moves on once it is bound.
-    const bool isAsked = record == nullptr && !object->isa().isStruct();
-    const ObjectHooks* const hooks = isAsked ? &_access.hooksOf(*object) : nullptr;
-    if (hooks != nullptr && hooks->rootObject != nullptr && hooks->setUndoManager != nullptr)
-        ObjectAccess::send(*object, *hooks->setUndoManager, _marshaller->undoManager());
-
-    const Frame frame{&plan, source.element(), _frame, _frame != nullptr ? _frame->depth + 1 : 1,
-                      wrapper};
-    struct Restore {
-        const Frame*& current;
-        const Frame* outer;
-        ~Restore() { current = outer; }
-    } const restore{_frame, _frame};
-    _frame = &frame;
-    const Traced traced(*this, plan, source.element(), *object);
-    const LentNames fields(*this);
-    const LentNames attributes(*this);
-    if (!readFields(plan, {*object, source, {*fields, *attributes}, isFlattened}, error))
-        return nullptr;
-    if (record != nullptr)
-        record->setNotifyBindingsObservers(true);
-    else if (isAsked && hooks->setNotifyBindingsObservers != nullptr)
-        ObjectAccess::send(*object, *hooks->setNotifyBindingsObservers, true);
-    return object;
-}
-
-Ref<Object> Unmarshalling::allocate(const ClassPlan& plan) {
+const Class* Unmarshalling::classOf(const ClassPlan& plan) {
     if (!_classKnown[plan.index]) {
         _classKnown[plan.index] = true;
         _classes[plan.index] = Class::named(plan.classNameToInstantiate.view());
     }
-    const Class* type = _classes[plan.index];
+    return _classes[plan.index];
+}
+
+Ref<Object> Unmarshalling::allocate(const ClassPlan& plan) {
+    const Class* const type = classOf(plan);
     Ref<Object> object = type != nullptr ? type->create() : nullptr;
     if (type != nullptr && !object) {
         logWarningOrLine("Class %@ cannot be made without arguments, records stand in for it",

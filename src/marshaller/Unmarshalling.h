@@ -22,6 +22,7 @@
 #include "marshaller/ReadingProgress.h"
 #include "marshaller/ReadingTrace.h"
 #include "marshaller/Reporting.h"
+#include "marshaller/UsualReading.h"
 #include "plan/MappingPlan.h"
 
 namespace qx::detail {
@@ -66,15 +67,24 @@ public:
     // `nodes` are those that are kept of the element.
     Ref<Object> unmarshallNode(Number node, IndexedXML::Nodes nodes, ErrorSlot error);
     // `source` may be shared with the object that this one is flattened into.
-    Ref<Object> build(const ClassPlan& plan, ChildLookup& source, bool isFlattened,
-                      ErrorSlot error);
+    Ref<Object> build(const ClassPlan& plan, ChildLookup& source, bool isFlattened, ErrorSlot error,
+                      StructObject* given = nullptr);
+    // A new object, or the struct that is given.
     Ref<Object> build(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
-                      ErrorSlot error);
+                      ErrorSlot error, StructObject* given = nullptr);
     Ref<Object> allocate(const ClassPlan& plan);
+    // The host's class of that name; null where it has none, or none that can be made.
+    const Class* classOf(const ClassPlan& plan);
     // The fields of the class and its ancestors, and what no field consumed.
     bool readFields(const ClassPlan& plan, const Target& target, ErrorSlot error);
     // True unless it failed: also when there was nothing to bind.
     bool readField(const FieldPlan& field, const Target& target, ErrorSlot error);
+    // What is to be done where a field has failed: whether the reading goes on. It stands apart,
+    // so that a level of nested objects takes less of the stack.
+    [[gnu::noinline]] bool passOverField(const FieldPlan& field, const Target& target,
+                                         ErrorSlot error);
+    // What is left to do for an element all of which was bound.
+    bool mayEnd(const ClassPlan& plan, Number element, std::size_t attributes, ErrorSlot error);
     // `plan` is the class whose fields were bound, null where they were bound one by one.
     bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error);
 
@@ -145,14 +155,24 @@ private:
     bool isInsideElement(Number element) const noexcept {
         return _frame->parent != nullptr && _frame->parent->element == element;
     }
-    // What is to be done where a field has failed: whether the reading goes on. It stands apart,
-    // so that a level of nested objects takes less of the stack.
-    [[gnu::noinline]] bool passOverField(const FieldPlan& field, const Target& target,
-                                         ErrorSlot error);
     Number placeOf(const FieldPlan& field, const Target& target, int code) const;
     // What ends a reading as a whole goes on failing.
     bool mayPassOver() const noexcept { return !_budget.isSpent() && !_progress->isCancelled(); }
-    bool mayBuild(const ClassPlan& plan, const ChildLookup& source, ErrorSlot error);
+    // An element, and how many children it has.
+    struct Counted {
+        Number element;
+        std::size_t children;
+    };
+    bool mayBuild(const ClassPlan& plan, const Counted& source, ErrorSlot error);
+    // The object, whose fields read(Object&) sets.
+    template <class Read>
+    Ref<Object> buildWith(const ClassPlan& plan, const Counted& source, StructObject* given,
+                          ErrorSlot error, Read read);
+    // Whether nobody wants more of an element than its fields.
+    bool isPlain() const noexcept {
+        return _use == Use::document && _trace == nullptr && !reports().isOn() &&
+               !_document.isMatched();
+    }
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
     static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
@@ -187,6 +207,7 @@ private:
     bool _isQuiet = false;
     const std::unique_ptr<ReadingTrace> _ownTrace; // of what is kept exactly
     ReadingTrace* _trace = nullptr;
+    UsualReading _usual;
     std::vector<const Class*> _classes; // by plan index, looked up once
     std::vector<bool> _classKnown;
     const Frame* _frame = nullptr;

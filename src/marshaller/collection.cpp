@@ -157,17 +157,16 @@ bool readItems(Unmarshalling& reading, const FieldPlan& field, const Target& tar
     return ObjectAccess::set(target.object, field.key, array, error);
 }
 
-// The text of an item.
-Value readText(Unmarshalling& reading, const FieldPlan& field, const Target& target,
+} // namespace
+
+Value itemText(Unmarshalling& reading, const FieldPlan& field, Object& owner,
                Unmarshalling::Number node, Ref<Error>* error) {
     if (reading.reports().isOn())
-        reading.reports().tellInside(reading.document(), node, &target.object);
+        reading.reports().tellInside(reading.document(), node, &owner);
     const Value text =
         reading.budget().takeVisits(1, node, error) ? reading.textOf(node, error) : Value();
     return text.isNull() ? Value() : itemOf(field, text, error, !reading.isCollecting());
 }
-
-} // namespace
 
 bool readCollection(Unmarshalling& reading, const FieldPlan& field, const Target& target,
                     Ref<Error>* error) {
@@ -195,7 +194,7 @@ bool readCollectionByType(Unmarshalling& reading, const FieldPlan& field, const 
     return readItems(reading, field, target, items, error, [&](Unmarshalling::Number node) {
         return field.typeClass != nullptr
                    ? Value(reading.build(*field.typeClass, node, target.source.nodes(), error))
-                   : readText(reading, field, target, node, error);
+                   : itemText(reading, field, target.object, node, error);
     });
 }
 

@@ -46,6 +46,15 @@ bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorS
     return validateChildren(copied, error) && validateAttributes(copied, error);
 }
 
+bool Unmarshalling::mayEnd(const ClassPlan& plan, Number element, std::size_t attributes,
+                           ErrorSlot error) {
+    if ((_marshaller->isLenient() && !_marshaller->saveUnknownXML()) ||
+        _budget.takeVisits(attributes, element, error))
+        return true;
+    locate(error, element, nullptr, &plan);
+    return passOver(error);
+}
+
 // Told without a look at the children, which may be many and far away.
 bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& target) {
     return plan.bindsChildrenOnce && !target.isFlattened && !target.source.isCopy() &&

@@ -93,17 +93,12 @@ bool Dictionary::add(const String& key, Value&& value) {
     return true;
 }
 
-// Most records hold no more keys.
-constexpr std::size_t usualSize = 4;
-
-inline void Dictionary::append(const String& key, Value&& value) {
-    const std::size_t size = _entries.size();
-    if (_index ? nameindex::isFull(*_index, size) : size >= nameindex::scanLimit)
+void Dictionary::appendToMany(const String& key, Value&& value) {
+    static_assert(fewEntries == nameindex::scanLimit);
+    if (_index == nullptr || nameindex::isFull(*_index, _entries.size()))
         makeRoom();
-    if (size == 0)
-        _entries.reserve(usualSize);
     _entries.emplace_back(key, std::move(value));
-    if (_index) [[unlikely]]
+    if (_index)
         nameindex::add(*_index, key, _entries.size() - 1);
     ++_count;
 }

@@ -47,6 +47,8 @@ struct ObjectInternals {
     static Object::Extras* existingExtras(const Object& object) noexcept {
         return object._extras == nullptr || hasLinkForExtras(object) ? nullptr : object._extras;
     }
+    // Whether anybody could hear of a change.
+    static bool isHeard(const Object& object) noexcept { return object.hasObserversOrWeakRefs(); }
     // Whether the object's last reference is gone.
     static bool isEnding(const Object& object) noexcept;
 

@@ -18,12 +18,18 @@ struct StructInternals {
     static const std::type_info& baseOf(const Class& described) {
         return *described._superclassType;
     }
+    static void assign(const Class& known, const StructObject& object) { known.assignTo(object); }
     static Value withClass(const Ref<StructObject>& object, const Class* known) {
         if (known != nullptr)
             known->assignTo(*object);
         return object;
     }
 };
+
+StructObject::StructObject(const Class& known, void* place) noexcept
+    : StructObject(known.type(), place, false) {
+    StructInternals::assign(known, *this);
+}
 
 // A reading makes a box for each struct: cut from blocks, they halve what it allocates.
 void* StructObject::operator new(std::size_t size) { return ObjectMemory::allocate(size); }

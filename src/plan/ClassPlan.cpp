@@ -48,6 +48,7 @@ void ClassPlan::summarise() {
         }
     } while (walk.next() && ++levels < mostLevels);
     bindsChildrenOnce = bindsChildrenOnce && levels < mostLevels;
+    usualForm = UsualForm::of(*this);
 }
 
 bool ExtendsWalk::next() {

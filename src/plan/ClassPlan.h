@@ -4,7 +4,7 @@
 // resolved: its fields, the class that it extends, how many names and attributes to expect.
 // Immutable; the plan of the mapping owns it.
 
-#include "plan/FieldPlan.h"
+#include "plan/UsualForm.h"
 
 namespace qx::detail {
 
@@ -28,7 +28,9 @@ public:
     // equals the child count, every child was bound.
     bool bindsChildrenOnce = false;
 
-    // Works out attributeCount and bindsChildrenOnce, once the fields and the ancestors are there.
+    std::optional<UsualForm> usualForm;
+
+    // Works out attributeCount, bindsChildrenOnce and usualForm, once the fields and the ancestors are there.
     void summarise();
 };
 

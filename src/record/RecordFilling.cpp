@@ -2,7 +2,6 @@
 
 #include <QXXMLMarshalling/model/Null.h>
 
-#include "model/LentText.h"
 
 namespace qx::detail {
 
@@ -16,8 +15,9 @@ bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) 
     return contents(record)->add(key.string(), std::move(value));
 }
 
-void RecordFilling::makeContents(QXGenericRecord& record) {
+void RecordFilling::makeContents(QXGenericRecord& record, std::size_t count) {
     record._contents = make<Dictionary>();
+    record._contents->_entries.reserve(count);
     record._isCacheBehind = record.tracking().isIdle();
 }
 

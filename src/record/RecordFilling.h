@@ -20,6 +20,8 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "model/LentText.h"
+
 namespace qx::detail {
 
 class RecordFilling {
@@ -30,6 +32,14 @@ public:
     }
     // The same for a key that is known to be no property of the record.
     static bool addContent(QXGenericRecord& record, Key key, Value&& value);
+    // Of a record that is new and that nobody has heard of: under a key that it has not, and that
+    // is no property. The value may not be null; about so many are to come in all.
+    static void append(QXGenericRecord& record, Key key, Value&& value, std::size_t count) {
+        if (!record._contents) [[unlikely]]
+            makeContents(record, count);
+        LentText::keep(value);
+        record._contents->append(key.string(), std::move(value));
+    }
     // Made when there are none.
     static const Ref<Dictionary>& contents(QXGenericRecord& record) {
         if (!record._contents) [[unlikely]]
@@ -43,7 +53,7 @@ private:
     static bool namesProperty(const QXGenericRecord& record, Key key) {
         return key.namesProperty() && record.isa().property(key) != nullptr;
     }
-    static void makeContents(QXGenericRecord& record);
+    static void makeContents(QXGenericRecord& record, std::size_t count = 0);
 };
 
 } // namespace qx::detail

@@ -83,6 +83,16 @@ public:
             if (index()[at].nodeKind() == kind)
                 visit(at);
     }
+    // For who goes over whole elements: the entries, those inside an element once it is expanded,
+    // and the names to match by, by their numbers.
+    const XMLIndex& index() const noexcept { return *_index; }
+    void expand(Number element) {
+        if (_tree)
+            _tree->expand(element);
+    }
+    const String* names() const noexcept {
+        return _interned.empty() ? index().names().data() : _interned.data();
+    }
     // Where the attributes and declarations of an element stand.
     struct Attributes {
         Number begin = 0;
@@ -186,11 +196,6 @@ private:
     // Texts up to this are as fast made again as looked up.
     static constexpr std::size_t longestUnshared = 256;
 
-    const XMLIndex& index() const noexcept { return *_index; }
-    void expand(Number element) {
-        if (_tree)
-            _tree->expand(element);
-    }
     void expandAll(Number element) {
         if (_tree)
             _tree->expandAll(element);

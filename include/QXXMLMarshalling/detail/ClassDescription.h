@@ -3,6 +3,7 @@
 // How the parts of a class description (Property.h) are made from members: each accessor becomes a
 // captureless function pointer. Hosts use them through Class::define (Class.h).
 
+#include <QXXMLMarshalling/detail/StructPlacing.h>
 #include <QXXMLMarshalling/detail/TakeOver.h>
 #include <QXXMLMarshalling/detail/TakenTexts.h>
 #include <QXXMLMarshalling/model/Property.h>
@@ -31,10 +32,28 @@ struct ClassDraft {
     const std::type_info* superclass = nullptr;
     const StructType* structType = nullptr; // null: of a class that derives from Object
     Ref<Object> (*create)() = nullptr;      // null: not without arguments
+    bool setsByProperty = false;            // see Class::setsByProperty
     std::vector<Property> properties{};
     std::vector<Operation> operations{};
     std::vector<Operation> classOperations{};
 };
+
+// Whether setting a value by key is what Object makes of it: T overrides nothing of that.
+template <class T>
+constexpr bool setsByProperty() {
+    if constexpr (requires {
+                      &T::trySetValueForKey;
+                      &T::willChangeValueForKey;
+                      &T::didChangeValueForKey;
+                  }) {
+        using Announce = void (Object::*)(Key);
+        using Set = SetOutcome (Object::*)(const Value&, Key);
+        return std::is_same_v<decltype(&T::trySetValueForKey), Set> &&
+               std::is_same_v<decltype(&T::willChangeValueForKey), Announce> &&
+               std::is_same_v<decltype(&T::didChangeValueForKey), Announce>;
+    }
+    return false;
+}
 
 // Publishes the draft, under its name too unless `listed` is false (a class that no mapping may
 // name). The class that holds the type afterwards: the first one that was published for it;
@@ -168,6 +187,7 @@ Property memberProperty(std::string_view name) {
         if constexpr (!std::is_const_v<M>) {
             property.set = &setMember<T, Member>;
             property.takeOver = &takeOverMember<T, Member>;
+            property.placing = structPlacing<T, Member>();
         }
     }
     return property;

@@ -34,6 +34,8 @@ public:
     // Refers to the struct, which lives on somewhere else.
     StructObject(const std::type_info& type, const void* place) noexcept
         : StructObject(type, const_cast<void*>(place), false) {}
+    // The same, of that class.
+    StructObject(const Class& known, void* place) noexcept;
     static void* operator new(std::size_t size);
     static void* operator new(std::size_t size, std::align_val_t alignment);
     static void operator delete(void* memory) noexcept;

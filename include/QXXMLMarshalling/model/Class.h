@@ -100,6 +100,9 @@ public:
     bool isStruct() const noexcept { return _structType != nullptr; }
     const std::type_info& type() const noexcept { return *_type; }
 
+    // Whether an object of this very class, which nobody observes, is set a value by key as by the
+    // property: its C++ class overrides nothing of that.
+    bool setsByProperty() const noexcept { return _setsByProperty; }
     // The property of that name, inherited ones included; null when there is none.
     const Property* property(Key key) const;
     // The class's own properties in the order of their description, not the inherited ones.
@@ -141,6 +144,7 @@ private:
     const detail::StructType* _structType; // how structs of the class are moved; null for objects
     mutable std::atomic<const Class*> _superclass{nullptr};
     Ref<Object> (*_create)();
+    bool _setsByProperty;
     std::vector<Property> _properties;
     std::vector<Operation> _operations;
     std::vector<Operation> _classOperations;
@@ -238,6 +242,7 @@ ClassBuilder<T> Class::define(std::string_view name) {
     draft.superclass = &typeid(Base);
     if constexpr (std::derived_from<T, Object>) {
         static_assert(std::derived_from<T, Base>);
+        draft.setsByProperty = detail::setsByProperty<T>();
         if constexpr (std::is_default_constructible_v<T>)
             draft.create = []() -> Ref<Object> { return make<T>(); };
     } else {

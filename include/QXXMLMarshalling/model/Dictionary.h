@@ -20,6 +20,10 @@ namespace qx {
 
 class Array;
 
+namespace detail {
+class RecordFilling;
+}
+
 class QX_API Dictionary final : public Object {
 public:
     struct Entry {
@@ -131,12 +135,26 @@ protected:
     const Class& describedClass() const override;
 
 private:
+    friend class detail::RecordFilling;
+
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
-    void append(const String& key, Value&& value);
+    // Under a key that is not there; neither may be null.
+    void append(const String& key, Value&& value) {
+        if (_entries.size() >= fewEntries) [[unlikely]]
+            return appendToMany(key, std::move(value));
+        if (_entries.capacity() == 0)
+            _entries.reserve(usualSize);
+        _entries.emplace_back(key, std::move(value));
+        ++_count;
+    }
+    void appendToMany(const String& key, Value&& value);
     void makeRoom();
     void passRemoved() noexcept;
     void changed() noexcept { ++_changes; }
+
+    static constexpr std::size_t usualSize = 4;  // most records hold no more
+    static constexpr std::size_t fewEntries = 8; // up to so many there is no index
 
     using Entries = std::vector<Entry, detail::ObjectAllocator<Entry>>;
     using Index = std::vector<std::uint32_t>; // see NameIndex.h

@@ -14,6 +14,7 @@ namespace qx {
 
 namespace detail {
 class TakeOver;
+struct StructPlacing;
 struct TakenObjects;
 struct TakenTexts;
 } // namespace detail
@@ -33,6 +34,8 @@ struct Property {
     // Gives an object what another has, moved without a conversion; the objects that it holds stay
     // (TakeOver.h). Null where `set` has to do, with what `get` answers of the other.
     void (*takeOver)(const Property&, Object& held, Object& fresh, detail::TakeOver&) = nullptr;
+    // How structs are made in it, where it is a data member that holds them by value.
+    const detail::StructPlacing* placing = nullptr;
     // Whether zero, false and empty text are values like any other when the object is written.
     bool keepsZero = false;
     // Of which classes objects have to be; null for a property that takes no objects, or any.

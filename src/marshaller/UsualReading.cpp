@@ -1,0 +1,257 @@
+#include "marshaller/UsualReading.h"
+
+#include <QXXMLMarshalling/detail/StructPlacing.h>
+#include <QXXMLMarshalling/model/Array.h>
+
+#include "marshaller/FieldBinding.h"
+#include "model/ObjectExtras.h"
+
+#include <algorithm>
+#include <bit>
+
+namespace qx::detail {
+
+using Place = UsualForm::Place;
+using Slot = UsualForm::Slot;
+
+inline const UsualReading::Setters& UsualReading::settersOf(const ClassPlan& plan,
+                                                            const Object& object) {
+    if (_latest.size() <= plan.index)
+        _latest.resize(plan.index + 1, nullptr);
+    const Setters*& latest = _latest[plan.index];
+    if (latest == nullptr || latest->type != &object.isa()) [[unlikely]]
+        latest = &lookUp(plan, object);
+    return *latest;
+}
+
+const UsualReading::Setters& UsualReading::lookUp(const ClassPlan& plan, const Object& object) {
+    static const Selector announces("automaticallyNotifiesObserversForKey:");
+    const Class& type = object.isa();
+    Setters& setters = _setters.emplace_back();
+    setters.type = &type;
+    setters.appends = &type == &QXGenericRecord::classObject();
+    setters.usesProperties =
+        type.isStruct() || (type.setsByProperty() && typeid(object) == type.type() &&
+                            type.classOperation(announces) == nullptr);
+    for (const Slot& slot : plan.usualForm->slots()) {
+        const Key key = slot.field->key;
+        const Property* const property = type.property(key);
+        setters.slots.push_back({property, placedClass(slot, property)});
+        setters.appends = setters.appends && property == nullptr && !key.view().starts_with('@');
+    }
+    return setters;
+}
+
+// Where errors are collected an object that failed is left out, as if it had never been.
+const Class* UsualReading::placedClass(const Slot& slot, const Property* property) const {
+    const StructPlacing* const placing = property != nullptr ? property->placing : nullptr;
+    if (placing == nullptr || placing->isList() != slot.isList() || slot.plan == nullptr ||
+        _reading.isCollecting())
+        return nullptr;
+    const Class* const type = _reading.classOf(*slot.plan);
+    return type != nullptr && type->isStruct() && type->type() == *placing->type ? type : nullptr;
+}
+
+// One object that is bound.
+class UsualReading::Binding {
+public:
+    Binding(Unmarshalling& reading, const Source& source, const Setters& setters, Object& object,
+            ErrorSlot error) noexcept
+        : _reading(reading), _document(reading.document()), _source(source),
+          _slots(source.plan.usualForm->slots().data()), _setters(setters), _object(object),
+          _error(error), _isUnheard(setters.appends) {}
+
+    bool run() {
+        for (std::uint32_t left = _source.element.slots(); left != 0; left &= left - 1)
+            if (!readField(static_cast<std::size_t>(std::countr_zero(left))))
+                return false;
+        return _reading.mayEnd(_source.plan, _source.number, _source.element.attributeCount(),
+                               _error);
+    }
+
+private:
+    // The items of a list.
+    struct Items {
+        Number first;
+        Number end;
+        std::size_t most; // how many there may be
+    };
+
+    bool readField(std::size_t slot);
+    bool passOver(const FieldPlan& field);
+    bool readValue(std::size_t slot, ErrorSlot error);
+    bool readItems(std::size_t slot);
+    bool placeItems(std::size_t slot, const Items& items);
+    Items itemsOf(std::size_t slot) const;
+    template <class Visit>
+    bool forEach(const Items& items, const Slot& slot, Visit visit) const;
+    bool hasFailed(const Slot& slot, Number item);
+    bool adopt(const Value& value, ErrorSlot error);
+    bool set(std::size_t slot, Value&& value, ErrorSlot error);
+
+    Unmarshalling& _reading;
+    IndexedXML& _document;
+    const Source& _source;
+    const Slot* const _slots;
+    const Setters& _setters;
+    Object& _object;
+    const ErrorSlot _error;
+    bool _isUnheard; // a record, of nobody
+};
+
+bool UsualReading::readFields(const Source& source, Object& object, ErrorSlot error) {
+    return Binding(_reading, source, settersOf(source.plan, object), object, error).run();
+}
+
+inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlot error) {
+    const Key key = _slots[slot].field->key;
+    if (_isUnheard && !value.isNull()) {
+        const auto count = static_cast<std::size_t>(std::popcount(_source.element.slots()));
+        RecordFilling::append(static_cast<QXGenericRecord&>(_object), key, std::move(value), count);
+        return true;
+    }
+    const Property* const property = _setters.slots[slot].property;
+    if (_setters.usesProperties && property != nullptr && property->set != nullptr &&
+        !ObjectInternals::isHeard(_object))
+        return property->set(*property, _object, value) ||
+               ObjectAccess::refuse(_object, key, value, error);
+    return ObjectAccess::set(_object, key, std::move(value), error);
+}
+
+// Who is told of the object that is to hold it has heard of that one.
+inline bool UsualReading::Binding::adopt(const Value& value, ErrorSlot error) {
+    Object* const object = value.object();
+    if (object == nullptr || ObjectAccess::plainRecord(*object) != nullptr)
+        return true;
+    _isUnheard = _isUnheard && object->isa().isStruct();
+    return _reading.adopt(*object, _object, error);
+}
+
+inline bool UsualReading::Binding::readValue(std::size_t slot, ErrorSlot error) {
+    const Slot& taking = _slots[slot];
+    const Number number = _source.element[slot];
+    Value value;
+    if (!_document.isElement(number)) {
+        value = _document.value(number);
+        if (taking.place == Place::text && value.view().empty())
+            return true;
+    } else if (taking.plan == nullptr) {
+        value = _reading.textOf(number, error);
+    } else if (const Setter& setter = _setters.slots[slot]; setter.placed != nullptr) {
+        StructObject held(*setter.placed, setter.property->placing->begin(_object, 1));
+        return static_cast<bool>(_reading.build(*taking.plan, number, _source.nodes, error, &held));
+    } else {
+        value = _reading.build(*taking.plan, number, _source.nodes, error);
+        if (!value.isNull() && !adopt(value, error))
+            return false;
+    }
+    const bool isText =
+        !value.isNull() && (!convertsText(*taking.field) ||
+                            convertText(*taking.field, value, error, !_reading.isCollecting()));
+    return isText && set(slot, std::move(value), error);
+}
+
+inline bool UsualReading::Binding::readField(std::size_t slot) {
+    const FieldPlan& field = *_slots[slot].field;
+    if (_slots[slot].isList())
+        return readItems(slot) || passOver(field);
+    Ref<Error> problem;
+    if (readValue(slot, &problem) || !problem)
+        return true;
+    if (_error != nullptr)
+        *_error = std::move(problem);
+    return passOver(field);
+}
+
+[[gnu::noinline, gnu::cold]] bool UsualReading::Binding::passOver(const FieldPlan& field) {
+    ChildLookup lookup(_document, _source.number, _source.nodes, 0);
+    ConsumedNames none;
+    return _reading.passOverField(field, {_object, lookup, {none, none}, false}, _error);
+}
+
+UsualReading::Binding::Items UsualReading::Binding::itemsOf(std::size_t slot) const {
+    const XMLIndex& index = _document.index();
+    const Number number = _source.element[slot];
+    if (_slots[slot].place == Place::items)
+        return {number, index.contentEnd(_source.number), _source.element.childCount()};
+    _document.expand(number);
+    Items items{index.firstChild(number), index.contentEnd(number), 0};
+    _document.forEachChildFrom(items.first, number, [&](Number) { ++items.most; });
+    return items;
+}
+
+// Calls visit(Number) for each until it answers false.
+template <class Visit>
+bool UsualReading::Binding::forEach(const Items& items, const Slot& slot, Visit visit) const {
+    const XMLIndex& index = _document.index();
+    const String* const names = _document.names();
+    for (Number at = items.first; at < items.end; at = index.siblingOf(at)) {
+        if (index[at].nodeKind() != XMLNodeKind::element)
+            continue;
+        const bool isItem = names[index[at].name()].isSameAs(slot.itemName);
+        if (!isItem && slot.place == Place::items)
+            break; // they stand one behind the other
+        if (isItem && !visit(at))
+            return false;
+    }
+    return true;
+}
+
+inline bool UsualReading::Binding::hasFailed(const Slot& slot, Number item) {
+    if ((_error == nullptr || !*_error) && !_reading.budget().isSpent())
+        return false;
+    _reading.locate(_error, item, slot.field, _reading.currentClass());
+    return true;
+}
+
+bool UsualReading::Binding::readItems(std::size_t slot) {
+    const Slot& taking = _slots[slot];
+    const Items items = itemsOf(slot);
+    if (taking.place == Place::wrapped &&
+        !_reading.budget().takeVisits(items.most, _source.element[slot], _error))
+        return false;
+    if (_setters.slots[slot].placed != nullptr)
+        return placeItems(slot, items);
+    // Few may be made of very many.
+    constexpr std::size_t usualSize = 16;
+    Ref<Array> array;
+    const bool areRead = forEach(items, taking, [&](Number node) {
+        if (!array) {
+            array = make<Array>();
+            array->reserve(std::min(items.most, usualSize));
+        }
+        Value item = taking.plan != nullptr
+                         ? Value(_reading.build(*taking.plan, node, _source.nodes, _error))
+                         : itemText(_reading, *taking.field, _object, node, _error);
+        if (hasFailed(taking, node))
+            return _reading.passOver(_error);
+        if (item.isNull())
+            return true;
+        if (!adopt(item, _error))
+            return false;
+        array->add(std::move(item));
+        return true;
+    });
+    return areRead && (!array || set(slot, Value(std::move(array)), _error));
+}
+
+// Without a slot for errors an item that fails is left out.
+bool UsualReading::Binding::placeItems(std::size_t slot, const Items& items) {
+    const Setter& setter = _setters.slots[slot];
+    const StructPlacing& placing = *setter.property->placing;
+    void* list = nullptr;
+    return forEach(items, _slots[slot], [&](Number node) {
+        if (list == nullptr)
+            list = placing.begin(_object, items.most);
+        StructObject held(*setter.placed, placing.add(list));
+        const bool isBuilt = static_cast<bool>(
+            _reading.build(*_slots[slot].plan, node, _source.nodes, _error, &held));
+        if (hasFailed(_slots[slot], node))
+            return false;
+        if (!isBuilt)
+            placing.removeLast(list);
+        return true;
+    });
+}
+
+} // namespace qx::detail
