@@ -144,6 +144,9 @@ std::string fromUTF16(std::u16string_view units) {
 }
 
 std::string_view withoutLeadingSpace(std::string_view text) noexcept {
+    const auto isPlain = [](char c) { return c > ' ' && c <= '~'; };
+    if (!text.empty() && isPlain(text.front()))
+        return text;
     const auto* const bytes = reinterpret_cast<const std::uint8_t*>(text.data());
     std::size_t start = 0;
     for (std::size_t next = 0; next < text.size(); start = next) {

@@ -27,6 +27,7 @@ inline bool UsualElement::take(std::size_t slot, Number number) noexcept {
     if (slot == none || (_slots >> slot & 1U) != 0)
         return false;
     _slots |= 1U << slot;
+    ++_slotCount;
     _first[slot] = number;
     return true;
 }

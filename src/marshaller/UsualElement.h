@@ -18,6 +18,7 @@ public:
 
     // The slots that have something, one bit each.
     std::uint32_t slots() const noexcept { return _slots; }
+    std::size_t slotCount() const noexcept { return _slotCount; }
     // The attribute, child, wrapper or text of such a slot, or its first item.
     Number operator[](std::size_t slot) const noexcept { return _first[slot]; }
     std::size_t attributeCount() const noexcept { return _attributeCount; }
@@ -29,6 +30,7 @@ private:
     bool take(std::size_t slot, Number number) noexcept;
 
     std::uint32_t _slots = 0;
+    std::uint32_t _slotCount = 0;
     std::uint32_t _attributeCount = 0;
     std::uint32_t _childCount = 0;
     std::array<Number, UsualForm::mostSlots> _first;

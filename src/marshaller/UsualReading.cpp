@@ -27,7 +27,7 @@ inline const UsualReading::Setters& UsualReading::settersOf(const ClassPlan& pla
 const UsualReading::Setters& UsualReading::lookUp(const ClassPlan& plan, const Object& object) {
     static const Selector announces("automaticallyNotifiesObserversForKey:");
     const Class& type = object.isa();
-    Setters& setters = _setters.emplace_back();
+    Setters& setters = _setters.emplace_front();
     setters.type = &type;
     setters.appends = &type == &QXGenericRecord::classObject();
     setters.usesProperties =
@@ -106,8 +106,8 @@ bool UsualReading::readFields(const Source& source, Object& object, ErrorSlot er
 inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlot error) {
     const Key key = _slots[slot].field->key;
     if (_isUnheard && !value.isNull()) {
-        const auto count = static_cast<std::size_t>(std::popcount(_source.element.slots()));
-        RecordFilling::append(static_cast<QXGenericRecord&>(_object), key, std::move(value), count);
+        RecordFilling::append(static_cast<QXGenericRecord&>(_object), key, std::move(value),
+                              _source.element.slotCount());
         return true;
     }
     const Property* const property = _setters.slots[slot].property;

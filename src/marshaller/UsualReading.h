@@ -16,7 +16,7 @@
 #include "marshaller/UsualElement.h"
 #include "plan/ClassPlan.h"
 
-#include <deque>
+#include <forward_list>
 #include <vector>
 
 namespace qx::detail {
@@ -59,7 +59,7 @@ private:
     const Class* placedClass(const UsualForm::Slot& slot, const Property* property) const;
 
     Unmarshalling& _reading;
-    std::deque<Setters> _setters;        // which stay where they are
+    std::forward_list<Setters> _setters; // which stay where they are
     std::vector<const Setters*> _latest; // by plan index
 };
 

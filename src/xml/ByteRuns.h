@@ -4,6 +4,7 @@
 // many together. A zero byte stands at `end`, and is of no kind: every run ends there at the
 // latest.
 
+#include <algorithm>
 #include <array>
 #include <bit>
 #include <cstddef>
@@ -92,6 +93,18 @@ public:
             _mm_or_si128(equal('/'), equal('=')),
             _mm_or_si128(equal('>'),
                          _mm_cmpeq_epi8(_mm_min_epu8(_bytes, _mm_set1_epi8(' ')), _bytes))));
+    }
+    // How many of them are that one.
+    std::size_t count(char c) const noexcept {
+        const __m128i ones = _mm_and_si128(equal(c), _mm_set1_epi8(1));
+        const ByteBlock sums(_mm_sad_epu8(ones, _mm_setzero_si128()));
+        return sums.lowerWord() + sums.upperWord();
+    }
+    // A bit for each quote and angle bracket.
+    std::uint64_t tagMarks() const noexcept {
+        const __m128i marks = _mm_or_si128(_mm_or_si128(equal('"'), equal('\'')),
+                                           _mm_or_si128(equal('<'), equal('>')));
+        return static_cast<std::uint32_t>(_mm_movemask_epi8(marks));
     }
     // The first bytes, zeros behind them.
     ByteBlock first(std::size_t count) const noexcept {
@@ -185,6 +198,56 @@ const char* endOfRun(const char* at, [[maybe_unused]] const char* end) noexcept 
             return at;
         ++at;
     }
+}
+
+// Walks over the quotes and angle brackets of a text: those of 64 bytes are found together.
+class TagMarks {
+public:
+    // From there on, where the text goes on.
+    TagMarks(const char* at, const char* end) noexcept : _at(at), _end(end) {}
+
+    // The next one; null where fewer than 64 bytes are left to look at.
+    const char* next() noexcept {
+        while (_marks == 0) {
+            if (_end - _at < size)
+                return nullptr;
+            for (int i = 0; i < size; i += 16)
+                _marks |= marksOf(_at + i) << i;
+            _at += size;
+        }
+        const char* const found = _at - size + std::countr_zero(_marks);
+        _marks &= _marks - 1;
+        return found;
+    }
+
+private:
+    static constexpr int size = 64;
+
+    // A bit for each of sixteen bytes.
+    static std::uint64_t marksOf(const char* at) noexcept {
+#if defined(__SSE2__)
+        return ByteBlock(at).tagMarks();
+#else
+        std::uint64_t marks = 0;
+        for (unsigned i = 0; i < 16; ++i)
+            marks |= std::uint64_t{at[i] != '\0' && !is(at[i], tagByte)} << i;
+        return marks;
+#endif
+    }
+
+    const char* _at; // what was not looked at
+    const char* const _end;
+    std::uint64_t _marks = 0; // in the block before, of those that were not handed out
+};
+
+// How often the byte stands there.
+inline std::size_t countOf(char c, const char* from, const char* to) noexcept {
+    std::size_t count = 0;
+#if defined(__SSE2__)
+    for (; ByteBlock::fits(from, to); from += ByteBlock::size)
+        count += ByteBlock(from).count(c);
+#endif
+    return count + static_cast<std::size_t>(std::count(from, to, c));
 }
 
 // A name of at most 15 bytes as two words, zeros behind it.

@@ -1,5 +1,7 @@
 #include "xml/TextPosition.h"
 
+#include "xml/ByteRuns.h"
+
 #include <algorithm>
 #include <cstdint>
 #include <cstring>
@@ -23,20 +25,6 @@ std::size_t countCodePoints(const char* from, const char* to) noexcept {
     return count;
 }
 
-std::size_t countLineEnds(const char* from, const char* to) noexcept {
-    std::size_t count = 0;
-    constexpr std::uint64_t lowBits = 0x0101010101010101U;
-    for (; to - from >= 8; from += 8) {
-        std::uint64_t word = 0;
-        std::memcpy(&word, from, 8);
-        // A line end is a zero byte of `other`; of `others` each byte's lowest bit is set but its.
-        const std::uint64_t other = word ^ lowBits * '\n';
-        const std::uint64_t others = (((other & ~(lowBits << 7)) + (lowBits * 0x7F)) | other) >> 7;
-        count += 8 - static_cast<std::size_t>(((others & lowBits) * lowBits) >> 56);
-    }
-    return count + static_cast<std::size_t>(std::count(from, to, '\n'));
-}
-
 } // namespace
 
 void TextPosition::moveTo(std::size_t offset) {
@@ -57,7 +45,7 @@ void TextPosition::advance(std::size_t offset) noexcept {
     const char* from = _text.data() + _at.offset;
     const char* const to = _text.data() + offset;
     _at.offset = offset;
-    if (const std::size_t lines = countLineEnds(from, to); lines != 0) {
+    if (const std::size_t lines = countOf('\n', from, to); lines != 0) {
         _at.line += lines;
         _at.column = 1;
         from = to;

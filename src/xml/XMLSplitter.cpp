@@ -37,8 +37,10 @@ bool XMLSplitter::isItemName(std::string_view name) const noexcept {
 
 void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
     _text = text;
-    while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext()) {
-    }
+    do {
+        if (_depth != 0 && _seen == 0)
+            goOverTags();
+    } while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext());
     _text = {};
 }
 
@@ -109,6 +111,38 @@ bool XMLSplitter::goOverNext() {
         return goOverInstruction();
     default:
         return goOverStartTag();
+    }
+}
+
+// Goes over tags and texts inside an item as long as they are whole and nothing else comes: most of
+// a document. What ends the item, is faulty or stands near the end of the text is left alone.
+void XMLSplitter::goOverTags() {
+    TagMarks marks(_text.data() + _at, _text.data() + _text.size());
+    const char* mark = marks.next();
+    while (true) {
+        while (mark != nullptr && *mark != '<')
+            mark = marks.next();
+        if (mark == nullptr || mark[1] == '!' || mark[1] == '?')
+            return;
+        const char* const tag = mark;
+        const bool isEndTag = tag[1] == '/';
+        mark = marks.next();
+        while (mark != nullptr && (*mark == '"' || *mark == '\'')) {
+            const char quote = *mark;
+            mark = marks.next();
+            while (!isEndTag && mark != nullptr && *mark != quote && *mark != '<')
+                mark = marks.next();
+            if (!isEndTag && mark != nullptr && *mark == quote)
+                mark = marks.next();
+        }
+        if (mark == nullptr || *mark != '>' || (isEndTag && _depth == 1))
+            return;
+        if (isEndTag)
+            --_depth;
+        else if (mark[-1] != '/')
+            ++_depth;
+        _at = static_cast<End>(mark + 1 - _text.data());
+        mark = marks.next();
     }
 }
 

@@ -73,6 +73,7 @@ private:
     using End = std::size_t;
 
     bool goOverNext();
+    void goOverTags();
     bool goOverDeclaration();
     bool goOverInstruction();
     bool goOverStartTag();
