@@ -23,11 +23,6 @@ ObjectHooks::ObjectHooks(const Class& describedType)
       setParent(describedType.operation("setParent:")),
       isRemovable(describedType.operation("isRemovable")) {}
 
-const ObjectHooks& ObjectAccess::hooksOf(const Object& object) {
-    const Class& type = object.isa();
-    return _known.try_emplace(&type, type).first->second;
-}
-
 Value ObjectAccess::send(Object& object, const Operation& operation) {
     return operation.invoke(operation.selector, object.isa(), &object, {});
 }

@@ -37,7 +37,12 @@ enum class KeptXML : std::uint8_t { children, attributes, namespaces };
 class ObjectAccess {
 public:
     // The hooks of the object's class; they live as long as the ObjectAccess.
-    const ObjectHooks& hooksOf(const Object& object);
+    const ObjectHooks& hooksOf(const Object& object) {
+        const Class& type = object.isa();
+        if (_latest == nullptr || _latest->type != &type)
+            _latest = &_known.try_emplace(&type, type).first->second;
+        return *_latest;
+    }
 
     // The object as a record, null for one of any other class, a subclass of the record's too. What
     // the hooks of most objects would do is done directly then.
@@ -102,6 +107,8 @@ private:
     static const Class* const records;
 
     std::unordered_map<const Class*, ObjectHooks> _known;
+    const ObjectHooks* _latest =
+        nullptr; // mostly the next one's, too: 3 % of the time of host classes
 };
 
 } // namespace qx::detail

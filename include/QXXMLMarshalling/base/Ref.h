@@ -9,11 +9,26 @@
 
 #include <concepts>
 #include <cstddef>
+#include <type_traits>
+#include <typeinfo>
 #include <utility>
 
 namespace qx {
 
 class Object;
+
+namespace detail {
+
+// A dynamic_cast; most objects are of the very class that is asked for, and need no search.
+template <class To, class From>
+To* castTo(From* object) noexcept {
+    if constexpr (requires { static_cast<To*>(object); } && std::is_polymorphic_v<From>)
+        if (object != nullptr && typeid(*object).name() == typeid(To).name())
+            return static_cast<To*>(object);
+    return dynamic_cast<To*>(object);
+}
+
+} // namespace detail
 
 // Holds an object of class T, or null. Copying shares the object.
 template <class T>
@@ -68,7 +83,7 @@ public:
     // The same object as another class, or null where it is of no such class.
     template <class U>
     Ref<U> as() const noexcept {
-        return Ref<U>(dynamic_cast<U*>(_object));
+        return Ref<U>(detail::castTo<U>(_object));
     }
 
 private:

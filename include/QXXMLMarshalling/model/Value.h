@@ -106,7 +106,7 @@ public:
     // The object as class T, or null where the value is no object of that class.
     template <class T>
     Ref<T> as() const noexcept {
-        return Ref<T>(dynamic_cast<T*>(object()));
+        return Ref<T>(detail::castTo<T>(object()));
     }
     // The value as a T of its own, structs copied: what a property of type T would hold. None where
     // the property would refuse it.

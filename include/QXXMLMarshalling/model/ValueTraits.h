@@ -290,7 +290,7 @@ template <std::derived_from<Object> T>
 struct ValueTraits<T*> {
     static Value toValue(const T* value) { return value; }
     static bool fromValue(const Value& value, T*& result) {
-        T* object = dynamic_cast<T*>(value.object());
+        T* object = detail::castTo<T>(value.object());
         if (object == nullptr && !value.isNull())
             return false;
         result = object;
