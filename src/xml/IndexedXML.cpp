@@ -199,7 +199,8 @@ IndexedXML::Extent IndexedXML::extent(Number element, std::size_t enough) {
         open.pop_back();
         expand(inner);
         const Number end = index().contentEnd(inner);
-        for (Number at = index().content(inner); at < end; at = index().siblingOf(at)) {
+        Number at = index().content(inner);
+        for (; at < end && extent.nodes < enough; at = index().siblingOf(at)) {
             const XMLIndexEntry& entry = index()[at];
             if (XMLIndex::isLayout(entry, index()[inner]))
                 continue;
