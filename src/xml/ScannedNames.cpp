@@ -32,14 +32,22 @@ ScannedNames::Name& ScannedNames::findLong(std::string_view text) {
 ScannedNames::Name& ScannedNames::add(std::string_view text, const ShortName& bytes,
                                       std::uint32_t hash) {
     require(text.size() <= _longest && _URIs + _names.size() < xmlLimits::names);
-    Name name{bytes, static_cast<std::uint32_t>(text.data() - _text.data()),
-              static_cast<std::uint32_t>(text.size()), hash, 0};
+    Name name{bytes,
+              static_cast<std::uint32_t>(text.data() - _text.data()),
+              static_cast<std::uint32_t>(text.size()),
+              hash,
+              0,
+              0,
+              none,
+              0,
+              0};
     if (!text.empty())
         takeApart(name, text);
     if ((_names.size() + 1) * 2 > _slots.size())
         grow();
     _texts.push_back(knownName(text));
     name.number = static_cast<Number>(_names.size());
+    name.follower = name.number;
     _names.push_back(name);
     fill(name.number);
     return _names.back();

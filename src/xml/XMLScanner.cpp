@@ -150,7 +150,7 @@ XMLScanner::Place XMLScanner::scanRoot(Place at) {
     at = scanElementStart(at);
     while (!_open.empty()) {
         if (*at != '<')
-            at = scanText(at);
+            at = *at == '\n' ? scanIndent(at) : scanText(at);
         else if (at[1] == '/')
             at = scanEndTag(at);
         else if (at[1] == '!' || at[1] == '?')
@@ -289,6 +289,16 @@ inline std::pair<XMLScanner::Place, bool> XMLScanner::scanBlanks(Place at) {
     }
 }
 
+// What mostly stands between elements: a line end and blanks.
+inline XMLScanner::Place XMLScanner::scanIndent(Place at) {
+    const Place end = endOfRun<blankByte>(at, _end);
+    if (*end != '<' || end[1] == '!')
+        return scanText(at);
+    _needsWork = false;
+    addLeaf(XMLNodeKind::text, 0, at, end).setIf(true, XMLIndexEntry::isBlank);
+    return end;
+}
+
 // One text, up to the next markup that is no CDATA.
 inline XMLScanner::Place XMLScanner::scanText(Place at) {
     const Place begin = at;
@@ -357,9 +367,10 @@ XMLScanner::Place XMLScanner::scanInstruction(Place at) {
     const Place begin = at;
     _needsWork = false;
     at += 2;
-    const Place target = at;
-    const Number name = scanNameByBytes(at).number;
-    const std::string_view text(target, static_cast<std::size_t>(at - target));
+    const Name& target = findNameByBytes(at);
+    const Number name = target.number;
+    const std::string_view text(at, target.size);
+    at += target.size;
     require(text.find(':') == std::string_view::npos);
     require(text.size() != 3 || (text[0] | 0x20) != 'x' || (text[1] | 0x20) != 'm' ||
             (text[2] | 0x20) != 'l');
@@ -415,15 +426,25 @@ XMLScanner::Place XMLScanner::scanBeyondASCII(Place at) {
 }
 
 inline XMLScanner::Name& XMLScanner::scanName(Place& at) {
-    ShortName bytes;
-    const std::size_t size = ShortName::read(at, _end, bytes);
-    if (size == 0) [[unlikely]]
-        return scanNameByBytes(at);
-    at += size;
-    return _names.find(at - size, size, bytes);
+    Name* name =
+        _latestName != ScannedNames::none ? _names.follower(_latestName, at, _end) : nullptr;
+    if (name == nullptr) [[unlikely]]
+        name = &findName(at);
+    _latestName = name->number;
+    at += name->size;
+    return *name;
 }
 
-XMLScanner::Name& XMLScanner::scanNameByBytes(Place& at) {
+XMLScanner::Name& XMLScanner::findName(Place at) {
+    ShortName bytes;
+    const std::size_t size = ShortName::read(at, _end, bytes);
+    Name& name = size != 0 ? _names.find(at, size, bytes) : findNameByBytes(at);
+    if (_latestName != ScannedNames::none)
+        _names.setFollower(_latestName, name);
+    return name;
+}
+
+XMLScanner::Name& XMLScanner::findNameByBytes(Place at) {
     const Place begin = at;
     while (is(*at, nameByte))
         ++at;

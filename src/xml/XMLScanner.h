@@ -51,6 +51,7 @@ private:
     Place scanAttribute(Place at);
     Place scanEndTag(Place at);
     Place scanText(Place at);
+    Place scanIndent(Place at);
     std::pair<Place, bool> scanBlanks(Place at);
     Place scanMarkup(Place at);
     Place scanCData(Place at);
@@ -60,9 +61,10 @@ private:
     Place scanReference(Place at);
     Place scanCharacterReference(Place at);
     Place scanBeyondASCII(Place at);
-    // These move the place.
+    // Moves the place.
     Name& scanName(Place& at);
-    Name& scanNameByBytes(Place& at);
+    Name& findName(Place at);
+    Name& findNameByBytes(Place at);
 
     void takeMeaning(XMLIndexEntry& entry, const Name& name);
     void takeDeclaration(XMLIndexEntry& entry, const Name& name);
@@ -100,6 +102,7 @@ private:
     XMLIndexEntry* _last = nullptr;
     std::vector<Open> _open;
     ScannedNames _names;
+    Number _latestName = ScannedNames::none;
     std::uint32_t _element = 0; // counts the start tags
     bool _needsWork = false;    // of the value that is being scanned
 };
