@@ -109,8 +109,10 @@ XMLParser::Parsed XMLPieces::parse(const XMLSplitter& before, Found found) {
 
 XMLParser::Parsed XMLPieces::parseUpToCut() {
     const std::size_t cut = _splitter.cut();
-    std::string piece = _opening;
-    piece.append(text().substr(0, cut)).append(_splitter.closing());
+    const std::string closing = _splitter.closing();
+    std::string piece;
+    piece.reserve(_opening.size() + cut + closing.size());
+    piece.append(_opening).append(text().substr(0, cut)).append(closing);
     auto parsed = XMLParser::parsePiece(std::move(piece), _origin, _options);
     removeUpToCut();
     return parsed;
