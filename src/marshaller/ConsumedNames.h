@@ -25,8 +25,6 @@ public:
 
     // Not once the first was taken.
     void add(const String& name) { _added.push_back(name); }
-    // How many were added.
-    std::size_t size() const noexcept { return _added.size(); }
     // Lowers the name's count by one; false where it is none.
     bool take(const String& name) {
         if (_next < _added.size() && _added[_next].isSameAs(name)) {

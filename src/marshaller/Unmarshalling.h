@@ -175,7 +175,6 @@ private:
     }
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
-    static bool hasBoundAllChildren(const ClassPlan& plan, const Target& target);
     // Whether what is left is told from the trace, not from names: of objects that this call makes.
     bool isExact(const ClassPlan* plan) const noexcept {
         return _keepsExactly && plan != nullptr && _frame != nullptr &&

@@ -36,10 +36,8 @@ bool Unmarshalling::validate(const ClassPlan* plan, const Target& target, ErrorS
         _reports.tellTexts(_document, target.source.element(), &target.object);
     if (isExact(plan))
         return validateExactly(target, error);
-    if (_use == Use::document) {
-        const bool allBound = plan != nullptr && hasBoundAllChildren(*plan, target);
-        return (allBound || validateChildren(target, error)) && validateAttributes(target, error);
-    }
+    if (_use == Use::document)
+        return validateChildren(target, error) && validateAttributes(target, error);
     ConsumedNames fields = target.bound.fields;
     ConsumedNames attributes = target.bound.attributes;
     const Target copied{target.object, target.source, {fields, attributes}, target.isFlattened};
@@ -53,12 +51,6 @@ bool Unmarshalling::mayEnd(const ClassPlan& plan, Number element, std::size_t at
         return true;
     locate(error, element, nullptr, &plan);
     return passOver(error);
-}
-
-// Told without a look at the children, which may be many and far away.
-bool Unmarshalling::hasBoundAllChildren(const ClassPlan& plan, const Target& target) {
-    return plan.bindsChildrenOnce && !target.isFlattened && !target.source.isCopy() &&
-           target.bound.fields.size() == target.source.childCount();
 }
 
 // What no field consumed is an error, there.

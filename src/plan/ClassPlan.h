@@ -24,13 +24,10 @@ public:
     // The class that this one extends; null where it extends none or one that is not mapped.
     const ClassPlan* parent = nullptr;
     bool isOnCycle = false; // of `extends`
-    // Whether the class with its ancestors binds no child element to two fields: if the bound count
-    // equals the child count, every child was bound.
-    bool bindsChildrenOnce = false;
 
-    std::optional<UsualForm> usualForm;
+    std::optional<UsualForm> usualForm; // with the ancestors' fields
 
-    // Works out attributeCount, bindsChildrenOnce and usualForm, once the fields and the ancestors are there.
+    // Works out attributeCount and usualForm, once the fields and the ancestors are there.
     void summarise();
 };
 
