@@ -44,7 +44,7 @@ public:
         std::uint32_t usedAt = 0;      // the element that had it last as an attribute
         Number local = none;           // with a prefix: the number of the name behind the colon
         std::uint32_t localUsedAt = 0; // the element that had an attribute of this local name last
-        Number follower; // that came behind it last; itself, where none did or a long one
+        Number follower; // that came behind it last; itself, where none did
         Meaning meaning = Meaning::plain;
     };
 
@@ -74,12 +74,13 @@ public:
     // not. Names mostly follow each other as they did before.
     Name* follower(Number number, const char* at, const char* end) noexcept {
         Name& name = _names[_names[number].follower];
-        return name.bytes.standsAt(at, end, name.size) && !is(at[name.size], nameByte) ? &name
-                                                                                       : nullptr;
+        const bool isThere = name.size <= ShortName::longest &&
+                             name.bytes.standsAt(at, end, name.size) &&
+                             !is(at[name.size], nameByte);
+        return isThere ? &name : nullptr;
     }
     void setFollower(Number number, const Name& name) noexcept {
-        if (name.size <= ShortName::longest)
-            _names[number].follower = name.number;
+        _names[number].follower = name.number;
     }
     // The empty prefix, that of a default namespace.
     Number numberOfNoPrefix() { return find(_text.data() + _text.size(), 0).number; }
