@@ -72,8 +72,8 @@ bool DocumentUpdate::prepare(Ref<Error>* error) {
     const TracedWriting::Size size{_source->written().size(), _source->written().textSize()};
     if (!_after.write(*_marshaller, _object, size, XMLDraft::Values::copied, error))
         return false;
-    const ClassPlan& was = *_source->written()[0].plan;
-    const ClassPlan& is = *_after.trace()[0].plan;
+    const ClassPlan& was = *_source->written().plan(0);
+    const ClassPlan& is = *_after.trace().plan(0);
     if (&was != &is)
         return fail(error, errors::rootOfOtherClass, was.className.string(), is.className.string());
     return true;
@@ -119,21 +119,33 @@ bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit
     if (!update._bytes)
         return false;
     culprit = edits.edits().front().shown;
-    Ref<Error> problem; // of what was written: the edits are to blame
-    const auto again =
-        TracedReading::of(*_marshaller, update._bytes, &problem, WritingTrace::Extent::hash);
-    if (problem && problem->code() == errors::readingCancelled.code) {
-        *error = std::move(problem);
-        return false;
-    }
-    if (!again)
-        return false;
-    const bool isSame = again->hash() == _after.hash() &&
-                        again->written().hiddenHash() == _after.trace().hiddenHash();
-    if (!isSame && (!again->writeAll(*_marshaller, &problem) || !check(*again, update, culprit)))
+    if (!isRight(update, culprit, error))
         return false;
     listEdits(plan, edits, update);
     return true;
+}
+
+// Mostly hashes tell. What a field took and an object keeps, too, is in them, and may be older
+// there than the field's value.
+bool DocumentUpdate::isRight(QXXMLUpdate& update, Shown& culprit, Ref<Error>* error) {
+    using Extent = WritingTrace::Extent;
+    Ref<Error> problem; // of what was written: the edits are to blame
+    const auto read = [&](Extent extent) {
+        auto reading = TracedReading::of(*_marshaller, update._bytes, &problem, extent);
+        if (problem && problem->code() == errors::readingCancelled.code)
+            *error = std::move(problem);
+        return reading;
+    };
+    if (!_writer->hasTaken()) {
+        const auto again = read(Extent::hash);
+        if (!again)
+            return false;
+        if (again->hash() == _after.hash() &&
+            again->written().hiddenHash() == _after.trace().hiddenHash())
+            return true;
+    }
+    const auto again = read(Extent::all);
+    return again && check(*again, update, culprit);
 }
 
 bool DocumentUpdate::check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const {

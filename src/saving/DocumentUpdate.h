@@ -29,6 +29,9 @@ private:
     // Has the smallest objects around what could not be carried written anew next time. False where
     // one has none around it.
     bool writeAnew(const UpdatePlan& plan, Shown culprit);
+    // Whether the update's bytes say, read again, what the object says. False with an error where
+    // that was cancelled.
+    bool isRight(QXXMLUpdate& update, Shown& culprit, Ref<Error>* error);
     // Whether the reading says what the object says.
     bool check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const;
     void listUnshown(const ShownComparison& comparison, QXXMLUpdate& update) const;

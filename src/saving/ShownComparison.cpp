@@ -21,7 +21,8 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
         return wanted;
     if (is.kind == Kind::text)
         return _wanted.text(wanted) == _found.text(found) ? none : wanted;
-    if (is.kind == Kind::object ? is.plan != other.plan : is.field != other.field)
+    if (is.kind == Kind::object ? _wanted.plan(wanted) != _found.plan(found)
+                                : is.field != other.field)
         return wanted;
     if (is.kind == Kind::object && !keepTheSame(wanted, found))
         return wanted;
@@ -48,7 +49,7 @@ std::vector<std::string> ShownComparison::kept(const WritingTrace& trace, Shown 
     std::vector<std::string> texts;
     if (const auto* const list = trace.keptOf(object))
         for (const auto& each : attributes ? list->attributes : list->children)
-            if (!_isDouble(trace[object].plan, each.text))
+            if (!_isDouble(trace.plan(object), each.text))
                 texts.push_back(each.text);
     return texts;
 }

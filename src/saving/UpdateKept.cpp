@@ -27,11 +27,11 @@ void UpdatePlan::compareKept(const Context& context) {
     const WritingTrace::KeptList& was = before != nullptr ? *before : nothing;
     const WritingTrace::KeptList& is = after != nullptr ? *after : nothing;
     if (!areEqual(was.children, is.children)) {
-        countDoubles(*_source.after[context.after].plan, was.children, is.children);
+        countDoubles(*_source.after.plan(context.after), was.children, is.children);
         compareKeptChildren(context, was, is);
     }
     if (!areEqual(was.attributes, is.attributes)) {
-        countDoubles(*_source.after[context.after].plan, was.attributes, is.attributes);
+        countDoubles(*_source.after.plan(context.after), was.attributes, is.attributes);
         compareKeptAttributes(context, was, is);
     }
 }
@@ -73,7 +73,7 @@ std::vector<UpdatePlan::Entry> UpdatePlan::entriesOfKept(const Context& context,
 
 void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
                                      const WritingTrace::KeptList& is) {
-    const ClassPlan* const plan = _source.after[context.after].plan;
+    const ClassPlan* const plan = _source.after.plan(context.after);
     const std::vector<Entry> entries = entriesOfKept(context, was.children);
     const auto itemsOf = [&](const std::vector<Kept>& all) {
         std::vector<ListItem> items;
@@ -127,7 +127,7 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
             known.insert(kept);
         }
         const bool isDouble =
-            _source.writer.isTaken(_source.after[context.after].plan, was.attributes[i].text);
+            _source.writer.isTaken(_source.after.plan(context.after), was.attributes[i].text);
         if (isDouble || (kept != nullptr && kept->text == was.attributes[i].text))
             continue;
         if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
