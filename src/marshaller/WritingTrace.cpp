@@ -65,7 +65,9 @@ String WritingTrace::keyPath(Number number) const {
 }
 
 std::uint64_t WritingTrace::hashOf(const Shown& shown) const noexcept {
-    const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (shown.isList ? 16 : 0);
+    // An empty list shows no more than none.
+    const bool isList = shown.isList && shown.count != 0;
+    const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (isList ? 16 : 0);
     return shown.kind == Kind::object
                ? mixed(mixed(own, reinterpret_cast<std::uintptr_t>(_objects[shown.place].plan)),
                        shown.hash)
@@ -119,9 +121,11 @@ WritingTrace::Shown& WritingTrace::add(Kind kind) {
 namespace {
 
 bool isAttribute(const WritingTrace::Shown& field) {
+    // A field that leaves its kind open has no wrapper.
     const bool mayBe =
-        field.field->kind == BindingKind::attribute || field.field->kind == BindingKind::automatic;
-    return mayBe && field.field->location().isEmpty() && !field.isList;
+        field.field->kind == BindingKind::automatic ||
+        (field.field->kind == BindingKind::attribute && field.field->location().isEmpty());
+    return mayBe && !field.isList;
 }
 
 } // namespace

@@ -25,6 +25,8 @@ void UpdatePlan::compareList(const Context& context, Shown before, Shown after,
     List list;
     list.was = _source.before.shownValues(before);
     list.is = _source.after.shownValues(after);
+    if (list.was.empty() && list.is.empty())
+        return;
     list.plan = _source.after[after].field;
     list.field = after;
     if (!findEntries(context, list))

@@ -7,8 +7,8 @@ namespace qx::detail {
 
 using Form = ReadingTrace::Form;
 
-UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew)
-    : _source(source), _anew(anew) {
+UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept)
+    : _source(source), _anew(anew), _addsKept(addsKept) {
     const auto& uses = source.read.uses();
     const auto fieldOf = [&](std::uint32_t use) { return uses[use].field; };
     // By owner in one pass, then each owner's by field.
