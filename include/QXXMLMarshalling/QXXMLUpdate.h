@@ -48,10 +48,11 @@ public:
     //   -211  "The root is of class: %@, not of class: %@"   (the document's, the object's)
     //   -230  "The document has no place of its own for the new value of: %@"   (the key path): an
     //         attribute's default or an entity brings the value in
-    //   -230  "The document has one place for the new values of: %@ and: %@"   (both key paths): two
+    //   -230  "The document has one place for the new values of: %@ and: %@"   (key paths): two
     //         fields share an attribute, or text is taken as a whole
-    //   -230  "The document cannot be changed to say the new value of: %@, which would be read as: %@"
-    //         (the key path, the text or "nothing"): the mapping writes where it does not read
+    //   -230  "The document cannot be changed to say the new value of: %@, which would be read
+    //         as: %@"   (the key path, the text or "nothing"): the mapping writes the value where
+    //         it does not read it
     //   -230  "The document could not be read with the new value of: %@: %@"   (the key path of the
     //         first edit, the error)
     //   -231  "The document cannot be changed in its encoding: %@"
