@@ -46,9 +46,15 @@ public:
     // The document with the object's changes, in its own encoding. The original has to be one that
     // the marshaller reads. Errors are those of reading it and of writing the object, and
     //   -211  "The root is of class: %@, not of class: %@"   (the document's, the object's)
-    //   -230  "The document cannot be changed to say the new value of: %@"   (the key path): two
-    //         fields share an attribute, an attribute's default or an entity brings the value in,
-    //         or the mapping writes the value where it does not read it
+    //   -230  "The document has no place of its own for the new value of: %@"   (the key path): an
+    //         attribute's default or an entity brings the value in
+    //   -230  "The document has one place for the new values of: %@ and: %@"   (key paths): two
+    //         fields share an attribute, or text is taken as a whole
+    //   -230  "The document cannot be changed to say the new value of: %@, which would be read
+    //         as: %@"   (the key path, the text or "nothing"): the mapping writes the value where
+    //         it does not read it
+    //   -230  "The document could not be read with the new value of: %@: %@"   (the key path of the
+    //         first edit, the error)
     //   -231  "The document cannot be changed in its encoding: %@"
     //   517   "The text cannot be written: %@"
     static qx::Result<QXXMLUpdate> updatedText(QXXMLMarshaller& marshaller, qx::XMLBytes original,
@@ -77,7 +83,8 @@ public:
     // in no other way: comments and unknown XML inside are gone with the old one, layout too.
     const std::vector<qx::String>& writtenAnew() const noexcept { return _writtenAnew; }
     // Values of the object that no XML shows, and that reading would not give: an optional zero
-    // where the document has none, what a text field writes over.
+    // where the document has none, what a text field writes over. Also the text of unknown XML that
+    // an object keeps, not exactly, from an earlier reading, and that a field would take.
     const std::vector<Unshown>& unshown() const noexcept { return _unshown; }
 
 private:

@@ -36,24 +36,31 @@ public:
     std::size_t size() const noexcept { return _size; }
     const T* data() const noexcept { return _data; }
     T* data() noexcept { return _data; }
+    bool empty() const noexcept { return _size == 0; }
+    const T* begin() const noexcept { return _data; }
+    const T* end() const noexcept { return _data + _size; }
     const T& operator[](std::size_t i) const noexcept { return _data[i]; }
     T& operator[](std::size_t i) noexcept { return _data[i]; }
     T& back() noexcept { return _data[_size - 1]; }
+    const T& back() const noexcept { return _data[_size - 1]; }
 
     void push_back(const T& item) {
         if (_size == _capacity)
-            reserve(_size + _size / 2 + 16);
+            moveTo(_size + _size / 2 + 16);
         _data[_size++] = item;
     }
     // What is added is not set.
     void resize(std::size_t size) {
-        if (size > _capacity)
-            reserve(size);
+        reserve(size);
         _size = size;
+    }
+    void reserve(std::size_t capacity) {
+        if (capacity > _capacity)
+            moveTo(capacity);
     }
 
 private:
-    void reserve(std::size_t capacity) {
+    void moveTo(std::size_t capacity) {
         void* const memory =
             capacity <= SIZE_MAX / sizeof(T) ? std::realloc(_data, capacity * sizeof(T)) : nullptr;
         if (memory == nullptr)

@@ -50,7 +50,7 @@ void ReadingTrace::keep(Form form, Number entry) {
 void ReadingTrace::forget(std::size_t uses) {
     _uses.resize(std::min(uses, _uses.size()));
     while (!_owners.empty() && _owners.back().use != none && _owners.back().use >= uses)
-        _owners.pop_back();
+        _owners.resize(_owners.size() - 1);
 }
 
 String ReadingTrace::keyPath(std::uint32_t owner, const FieldPlan* field) const {

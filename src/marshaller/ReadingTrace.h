@@ -15,6 +15,7 @@
 // An entry without a use was dropped. One entry may have several: of two fields, of an object and
 // those that are flattened into it, or of a field and as kept XML too.
 
+#include "base/BulkArray.h"
 #include "plan/ClassPlan.h"
 #include "xml/IndexedXML.h"
 
@@ -58,8 +59,8 @@ public:
     };
 
     // In the order in which they came about. The mapping must outlive them.
-    const std::vector<Use>& uses() const noexcept { return _uses; }
-    const std::vector<Owner>& owners() const noexcept { return _owners; }
+    const BulkArray<Use>& uses() const noexcept { return _uses; }
+    const BulkArray<Owner>& owners() const noexcept { return _owners; }
     // "lines[0].text" for a field of an owner; empty for the root without a field.
     String keyPath(std::uint32_t owner, const FieldPlan* field) const;
 
@@ -79,8 +80,8 @@ public:
     void forget(std::size_t uses);
 
 private:
-    std::vector<Use> _uses;
-    std::vector<Owner> _owners;
+    BulkArray<Use> _uses;
+    BulkArray<Owner> _owners;
     std::vector<std::uint32_t> _open; // the owners whose reading goes on
 };
 

@@ -50,7 +50,8 @@ private:
 class Unmarshalling::Traced {
 public:
     Traced(Unmarshalling& reading, const ClassPlan& plan, Number element, const Object& object)
-        : _trace(reading._trace), _isLasting(reading._isQuiet || reading.isInsideElement(element)) {
+        : _trace(reading._trace),
+          _isLasting(reading._isTraced || reading.isInsideElement(element)) {
         if (_trace != nullptr)
             _trace->enter(plan, element, object);
     }
@@ -325,12 +326,12 @@ Ref<Object> Unmarshalling::read(Number element, ErrorSlot error, ReadingProgress
     return object;
 }
 
-Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
-                         ReadingTrace* trace) {
+namespace {
+
+Ref<Object> readAll(QXXMLMarshaller& marshaller, IndexedXML& document, Unmarshalling& reading,
+                    Ref<Error>* error) {
     ReadingProgress progress(marshaller, document.size());
     ErrorCollector collector(marshaller, error);
-    Unmarshalling reading(marshaller, document);
-    reading.setTrace(trace);
     auto object = reading.read(document.root(), error, progress, collector);
     if (collector.count() != 0) {
         collector.giveTo(error);
@@ -339,6 +340,21 @@ Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<
     }
     // Without a slot a collection leaves out what fails.
     return progress.isCancelled() ? nullptr : object;
+}
+
+} // namespace
+
+Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
+                         ReadingTrace* trace) {
+    Unmarshalling reading(marshaller, document);
+    reading.setTrace(trace);
+    return readAll(marshaller, document, reading, error);
+}
+
+Ref<Object> readQuietly(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error) {
+    Unmarshalling reading(marshaller, document);
+    reading.setQuiet();
+    return readAll(marshaller, document, reading, error);
 }
 
 } // namespace qx::detail

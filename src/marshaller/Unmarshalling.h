@@ -58,9 +58,10 @@ public:
     // From here on it is told what becomes of each entry; it outlives the call. The report handler
     // and the log hear nothing then.
     void setTrace(ReadingTrace* trace) noexcept {
-        _isQuiet = trace != nullptr;
-        _trace = _isQuiet ? trace : _ownTrace.get();
+        _isTraced = _isQuiet = trace != nullptr;
+        _trace = _isTraced ? trace : _ownTrace.get();
     }
+    void setQuiet() noexcept { _isQuiet = true; }
     // In an undo group of its own. Errors that the collector takes leave out what failed.
     Ref<Object> read(Number element, ErrorSlot error, ReadingProgress& progress,
                      ErrorCollector& collector);
@@ -204,6 +205,7 @@ private:
     const Reporting _silent;
     const bool _keepsExactly;
     bool _isQuiet = false;
+    bool _isTraced = false;
     const std::unique_ptr<ReadingTrace> _ownTrace; // of what is kept exactly
     ReadingTrace* _trace = nullptr;
     UsualReading _usual;
@@ -220,5 +222,7 @@ private:
 // A whole document, in one undo group.
 Ref<Object> readDocument(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error,
                          ReadingTrace* trace = nullptr);
+// The same; the report handler and the log hear nothing.
+Ref<Object> readQuietly(QXXMLMarshaller& marshaller, IndexedXML& document, Ref<Error>* error);
 
 } // namespace qx::detail

@@ -64,10 +64,13 @@ String WritingTrace::keyPath(Number number) const {
     return String(path);
 }
 
-std::uint64_t WritingTrace::hashOf(const Shown& shown) noexcept {
-    const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (shown.isList ? 16 : 0);
+std::uint64_t WritingTrace::hashOf(const Shown& shown) const noexcept {
+    // An empty list shows no more than none.
+    const bool isList = shown.isList && shown.count != 0;
+    const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (isList ? 16 : 0);
     return shown.kind == Kind::object
-               ? mixed(mixed(own, reinterpret_cast<std::uintptr_t>(shown.plan)), shown.hash)
+               ? mixed(mixed(own, reinterpret_cast<std::uintptr_t>(_objects[shown.place].plan)),
+                       shown.hash)
                : mixed(own, shown.hash);
 }
 
@@ -101,24 +104,28 @@ std::uint64_t WritingTrace::KeptList::hash() const noexcept {
     return hash;
 }
 
-WritingTrace::Number WritingTrace::add(Shown shown) {
-    shown.around = _open.empty() ? none : _open.back();
-    shown.next = size() + 1;
-    if (shown.around != none && _shown[shown.around].kind == Kind::field)
-        shown.count = _shown[shown.around].count++;
-    if (_extent == Extent::all || shown.kind != Kind::text)
-        _shown.push_back(shown);
-    if (shown.kind == Kind::text)
-        mixInto(shown.around, shown);
-    return shown.next - 1;
+WritingTrace::Shown& WritingTrace::add(Kind kind) {
+    const Number around = _open.empty() ? none : _open.back();
+    std::uint32_t count = 0;
+    if (around != none && _shown[around].kind == Kind::field)
+        count = _shown[around].count++;
+    _shown.push_back({.kind = kind,
+                      .next = size() + 1,
+                      .around = around,
+                      .count = count,
+                      .field = nullptr,
+                      .hash = 0});
+    return _shown.back();
 }
 
 namespace {
 
 bool isAttribute(const WritingTrace::Shown& field) {
+    // A field that leaves its kind open has no wrapper.
     const bool mayBe =
-        field.field->kind == BindingKind::attribute || field.field->kind == BindingKind::automatic;
-    return mayBe && field.field->location().isEmpty() && !field.isList;
+        field.field->kind == BindingKind::automatic ||
+        (field.field->kind == BindingKind::attribute && field.field->location().isEmpty());
+    return mayBe && !field.isList;
 }
 
 } // namespace
@@ -130,22 +137,21 @@ void WritingTrace::noteContent() {
         Shown& shown = _shown[*at];
         if (shown.kind != Kind::object)
             continue;
-        if (shown.hasContent || (element != nullptr && shown.element != element))
+        const XMLDraft::Element* const own = _objects[shown.place].element;
+        if (shown.hasContent || (element != nullptr && own != element))
             return;
-        element = shown.element;
+        element = own;
         shown.hasContent = true;
     }
 }
 
 void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element,
                                const Object& object, ObjectAccess& access) {
-    Shown shown(Kind::object);
-    shown.plan = &plan;
-    shown.element = element;
-    shown.object = object.isa().isStruct() ? nullptr : &object;
-    if (!_open.empty() && _shown[_shown[_open.back()].around].element != element)
+    if (!_open.empty() && placed(_shown[_open.back()].around).element != element)
         noteContent();
-    const Number number = add(shown);
+    add(Kind::object).place = static_cast<std::uint32_t>(_objects.size());
+    _objects.push_back({&plan, element, object.isa().isStruct() ? nullptr : &object});
+    const Number number = size() - 1;
     _open.push_back(number);
     if (!access.mayKeepXML(object))
         return;
@@ -172,14 +178,16 @@ void WritingTrace::leave() {
     shown.hash = hashOf(shown);
     _open.pop_back();
     mixInto(shown.around, shown);
-    if (_extent == Extent::hash)
-        _shown.pop_back();
+    if (_extent == Extent::all)
+        return;
+    if (shown.kind == Kind::object)
+        _objects.resize(shown.place);
+    _shown.resize(size() - 1);
 }
 
 void WritingTrace::enterField(const FieldPlan& field) {
-    Shown shown(Kind::field);
-    shown.field = &field;
-    _open.push_back(add(shown));
+    add(Kind::field).field = &field;
+    _open.push_back(size() - 1);
 }
 
 void WritingTrace::hold(const Value& value) {
@@ -188,21 +196,31 @@ void WritingTrace::hold(const Value& value) {
 }
 
 void WritingTrace::addText(std::string_view text, bool isHidden) {
-    Shown shown(Kind::text);
+    const std::uint64_t hash = mixed(1, hashOfText(text));
+    const Number open = _open.back();
+    if (isHidden) {
+        _hidesSome = true;
+        const auto field = reinterpret_cast<std::uintptr_t>(_shown[open].field);
+        _hiddenHash = mixed(mixed(_hiddenHash, field), hash);
+    } else {
+        _shown[open].hash = mixed(_shown[open].hash, hash);
+        if (!isAttribute(_shown[open]))
+            noteContent();
+    }
+    if (_extent == Extent::hash) {
+        ++_shown[open].count;
+        return;
+    }
+    if (text.size() > UINT32_MAX - _texts.size()) {
+        _isTooLarge = true;
+        text = {};
+    }
+    Shown& shown = add(Kind::text);
     shown.isHidden = isHidden;
-    _hidesSome = _hidesSome || isHidden;
-    shown.begin = _texts.size();
-    shown.size = text.size();
-    shown.hash = mixed(1, hashOfText(text));
-    if (_extent == Extent::all)
-        _texts += text;
-    const Shown& field = _shown[_open.back()];
-    if (isHidden)
-        _hiddenHash =
-            mixed(mixed(_hiddenHash, reinterpret_cast<std::uintptr_t>(field.field)), shown.hash);
-    if (!isHidden && !isAttribute(field))
-        noteContent();
-    add(shown);
+    shown.hash = hash;
+    shown.span = {static_cast<std::uint32_t>(_texts.size()),
+                  static_cast<std::uint32_t>(text.size())};
+    _texts += text;
 }
 
 // Attributes of the element stay.
@@ -210,7 +228,7 @@ void WritingTrace::replaceContent(const XMLDraft::Element* element) {
     auto outermost = _open.rbegin();
     for (auto at = _open.rbegin(); at != _open.rend(); ++at) {
         const Shown& shown = _shown[*at];
-        if (shown.kind == Kind::object && shown.element != element)
+        if (shown.kind == Kind::object && _objects[shown.place].element != element)
             break;
         outermost = shown.kind == Kind::object ? at : outermost;
     }
@@ -227,7 +245,8 @@ void WritingTrace::replaceContent(const XMLDraft::Element* element) {
         Shown& shown = _shown[at];
         const bool isOpen = open != _open.end() && *open == at;
         open += isOpen ? 1 : 0;
-        const bool isFlattened = shown.kind == Kind::object && shown.element == element;
+        const bool isFlattened =
+            shown.kind == Kind::object && _objects[shown.place].element == element;
         if (shown.kind != Kind::field && !isOpen && !isFlattened && !isAttributeValue(at))
             shown.isHidden = _hidesSome = true;
         if (shown.kind == Kind::object && !isOpen && !isFlattened)
@@ -240,9 +259,12 @@ void WritingTrace::forget(Number count) {
     if (count >= size())
         return;
     --_shown[_open.back()].count;
+    for (Number number = size(); number-- > count;)
+        if (_shown[number].kind == Kind::object)
+            _objects.resize(_shown[number].place);
     for (Number number = count; !_kept.empty() && number < size(); ++number)
         _kept.erase(number);
-    _shown.erase(_shown.begin() + count, _shown.end());
+    _shown.resize(count);
 }
 
 } // namespace qx::detail

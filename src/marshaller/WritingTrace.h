@@ -18,6 +18,7 @@
 
 #include <QXXMLMarshalling/xml/XMLNode.h>
 
+#include "base/BulkArray.h"
 #include "marshaller/ObjectAccess.h"
 #include "plan/ClassPlan.h"
 #include "xml/XMLDraft.h"
@@ -38,28 +39,25 @@ public:
     enum class Kind : std::uint8_t { object, field, text };
     // Kept small: a writing shows as many as it goes over values.
     struct Shown {
-        explicit Shown(Kind which) noexcept : kind(which) {}
-
         Kind kind;
         bool isList = false;     // of a field: it holds an array
         bool isHidden = false;   // of a value
         bool hasContent = false; // of an object: more than attributes stands in its element
-        Number next = 0;         // the entry after everything inside
+        Number next;             // the entry after everything inside
         Number around = none;    // the entry that this one stands in
         // Of a value its number in the field; of a field, how many values it has.
         std::uint32_t count = 0;
-        union {
-            const ClassPlan* plan = nullptr; // of an object
-            const FieldPlan* field;          // of a field
-            std::size_t begin;               // of a text
+        struct Span {
+            std::uint32_t begin, size;
         };
         union {
-            XMLDraft::Element* element = nullptr; // that holds an object's fields
-            std::size_t size;                     // of a text
+            const FieldPlan* field; // of a field
+            Span span;              // of a text
+            std::uint32_t place;    // of an object: among all objects
         };
-        const Object* object = nullptr; // null of a plain struct, which may have moved on
-        std::uint64_t hash = 0;         // of all that is shown inside, kept XML included
+        std::uint64_t hash; // of all that is shown inside, kept XML included
     };
+    static_assert(sizeof(Shown) == 32);
     // A node of the unknown XML of an object, and its text.
     struct Kept {
         Ref<XMLNode> node;
@@ -80,12 +78,22 @@ public:
         _texts.reserve(textSize);
     }
     std::size_t textSize() const noexcept { return _texts.size(); }
+    // Whether there was no room for a text: all may have 4 GB, twice what a document may have.
+    bool isTooLarge() const noexcept { return _isTooLarge; }
 
     const Shown& operator[](Number number) const noexcept { return _shown[number]; }
     Number size() const noexcept { return static_cast<Number>(_shown.size()); }
     std::string_view text(Number number) const noexcept {
-        return std::string_view(_texts).substr(_shown[number].begin, _shown[number].size);
+        const Shown::Span span = _shown[number].span;
+        return std::string_view(_texts).substr(span.begin, span.size);
     }
+    // Of an object. The element holds its fields; the object itself is null for a plain struct,
+    // which may have moved on.
+    const ClassPlan* plan(Number object) const noexcept { return placed(object).plan; }
+    const XMLDraft::Element* element(Number object) const noexcept {
+        return placed(object).element;
+    }
+    const Object* object(Number object) const noexcept { return placed(object).object; }
     // Null where the object keeps nothing.
     const KeptList* keptOf(Number object) const;
     // Calls visit(Number) for each object that keeps something, in their order.
@@ -135,12 +143,18 @@ public:
     void forget(Number count);
 
 private:
-    Number add(Shown shown);
+    struct Placed {
+        const ClassPlan* plan;
+        const XMLDraft::Element* element;
+        const Object* object;
+    };
+    const Placed& placed(Number object) const noexcept { return _objects[_shown[object].place]; }
+    Shown& add(Kind kind);
     // Marks that more than attributes stands in the element that is open.
     void noteContent();
     void mixInto(Number around, const Shown& shown);
     // With `hash` of what is inside.
-    static std::uint64_t hashOf(const Shown& shown) noexcept;
+    std::uint64_t hashOf(const Shown& shown) const noexcept;
     void hashAnew();
 
     const bool _keepsUnknown;
@@ -148,9 +162,11 @@ private:
     std::uint64_t _hash = 0;
     std::uint64_t _hiddenHash = 0;
     bool _isHashed = true; // whether the hashes are right
-    std::vector<Shown> _shown;
+    BulkArray<Shown> _shown;
+    BulkArray<Placed> _objects;
     std::vector<Number> _open;
     std::string _texts;
+    bool _isTooLarge = false;
     bool _hidesSome = false;
     std::unordered_map<Number, KeptList> _kept;
 };

@@ -46,7 +46,7 @@ bool Unmarshalling::keepChildren(const Target& target, const Leftovers& left, Er
         if (kept->find(name) == nullptr)
             kept->set(name, make<Array>());
         static_cast<Array*>(kept->find(name)->object())->add(node);
-        if (_isQuiet)
+        if (_isTraced)
             _trace->keep(ReadingTrace::Form::keptChild, child.entry);
     }
     return !kept || _access.setKept(target.object, KeptXML::children, kept, error);
@@ -63,7 +63,7 @@ bool Unmarshalling::keepAttributes(const Target& target, const Leftovers& left, 
         if (!kept)
             kept = make<Array>();
         kept->add(node);
-        if (_isQuiet)
+        if (_isTraced)
             _trace->keep(ReadingTrace::Form::keptAttribute, attribute.entry);
     }
     return !kept || _access.setKept(target.object, KeptXML::attributes, kept, error);

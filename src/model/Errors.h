@@ -99,8 +99,15 @@ inline constexpr ErrorText namespaceOfTwoPrefixes{
     -225, "The namespace: %@ would have two prefixes: %@ and: %@", "Invalid Mapping"};
 inline constexpr ErrorText readingCancelled{-226, "The reading was cancelled",
                                             "The program asked for it."};
-inline constexpr ErrorText changeCannotBeSaved{
-    -230, "The document cannot be changed to say the new value of: %@", invalidValue};
+inline constexpr ErrorText changeHasNoPlace{
+    -230, "The document has no place of its own for the new value of: %@", invalidValue};
+inline constexpr ErrorText changesMeet{
+    -230, "The document has one place for the new values of: %@ and: %@", invalidValue};
+inline constexpr ErrorText changeReadsOtherwise{
+    -230, "The document cannot be changed to say the new value of: %@, which would be read as: %@",
+    invalidValue};
+inline constexpr ErrorText changeCannotBeRead{
+    -230, "The document could not be read with the new value of: %@: %@", invalidValue};
 inline constexpr ErrorText encodingCannotBeKept{
     -231, "The document cannot be changed in its encoding: %@", invalidXML};
 inline constexpr ErrorText fileHasChanged{-232, "The file has changed since it was read: %@",

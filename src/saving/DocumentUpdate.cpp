@@ -27,31 +27,38 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
     if (_source->hash() == _after.hash())
         return unchanged();
     prepareWriter();
-    const UpdateSource source{
-        _source->index(),
-        _source->document(),
-        *_markup,
-        *_layout,
-        _source->read(),
-        _source->written(),
-        _after.trace(),
-        *_writer,
-        _marshaller->isUsingNamespaceURIs() ? NamespaceMatching::keptOf(*_marshaller) : nullptr};
-    Shown firstCulprit = WritingTrace::none;
+    Ref<Error> why;
     for (int attempt = 0; attempt < mostAttempts; ++attempt) {
         QXXMLUpdate update;
-        UpdatePlan plan(source, _anew);
-        Shown culprit = 0;
-        if (carry(plan, update, culprit, &error))
+        UpdatePlan plan(*_basis, _anew);
+        Obstacle obstacle;
+        if (carry(plan, update, obstacle, &error))
             return update;
         if (error)
             return error;
-        firstCulprit = attempt == 0 ? culprit : firstCulprit;
-        if (!writeAnew(plan, culprit))
+        if (carryLess(plan, update, &error))
+            return update;
+        if (error)
+            return error;
+        why = attempt == 0 ? std::move(obstacle.why) : why;
+        if (!writeAnew(plan, obstacle.shown))
             break;
     }
-    fail(&error, errors::changeCannotBeSaved, _after.trace().keyPath(firstCulprit));
-    return error;
+    return why;
+}
+
+// What is kept exactly is nothing that a field took, so what is new there was added on purpose.
+bool DocumentUpdate::carryLess(const UpdatePlan& plan, QXXMLUpdate& update, Ref<Error>* error) {
+    if (plan.newKept().empty() || _marshaller->keepsExactly())
+        return false;
+    update = {};
+    UpdatePlan less(*_basis, _anew, false);
+    Obstacle obstacle;
+    if (!carry(less, update, obstacle, error))
+        return false;
+    for (const auto& [object, text] : less.newKept())
+        update._unshown.push_back({_after.trace().keyPath(object), String(text)});
+    return true;
 }
 
 // All that could not be carried at once: each attempt takes a reading.
@@ -72,8 +79,8 @@ bool DocumentUpdate::prepare(Ref<Error>* error) {
     const TracedWriting::Size size{_source->written().size(), _source->written().textSize()};
     if (!_after.write(*_marshaller, _object, size, XMLDraft::Values::copied, error))
         return false;
-    const ClassPlan& was = *_source->written()[0].plan;
-    const ClassPlan& is = *_after.trace()[0].plan;
+    const ClassPlan& was = *_source->written().plan(0);
+    const ClassPlan& is = *_after.trace().plan(0);
     if (&was != &is)
         return fail(error, errors::rootOfOtherClass, was.className.string(), is.className.string());
     return true;
@@ -93,67 +100,100 @@ void DocumentUpdate::prepareWriter() {
     _writer = std::make_unique<NewXML>(*_layout, _after.trace(), _encoding->encoder());
     _source->forEachDouble(
         [&](const ClassPlan* plan, const std::string& text) { _writer->countAsTaken(plan, text); });
+    _basis = std::make_unique<UpdateSource>(UpdateSource{
+        _source->index(), _source->document(), *_markup, *_layout, _source->read(),
+        _source->written(), _after.trace(), *_writer,
+        _marshaller->isUsingNamespaceURIs() ? NamespaceMatching::keptOf(*_marshaller) : nullptr});
 }
 
-bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit,
+String DocumentUpdate::nameOf(Shown shown) const {
+    const String path = _after.trace().keyPath(shown);
+    return !path.isEmpty() ? path : _after.trace().plan(0)->className.string();
+}
+
+bool DocumentUpdate::carry(UpdatePlan& plan, QXXMLUpdate& update, Obstacle& obstacle,
                            Ref<Error>* error) {
     try {
         plan.run();
     } catch (const Exception& exception) {
         return fail(error, errors::textCannotBeWritten, exception.reason());
     }
-    EditList& edits = plan.edits();
-    const SourceEdit* const clash = edits.arrange();
-    if (clash != nullptr || !plan.failures().empty()) {
-        culprit = clash != nullptr ? clash->shown : plan.failures().front();
+    if (!arrange(plan, obstacle))
         return false;
-    }
     plan.joinRemovals();
+    const EditList& edits = plan.edits();
     if (edits.isEmpty()) {
         update._bytes = _original;
-        return check(*_source, update, culprit);
+        return check(*_source, plan, update, obstacle);
     }
     const std::string_view text = _markup->text();
     const auto size = static_cast<EditList::Offset>(text.size());
     update._bytes = _encoding->encoded(edits.applied(text, 0, size), text, error);
-    if (!update._bytes)
-        return false;
-    culprit = edits.edits().front().shown;
-    Ref<Error> problem; // of what was written: the edits are to blame
-    const auto again =
-        TracedReading::of(*_marshaller, update._bytes, &problem, WritingTrace::Extent::hash);
-    if (problem && problem->code() == errors::readingCancelled.code) {
-        *error = std::move(problem);
-        return false;
-    }
-    if (!again)
-        return false;
-    const bool isSame = again->hash() == _after.hash() &&
-                        again->written().hiddenHash() == _after.trace().hiddenHash();
-    if (!isSame && (!again->writeAll(*_marshaller, &problem) || !check(*again, update, culprit)))
+    if (!update._bytes || !isRight(plan, update, obstacle, error))
         return false;
     listEdits(plan, edits, update);
     return true;
 }
 
-bool DocumentUpdate::check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const {
-    if (reading.index().entries().empty() || reading.written().size() == 0)
-        return false;
+bool DocumentUpdate::arrange(UpdatePlan& plan, Obstacle& obstacle) const {
+    const SourceEdit* const clash = plan.edits().arrange();
+    if (clash != nullptr) {
+        obstacle.shown = clash->shown;
+        return fail(&obstacle.why, errors::changesMeet, clash->keyPath, (clash + 1)->keyPath);
+    }
+    if (plan.failures().empty())
+        return true;
+    obstacle.shown = plan.failures().front();
+    return fail(&obstacle.why, errors::changeHasNoPlace, nameOf(obstacle.shown));
+}
+
+// Mostly hashes tell. What a field took and an object keeps, too, is in them, and may be older
+// there than the field's value.
+bool DocumentUpdate::isRight(const UpdatePlan& plan, QXXMLUpdate& update, Obstacle& obstacle,
+                             Ref<Error>* error) {
+    using Extent = WritingTrace::Extent;
+    const auto read = [&](Extent extent) {
+        Ref<Error> problem;
+        auto reading = TracedReading::of(*_marshaller, update._bytes, &problem, extent);
+        if (problem && problem->code() == errors::readingCancelled.code)
+            *error = std::move(problem);
+        else if (!reading) { // the edits are to blame
+            obstacle.shown = plan.edits().edits().front().shown;
+            fail(&obstacle.why, errors::changeCannotBeRead, nameOf(obstacle.shown),
+                 problem->localizedDescription());
+        }
+        return reading;
+    };
+    if (!_writer->hasTaken()) {
+        const auto again = read(Extent::hash);
+        if (!again)
+            return false;
+        if (again->hash() == _after.hash() &&
+            again->written().hiddenHash() == _after.trace().hiddenHash())
+            return true;
+    }
+    const auto again = read(Extent::all);
+    return again && check(*again, plan, update, obstacle);
+}
+
+bool DocumentUpdate::check(TracedReading& reading, const UpdatePlan& plan, QXXMLUpdate& update,
+                           Obstacle& obstacle) const {
     std::unordered_set<std::string> doubles;
-    const auto keyOf = [](const ClassPlan* plan, const std::string& text) {
-        return std::to_string(plan->index) + " " + text;
+    const auto keyOf = [](const ClassPlan* of, const std::string& text) {
+        return std::to_string(of->index) + " " + text;
     };
     reading.forEachDouble(
-        [&](const ClassPlan* plan, const std::string& text) { doubles.insert(keyOf(plan, text)); });
+        [&](const ClassPlan* of, const std::string& text) { doubles.insert(keyOf(of, text)); });
     ShownComparison comparison(
-        _after.trace(), reading.written(), [&](const ClassPlan* plan, const std::string& text) {
-            return _writer->isTaken(plan, text) || doubles.contains(keyOf(plan, text));
-        });
-    const Shown different = comparison.firstDifference();
-    if (different != WritingTrace::none) {
-        culprit = different;
-        return false;
-    }
+        _after.trace(), reading.written(),
+        [&](const ClassPlan* of, const std::string& text) {
+            return _writer->isTaken(of, text) || doubles.contains(keyOf(of, text));
+        },
+        plan.addsKept() ? UpdatePlan::NewKept() : plan.newKept());
+    obstacle.shown = comparison.firstDifference();
+    if (obstacle.shown != WritingTrace::none)
+        return fail(&obstacle.why, errors::changeReadsOtherwise, nameOf(obstacle.shown),
+                    comparison.foundInstead());
     listUnshown(comparison, update);
     return true;
 }

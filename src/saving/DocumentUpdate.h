@@ -24,13 +24,28 @@ private:
     bool prepare(Ref<Error>* error);
     void prepareWriter();
     QXXMLUpdate unchanged() const;
-    // Carries out the plan. False with an error, or with the object or field in the way.
-    bool carry(UpdatePlan& plan, QXXMLUpdate& update, Shown& culprit, Ref<Error>* error);
+    // The object or field in the way of a change, and an error that says why.
+    struct Obstacle {
+        Shown shown = 0;
+        Ref<Error> why;
+    };
+    // Carries out the plan. False with an error, or with an obstacle.
+    bool carry(UpdatePlan& plan, QXXMLUpdate& update, Obstacle& obstacle, Ref<Error>* error);
+    // The same without the unknown XML that the plan adds, if it does.
+    bool carryLess(const UpdatePlan& plan, QXXMLUpdate& update, Ref<Error>* error);
+    bool arrange(UpdatePlan& plan, Obstacle& obstacle) const;
     // Has the smallest objects around what could not be carried written anew next time. False where
     // one has none around it.
     bool writeAnew(const UpdatePlan& plan, Shown culprit);
+    // Whether the update's bytes say, read again, what the object says. False with an error where
+    // that was cancelled.
+    bool isRight(const UpdatePlan& plan, QXXMLUpdate& update, Obstacle& obstacle,
+                 Ref<Error>* error);
     // Whether the reading says what the object says.
-    bool check(TracedReading& reading, QXXMLUpdate& update, Shown& culprit) const;
+    bool check(TracedReading& reading, const UpdatePlan& plan, QXXMLUpdate& update,
+               Obstacle& obstacle) const;
+    // The key path; of the root its class.
+    String nameOf(Shown shown) const;
     void listUnshown(const ShownComparison& comparison, QXXMLUpdate& update) const;
     void listEdits(const UpdatePlan& plan, const EditList& edits, QXXMLUpdate& update) const;
 
@@ -43,6 +58,7 @@ private:
     std::unique_ptr<SourceMarkup> _markup;
     std::unique_ptr<SourceLayout> _layout;
     std::unique_ptr<NewXML> _writer;
+    std::unique_ptr<UpdateSource> _basis; // of all plans
     std::set<Shown> _anew;
 };
 

@@ -19,7 +19,11 @@ const SourceEdit* EditList::arrange() {
 }
 
 std::string EditList::applied(std::string_view text, Offset begin, Offset end) const {
+    std::size_t size = end - begin;
+    for (const SourceEdit& edit : _edits)
+        size += edit.text.size();
     std::string result;
+    result.reserve(size);
     for (const SourceEdit& edit : _edits) {
         result += text.substr(begin, edit.begin - begin);
         result += edit.text;

@@ -27,8 +27,8 @@ public:
     bool isEmpty() const noexcept { return _edits.empty(); }
     const std::vector<SourceEdit>& edits() const noexcept { return _edits; }
     std::vector<SourceEdit>& edits() noexcept { return _edits; }
-    // Brings them into the order of the text. The key path of one that meets another, where they
-    // are not the same; null where all can be carried out.
+    // Brings them into the order of the text. One that meets the next, where they are not the
+    // same; null where all can be carried out.
     const SourceEdit* arrange();
     // That part of the text with the edits, which are arranged.
     std::string applied(std::string_view text, Offset begin, Offset end) const;

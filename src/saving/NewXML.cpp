@@ -10,7 +10,7 @@ namespace qx::detail {
 NewXML::NewXML(const SourceLayout& layout, const WritingTrace& shown, TextEncoder* encoder)
     : _layout(layout), _shown(shown), _encoder(encoder) {
     shown.forEachKeeping(
-        [&](WritingTrace::Number at) { _objects[shown[at].element].push_back(at); });
+        [&](WritingTrace::Number at) { _objects[shown.element(at)].push_back(at); });
 }
 
 std::string NewXML::escaped(std::string_view value, std::string_view special, char quote) const {
@@ -193,7 +193,7 @@ void NewXML::appendAttributes(const XMLDraft::Element& element, const Around& ar
         return;
     for (const WritingTrace::Number object : objects->second)
         for (const auto& kept : _shown.keptOf(object)->attributes)
-            if (!isTaken(_shown[object].plan, kept.text) &&
+            if (!isTaken(_shown.plan(object), kept.text) &&
                 names.insert(kept.node->name().str()).second)
                 output += attribute(kept.node->name().view(), kept.node->stringValue().view());
 }
@@ -221,7 +221,7 @@ bool NewXML::appendContent(const XMLDraft::Element& element, const Around& aroun
         return isOnLines;
     for (const WritingTrace::Number object : objects->second)
         for (const auto& kept : _shown.keptOf(object)->children)
-            if (!isTaken(_shown[object].plan, kept.text)) {
+            if (!isTaken(_shown.plan(object), kept.text)) {
                 startLine();
                 output += markup(kept.text);
             }

@@ -64,8 +64,9 @@ public:
     void countAsTaken(const ClassPlan* plan, const std::string& text) {
         _taken.insert(keyOf(plan, text));
     }
+    bool hasTaken() const noexcept { return !_taken.empty(); }
     bool isTaken(const ClassPlan* plan, const std::string& text) const {
-        return !_taken.empty() && _taken.contains(keyOf(plan, text));
+        return hasTaken() && _taken.contains(keyOf(plan, text));
     }
 
 private:

@@ -18,13 +18,20 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
     if (is.hash == other.hash)
         return none;
     if (is.kind != other.kind)
-        return wanted;
+        return differs(wanted, found);
     if (is.kind == Kind::text)
-        return _wanted.text(wanted) == _found.text(found) ? none : wanted;
-    if (is.kind == Kind::object ? is.plan != other.plan : is.field != other.field)
-        return wanted;
-    if (is.kind == Kind::object && !keepTheSame(wanted, found))
-        return wanted;
+        return _wanted.text(wanted) == _found.text(found) ? none : differs(wanted, found);
+    if (is.kind == Kind::object ? _wanted.plan(wanted) != _found.plan(found)
+                                : is.field != other.field)
+        return differs(wanted, found);
+    if (const Shown different = compareInside(wanted, found); different != none)
+        return different;
+    return is.kind == Kind::field || keepTheSame(wanted, found) ? none : differs(wanted, found);
+}
+
+ShownComparison::Shown ShownComparison::compareInside(Shown wanted, Shown found) {
+    const auto& is = _wanted[wanted];
+    const auto& other = _found[found];
     const bool isOfOtherForm = is.kind == Kind::field && is.isList != other.isList;
     Shown a = wanted + 1, b = found + 1;
     while (true) {
@@ -33,9 +40,9 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
         while (b < other.next && _found[b].isHidden)
             b = _found[b].next;
         if (a >= is.next || b >= other.next)
-            return a >= is.next && b >= other.next ? none : wanted;
+            return a >= is.next && b >= other.next ? none : differs(wanted, found);
         if (isOfOtherForm)
-            return wanted;
+            return differs(wanted, found);
         if (const Shown different = compare(a, b); different != none)
             return different;
         a = _wanted[a].next;
@@ -43,12 +50,28 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
     }
 }
 
+String ShownComparison::foundInstead() const {
+    if (_different == none)
+        return "nothing";
+    Shown value = _different;
+    if (_found[value].kind == Kind::field) {
+        const auto values = _found.shownValues(value);
+        if (values.empty())
+            return "nothing";
+        value = values.front();
+    }
+    if (_found[value].kind == Kind::text)
+        return String(_found.text(value));
+    return value == _different ? "an object that keeps other unknown XML" : "another object";
+}
+
 std::vector<std::string> ShownComparison::kept(const WritingTrace& trace, Shown object,
                                                bool attributes) const {
     std::vector<std::string> texts;
     if (const auto* const list = trace.keptOf(object))
         for (const auto& each : attributes ? list->attributes : list->children)
-            if (!_isDouble(trace[object].plan, each.text))
+            if (!_isDouble(trace.plan(object), each.text) &&
+                (&trace != &_wanted || !_leftOut.contains({object, each.text})))
                 texts.push_back(each.text);
     return texts;
 }

@@ -6,6 +6,7 @@
 #include "marshaller/WritingTrace.h"
 
 #include <functional>
+#include <set>
 
 namespace qx::detail {
 
@@ -13,26 +14,38 @@ class ShownComparison {
 public:
     using Shown = WritingTrace::Number;
     using IsDouble = std::function<bool(const ClassPlan*, const std::string&)>;
+    using LeftOut = std::vector<std::pair<Shown, std::string>>;
     static constexpr Shown none = WritingTrace::none;
 
     ShownComparison(const WritingTrace& wanted, const WritingTrace& found,
-                    IsDouble isDouble = nullptr)
-        : _wanted(wanted), _found(found), _isDouble(std::move(isDouble)) {}
+                    IsDouble isDouble = nullptr, const LeftOut& leftOut = {})
+        : _wanted(wanted), _found(found), _isDouble(std::move(isDouble)),
+          _leftOut(leftOut.begin(), leftOut.end()) {}
 
     // The first object or field of the wanted ones that is another in the found ones; none where
     // all are the same.
     Shown firstDifference();
+    // What is found there, in words: a text, "nothing", or what object.
+    String foundInstead() const;
     // Calls visit(value) for each value of the wanted ones that is hidden, and another there.
     void forEachUnshown(const std::function<void(Shown)>& visit) const;
 
 private:
     Shown compare(Shown wanted, Shown found);
+    Shown compareInside(Shown wanted, Shown found);
+    Shown differs(Shown wanted, Shown found) {
+        _different = found;
+        return wanted;
+    }
     bool keepTheSame(Shown wanted, Shown found) const;
     std::vector<std::string> kept(const WritingTrace& trace, Shown object, bool attributes) const;
 
     const WritingTrace& _wanted;
     const WritingTrace& _found;
+    Shown _different = none; // of the found ones
     const IsDouble _isDouble;
+    // What the wanted ones keep and count as nothing: objects and texts.
+    const std::set<std::pair<Shown, std::string>> _leftOut;
 };
 
 } // namespace qx::detail

@@ -21,19 +21,22 @@ SourceLayout::SourceLayout(const XMLIndex& index, const SourceMarkup& markup)
     bool hasQuote = false, hasEmpty = false;
     Number root = UINT32_MAX;
     for (Number at = 0; at < index.entries().size() && !(hasQuote && hasEmpty); ++at) {
-        const SourceMarkup::Spot& spot = markup[at];
         const XMLNodeKind kind = index[at].nodeKind();
-        if (kind == XMLNodeKind::element && root == UINT32_MAX)
+        const bool isElement = kind == XMLNodeKind::element;
+        if (isElement && root == UINT32_MAX)
             root = at;
+        const bool mayShow = isElement ? !hasEmpty && index.firstChild(at) == index.contentEnd(at)
+                                       : !hasQuote && kind == XMLNodeKind::attribute;
+        const SourceMarkup::Spot spot = mayShow ? markup[at] : SourceMarkup::Spot();
         if (!spot.isPlaced())
             continue;
-        if (kind == XMLNodeKind::element && spot.insideBegin == spot.insideEnd && !hasEmpty) {
+        if (isElement && spot.insideBegin == spot.insideEnd) {
             hasEmpty = true;
             if (!spot.isEmptyTag())
                 _emptyTag = {};
             else if (isBlank(text[spot.end - 3]))
                 _emptyTag = " />";
-        } else if (!hasQuote && kind == XMLNodeKind::attribute) {
+        } else if (!isElement) {
             hasQuote = true;
             _quote = text[spot.end - 1];
         }

@@ -11,6 +11,7 @@ namespace qx::detail {
 
 namespace {
 
+constexpr std::string_view blanks = " \t\r\n";
 constexpr std::size_t npos = std::string_view::npos;
 constexpr auto endsName = [] {
     std::array<bool, 256> ends{};
@@ -45,15 +46,54 @@ std::size_t behindDoctype(std::string_view text, std::size_t at) {
     return at;
 }
 
+SourceMarkup::Number rootOf(const XMLIndex& index) {
+    SourceMarkup::Number at = 0;
+    while (at < index.entries().size() && index[at].nodeKind() != XMLNodeKind::element)
+        at = index.siblingOf(at);
+    return at;
+}
+
 } // namespace
 
 SourceMarkup::SourceMarkup(const XMLIndex& index)
-    : _index(index), _spots(index.entries().size()), _parents(_spots.size(), none) {
+    : _index(index), _parents(index.entries().size(), none) {
     findParents();
+    const Number root = rootOf(index);
+    // The C parser tells where an element begins, and no more.
+    _isScanned = root < _parents.size() && index[root].begin < index[root].end;
+    if (_isScanned)
+        return;
+    _spots.resize(_parents.size());
     tokenise();
     place();
     _tokens = {};
     _attributes = {};
+}
+
+SourceMarkup::Spot SourceMarkup::scannedSpot(Number entry) const noexcept {
+    const XMLIndexEntry& found = _index[entry];
+    if (found.nodeKind() == XMLNodeKind::element)
+        return scannedElement(entry);
+    if (!found.isAttributeOrNamespace())
+        return {found.begin, found.end, found.begin, found.end};
+    // From the opening quote back over "=" to the name.
+    const std::size_t equals = text().rfind('=', found.begin - 2);
+    const std::size_t last = text().find_last_not_of(blanks, equals - 1);
+    const std::size_t name = text().find_last_of(blanks, last) + 1;
+    return {static_cast<Offset>(name), found.end + 1, found.begin, found.end};
+}
+
+SourceMarkup::Spot SourceMarkup::scannedElement(Number element) const noexcept {
+    const XMLIndexEntry& found = _index[element];
+    const Number child = _index.firstChild(element);
+    const std::size_t named = child != _index.content(element)
+                                  ? _index[child - 1].end + 1
+                                  : found.begin + 1 + _index.name(found).size();
+    const std::size_t tagEnd = text().find_first_not_of(blanks, named);
+    if (text()[tagEnd] == '/')
+        return {found.begin, found.end, found.end, found.end};
+    return {found.begin, found.end, static_cast<Offset>(tagEnd + 1),
+            static_cast<Offset>(text().rfind('<', found.end - 1))};
 }
 
 void SourceMarkup::findParents() {
@@ -106,7 +146,7 @@ std::size_t SourceMarkup::startTag(std::size_t at) {
     token.attributes = static_cast<std::uint32_t>(_attributes.size());
     std::size_t next = at + 1 + nameAt(at + 1).size();
     while (next < text().size()) {
-        next = text().find_first_not_of(" \t\r\n", next);
+        next = text().find_first_not_of(blanks, next);
         if (text()[next] == '>' || text()[next] == '/')
             break;
         const std::string_view name = nameAt(next);
@@ -158,12 +198,8 @@ void SourceMarkup::tokenise() {
 }
 
 void SourceMarkup::place() {
-    if (_spots.empty())
-        return;
-    Number root = 0;
-    while (root < _spots.size() && _index[root].nodeKind() != XMLNodeKind::element)
-        root = _index.siblingOf(root);
-    if (root == _spots.size())
+    const Number root = rootOf(_index);
+    if (root >= _spots.size())
         return;
     _pairs.emplace_back(root, 0);
     while (!_pairs.empty()) {

@@ -8,9 +8,11 @@
 //                                   text             9            9         11   11
 //                                   element b       11           15         15   15
 //
-// An index that the C parser filled does not tell that. So the text, which is known to be well
-// formed, is gone over once and laid beside the index. What an entity or an attribute's default
-// brought in has no place; nor has anything inside an element of which a child came in so.
+// An index that the scanner filled has most of that, and its entries are all the text's own: a spot
+// is worked out when somebody asks. One that the C parser filled does not tell it. So the text,
+// which is known to be well formed, is gone over once and laid beside the index. What an entity or
+// an attribute's default brought in has no place; nor has anything inside an element of which a
+// child came in so.
 
 #include "xml/XMLIndex.h"
 
@@ -36,11 +38,14 @@ public:
     explicit SourceMarkup(const XMLIndex& index);
 
     std::string_view text() const noexcept { return _index.text(); }
-    const Spot& operator[](Number entry) const noexcept { return _spots[entry]; }
+    Spot operator[](Number entry) const noexcept {
+        return _isScanned ? scannedSpot(entry) : _spots[entry];
+    }
     // The element that an entry stands in; none of the root.
     Number parent(Number entry) const noexcept { return _parents[entry]; }
     std::string_view raw(Number entry) const noexcept {
-        return text().substr(_spots[entry].begin, _spots[entry].size());
+        const Spot spot = (*this)[entry];
+        return text().substr(spot.begin, spot.size());
     }
 
 private:
@@ -56,6 +61,8 @@ private:
         std::string_view name;
     };
 
+    Spot scannedSpot(Number entry) const noexcept;
+    Spot scannedElement(Number element) const noexcept;
     void findParents();
     void tokenise();
     std::size_t skipProlog() const;
@@ -67,7 +74,8 @@ private:
     void placeChildren(Number element, std::uint32_t token);
 
     const XMLIndex& _index;
-    std::vector<Spot> _spots;
+    bool _isScanned = false;
+    std::vector<Spot> _spots; // of an index that the C parser filled
     std::vector<Number> _parents;
     std::vector<Token> _tokens;
     std::vector<Attribute> _attributes;

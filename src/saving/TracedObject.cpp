@@ -15,6 +15,8 @@ bool TracedWriting::write(const QXXMLMarshaller& marshaller, const Value& object
     _draft = std::make_unique<XMLDraft>(values);
     if (!Marshalling(marshaller, *_draft, _trace).marshallObject(object, error))
         return false;
+    if (_trace.isTooLarge())
+        return fail(error, errors::textCannotBeWritten, "all values take more than 4 GB");
     _trace.hash();
     return true;
 }
@@ -27,34 +29,32 @@ std::unique_ptr<TracedReading> TracedReading::of(QXXMLMarshaller& marshaller, Re
         return nullptr;
     traced->_document = std::make_unique<IndexedXML>(*traced->_parsed);
     IndexedXML& document = *traced->_document;
-    traced->_read.reserve(traced->index().entries().size());
+    const bool isAll = extent == WritingTrace::Extent::all;
+    ReadingTrace& trace = traced->_read;
+    if (isAll)
+        trace.reserve(traced->index().entries().size());
     Ref<Error> problem;
+    Ref<Object> object;
     {
         const NoUndo noUndo(marshaller.undoManager());
-        traced->_object = readDocument(marshaller, document, &problem, &traced->_read);
+        object = isAll ? readDocument(marshaller, document, &problem, &trace)
+                       : readQuietly(marshaller, document, &problem);
     }
-    if (!traced->_object && !problem)
+    if (!object && !problem)
         fail(&problem, errors::noDefinitionForElement,
              [&] { return document.quoted(document.root()); });
-    if (!problem && traced->write(marshaller, extent, &problem))
+    // Mostly a field and a value for each use.
+    TracedWriting::Size size{};
+    if (isAll)
+        size = {2 * trace.uses().size() + 1, traced->index().text().size() / 2};
+    traced->_written = std::make_unique<TracedWriting>(marshaller, extent);
+    if (!problem &&
+        traced->_written->write(marshaller, object, size, XMLDraft::Values::dropped, &problem)) {
+        traced->_written->keepTraceOnly();
         return traced;
+    }
     *error = std::move(problem);
     return nullptr;
-}
-
-bool TracedReading::write(const QXXMLMarshaller& marshaller, WritingTrace::Extent extent,
-                          Ref<Error>* error) {
-    const bool isAll = extent == WritingTrace::Extent::all;
-    // Mostly a field and a value for each use.
-    const TracedWriting::Size size{isAll ? 2 * _read.uses().size() + 1 : 0,
-                                   isAll ? index().text().size() / 2 : 0};
-    _written = std::make_unique<TracedWriting>(marshaller, extent);
-    if (!_written->write(marshaller, _object, size, XMLDraft::Values::dropped, error))
-        return false;
-    _written->keepTraceOnly();
-    if (isAll)
-        _object.reset();
-    return true;
 }
 
 // The elements that stand around what was taken, too.

@@ -47,14 +47,11 @@ private:
 // A text, what was read from it, and what writing makes of that.
 class TracedReading {
 public:
-    // Null with an error of reading or of writing. With nothing but a hash of what is written, the
-    // rest may come later.
+    // Null with an error of reading or of writing. Where a hash of what is written is enough,
+    // nothing else is traced.
     static std::unique_ptr<TracedReading>
     of(QXXMLMarshaller& marshaller, Ref<const Data> bytes, Ref<Error>* error,
        WritingTrace::Extent extent = WritingTrace::Extent::all);
-    bool writeAll(const QXXMLMarshaller& marshaller, Ref<Error>* error) {
-        return write(marshaller, WritingTrace::Extent::all, error);
-    }
 
     const XMLIndex& index() const noexcept { return _parsed->index(); }
     IndexedXML& document() noexcept { return *_document; }
@@ -69,13 +66,11 @@ public:
 private:
     TracedReading() = default;
 
-    bool write(const QXXMLMarshaller& marshaller, WritingTrace::Extent extent, Ref<Error>* error);
     std::vector<bool> takenEntries() const;
 
     XMLParser::Parsed _parsed;
     std::unique_ptr<IndexedXML> _document;
     ReadingTrace _read;
-    Ref<Object> _object; // until all of it is written
     std::unique_ptr<TracedWriting> _written;
 };
 

@@ -27,17 +27,18 @@ void UpdatePlan::compareKept(const Context& context) {
     const WritingTrace::KeptList& was = before != nullptr ? *before : nothing;
     const WritingTrace::KeptList& is = after != nullptr ? *after : nothing;
     if (!areEqual(was.children, is.children)) {
-        countDoubles(*_source.after[context.after].plan, was.children, is.children);
+        countDoubles(*_source.after.plan(context.after), was.children, is.children);
         compareKeptChildren(context, was, is);
     }
     if (!areEqual(was.attributes, is.attributes)) {
-        countDoubles(*_source.after[context.after].plan, was.attributes, is.attributes);
+        countDoubles(*_source.after.plan(context.after), was.attributes, is.attributes);
         compareKeptAttributes(context, was, is);
     }
 }
 
-// What a field took, too, is as old in the object as the object's reading. Where there are as many
-// of its name in both, it stands in the same place.
+// What a field took, too, is as old in the object as the object's reading. Where fields took all of
+// a name, they would again; where there are as many of its name in both, it stands in the same
+// place.
 void UpdatePlan::countDoubles(const ClassPlan& plan, const std::vector<Kept>& was,
                               const std::vector<Kept>& is) {
     std::unordered_map<String, std::vector<const Kept*>> before, now;
@@ -46,11 +47,21 @@ void UpdatePlan::countDoubles(const ClassPlan& plan, const std::vector<Kept>& wa
     for (const Kept& each : is)
         now[each.node->name()].push_back(&each);
     for (const auto& [name, named] : before) {
+        const auto isTaken = [&](const Kept* kept) {
+            return _source.writer.isTaken(&plan, kept->text);
+        };
         const auto& same = now[name];
-        for (std::size_t i = 0; i < named.size() && same.size() == named.size(); ++i)
-            if (_source.writer.isTaken(&plan, named[i]->text))
+        const bool areAllTaken = std::ranges::all_of(named, isTaken);
+        const bool areAsMany = same.size() == named.size();
+        for (std::size_t i = 0; i < same.size(); ++i)
+            if (areAllTaken || (areAsMany && isTaken(named[i])))
                 _source.writer.countAsTaken(&plan, same[i]->text);
     }
+}
+
+bool UpdatePlan::mayAddKept(Shown object, const std::string& text) {
+    _newKept.emplace_back(object, text);
+    return _addsKept;
 }
 
 // The object lists them by name, each name's in the order of the document.
@@ -73,7 +84,7 @@ std::vector<UpdatePlan::Entry> UpdatePlan::entriesOfKept(const Context& context,
 
 void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
                                      const WritingTrace::KeptList& is) {
-    const ClassPlan* const plan = _source.after[context.after].plan;
+    const ClassPlan* const plan = _source.after.plan(context.after);
     const std::vector<Entry> entries = entriesOfKept(context, was.children);
     const auto itemsOf = [&](const std::vector<Kept>& all) {
         std::vector<ListItem> items;
@@ -89,7 +100,7 @@ void UpdatePlan::compareKeptChildren(const Context& context, const WritingTrace:
         const std::string& text = is.children[i].text;
         const std::size_t before = matching.was[i];
         if (before == ListMatching::none) {
-            if (!_source.writer.isTaken(plan, text))
+            if (!_source.writer.isTaken(plan, text) && mayAddKept(context.after, text))
                 insertChild(_source.writer.markup(text), end, context.after);
             continue;
         }
@@ -127,7 +138,7 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
             known.insert(kept);
         }
         const bool isDouble =
-            _source.writer.isTaken(_source.after[context.after].plan, was.attributes[i].text);
+            _source.writer.isTaken(_source.after.plan(context.after), was.attributes[i].text);
         if (isDouble || (kept != nullptr && kept->text == was.attributes[i].text))
             continue;
         if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
@@ -150,7 +161,7 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
         tag.begin + 1 +
         static_cast<SourceMarkup::Offset>(_source.document.writtenName(context.entry).size());
     for (const Kept& each : is.attributes)
-        if (!known.contains(&each))
+        if (!known.contains(&each) && mayAddKept(context.after, each.text))
             add(nameEnd, nameEnd,
                 _source.writer.attribute(each.node->name().view(), each.node->stringValue().view()),
                 context.after);

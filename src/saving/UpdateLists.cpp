@@ -25,6 +25,8 @@ void UpdatePlan::compareList(const Context& context, Shown before, Shown after,
     List list;
     list.was = _source.before.shownValues(before);
     list.is = _source.after.shownValues(after);
+    if (list.was.empty() && list.is.empty())
+        return;
     list.plan = _source.after[after].field;
     list.field = after;
     if (!findEntries(context, list))
@@ -35,6 +37,15 @@ void UpdatePlan::compareList(const Context& context, Shown before, Shown after,
         return fillList(context, list, ordinal);
     arrangeList(context, list, ordinal);
 }
+
+namespace {
+
+// Null of a text and of a plain struct.
+const Object* objectIn(const WritingTrace& trace, WritingTrace::Number value) {
+    return trace[value].kind == WritingTrace::Kind::object ? trace.object(value) : nullptr;
+}
+
+} // namespace
 
 // By place, or, where a setter has sorted them, by the objects themselves. False where it does not
 // show which is which.
@@ -51,12 +62,11 @@ bool UpdatePlan::findEntries(const Context& context, List& list) const {
         return false;
     bool isSorted = false;
     for (std::size_t i = 0; i < list.was.size(); ++i) {
-        const WritingTrace::Shown& shown = _source.before[list.was[i]];
-        const bool isObject = shown.kind == WritingTrace::Kind::object;
+        const Object* const object = objectIn(_source.before, list.was[i]);
+        const bool isObject = _source.before[list.was[i]].kind == WritingTrace::Kind::object;
         if (isObject != (use(list.uses[i]).made != ReadingTrace::none))
             return false;
-        isSorted = isSorted ||
-                   (isObject && shown.object != nullptr && shown.object != objectOf(list.uses[i]));
+        isSorted = isSorted || (object != nullptr && object != objectOf(list.uses[i]));
     }
     return !isSorted || findObjects(list);
 }
@@ -72,10 +82,10 @@ bool UpdatePlan::findObjects(List& list) const {
     for (const std::uint32_t number : list.uses)
         byObject.emplace(objectOf(number), number);
     for (std::size_t i = 0; i < list.was.size(); ++i) {
-        const WritingTrace::Shown& shown = _source.before[list.was[i]];
-        if (shown.kind != WritingTrace::Kind::object || shown.object == nullptr)
+        const Object* const object = objectIn(_source.before, list.was[i]);
+        if (object == nullptr)
             continue;
-        const auto found = byObject.find(shown.object);
+        const auto found = byObject.find(object);
         if (found == byObject.end())
             return false;
         list.uses[i] = found->second;
@@ -88,7 +98,7 @@ namespace {
 ListItem itemOf(const WritingTrace& trace, WritingTrace::Number value) {
     const WritingTrace::Shown& shown = trace[value];
     const bool isObject = shown.kind == WritingTrace::Kind::object;
-    return {shown.hash, isObject ? reinterpret_cast<std::uintptr_t>(shown.plan) : 0};
+    return {shown.hash, isObject ? reinterpret_cast<std::uintptr_t>(trace.plan(value)) : 0};
 }
 
 // The text of the item's field, where it has one.
@@ -256,7 +266,7 @@ std::string UpdatePlan::printed(const List& list, Shown item, Entry inside,
         return _source.writer.element(binding != nullptr ? binding->name : plan.xmlName(),
                                       _source.after.text(item), around);
     const bool isNamed = binding != nullptr && list.binding != 0 && !binding->bindTo.isEmpty();
-    return _source.writer.element(*_source.after[item].element,
+    return _source.writer.element(*_source.after.element(item),
                                   isNamed ? &binding->bindTo : nullptr, around);
 }
 

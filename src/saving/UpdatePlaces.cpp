@@ -35,7 +35,7 @@ void UpdatePlan::insertValue(const Context& context, Shown value, Shown field,
         isAttribute ? _source.writer.elementWithAttribute(plan.location(), name,
                                                           _source.after.text(value), around)
         : isText    ? _source.writer.element(name, _source.after.text(value), around)
-                    : _source.writer.element(*_source.after[value].element, nullptr, around);
+                    : _source.writer.element(*_source.after.element(value), nullptr, around);
     insertChild(printed, place, value);
 }
 
@@ -125,7 +125,7 @@ void UpdatePlan::replaceElement(Entry element, Shown object, const String* name)
         start && !start->empty() && !_source.layout.isInline(parent))
         line = std::string(*start);
     add(spot.begin, spot.end,
-        _source.writer.element(*_source.after[object].element, name, around(parent, line)), object);
+        _source.writer.element(*_source.after.element(object), name, around(parent, line)), object);
 }
 
 void UpdatePlan::removeElement(Entry element, Shown shown) {

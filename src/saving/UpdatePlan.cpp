@@ -7,8 +7,8 @@ namespace qx::detail {
 
 using Form = ReadingTrace::Form;
 
-UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew)
-    : _source(source), _anew(anew) {
+UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept)
+    : _source(source), _anew(anew), _addsKept(addsKept) {
     const auto& uses = source.read.uses();
     const auto fieldOf = [&](std::uint32_t use) { return uses[use].field; };
     // By owner in one pass, then each owner's by field.
@@ -129,7 +129,7 @@ void UpdatePlan::compareValue(const Context& context, std::uint32_t number, Show
         return setText(taken.entry, isOwn, text, _source.after.text(is), is);
     }
     const bool isSameClass =
-        !wasText && !isText(is) && taken.made != none && before[was].plan == _source.after[is].plan;
+        !wasText && !isText(is) && taken.made != none && before.plan(was) == _source.after.plan(is);
     if (isSameClass)
         return compareObject(was, is, taken.made, &context, ordinal);
     const bool mayBeReplaced = taken.form == Form::child || taken.form == Form::item;

@@ -46,17 +46,24 @@ public:
     using Entry = XMLIndex::Number;
     static constexpr std::uint32_t none = UINT32_MAX;
 
-    // The objects of `anew`, numbers of the later writing, are written anew.
-    UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew);
+    // The objects of `anew`, numbers of the later writing, are written anew. An object that was
+    // saved before may keep what a field took once, and took no more when the text was read: back
+    // in the text it would be taken again. So there may be a plan that adds no unknown XML.
+    UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept = true);
 
     void run();
     EditList& edits() noexcept { return *_edits; }
+    const EditList& edits() const noexcept { return *_edits; }
     // Once they are arranged.
     void joinRemovals();
     // The objects and fields whose change could not be carried.
     const std::vector<Shown>& failures() const noexcept { return _failures; }
     // The values whose element has lost what stood in it beside the text.
     const std::vector<Shown>& rewritten() const noexcept { return _rewritten; }
+    // The unknown XML that objects keep and the text lacks: the object, and the node's text.
+    using NewKept = std::vector<std::pair<Shown, std::string>>;
+    bool addsKept() const noexcept { return _addsKept; }
+    const NewKept& newKept() const noexcept { return _newKept; }
     // The nearest object around, itself included, that has an element to be written anew, and is
     // not the root; none where there is none.
     Shown objectAround(Shown shown) const;
@@ -158,6 +165,7 @@ private:
                              const WritingTrace::KeptList& is);
     void compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
                                const WritingTrace::KeptList& is);
+    bool mayAddKept(Shown object, const std::string& text);
     std::vector<Entry> entriesOfKept(const Context& context,
                                      const std::vector<WritingTrace::Kept>& kept) const;
 
@@ -167,6 +175,8 @@ private:
 
     const UpdateSource& _source;
     const std::set<Shown>& _anew;
+    const bool _addsKept;
+    NewKept _newKept;
     EditList _all;
     EditList* _edits = &_all; // those of an item that moves are its own
     std::vector<Shown> _failures;

@@ -29,8 +29,7 @@ XMLDraft::Node* XMLDraft::newNode(Kind kind, const String* name, std::string_vie
         value = {};
     // What moves leaves a pointer.
     void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
-    Node* const node = ::new (memory) Node{name, nullptr, 0, static_cast<std::uint8_t>(kind)};
-    node->size = value.size() & Node::largestSize;
+    Node* const node = ::new (memory) Node{name, nullptr, Node::bitsOf(kind, value.size())};
     if (!value.empty())
         std::memcpy(node + 1, value.data(), value.size());
     return node;
@@ -53,13 +52,8 @@ void XMLDraft::append(Node*& last, Node* node) noexcept {
 }
 
 XMLDraft::Element& XMLDraft::newElement(const String& name) {
-    return *::new (allocate(sizeof(Element)))
-        Element{{&name, nullptr, 0, static_cast<std::uint8_t>(Kind::element)},
-                nullptr,
-                nullptr,
-                false,
-                false,
-                false};
+    return *::new (allocate(sizeof(Element))) Element{
+        {&name, nullptr, Node::bitsOf(Kind::element, 0)}, nullptr, nullptr, false, false, false};
 }
 
 void XMLDraft::addDeclaration(Element& element, const String& prefix, const String& URI) {
@@ -131,7 +125,7 @@ XMLDraft::Element& XMLDraft::enlarged(Node& child) {
         setText(element, child.value());
         const Element* const place = &element;
         std::memcpy(&child + 1, &place, sizeof place);
-        child.kindNumber = static_cast<std::uint8_t>(Kind::moved);
+        child.bits = Node::bitsOf(Kind::moved, 0);
     }
     return const_cast<Element&>(child.element());
 }

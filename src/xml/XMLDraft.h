@@ -49,14 +49,17 @@ public:
     struct Node {
         const String* name;
         Node* next;
-        static constexpr std::uint64_t largestSize = (std::uint64_t(1) << 56U) - 1;
-        std::uint64_t size : 56;
-        std::uint64_t kindNumber : 8;
+        // The size above the kind: a word that is written at once. Bit fields are read before that,
+        // and so memory that nothing has touched yet.
+        std::uint64_t bits;
 
-        Kind kind() const noexcept { return static_cast<Kind>(kindNumber); }
+        static constexpr std::uint64_t bitsOf(Kind kind, std::size_t size) noexcept {
+            return std::uint64_t(size) << 8U | static_cast<std::uint64_t>(kind);
+        }
+        Kind kind() const noexcept { return static_cast<Kind>(bits & 0xFFU); }
         // Of an attribute, a declaration, a text or a leaf.
         std::string_view value() const noexcept {
-            return {reinterpret_cast<const char*>(this + 1), size};
+            return {reinterpret_cast<const char*>(this + 1), bits >> 8U};
         }
         inline const Element& element() const noexcept; // itself, or that of what moved
         XMLElement& holder() const noexcept;            // of what is kept

@@ -139,7 +139,7 @@ void XMLSerializer::writeChildren(const XMLDraft::Element& element) {
             writeLeaf(node);
             break;
         case XMLDraft::Kind::text:
-            _limits.addText(node.size, {});
+            _limits.addText(node.value().size(), {});
             writeEscaped(node.value(), Where::text, isWhite(node.value()), {});
             break;
         case XMLDraft::Kind::keptChildren:
@@ -159,7 +159,7 @@ void XMLSerializer::writeLeaf(const XMLDraft::Node& leaf) {
     writeName(*leaf.name, {});
     _output += '>';
     _limits.enter({}, 0, 0);
-    _limits.requireSize(leaf.size, "a text is larger than", {});
+    _limits.requireSize(leaf.value().size(), "a text is larger than", {});
     writeEscaped(leaf.value(), Where::text, isWhite(leaf.value()), {});
     _limits.leave();
     endTag(*leaf.name);

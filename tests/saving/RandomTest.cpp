@@ -43,21 +43,32 @@ public:
         ASSERT_TRUE(update) << support::told(update.error());
         const std::string saved(update->bytes()->view());
         SCOPED_TRACE(saved);
-        const auto again = marshaller->readString(saved, &error);
-        ASSERT_TRUE(again && !error) << support::told(error);
+        compare(*marshaller, saved, object);
         if (_isKept) {
             EXPECT_EQ(unknownIn(saved), unknownIn(document));
         }
-        marshaller->setSaveUnknownXML(false);
-        EXPECT_EQ(marshaller->writeString(again), marshaller->writeString(object));
         EXPECT_TRUE(update->writtenAnew().empty());
         std::size_t changed = 0;
         for (const QXXMLUpdate::Edit& one : update->edits())
             changed += one.oldText.size() + one.newText.size();
         EXPECT_LE(changed, _most);
+        edit(object, 0);
+        const auto later = QXXMLUpdate::updatedText(*marshaller, saved, object);
+        ASSERT_TRUE(later) << support::told(later.error()) << _edits;
+        compare(*marshaller, later->bytes()->view(), object);
     }
 
 private:
+    static void compare(QXXMLMarshaller& marshaller, std::string_view saved,
+                        const qx::Ref<qx::Object>& object) {
+        qx::Ref<qx::Error> error;
+        const auto again = marshaller.readString(saved, &error);
+        ASSERT_TRUE(again && !error) << support::told(error);
+        marshaller.setSaveUnknownXML(false);
+        EXPECT_EQ(marshaller.writeString(again), marshaller.writeString(object));
+        marshaller.setSaveUnknownXML(true);
+    }
+
     std::size_t below(std::size_t n) { return _random() % n; }
     bool isLikely(std::size_t percent) { return below(100) < percent; }
 

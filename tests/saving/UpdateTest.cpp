@@ -284,3 +284,45 @@ TEST_F(Update, ADocumentFileIsSavedAgainAndAgainWhateverFieldsShare) {
     text.replace(text.find("<line>4</line>"), 14, "");
     edit("title", "F", "K");
 }
+
+// Not kept exactly, an object holds what its fields took, too, as it was when it was read.
+TEST(UpdateAgain, SavesAnObjectThatKeepsWhatIsGone) {
+    const struct {
+        const char *mapping, *document;
+        std::vector<const char*> edits;
+        const char* saved;
+    } cases[] = {
+        {"<Order xml='order'><day name='on' node='attribute' location='received'/></Order>",
+         "<order>\n    <received on='1'/>\n</order>",
+         {"day = null", "", "day = \"2\"", ""},
+         "<order>\n    <received on=\"2\"/>\n</order>"},
+        {"<Order xml='order'><day node='attribute'/><more type='More' container='false' "
+         "node='element'/></Order><More><note node='element'/></More>",
+         "<order day='1'><note>a</note></order>",
+         {"day = null", "", "more.note = \"b\"", "day = \"2\""},
+         "<order day=\"2\"><note>b</note></order>"},
+        {"<Order xml='order'><more type='More' container='false' node='element'/>"
+         "<rows type='Row' collection='array' name='row'/></Order>"
+         "<More><note node='element'/></More><Row><id node='attribute'/></Row>",
+         "<order><note>a</note><row id='1'/></order>",
+         {"insert rows[0] Row{id: \"0\"}", "rows[1].id = \"2\"", "remove rows[0]", ""},
+         "<order><note>a</note><row id='2'/></order>"},
+        {"<Order xml='order'><rows collection='array' name='row'/><note node='element'/></Order>",
+         "<order/>",
+         {"note = \"a\"", "", "note = \"b\""},
+         "<order><note>b</note></order>"},
+    };
+    for (const auto& each : cases) {
+        const auto marshaller = scenario::marshaller(each.mapping);
+        std::string text = each.document;
+        const auto order = marshaller->readString(text);
+        ASSERT_TRUE(order);
+        for (const char* edit : each.edits) {
+            edits::apply(order, edit);
+            const auto update = QXXMLUpdate::updatedText(*marshaller, text, order);
+            ASSERT_TRUE(update) << support::told(update.error()) << edit << text;
+            text = update->bytes()->view();
+        }
+        EXPECT_EQ(text, each.saved);
+    }
+}
