@@ -44,6 +44,14 @@ target_link_libraries(qx_dependencies INTERFACE ${QX_DEPENDENCIES})
 
 file(GLOB_RECURSE qx_unclaimed RELATIVE "${PROJECT_SOURCE_DIR}/src" CONFIGURE_DEPENDS
     "${PROJECT_SOURCE_DIR}/src/*.cpp")
+# The standard headers of most files are compiled once for all folders. Where a compiler cache is in use, it
+# saves more, and knows nothing that was compiled so. Projects that take this one in compile each file alone:
+# tests/checks/install.sh sees from that that no file leaves an include to this list.
+set(QX_PRECOMPILE OFF)
+if(PROJECT_IS_TOP_LEVEL AND NOT CMAKE_CXX_COMPILER_LAUNCHER)
+    set(QX_PRECOMPILE ON)
+endif()
+
 set(QX_BUILT_LAYERS)
 foreach(layer IN LISTS QX_LAYERS)
     set(sources ${qx_unclaimed})
@@ -57,6 +65,13 @@ foreach(layer IN LISTS QX_LAYERS)
     set_target_properties(qx_${layer} PROPERTIES POSITION_INDEPENDENT_CODE ON)
     target_include_directories(qx_${layer} PRIVATE "${PROJECT_SOURCE_DIR}/src")
     target_link_libraries(qx_${layer} PUBLIC qx_headers PRIVATE qx_warnings)
+    if(QX_PRECOMPILE AND QX_BUILT_LAYERS)
+        list(GET QX_BUILT_LAYERS 0 lowest)
+        target_precompile_headers(qx_${layer} REUSE_FROM qx_${lowest})
+    elseif(QX_PRECOMPILE)
+        target_precompile_headers(qx_${layer} PRIVATE <algorithm> <array> <charconv> <functional> <memory>
+            <optional> <span> <string> <string_view> <unordered_map> <utility> <vector>)
+    endif()
     list(APPEND QX_BUILT_LAYERS ${layer})
 endforeach()
 if(qx_unclaimed)

@@ -11,7 +11,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <chrono>
+#include <ctime>
 
 using namespace qx;
 
@@ -90,9 +90,9 @@ TEST(StringsFileTest, ManyFaultyEntriesCostNoMoreThanTheirBytes) {
         std::string file;
         while (file.size() < 1'000'000)
             file += line;
-        const auto start = std::chrono::steady_clock::now();
+        const std::clock_t start = std::clock();
         parseStrings(file);
         parseStrings(file + "*/");
-        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2)) << line;
+        EXPECT_LT(std::clock() - start, 2 * CLOCKS_PER_SEC) << line;
     }
 }

@@ -3,21 +3,20 @@
 #include "model/Warning.h"
 
 #include "support/FileSandbox.h"
+#include "support/Patterns.h"
 
 #include <gtest/gtest.h>
-
-#include <regex>
 
 using namespace qx;
 
 namespace {
 
 std::string lineOf(void (*write)()) {
-    static const std::regex head(R"(^\d{4}-\d\d-\d\d \d\d:\d\d:\d\d\.\d{3} Client\[\d+\] )");
+    const std::string head = R"(^\d{4}-\d\d-\d\d \d\d:\d\d:\d\d\.\d{3} Client\[\d+\] )";
     const FileSandbox world;
     ::testing::internal::CaptureStderr();
     write();
-    return std::regex_replace(::testing::internal::GetCapturedStderr(), head, "head ");
+    return support::replaced(::testing::internal::GetCapturedStderr(), head, "head ");
 }
 
 } // namespace

@@ -1,14 +1,13 @@
 // Mapping documents are read into nodes, refused with exact errors, and printed.
 
 #include "support/Cases.h"
+#include "support/Patterns.h"
 #include "support/Texts.h"
 
 #include <QXXMLMarshalling/QXXMLDocumentMapping.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
 #include <gtest/gtest.h>
-
-#include <regex>
 
 namespace {
 
@@ -32,12 +31,11 @@ Ref<QXXMLFieldMapping> field(std::string_view xml) {
 // without.
 const bool added = support::addCases(
     "tests/mapping/mappings.md", {"mapping"}, {"description", "error"}, [](const auto& expected) {
-        static const std::regex address(": 0x[0-9a-f]+");
         const std::string& content = expected.given.at("mapping");
         Ref<Error> error;
         const auto document = mapping(content, &error);
         EXPECT_EQ(!document, !mapping(content));
-        EXPECT_EQ((document ? std::regex_replace(document->description().str(), address, "")
+        EXPECT_EQ((document ? support::replaced(document->description().str(), ": 0x[0-9a-f]+", "")
                             : support::told(error)) +
                       "\n",
                   expected.text);

@@ -6,9 +6,10 @@
 #include <QXXMLMarshalling/model/ValueTraits.h>
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
+#include "support/Patterns.h"
+
 #include <gtest/gtest.h>
 
-#include <regex>
 #include <string>
 
 namespace support {
@@ -50,8 +51,7 @@ inline std::string told(const qx::Ref<qx::Error>& error) {
 
 // The description of a value in one line.
 inline std::string oneLine(const qx::Value& value) {
-    static const std::regex layout("\\s+");
-    return std::regex_replace(value.description().str(), layout, " ");
+    return replaced(value.description().str(), "\\s+", " ");
 }
 
 // What a property of the type holds when it is set to the value; "refused" when it stays as it is.

@@ -7,11 +7,11 @@
 
 #include "support/FileSandbox.h"
 #include "support/Page.h"
+#include "support/Patterns.h"
 
 #include <gtest/gtest.h>
 
 #include <cstdlib>
-#include <regex>
 
 #include <sys/wait.h>
 
@@ -65,8 +65,7 @@ private:
 template <class Answer>
 void run(const std::string& page, std::size_t least, Answer answer) {
     // What the parser's version decides: the column and the text of its error.
-    static const std::regex parserError(
-        "(qxxml: error 76: [^:\n]+:[0-9]+):[0-9]+: .+(\n(! )?    .*)*");
+    const std::string parserError = "(qxxml: error 76: [^:\n]+:[0-9]+):[0-9]+: .+(\n(! )?    .*)*";
     Shell home;
     const auto blocks = support::blocksOf(QX_SOURCE_DIR "/" + page);
     for (const auto& block : blocks)
@@ -78,8 +77,8 @@ void run(const std::string& page, std::size_t least, Answer answer) {
             continue;
         const std::size_t end = text.find('\n');
         ASSERT_TRUE(text.starts_with("$ ")) << page << ":" << line;
-        EXPECT_EQ(std::regex_replace(answer(home, text.substr(2, end - 2)), parserError, "$1"),
-                  std::regex_replace(text.substr(end + 1), parserError, "$1"))
+        EXPECT_EQ(support::replaced(answer(home, text.substr(2, end - 2)), parserError, "$1"),
+                  support::replaced(text.substr(end + 1), parserError, "$1"))
             << page << ":" << line;
         ++commands;
     }
@@ -98,9 +97,8 @@ TEST(Commands, DoWhatTheirPagesShow) {
 
 TEST(Commands, AreAnsweredWithOutputErrorsAndStatus) {
     run("tests/tools/qxxml/commands.md", 25, [](const Shell& home, const std::string& command) {
-        static const std::regex line("(.+)");
         const auto [status, output, errors] = home.run(command);
-        return output + std::regex_replace(errors, line, "! $1") +
+        return output + support::replaced(errors, "(.+)", "! $1") +
                (status != 0 ? "= " + std::to_string(status) + "\n" : "");
     });
 }
