@@ -48,7 +48,8 @@ const Class* UsualReading::placedClass(const Slot& slot, const Property* propert
     if (placing == nullptr || placing->isList() != slot.isList() || slot.plan == nullptr ||
         _reading.isCollecting())
         return nullptr;
-    const Class* const type = _reading.classOf(*slot.plan);
+    // Whether such objects can be made is found out when the first of them is.
+    const Class* const type = Class::named(slot.plan->classNameToInstantiate.view());
     return type != nullptr && type->isStruct() && type->type() == *placing->type ? type : nullptr;
 }
 
@@ -105,7 +106,9 @@ bool UsualReading::readFields(const Source& source, Object& object, ErrorSlot er
 
 inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlot error) {
     const Key key = _slots[slot].field->key;
-    if (_isUnheard && !value.isNull()) {
+    // A null makes the change cache, which is to hear of what follows.
+    _isUnheard = _isUnheard && !value.isNull();
+    if (_isUnheard) {
         RecordFilling::append(static_cast<QXGenericRecord&>(_object), key, std::move(value),
                               _source.element.slotCount());
         return true;
@@ -113,7 +116,7 @@ inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlo
     const Property* const property = _setters.slots[slot].property;
     if (_setters.usesProperties && property != nullptr && property->set != nullptr &&
         !ObjectInternals::isHeard(_object))
-        return property->set(*property, _object, value) ||
+        return ObjectInternals::setAndTell(_object, *property, value) ||
                ObjectAccess::refuse(_object, key, value, error);
     return ObjectAccess::set(_object, key, std::move(value), error);
 }
@@ -157,6 +160,9 @@ inline bool UsualReading::Binding::readField(std::size_t slot) {
         return readItems(slot) || passOver(field);
     Ref<Error> problem;
     if (readValue(slot, &problem) || !problem)
+        return true;
+    // What does not fit as an attribute is left to a child, which is not there.
+    if (_slots[slot].place == Place::either && !_document.isElement(_source.element[slot]))
         return true;
     if (_error != nullptr)
         *_error = std::move(problem);
@@ -239,10 +245,10 @@ bool UsualReading::Binding::readItems(std::size_t slot) {
 bool UsualReading::Binding::placeItems(std::size_t slot, const Items& items) {
     const Setter& setter = _setters.slots[slot];
     const StructPlacing& placing = *setter.property->placing;
-    void* list = nullptr;
+    std::size_t count = 0; // of many children few may be items
+    forEach(items, _slots[slot], [&](Number) { return ++count != 0; });
+    void* const list = count != 0 ? placing.begin(_object, count) : nullptr;
     return forEach(items, _slots[slot], [&](Number node) {
-        if (list == nullptr)
-            list = placing.begin(_object, items.most);
         StructObject held(*setter.placed, placing.add(list));
         const bool isBuilt = static_cast<bool>(
             _reading.build(*_slots[slot].plan, node, _source.nodes, _error, &held));

@@ -30,7 +30,8 @@ public:
 
     std::optional<UsualForm> usualForm;
 
-    // Works out attributeCount, bindsChildrenOnce and usualForm, once the fields and the ancestors are there.
+    // Works out attributeCount, bindsChildrenOnce and usualForm, once the fields and the ancestors
+    // are there.
     void summarise();
 };
 
