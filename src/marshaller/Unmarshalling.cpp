@@ -124,8 +124,11 @@ Ref<Object> Unmarshalling::buildWith(const ClassPlan& plan, const Counted& sourc
 
 Ref<Object> Unmarshalling::build(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
                                  ErrorSlot error, StructObject* given) {
+    // Without a slot for errors items may be left out, which are unknown XML then.
+    const bool mayBeUsual =
+        plan.usualForm && isPlain() && (error != nullptr || !plan.usualForm->hasItems());
     UsualElement usual;
-    if (plan.usualForm && isPlain() && usual.find(_document, *plan.usualForm, element))
+    if (mayBeUsual && usual.find(_document, *plan.usualForm, element))
         return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
             return _usual.readFields({plan, usual, element, nodes}, object, error);
         });

@@ -30,9 +30,11 @@ const UsualReading::Setters& UsualReading::lookUp(const ClassPlan& plan, const O
     Setters& setters = _setters.emplace_front();
     setters.type = &type;
     setters.appends = &type == &QXGenericRecord::classObject();
-    setters.usesProperties =
-        type.isStruct() || (type.setsByProperty() && typeid(object) == type.type() &&
-                            type.classOperation(announces) == nullptr);
+    if (type.isStruct())
+        setters.way = Way::ofStruct;
+    else if (type.setsByProperty() && typeid(object) == type.type() &&
+             type.classOperation(announces) == nullptr)
+        setters.way = Way::ofObject;
     for (const Slot& slot : plan.usualForm->slots()) {
         const Key key = slot.field->key;
         const Property* const property = type.property(key);
@@ -48,7 +50,8 @@ const Class* UsualReading::placedClass(const Slot& slot, const Property* propert
     if (placing == nullptr || placing->isList() != slot.isList() || slot.plan == nullptr ||
         _reading.isCollecting())
         return nullptr;
-    const Class* const type = _reading.classOf(*slot.plan);
+    // Whether such objects can be made is found out when the first of them is.
+    const Class* const type = Class::named(slot.plan->classNameToInstantiate.view());
     return type != nullptr && type->isStruct() && type->type() == *placing->type ? type : nullptr;
 }
 
@@ -105,17 +108,22 @@ bool UsualReading::readFields(const Source& source, Object& object, ErrorSlot er
 
 inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlot error) {
     const Key key = _slots[slot].field->key;
-    if (_isUnheard && !value.isNull()) {
+    // A null makes the change cache, which is to hear of what follows.
+    _isUnheard = _isUnheard && !value.isNull();
+    if (_isUnheard) {
         RecordFilling::append(static_cast<QXGenericRecord&>(_object), key, std::move(value),
                               _source.element.slotCount());
         return true;
     }
     const Property* const property = _setters.slots[slot].property;
-    if (_setters.usesProperties && property != nullptr && property->set != nullptr &&
-        !ObjectInternals::isHeard(_object))
-        return property->set(*property, _object, value) ||
-               ObjectAccess::refuse(_object, key, value, error);
-    return ObjectAccess::set(_object, key, std::move(value), error);
+    const bool isPlain = _setters.way != Way::byKey && property != nullptr &&
+                         property->set != nullptr && !ObjectInternals::isHeard(_object);
+    if (!isPlain)
+        return ObjectAccess::set(_object, key, std::move(value), error);
+    const bool isSet = _setters.way == Way::ofStruct
+                           ? property->set(*property, _object, value)
+                           : ObjectInternals::setUnheard(_object, *property, value);
+    return isSet || ObjectAccess::refuse(_object, key, value, error);
 }
 
 // Who is told of the object that is to hold it has heard of that one.
@@ -157,6 +165,9 @@ inline bool UsualReading::Binding::readField(std::size_t slot) {
         return readItems(slot) || passOver(field);
     Ref<Error> problem;
     if (readValue(slot, &problem) || !problem)
+        return true;
+    // What does not fit as an attribute is left to a child, which is not there.
+    if (_slots[slot].place == Place::either && !_document.isElement(_source.element[slot]))
         return true;
     if (_error != nullptr)
         *_error = std::move(problem);
@@ -239,10 +250,10 @@ bool UsualReading::Binding::readItems(std::size_t slot) {
 bool UsualReading::Binding::placeItems(std::size_t slot, const Items& items) {
     const Setter& setter = _setters.slots[slot];
     const StructPlacing& placing = *setter.property->placing;
-    void* list = nullptr;
+    std::size_t count = 0; // of many children few may be items
+    forEach(items, _slots[slot], [&](Number) { return ++count != 0; });
+    void* const list = count != 0 ? placing.begin(_object, count) : nullptr;
     return forEach(items, _slots[slot], [&](Number node) {
-        if (list == nullptr)
-            list = placing.begin(_object, items.most);
         StructObject held(*setter.placed, placing.add(list));
         const bool isBuilt = static_cast<bool>(
             _reading.build(*_slots[slot].plan, node, _source.nodes, _error, &held));

@@ -85,6 +85,7 @@ bool UsualForm::add(const FieldPlan& field) {
         return false;
     if (slot->place == Place::text)
         _textSlot = _slots.size();
+    _hasItems = _hasItems || slot->place == Place::items;
     if (field.isRequired && !field.isCollection())
         _required |= 1U << _slots.size();
     _slots.push_back(*slot);

@@ -54,6 +54,8 @@ public:
     const std::vector<Slot>& slots() const noexcept { return _slots; }
     // Those without which the element is faulty, one bit each.
     std::uint32_t required() const noexcept { return _required; }
+    // Whether items stand in the element itself.
+    bool hasItems() const noexcept { return _hasItems; }
     // The slot of the element's own text; mostSlots where there is none.
     std::size_t textSlot() const noexcept { return _textSlot; }
 
@@ -63,6 +65,7 @@ private:
 
     std::vector<Slot> _slots;
     std::uint32_t _required = 0;
+    bool _hasItems = false;
     std::size_t _textSlot = mostSlots;
 };
 

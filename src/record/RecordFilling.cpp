@@ -2,7 +2,6 @@
 
 #include <QXXMLMarshalling/model/Null.h>
 
-
 namespace qx::detail {
 
 bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) {
