@@ -138,13 +138,13 @@ inline bool UsualReading::Binding::adopt(const Value& value, ErrorSlot error) {
 inline bool UsualReading::Binding::readValue(std::size_t slot, ErrorSlot error) {
     const Slot& taking = _slots[slot];
     const Number number = _source.element[slot];
+    const bool isElement = _document.isElement(number);
     Value value;
-    if (!_document.isElement(number)) {
-        value = _document.value(number);
+    if (!isElement || taking.plan == nullptr) {
+        const Number text = isElement ? _document.onlyText(number) : number;
+        value = text != IndexedXML::none ? _document.value(text) : _reading.textOf(number, error);
         if (taking.place == Place::text && value.view().empty())
             return true;
-    } else if (taking.plan == nullptr) {
-        value = _reading.textOf(number, error);
     } else if (const Setter& setter = _setters.slots[slot]; setter.placed != nullptr) {
         StructObject held(*setter.placed, setter.property->placing->begin(_object, 1));
         return static_cast<bool>(_reading.build(*taking.plan, number, _source.nodes, error, &held));
