@@ -16,7 +16,7 @@ bool RecordFilling::addContent(QXGenericRecord& record, Key key, Value&& value) 
 
 void RecordFilling::makeContents(QXGenericRecord& record, std::size_t count) {
     record._contents = make<Dictionary>();
-    record._contents->_entries.reserve(count);
+    DictionaryFilling::begin(*record._contents, count);
     record._isCacheBehind = record.tracking().isIdle();
 }
 

@@ -20,6 +20,7 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "model/DictionaryFilling.h"
 #include "model/LentText.h"
 
 namespace qx::detail {
@@ -38,7 +39,7 @@ public:
         if (!record._contents) [[unlikely]]
             makeContents(record, count);
         LentText::keep(value);
-        record._contents->append(key.string(), std::move(value));
+        DictionaryFilling::append(*record._contents, key.string(), std::move(value));
     }
     // Made when there are none.
     static const Ref<Dictionary>& contents(QXGenericRecord& record) {

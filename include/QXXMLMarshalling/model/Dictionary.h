@@ -21,7 +21,7 @@ namespace qx {
 class Array;
 
 namespace detail {
-class RecordFilling;
+struct DictionaryFilling;
 }
 
 class QX_API Dictionary final : public Object {
@@ -135,7 +135,7 @@ protected:
     const Class& describedClass() const override;
 
 private:
-    friend class detail::RecordFilling;
+    friend struct detail::DictionaryFilling;
 
     std::size_t positionOf(const String& key) const noexcept;
     void checkUnchanged(std::size_t changes) const;
