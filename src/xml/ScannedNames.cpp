@@ -16,7 +16,11 @@ void require(bool condition) {
 
 ScannedNames::ScannedNames(std::string_view text, std::size_t longest, std::vector<String>& texts)
     : _text(text), _longest(longest), _seed(String::hashOf("names of a document")), _slots(256),
-      _texts(texts) {}
+      _texts(texts) {
+    constexpr std::size_t usualCount = 32;
+    _names.reserve(usualCount);
+    _texts.reserve(usualCount);
+}
 
 ScannedNames::Name& ScannedNames::findLong(std::string_view text) {
     const std::uint32_t hash = String::hashOf(text);

@@ -1,5 +1,7 @@
 #include "xml/XMLCharacters.h"
 
+#include "xml/ByteRuns.h"
+
 #include <algorithm>
 #include <iterator>
 
@@ -116,9 +118,13 @@ bool isXMLName(std::string_view text) noexcept {
     std::size_t at = 0;
     if (text.empty() || !isNameStart(decodeCharacter(text, at)))
         return false;
-    while (at < text.size())
-        if (!isNameCharacter(decodeCharacter(text, at)))
+    while (at < text.size()) {
+        const bool isPlain = static_cast<unsigned char>(text[at]) < 0x80 && is(text[at], nameByte);
+        if (isPlain)
+            ++at;
+        else if (!isNameCharacter(decodeCharacter(text, at)))
             return false;
+    }
     return true;
 }
 
