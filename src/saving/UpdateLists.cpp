@@ -193,7 +193,7 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
         const std::size_t was = matching.was[i];
         if (was != ListMatching::none && matching.stays[i]) {
             previous = was;
-            if (before[was].hash != now[i].hash || !_anew.empty())
+            if (!areSame(list.was[was], list.is[i]) || !_anew.empty())
                 compareValue(context, list.uses[was], list.was[was], list.is[i], ordinal);
             continue;
         }

@@ -8,7 +8,8 @@ namespace qx::detail {
 using Form = ReadingTrace::Form;
 
 UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept)
-    : _source(source), _anew(anew), _addsKept(addsKept) {
+    : _source(source), _anew(anew), _addsKept(addsKept),
+      _comparesAll(source.before.declarationsHash() != source.after.declarationsHash()) {
     const auto& uses = source.read.uses();
     const auto fieldOf = [&](std::uint32_t use) { return uses[use].field; };
     // By owner in one pass, then each owner's by field.
@@ -73,7 +74,7 @@ void UpdatePlan::compareObject(Shown before, Shown after, std::uint32_t owner,
         const String name = _source.document.name(element);
         return replaceElement(element, after, &name);
     }
-    if (_source.before[before].hash == _source.after[after].hash)
+    if (areSame(before, after))
         return;
     const Context context{before, after, owner, parent, ordinal, element};
     std::size_t field = 0;
@@ -87,7 +88,7 @@ void UpdatePlan::compareObject(Shown before, Shown after, std::uint32_t owner,
 
 void UpdatePlan::compareField(const Context& context, Shown before, Shown after,
                               std::size_t ordinal) {
-    if (_source.before[before].hash == _source.after[after].hash)
+    if (areSame(before, after))
         return;
     if (_source.before[before].isList || _source.after[after].isList)
         return compareList(context, before, after, ordinal);

@@ -101,6 +101,9 @@ private:
     void fail(Shown shown) { _failures.push_back(shown); }
     Entry parentOf(Entry entry) const noexcept { return _source.markup.parent(entry); }
     const ReadingTrace::Use& use(std::uint32_t number) const { return _source.read.uses()[number]; }
+    bool areSame(Shown before, Shown after) const {
+        return !_comparesAll && _source.before[before].hash == _source.after[after].hash;
+    }
     bool isText(Shown after) const { return _source.after[after].kind == WritingTrace::Kind::text; }
 
     // UpdateLists.cpp
@@ -163,8 +166,11 @@ private:
                       const std::vector<WritingTrace::Kept>& is);
     void compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
                              const WritingTrace::KeptList& is);
+    void compareDeclarations(const Context& context, const WritingTrace::KeptList& was,
+                             const WritingTrace::KeptList& is);
     void compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
                                const WritingTrace::KeptList& is);
+    void addToTag(const Context& context, std::string_view name, const WritingTrace::Kept& kept);
     bool mayAddKept(Shown object, const std::string& text);
     std::vector<Entry> entriesOfKept(const Context& context,
                                      const std::vector<WritingTrace::Kept>& kept) const;
@@ -176,6 +182,8 @@ private:
     const UpdateSource& _source;
     const std::set<Shown>& _anew;
     const bool _addsKept;
+    // Whether objects have to be compared that show the same: they may declare something else.
+    const bool _comparesAll;
     NewKept _newKept;
     EditList _all;
     EditList* _edits = &_all; // those of an item that moves are its own
