@@ -17,7 +17,7 @@
 
 class QX_API QXXMLDocumentFile final : public qx::Object {
 public:
-    // Null with the errors of QXXMLMarshaller::readFile().
+    // Null with the errors of QXXMLMarshaller::readFile(), and 256 for a pipe or a device.
     static qx::Ref<QXXMLDocumentFile> open(const qx::String& path,
                                            qx::Ref<QXXMLMarshaller> marshaller,
                                            qx::Ref<qx::Error>* error = nullptr);

@@ -42,7 +42,7 @@ Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMars
     qx::detail::reset(error);
     if (!marshaller)
         marshaller = QXXMLMarshaller::initWithMapping(nullptr);
-    auto text = qx::readFile(path, error);
+    auto text = qx::readFile(path, error, qx::ReadableFiles::regular);
     if (!text)
         return nullptr;
     Ref<Error> problem;
@@ -108,7 +108,7 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
             *error = update.error();
         return false;
     }
-    const auto theirs = qx::readFile(_path, error);
+    const auto theirs = qx::readFile(_path, error, qx::ReadableFiles::regular);
     if (!theirs)
         return false;
     const bool isSame = theirs->view() == text->view();
@@ -142,7 +142,7 @@ bool QXXMLDocumentFile::revert(Ref<Error>* error) {
     qx::detail::reset(error);
     const Ref<QXXMLDocumentFile> kept(this);
     const ExactKeeping exact(_marshaller);
-    auto text = qx::readFile(_path, error);
+    auto text = qx::readFile(_path, error, qx::ReadableFiles::regular);
     if (!text || !_marshaller->readStringInto(_root, *text, error))
         return false;
     setBase(std::move(text), SavePoint(*this));
