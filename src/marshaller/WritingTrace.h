@@ -108,9 +108,11 @@ public:
     }
     // Of the hidden values and their fields, where the hash above is known without more work.
     std::uint64_t hiddenHash() const noexcept { return _hiddenHash; }
-    // Of the declarations that objects keep, which are in no hash above: an object need not have
-    // any to say what is in its document.
-    std::uint64_t declarationsHash() const noexcept { return _declarationsHash; }
+    // Whether objects may keep other declarations than there. They are in no hash above, and count
+    // for nothing where none are kept: an object need not have any to say what is in its document.
+    bool declaresOtherThan(const WritingTrace& other) const noexcept {
+        return _declarationsHash != 0 && _declarationsHash != other._declarationsHash;
+    }
     // Whether there is a hidden value.
     bool hidesSome() const noexcept { return _hidesSome; }
     // Calls visit(Number) for each entry directly inside.

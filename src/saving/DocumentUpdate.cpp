@@ -24,8 +24,7 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
     Ref<Error> error;
     if (!prepare(&error))
         return error;
-    if (_source->hash() == _after.hash() &&
-        _source->written().declarationsHash() == _after.trace().declarationsHash())
+    if (_source->hash() == _after.hash() && !_after.trace().declaresOtherThan(_source->written()))
         return unchanged();
     prepareWriter();
     Ref<Error> why;
@@ -171,7 +170,7 @@ bool DocumentUpdate::isRight(const UpdatePlan& plan, QXXMLUpdate& update, Obstac
             return false;
         if (again->hash() == _after.hash() &&
             again->written().hiddenHash() == _after.trace().hiddenHash() &&
-            again->written().declarationsHash() == _after.trace().declarationsHash())
+            !_after.trace().declaresOtherThan(again->written()))
             return true;
     }
     const auto again = read(Extent::all);

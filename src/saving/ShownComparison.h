@@ -20,7 +20,7 @@ public:
     ShownComparison(const WritingTrace& wanted, const WritingTrace& found,
                     IsDouble isDouble = nullptr, const LeftOut& leftOut = {})
         : _wanted(wanted), _found(found), _isDouble(std::move(isDouble)),
-          _comparesDeclarations(wanted.declarationsHash() != found.declarationsHash()),
+          _comparesDeclarations(wanted.declaresOtherThan(found)),
           _leftOut(leftOut.begin(), leftOut.end()) {}
 
     // The first object or field of the wanted ones that is another in the found ones; none where

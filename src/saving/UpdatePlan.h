@@ -87,12 +87,23 @@ private:
         Entry opened = none;             // what is new is all that stands in this element
     };
 
+    // Both lists of items; what each was read from, and the wrapper around them.
+    struct List {
+        std::vector<Shown> was, is;
+        std::vector<std::uint32_t> uses; // of what was
+        Entry wrapper = none;
+        std::uint32_t binding = 0;
+        const FieldPlan* plan = nullptr;
+        Shown field = none; // in the later writing
+    };
+
     // UpdatePlan.cpp
     // The uses of a field; of null, what was kept.
     std::span<const std::uint32_t> usesOf(std::uint32_t owner, const FieldPlan* field) const;
     void compareObject(Shown before, Shown after, std::uint32_t owner, const Context* parent,
                        std::size_t ordinal);
     void compareField(const Context& context, Shown before, Shown after, std::size_t ordinal);
+    void compareInside(const Context& context, Shown before, Shown after, std::size_t ordinal);
     void compareSingle(const Context& context, Shown was, Shown is, Shown field,
                        std::size_t ordinal);
     void compareValue(const Context& context, std::uint32_t use, Shown was, Shown is,
@@ -102,12 +113,11 @@ private:
     Entry parentOf(Entry entry) const noexcept { return _source.markup.parent(entry); }
     const ReadingTrace::Use& use(std::uint32_t number) const { return _source.read.uses()[number]; }
     bool areSame(Shown before, Shown after) const {
-        return !_comparesAll && _source.before[before].hash == _source.after[after].hash;
+        return _source.before[before].hash == _source.after[after].hash;
     }
     bool isText(Shown after) const { return _source.after[after].kind == WritingTrace::Kind::text; }
 
     // UpdateLists.cpp
-    struct List;
     void compareList(const Context& context, Shown before, Shown after, std::size_t ordinal);
     bool findEntries(const Context& context, List& list) const;
     bool findObjects(List& list) const;

@@ -333,7 +333,7 @@ TEST(UpdateNamespaces, CarriesDeclarationsThatAProgramChanges) {
         "</Feed><Item><id node='attribute'/></Item>");
     const std::string document = "<feed xmlns:g='urn:g'\n      xmlns:h='urn:h'>\n"
                                  "    <item xmlns=\"urn:i\" id=\"1\"/><!-- one -->\n"
-                                 "    <item id=\"2\"/>\n</feed>";
+                                 "    <item id=\"&#50;\"/>\n</feed>";
     const auto declare = [](const qx::Value& object,
                             std::vector<std::pair<const char*, const char*>> declarations) {
         const auto all = qx::make<qx::Array>();
@@ -355,7 +355,7 @@ TEST(UpdateNamespaces, CarriesDeclarationsThatAProgramChanges) {
     declare(items->at(0), {{"", "urn:j"}});
     edits::apply(feed, "move all[0] 1");
     EXPECT_EQ(saved(), "<feed xmlns:k=\"a&amp;b\"\n      xmlns:h='urn:H'>\n"
-                       "    <item id=\"2\"/>\n"
+                       "    <item id=\"&#50;\"/>\n"
                        "    <item xmlns=\"urn:j\" id=\"1\"/><!-- one -->\n</feed>");
     marshaller->setUsingNamespaceURIs(false);
     edits::apply(feed, "move all[0] 1");
