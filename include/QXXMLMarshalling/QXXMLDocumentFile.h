@@ -17,7 +17,7 @@
 
 class QX_API QXXMLDocumentFile final : public qx::Object {
 public:
-    // Null with the errors of QXXMLMarshaller::readFile().
+    // Null with the errors of QXXMLMarshaller::readFile(), and 256 for a pipe or a device.
     static qx::Ref<QXXMLDocumentFile> open(const qx::String& path,
                                            qx::Ref<QXXMLMarshaller> marshaller,
                                            qx::Ref<qx::Error>* error = nullptr);
@@ -75,10 +75,18 @@ private:
     friend qx::Ref<QXXMLDocumentFile> qx::make<QXXMLDocumentFile>();
 
     qx::Result<QXXMLUpdate> update(const qx::Ref<qx::Data>& text) const;
-    bool write(const qx::String& path, const qx::Ref<qx::Data>& bytes, qx::Ref<qx::Error>* error);
+    // Where the undo manager stood when a save began: code of the host's may edit the object while
+    // that goes on.
+    struct SavePoint {
+        explicit SavePoint(const QXXMLDocumentFile& file);
+        const qx::Ref<qx::UndoManager> undoManager;
+        const std::uint64_t position;
+    };
+    bool write(const qx::String& path, const qx::Ref<qx::Data>& bytes, const SavePoint& point,
+               qx::Ref<qx::Error>* error);
     bool carryOver(const qx::Ref<qx::Data>& text, const QXXMLUpdate& update,
                    const qx::Ref<qx::Data>& theirs, qx::Ref<qx::Error>* error);
-    void setBase(qx::Ref<qx::Data> text);
+    void setBase(qx::Ref<qx::Data> text, const SavePoint& point);
 
     qx::String _path;
     qx::Ref<QXXMLMarshaller> _marshaller;

@@ -60,7 +60,8 @@ public:
     static qx::Result<QXXMLUpdate> updatedText(QXXMLMarshaller& marshaller, qx::XMLBytes original,
                                                const qx::Value& object);
     // The same, and the file gets the new bytes, in one step; untouched where there are no edits,
-    // and on failure. Besides the errors above, those of reading and of writing files, and
+    // and on failure. Besides the errors above, those of reading and of writing files (256 for a
+    // pipe or a device, too), and
     //   -232  "The file has changed since it was read: %@"
     static qx::Result<QXXMLUpdate> updateFile(QXXMLMarshaller& marshaller, const qx::Value& object,
                                               const qx::String& path);

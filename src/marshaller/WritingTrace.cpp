@@ -147,7 +147,9 @@ void WritingTrace::noteContent() {
 
 void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element,
                                const Object& object, ObjectAccess& access) {
-    if (!_open.empty() && placed(_shown[_open.back()].around).element != element)
+    const bool isFlattened =
+        !_open.empty() && placed(_shown[_open.back()].around).element == element;
+    if (!_open.empty() && !isFlattened)
         noteContent();
     add(Kind::object).place = static_cast<std::uint32_t>(_objects.size());
     _objects.push_back({&plan, element, object.isa().isStruct() ? nullptr : &object});
@@ -156,8 +158,11 @@ void WritingTrace::enterObject(const ClassPlan& plan, XMLDraft::Element* element
     if (!access.mayKeepXML(object))
         return;
     KeptList kept;
-    listAll(kept.declarations, access.getKept(object, KeptXML::namespaces),
-            XMLNodeKind::namespaceDeclaration);
+    if (_declares && !isFlattened) // else they are those of the object around it
+        listAll(kept.declarations, access.getKept(object, KeptXML::namespaces),
+                XMLNodeKind::namespaceDeclaration);
+    for (const Kept& each : kept.declarations)
+        _declarationsHash = mixed(_declarationsHash, hashOfText(each.text));
     if (_keepsUnknown) {
         listAll(kept.attributes, access.getKept(object, KeptXML::attributes),
                 XMLNodeKind::attribute);

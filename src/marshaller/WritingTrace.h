@@ -70,8 +70,8 @@ public:
 
     // One that has nothing but a hash lists what is open, no more.
     enum class Extent : std::uint8_t { all, hash };
-    explicit WritingTrace(bool keepsUnknown, Extent extent = Extent::all) noexcept
-        : _keepsUnknown(keepsUnknown), _extent(extent) {}
+    WritingTrace(bool keepsUnknown, bool declares, Extent extent) noexcept
+        : _keepsUnknown(keepsUnknown), _declares(declares), _extent(extent) {}
     // About how many entries there will be, with so many bytes of text.
     void reserve(std::size_t entries, std::size_t textSize) {
         _shown.reserve(entries);
@@ -108,6 +108,11 @@ public:
     }
     // Of the hidden values and their fields, where the hash above is known without more work.
     std::uint64_t hiddenHash() const noexcept { return _hiddenHash; }
+    // Whether objects may keep other declarations than there. They are in no hash above, and count
+    // for nothing where none are kept: an object need not have any to say what is in its document.
+    bool declaresOtherThan(const WritingTrace& other) const noexcept {
+        return _declarationsHash != 0 && _declarationsHash != other._declarationsHash;
+    }
     // Whether there is a hidden value.
     bool hidesSome() const noexcept { return _hidesSome; }
     // Calls visit(Number) for each entry directly inside.
@@ -158,9 +163,11 @@ private:
     void hashAnew();
 
     const bool _keepsUnknown;
+    const bool _declares; // what objects keep of namespaces
     const Extent _extent;
     std::uint64_t _hash = 0;
     std::uint64_t _hiddenHash = 0;
+    std::uint64_t _declarationsHash = 0;
     bool _isHashed = true; // whether the hashes are right
     BulkArray<Shown> _shown;
     BulkArray<Placed> _objects;

@@ -24,7 +24,7 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
     Ref<Error> error;
     if (!prepare(&error))
         return error;
-    if (_source->hash() == _after.hash())
+    if (_source->hash() == _after.hash() && !_after.trace().declaresOtherThan(_source->written()))
         return unchanged();
     prepareWriter();
     Ref<Error> why;
@@ -169,7 +169,8 @@ bool DocumentUpdate::isRight(const UpdatePlan& plan, QXXMLUpdate& update, Obstac
         if (!again)
             return false;
         if (again->hash() == _after.hash() &&
-            again->written().hiddenHash() == _after.trace().hiddenHash())
+            again->written().hiddenHash() == _after.trace().hiddenHash() &&
+            !_after.trace().declaresOtherThan(again->written()))
             return true;
     }
     const auto again = read(Extent::all);

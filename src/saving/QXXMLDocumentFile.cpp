@@ -42,7 +42,7 @@ Ref<QXXMLDocumentFile> QXXMLDocumentFile::open(const String& path, Ref<QXXMLMars
     qx::detail::reset(error);
     if (!marshaller)
         marshaller = QXXMLMarshaller::initWithMapping(nullptr);
-    auto text = qx::readFile(path, error);
+    auto text = qx::readFile(path, error, qx::ReadableFiles::regular);
     if (!text)
         return nullptr;
     Ref<Error> problem;
@@ -65,10 +65,13 @@ void QXXMLDocumentFile::setUndoManager(Ref<qx::UndoManager> manager) {
     _undoManager = std::move(manager);
 }
 
-void QXXMLDocumentFile::setBase(Ref<Data> text) {
+QXXMLDocumentFile::SavePoint::SavePoint(const QXXMLDocumentFile& file)
+    : undoManager(file._undoManager), position(undoManager ? undoManager->position() : 0) {}
+
+void QXXMLDocumentFile::setBase(Ref<Data> text, const SavePoint& point) {
     _text = std::move(text);
-    if (_undoManager)
-        _undoManager->setSavedMark();
+    if (point.undoManager)
+        point.undoManager->setSavedMark(point.position);
 }
 
 // Code of the host's may let go of the file while the object is read, or save it.
@@ -86,16 +89,18 @@ bool QXXMLDocumentFile::isEdited() const {
     return !update || !update->edits().empty();
 }
 
-bool QXXMLDocumentFile::write(const String& path, const Ref<Data>& bytes, Ref<Error>* error) {
+bool QXXMLDocumentFile::write(const String& path, const Ref<Data>& bytes, const SavePoint& point,
+                              Ref<Error>* error) {
     if (!qx::writeFileAtomically(path, bytes->view(), error))
         return false;
-    setBase(bytes);
+    setBase(bytes, point);
     return true;
 }
 
 bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     qx::detail::reset(error);
     const Ref<QXXMLDocumentFile> kept(this);
+    const SavePoint point(*this);
     const Ref<Data> text = _text;
     const auto update = this->update(text);
     if (!update) {
@@ -103,7 +108,7 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
             *error = update.error();
         return false;
     }
-    const auto theirs = qx::readFile(_path, error);
+    const auto theirs = qx::readFile(_path, error, qx::ReadableFiles::regular);
     if (!theirs)
         return false;
     const bool isSame = theirs->view() == text->view();
@@ -112,21 +117,22 @@ bool QXXMLDocumentFile::save(Ref<Error>* error, Changed changed) {
     if (!isSame && changed == Changed::carryOver)
         return carryOver(text, *update, theirs, error);
     if (isSame && update->edits().empty()) {
-        setBase(text);
+        setBase(text, point);
         return true;
     }
-    return write(_path, update->bytes(), error);
+    return write(_path, update->bytes(), point, error);
 }
 
 bool QXXMLDocumentFile::saveAs(const String& path, Ref<Error>* error) {
     qx::detail::reset(error);
     const Ref<QXXMLDocumentFile> kept(this);
+    const SavePoint point(*this);
     const Ref<Data> text = _text;
     const String to = path; // which may be the file's own
     const auto update = this->update(text);
     if (!update && error != nullptr)
         *error = update.error();
-    if (!update || !write(to, update->bytes(), error))
+    if (!update || !write(to, update->bytes(), point, error))
         return false;
     _path = to;
     return true;
@@ -136,10 +142,10 @@ bool QXXMLDocumentFile::revert(Ref<Error>* error) {
     qx::detail::reset(error);
     const Ref<QXXMLDocumentFile> kept(this);
     const ExactKeeping exact(_marshaller);
-    auto text = qx::readFile(_path, error);
+    auto text = qx::readFile(_path, error, qx::ReadableFiles::regular);
     if (!text || !_marshaller->readStringInto(_root, *text, error))
         return false;
-    setBase(std::move(text));
+    setBase(std::move(text), SavePoint(*this));
     return true;
 }
 
@@ -166,9 +172,10 @@ bool QXXMLDocumentFile::carryOver(const Ref<Data>& text, const QXXMLUpdate& upda
             *error = std::move(problem);
         return false;
     }
-    if (!write(_path, bytes, error) || !_marshaller->readStringInto(_root, *bytes, error))
+    if (!write(_path, bytes, SavePoint(*this), error) ||
+        !_marshaller->readStringInto(_root, *bytes, error))
         return false;
-    setBase(bytes);
+    setBase(bytes, SavePoint(*this));
     return true;
 }
 

@@ -17,13 +17,13 @@ Result<QXXMLUpdate> QXXMLUpdate::updatedText(QXXMLMarshaller& marshaller, qx::XM
 Result<QXXMLUpdate> QXXMLUpdate::updateFile(QXXMLMarshaller& marshaller, const qx::Value& object,
                                             const qx::String& path) {
     Ref<Error> error;
-    const auto original = qx::readFile(path, &error);
+    const auto original = qx::readFile(path, &error, qx::ReadableFiles::regular);
     if (!original)
         return error;
     auto update = updatedText(marshaller, *original, object);
     if (!update || update->edits().empty())
         return update;
-    const auto now = qx::readFile(path, &error);
+    const auto now = qx::readFile(path, &error, qx::ReadableFiles::regular);
     const bool isSame = now && now->view() == original->view();
     if (now && !isSame)
         qx::fail(&error, qx::errors::fileHasChanged, path);

@@ -15,7 +15,7 @@ ShownComparison::Shown ShownComparison::firstDifference() {
 ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
     const auto& is = _wanted[wanted];
     const auto& other = _found[found];
-    if (is.hash == other.hash)
+    if (is.hash == other.hash && !_comparesDeclarations)
         return none;
     if (is.kind != other.kind)
         return differs(wanted, found);
@@ -26,7 +26,9 @@ ShownComparison::Shown ShownComparison::compare(Shown wanted, Shown found) {
         return differs(wanted, found);
     if (const Shown different = compareInside(wanted, found); different != none)
         return different;
-    return is.kind == Kind::field || keepTheSame(wanted, found) ? none : differs(wanted, found);
+    const bool isSame =
+        is.kind == Kind::field || (keepTheSame(wanted, found) && declareTheSame(wanted, found));
+    return isSame ? none : differs(wanted, found);
 }
 
 ShownComparison::Shown ShownComparison::compareInside(Shown wanted, Shown found) {
@@ -87,6 +89,20 @@ bool ShownComparison::keepTheSame(Shown wanted, Shown found) const {
             return false;
     }
     return true;
+}
+
+bool ShownComparison::declareTheSame(Shown wanted, Shown found) const {
+    const auto* const is = _wanted.keptOf(wanted);
+    if (!_comparesDeclarations || is == nullptr || is->declarations.empty())
+        return true;
+    const auto textsOf = [](const WritingTrace::KeptList* list) {
+        std::set<std::string> texts;
+        for (const auto& each :
+             list != nullptr ? list->declarations : std::vector<WritingTrace::Kept>())
+            texts.insert(each.text);
+        return texts;
+    };
+    return textsOf(is) == textsOf(_found.keptOf(found));
 }
 
 void ShownComparison::forEachUnshown(const std::function<void(Shown)>& visit) const {

@@ -20,6 +20,7 @@ public:
     ShownComparison(const WritingTrace& wanted, const WritingTrace& found,
                     IsDouble isDouble = nullptr, const LeftOut& leftOut = {})
         : _wanted(wanted), _found(found), _isDouble(std::move(isDouble)),
+          _comparesDeclarations(wanted.declaresOtherThan(found)),
           _leftOut(leftOut.begin(), leftOut.end()) {}
 
     // The first object or field of the wanted ones that is another in the found ones; none where
@@ -38,10 +39,13 @@ private:
         return wanted;
     }
     bool keepTheSame(Shown wanted, Shown found) const;
+    bool declareTheSame(Shown wanted, Shown found) const;
     std::vector<std::string> kept(const WritingTrace& trace, Shown object, bool attributes) const;
 
     const WritingTrace& _wanted;
     const WritingTrace& _found;
+    // Whether objects have to keep the same declarations, too: those that keep any.
+    const bool _comparesDeclarations;
     Shown _different = none; // of the found ones
     const IsDouble _isDouble;
     // What the wanted ones keep and count as nothing: objects and texts.

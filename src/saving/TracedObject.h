@@ -18,7 +18,8 @@ class TracedWriting {
 public:
     explicit TracedWriting(const QXXMLMarshaller& marshaller,
                            WritingTrace::Extent extent = WritingTrace::Extent::all)
-        : _mapping(marshaller.mapping()), _trace(marshaller.saveUnknownXML(), extent) {}
+        : _mapping(marshaller.mapping()),
+          _trace(marshaller.saveUnknownXML(), marshaller.isUsingNamespaceURIs(), extent) {}
     TracedWriting(const TracedWriting&) = delete;
     TracedWriting& operator=(const TracedWriting&) = delete;
 

@@ -34,6 +34,56 @@ void UpdatePlan::compareKept(const Context& context) {
         countDoubles(*_source.after.plan(context.after), was.attributes, is.attributes);
         compareKeptAttributes(context, was, is);
     }
+    if (!is.declarations.empty() && !areEqual(was.declarations, is.declarations))
+        compareDeclarations(context, was, is);
+}
+
+// Declarations stay what they are while the object keeps none: it may have been made by a program.
+void UpdatePlan::compareDeclarations(const Context& context, const WritingTrace::KeptList& was,
+                                     const WritingTrace::KeptList& is) {
+    std::unordered_map<String, const Kept*> now;
+    for (const Kept& each : is.declarations)
+        now.try_emplace(each.node->name(), &each);
+    std::vector<Entry> entries;
+    for (const std::uint32_t number : usesOf(context.owner, nullptr))
+        if (use(number).form == Form::declaration)
+            entries.push_back(use(number).entry);
+    for (std::size_t i = 0; i < was.declarations.size(); ++i) {
+        const auto kept = now.find(was.declarations[i].node->name());
+        const Kept* const found = kept != now.end() ? kept->second : nullptr;
+        if (found != nullptr)
+            now.erase(kept);
+        if (found != nullptr && found->text == was.declarations[i].text)
+            continue;
+        if (i >= entries.size() || !_source.markup[entries[i]].isPlaced())
+            return fail(context.after);
+        const SourceMarkup::Spot spot = _source.markup[entries[i]];
+        const char quote = _source.markup.text()[spot.end - 1];
+        if (found != nullptr)
+            add(spot.insideBegin, spot.insideEnd,
+                _source.writer.attributeValue(found->node->stringValue().view(), quote),
+                context.after);
+        else
+            add(blanksBefore(spot.begin), spot.end, {}, context.after);
+    }
+    for (const Kept& each : is.declarations)
+        if (const auto left = now.find(each.node->name());
+            left != now.end() && left->second == &each)
+            addToTag(context,
+                     each.node->name().isEmpty() ? "xmlns" : "xmlns:" + each.node->name().str(),
+                     each);
+}
+
+// Behind the element's name.
+void UpdatePlan::addToTag(const Context& context, std::string_view name, const Kept& kept) {
+    const SourceMarkup::Spot tag = _source.markup[context.entry];
+    if (!tag.isPlaced())
+        return fail(context.after);
+    const auto nameEnd =
+        tag.begin + 1 +
+        static_cast<SourceMarkup::Offset>(_source.document.writtenName(context.entry).size());
+    add(nameEnd, nameEnd, _source.writer.attribute(name, kept.node->stringValue().view()),
+        context.after);
 }
 
 // What a field took, too, is as old in the object as the object's reading. Where fields took all of
@@ -152,19 +202,9 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
         else
             add(blanksBefore(spot.begin), spot.end, {}, context.after);
     }
-    const SourceMarkup::Spot& tag = _source.markup[context.entry];
-    if (known.size() == is.attributes.size())
-        return;
-    if (!tag.isPlaced())
-        return fail(context.after);
-    const auto nameEnd =
-        tag.begin + 1 +
-        static_cast<SourceMarkup::Offset>(_source.document.writtenName(context.entry).size());
     for (const Kept& each : is.attributes)
         if (!known.contains(&each) && mayAddKept(context.after, each.text))
-            add(nameEnd, nameEnd,
-                _source.writer.attribute(each.node->name().view(), each.node->stringValue().view()),
-                context.after);
+            addToTag(context, each.node->name().view(), each);
 }
 
 } // namespace qx::detail

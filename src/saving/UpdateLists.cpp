@@ -10,16 +10,6 @@ namespace qx::detail {
 
 using Form = ReadingTrace::Form;
 
-// Both lists of items; what each was read from, and the wrapper around them.
-struct UpdatePlan::List {
-    std::vector<Shown> was, is;
-    std::vector<std::uint32_t> uses; // of what was
-    Entry wrapper = none;
-    std::uint32_t binding = 0;
-    const FieldPlan* plan = nullptr;
-    Shown field = none; // in the later writing
-};
-
 void UpdatePlan::compareList(const Context& context, Shown before, Shown after,
                              std::size_t ordinal) {
     List list;
@@ -193,7 +183,8 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
         const std::size_t was = matching.was[i];
         if (was != ListMatching::none && matching.stays[i]) {
             previous = was;
-            if (before[was].hash != now[i].hash || !_anew.empty())
+            const bool isSame = areSame(list.was[was], list.is[i]) && _anew.empty();
+            if (!isSame || (_comparesAll && !isText(list.is[i])))
                 compareValue(context, list.uses[was], list.was[was], list.is[i], ordinal);
             continue;
         }

@@ -8,7 +8,8 @@ namespace qx::detail {
 using Form = ReadingTrace::Form;
 
 UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept)
-    : _source(source), _anew(anew), _addsKept(addsKept) {
+    : _source(source), _anew(anew), _addsKept(addsKept),
+      _comparesAll(source.after.declaresOtherThan(source.before)) {
     const auto& uses = source.read.uses();
     const auto fieldOf = [&](std::uint32_t use) { return uses[use].field; };
     // By owner in one pass, then each owner's by field.
@@ -73,7 +74,7 @@ void UpdatePlan::compareObject(Shown before, Shown after, std::uint32_t owner,
         const String name = _source.document.name(element);
         return replaceElement(element, after, &name);
     }
-    if (_source.before[before].hash == _source.after[after].hash)
+    if (!_comparesAll && areSame(before, after))
         return;
     const Context context{before, after, owner, parent, ordinal, element};
     std::size_t field = 0;
@@ -87,14 +88,33 @@ void UpdatePlan::compareObject(Shown before, Shown after, std::uint32_t owner,
 
 void UpdatePlan::compareField(const Context& context, Shown before, Shown after,
                               std::size_t ordinal) {
-    if (_source.before[before].hash == _source.after[after].hash)
-        return;
+    if (areSame(before, after))
+        return _comparesAll ? compareInside(context, before, after, ordinal) : void();
     if (_source.before[before].isList || _source.after[after].isList)
         return compareList(context, before, after, ordinal);
     const auto was = _source.before.shownValues(before);
     const auto is = _source.after.shownValues(after);
     compareSingle(context, was.empty() ? none : was.front(), is.empty() ? none : is.front(), after,
                   ordinal);
+}
+
+// Of a field that says the same, the objects. Where it does not show what they were read from,
+// nothing is changed in them.
+void UpdatePlan::compareInside(const Context& context, Shown before, Shown after,
+                               std::size_t ordinal) {
+    List list;
+    list.was = _source.before.shownValues(before);
+    list.is = _source.after.shownValues(after);
+    list.plan = _source.after[after].field;
+    if (_source.after[after].isList && !findEntries(context, list))
+        return;
+    if (!_source.after[after].isList)
+        for (const std::uint32_t number : usesOf(context.owner, list.plan))
+            if (use(number).form != Form::wrapper)
+                list.uses = {number};
+    for (std::size_t i = 0; i < list.is.size() && i < list.uses.size(); ++i)
+        if (!isText(list.is[i]) && use(list.uses[i]).made != none)
+            compareObject(list.was[i], list.is[i], use(list.uses[i]).made, &context, ordinal);
 }
 
 void UpdatePlan::compareSingle(const Context& context, Shown was, Shown is, Shown field,

@@ -87,12 +87,23 @@ private:
         Entry opened = none;             // what is new is all that stands in this element
     };
 
+    // Both lists of items; what each was read from, and the wrapper around them.
+    struct List {
+        std::vector<Shown> was, is;
+        std::vector<std::uint32_t> uses; // of what was
+        Entry wrapper = none;
+        std::uint32_t binding = 0;
+        const FieldPlan* plan = nullptr;
+        Shown field = none; // in the later writing
+    };
+
     // UpdatePlan.cpp
     // The uses of a field; of null, what was kept.
     std::span<const std::uint32_t> usesOf(std::uint32_t owner, const FieldPlan* field) const;
     void compareObject(Shown before, Shown after, std::uint32_t owner, const Context* parent,
                        std::size_t ordinal);
     void compareField(const Context& context, Shown before, Shown after, std::size_t ordinal);
+    void compareInside(const Context& context, Shown before, Shown after, std::size_t ordinal);
     void compareSingle(const Context& context, Shown was, Shown is, Shown field,
                        std::size_t ordinal);
     void compareValue(const Context& context, std::uint32_t use, Shown was, Shown is,
@@ -101,10 +112,12 @@ private:
     void fail(Shown shown) { _failures.push_back(shown); }
     Entry parentOf(Entry entry) const noexcept { return _source.markup.parent(entry); }
     const ReadingTrace::Use& use(std::uint32_t number) const { return _source.read.uses()[number]; }
+    bool areSame(Shown before, Shown after) const {
+        return _source.before[before].hash == _source.after[after].hash;
+    }
     bool isText(Shown after) const { return _source.after[after].kind == WritingTrace::Kind::text; }
 
     // UpdateLists.cpp
-    struct List;
     void compareList(const Context& context, Shown before, Shown after, std::size_t ordinal);
     bool findEntries(const Context& context, List& list) const;
     bool findObjects(List& list) const;
@@ -163,8 +176,11 @@ private:
                       const std::vector<WritingTrace::Kept>& is);
     void compareKeptChildren(const Context& context, const WritingTrace::KeptList& was,
                              const WritingTrace::KeptList& is);
+    void compareDeclarations(const Context& context, const WritingTrace::KeptList& was,
+                             const WritingTrace::KeptList& is);
     void compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
                                const WritingTrace::KeptList& is);
+    void addToTag(const Context& context, std::string_view name, const WritingTrace::Kept& kept);
     bool mayAddKept(Shown object, const std::string& text);
     std::vector<Entry> entriesOfKept(const Context& context,
                                      const std::vector<WritingTrace::Kept>& kept) const;
@@ -176,6 +192,8 @@ private:
     const UpdateSource& _source;
     const std::set<Shown>& _anew;
     const bool _addsKept;
+    // Whether objects have to be compared that show the same: they may declare something else.
+    const bool _comparesAll;
     NewKept _newKept;
     EditList _all;
     EditList* _edits = &_all; // those of an item that moves are its own

@@ -183,11 +183,20 @@ bool UndoManager::canUndo() const noexcept {
 
 bool UndoManager::canRedo() const noexcept { return _state->history.redoStack().count != 0; }
 
-void UndoManager::setSavedMark() {
+std::uint64_t UndoManager::position() {
     const Ref<UndoManager> kept(this);
     if (_state->outermostOpenedByItself && _state->open.size() == 1)
         _state->closeGroup();
-    _state->savedPosition = _state->position;
+    return _state->position;
+}
+
+void UndoManager::setSavedMark() {
+    const Ref<UndoManager> kept(this);
+    setSavedMark(position());
+}
+
+void UndoManager::setSavedMark(std::uint64_t position) noexcept {
+    _state->savedPosition = position;
 }
 
 bool UndoManager::isAtSavedMark() const noexcept {

@@ -1,6 +1,6 @@
 // What hostile documents cost at most, counted by what the library and the C parser allocate:
 // parsing one takes 64 MiB and eight times its size, and binding one is bounded by what a reading
-// may make and keep. And how often memory is taken for plain structs.
+// may make and keep. And how often memory is taken for plain structs, and for saving many items.
 
 #include <QXXMLMarshalling/QXXMLMarshalling.h>
 
@@ -150,6 +150,50 @@ void readStructs() {
     expectWithin(count + shared, taken, "pieces of memory for structs");
 }
 
+// All items edited, reversed or shuffled.
+void arrange(qx::Array& items, int how) {
+    const std::size_t count = items.count();
+    for (std::size_t i = 0; i < count; ++i) {
+        const std::size_t other = how == 1 ? count - 1 - i : i * 7919 % count;
+        const qx::Value item = items.at(i);
+        if (how == 0)
+            item.object()->setValueForKey("new", "text");
+        if (how == 0 || other <= i)
+            continue;
+        items.replace(i, items.at(other));
+        items.replace(other, item);
+    }
+}
+
+// How much memory is taken, and how often, grows with the number of items, however they change.
+void save() {
+    const auto marshaller =
+        marshallerFor("<class name='L'><map-to xml='l'/><field name='items' type='I' "
+                      "collection='array'><bind-xml name='i'/></field></class><class name='I'>"
+                      "<field name='id'><bind-xml node='attribute'/></field>"
+                      "<field name='text'><bind-xml node='text'/></field></class>");
+    for (const int how : {0, 1, 2}) {
+        std::size_t most[2] = {}, often[2] = {};
+        for (const std::size_t count : {std::size_t(2'000), std::size_t(100'000)}) {
+            std::string document = "<l>\n";
+            for (std::size_t i = 0; i < count; ++i)
+                document += "  <i id='" + std::to_string(i) + "'>Pens</i>\n";
+            document += "</l>\n";
+            const auto list = marshaller->readString(document);
+            arrange(*list->valueForKey("items").as<qx::Array>(), how);
+            const std::size_t before = pieces;
+            const bool isLarge = count > 2'000;
+            most[isLarge] = peakOf([&] {
+                const auto update = QXXMLUpdate::updatedText(*marshaller, document, list);
+                isFailed |= !update || update->edits().empty();
+            });
+            often[isLarge] = pieces - before;
+        }
+        expectWithin(60 * most[0], most[1], "memory of a save, of 50 times the items");
+        expectWithin(60 * often[0], often[1], "pieces of memory of a save, of 50 times the items");
+    }
+}
+
 } // namespace
 
 void* operator new(std::size_t size) { return counted(std::malloc(size)); }
@@ -172,5 +216,6 @@ int main() {
     parse();
     keep();
     readStructs();
+    save();
     return isFailed ? 1 : 0;
 }

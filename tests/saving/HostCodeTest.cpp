@@ -149,3 +149,15 @@ TEST_F(HostCode, AFileThatChangesWhileItIsUpdatedIsNotOverwritten) {
     EXPECT_EQ(folder.read("n.xml"), theirs);
     EXPECT_EQ(QXXMLDocumentFile::open(path, nullptr), nullptr);
 }
+
+TEST_F(HostCode, EditsWhileASaveGoesOnAreNotSaved) {
+    open();
+    const auto undo = qx::make<qx::UndoManager>();
+    file->setUndoManager(undo);
+    const auto edit = [&] { undo->registerUndo(*file->root<Note>(), [](Note&) {}); };
+    edit();
+    EXPECT_TRUE(Meddling::during(0, edit, [&] { EXPECT_TRUE(file->save()); }));
+    EXPECT_TRUE(file->isEdited());
+    EXPECT_TRUE(file->save());
+    EXPECT_FALSE(file->isEdited());
+}

@@ -326,3 +326,38 @@ TEST(UpdateAgain, SavesAnObjectThatKeepsWhatIsGone) {
         EXPECT_EQ(text, each.saved);
     }
 }
+
+TEST(UpdateNamespaces, CarriesDeclarationsThatAProgramChanges) {
+    const auto marshaller = scenario::marshaller(
+        "<Feed xml='feed'><title node='element'/><all type='Item' collection='array' name='item'/>"
+        "</Feed><Item><id node='attribute'/></Item>");
+    const std::string document = "<feed xmlns:g='urn:g'\n      xmlns:h='urn:h'>\n"
+                                 "    <item xmlns=\"urn:i\" id=\"1\"/><!-- one -->\n"
+                                 "    <item id=\"&#50;\"/>\n</feed>";
+    const auto declare = [](const qx::Value& object,
+                            std::vector<std::pair<const char*, const char*>> declarations) {
+        const auto all = qx::make<qx::Array>();
+        for (const auto& [prefix, URI] : declarations)
+            all->add(qx::XMLNode::namespaceWithName(prefix, URI));
+        object.object()->setValueForKey(all, "__namespaces");
+    };
+    const auto feed = marshaller->readString(document);
+    const auto items = feed->valueForKey("all").as<qx::Array>();
+    const auto saved = [&] {
+        const auto update = QXXMLUpdate::updatedText(*marshaller, document, feed);
+        return update ? std::string(update->bytes()->view()) : support::told(update.error());
+    };
+    // What keeps none says nothing of them.
+    declare(feed, {});
+    items->at(0).object()->setValueForKey(qx::Value(), "__namespaces");
+    EXPECT_EQ(saved(), document);
+    declare(feed, {{"h", "urn:H"}, {"k", "a&b"}});
+    declare(items->at(0), {{"", "urn:j"}});
+    edits::apply(feed, "move all[0] 1");
+    EXPECT_EQ(saved(), "<feed xmlns:k=\"a&amp;b\"\n      xmlns:h='urn:H'>\n"
+                       "    <item id=\"&#50;\"/>\n"
+                       "    <item xmlns=\"urn:j\" id=\"1\"/><!-- one -->\n</feed>");
+    marshaller->setUsingNamespaceURIs(false);
+    edits::apply(feed, "move all[0] 1");
+    EXPECT_EQ(saved(), document);
+}

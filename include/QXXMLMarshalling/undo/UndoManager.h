@@ -19,6 +19,7 @@
 
 #include <QXXMLMarshalling/model/Object.h>
 
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <vector>
@@ -101,6 +102,10 @@ public:
     // begins. Setting it ends the group that opened by itself; what another open group holds counts
     // as changed until it is undone.
     void setSavedMark();
+    // The same for a save that takes its time: what is registered after position() is not saved.
+    // Asking for it ends the group that opened by itself, too.
+    std::uint64_t position();
+    void setSavedMark(std::uint64_t position) noexcept;
     bool isAtSavedMark() const noexcept;
 
     // Forgets all actions, those in open groups too; the groups stay open, but for the one that
