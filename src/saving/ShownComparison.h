@@ -44,12 +44,12 @@ private:
 
     const WritingTrace& _wanted;
     const WritingTrace& _found;
+    const IsDouble _isDouble;
     // Whether objects have to keep the same declarations, too: those that keep any.
     const bool _comparesDeclarations;
-    Shown _different = none; // of the found ones
-    const IsDouble _isDouble;
     // What the wanted ones keep and count as nothing: objects and texts.
     const std::set<std::pair<Shown, std::string>> _leftOut;
+    Shown _different = none; // of the found ones
 };
 
 } // namespace qx::detail

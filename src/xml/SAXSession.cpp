@@ -287,8 +287,8 @@ void SAXSession::startDocument() {
 void SAXSession::startElement(XMLNames::Name local, XMLNames::Name prefix, int namespaceCount,
                               const xmlChar** namespaces, int attributeCount, int defaultedCount,
                               const xmlChar** attributes) {
-    const void* start = ::memrchr(_text.data(), isInsideReference() ? '&' : '<', offset());
-    _tagOffset = start != nullptr ? static_cast<const char*>(start) - _text.data() : 0;
+    const std::size_t start = _text.substr(0, offset()).rfind(isInsideReference() ? '&' : '<');
+    _tagOffset = start != std::string_view::npos ? start : 0;
     if (_tagOffset < _origin.added)
         setLine(*_context->input, ++_addedTags);
     if (_attributeDefaults != 0)
