@@ -1,0 +1,180 @@
+// Elements of their class's usual form are bound straight, all others the general way, which a
+// report handler brings about for every element: what comes of both is the same.
+
+#include "Structs.h"
+
+#include <QXXMLMarshalling/QXMappedObject.h>
+
+using namespace structs;
+
+namespace {
+
+struct Leaf {
+    std::string a = "none";
+    int n = 1;
+};
+// Its own constructor gives its members other values than they have by themselves.
+struct Branch {
+    Branch() : leaf{"owner's", 7}, maybe(Leaf{"owner's", 8}), leaves(3, Leaf{"owner's", 9}) {}
+    std::string a;
+    Leaf leaf;
+    std::optional<Leaf> maybe;
+    std::vector<Leaf> leaves;
+    void setWord(const std::string& word) {
+        if (word == "thrown")
+            throw std::runtime_error(word);
+        _word = word;
+    }
+    const std::string& word() const { return _word; }
+
+private:
+    std::string _word;
+};
+
+// What it is set shows in `heard`, whoever hears of it: the setter begins to observe.
+class Listener : public QXMappedObject {
+public:
+    static inline std::string heard;
+    std::string a;
+    int n = 0;
+    const qx::Value& inner() const { return _inner; }
+    void setInner(const qx::Value& inner) {
+        _inner = inner;
+        _token = observe("inner.a", [](const qx::ValueChange& change) {
+            heard += support::oneLine(change.newValue) + ";";
+        });
+    }
+
+private:
+    qx::Value _inner;
+    qx::ObservationToken _token;
+};
+
+constexpr const char* classes =
+    "<Record xml='r'><a node='attribute'/><n type='int' node='element'/><b/><c type='int' "
+    "name='i'/>"
+    "<text node='text'/></Record>"
+    "<List xml='l'><a node='attribute'/><items type='Leaf' collection='array' name='leaf'/>"
+    "<numbers type='int' collection='array' name='number' location='numbers'/>"
+    "<must node='element' required='true'/></List>"
+    "<Leaf xml='leaf'><a/><n type='int' node='attribute'/></Leaf>"
+    "<Branch xml='branch'><a node='attribute'/><leaf type='Leaf' node='element'/>"
+    "<maybe type='Leaf' node='element'/><leaves type='Leaf' collection='array' name='item'/>"
+    "<word node='element'/></Branch>"
+    "<Listener xml='listener'><a node='attribute'/><n node='element'/>"
+    "<inner type='Leaf' node='element'/></Listener>";
+
+class UsualForm : public testing::Test {
+protected:
+    void SetUp() override {
+        qx::Class::define<Leaf>("Leaf").members<&Leaf::a, &Leaf::n>();
+        qx::Class::define<Branch>("Branch")
+            .members<&Branch::a, &Branch::leaf, &Branch::maybe, &Branch::leaves>()
+            .property<&Branch::word, &Branch::setWord>("word");
+        qx::Class::define<Listener, QXMappedObject>("Listener")
+            .members<&Listener::a, &Listener::n>()
+            .property<&Listener::inner, &Listener::setInner>("inner");
+    }
+    void TearDown() override {
+        for (const char* name : {"Leaf", "Branch", "Listener"})
+            qx::Class::forget(name);
+    }
+
+    // The object, the order of its keys and of the changes, the errors with their places, and what
+    // observers heard.
+    std::string read(const std::string& document, bool hasSlot) {
+        Listener::heard.clear();
+        qx::Ref<qx::Error> error;
+        std::string all;
+        try {
+            const auto object = marshaller->readString(document, hasSlot ? &error : nullptr);
+            all = support::show(object);
+            if (const auto record = object.as<QXGenericRecord>(); record && record->contents())
+                all += support::oneLine(record->contents()->allKeys()) +
+                       support::oneLine(record->changeCache()->allKeys());
+        } catch (const std::exception& exception) {
+            all = exception.what();
+        }
+        if (error)
+            for (const auto& one : error->all())
+                all += "\n" + one->report().str();
+        return all + Listener::heard;
+    }
+
+    qx::Ref<QXXMLMarshaller> marshaller = scenario::marshaller(classes);
+};
+
+constexpr const char* documents[] = {
+    "<r a='1' b='2' i='3'><n>4</n></r>",
+    "<r><b>2</b><n/><i>5</i></r>",
+    "<r i='none' a='x'/>",
+    "<r>text</r>",
+    "<r> <!-- c -->\n</r>",
+    "<r>t<!-- c -->u</r>",
+    "<r a='1'>t<n>4</n></r>",
+    "<r><n>1</n><n>2</n></r>",
+    "<r><n>four</n></r>",
+    "<r b='1'><b>2</b></r>",
+    "<r z='1'/>",
+    "<r><z/></r>",
+    "<r xmlns:p='urn:p'><?i d?></r>",
+    "<l><leaf a='1'/><!-- c --><leaf n='2'/> t <must/></l>",
+    "<l><leaf/><must/><leaf/></l>",
+    "<l><leaf n='x'/><leaf n='2'/><must/></l>",
+    "<l><leaf a='1'/></l>",
+    "<l><must/><numbers k='1'><number>1</number><z/>t<number>2</number></numbers></l>",
+    "<l><must/><numbers/><numbers><number>1</number></numbers></l>",
+    "<l><must/><numbers><number>1</number><number>two</number></numbers></l>",
+    "<branch/>",
+    "<branch a='1'><leaf/><maybe/><item/><item a='2'/></branch>",
+    "<branch><leaf a='1'><a>2</a></leaf></branch>",
+    "<branch><maybe n='1'/><leaf n='x'/></branch>",
+    "<branch><item n='1'/><item z='2'/><item n='x'/></branch>",
+    "<branch><item n='1'/><word>thrown</word></branch>",
+    "<listener a='1'><n>2</n><inner a='3'/></listener>",
+    "<listener><n>x</n></listener>"};
+
+} // namespace
+
+TEST_F(UsualForm, IsReadLikeAnyOther) {
+    testing::internal::CaptureStderr();
+    for (const char* document : documents)
+        for (unsigned options = 0; options < 32; ++options) {
+            marshaller->setLenient((options & 1U) != 0);
+            marshaller->setSaveUnknownXML((options & 2U) != 0);
+            marshaller->setMaximumErrors((options & 4U) != 0 ? 5 : 1);
+            marshaller->setKeepsPartial((options & 8U) != 0);
+            const bool hasSlot = (options & 16U) != 0;
+            marshaller->setReportHandler(nullptr);
+            const std::string usual = read(document, hasSlot);
+            marshaller->setReportHandler([](const QXXMLReport&) {});
+            EXPECT_EQ(usual, read(document, hasSlot)) << document << " " << options;
+        }
+    testing::internal::GetCapturedStderr();
+}
+
+TEST_F(UsualForm, StopsAtTheSameLimits) {
+    const std::string document = "<l a='1'><leaf a='1'/><leaf n='2'/><must/></l>";
+    for (std::size_t limit = 0; limit < 6; ++limit)
+        for (const bool isOfDepth : {false, true}) {
+            marshaller->setMaximumDepth(isOfDepth ? limit : 256);
+            marshaller->setMaximumObjects({isOfDepth ? 100 : limit, 0});
+            marshaller->setReportHandler(nullptr);
+            const std::string usual = read(document, true);
+            marshaller->setReportHandler([](const QXXMLReport&) {});
+            EXPECT_EQ(usual, read(document, true)) << limit;
+        }
+}
+
+// Whatever the owner's constructor made of them.
+TEST_F(UsualForm, MakesStructsInPlaceFromTheirOwnDefaults) {
+    const auto read = marshaller->readString<Branch>(
+        "<branch><leaf n='2'/><maybe a='3'/><item/><item a='4'/></branch>");
+    ASSERT_TRUE(read) << errorOf(read);
+    EXPECT_EQ(read->leaf.a + std::to_string(read->leaf.n), "none2");
+    EXPECT_EQ(read->maybe->a + std::to_string(read->maybe->n), "31");
+    ASSERT_EQ(read->leaves.size(), 2U);
+    EXPECT_EQ(read->leaves[0].a + read->leaves[1].a, "none4");
+    const auto none = marshaller->readString<Branch>("<branch/>");
+    EXPECT_EQ(none->leaves.size(), 3U);
+}
