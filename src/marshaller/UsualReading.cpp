@@ -116,7 +116,7 @@ inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlo
     const Property* const property = _setters.slots[slot].property;
     if (_setters.usesProperties && property != nullptr && property->set != nullptr &&
         !ObjectInternals::isHeard(_object))
-        return ObjectInternals::setAndTell(_object, *property, value) ||
+        return property->set(*property, _object, value) ||
                ObjectAccess::refuse(_object, key, value, error);
     return ObjectAccess::set(_object, key, std::move(value), error);
 }
