@@ -169,6 +169,13 @@ private:
     template <class Read>
     Ref<Object> buildWith(const ClassPlan& plan, const Counted& source, StructObject* given,
                           ErrorSlot error, Read read);
+    // False where the element has not the class's usual form.
+    [[gnu::noinline]] bool buildUsual(const ClassPlan& plan, Number element,
+                                      IndexedXML::Nodes nodes, ErrorSlot error, StructObject* given,
+                                      Ref<Object>& object);
+    [[gnu::noinline]] Ref<Object> buildLookingUp(const ClassPlan& plan, Number element,
+                                                 IndexedXML::Nodes nodes, ErrorSlot error,
+                                                 StructObject* given);
     // Whether nobody wants more of an element than its fields.
     bool isPlain() const noexcept {
         return _use == Use::document && _trace == nullptr && !reports().isOn() &&

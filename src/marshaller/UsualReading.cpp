@@ -30,11 +30,9 @@ const UsualReading::Setters& UsualReading::lookUp(const ClassPlan& plan, const O
     Setters& setters = _setters.emplace_front();
     setters.type = &type;
     setters.appends = &type == &QXGenericRecord::classObject();
-    if (type.isStruct())
-        setters.way = Way::ofStruct;
-    else if (type.setsByProperty() && typeid(object) == type.type() &&
-             type.classOperation(announces) == nullptr)
-        setters.way = Way::ofObject;
+    setters.usesProperties =
+        type.isStruct() || (type.setsByProperty() && typeid(object) == type.type() &&
+                            type.classOperation(announces) == nullptr);
     for (const Slot& slot : plan.usualForm->slots()) {
         const Key key = slot.field->key;
         const Property* const property = type.property(key);
@@ -116,14 +114,11 @@ inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlo
         return true;
     }
     const Property* const property = _setters.slots[slot].property;
-    const bool isPlain = _setters.way != Way::byKey && property != nullptr &&
-                         property->set != nullptr && !ObjectInternals::isHeard(_object);
-    if (!isPlain)
-        return ObjectAccess::set(_object, key, std::move(value), error);
-    const bool isSet = _setters.way == Way::ofStruct
-                           ? property->set(*property, _object, value)
-                           : ObjectInternals::setUnheard(_object, *property, value);
-    return isSet || ObjectAccess::refuse(_object, key, value, error);
+    if (_setters.usesProperties && property != nullptr && property->set != nullptr &&
+        !ObjectInternals::isHeard(_object))
+        return property->set(*property, _object, value) ||
+               ObjectAccess::refuse(_object, key, value, error);
+    return ObjectAccess::set(_object, key, std::move(value), error);
 }
 
 // Who is told of the object that is to hold it has heard of that one.

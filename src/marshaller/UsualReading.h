@@ -41,9 +41,6 @@ public:
     bool readFields(const Source& source, Object& object, ErrorSlot error);
 
 private:
-    // How values are set: by key-value access, or by the properties, of a struct or of an object
-    // whose class does what Object does.
-    enum class Way : std::uint8_t { byKey, ofStruct, ofObject };
     // How the fields of a form are set in objects of one class.
     struct Setter {
         const Property* property; // null where the class has none
@@ -51,8 +48,8 @@ private:
     };
     struct Setters {
         const Class* type = nullptr;
-        Way way = Way::byKey;
-        bool appends = false; // to the contents of a record that nobody has heard of
+        bool usesProperties = false; // while nobody observes the object
+        bool appends = false;        // to the contents of a record that nobody has heard of
         std::vector<Setter> slots;
     };
     class Binding;

@@ -26,34 +26,24 @@ void Object::setValueForKey(const Value& value, Key key) {
     }
 }
 
+namespace {
+
 // As in a ChangeScope, which costs more where nothing is thrown: it asks for exceptions on the way.
-bool ObjectInternals::setAndTell(Object& object, const Property& property, const Value& value) {
+bool setAndTell(Object& object, const Property& property, const Value& value) {
     object.willChangeValueForKey(property.key);
     bool isSet = false;
     try {
         isSet = property.set(property, object, value);
     } catch (...) {
-        tellEndOfFailedChange(property.key, [&] { object.didChangeValueForKey(property.key); });
+        ObjectInternals::tellEndOfFailedChange(property.key,
+                                               [&] { object.didChangeValueForKey(property.key); });
         throw;
     }
     object.didChangeValueForKey(property.key);
     return isSet;
 }
 
-// Nobody hears of the beginning; the setter may bring somebody who hears of the end.
-bool ObjectInternals::setUnheard(Object& object, const Property& property, const Value& value) {
-    const auto tell = [&] { object.didChangeValueForKey(property.key); };
-    bool isSet = false;
-    try {
-        isSet = property.set(property, object, value);
-    } catch (...) {
-        tellEndOfFailedChange(property.key, tell);
-        throw;
-    }
-    if (isHeard(object)) [[unlikely]]
-        tell();
-    return isSet;
-}
+} // namespace
 
 SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
     // Whoever is told before the change may let the last reference go.
@@ -74,8 +64,7 @@ SetOutcome Object::trySetValueForKey(const Value& value, Key key) {
         return SetOutcome::refused;
     if (!type.automaticallyNotifiesObserversForKey(key))
         return property->set(*property, *this, value) ? SetOutcome::set : SetOutcome::refused;
-    return ObjectInternals::setAndTell(*this, *property, value) ? SetOutcome::set
-                                                                : SetOutcome::refused;
+    return setAndTell(*this, *property, value) ? SetOutcome::set : SetOutcome::refused;
 }
 
 Value Object::valueForUndefinedKey(Key key) const {

@@ -10,8 +10,6 @@
 
 namespace qx {
 
-struct Property;
-
 // Told once when an object that it was added to ends, while the object is still whole.
 class EndListener {
 public:
@@ -51,10 +49,6 @@ struct ObjectInternals {
     }
     // Whether anybody could hear of a change.
     static bool isHeard(const Object& object) noexcept { return object.hasObserversOrWeakRefs(); }
-    // Sets the property, announced as a change. False where it does not take the value.
-    static bool setAndTell(Object& object, const Property& property, const Value& value);
-    // The same of an object that nobody observes yet, and that announces changes as Object does.
-    static bool setUnheard(Object& object, const Property& property, const Value& value);
     // Whether the object's last reference is gone.
     static bool isEnding(const Object& object) noexcept;
 

@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <climits>
-#include <cstring>
 #include <libxml/SAX2.h>
 #include <libxml/parserInternals.h>
 #include <mutex>
