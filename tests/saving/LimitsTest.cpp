@@ -104,13 +104,14 @@ TEST(SavingLimits, ObjectsNestAsDeepAsReadingGoesAndNeverInThemselves) {
     ASSERT_TRUE(update) << support::told(update.error());
     EXPECT_TRUE(update->bytes()->view() == text + "<node name='b'/>" + end);
     // One level more, then without end.
-    const auto below = qx::make<QXGenericRecord>();
-    below->setClassNameForMarshalling("Node");
-    innermost->setValueForKey(below, "node");
+    const auto self = qx::make<QXGenericRecord>();
+    self->setClassNameForMarshalling("Node");
+    innermost->setValueForKey(self, "node");
     EXPECT_FALSE(QXXMLUpdate::updatedText(*marshaller, deep, root));
-    innermost->setValueForKey(root, "node");
-    const auto cyclic = QXXMLUpdate::updatedText(*marshaller, deep, root);
-    innermost->setValueForKey(qx::Value(), "node");
+    self->setValueForKey(self, "node");
+    const auto cyclic = QXXMLUpdate::updatedText(*marshaller, document, self);
+    self->setValueForKey(qx::Value(), "node");
+    self->setChangeCache(nullptr); // which knows it from before
     ASSERT_FALSE(cyclic);
     EXPECT_EQ(support::told(cyclic.error()).substr(0, 44),
               "-223: Objects nest deeper than the limit of ");
