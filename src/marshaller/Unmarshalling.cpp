@@ -126,11 +126,23 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, Number element, IndexedX
     // Without a slot for errors items may be left out, which are unknown XML then.
     const bool mayBeUsual =
         plan.usualForm && isPlain() && (error != nullptr || !plan.usualForm->hasItems());
+    auto object = mayBeUsual ? buildUsual(plan, element, nodes, error, given) : std::nullopt;
+    return object ? std::move(*object) : buildAny(plan, element, nodes, error, given);
+}
+
+std::optional<Ref<Object>> Unmarshalling::buildUsual(const ClassPlan& plan, Number element,
+                                                     IndexedXML::Nodes nodes, ErrorSlot error,
+                                                     StructObject* given) {
     UsualElement usual;
-    if (mayBeUsual && usual.find(_document, *plan.usualForm, element))
-        return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
-            return _usual.readFields({plan, usual, element, nodes}, object, error);
-        });
+    if (!usual.find(_document, *plan.usualForm, element))
+        return std::nullopt;
+    return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
+        return _usual.readFields({plan, usual, element, nodes}, object, error);
+    });
+}
+
+Ref<Object> Unmarshalling::buildAny(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
+                                    ErrorSlot error, StructObject* given) {
     ChildLookup source(_document, element, nodes, plan.bindingCount);
     return build(plan, source, false, error, given);
 }
