@@ -128,26 +128,23 @@ Ref<Object> Unmarshalling::build(const ClassPlan& plan, Number element, IndexedX
     // Without a slot for errors items may be left out, which are unknown XML then.
     const bool mayBeUsual =
         plan.usualForm && isPlain() && (error != nullptr || !plan.usualForm->hasItems());
-    Ref<Object> object;
-    if (mayBeUsual && buildUsual(plan, element, nodes, error, given, object))
-        return object;
-    return buildLookingUp(plan, element, nodes, error, given);
+    auto object = mayBeUsual ? buildUsual(plan, element, nodes, error, given) : std::nullopt;
+    return object ? std::move(*object) : buildAny(plan, element, nodes, error, given);
 }
 
-bool Unmarshalling::buildUsual(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
-                               ErrorSlot error, StructObject* given, Ref<Object>& object) {
+std::optional<Ref<Object>> Unmarshalling::buildUsual(const ClassPlan& plan, Number element,
+                                                     IndexedXML::Nodes nodes, ErrorSlot error,
+                                                     StructObject* given) {
     UsualElement usual;
     if (!usual.find(_document, *plan.usualForm, element))
-        return false;
-    object = buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& made) {
-        return _usual.readFields({plan, usual, element, nodes}, made, error);
+        return std::nullopt;
+    return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
+        return _usual.readFields({plan, usual, element, nodes}, object, error);
     });
-    return true;
 }
 
-Ref<Object> Unmarshalling::buildLookingUp(const ClassPlan& plan, Number element,
-                                          IndexedXML::Nodes nodes, ErrorSlot error,
-                                          StructObject* given) {
+Ref<Object> Unmarshalling::buildAny(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
+                                    ErrorSlot error, StructObject* given) {
     ChildLookup source(_document, element, nodes, plan.bindingCount);
     return build(plan, source, false, error, given);
 }

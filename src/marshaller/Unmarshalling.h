@@ -169,13 +169,14 @@ private:
     template <class Read>
     Ref<Object> buildWith(const ClassPlan& plan, const Counted& source, StructObject* given,
                           ErrorSlot error, Read read);
-    // False where the element has not the class's usual form.
-    [[gnu::noinline]] bool buildUsual(const ClassPlan& plan, Number element,
-                                      IndexedXML::Nodes nodes, ErrorSlot error, StructObject* given,
-                                      Ref<Object>& object);
-    [[gnu::noinline]] Ref<Object> buildLookingUp(const ClassPlan& plan, Number element,
-                                                 IndexedXML::Nodes nodes, ErrorSlot error,
-                                                 StructObject* given);
+    // As build(): none where the element has not the usual form of the class. The two stand apart,
+    // so that a level of nested objects takes the stack of one of them.
+    [[gnu::noinline]] std::optional<Ref<Object>> buildUsual(const ClassPlan& plan, Number element,
+                                                            IndexedXML::Nodes nodes,
+                                                            ErrorSlot error, StructObject* given);
+    [[gnu::noinline]] Ref<Object> buildAny(const ClassPlan& plan, Number element,
+                                           IndexedXML::Nodes nodes, ErrorSlot error,
+                                           StructObject* given);
     // Whether nobody wants more of an element than its fields.
     bool isPlain() const noexcept {
         return _use == Use::document && _trace == nullptr && !reports().isOn() &&

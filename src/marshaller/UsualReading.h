@@ -3,7 +3,8 @@
 // Elements of their class's usual form (UsualElement.h) are bound straight: what is found for each
 // field is set, in the order of the fields. What has another form, or is read with a trace, reports
 // or prefixes of the host's, goes the general way (Unmarshalling::readFields) before anything was
-// made of it. Both come to the same objects and errors.
+// made of it; so do elements with items of their own where errors have no slot. Both come to the
+// same objects and errors.
 //
 // Records that nobody can have heard of get their values appended; objects whose class sets values
 // as Object does get them by the property; structs in members of structs are made there.
