@@ -154,7 +154,10 @@ Value IndexedXML::text(Number element) {
     return _longTexts.try_emplace(element, _joined).first->second;
 }
 
-void IndexedXML::appendText(Number element, std::string& text) {
+// Calls visit(const XMLIndexEntry&) for all that is inside the element and no layout, in the
+// order of the document, until it answers false.
+template <class Visit>
+void IndexedXML::forEachInside(Number element, Visit visit) {
     struct Open {
         Number element;
         Number at;
@@ -162,7 +165,7 @@ void IndexedXML::appendText(Number element, std::string& text) {
     };
     const auto opened = [this](Number number) {
         expand(number);
-        return Open{number, index().firstChild(number), index().contentEnd(number)};
+        return Open{number, index().content(number), index().contentEnd(number)};
     };
     std::vector<Open> open{opened(element)};
     while (!open.empty()) {
@@ -172,13 +175,21 @@ void IndexedXML::appendText(Number element, std::string& text) {
             continue;
         }
         const Number at = std::exchange(inner.at, index().siblingOf(inner.at));
-        const XMLIndexEntry& entry = index()[at];
-        if (entry.nodeKind() == XMLNodeKind::element)
+        if (XMLIndex::isLayout(index()[at], index()[inner.element]))
+            continue;
+        if (!visit(index()[at]))
+            return;
+        if (isElement(at))
             open.push_back(opened(at));
-        else if (entry.nodeKind() == XMLNodeKind::text &&
-                 !XMLIndex::isLayout(entry, index()[inner.element]))
-            text += index().value(entry, _room);
     }
+}
+
+void IndexedXML::appendText(Number element, std::string& text) {
+    forEachInside(element, [&](const XMLIndexEntry& entry) {
+        if (entry.nodeKind() == XMLNodeKind::text)
+            text += index().value(entry, _room);
+        return true;
+    });
 }
 
 IndexedXML::Number IndexedXML::attributeOfMany(Number element, const Attributes& all,
@@ -193,26 +204,14 @@ IndexedXML::Number IndexedXML::attributeOfMany(Number element, const Attributes&
 
 IndexedXML::Extent IndexedXML::extent(Number element, std::size_t enough) {
     Extent extent{.elements = 1, .nodes = 1};
-    std::vector<Number> open{element};
-    while (!open.empty() && extent.nodes < enough) {
-        const Number inner = open.back();
-        open.pop_back();
-        expand(inner);
-        const Number end = index().contentEnd(inner);
-        Number at = index().content(inner);
-        for (; at < end && extent.nodes < enough; at = index().siblingOf(at)) {
-            const XMLIndexEntry& entry = index()[at];
-            if (XMLIndex::isLayout(entry, index()[inner]))
-                continue;
-            ++extent.nodes;
-            if (entry.nodeKind() == XMLNodeKind::element) {
-                ++extent.elements;
-                open.push_back(at);
-            } else {
-                extent.textSize += entry.end - entry.begin;
-            }
-        }
-    }
+    forEachInside(element, [&](const XMLIndexEntry& entry) {
+        ++extent.nodes;
+        if (entry.nodeKind() == XMLNodeKind::element)
+            ++extent.elements;
+        else
+            extent.textSize += entry.end - entry.begin;
+        return extent.nodes < enough;
+    });
     return extent;
 }
 

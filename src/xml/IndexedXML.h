@@ -203,6 +203,8 @@ private:
     void readTree(XMLElement* element, Content content);
     void findRoot() noexcept;
     void internNames();
+    template <class Visit>
+    void forEachInside(Number element, Visit visit);
     void appendText(Number element, std::string& text);
     Value sharedValue(Number number);
     Number attributeOfMany(Number element, const Attributes& all, const String& name);
