@@ -33,6 +33,7 @@ const UsualReading::Setters& UsualReading::lookUp(const ClassPlan& plan, const O
     setters.usesProperties =
         type.isStruct() || (type.setsByProperty() && typeid(object) == type.type() &&
                             type.classOperation(announces) == nullptr);
+    setters.slots.reserve(plan.usualForm->slots().size());
     for (const Slot& slot : plan.usualForm->slots()) {
         const Key key = slot.field->key;
         const Property* const property = type.property(key);
