@@ -1,7 +1,8 @@
 // Each allocation of each operation fails, one run after the other: once alone, once with all that
 // follow. The operation then ends in std::bad_alloc or does what it does otherwise, and one that
 // ended does its work on the same objects when it is called again. Documents are parsed, a
-// marshaller reads and writes, and changes are undone and redone, with observers and without.
+// marshaller reads and writes, structs, too, and changes are undone and redone, with observers and
+// without.
 
 #include "FailingMemory.h"
 
@@ -11,6 +12,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iostream>
+#include <optional>
 #include <sstream>
 #include <streambuf>
 
@@ -465,6 +467,48 @@ void undoing() {
             });
 }
 
+struct Part {
+    std::string name;
+    int count = 0;
+};
+struct Crate {
+    std::string label;
+    Part lid;
+    std::optional<Part> spare;
+    std::vector<Part> parts;
+};
+
+// Structs are made in the members that hold them.
+void readingStructs() {
+    const auto part =
+        qx::Class::define<Part>("Part").members<&Part::name, &Part::count>().registration();
+    const auto crate = qx::Class::define<Crate>("Crate")
+                           .members<&Crate::label, &Crate::lid, &Crate::spare, &Crate::parts>()
+                           .registration();
+    const auto mapping = qx::XMLDocument::initWithData(
+        "<mapping><class name='Crate'><map-to xml='crate'/>"
+        "<field name='label'><bind-xml name='label' node='attribute'/></field>"
+        "<field name='lid' type='Part'><bind-xml name='lid' node='element'/></field>"
+        "<field name='spare' type='Part'><bind-xml name='spare' node='element'/></field>"
+        "<field name='parts' type='Part' collection='array'><bind-xml name='part'/></field>"
+        "</class><class name='Part'>"
+        "<field name='name'><bind-xml name='name' node='attribute'/></field>"
+        "<field name='count' type='int'><bind-xml name='count' node='attribute'/></field>"
+        "</class></mapping>");
+    const std::string text = "<crate label='a label that takes memory'><lid name='an oaken lid, "
+                             "polished' count='1'/><spare count='2'/><part count='3'/><part "
+                             "name='a part with a long name' count='4'/></crate>";
+    const auto marshaller = M::initWithMappingXML(mapping.get());
+    tryEach("structs", [&] {
+        const auto read = std::make_shared<Crate>();
+        Trial trial;
+        trial.operation = [&, read] { *read = marshaller->readString<Crate>(text).value(); };
+        trial.outcome = [&, read] { return marshaller->writeString(*read).str(); };
+        trial.kept = [read] { return read->label; };
+        return trial;
+    });
+}
+
 } // namespace
 
 extern "C" void QXLogWarning(std::string_view, std::span<const qx::Value>) {}
@@ -475,6 +519,7 @@ int main() {
     parsing();
     marshalling();
     failures();
+    readingStructs();
     undoing();
     std::cout << faults << " faults\n";
     return faults == 0 ? 0 : 1;
