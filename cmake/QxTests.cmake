@@ -108,7 +108,7 @@ if(TARGET QXXMLMarshalling)
         add_dependencies(tests program_${name})
     endforeach()
     # They take the parser's memory away, and count it.
-    foreach(name without_memory bounded_memory)
+    foreach(name without_memory undo_without_memory bounded_memory)
         target_link_libraries(program_${name} PRIVATE LibXml2::LibXml2)
     endforeach()
 

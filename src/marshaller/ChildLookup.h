@@ -131,8 +131,8 @@ private:
     const bool _isCopy = false;
     bool _isWhole = true; // no child was taken
     std::size_t _lookups;
-    // The children: most elements have few, which take no memory of their own. Reading orders takes
-    // 6 % fewer instructions for it (bench/orders_bench.cpp, read).
+    // The children: most elements have few, which take no memory of their own. Elements that are
+    // bound so take 6 % fewer instructions for it.
     std::array<Child, 8> _few;
     std::vector<Child> _many; // where they are more
     Child* _children = _few.data();

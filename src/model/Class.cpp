@@ -198,8 +198,7 @@ const Operation* findOperation(const std::vector<Operation>& operations, Selecto
 
 Class::Class(detail::ClassDraft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),
-      _structType(draft.structType), _create(draft.create),
-      _setsByProperty(draft.setsByProperty),
+      _structType(draft.structType), _create(draft.create), _setsByProperty(draft.setsByProperty),
       _properties(std::move(draft.properties)), _operations(std::move(draft.operations)),
       _classOperations(std::move(draft.classOperations)) {
     for (const Property& property : _properties)

@@ -18,8 +18,8 @@ void ClassPlan::summarise() {
     std::size_t levels = 0;
     ExtendsWalk walk(*this);
     do {
-        attributeCount += static_cast<std::size_t>(
-            std::ranges::count_if(walk.current().fields, mayBeAttribute));
+        attributeCount +=
+            static_cast<std::size_t>(std::ranges::count_if(walk.current().fields, mayBeAttribute));
     } while (walk.next() && ++levels < mostLevels);
     usualForm = UsualForm::of(*this);
 }

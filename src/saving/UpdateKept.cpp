@@ -55,16 +55,8 @@ void UpdatePlan::compareDeclarations(const Context& context, const WritingTrace:
             now.erase(kept);
         if (found != nullptr && found->text == was.declarations[i].text)
             continue;
-        if (i >= entries.size() || !_source.markup[entries[i]].isPlaced())
-            return fail(context.after);
-        const SourceMarkup::Spot spot = _source.markup[entries[i]];
-        const char quote = _source.markup.text()[spot.end - 1];
-        if (found != nullptr)
-            add(spot.insideBegin, spot.insideEnd,
-                _source.writer.attributeValue(found->node->stringValue().view(), quote),
-                context.after);
-        else
-            add(blanksBefore(spot.begin), spot.end, {}, context.after);
+        if (!changeInTag(context, i < entries.size() ? entries[i] : none, found))
+            return;
     }
     for (const Kept& each : is.declarations)
         if (const auto left = now.find(each.node->name());
@@ -72,6 +64,23 @@ void UpdatePlan::compareDeclarations(const Context& context, const WritingTrace:
             addToTag(context,
                      each.node->name().isEmpty() ? "xmlns" : "xmlns:" + each.node->name().str(),
                      each);
+}
+
+// The attribute or declaration gets the value of what is kept now, or goes where nothing is. False
+// where it has no place.
+bool UpdatePlan::changeInTag(const Context& context, Entry entry, const Kept* now) {
+    const SourceMarkup::Spot spot = entry != none ? _source.markup[entry] : SourceMarkup::Spot();
+    if (!spot.isPlaced()) {
+        fail(context.after);
+        return false;
+    }
+    const char quote = _source.markup.text()[spot.end - 1];
+    if (now != nullptr)
+        add(spot.insideBegin, spot.insideEnd,
+            _source.writer.attributeValue(now->node->stringValue().view(), quote), context.after);
+    else
+        add(blanksBefore(spot.begin), spot.end, {}, context.after);
+    return true;
 }
 
 // Behind the element's name.
@@ -191,16 +200,8 @@ void UpdatePlan::compareKeptAttributes(const Context& context, const WritingTrac
             _source.writer.isTaken(_source.after.plan(context.after), was.attributes[i].text);
         if (isDouble || (kept != nullptr && kept->text == was.attributes[i].text))
             continue;
-        if (entries[i] == none || !_source.markup[entries[i]].isPlaced())
-            return fail(context.after);
-        const SourceMarkup::Spot& spot = _source.markup[entries[i]];
-        const char quote = _source.markup.text()[spot.end - 1];
-        if (kept != nullptr)
-            add(spot.insideBegin, spot.insideEnd,
-                _source.writer.attributeValue(kept->node->stringValue().view(), quote),
-                context.after);
-        else
-            add(blanksBefore(spot.begin), spot.end, {}, context.after);
+        if (!changeInTag(context, entries[i], kept))
+            return;
     }
     for (const Kept& each : is.attributes)
         if (!known.contains(&each) && mayAddKept(context.after, each.text))

@@ -180,6 +180,7 @@ private:
                              const WritingTrace::KeptList& is);
     void compareKeptAttributes(const Context& context, const WritingTrace::KeptList& was,
                                const WritingTrace::KeptList& is);
+    bool changeInTag(const Context& context, Entry entry, const WritingTrace::Kept* now);
     void addToTag(const Context& context, std::string_view name, const WritingTrace::Kept& kept);
     bool mayAddKept(Shown object, const std::string& text);
     std::vector<Entry> entriesOfKept(const Context& context,

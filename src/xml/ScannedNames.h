@@ -44,7 +44,7 @@ public:
         std::uint32_t usedAt = 0;      // the element that had it last as an attribute
         Number local = none;           // with a prefix: the number of the name behind the colon
         std::uint32_t localUsedAt = 0; // the element that had an attribute of this local name last
-        Number follower; // that came behind it last; itself, where none did
+        Number follower;               // that came behind it last; itself, where none did
         Meaning meaning = Meaning::plain;
     };
 

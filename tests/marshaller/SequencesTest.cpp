@@ -123,6 +123,21 @@ TEST(Sequences, AreTheObjectsOfTheWholeDocumentHoweverItComes) {
     }
 }
 
+// Tags are told apart in many bytes at a time: each mark stands at each place among those.
+TEST(Sequences, EndWhereTheyDoWhereverAMarkFalls) {
+    const std::string inside =
+        "<b c='/>' d=\"it's>\" >it's \"&gt;></b ><item e=''/><item ><b/></item\n>"
+        "<!-- </item> --><![CDATA[</item>]]><?p </item>?>";
+    for (std::size_t width = 0; width < 64; ++width) {
+        const std::string item = "<item id='" + std::string(width, 'x') + "'>" + inside + "</item>";
+        const std::string document = "<all>" + item + "<b>'</b>" + item + item + "</all>";
+        EXPECT_EQ(each(document, document.size()), whole(document)) << width;
+        const std::string faulty = "<all>" + item + "<item>" + inside + "<b c='<'/></item></all>";
+        const Told first{whole("<all>" + item + "</all>").objects, whole(faulty).error};
+        EXPECT_EQ(each(faulty, faulty.size()), first) << width;
+    }
+}
+
 TEST(Sequences, HandOverWhatComesBeforeAFaultAndTellItsPlace) {
     for (const auto& [name, document] : documents) {
         SCOPED_TRACE(name);

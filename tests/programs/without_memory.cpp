@@ -1,10 +1,7 @@
-// Each allocation of each operation fails, one run after the other: once alone, once with all that
-// follow. The operation then ends in std::bad_alloc or does what it does otherwise, and one that
-// ended does its work on the same objects when it is called again. Documents are parsed, a
-// marshaller reads and writes, structs, too, and changes are undone and redone, with observers and
-// without.
+// Documents are parsed, and a marshaller reads and writes, structs, too, while memory fails
+// (Trials.h).
 
-#include "FailingMemory.h"
+#include "Trials.h"
 
 #include <QXXMLMarshalling/QXXMLMarshalling.h>
 
@@ -20,50 +17,6 @@ namespace {
 
 using qx::Ref;
 using M = QXXMLMarshaller;
-
-// An operation of whose allocations one fails, and what it works on: made anew for each run.
-struct Trial {
-    std::function<void()> operation;
-    // What the operation gave and changed.
-    std::function<std::string()> outcome;
-    // What a failure must leave as it was.
-    std::function<std::string()> kept = [] { return std::string(); };
-    // Makes up for what a failure may leave changed, before the operation is called again.
-    std::function<void()> restore = [] {};
-};
-
-int faults = 0;
-
-void tryEach(const std::string& name, const std::function<Trial()>& make) {
-    const auto run = [](const Trial& trial) {
-        trial.operation();
-        return trial.outcome();
-    };
-    const std::string expected = run(make());
-    failing::eachAllocation([&](long n) {
-        const auto compare = [&](const char* when, const std::string& got,
-                                 const std::string& wanted) {
-            if (got != wanted && ++faults < 20)
-                std::cout << name << when << (failing::allFollowing ? ", from" : ", at")
-                          << " allocation " << n << ":\n  " << got << "\ninstead of\n  " << wanted
-                          << '\n';
-        };
-        const Trial trial = make();
-        const std::string before = trial.kept();
-        const failing::Outcome end = failing::run(n, trial.operation);
-        if (end == failing::Outcome::failed) {
-            compare(" changed something", trial.kept(), before);
-            // The first trial ends as it is: what a failure left in it must end with it.
-            const Trial again = make();
-            failing::run(n, again.operation);
-            again.restore();
-            compare(" called again", run(again), expected);
-        } else {
-            compare("", trial.outcome(), expected);
-        }
-        return end;
-    });
-}
 
 std::string contentOf(const std::filesystem::path& path) {
     std::ostringstream text;
@@ -334,139 +287,6 @@ void failures() {
     });
 }
 
-// Both sides of a pair change in one setter.
-class Person : public qx::UndoableObject {
-public:
-    qx::Value partner() const { return _partner; }
-    void setPartner(qx::Value partner) {
-        if (partner.isSameAs(_partner))
-            return;
-        const auto former = _partner.as<Person>();
-        const auto next = partner.as<Person>();
-        {
-            const qx::ChangeScope scope(*this, "partner");
-            _partner = std::move(partner);
-        }
-        if (former)
-            former->setValueForKey(nullptr, "partner");
-        if (next)
-            next->setValueForKey(this, "partner");
-    }
-    qx::String name;
-
-private:
-    qx::Value _partner;
-};
-
-// A few objects with all that can be changed about them.
-struct Scene {
-    explicit Scene(bool isObserved) : observed(isObserved) {
-        for (int i = 0; i < 12; ++i)
-            record->setValueForKey(i, "key" + std::to_string(i));
-        record->setUndoManager(manager);
-        one->setUndoManager(manager);
-        other->setUndoManager(manager);
-        if (observed)
-            for (qx::Object* object :
-                 {static_cast<qx::Object*>(record.get()), static_cast<qx::Object*>(one.get())})
-                for (const char* key : {"key3", "new", "partner", "partner.name"})
-                    tokens.push_back(
-                        object->observe(key, [this](const qx::ValueChange&) { ++told; }));
-    }
-    ~Scene() {
-        manager->removeAllActions();
-        one->setUndoManager(nullptr);
-        one->setValueForKey(nullptr, "partner");
-        one->setChangeCache(nullptr);
-        other->setChangeCache(nullptr);
-    }
-    Scene(const Scene&) = delete;
-    Scene& operator=(const Scene&) = delete;
-
-    void change() const {
-        const qx::UndoGroup group(manager);
-        record->setValueForKey("three", "key3");
-        record->setValueForKey(nullptr, "key0");
-        record->setValueForKey(nullptr, "key3");
-        record->setValueForKey("new", "new");
-        one->setValueForKey("One", "name");
-        one->setValueForKey(other, "partner");
-        other->setValueForKey("Other", "name");
-    }
-    std::string state() const {
-        std::string text;
-        for (const qx::String& key : record->keys())
-            text += key.str() + "=" + record->valueForKey(key).description().str() + " ";
-        for (const auto& [person, partner] : {std::pair{one, other}, std::pair{other, one}})
-            text += person->name.str() +
-                    (person->partner().isNull()            ? " alone"
-                     : person->partner().isSameAs(partner) ? " paired"
-                                                           : " lost") +
-                    " ";
-        return text + std::to_string(manager->groupingLevel()) +
-               (manager->canUndo() ? " can undo" : "") + (manager->canRedo() ? " can redo" : "");
-    }
-    void undoAll() const {
-        while (manager->canUndo())
-            manager->undo();
-    }
-    // All that can still be undone and redone, and whether observers still hear.
-    std::string outcome() {
-        std::string text = state();
-        undoAll();
-        text += "\n  undone " + state();
-        while (manager->canRedo())
-            manager->redo();
-        text += "\n  redone " + state();
-        told = 0;
-        record->setValueForKey("told?", "key3");
-        return text + "\n  told " + std::to_string(told);
-    }
-
-    bool observed;
-    int told = 0;
-    Ref<qx::UndoManager> manager = qx::make<qx::UndoManager>();
-    Ref<QXGenericRecord> record = qx::make<QXGenericRecord>();
-    Ref<Person> one = qx::make<Person>();
-    Ref<Person> other = qx::make<Person>();
-    std::vector<qx::ObservationToken> tokens;
-};
-
-void undoing() {
-    qx::Class::define<Person, qx::UndoableObject>("Person")
-        .property<&Person::name>("name")
-        .property<&Person::partner, &Person::setPartner>("partner");
-    using Step = void (*)(Scene&);
-    const Step change = [](Scene& scene) { scene.change(); };
-    const Step undo = [](Scene& scene) { scene.manager->undo(); };
-    const Step redo = [](Scene& scene) { scene.manager->redo(); };
-    const struct {
-        std::string name;
-        std::vector<Step> before;
-        Step operation;
-        bool isWhole; // has happened or not
-    } rows[] = {{"setting", {}, change, false},
-                {"undoing", {change}, undo, true},
-                {"redoing", {change, undo}, redo, true}};
-    for (const bool observed : {false, true})
-        for (const auto& row : rows)
-            tryEach(row.name + (observed ? ", observed" : ""), [&row, observed] {
-                const auto scene = std::make_shared<Scene>(observed);
-                for (const Step step : row.before)
-                    step(*scene);
-                Trial trial;
-                trial.operation = [&row, scene] { row.operation(*scene); };
-                trial.outcome = [scene] { return scene->outcome(); };
-                // Of several changes some may have happened. Without memory nobody can be told, and
-                // what nobody is told of stays as it is.
-                if (!row.isWhole)
-                    trial.restore = [scene] { scene->undoAll(); };
-                else if (!observed || !failing::allFollowing)
-                    trial.kept = [scene] { return scene->state(); };
-                return trial;
-            });
-}
-
 struct Part {
     std::string name;
     int count = 0;
@@ -520,7 +340,6 @@ int main() {
     marshalling();
     failures();
     readingStructs();
-    undoing();
     std::cout << faults << " faults\n";
     return faults == 0 ? 0 : 1;
 }

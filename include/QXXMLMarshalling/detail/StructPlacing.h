@@ -5,6 +5,7 @@
 
 #include <QXXMLMarshalling/detail/ContainerTraits.h>
 
+#include <memory>
 #include <optional>
 
 namespace qx::detail {
@@ -33,38 +34,44 @@ concept PlacedStruct = Struct<T> && std::default_initializable<T> && std::movabl
 template <class V>
 struct MemberPlacing;
 
+// A new one stands on the stack for a moment: large ones are made in boxes.
 template <PlacedStruct V>
-struct MemberPlacing<V> {
+requires(sizeof(V) <= 4096) struct MemberPlacing<V> {
     template <class T, auto Member>
-    static constexpr StructPlacing of{
-        &typeid(V),
-        [](Object& owner, std::size_t) -> void* { return &(memberOf<T, Member>(owner) = V()); },
-        nullptr, nullptr};
+    static constexpr StructPlacing of{&typeid(V),
+                                      [](Object& owner, std::size_t) -> void* {
+                                          return std::addressof(memberOf<T, Member>(owner) = V());
+                                      },
+                                      nullptr, nullptr};
 };
 
 template <PlacedStruct V>
 struct MemberPlacing<std::optional<V>> {
     template <class T, auto Member>
-    static constexpr StructPlacing of{
-        &typeid(V),
-        [](Object& owner, std::size_t) -> void* { return &memberOf<T, Member>(owner).emplace(); },
-        nullptr, nullptr};
+    static constexpr StructPlacing of{&typeid(V),
+                                      [](Object& owner, std::size_t) -> void* {
+                                          return std::addressof(
+                                              memberOf<T, Member>(owner).emplace());
+                                      },
+                                      nullptr, nullptr};
 };
 
 template <PlacedStruct V>
 struct MemberPlacing<std::vector<V>> {
     using List = std::vector<V>;
     template <class T, auto Member>
-    static constexpr StructPlacing of{
-        &typeid(V),
-        [](Object& owner, std::size_t count) -> void* {
-            List& list = memberOf<T, Member>(owner);
-            list.clear();
-            list.reserve(count);
-            return &list;
-        },
-        [](void* list) -> void* { return &static_cast<List*>(list)->emplace_back(); },
-        [](void* list) { static_cast<List*>(list)->pop_back(); }};
+    static constexpr StructPlacing of{&typeid(V),
+                                      [](Object& owner, std::size_t count) -> void* {
+                                          List& list = memberOf<T, Member>(owner);
+                                          list.clear();
+                                          list.reserve(count);
+                                          return &list;
+                                      },
+                                      [](void* list) -> void* {
+                                          return std::addressof(
+                                              static_cast<List*>(list)->emplace_back());
+                                      },
+                                      [](void* list) { static_cast<List*>(list)->pop_back(); }};
 };
 
 // Null where the member, or who has it, is of another kind.

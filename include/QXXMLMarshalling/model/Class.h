@@ -100,8 +100,8 @@ public:
     bool isStruct() const noexcept { return _structType != nullptr; }
     const std::type_info& type() const noexcept { return *_type; }
 
-    // Whether an object of this very class, which nobody observes, is set a value by key as by the
-    // property: its C++ class overrides nothing of that.
+    // Whether setting a value by key, in an object of this very class that nobody observes, is no
+    // more than setting the property: its C++ class overrides nothing of key-value setting.
     bool setsByProperty() const noexcept { return _setsByProperty; }
     // The property of that name, inherited ones included; null when there is none.
     const Property* property(Key key) const;
