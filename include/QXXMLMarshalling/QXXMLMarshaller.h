@@ -43,6 +43,7 @@ class ByteSource;
 class NamespaceTable;
 namespace detail {
 class NamespaceMatching;
+class ReadingMemory;
 class ReadingProgress;
 class Reporting;
 } // namespace detail
@@ -449,35 +450,33 @@ protected:
 
 private:
     friend class qx::detail::NamespaceMatching;
+    friend class qx::detail::ReadingMemory;
     friend class qx::detail::ReadingProgress;
     friend class qx::detail::Reporting;
 
-    bool matchNamespaces(NamespacePrefixes prefixes, bool matches, qx::Ref<qx::Error>* error);
+    using Slot = qx::Ref<qx::Error>*;
+    bool matchNamespaces(NamespacePrefixes prefixes, bool matches, Slot error);
     // The object of a document whose root is to be of that C++ type.
-    qx::Ref<qx::Object> readString(qx::XMLBytes xml, const std::type_info& type,
-                                   qx::Ref<qx::Error>* error);
-    qx::Ref<qx::Object> readFile(const qx::String& path, const std::type_info& type,
-                                 qx::Ref<qx::Error>* error);
-    qx::Ref<qx::Object> readStream(std::istream& stream, const std::type_info& type,
-                                   qx::Ref<qx::Error>* error);
-    qx::Ref<qx::Object> unmarshall(qx::XMLDocument* document, const std::type_info& type,
-                                   qx::Ref<qx::Error>* error);
+    qx::Ref<qx::Object> readString(qx::XMLBytes xml, const std::type_info& type, Slot error);
+    qx::Ref<qx::Object> readFile(const qx::String& path, const std::type_info& type, Slot error);
+    qx::Ref<qx::Object> readStream(std::istream& stream, const std::type_info& type, Slot error);
+    qx::Ref<qx::Object> unmarshall(qx::XMLDocument* xml, const std::type_info& type, Slot error);
     using Visitor = qx::detail::UniqueFunction<qx::detail::Visited(const qx::Ref<qx::Object>&)>;
     bool readEach(const qx::String& path, const qx::String& elementName, const std::type_info& type,
-                  Visitor visitor, qx::Ref<qx::Error>* error);
+                  Visitor visitor, Slot error);
     bool readEach(std::istream& stream, const qx::String& elementName, const std::type_info& type,
-                  Visitor visitor, qx::Ref<qx::Error>* error);
+                  Visitor visitor, Slot error);
     bool readEach(qx::ByteSource& source, const qx::String& elementName, const std::type_info& type,
-                  Visitor visitor, qx::Ref<qx::Error>* error);
-    bool readFileInto(qx::Object* object, const qx::String& path, qx::Ref<qx::Error>* error);
-    bool readBytesInto(qx::Object* object, qx::XMLBytes xml, qx::Ref<qx::Error>* error);
-    bool readInputInto(qx::Object* object, std::istream& stream, qx::Ref<qx::Error>* error);
-    bool readTreeInto(qx::Object* object, qx::XMLDocument* document, qx::Ref<qx::Error>* error);
+                  Visitor visitor, Slot error);
+    bool readFileInto(qx::Object* object, const qx::String& path, Slot error);
+    bool readBytesInto(qx::Object* object, qx::XMLBytes xml, Slot error);
+    bool readInputInto(qx::Object* object, std::istream& stream, Slot error);
+    bool readTreeInto(qx::Object* object, qx::XMLDocument* document, Slot error);
     using Producer = qx::detail::UniqueFunction<qx::Value()>;
-    bool writeEach(const qx::String& path, const qx::String& rootName, Producer next,
-                   qx::Ref<qx::Error>* error, qx::XMLOptions layout);
-    bool writeEach(std::ostream& stream, const qx::String& rootName, Producer next,
-                   qx::Ref<qx::Error>* error, qx::XMLOptions layout);
+    bool writeEach(const qx::String& path, const qx::String& rootName, Producer next, Slot error,
+                   qx::XMLOptions layout);
+    bool writeEach(std::ostream& stream, const qx::String& rootName, Producer next, Slot error,
+                   qx::XMLOptions layout);
 
     qx::Ref<QXXMLMarshallingMapping> _mapping;
     bool _saveUnknownXML = true;
@@ -497,4 +496,5 @@ private:
     bool _matchesNamespaces = false;
     NamespacePrefixes _namespacePrefixes;
     std::shared_ptr<const qx::NamespaceTable> _namespaces; // null: names are matched as written
+    std::shared_ptr<qx::detail::ReadingMemory> _memory;    // null before the first reading
 };

@@ -8,6 +8,7 @@
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
 #include "marshaller/NoUndo.h"
+#include "marshaller/ReadingMemory.h"
 #include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
@@ -22,6 +23,7 @@ using qx::detail::ClassPlan;
 using qx::detail::ErrorDetails;
 using qx::detail::MappingPlan;
 using qx::detail::ReadingContext;
+using qx::detail::ReadingMemory;
 using qx::detail::reset;
 
 namespace {
@@ -90,17 +92,21 @@ Ref<qx::Object> objectOf(QXXMLMarshaller& marshaller, const Source& source,
     return objectOf(marshaller, document, type, error);
 }
 
-Source sourceOf(const QXXMLMarshaller& marshaller, Ref<qx::Data> data, Ref<Error>* error) {
+Source sourceOf(QXXMLMarshaller& marshaller, Ref<qx::Data> data, Ref<Error>* error) {
     if (!data)
         return {};
-    return {qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error), {}};
+    return {qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error,
+                                 &ReadingMemory::of(marshaller).names),
+            {}};
 }
 
-Source sourceOf(const QXXMLMarshaller& marshaller, qx::XMLBytes bytes, Ref<Error>* error) {
-    return {qx::XMLParser::parseCopy(bytes, qx::detail::parsingOf(marshaller), error), {}};
+Source sourceOf(QXXMLMarshaller& marshaller, qx::XMLBytes bytes, Ref<Error>* error) {
+    return {qx::XMLParser::parseCopy(bytes, qx::detail::parsingOf(marshaller), error,
+                                     &ReadingMemory::of(marshaller).names),
+            {}};
 }
 
-Source sourceOfFile(const QXXMLMarshaller& marshaller, const String& path, Ref<Error>* error) {
+Source sourceOfFile(QXXMLMarshaller& marshaller, const String& path, Ref<Error>* error) {
     Source source = sourceOf(marshaller, qx::readFile(path, error), error);
     source.name = path;
     if (!source.parsed)

@@ -100,11 +100,9 @@ public:
         const ByteBlock sums(_mm_sad_epu8(ones, _mm_setzero_si128()));
         return sums.lowerWord() + sums.upperWord();
     }
-    // A bit for each quote and angle bracket.
-    std::uint64_t tagMarks() const noexcept {
-        const __m128i marks = _mm_or_si128(_mm_or_si128(equal('"'), equal('\'')),
-                                           _mm_or_si128(equal('<'), equal('>')));
-        return static_cast<std::uint32_t>(_mm_movemask_epi8(marks));
+    // A bit for each that is that one.
+    std::uint64_t marks(char c) const noexcept {
+        return static_cast<std::uint32_t>(_mm_movemask_epi8(equal(c)));
     }
     // The first bytes, zeros behind them.
     ByteBlock first(std::size_t count) const noexcept {
@@ -200,11 +198,11 @@ const char* endOfRun(const char* at, [[maybe_unused]] const char* end) noexcept 
     }
 }
 
-// Walks over the quotes and angle brackets of a text: those of 64 bytes are found together.
-class TagMarks {
+// Walks over the "<" of a text: those of 64 bytes are found together.
+class MarkupStarts {
 public:
     // From there on, where the text goes on.
-    TagMarks(const char* at, const char* end) noexcept : _at(at), _end(end) {}
+    MarkupStarts(const char* at, const char* end) noexcept : _at(at), _end(end) {}
 
     // The next one; null where fewer than 64 bytes are left to look at.
     const char* next() noexcept {
@@ -226,11 +224,11 @@ private:
     // A bit for each of sixteen bytes.
     static std::uint64_t marksOf(const char* at) noexcept {
 #if defined(__SSE2__)
-        return ByteBlock(at).tagMarks();
+        return ByteBlock(at).marks('<');
 #else
         std::uint64_t marks = 0;
         for (unsigned i = 0; i < 16; ++i)
-            marks |= std::uint64_t{at[i] != '\0' && !is(at[i], tagByte)} << i;
+            marks |= std::uint64_t{at[i] == '<'} << i;
         return marks;
 #endif
     }

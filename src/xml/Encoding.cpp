@@ -104,6 +104,9 @@ EncodingSignature encodingSignature(std::string_view bytes) noexcept {
         {"\xFF\xFE"sv, {"UTF-16LE", 2}},     {"\0\0\0<"sv, {"UTF-32BE", 0}},
         {"<\0\0\0"sv, {"UTF-32LE", 0}},      {"\0<"sv, {"UTF-16BE", 0}},
         {"<\0"sv, {"UTF-16LE", 0}}};
+    const bool isUsual = bytes.size() > 1 && bytes[0] == '<' && bytes[1] != '\0';
+    if (isUsual)
+        return {nullptr, 0};
     for (const Known& known : all)
         if (bytes.starts_with(known.start))
             return known.signature;
@@ -146,9 +149,10 @@ DocumentEncoding encodingOf(std::string_view bytes) {
     const EncodingSignature signature = encodingSignature(bytes);
     const bool isSigned = signature.encoding != nullptr;
     const String name = isSigned ? String(signature.encoding) : encodingInDeclaration(bytes);
-    if (name.isEmpty() || isUTF8Name(name))
-        return {nullptr, signature.markSize, false};
-    return {name, signature.markSize, !isSigned};
+    if (!name.isEmpty() && !isUTF8Name(name))
+        return {name, signature.markSize, !isSigned, nullptr};
+    return {nullptr, signature.markSize, false,
+            isSigned ? encodingInDeclaration(bytes.substr(signature.markSize)) : name};
 }
 
 DecodeResult decode(std::string_view bytes, const String& encoding, std::string& text) {

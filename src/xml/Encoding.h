@@ -48,6 +48,9 @@ struct DocumentEncoding {
     // How many bytes the byte-order mark takes.
     std::size_t markSize = 0;
     bool isDeclared = false;
+    // As the declaration names it; null where it names none or the bytes have to be made UTF-8
+    // first.
+    String declared;
 
     // An encoding that stores ASCII in another way cannot be what the declaration was read in.
     bool isContradictedBy(std::string_view text) const noexcept;

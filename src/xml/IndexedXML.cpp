@@ -91,12 +91,12 @@ void IndexedXML::findRoot() noexcept {
 void IndexedXML::internNames() {
     const auto names = _index->names();
     for (std::size_t i = 0; i < names.size(); ++i) {
-        String known = knownName(names[i]);
-        if (known.isSameAs(names[i]))
+        const Key known = names[i].isInterned() ? Key() : Key::existing(names[i].view());
+        if (known.isNull())
             continue;
         if (_interned.empty())
             _interned.assign(names.begin(), names.end());
-        _interned[i] = std::move(known);
+        _interned[i] = known.string();
     }
 }
 

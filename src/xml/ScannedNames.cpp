@@ -3,6 +3,8 @@
 #include "base/KnownName.h"
 #include "xml/XMLCharacters.h"
 
+#include <utility>
+
 namespace qx {
 
 namespace {
@@ -14,12 +16,31 @@ void require(bool condition) {
 
 } // namespace
 
-ScannedNames::ScannedNames(std::string_view text, std::size_t longest, std::vector<String>& texts)
-    : _text(text), _longest(longest), _seed(String::hashOf("names of a document")), _slots(256),
-      _texts(texts) {
+ScannedNames::ScannedNames(std::size_t longest)
+    : _longest(longest), _seed(String::hashOf("names of a document")), _slots(256) {
     constexpr std::size_t usualCount = 32;
     _names.reserve(usualCount);
     _texts.reserve(usualCount);
+}
+
+ScannedNames ScannedNames::take(Kept* kept, std::size_t longest) {
+    auto known = kept != nullptr ? std::exchange(*kept, std::nullopt) : std::nullopt;
+    if (!known || known->_longest != longest)
+        return ScannedNames(longest);
+    known->_URIs = 0;
+    return std::move(*known);
+}
+
+std::vector<String> ScannedNames::finish(std::uint32_t element, Kept* kept) {
+    constexpr std::size_t mostKept = 100;
+    constexpr std::uint32_t mostElements =
+        UINT32_MAX / 4; // the next document has no more than that
+    if (kept == nullptr || _texts.size() > mostKept || element > mostElements)
+        return std::move(_texts);
+    _element = element;
+    auto texts = _texts;
+    *kept = std::move(*this);
+    return texts;
 }
 
 ScannedNames::Name& ScannedNames::findLong(std::string_view text) {
@@ -27,7 +48,7 @@ ScannedNames::Name& ScannedNames::findLong(std::string_view text) {
     const std::size_t mask = _slots.size() - 1;
     for (std::size_t slot = hash & mask; _slots[slot] != 0; slot = (slot + 1) & mask) {
         Name& name = _names[_slots[slot] - 1];
-        if (_text.substr(name.begin, name.size) == text)
+        if (this->text(name) == text)
             return name;
     }
     return add(text, {UINT64_MAX, UINT64_MAX}, hash);
@@ -36,15 +57,7 @@ ScannedNames::Name& ScannedNames::findLong(std::string_view text) {
 ScannedNames::Name& ScannedNames::add(std::string_view text, const ShortName& bytes,
                                       std::uint32_t hash) {
     require(text.size() <= _longest && _URIs + _names.size() < xmlLimits::names);
-    Name name{bytes,
-              static_cast<std::uint32_t>(text.data() - _text.data()),
-              static_cast<std::uint32_t>(text.size()),
-              hash,
-              0,
-              0,
-              none,
-              0,
-              0};
+    Name name{bytes, static_cast<std::uint32_t>(text.size()), hash, 0, 0, none, 0, 0};
     if (!text.empty())
         takeApart(name, text);
     if ((_names.size() + 1) * 2 > _slots.size())

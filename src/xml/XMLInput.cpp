@@ -41,7 +41,7 @@ bool XMLInput::decodeBytes(std::string_view bytes) {
         convert(bytes, encoding.name);
     if (encoding.isContradictedBy(_text))
         throw ParseFailure(parseErrors::otherEncoding, {encoding.name}, 0);
-    _declaredEncoding = encodingInDeclaration(_text);
+    _declaredEncoding = encoding.name.isNull() ? encoding.declared : encodingInDeclaration(_text);
     return !encoding.name.isNull();
 }
 

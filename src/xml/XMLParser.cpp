@@ -7,25 +7,26 @@
 namespace qx {
 
 XMLParser::Parsed XMLParser::parse(Ref<const Data> data, const XMLParseOptions& options,
-                                   Ref<Error>* error) {
+                                   Ref<Error>* error, Names* names) {
     const std::string_view bytes = data->view();
-    return run(bytes, std::move(data), options, error, Way::fastest);
+    return run(bytes, std::move(data), options, error, names, Way::fastest);
 }
 
 XMLParser::Parsed XMLParser::parseCopy(XMLBytes bytes, const XMLParseOptions& options,
-                                       Ref<Error>* error, Way way) {
-    return run(bytes.view(), nullptr, options, error, way);
+                                       Ref<Error>* error, Names* names, Way way) {
+    return run(bytes.view(), nullptr, options, error, names, way);
 }
 
 XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
-                                 const XMLParseOptions& options, Ref<Error>* error, Way way) {
+                                 const XMLParseOptions& options, Ref<Error>* error, Names* names,
+                                 Way way) {
     const auto parsed = std::make_shared<ParsedDocument>();
     parsed->_owner = std::move(owner);
     XMLInput& input = parsed->_input;
     try {
         input.read(bytes, !parsed->_owner);
         parsed->_index = XMLIndex(input.text());
-        fill(parsed->_index, options, way);
+        fill(parsed->_index, options, names, way);
         return parsed;
     } catch (const ParseFailure& failure) {
         if (error != nullptr)
@@ -35,16 +36,16 @@ XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
 }
 
 XMLParser::Parsed XMLParser::parsePiece(std::string text, const TextOrigin& origin,
-                                        const XMLParseOptions& options) {
+                                        const XMLParseOptions& options, Names* names) {
     const auto parsed = std::make_shared<ParsedDocument>();
     parsed->_input.take(std::move(text));
     parsed->_index = XMLIndex(parsed->_input.text(), origin);
-    fill(parsed->_index, options, Way::fastest);
+    fill(parsed->_index, options, names, Way::fastest);
     return parsed;
 }
 
-void XMLParser::fill(XMLIndex& index, const XMLParseOptions& options, Way way) {
-    if (way == Way::cParserOnly || !XMLScanner::scan(index, options))
+void XMLParser::fill(XMLIndex& index, const XMLParseOptions& options, Names* names, Way way) {
+    if (way == Way::cParserOnly || !XMLScanner::scan(index, options, names))
         SAXSession(index, options).run();
 }
 

@@ -91,20 +91,33 @@ XMLParser::Parsed XMLPieces::parse(const XMLSplitter& before, Found found) {
             throw failure;
         }
         auto parsed =
-            XMLParser::parsePiece(std::string(_opening).append(text()), _origin, _options);
+            XMLParser::parsePiece(std::string(_opening).append(text()), _origin, _options, &_names);
         if (_splitter.isFaulty() || isBeyondLimit())
             throw ParseFailure(parseErrors::textTooLarge, {_options.maximumTextSize},
                                _opening.size() + _splitter.position());
         return parsed;
     } catch (const ParseFailure& failure) {
         const std::size_t fault = failure.offset - std::min(failure.offset, _opening.size());
-        _splitter = before;
-        _splitter.goOver(text().substr(0, fault), std::string_view::npos);
-        if (_splitter.itemCount() == 0)
+        if (!cutBefore(fault, before))
             throw;
+        const std::size_t cut = _splitter.cut();
         _hasEnded = false;
-        return parseUpToCut();
+        try {
+            return parseUpToCut();
+        } catch (const ParseFailure&) {
+            // It lies in the last item: at its end a tag inside that was not closed has shown.
+            if (!cutBefore(cut - 1, before))
+                throw failure;
+            return parseUpToCut();
+        }
     }
+}
+
+// False where no item ends before that place.
+bool XMLPieces::cutBefore(std::size_t place, const XMLSplitter& before) {
+    _splitter = before;
+    _splitter.goOver(text().substr(0, place), std::string_view::npos);
+    return _splitter.itemCount() != 0;
 }
 
 XMLParser::Parsed XMLPieces::parseUpToCut() {
@@ -113,7 +126,7 @@ XMLParser::Parsed XMLPieces::parseUpToCut() {
     std::string piece;
     piece.reserve(_opening.size() + cut + closing.size());
     piece.append(_opening).append(text().substr(0, cut)).append(closing);
-    auto parsed = XMLParser::parsePiece(std::move(piece), _origin, _options);
+    auto parsed = XMLParser::parsePiece(std::move(piece), _origin, _options, &_names);
     removeUpToCut();
     return parsed;
 }

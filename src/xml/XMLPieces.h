@@ -37,11 +37,13 @@ private:
     void readMore();
     XMLParser::Parsed parse(const XMLSplitter& before, Found found);
     XMLParser::Parsed parseUpToCut();
+    bool cutBefore(std::size_t place, const XMLSplitter& before);
     void removeUpToCut();
 
     XMLTextSource _source;
     XMLSplitter _splitter;
     const XMLParseOptions _options;
+    XMLParser::Names _names;
     std::string _text;
     std::size_t _start = 0;                 // of what has not been handed out
     std::string _opening;                   // goes before that

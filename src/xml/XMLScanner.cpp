@@ -4,7 +4,6 @@
 #include "xml/XMLLimits.h"
 
 #include <algorithm>
-#include <cstring>
 #include <tuple>
 
 namespace qx {
@@ -22,11 +21,14 @@ constexpr std::ptrdiff_t emptyCData = 12;
 
 } // namespace
 
-bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options) {
+bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options, ScannedNames::Kept* kept) {
     if (index.text().size() >= UINT32_MAX)
         return false;
     try {
-        XMLScanner(index, options).scanDocument();
+        const std::size_t longest = std::min(longestName, options.maximumTextSize);
+        XMLScanner scanner(index, options, ScannedNames::take(kept, longest));
+        scanner.scanDocument();
+        index._names = scanner._names.finish(scanner._element, kept);
         return true;
     } catch (const Refused&) {
         index = XMLIndex(index.text(), index.origin());
@@ -34,11 +36,13 @@ bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options) {
     }
 }
 
-XMLScanner::XMLScanner(XMLIndex& index, const XMLParseOptions& options)
+XMLScanner::XMLScanner(XMLIndex& index, const XMLParseOptions& options, ScannedNames names)
     : _text(index.text()), _end(_text.data() + _text.size()), _maximumDepth(options.maximumDepth),
       _maximumSize(std::min(options.maximumTextSize, largestPiece)),
-      _keepsWhiteSpace(options.keepWhiteSpace), _index(index),
-      _names(_text, std::min(longestName, _maximumSize), index._names) {
+      _keepsWhiteSpace(options.keepWhiteSpace), _index(index), _names(std::move(names)),
+      _element(_names.element()) {
+    constexpr std::size_t usualDepth = 16;
+    _open.reserve(usualDepth);
     // Most entries stand for more bytes than this.
     constexpr std::size_t bytesOfEntry = 16;
     makeRoom(_text.size() / bytesOfEntry + 16);
@@ -260,8 +264,7 @@ inline XMLScanner::Place XMLScanner::scanEndTag(Place at) {
     const Name& name = _names[_first[_open.back().number].name()];
     at += 2;
     require((name.size <= ShortName::longest && name.bytes.standsAt(at, _end, name.size)) ||
-            (static_cast<std::size_t>(_end - at) > name.size &&
-             std::memcmp(at, _text.data() + name.begin, name.size) == 0));
+            startsWith(at, _names.text(name)));
     at = expect(afterWhite(at + name.size), '>');
     endElement(at);
     return at;

@@ -23,8 +23,9 @@ namespace qx {
 class XMLScanner {
 public:
     // Fills the index, which is empty, from its text; a zero byte follows that. False where the
-    // text is refused: the index is empty then.
-    static bool scan(XMLIndex& index, const XMLParseOptions& options);
+    // text is refused: the index is empty then. Documents that share `kept` share their names.
+    static bool scan(XMLIndex& index, const XMLParseOptions& options,
+                     ScannedNames::Kept* kept = nullptr);
 
 private:
     using Number = XMLIndex::Number;
@@ -38,7 +39,7 @@ private:
         bool preservesSpace;      // so do the elements inside
     };
 
-    XMLScanner(XMLIndex& index, const XMLParseOptions& options);
+    XMLScanner(XMLIndex& index, const XMLParseOptions& options, ScannedNames names);
 
     // Each is given the place where it begins, which is there, and answers where it ends.
     using Place = const char*;
@@ -103,8 +104,8 @@ private:
     std::vector<Open> _open;
     ScannedNames _names;
     Number _latestName = ScannedNames::none;
-    std::uint32_t _element = 0; // counts the start tags
-    bool _needsWork = false;    // of the value that is being scanned
+    std::uint32_t _element;  // counts the start tags
+    bool _needsWork = false; // of the value that is being scanned
 };
 
 } // namespace qx

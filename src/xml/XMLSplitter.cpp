@@ -29,7 +29,8 @@ std::string_view localPart(std::string_view name) noexcept {
 
 XMLSplitter::XMLSplitter(String itemName, Match match)
     : _match(match),
-      _itemName(match == Match::names ? std::move(itemName) : String(localPart(itemName))) {}
+      _itemName(match == Match::names ? std::move(itemName) : String(localPart(itemName))),
+      _itemStart(_itemName.isEmpty() ? '\0' : _itemName.view().front()) {}
 
 bool XMLSplitter::isItemName(std::string_view name) const noexcept {
     return (_match == Match::names ? name : localPart(name)) == _itemName;
@@ -39,7 +40,7 @@ void XMLSplitter::goOver(std::string_view text, std::size_t enough) {
     _text = text;
     do {
         if (_depth != 0 && _seen == 0)
-            goOverTags();
+            goOverItem();
     } while (_cut < enough && _at < _text.size() && !_isFaulty && goOverNext());
     _text = {};
 }
@@ -114,36 +115,27 @@ bool XMLSplitter::goOverNext() {
     }
 }
 
-// Goes over tags and texts inside an item as long as they are whole and nothing else comes: most of
-// a document. What ends the item, is faulty or stands near the end of the text is left alone.
-void XMLSplitter::goOverTags() {
-    TagMarks marks(_text.data() + _at, _text.data() + _text.size());
-    const char* mark = marks.next();
-    while (true) {
-        while (mark != nullptr && *mark != '<')
-            mark = marks.next();
-        if (mark == nullptr || mark[1] == '!' || mark[1] == '?')
+// Goes over what an item holds, most of a document, up to what may end it: a tag of its name, or a
+// comment and the like, which may have such a tag in it. No other "<" needs to be looked at. What
+// stands near the end of the text is left alone.
+void XMLSplitter::goOverItem() {
+    MarkupStarts starts(_text.data() + _at, _text.data() + _text.size());
+    while (const char* const start = starts.next()) {
+        _at = static_cast<End>(start - _text.data());
+        if (start[1] == '!' || start[1] == '?')
             return;
-        const char* const tag = mark;
-        const bool isEndTag = tag[1] == '/';
-        mark = marks.next();
-        while (mark != nullptr && (*mark == '"' || *mark == '\'')) {
-            const char quote = *mark;
-            mark = marks.next();
-            while (!isEndTag && mark != nullptr && *mark != quote && *mark != '<')
-                mark = marks.next();
-            if (!isEndTag && mark != nullptr && *mark == quote)
-                mark = marks.next();
-        }
-        if (mark == nullptr || *mark != '>' || (isEndTag && _depth == 1))
+        const std::size_t name = _at + (start[1] == '/' ? 2 : 1);
+        if ((_match == Match::localNames || _text[name] == _itemStart) && isItemName(nameAt(name)))
             return;
-        if (isEndTag)
-            --_depth;
-        else if (mark[-1] != '/')
-            ++_depth;
-        _at = static_cast<End>(mark + 1 - _text.data());
-        mark = marks.next();
     }
+}
+
+// A zero byte ends the last one.
+std::string_view XMLSplitter::nameAt(std::size_t begin) const noexcept {
+    const char* at = _text.data() + begin;
+    while (is(*at, nameByte))
+        ++at;
+    return {_text.data() + begin, at};
 }
 
 XMLSplitter::End XMLSplitter::behind(std::string_view mark, std::size_t from) const {
@@ -244,14 +236,14 @@ bool XMLSplitter::goOverStartTag() {
         return pass(end);
     const std::string_view tag = _text.substr(_at, end - _at);
     const bool isEmpty = tag[tag.size() - 2] == '/';
-    if (_depth != 0) {
-        _depth += isEmpty ? 0 : 1;
-        return pass(end);
-    }
     if (_open.empty() && !_root.empty())
         return fail();
     const std::size_t nameSize = tag.find_first_of(" \t\r\n/>") - 1;
     const bool isItem = isItemName(tag.substr(1, nameSize));
+    if (_depth != 0) {
+        _depth += isItem && !isEmpty ? 1 : 0;
+        return pass(end);
+    }
     if (isItem)
         _depth = 1;
     else
@@ -268,11 +260,11 @@ bool XMLSplitter::goOverEndTag() {
     if (_text[mark] == '<')
         return fail();
     const End end = mark + 1;
-    if (_depth == 0) {
-        const std::string_view name = _text.substr(_at + 2, end - _at - 3);
-        if (_open.empty() || withoutTrailingWhite(name) != _open.back().name())
-            return fail();
-    }
+    const std::string_view name = withoutTrailingWhite(_text.substr(_at + 2, end - _at - 3));
+    if (_depth != 0)
+        return isItemName(name) ? endElement(end) : pass(end);
+    if (_open.empty() || name != _open.back().name())
+        return fail();
     return endElement(end);
 }
 

@@ -73,7 +73,8 @@ private:
     using End = std::size_t;
 
     bool goOverNext();
-    void goOverTags();
+    void goOverItem();
+    std::string_view nameAt(std::size_t begin) const noexcept;
     bool goOverDeclaration();
     bool goOverInstruction();
     bool goOverStartTag();
@@ -94,13 +95,14 @@ private:
 
     Match _match;
     String _itemName;
+    char _itemStart;
     std::string_view _text;
     std::size_t _at = 0;
     std::size_t _seen = 0; // up to here what begins at _at does not end
     char _quote = 0;       // that is open there, in a tag
     std::size_t _cut = 0;
     std::size_t _itemCount = 0;
-    std::size_t _depth = 0; // of elements inside an item
+    std::size_t _depth = 0; // of elements of its name in an item, itself among them
     bool _isFaulty = false;
     std::string _prologue; // the declaration and the DOCTYPE
     std::vector<Open> _open;

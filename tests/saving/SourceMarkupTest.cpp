@@ -14,7 +14,7 @@ using qx::detail::SourceMarkup;
 
 // The C parser lists declarations before attributes.
 std::set<std::string> spotsOf(const std::string& text, XMLParser::Way way) {
-    const auto parsed = XMLParser::parseCopy(std::string_view(text), {}, nullptr, way);
+    const auto parsed = XMLParser::parseCopy(std::string_view(text), {}, nullptr, nullptr, way);
     const qx::XMLIndex& index = parsed->index();
     const SourceMarkup markup(index);
     std::set<std::string> all;
