@@ -17,11 +17,14 @@ inline bool isWhite(std::string_view text) noexcept {
 }
 
 constexpr std::string_view withoutLeadingWhite(std::string_view text) noexcept {
-    text.remove_prefix(std::min(text.find_first_not_of(whiteSpace), text.size()));
+    while (!text.empty() && isWhite(text.front()))
+        text.remove_prefix(1);
     return text;
 }
 constexpr std::string_view withoutTrailingWhite(std::string_view text) noexcept {
-    return text.substr(0, text.find_last_not_of(whiteSpace) + 1);
+    while (!text.empty() && isWhite(text.back()))
+        text.remove_suffix(1);
+    return text;
 }
 constexpr std::string_view trimmed(std::string_view text) noexcept {
     return withoutTrailingWhite(withoutLeadingWhite(text));

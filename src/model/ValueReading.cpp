@@ -30,6 +30,18 @@ bool isWholeReal(const Value& value, double from, double to) {
     return std::trunc(real) == real && real >= from && real < to;
 }
 
+// XML Schema's words for what is no finite number; std::from_chars has others.
+bool readNotFinite(std::string_view text, double& result) {
+    const bool isNegative = text == "-INF";
+    if (text == "NaN")
+        result = std::numeric_limits<double>::quiet_NaN();
+    else if (isNegative || text == "INF")
+        result = isNegative ? -HUGE_VAL : HUGE_VAL;
+    else
+        return false;
+    return true;
+}
+
 } // namespace
 
 bool readBoolean(const Value& value, bool& result) {
@@ -77,16 +89,11 @@ bool readUnsigned(const Value& value, std::uint64_t& result) {
     return true;
 }
 
-// XML Schema's words for what is no finite number; std::from_chars has others.
 bool readReal(const Value& value, double& result) {
     if (value.isString()) {
-        const std::string_view text = trimmed(value.view());
         double read = 0;
-        if (text == "NaN")
-            read = std::numeric_limits<double>::quiet_NaN();
-        else if (text == "INF" || text == "-INF")
-            read = text.front() == '-' ? -HUGE_VAL : HUGE_VAL;
-        else if (!readWhole(text, read) || !std::isfinite(read))
+        const bool isFinite = readWhole(value.view(), read) && std::isfinite(read);
+        if (!isFinite && !readNotFinite(trimmed(value.view()), read))
             return false;
         result = read;
         return true;
