@@ -43,6 +43,49 @@ public:
         return place;
     }
 
+    // Writes at the end of the buffer, which is made room in once: for that many bytes, and for
+    // what is written in whole blocks and overwritten by what follows. The text has it once it is
+    // kept.
+    class Piece {
+    public:
+        static constexpr std::size_t blockSize = 16;
+
+        Piece(TextBuffer& buffer, std::size_t most) : _buffer(buffer) {
+            if (buffer._capacity - buffer._size < most + blockSize)
+                buffer.grow(most + blockSize);
+            _at = reinterpret_cast<char*>(buffer._rep + 1) + buffer._size;
+        }
+        Piece(const Piece&) = delete;
+        Piece& operator=(const Piece&) = delete;
+
+        Piece& operator+=(char c) noexcept {
+            *_at++ = c;
+            return *this;
+        }
+        Piece& operator+=(std::string_view text) noexcept {
+            copy(text.data(), text.size(), _at);
+            _at += text.size();
+            return *this;
+        }
+        void addBlanks(std::size_t count) noexcept {
+            for (std::size_t i = 0; i < count; i += blockSize)
+                std::memset(_at + i, ' ', blockSize);
+            _at += count;
+        }
+        // Where the next bytes stand, and that so many were put there.
+        char* end() const noexcept { return _at; }
+        void advance(std::size_t count) noexcept { _at += count; }
+
+        void keep() noexcept {
+            _buffer._size =
+                static_cast<std::size_t>(_at - reinterpret_cast<char*>(_buffer._rep + 1));
+        }
+
+    private:
+        TextBuffer& _buffer;
+        char* _at;
+    };
+
     // The text; the buffer is empty afterwards.
     String take();
 

@@ -52,8 +52,14 @@ void XMLDraft::append(Node*& last, Node* node) noexcept {
 }
 
 XMLDraft::Element& XMLDraft::newElement(const String& name) {
-    return *::new (allocate(sizeof(Element))) Element{
-        {&name, nullptr, Node::bitsOf(Kind::element, 0)}, nullptr, nullptr, false, false, false};
+    return *::new (allocate(sizeof(Element)))
+        Element{{&name, nullptr, Node::bitsOf(Kind::element, 0)},
+                nullptr,
+                nullptr,
+                false,
+                false,
+                false,
+                false};
 }
 
 void XMLDraft::addDeclaration(Element& element, const String& prefix, const String& URI) {
@@ -135,6 +141,7 @@ void XMLDraft::setText(Element& element, std::string_view text) {
     _children.erase(&element);
     element.lastChild = nullptr;
     element.hasText = node != nullptr;
+    element.hasKept = false;
     if (node != nullptr)
         append(element.lastChild, node);
 }
@@ -147,9 +154,11 @@ void XMLDraft::moveChildren(Element& from, Element& to) {
         std::swap(last->next, to.lastChild->next);
     to.lastChild = last;
     to.hasText = to.hasText || from.hasText;
+    to.hasKept = to.hasKept || from.hasKept;
 }
 
 XMLElement& XMLDraft::holderOfChildren(Element& element) {
+    element.hasKept = true;
     return newHolder(Kind::keptChildren, element.lastChild);
 }
 

@@ -68,6 +68,7 @@ public:
         Node* lastAttribute; // declarations stand among the attributes
         Node* lastChild;
         bool hasText;         // a text that is not empty
+        bool hasKept;         // places for what is kept among the children
         bool hasDeclarations; // of whatever kind
         bool isIndexed;       // its attributes are
     };
