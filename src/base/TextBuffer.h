@@ -4,8 +4,7 @@
 
 #include <QXXMLMarshalling/base/String.h>
 
-#include <cstdint>
-#include <cstring>
+#include "base/ShortCopy.h"
 
 namespace qx {
 
@@ -22,7 +21,7 @@ public:
     }
 
     TextBuffer& operator+=(std::string_view text) {
-        copy(text.data(), text.size(), extend(text.size()));
+        copyShort(text.data(), text.size(), extend(text.size()));
         return *this;
     }
     TextBuffer& operator+=(char c) {
@@ -63,7 +62,7 @@ public:
             return *this;
         }
         Piece& operator+=(std::string_view text) noexcept {
-            copy(text.data(), text.size(), _at);
+            copyShort(text.data(), text.size(), _at);
             _at += text.size();
             return *this;
         }
@@ -91,25 +90,6 @@ public:
 
 private:
     void grow(std::size_t count);
-    // Most pieces are short: for these a call would cost more than the copy.
-    static void copy(const char* from, std::size_t size, char* to) noexcept {
-        const auto copyEnds = [&]<class Word>(Word first, Word last) {
-            std::memcpy(&first, from, sizeof(Word));
-            std::memcpy(&last, from + size - sizeof(Word), sizeof(Word));
-            std::memcpy(to, &first, sizeof(Word));
-            std::memcpy(to + size - sizeof(Word), &last, sizeof(Word));
-        };
-        if (size > 2 * sizeof(std::uint64_t))
-            std::memcpy(to, from, size);
-        else if (size >= sizeof(std::uint64_t))
-            copyEnds(std::uint64_t{}, std::uint64_t{});
-        else if (size >= sizeof(std::uint32_t))
-            copyEnds(std::uint32_t{}, std::uint32_t{});
-        else
-            for (std::size_t i = 0; i < size; ++i)
-                to[i] = from[i];
-    }
-
     String::Rep* _rep = nullptr;
     std::size_t _size = 0;
     std::size_t _capacity = 0; // of text, without the zero byte at its end

@@ -22,10 +22,14 @@
 
 #include <QXXMLMarshalling/xml/XMLElement.h>
 
+#include "base/ShortCopy.h"
+
+#include <algorithm>
 #include <cstdint>
 #include <memory>
 #include <unordered_map>
 #include <unordered_set>
+#include <utility>
 #include <vector>
 
 namespace qx {
@@ -80,13 +84,27 @@ public:
     XMLDraft& operator=(const XMLDraft&) = delete;
 
     // An element that stands nowhere yet.
-    Element& newElement(const String& name);
+    Element& newElement(const String& name) {
+        return *::new (allocate(sizeof(Element)))
+            Element{{&name, nullptr, Node::bitsOf(Kind::element, 0)},
+                    nullptr,
+                    nullptr,
+                    false,
+                    false,
+                    false,
+                    false};
+    }
     // Adds nothing when the prefix is declared there already.
     void addDeclaration(Element& element, const String& prefix, const String& URI);
     // Adds nothing when an attribute of that name is there already.
     void addAttribute(Element& element, const String& name, std::string_view value);
-    static void addChild(Element& parent, Element& child) noexcept;
-    void addLeaf(Element& parent, const String& name, std::string_view text);
+    static void addChild(Element& parent, Element& child) noexcept {
+        append(parent.lastChild, &child);
+    }
+    void addLeaf(Element& parent, const String& name, std::string_view text) {
+        append(parent.lastChild,
+               text.empty() ? &newElement(name) : newText(Kind::leaf, &name, text));
+    }
     // Takes the place of all children. An empty text is none.
     void setText(Element& element, std::string_view text);
     // Appends the children of the one to those of the other.
@@ -151,9 +169,21 @@ private:
     void grow(std::size_t size);
     // The element in place of the child, which has room for more than a text.
     Element& enlarged(Node& child);
-    Node* newNode(Kind kind, const String* name, std::string_view value);
+    Node* newNode(Kind kind, const String* name, std::string_view value) {
+        // What moves leaves a pointer.
+        void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
+        Node* const node = ::new (memory) Node{name, nullptr, Node::bitsOf(kind, value.size())};
+        copyShort(value.data(), value.size(), reinterpret_cast<char*>(node + 1));
+        return node;
+    }
+    Node* newText(Kind kind, const String* name, std::string_view value) {
+        return newNode(kind, name, _values == Values::copied ? value : std::string_view());
+    }
     XMLElement& newHolder(Kind kind, Node*& last);
-    static void append(Node*& last, Node* node) noexcept;
+    static void append(Node*& last, Node* node) noexcept {
+        node->next = last != nullptr ? std::exchange(last->next, node) : node;
+        last = node;
+    }
     bool hasAttribute(Element& element, const String& name);
     void indexAttributes(Element& element);
     Children& indexedChildren(const Element& element);
