@@ -42,6 +42,12 @@ public:
         return place;
     }
 
+    // Makes room for so many bytes in all.
+    void reserve(std::size_t capacity) {
+        if (capacity > _capacity)
+            grow(capacity - _size);
+    }
+
     // Writes at the end of the buffer, which is made room in once: for that many bytes, and for
     // what is written in whole blocks and overwritten by what follows. The text has it once it is
     // kept.

@@ -20,6 +20,7 @@ void XMLDraft::grow(std::size_t size) {
     _blockSize = std::min(2 * _blockSize, largestBlock);
     _next = _blocks.back().get();
     _left = capacity;
+    _allocated += capacity;
 }
 
 // The holder of the list's last place if that is of the kind, else of a new place at its end.

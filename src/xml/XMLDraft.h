@@ -126,6 +126,8 @@ public:
     template <class LastIn>
     Found lastChildNamed(const Element& element, const String& name, LastIn lastIn);
 
+    // How much memory it takes.
+    std::size_t size() const noexcept { return _allocated - _left; }
     // The tree as nodes, in a document of version "1.0" and encoding "UTF-8". What is kept moves.
     static Ref<XMLDocument> makeDocument(const Element& root);
 
@@ -193,6 +195,7 @@ private:
     std::vector<std::unique_ptr<std::byte[]>> _blocks;
     std::byte* _next = nullptr;
     std::size_t _left = 0;
+    std::size_t _allocated = 0;
     std::size_t _blockSize = 2048;
     std::vector<Ref<XMLElement>> _holders;
     std::unordered_map<const Element*, Attributes> _attributes;
