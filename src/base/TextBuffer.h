@@ -4,8 +4,7 @@
 
 #include <QXXMLMarshalling/base/String.h>
 
-#include <cstdint>
-#include <cstring>
+#include "base/ShortCopy.h"
 
 namespace qx {
 
@@ -22,7 +21,7 @@ public:
     }
 
     TextBuffer& operator+=(std::string_view text) {
-        copy(text.data(), text.size(), extend(text.size()));
+        copyShort(text.data(), text.size(), extend(text.size()));
         return *this;
     }
     TextBuffer& operator+=(char c) {
@@ -43,30 +42,60 @@ public:
         return place;
     }
 
+    // Makes room for so many bytes in all.
+    void reserve(std::size_t capacity) {
+        if (capacity > _capacity)
+            grow(capacity - _size);
+    }
+
+    // Writes at the end of the buffer, which is made room in once: for that many bytes, and for
+    // what is written in whole blocks and overwritten by what follows. The text has it once it is
+    // kept.
+    class Piece {
+    public:
+        static constexpr std::size_t blockSize = 16;
+
+        Piece(TextBuffer& buffer, std::size_t most) : _buffer(buffer) {
+            if (buffer._capacity - buffer._size < most + blockSize)
+                buffer.grow(most + blockSize);
+            _at = reinterpret_cast<char*>(buffer._rep + 1) + buffer._size;
+        }
+        Piece(const Piece&) = delete;
+        Piece& operator=(const Piece&) = delete;
+
+        Piece& operator+=(char c) noexcept {
+            *_at++ = c;
+            return *this;
+        }
+        Piece& operator+=(std::string_view text) noexcept {
+            copyShort(text.data(), text.size(), _at);
+            _at += text.size();
+            return *this;
+        }
+        void addBlanks(std::size_t count) noexcept {
+            for (std::size_t i = 0; i < count; i += blockSize)
+                std::memset(_at + i, ' ', blockSize);
+            _at += count;
+        }
+        // Where the next bytes stand, and that so many were put there.
+        char* end() const noexcept { return _at; }
+        void advance(std::size_t count) noexcept { _at += count; }
+
+        void keep() noexcept {
+            _buffer._size =
+                static_cast<std::size_t>(_at - reinterpret_cast<char*>(_buffer._rep + 1));
+        }
+
+    private:
+        TextBuffer& _buffer;
+        char* _at;
+    };
+
     // The text; the buffer is empty afterwards.
     String take();
 
 private:
     void grow(std::size_t count);
-    // Most pieces are short: for these a call would cost more than the copy.
-    static void copy(const char* from, std::size_t size, char* to) noexcept {
-        const auto copyEnds = [&]<class Word>(Word first, Word last) {
-            std::memcpy(&first, from, sizeof(Word));
-            std::memcpy(&last, from + size - sizeof(Word), sizeof(Word));
-            std::memcpy(to, &first, sizeof(Word));
-            std::memcpy(to + size - sizeof(Word), &last, sizeof(Word));
-        };
-        if (size > 2 * sizeof(std::uint64_t))
-            std::memcpy(to, from, size);
-        else if (size >= sizeof(std::uint64_t))
-            copyEnds(std::uint64_t{}, std::uint64_t{});
-        else if (size >= sizeof(std::uint32_t))
-            copyEnds(std::uint32_t{}, std::uint32_t{});
-        else
-            for (std::size_t i = 0; i < size; ++i)
-                to[i] = from[i];
-    }
-
     String::Rep* _rep = nullptr;
     std::size_t _size = 0;
     std::size_t _capacity = 0; // of text, without the zero byte at its end

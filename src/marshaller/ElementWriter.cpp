@@ -2,40 +2,12 @@
 
 namespace qx::detail {
 
-WrittenElement ElementWriter::newElement(const String& name, std::size_t attributes) {
-    return _draft != nullptr ? WrittenElement(_draft->newElement(name))
-                             : WrittenElement(XMLElement::initForAttributes(name, attributes));
-}
-
 void ElementWriter::addDeclaration(const WrittenElement& element, const String& prefix,
                                    const String& URI) {
     if (element.node)
         element.node->addNamespace(XMLNode::namespaceWithName(prefix, URI));
     else
         _draft->addDeclaration(*element.drafted, prefix, URI);
-}
-
-// A kept element may be among those of a draft: it is a node all the same.
-void ElementWriter::addAttribute(const WrittenElement& element, const String& name,
-                                 const FieldText& value) {
-    if (element.node)
-        element.node->addAttribute(name, value.string());
-    else
-        _draft->addAttribute(*element.drafted, name, value.view());
-}
-
-void ElementWriter::addChild(const WrittenElement& parent, const WrittenElement& child) {
-    if (parent.node)
-        parent.node->addChild(child.node);
-    else
-        XMLDraft::addChild(*parent.drafted, *child.drafted);
-}
-
-void ElementWriter::addChild(const WrittenElement& parent, const String& name,
-                             const FieldText& text) {
-    if (parent.node)
-        return parent.node->addChild(XMLElement::initWithName(name, text.string()));
-    _draft->addLeaf(*parent.drafted, name, text.view());
 }
 
 void ElementWriter::setText(const WrittenElement& element, const FieldText& text) {

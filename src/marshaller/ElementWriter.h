@@ -31,12 +31,28 @@ public:
     explicit ElementWriter(XMLDraft* draft) noexcept : _draft(draft) {}
 
     // With memory for so many attributes.
-    WrittenElement newElement(const String& name, std::size_t attributes);
+    WrittenElement newElement(const String& name, std::size_t attributes) {
+        return _draft != nullptr ? WrittenElement(_draft->newElement(name))
+                                 : WrittenElement(XMLElement::initForAttributes(name, attributes));
+    }
     void addDeclaration(const WrittenElement& element, const String& prefix, const String& URI);
-    // Adds nothing when an attribute of that name is there already.
-    void addAttribute(const WrittenElement& element, const String& name, const FieldText& value);
-    void addChild(const WrittenElement& parent, const WrittenElement& child);
-    void addChild(const WrittenElement& parent, const String& name, const FieldText& text);
+    // Adds nothing when an attribute of that name is there already. A kept element may be among
+    // those of a draft: it is a node all the same.
+    void addAttribute(const WrittenElement& element, const String& name, const FieldText& value) {
+        if (!element.node)
+            return _draft->addAttribute(*element.drafted, name, value.view());
+        element.node->addAttribute(name, value.string());
+    }
+    void addChild(const WrittenElement& parent, const WrittenElement& child) {
+        if (!parent.node)
+            return XMLDraft::addChild(*parent.drafted, *child.drafted);
+        parent.node->addChild(child.node);
+    }
+    void addChild(const WrittenElement& parent, const String& name, const FieldText& text) {
+        if (!parent.node)
+            return _draft->addLeaf(*parent.drafted, name, text.view());
+        parent.node->addChild(XMLElement::initWithName(name, text.string()));
+    }
     // Takes the place of all children.
     void setText(const WrittenElement& element, const FieldText& text);
     // Appends the children of the one to those of the other, and drops what is left of the one.

@@ -87,6 +87,11 @@ Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Targe
 bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
                              ErrorSlot error) {
     ObjectAccess::Held held = ObjectAccess::get(object, field.key);
+    return writeValue(field, element, object, held, error);
+}
+
+bool Marshalling::writeValue(const FieldPlan& field, const WrittenElement& element, Object& object,
+                             ObjectAccess::Held& held, ErrorSlot error) {
     if (held.value().isNull() && field.isContainer) {
         if (!field.isRequired)
             return true;
@@ -95,10 +100,14 @@ bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& eleme
         held = {false, held.keepsZero()};
     }
     const Value& value = held.value();
-    if (const auto array = value.as<Array>())
-        return writeCollection(*this, field, element, *array, error);
-    if (value.isNull() || (value.isObject() && value.classNameForMarshalling().isNull()))
+    if (value.isObject()) {
+        if (const auto array = value.as<Array>())
+            return writeCollection(*this, field, element, *array, error);
+        if (value.classNameForMarshalling().isNull())
+            return fail(error, errors::noClassName, object.isa().name());
+    } else if (value.isNull()) {
         return fail(error, errors::noClassName, object.isa().name());
+    }
     _omitsZero = _marshaller->omitsZeroAttributes() && !held.keepsZero();
     const bool isWritten = bindingOf(field).write(*this, field, element, value, error);
     if (_trace != nullptr)

@@ -59,17 +59,15 @@ Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bool 
     }
 }
 
-FieldText::FieldText(const Value& value, ValueType type) : _value(value) {
+void FieldText::describe(ValueType type) {
     if (type == ValueType::boolean) {
-        _view = value.boolValue() ? "true" : "false";
-    } else if (value.isString()) {
-        _view = value.view();
-    } else if (value.kind() == Value::Kind::integer) {
+        _view = _value.boolValue() ? "true" : "false";
+    } else if (_value.kind() == Value::Kind::integer) {
         const auto end =
-            std::to_chars(_digits.data(), _digits.data() + _digits.size(), value.intValue()).ptr;
+            std::to_chars(_digits.data(), _digits.data() + _digits.size(), _value.intValue()).ptr;
         _view = {_digits.data(), end};
     } else {
-        _description = value.description();
+        _description = _value.description();
         _view = _description;
     }
 }

@@ -32,7 +32,12 @@ Value itemOf(const FieldPlan& field, const Value& text, Ref<Error>* error, bool 
 // description. It needs the value as long as it is used.
 class FieldText {
 public:
-    FieldText(const Value& value, ValueType type);
+    FieldText(const Value& value, ValueType type) : _value(value) {
+        if (value.isString() && type != ValueType::boolean) [[likely]]
+            _view = value.view();
+        else
+            describe(type);
+    }
     FieldText(const FieldText&) = delete;
     FieldText& operator=(const FieldText&) = delete;
 
@@ -42,6 +47,8 @@ public:
     String string() const;
 
 private:
+    void describe(ValueType type);
+
     const Value& _value;
     std::string_view _view;
     String _description; // of what is neither text nor integer

@@ -103,8 +103,8 @@ WrittenElement Marshalling::newElement(const String& name, std::size_t attribute
     return element;
 }
 
-void Marshalling::addTextElement(const WrittenElement& parent, const String& name,
-                                 const FieldText& text) {
+void Marshalling::addNamedTextElement(const WrittenElement& parent, const String& name,
+                                      const FieldText& text) {
     if (_trace != nullptr)
         _trace->addText(text.view(), false);
     if (!_names)
@@ -115,8 +115,8 @@ void Marshalling::addTextElement(const WrittenElement& parent, const String& nam
     _output.addChild(parent, element);
 }
 
-void Marshalling::addAttribute(const WrittenElement& element, const String& name,
-                               const FieldText& text) {
+void Marshalling::addNamedAttribute(const WrittenElement& element, const String& name,
+                                    const FieldText& text) {
     if (_trace != nullptr) {
         const XMLDraft::Node* const last = element.drafted->lastAttribute;
         _output.addAttribute(element, name, text);
@@ -248,13 +248,21 @@ bool Marshalling::failed(const FieldPlan& field, std::size_t item, Ref<Error>& p
 
 bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
                                  Object& object, ErrorSlot error) {
-    for (const FieldPlan& field : plan.fields) {
+    const auto& getters = _getters.of(plan, object);
+    const QXGenericRecord* const record = ObjectAccess::plainRecord(std::as_const(object));
+    std::size_t next = 0;
+    for (std::size_t i = 0; i < plan.fields.size(); ++i) {
+        const FieldPlan& field = plan.fields[i];
+        const Property* const property = getters.properties[i];
         Ref<Error> problem;
         if (_trace != nullptr)
             _trace->enterField(field);
         if (_placing != nullptr)
             _placing->enterField(field.key);
-        const bool isWritten = writeField(field, element, object, &problem);
+        ObjectAccess::Held held = record != nullptr && property == nullptr
+                                      ? ObjectAccess::getContent(*record, field.key, next)
+                                      : ObjectAccess::get(object, field.key, property);
+        const bool isWritten = writeValue(field, element, object, held, &problem);
         if (_placing != nullptr && isWritten)
             placeKept(field, element);
         if (_trace != nullptr)

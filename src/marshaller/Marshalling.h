@@ -6,6 +6,7 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "marshaller/FieldGetters.h"
 #include "marshaller/KeptPlacing.h"
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/OutputNames.h"
@@ -44,6 +45,9 @@ public:
                      ErrorSlot error);
     bool writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
                     ErrorSlot error);
+    // The same with the field's value.
+    bool writeValue(const FieldPlan& field, const WrittenElement& element, Object& object,
+                    ObjectAccess::Held& held, ErrorSlot error);
 
     // What the kinds of binding ask for.
     //
@@ -78,9 +82,17 @@ public:
     std::vector<OutputNames::Declaration> keptDeclarations(const Object& object);
     // The element that is open. Names are those of the mapping, and last as long as this object.
     WrittenElement newElement(const String& name, std::size_t attributes);
-    void addTextElement(const WrittenElement& parent, const String& name, const FieldText& text);
+    void addTextElement(const WrittenElement& parent, const String& name, const FieldText& text) {
+        if (_trace == nullptr && !_names) [[likely]]
+            return _output.addChild(parent, name, text);
+        addNamedTextElement(parent, name, text);
+    }
     // To the element that is open, or to a child of it.
-    void addAttribute(const WrittenElement& element, const String& name, const FieldText& text);
+    void addAttribute(const WrittenElement& element, const String& name, const FieldText& text) {
+        if (_trace == nullptr && !_names) [[likely]]
+            return _output.addAttribute(element, name, text);
+        addNamedAttribute(element, name, text);
+    }
     // None when no child has that name.
     WrittenElement lastChildNamed(const WrittenElement& element, const String& name);
     // Hands on what is wrong with that item of a collection; false.
@@ -110,6 +122,11 @@ private:
     std::vector<OutputNames::Declaration> declarationsOf(const ClassPlan& plan,
                                                          const Object& object);
     void declare(const WrittenElement& element, const OutputNames::Declaration& declaration);
+    // With a trace, or where the name is to be found.
+    void addNamedTextElement(const WrittenElement& parent, const String& name,
+                             const FieldText& text);
+    void addNamedAttribute(const WrittenElement& element, const String& name,
+                           const FieldText& text);
     // They stand apart, so that a level of nested objects takes less of the stack.
     [[gnu::noinline]] void placeKept(const FieldPlan& field, const WrittenElement& element);
     [[gnu::noinline]] bool writeObjectExactly(const ClassPlan& plan, const WrittenElement& element,
@@ -124,6 +141,7 @@ private:
     const qx::Ref<const QXXMLMarshallingMapping> _mapping; // of the plan
     const MappingPlan& _plan;
     ObjectAccess _access;
+    FieldGetters _getters;
     ElementWriter _output;
     WritingTrace* _trace = nullptr;
     const bool _keepsExactly;

@@ -33,17 +33,17 @@ Value ObjectAccess::send(Object& object, const Operation& operation, const Value
 
 const Class* const ObjectAccess::records = &QXGenericRecord::classObject();
 
-ObjectAccess::Held ObjectAccess::get(const Object& object, Key key) {
-    const Class& type = object.isa();
-    if (&type == records)
-        return getContent(static_cast<const QXGenericRecord&>(object), key);
-    const Property* property = type.property(key);
-    if (property == nullptr)
-        return {object.valueForKey(key), false};
+ObjectAccess::Held ObjectAccess::get(const Object& object, Key key, const Property* property) {
+    if (property == nullptr) {
+        const QXGenericRecord* const record = plainRecord(object);
+        std::size_t first = 0;
+        return record != nullptr ? getContent(*record, key, first)
+                                 : Held(object.valueForKey(key), false);
+    }
     if (property->lend != nullptr)
         return {property->lend(*property, object), property->keepsZero};
     // A class of a host's may answer for a property in its own way.
-    return {type.isStruct() ? property->get(*property, object) : object.valueForKey(key),
+    return {object.isa().isStruct() ? property->get(*property, object) : object.valueForKey(key),
             property->keepsZero};
 }
 
@@ -57,16 +57,6 @@ bool ObjectAccess::refuse(const Object& object, Key key, const Value& value, Ref
     return wrong.isNull() ? fail(error, errors::unableToSetValue, value, key.string(), type.name())
                           : fail(error, errors::objectOfWrongClass, wrong, key.string(),
                                  type.name(), taken->names);
-}
-
-ObjectAccess::Held ObjectAccess::getContent(const QXGenericRecord& record, Key key) {
-    if (key.namesProperty())
-        return {record.valueForKey(key), false};
-    const Dictionary* const contents = record.contents().get();
-    const Value* const value = contents != nullptr ? contents->find(key.string()) : nullptr;
-    if (value == nullptr)
-        return {Value(), false};
-    return value->isObject() ? Held(*value, false) : Held(*value);
 }
 
 bool ObjectAccess::setOrRefuse(Object& object, Key key, const Value& value, Ref<Error>* error) {
@@ -137,8 +127,7 @@ bool ObjectAccess::mayKeepXML(const Object& object) {
         const bool isOne = key.isSameAs(keys[0]) || key.isSameAs(keys[1]) || key.isSameAs(keys[2]);
         return isOne || (!key.isInterned() && std::ranges::find(keys, key) != keys.end());
     };
-    return contents != nullptr &&
-           std::ranges::any_of(*contents, [&](const auto& entry) { return isKept(entry.key); });
+    return contents != nullptr && DictionaryFilling::anyKey(*contents, isKept);
 }
 
 // A class that lacks a key raises when it is read by a key that it does not take; so it is asked

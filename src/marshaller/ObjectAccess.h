@@ -49,6 +49,9 @@ public:
     static QXGenericRecord* plainRecord(Object& object) {
         return &object.isa() == records ? static_cast<QXGenericRecord*>(&object) : nullptr;
     }
+    static const QXGenericRecord* plainRecord(const Object& object) {
+        return &object.isa() == records ? static_cast<const QXGenericRecord*>(&object) : nullptr;
+    }
 
     // Calls one of the object's hooks.
     static Value send(Object& object, const Operation& operation);
@@ -70,7 +73,21 @@ public:
         const Value* _lent = nullptr;
         bool _keepsZero = false;
     };
-    static Held get(const Object& object, Key key);
+    static Held get(const Object& object, Key key) {
+        return get(object, key, object.isa().property(key));
+    }
+    // The same by what property(key) of its class is.
+    static Held get(const Object& object, Key key, const Property* property);
+    // The same of what a record has under a key that is no property of records; `next` is the
+    // place in its contents where that may stand, and moves on.
+    static Held getContent(const QXGenericRecord& record, Key key, std::size_t& next) {
+        const Dictionary* const contents = record.contents().get();
+        const Value* const value =
+            contents != nullptr ? DictionaryFilling::find(*contents, key.string(), next) : nullptr;
+        if (value == nullptr)
+            return {Value(), false};
+        return value->isObject() ? Held(*value, false) : Held(*value);
+    }
     // False where getKept would give null for each.
     bool mayKeepXML(const Object& object);
     // Null where the object has no such key.
@@ -100,7 +117,6 @@ public:
     bool isToBeWritten(Object& item);
 
 private:
-    static Held getContent(const QXGenericRecord& record, Key key);
     static bool setOrRefuse(Object& object, Key key, const Value& value, Ref<Error>* error);
     static SetOutcome setProperty(Object& object, Key key, const Value& value);
 

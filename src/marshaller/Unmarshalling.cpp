@@ -139,7 +139,9 @@ std::optional<Ref<Object>> Unmarshalling::buildUsual(const ClassPlan& plan, Numb
     if (!usual.find(_document, *plan.usualForm, element))
         return std::nullopt;
     return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
-        return _usual.readFields({plan, usual, element, nodes}, object, error);
+        const UsualReading::Source source{plan, usual, element, nodes};
+        return _trace == nullptr ? _usual.readFields(source, object, error)
+                                 : _usual.readFieldsTraced(source, object, error);
     });
 }
 

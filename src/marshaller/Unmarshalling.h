@@ -86,6 +86,13 @@ public:
                                          ErrorSlot error);
     // What is left to do for an element all of which was bound.
     bool mayEnd(const ClassPlan& plan, Number element, std::size_t attributes, ErrorSlot error);
+    // Whether what is left is told from the trace, not from names: of objects that this call makes.
+    bool isExact(const ClassPlan* plan) const noexcept {
+        return _keepsExactly && plan != nullptr && _frame != nullptr &&
+               _marshaller->saveUnknownXML();
+    }
+    // As mayEnd() where the trace shows that something is left to be kept exactly.
+    bool mayEndExactly(const ClassPlan& plan, const Target& target, ErrorSlot error);
     // `plan` is the class whose fields were bound, null where they were bound one by one.
     bool validate(const ClassPlan* plan, const Target& target, ErrorSlot error);
 
@@ -179,16 +186,10 @@ private:
                                            StructObject* given);
     // Whether nobody wants more of an element than its fields.
     bool isPlain() const noexcept {
-        return _use == Use::document && _trace == nullptr && !reports().isOn() &&
-               !_document.isMatched();
+        return _use == Use::document && !reports().isOn() && !_document.isMatched();
     }
     bool keepNamespaces(const Target& target, ErrorSlot error);
     std::vector<Number> declarationsAround(Number element);
-    // Whether what is left is told from the trace, not from names: of objects that this call makes.
-    bool isExact(const ClassPlan* plan) const noexcept {
-        return _keepsExactly && plan != nullptr && _frame != nullptr &&
-               _marshaller->saveUnknownXML();
-    }
     bool validateExactly(const Target& target, ErrorSlot error);
     bool keepChildren(const Target& target, const Leftovers& left, ErrorSlot error);
     bool keepAttributes(const Target& target, const Leftovers& left, ErrorSlot error);

@@ -24,7 +24,7 @@ std::size_t slotFrom(std::size_t next, std::span<const Slot> slots, const String
 } // namespace
 
 inline bool UsualElement::take(std::size_t slot, Number number) noexcept {
-    if (slot == none || (_slots >> slot & 1U) != 0)
+    if (slot == none || has(slot))
         return false;
     _slots |= 1U << slot;
     ++_slotCount;
@@ -70,9 +70,32 @@ bool UsualElement::find(IndexedXML& document, const UsualForm& form, Number elem
         }
     }
     // Beside other children the text would be put together.
-    const bool isTextAlone = form.textSlot() == none || _childCount == 0 ||
-                             (_childCount == 1 && (_slots >> form.textSlot() & 1U) != 0);
+    const bool isTextAlone =
+        form.textSlot() == none || _childCount == 0 || (_childCount == 1 && has(form.textSlot()));
     return isTextAlone && (form.required() & ~_slots) == 0;
+}
+
+bool UsualElement::isAllItems(IndexedXML& document, const UsualForm& form) const {
+    const XMLIndex& index = document.index();
+    const auto isItem = [&](const Slot& slot, Number child) {
+        const XMLNodeKind kind = index[child].nodeKind();
+        return kind == XMLNodeKind::element
+                   ? document.names()[index[child].name()].isSameAs(slot.itemName)
+                   : kind == XMLNodeKind::text || kind == XMLNodeKind::comment;
+    };
+    for (std::size_t i = 0; i < form.slots().size(); ++i) {
+        const Slot& slot = form.slots()[i];
+        if (slot.place != Place::wrapped || !has(i))
+            continue;
+        document.expand(_first[i]);
+        if (index.firstChild(_first[i]) != index.content(_first[i]))
+            return false; // it has attributes
+        const Number end = index.contentEnd(_first[i]);
+        for (Number at = index.firstChild(_first[i]); at < end; at = index.siblingOf(at))
+            if (!isItem(slot, at))
+                return false;
+    }
+    return true;
 }
 
 } // namespace qx::detail

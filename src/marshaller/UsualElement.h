@@ -16,8 +16,12 @@ public:
     // Looks the element through; false where it has not the form.
     bool find(IndexedXML& document, const UsualForm& form, Number element);
 
+    // Whether its wrappers hold items, and nothing else.
+    bool isAllItems(IndexedXML& document, const UsualForm& form) const;
+
     // The slots that have something, one bit each.
     std::uint32_t slots() const noexcept { return _slots; }
+    bool has(std::size_t slot) const noexcept { return (_slots >> slot & 1U) != 0; }
     std::size_t slotCount() const noexcept { return _slotCount; }
     // The attribute, child, wrapper or text of such a slot, or its first item.
     Number operator[](std::size_t slot) const noexcept { return _first[slot]; }

@@ -13,6 +13,38 @@ namespace qx::detail {
 
 using Place = UsualForm::Place;
 using Slot = UsualForm::Slot;
+using Form = ReadingTrace::Form;
+
+namespace {
+
+// What a binding tells its reading's trace, if there is one. In this namespace, so that either
+// binding is as much the compiler's own as one that is no template: it inlines more of it.
+class Untraced {
+public:
+    static constexpr bool isOn = false;
+
+    explicit Untraced(ReadingTrace*) noexcept {}
+    void take(Form, const Slot&, IndexedXML::Number, std::size_t = 0) const noexcept {}
+    std::size_t uses() const noexcept { return 0; }
+    void forget(std::size_t) const noexcept {}
+};
+
+class Traced {
+public:
+    static constexpr bool isOn = true;
+
+    explicit Traced(ReadingTrace* trace) noexcept : _trace(*trace) {}
+    void take(Form form, const Slot& slot, IndexedXML::Number entry, std::size_t item = 0) const {
+        _trace.take(form, *slot.field, entry, 0, item);
+    }
+    std::size_t uses() const noexcept { return _trace.uses().size(); }
+    void forget(std::size_t uses) const { _trace.forget(uses); }
+
+private:
+    ReadingTrace& _trace;
+};
+
+} // namespace
 
 inline const UsualReading::Setters& UsualReading::settersOf(const ClassPlan& plan,
                                                             const Object& object) {
@@ -55,20 +87,23 @@ const Class* UsualReading::placedClass(const Slot& slot, const Property* propert
 }
 
 // One object that is bound.
+template <class Tracing>
 class UsualReading::Binding {
 public:
     Binding(Unmarshalling& reading, const Source& source, const Setters& setters, Object& object,
             ErrorSlot error) noexcept
         : _reading(reading), _document(reading.document()), _source(source),
           _slots(source.plan.usualForm->slots().data()), _setters(setters), _object(object),
-          _error(error), _isUnheard(setters.appends) {}
+          _error(error), _isUnheard(setters.appends), _trace(reading.trace()) {}
 
     bool run() {
-        for (std::uint32_t left = _source.element.slots(); left != 0; left &= left - 1)
+        for (std::uint32_t left = slotsToRead(); left != 0; left &= left - 1)
             if (!readField(static_cast<std::size_t>(std::countr_zero(left))))
                 return false;
-        return _reading.mayEnd(_source.plan, _source.number, _source.element.attributeCount(),
-                               _error);
+        return Tracing::isOn && _reading.isExact(&_source.plan) && hasLeft()
+                   ? keepLeft()
+                   : _reading.mayEnd(_source.plan, _source.number, _source.element.attributeCount(),
+                                     _error);
     }
 
 private:
@@ -79,11 +114,15 @@ private:
         std::size_t most; // how many there may be
     };
 
+    std::uint32_t slotsToRead() const noexcept;
     bool readField(std::size_t slot);
-    bool passOver(const FieldPlan& field);
-    bool readValue(std::size_t slot, ErrorSlot error);
-    bool readItems(std::size_t slot);
-    bool placeItems(std::size_t slot, const Items& items);
+    [[gnu::noinline, gnu::cold]] bool passOver(const FieldPlan& field);
+    bool hasLeft() const;
+    [[gnu::noinline, gnu::cold]] bool keepLeft();
+    // Apart, so that a level of nested objects takes the stack of one of them.
+    [[gnu::noinline]] bool readValue(std::size_t slot, ErrorSlot error);
+    [[gnu::noinline]] bool readItems(std::size_t slot);
+    [[gnu::noinline]] bool placeItems(std::size_t slot, const Items& items);
     Items itemsOf(std::size_t slot) const;
     template <class Visit>
     bool forEach(const Items& items, const Slot& slot, Visit visit) const;
@@ -99,13 +138,43 @@ private:
     Object& _object;
     const ErrorSlot _error;
     bool _isUnheard; // a record, of nobody
+    [[no_unique_address]] Tracing _trace;
+    std::size_t _attributesTaken = 0; // of a reading with a trace
 };
 
 bool UsualReading::readFields(const Source& source, Object& object, ErrorSlot error) {
-    return Binding(_reading, source, settersOf(source.plan, object), object, error).run();
+    return Binding<Untraced>(_reading, source, settersOf(source.plan, object), object, error).run();
 }
 
-inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlot error) {
+bool UsualReading::readFieldsTraced(const Source& source, Object& object, ErrorSlot error) {
+    return Binding<Traced>(_reading, source, settersOf(source.plan, object), object, error).run();
+}
+
+// Whether there is something that no field took: an attribute that did not fit, what else a wrapper
+// holds.
+template <class Tracing>
+bool UsualReading::Binding<Tracing>::hasLeft() const {
+    return _attributesTaken != _source.element.attributeCount() ||
+           !_source.element.isAllItems(_document, *_source.plan.usualForm);
+}
+
+template <class Tracing>
+bool UsualReading::Binding<Tracing>::keepLeft() {
+    ChildLookup lookup(_document, _source.number, _source.nodes, 0);
+    ConsumedNames none;
+    return _reading.mayEndExactly(_source.plan, {_object, lookup, {none, none}, false}, _error);
+}
+
+// An element's own text is taken by its field also where there is none.
+template <class Tracing>
+inline std::uint32_t UsualReading::Binding<Tracing>::slotsToRead() const noexcept {
+    const std::size_t text = _source.plan.usualForm->textSlot();
+    const bool hasText = Tracing::isOn && text != UsualForm::mostSlots;
+    return _source.element.slots() | (hasText ? 1U << text : 0U);
+}
+
+template <class Tracing>
+inline bool UsualReading::Binding<Tracing>::set(std::size_t slot, Value&& value, ErrorSlot error) {
     const Key key = _slots[slot].field->key;
     // A null makes the change cache, which is to hear of what follows.
     _isUnheard = _isUnheard && !value.isNull();
@@ -123,7 +192,8 @@ inline bool UsualReading::Binding::set(std::size_t slot, Value&& value, ErrorSlo
 }
 
 // Who is told of the object that is to hold it has heard of that one.
-inline bool UsualReading::Binding::adopt(const Value& value, ErrorSlot error) {
+template <class Tracing>
+inline bool UsualReading::Binding<Tracing>::adopt(const Value& value, ErrorSlot error) {
     Object* const object = value.object();
     if (object == nullptr || ObjectAccess::plainRecord(*object) != nullptr)
         return true;
@@ -131,10 +201,13 @@ inline bool UsualReading::Binding::adopt(const Value& value, ErrorSlot error) {
     return _reading.adopt(*object, _object, error);
 }
 
-inline bool UsualReading::Binding::readValue(std::size_t slot, ErrorSlot error) {
+template <class Tracing>
+bool UsualReading::Binding<Tracing>::readValue(std::size_t slot, ErrorSlot error) {
     const Slot& taking = _slots[slot];
     const Number number = _source.element[slot];
     const bool isElement = _document.isElement(number);
+    if (isElement)
+        _trace.take(Form::child, taking, number);
     Value value;
     if (!isElement || taking.plan == nullptr) {
         const Number text = isElement ? _document.onlyText(number) : number;
@@ -152,13 +225,25 @@ inline bool UsualReading::Binding::readValue(std::size_t slot, ErrorSlot error) 
     const bool isText =
         !value.isNull() && (!convertsText(*taking.field) ||
                             convertText(*taking.field, value, error, !_reading.isCollecting()));
-    return isText && set(slot, std::move(value), error);
+    if (!isText || !set(slot, std::move(value), error))
+        return false;
+    // Of one that does not fit nothing came.
+    if (Tracing::isOn && !isElement && taking.place != Place::text) {
+        _trace.take(Form::attribute, taking, number);
+        ++_attributesTaken;
+    }
+    return true;
 }
 
-inline bool UsualReading::Binding::readField(std::size_t slot) {
+template <class Tracing>
+inline bool UsualReading::Binding<Tracing>::readField(std::size_t slot) {
     const FieldPlan& field = *_slots[slot].field;
     if (_slots[slot].isList())
         return readItems(slot) || passOver(field);
+    if (_slots[slot].place == Place::text)
+        _trace.take(Form::text, _slots[slot], _source.number);
+    if (Tracing::isOn && !_source.element.has(slot))
+        return true;
     Ref<Error> problem;
     if (readValue(slot, &problem) || !problem)
         return true;
@@ -170,13 +255,16 @@ inline bool UsualReading::Binding::readField(std::size_t slot) {
     return passOver(field);
 }
 
-[[gnu::noinline, gnu::cold]] bool UsualReading::Binding::passOver(const FieldPlan& field) {
+template <class Tracing>
+bool UsualReading::Binding<Tracing>::passOver(const FieldPlan& field) {
     ChildLookup lookup(_document, _source.number, _source.nodes, 0);
     ConsumedNames none;
     return _reading.passOverField(field, {_object, lookup, {none, none}, false}, _error);
 }
 
-UsualReading::Binding::Items UsualReading::Binding::itemsOf(std::size_t slot) const {
+template <class Tracing>
+typename UsualReading::Binding<Tracing>::Items
+UsualReading::Binding<Tracing>::itemsOf(std::size_t slot) const {
     const XMLIndex& index = _document.index();
     const Number number = _source.element[slot];
     if (_slots[slot].place == Place::items)
@@ -188,8 +276,10 @@ UsualReading::Binding::Items UsualReading::Binding::itemsOf(std::size_t slot) co
 }
 
 // Calls visit(Number) for each until it answers false.
+template <class Tracing>
 template <class Visit>
-bool UsualReading::Binding::forEach(const Items& items, const Slot& slot, Visit visit) const {
+bool UsualReading::Binding<Tracing>::forEach(const Items& items, const Slot& slot,
+                                             Visit visit) const {
     const XMLIndex& index = _document.index();
     const String* const names = _document.names();
     for (Number at = items.first; at < items.end; at = index.siblingOf(at)) {
@@ -204,19 +294,23 @@ bool UsualReading::Binding::forEach(const Items& items, const Slot& slot, Visit 
     return true;
 }
 
-inline bool UsualReading::Binding::hasFailed(const Slot& slot, Number item) {
+template <class Tracing>
+inline bool UsualReading::Binding<Tracing>::hasFailed(const Slot& slot, Number item) {
     if ((_error == nullptr || !*_error) && !_reading.budget().isSpent())
         return false;
     _reading.locate(_error, item, slot.field, _reading.currentClass());
     return true;
 }
 
-bool UsualReading::Binding::readItems(std::size_t slot) {
+template <class Tracing>
+bool UsualReading::Binding<Tracing>::readItems(std::size_t slot) {
     const Slot& taking = _slots[slot];
     const Items items = itemsOf(slot);
     if (taking.place == Place::wrapped &&
         !_reading.budget().takeVisits(items.most, _source.element[slot], _error))
         return false;
+    if (taking.place == Place::wrapped)
+        _trace.take(Form::wrapper, taking, _source.element[slot]);
     if (_setters.slots[slot].placed != nullptr)
         return placeItems(slot, items);
     // Few may be made of very many.
@@ -227,13 +321,17 @@ bool UsualReading::Binding::readItems(std::size_t slot) {
             array = make<Array>();
             array->reserve(std::min(items.most, usualSize));
         }
+        const std::size_t before = _trace.uses();
+        _trace.take(Form::item, taking, node, array->count());
         Value item = taking.plan != nullptr
                          ? Value(_reading.build(*taking.plan, node, _source.nodes, _error))
                          : itemText(_reading, *taking.field, _object, node, _error);
         if (hasFailed(taking, node))
             return _reading.passOver(_error);
-        if (item.isNull())
+        if (item.isNull()) {
+            _trace.forget(before);
             return true;
+        }
         if (!adopt(item, _error))
             return false;
         array->add(std::move(item));
@@ -243,20 +341,28 @@ bool UsualReading::Binding::readItems(std::size_t slot) {
 }
 
 // Without a slot for errors an item that fails is left out.
-bool UsualReading::Binding::placeItems(std::size_t slot, const Items& items) {
+template <class Tracing>
+bool UsualReading::Binding<Tracing>::placeItems(std::size_t slot, const Items& items) {
     const Setter& setter = _setters.slots[slot];
     const StructPlacing& placing = *setter.property->placing;
     std::size_t count = 0; // of many children few may be items
     forEach(items, _slots[slot], [&](Number) { return ++count != 0; });
     void* const list = count != 0 ? placing.begin(_object, count) : nullptr;
+    std::size_t made = 0;
     return forEach(items, _slots[slot], [&](Number node) {
+        const std::size_t before = _trace.uses();
+        _trace.take(Form::item, _slots[slot], node, made);
         StructObject held(*setter.placed, placing.add(list));
         const bool isBuilt = static_cast<bool>(
             _reading.build(*_slots[slot].plan, node, _source.nodes, _error, &held));
         if (hasFailed(_slots[slot], node))
             return false;
-        if (!isBuilt)
+        if (isBuilt) {
+            ++made;
+        } else {
             placing.removeLast(list);
+            _trace.forget(before);
+        }
         return true;
     });
 }

@@ -1,10 +1,11 @@
 #pragma once
 
 // Elements of their class's usual form (UsualElement.h) are bound straight: what is found for each
-// field is set, in the order of the fields. What has another form, or is read with a trace, reports
-// or prefixes of the host's, goes the general way (Unmarshalling::readFields) before anything was
+// field is set, in the order of the fields. What has another form, or is read with reports or
+// prefixes of the host's, goes the general way (Unmarshalling::readFields) before anything was
 // made of it; so do elements with items of their own where errors have no slot. Both come to the
-// same objects and errors.
+// same objects and errors, and tell a trace the same; the code is compiled apart for readings that
+// have none.
 //
 // Records that nobody can have heard of get their values appended; objects whose class sets values
 // as Object does get them by the property; structs in members of structs are made there.
@@ -38,8 +39,9 @@ public:
         Number number;
         IndexedXML::Nodes nodes;
     };
-    // As Unmarshalling::readFields.
+    // As Unmarshalling::readFields. Of a reading with a trace the second.
     bool readFields(const Source& source, Object& object, ErrorSlot error);
+    bool readFieldsTraced(const Source& source, Object& object, ErrorSlot error);
 
 private:
     // How the fields of a form are set in objects of one class.
@@ -53,6 +55,7 @@ private:
         bool appends = false;        // to the contents of a record that nobody has heard of
         std::vector<Setter> slots;
     };
+    template <class Tracing>
     class Binding;
 
     const Setters& settersOf(const ClassPlan& plan, const Object& object);

@@ -64,7 +64,8 @@ bool read(Unmarshalling& reading, const FieldPlan& field, const Unmarshalling::T
 bool write(Marshalling& writing, const FieldPlan& field, const WrittenElement& element,
            const Value& value, Ref<Error>* error) {
     const ClassPlan* plan = nullptr;
-    if (!findClassToWrite(writing, field, value, plan, error))
+    const bool isText = !value.isObject() && field.valueType != ValueType::other;
+    if (!isText && !findClassToWrite(writing, field, value, plan, error))
         return false;
     if (plan != nullptr) {
         const bool isDeclared = field.valueType == ValueType::other;

@@ -53,6 +53,13 @@ bool Unmarshalling::mayEnd(const ClassPlan& plan, Number element, std::size_t at
     return passOver(error);
 }
 
+bool Unmarshalling::mayEndExactly(const ClassPlan& plan, const Target& target, ErrorSlot error) {
+    if (validate(&plan, target, error))
+        return true;
+    locate(error, target.source.element(), nullptr, &plan);
+    return passOver(error);
+}
+
 // What no field consumed is an error, there.
 bool Unmarshalling::refuse(Number unknown, ErrorSlot error) {
     locate(error, unknown, nullptr, _frame != nullptr ? _frame->plan : nullptr);

@@ -20,7 +20,7 @@ using qx::detail::reset;
 
 namespace {
 
-// Drafts the object and has print(element, limits) print the draft. Its names are the mapping's,
+// Drafts the object and has print(element, limits, size) print the draft of that size. Its names are the mapping's,
 // which the marshalling holds: getters may let go of the marshaller. What no XML document can hold,
 // or none that could be read again, raises while it is printed.
 template <class Print>
@@ -34,7 +34,7 @@ bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Err
     if (!root || (error != nullptr && *error))
         return false;
     try {
-        print(*root.drafted, reading);
+        print(*root.drafted, reading, draft.size());
         return true;
     } catch (const qx::Exception& exception) {
         return qx::fail(error, qx::errors::textCannotBeWritten, exception.reason());
@@ -45,7 +45,9 @@ bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Err
 bool print(const QXXMLMarshaller& marshaller, const qx::Value& object, qx::XMLOptions layout,
            Ref<Error>* error, qx::TextBuffer& text) {
     reset(error);
-    return printed(marshaller, object, error, [&](const auto& root, const auto& reading) {
+    return printed(marshaller, object, error, [&](const auto& root, const auto& reading, std::size_t size) {
+        // Mostly a document is somewhat smaller than its draft.
+        text.reserve(size);
         qx::writeDraft(root, layout, reading, text);
     });
 }
@@ -74,7 +76,7 @@ bool writeSequence(QXXMLMarshaller& marshaller, Sink& sink, const String& rootNa
         if (std::exchange(isEmpty, false))
             text += '>';
         const bool isPrinted =
-            printed(marshaller, object, error, [&](const auto& element, const auto& reading) {
+            printed(marshaller, object, error, [&](const auto& element, const auto& reading, std::size_t) {
                 qx::writeDraftInside(element, layout, reading, text);
             });
         if (!isPrinted || (text.size() >= blockSize && !sink.write(text.take(), error)))

@@ -82,6 +82,21 @@ public:
         return ByteBlock(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(at)));
     }
 
+    // The bytes of two such halves, or four from each of two places and zeros behind them.
+    static ByteBlock halves(const char* lower, const char* upper) noexcept {
+        return ByteBlock(_mm_unpacklo_epi64(half(lower)._bytes, half(upper)._bytes));
+    }
+    static ByteBlock quarters(const char* lower, const char* upper) noexcept {
+        int words[2];
+        std::memcpy(&words[0], lower, sizeof words[0]);
+        std::memcpy(&words[1], upper, sizeof words[1]);
+        return ByteBlock(
+            _mm_unpacklo_epi32(_mm_cvtsi32_si128(words[0]), _mm_cvtsi32_si128(words[1])));
+    }
+    void store(char* to) const noexcept {
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(to), _bytes);
+    }
+
     // How many bytes from the first on are of the kind, or fewer, where the next one may be, too.
     template <ByteKind kind>
     std::size_t run() const noexcept {
@@ -179,6 +194,46 @@ const char* endOfRunBefore(const char* at, const char* end) noexcept {
     while (at != end && is(*at, kind))
         ++at;
     return at;
+}
+
+// Copies the bytes and answers whether all are of the kind; where they are not, perhaps only some.
+template <ByteKind kind>
+bool copyRun(const char* from, std::size_t size, char* to) noexcept {
+#if defined(__SSE2__)
+    constexpr std::size_t half = ByteBlock::size / 2;
+    constexpr std::size_t quarter = ByteBlock::size / 4;
+    if (size >= ByteBlock::size) {
+        const std::size_t last = size - ByteBlock::size;
+        for (std::size_t at = 0; at < last; at += ByteBlock::size) {
+            const ByteBlock block(from + at);
+            block.store(to + at);
+            if (block.run<kind>() != ByteBlock::size)
+                return false;
+        }
+        const ByteBlock block(from + last);
+        block.store(to + last);
+        return block.run<kind>() == ByteBlock::size;
+    }
+    // The ends overlap.
+    if (size >= half) {
+        const ByteBlock block = ByteBlock::halves(from, from + size - half);
+        std::memcpy(to, from, half);
+        std::memcpy(to + size - half, from + size - half, half);
+        return block.run<kind>() == ByteBlock::size;
+    }
+    if (size >= quarter) {
+        const ByteBlock block = ByteBlock::quarters(from, from + size - quarter);
+        std::memcpy(to, from, quarter);
+        std::memcpy(to + size - quarter, from + size - quarter, quarter);
+        return block.run<kind>() == half;
+    }
+#endif
+    bool isRun = true;
+    for (std::size_t i = 0; i < size; ++i) {
+        to[i] = from[i];
+        isRun = isRun && is(from[i], kind);
+    }
+    return isRun;
 }
 
 template <ByteKind kind>

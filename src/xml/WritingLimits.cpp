@@ -1,16 +1,13 @@
 #include "xml/WritingLimits.h"
 
-#include "xml/XMLLimits.h"
-
 namespace qx {
 
 void WritingLimits::enterLimited(const XMLPlace& element, std::size_t attributes,
                                  std::size_t declarations) {
-    if (++_depth > _reading->maximumDepth)
+    if (_depth > _reading->maximumDepth)
         refuseBeyond("elements nest deeper than", _reading->maximumDepth, element);
     if (attributes > xmlLimits::attributes)
         refuseBeyond("an element has more attributes than", xmlLimits::attributes, element);
-    _textSize = 0;
     if (declarations == 0)
         return;
     _declarations.push_back({_depth, declarations});
@@ -18,15 +15,6 @@ void WritingLimits::enterLimited(const XMLPlace& element, std::size_t attributes
     if (_namespaces > xmlLimits::namespaces)
         refuseBeyond("more namespace declarations are in force than", xmlLimits::namespaces,
                      element);
-}
-
-void WritingLimits::leaveLimited() noexcept {
-    if (!_declarations.empty() && _declarations.back().depth == _depth) {
-        _namespaces -= _declarations.back().count;
-        _declarations.pop_back();
-    }
-    --_depth;
-    _textSize = 0;
 }
 
 void WritingLimits::requireDocument(std::size_t size, const XMLPlace& document) const {

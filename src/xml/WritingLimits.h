@@ -5,6 +5,7 @@
 
 #include <QXXMLMarshalling/xml/XMLDocument.h>
 
+#include "xml/XMLLimits.h"
 #include "xml/XMLPlace.h"
 
 #include <unordered_set>
@@ -19,12 +20,22 @@ public:
 
     // Around what an element holds.
     void enter(const XMLPlace& element, std::size_t attributes, std::size_t declarations) {
-        if (_reading != nullptr)
+        if (_reading == nullptr)
+            return;
+        _textSize = 0;
+        if (++_depth > _reading->maximumDepth || attributes > xmlLimits::attributes ||
+            declarations != 0) [[unlikely]]
             enterLimited(element, attributes, declarations);
     }
     void leave() noexcept {
-        if (_reading != nullptr)
-            leaveLimited();
+        if (_reading == nullptr)
+            return;
+        _textSize = 0;
+        if (!_declarations.empty() && _declarations.back().depth == _depth) {
+            _namespaces -= _declarations.back().count;
+            _declarations.pop_back();
+        }
+        --_depth;
     }
 
     // Text nodes that stand side by side are read as one, until something else comes.
@@ -49,7 +60,6 @@ private:
         std::size_t count;
     };
     void enterLimited(const XMLPlace& element, std::size_t attributes, std::size_t declarations);
-    void leaveLimited() noexcept;
     void requireFewNames(const XMLPlace& place) const;
 
     const XMLParseOptions* _reading;

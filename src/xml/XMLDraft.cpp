@@ -20,19 +20,7 @@ void XMLDraft::grow(std::size_t size) {
     _blockSize = std::min(2 * _blockSize, largestBlock);
     _next = _blocks.back().get();
     _left = capacity;
-}
-
-XMLDraft::Node* XMLDraft::newNode(Kind kind, const String* name, std::string_view value) {
-    const bool isKept = kind == Kind::keptChildren || kind == Kind::keptAttributes ||
-                        kind == Kind::keptDeclarations;
-    if (_values == Values::dropped && !isKept)
-        value = {};
-    // What moves leaves a pointer.
-    void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
-    Node* const node = ::new (memory) Node{name, nullptr, Node::bitsOf(kind, value.size())};
-    if (!value.empty())
-        std::memcpy(node + 1, value.data(), value.size());
-    return node;
+    _allocated += capacity;
 }
 
 // The holder of the list's last place if that is of the kind, else of a new place at its end.
@@ -46,16 +34,6 @@ XMLElement& XMLDraft::newHolder(Kind kind, Node*& last) {
     return *holder;
 }
 
-void XMLDraft::append(Node*& last, Node* node) noexcept {
-    node->next = last != nullptr ? std::exchange(last->next, node) : node;
-    last = node;
-}
-
-XMLDraft::Element& XMLDraft::newElement(const String& name) {
-    return *::new (allocate(sizeof(Element))) Element{
-        {&name, nullptr, Node::bitsOf(Kind::element, 0)}, nullptr, nullptr, false, false, false};
-}
-
 void XMLDraft::addDeclaration(Element& element, const String& prefix, const String& URI) {
     bool isThere = false;
     if (element.hasDeclarations)
@@ -64,14 +42,14 @@ void XMLDraft::addDeclaration(Element& element, const String& prefix, const Stri
         });
     if (isThere)
         return;
-    append(element.lastAttribute, newNode(Kind::declaration, &prefix, URI));
+    append(element.lastAttribute, newText(Kind::declaration, &prefix, URI));
     element.hasDeclarations = true;
 }
 
 void XMLDraft::addAttribute(Element& element, const String& name, std::string_view value) {
     if (element.lastAttribute != nullptr && hasAttribute(element, name))
         return;
-    Node* const attribute = newNode(Kind::attribute, &name, value);
+    Node* const attribute = newText(Kind::attribute, &name, value);
     if (element.isIndexed)
         _attributes.at(&element).names.insert(name.view());
     append(element.lastAttribute, attribute);
@@ -111,14 +89,6 @@ void XMLDraft::indexAttributes(Element& element) {
     element.isIndexed = true;
 }
 
-void XMLDraft::addChild(Element& parent, Element& child) noexcept {
-    append(parent.lastChild, &child);
-}
-
-void XMLDraft::addLeaf(Element& parent, const String& name, std::string_view text) {
-    append(parent.lastChild, text.empty() ? &newElement(name) : newNode(Kind::leaf, &name, text));
-}
-
 XMLDraft::Element& XMLDraft::enlarged(Node& child) {
     if (child.kind() == Kind::leaf) {
         Element& element = newElement(*child.name);
@@ -131,10 +101,11 @@ XMLDraft::Element& XMLDraft::enlarged(Node& child) {
 }
 
 void XMLDraft::setText(Element& element, std::string_view text) {
-    Node* const node = !text.empty() ? newNode(Kind::text, nullptr, text) : nullptr;
+    Node* const node = !text.empty() ? newText(Kind::text, nullptr, text) : nullptr;
     _children.erase(&element);
     element.lastChild = nullptr;
     element.hasText = node != nullptr;
+    element.hasKept = false;
     if (node != nullptr)
         append(element.lastChild, node);
 }
@@ -147,9 +118,11 @@ void XMLDraft::moveChildren(Element& from, Element& to) {
         std::swap(last->next, to.lastChild->next);
     to.lastChild = last;
     to.hasText = to.hasText || from.hasText;
+    to.hasKept = to.hasKept || from.hasKept;
 }
 
 XMLElement& XMLDraft::holderOfChildren(Element& element) {
+    element.hasKept = true;
     return newHolder(Kind::keptChildren, element.lastChild);
 }
 

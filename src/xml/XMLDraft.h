@@ -22,10 +22,14 @@
 
 #include <QXXMLMarshalling/xml/XMLElement.h>
 
+#include "base/ShortCopy.h"
+
+#include <algorithm>
 #include <cstdint>
 #include <memory>
 #include <unordered_map>
 #include <unordered_set>
+#include <utility>
 #include <vector>
 
 namespace qx {
@@ -68,6 +72,7 @@ public:
         Node* lastAttribute; // declarations stand among the attributes
         Node* lastChild;
         bool hasText;         // a text that is not empty
+        bool hasKept;         // places for what is kept among the children
         bool hasDeclarations; // of whatever kind
         bool isIndexed;       // its attributes are
     };
@@ -79,13 +84,27 @@ public:
     XMLDraft& operator=(const XMLDraft&) = delete;
 
     // An element that stands nowhere yet.
-    Element& newElement(const String& name);
+    Element& newElement(const String& name) {
+        return *::new (allocate(sizeof(Element)))
+            Element{{&name, nullptr, Node::bitsOf(Kind::element, 0)},
+                    nullptr,
+                    nullptr,
+                    false,
+                    false,
+                    false,
+                    false};
+    }
     // Adds nothing when the prefix is declared there already.
     void addDeclaration(Element& element, const String& prefix, const String& URI);
     // Adds nothing when an attribute of that name is there already.
     void addAttribute(Element& element, const String& name, std::string_view value);
-    static void addChild(Element& parent, Element& child) noexcept;
-    void addLeaf(Element& parent, const String& name, std::string_view text);
+    static void addChild(Element& parent, Element& child) noexcept {
+        append(parent.lastChild, &child);
+    }
+    void addLeaf(Element& parent, const String& name, std::string_view text) {
+        append(parent.lastChild,
+               text.empty() ? &newElement(name) : newText(Kind::leaf, &name, text));
+    }
     // Takes the place of all children. An empty text is none.
     void setText(Element& element, std::string_view text);
     // Appends the children of the one to those of the other.
@@ -107,6 +126,8 @@ public:
     template <class LastIn>
     Found lastChildNamed(const Element& element, const String& name, LastIn lastIn);
 
+    // How much memory it takes.
+    std::size_t size() const noexcept { return _allocated - _left; }
     // The tree as nodes, in a document of version "1.0" and encoding "UTF-8". What is kept moves.
     static Ref<XMLDocument> makeDocument(const Element& root);
 
@@ -150,9 +171,21 @@ private:
     void grow(std::size_t size);
     // The element in place of the child, which has room for more than a text.
     Element& enlarged(Node& child);
-    Node* newNode(Kind kind, const String* name, std::string_view value);
+    Node* newNode(Kind kind, const String* name, std::string_view value) {
+        // What moves leaves a pointer.
+        void* const memory = allocate(sizeof(Node) + std::max(value.size(), sizeof(Element*)));
+        Node* const node = ::new (memory) Node{name, nullptr, Node::bitsOf(kind, value.size())};
+        copyShort(value.data(), value.size(), reinterpret_cast<char*>(node + 1));
+        return node;
+    }
+    Node* newText(Kind kind, const String* name, std::string_view value) {
+        return newNode(kind, name, _values == Values::copied ? value : std::string_view());
+    }
     XMLElement& newHolder(Kind kind, Node*& last);
-    static void append(Node*& last, Node* node) noexcept;
+    static void append(Node*& last, Node* node) noexcept {
+        node->next = last != nullptr ? std::exchange(last->next, node) : node;
+        last = node;
+    }
     bool hasAttribute(Element& element, const String& name);
     void indexAttributes(Element& element);
     Children& indexedChildren(const Element& element);
@@ -162,6 +195,7 @@ private:
     std::vector<std::unique_ptr<std::byte[]>> _blocks;
     std::byte* _next = nullptr;
     std::size_t _left = 0;
+    std::size_t _allocated = 0;
     std::size_t _blockSize = 2048;
     std::vector<Ref<XMLElement>> _holders;
     std::unordered_map<const Element*, Attributes> _attributes;

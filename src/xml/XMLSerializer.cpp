@@ -140,12 +140,14 @@ void XMLSerializer::endElement(const XMLElement& element) {
     endTag(element.name());
 }
 
-void XMLSerializer::endTag(const String& name) {
-    char* const tag = _output.extend(name.size() + 3);
-    tag[0] = '<';
-    tag[1] = '/';
-    std::memcpy(tag + 2, name.c_str(), name.size());
-    tag[name.size() + 2] = '>';
+void XMLSerializer::endTag(const String& name, bool isOnLine) {
+    const std::size_t start = lineStart(isOnLine);
+    TextBuffer::Piece tag(_output, start + name.size() + 3);
+    addLineStart(tag, start);
+    tag += "</";
+    tag += name;
+    tag += '>';
+    tag.keep();
 }
 
 void XMLSerializer::writeLeaf(const XMLNode& node) {
@@ -262,13 +264,7 @@ void XMLSerializer::writeLiteral(std::string_view text, const XMLPlace& place) {
 }
 
 void XMLSerializer::writeName(const String& name, const XMLPlace& place) {
-    const char* const address = name.view().data();
-    const auto number = reinterpret_cast<std::uintptr_t>(address) / 16;
-    const char*& checked = _checked[(number ^ number / nameSlots) % nameSlots];
-    if (isChecked() && (checked != address || address == nullptr)) {
-        checkName(name, place);
-        checked = address;
-    }
+    requireName(name, place);
     if (_encoder != nullptr)
         return writeLiteral(name, place);
     _output += name;
@@ -287,10 +283,8 @@ void XMLSerializer::startLine(const XMLNode& child) {
 }
 
 void XMLSerializer::breakLine(std::size_t depth) {
-    // Deeper than documents are by default, blanks would outgrow all else.
-    constexpr std::size_t deepestIndent = 256;
     _output += '\n';
-    _output.append(std::min(depth, deepestIndent) * 4, ' ');
+    _output.append(indentOf(depth), ' ');
 }
 
 XMLSerializer::Level XMLSerializer::levelOf(const XMLElement& element) const {

@@ -67,11 +67,26 @@ private:
     void writeLiteral(std::string_view text, const XMLPlace& place);
     bool isEncodable(char32_t c, std::string_view character) const;
     void writeName(const String& name, const XMLPlace& place);
+    // Looks at it once.
+    void requireName(const String& name, const XMLPlace& place) {
+        const char* const address = name.view().data();
+        const auto number = reinterpret_cast<std::uintptr_t>(address) / 16;
+        const char*& checked = _checked[(number ^ number / nameSlots) % nameSlots];
+        if (isChecked() && (checked != address || address == nullptr)) {
+            checkName(name, place);
+            checked = address;
+        }
+    }
     void checkName(const String& name, const XMLPlace& place);
 
     // Of a pretty-printed document.
     void startLine(const XMLNode& child);
     void breakLine(std::size_t depth);
+    // Deeper than documents are by default, blanks would outgrow all else.
+    static std::size_t indentOf(std::size_t depth) noexcept {
+        constexpr std::size_t deepestIndent = 256;
+        return std::min(depth, deepestIndent) * 4;
+    }
     Level enclosingLevel() const { return _levels.empty() ? Level{false, false} : _levels.back(); }
     Level levelOf(const XMLElement& element) const;
 
@@ -83,12 +98,25 @@ private:
     }
 
     // Of a draft.
+    //
+    // What begins on a line of its own has that many bytes before it, 0 where it does not.
+    std::size_t lineStart(bool isOnLine) const noexcept {
+        return isOnLine ? 1 + indentOf(_levels.size()) : 0;
+    }
+    static void addLineStart(TextBuffer::Piece& piece, std::size_t size) noexcept {
+        if (size == 0)
+            return;
+        piece += '\n';
+        piece.addBlanks(size - 1);
+    }
     struct DraftTag;
-    void writeElement(const XMLDraft::Element& element);
-    DraftTag startTag(const XMLDraft::Element& element);
+    void writeElement(const XMLDraft::Element& element, bool isOnLine);
+    DraftTag startTag(const XMLDraft::Element& element, bool isOnLine);
+    void addAttribute(const XMLDraft::Element& element, const String& name, std::string_view value,
+                      DraftTag& tag);
     void writeChildren(const XMLDraft::Element& element);
-    void writeLeaf(const XMLDraft::Node& leaf);
-    void endTag(const String& name);
+    void writeLeaf(const XMLDraft::Node& leaf, bool isOnLine);
+    void endTag(const String& name, bool isOnLine = false);
 
     TextBuffer& _output;
     XMLOptions _options;

@@ -2,6 +2,7 @@
 
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "xml/ByteRuns.h"
 #include "xml/XMLCharacters.h"
 #include "xml/XMLSerializer.h"
 
@@ -66,16 +67,23 @@ bool declares(const XMLDraft::Element& element, std::string_view prefix) {
 
 void XMLSerializer::write(const XMLDraft::Element& root) {
     writeDeclaration("1.0", "UTF-8", {});
-    writeElement(root);
+    writeElement(root, false);
     if (has(XMLPrettyPrint))
         _output += '\n';
     _limits.requireDocument(_output.size(), {});
 }
 
-XMLSerializer::DraftTag XMLSerializer::startTag(const XMLDraft::Element& element) {
+XMLSerializer::DraftTag XMLSerializer::startTag(const XMLDraft::Element& element, bool isOnLine) {
+    const String& name = *element.name;
+    requireName(name, {});
+    const std::size_t start = lineStart(isOnLine);
+    TextBuffer::Piece piece(_output, start + name.size() + 1);
+    addLineStart(piece, start);
+    piece += '<';
+    piece += name;
+    piece.keep();
+
     DraftTag tag{.preserves = enclosingLevel().preserves};
-    _output += '<';
-    writeName(*element.name, {});
     if (element.hasDeclarations)
         forEachDeclaration(element, [&](const String& prefix, const String& URI) {
             _output += ' ';
@@ -83,48 +91,69 @@ XMLSerializer::DraftTag XMLSerializer::startTag(const XMLDraft::Element& element
             ++tag.declarations;
         });
     tag.attributes = tag.declarations;
-    const auto write = [&](const String& name, std::string_view value) {
-        _output += ' ';
-        writeAttribute(name, value, {},
-                       [&](std::string_view prefix) { return declares(element, prefix); });
-        ++tag.attributes;
-        tag.declarations += isDeclaration(name) ? 1 : 0;
-        if (name.view() == "xml:space")
-            tag.preserves = value == "preserve";
+    const auto add = [&](const String& attribute, std::string_view value) {
+        addAttribute(element, attribute, value, tag);
     };
     XMLDraft::forEach(element.lastAttribute, [&](const XMLDraft::Node& node) {
         if (node.kind() == XMLDraft::Kind::attribute)
-            write(*node.name, node.value());
+            add(*node.name, node.value());
         else if (node.kind() == XMLDraft::Kind::keptAttributes)
-            node.holder().forEachAttribute(write);
+            node.holder().forEachAttribute(add);
     });
     _limits.enter({}, tag.attributes, tag.declarations);
-    tag.hasChildren = anyChild(element, isThere);
+    tag.hasChildren = element.hasKept ? anyChild(element, isThere) : element.lastChild != nullptr;
     if (tag.hasChildren || !has(XMLCompactEmptyElements))
         _output += '>';
     return tag;
 }
 
+// Names that begin so may mean more than a value.
+void XMLSerializer::addAttribute(const XMLDraft::Element& element, const String& name,
+                                 std::string_view value, DraftTag& tag) {
+    ++tag.attributes;
+    if (name.view().starts_with("xml")) {
+        _output += ' ';
+        writeAttribute(name, value, {},
+                       [&](std::string_view prefix) { return declares(element, prefix); });
+        tag.declarations += isDeclaration(name) ? 1 : 0;
+        if (name.view() == "xml:space")
+            tag.preserves = value == "preserve";
+        return;
+    }
+    _limits.requireSize(value.size(), "an attribute's value is larger than", {});
+    requireName(name, {});
+    TextBuffer::Piece piece(_output, name.size() + value.size() + 4);
+    piece += ' ';
+    piece += name;
+    piece += "=\"";
+    const bool isPlain = copyRun<writtenByte>(value.data(), value.size(), piece.end());
+    if (isPlain) {
+        piece.advance(value.size());
+        piece += '"';
+    }
+    piece.keep();
+    if (isPlain)
+        return;
+    writeEscaped(value, Where::attribute, true, {});
+    _output += '"';
+}
+
 // Drafts are as deep as objects may nest.
-void XMLSerializer::writeElement(const XMLDraft::Element& element) {
-    const DraftTag tag = startTag(element);
+void XMLSerializer::writeElement(const XMLDraft::Element& element, bool isOnLine) {
+    const DraftTag tag = startTag(element, isOnLine);
+    bool isLaidOut = false;
     if (tag.hasChildren) {
-        const bool isMixed =
-            enclosingLevel().isMixed || element.hasText || !anyChild(element, [](const auto& node) {
-                return node.kind() != XMLDraft::Kind::text && isThere(node);
-            });
-        const bool isLaidOut = has(XMLPrettyPrint) && !isMixed && !tag.preserves;
+        const bool isMixed = enclosingLevel().isMixed || element.hasText;
+        isLaidOut = has(XMLPrettyPrint) && !isMixed && !tag.preserves;
         if (has(XMLPrettyPrint))
             _levels.push_back({tag.preserves, isMixed});
         writeChildren(element);
         if (has(XMLPrettyPrint))
             _levels.pop_back();
-        if (isLaidOut)
-            breakLine(_levels.size());
     }
     _limits.leave();
     if (tag.hasChildren || !has(XMLCompactEmptyElements))
-        endTag(*element.name);
+        endTag(*element.name, isLaidOut);
     else
         _output += "/>";
 }
@@ -132,11 +161,9 @@ void XMLSerializer::writeElement(const XMLDraft::Element& element) {
 void XMLSerializer::writeChildren(const XMLDraft::Element& element) {
     const bool isLaidOut = has(XMLPrettyPrint) && !_levels.back().isInline();
     XMLDraft::forEach(element.lastChild, [&](const XMLDraft::Node& node) {
-        if (isLaidOut && node.name != nullptr)
-            breakLine(_levels.size());
         switch (node.kind()) {
         case XMLDraft::Kind::leaf:
-            writeLeaf(node);
+            writeLeaf(node, isLaidOut);
             break;
         case XMLDraft::Kind::text:
             _limits.addText(node.value().size(), {});
@@ -149,29 +176,43 @@ void XMLSerializer::writeChildren(const XMLDraft::Element& element) {
             }
             break;
         default:
-            writeElement(node.element());
+            writeElement(node.element(), isLaidOut);
         }
     });
 }
 
-void XMLSerializer::writeLeaf(const XMLDraft::Node& leaf) {
-    _output += '<';
-    writeName(*leaf.name, {});
-    _output += '>';
+void XMLSerializer::writeLeaf(const XMLDraft::Node& leaf, bool isOnLine) {
+    const String& name = *leaf.name;
+    const std::string_view text = leaf.value();
+    requireName(name, {});
     _limits.enter({}, 0, 0);
-    _limits.requireSize(leaf.value().size(), "a text is larger than", {});
-    writeEscaped(leaf.value(), Where::text, isWhite(leaf.value()), {});
+    _limits.requireSize(text.size(), "a text is larger than", {});
+    const std::size_t start = lineStart(isOnLine);
+    TextBuffer::Piece piece(_output, start + 2 * name.size() + text.size() + 5);
+    addLineStart(piece, start);
+    piece += '<';
+    piece += name;
+    piece += '>';
+    const bool isPlain = copyRun<writtenByte>(text.data(), text.size(), piece.end());
+    if (isPlain) {
+        piece.advance(text.size());
+        piece += "</";
+        piece += name;
+        piece += '>';
+    }
+    piece.keep();
     _limits.leave();
-    endTag(*leaf.name);
+    if (isPlain)
+        return;
+    writeEscaped(text, Where::text, isWhite(text), {});
+    endTag(name);
 }
 
 void XMLSerializer::writeInside(const XMLDraft::Element& element) {
     _limits.enter({}, 0, 0);
-    if (has(XMLPrettyPrint)) {
+    if (has(XMLPrettyPrint))
         _levels.push_back({false, false});
-        breakLine(_levels.size());
-    }
-    writeElement(element);
+    writeElement(element, has(XMLPrettyPrint));
 }
 
 // Nodes are made only for the place of what cannot be written.

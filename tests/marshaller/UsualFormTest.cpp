@@ -3,7 +3,11 @@
 
 #include "Structs.h"
 
+#include "marshaller/Unmarshalling.h"
+
 using namespace structs;
+using qx::detail::ReadingTrace;
+using qx::detail::Unmarshalling;
 
 namespace {
 
@@ -83,6 +87,34 @@ protected:
         marshaller->setReportHandler([](const QXXMLReport&) {});
         EXPECT_EQ(usual, read(document, hasSlot)) << document;
     }
+    // What a reading tells its trace; in single steps it goes the general way.
+    std::string traceOf(const std::string& document, bool hasSlot, Unmarshalling::Use use) {
+        const auto parsed = qx::XMLDocument::initWithData(document);
+        qx::IndexedXML index(*parsed);
+        ReadingTrace trace;
+        qx::Ref<qx::Error> error;
+        qx::Ref<qx::Error>* const slot = hasSlot ? &error : nullptr;
+        qx::detail::ReadingProgress progress(*marshaller, index.size());
+        qx::detail::ErrorCollector collector(*marshaller, slot);
+        Unmarshalling reading(*marshaller, index, use);
+        reading.setTrace(&trace);
+        std::string all;
+        try {
+            reading.read(index.root(), slot, progress, collector);
+        } catch (const std::exception& exception) {
+            all = exception.what();
+        }
+        for (const ReadingTrace::Use& one : trace.uses())
+            all += "\n" + trace.keyPath(one.owner, one.field).str() + " of " +
+                   std::to_string(one.owner) + " made " + std::to_string(one.made) + " from " +
+                   std::to_string(one.entry) + " as " + std::to_string(int(one.form)) + " name " +
+                   std::to_string(one.binding) + " item " + std::to_string(one.item);
+        for (const ReadingTrace::Owner& owner : trace.owners())
+            all += "\n" + owner.plan->className.string().str() + " of " +
+                   std::to_string(owner.element) + " by " + std::to_string(owner.use) + ": " +
+                   std::to_string(owner.firstUse) + " to " + std::to_string(owner.usesEnd);
+        return all;
+    }
 };
 
 constexpr const char* documents[] = {
@@ -118,15 +150,20 @@ constexpr const char* documents[] = {
 
 } // namespace
 
-TEST_F(UsualForm, IsReadLikeAnyOther) {
+TEST_F(UsualForm, IsReadLikeAnyOtherAndTellsATraceTheSame) {
     testing::internal::CaptureStderr();
     for (const char* document : documents)
-        for (unsigned options = 0; options < 32; ++options) {
+        for (unsigned options = 0; options < 64; ++options) {
+            const bool hasSlot = (options & 16U) != 0;
             marshaller->setLenient((options & 1U) != 0);
             marshaller->setSaveUnknownXML((options & 2U) != 0);
             marshaller->setMaximumErrors((options & 4U) != 0 ? 5 : 1);
             marshaller->setKeepsPartial((options & 8U) != 0);
-            compare(document, (options & 16U) != 0);
+            marshaller->setKeepsExactly((options & 32U) != 0);
+            compare(document, hasSlot);
+            EXPECT_EQ(traceOf(document, hasSlot, Unmarshalling::Use::document),
+                      traceOf(document, hasSlot, Unmarshalling::Use::steps))
+                << document;
         }
     testing::internal::GetCapturedStderr();
 }
