@@ -5,6 +5,7 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
+#include "marshaller/ClassUses.h"
 #include "xml/XMLParser.h"
 
 namespace qx::detail {
@@ -18,6 +19,16 @@ public:
     }
 
     XMLParser::Names names;
+
+    // A reading holds them to its end: one that begins inside it may replace them here.
+    std::shared_ptr<ClassUses> classUses(const Ref<const QXXMLMarshallingMapping>& mapping) {
+        if (!_classUses || !_classUses->holdFor(mapping.get()))
+            _classUses = std::make_shared<ClassUses>(mapping);
+        return _classUses;
+    }
+
+private:
+    std::shared_ptr<ClassUses> _classUses;
 };
 
 } // namespace qx::detail

@@ -4,6 +4,7 @@
 
 #include "base/BulkObjects.h"
 #include "host/Log.h"
+#include "marshaller/ReadingMemory.h"
 #include "model/Errors.h"
 
 #include <algorithm>
@@ -17,8 +18,10 @@ Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, 
       _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
       _reports(marshaller), _keepsExactly(marshaller.keepsExactly()),
       _ownTrace(_keepsExactly ? std::make_unique<ReadingTrace>() : nullptr),
-      _trace(_ownTrace.get()), _usual(*this), _classes(_plan.classCount() + 1),
-      _classKnown(_plan.classCount() + 1) {
+      _trace(_ownTrace.get()),
+      // The plan of a single step may stand in no mapping and be gone after it.
+      _classUses(use == Use::document ? ReadingMemory::of(marshaller).classUses(_mapping)
+                                      : std::make_shared<ClassUses>(_mapping)) {
     if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
         document.matchBy(*table);
 }
@@ -140,8 +143,8 @@ std::optional<Ref<Object>> Unmarshalling::buildUsual(const ClassPlan& plan, Numb
         return std::nullopt;
     return buildWith(plan, {element, usual.childCount()}, given, error, [&](Object& object) {
         const UsualReading::Source source{plan, usual, element, nodes};
-        return _trace == nullptr ? _usual.readFields(source, object, error)
-                                 : _usual.readFieldsTraced(source, object, error);
+        return _trace == nullptr ? UsualReading::readFields(*this, source, object, error)
+                                 : UsualReading::readFieldsTraced(*this, source, object, error);
     });
 }
 
@@ -186,21 +189,13 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const Counted& source, Error
     return fail(error, errors::nestedTooDeep, deepest, plan.className.string());
 }
 
-const Class* Unmarshalling::classOf(const ClassPlan& plan) {
-    if (!_classKnown[plan.index]) {
-        _classKnown[plan.index] = true;
-        _classes[plan.index] = Class::named(plan.classNameToInstantiate.view());
-    }
-    return _classes[plan.index];
-}
-
 Ref<Object> Unmarshalling::allocate(const ClassPlan& plan) {
-    const Class* const type = classOf(plan);
+    const Class* const type = _classUses->classOf(plan);
     Ref<Object> object = type != nullptr ? type->create() : nullptr;
     if (type != nullptr && !object) {
         logWarningOrLine("Class %@ cannot be made without arguments, records stand in for it",
                          type->name());
-        _classes[plan.index] = nullptr;
+        _classUses->setUnmakeable(plan);
     }
     if (!object)
         object = QXGenericRecord::classObject().create();

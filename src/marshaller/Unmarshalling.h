@@ -14,6 +14,7 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
 #include "marshaller/ChildLookup.h"
+#include "marshaller/ClassUses.h"
 #include "marshaller/ConsumedNames.h"
 #include "marshaller/ErrorCollector.h"
 #include "marshaller/NamespaceMatching.h"
@@ -74,8 +75,6 @@ public:
     Ref<Object> build(const ClassPlan& plan, Number element, IndexedXML::Nodes nodes,
                       ErrorSlot error, StructObject* given = nullptr);
     Ref<Object> allocate(const ClassPlan& plan);
-    // The host's class of that name; null where it has none, or none that can be made.
-    const Class* classOf(const ClassPlan& plan);
     // The fields of the class and its ancestors, and what no field consumed.
     bool readFields(const ClassPlan& plan, const Target& target, ErrorSlot error);
     // True unless it failed: also when there was nothing to bind.
@@ -117,6 +116,7 @@ public:
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
+    ClassUses& classUses() noexcept { return *_classUses; }
     // The text inside an element, put together; null with -224 where that is too much.
     Value textOf(Number element, ErrorSlot error);
     IndexedXML& document() noexcept { return _document; }
@@ -217,9 +217,7 @@ private:
     bool _isTraced = false;
     const std::unique_ptr<ReadingTrace> _ownTrace; // of what is kept exactly
     ReadingTrace* _trace = nullptr;
-    UsualReading _usual;
-    std::vector<const Class*> _classes; // by plan index, looked up once
-    std::vector<bool> _classKnown;
+    const std::shared_ptr<ClassUses> _classUses;
     const Frame* _frame = nullptr;
     const Error* _earlier = nullptr;
     Number _wrapper = none; // see setWrapper

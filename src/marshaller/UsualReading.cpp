@@ -46,55 +46,15 @@ private:
 
 } // namespace
 
-inline const UsualReading::Setters& UsualReading::settersOf(const ClassPlan& plan,
-                                                            const Object& object) {
-    if (_latest.size() <= plan.index)
-        _latest.resize(plan.index + 1, nullptr);
-    const Setters*& latest = _latest[plan.index];
-    if (latest == nullptr || latest->type != &object.isa()) [[unlikely]]
-        latest = &lookUp(plan, object);
-    return *latest;
-}
-
-const UsualReading::Setters& UsualReading::lookUp(const ClassPlan& plan, const Object& object) {
-    static const Selector announces("automaticallyNotifiesObserversForKey:");
-    const Class& type = object.isa();
-    Setters& setters = _setters.emplace_front();
-    setters.type = &type;
-    setters.appends = &type == &QXGenericRecord::classObject();
-    setters.usesProperties =
-        type.isStruct() || (type.setsByProperty() && typeid(object) == type.type() &&
-                            type.classOperation(announces) == nullptr);
-    setters.slots.reserve(plan.usualForm->slots().size());
-    for (const Slot& slot : plan.usualForm->slots()) {
-        const Key key = slot.field->key;
-        const Property* const property = type.property(key);
-        setters.slots.push_back({property, placedClass(slot, property)});
-        setters.appends = setters.appends && property == nullptr && !key.view().starts_with('@');
-    }
-    return setters;
-}
-
-// Where errors are collected an object that failed is left out, as if it had never been.
-const Class* UsualReading::placedClass(const Slot& slot, const Property* property) const {
-    const StructPlacing* const placing = property != nullptr ? property->placing : nullptr;
-    if (placing == nullptr || placing->isList() != slot.isList() || slot.plan == nullptr ||
-        _reading.isCollecting())
-        return nullptr;
-    // Whether such objects can be made is found out when the first of them is.
-    const Class* const type = Class::named(slot.plan->classNameToInstantiate.view());
-    return type != nullptr && type->isStruct() && type->type() == *placing->type ? type : nullptr;
-}
-
 // One object that is bound.
 template <class Tracing>
 class UsualReading::Binding {
 public:
-    Binding(Unmarshalling& reading, const Source& source, const Setters& setters, Object& object,
-            ErrorSlot error) noexcept
+    Binding(Unmarshalling& reading, const Source& source, Object& object, ErrorSlot error)
         : _reading(reading), _document(reading.document()), _source(source),
-          _slots(source.plan.usualForm->slots().data()), _setters(setters), _object(object),
-          _error(error), _isUnheard(setters.appends), _trace(reading.trace()) {}
+          _slots(source.plan.usualForm->slots().data()),
+          _setters(reading.classUses().settersOf(source.plan, object)), _object(object),
+          _error(error), _isUnheard(_setters.appends), _trace(reading.trace()) {}
 
     bool run() {
         for (std::uint32_t left = slotsToRead(); left != 0; left &= left - 1)
@@ -114,6 +74,10 @@ private:
         std::size_t most; // how many there may be
     };
 
+    // Where errors are collected an object that failed is left out, as if it had never been.
+    bool isPlaced(const ClassUses::Setter& setter) const noexcept {
+        return setter.placed != nullptr && !_reading.isCollecting();
+    }
     std::uint32_t slotsToRead() const noexcept;
     bool readField(std::size_t slot);
     [[gnu::noinline, gnu::cold]] bool passOver(const FieldPlan& field);
@@ -134,7 +98,7 @@ private:
     IndexedXML& _document;
     const Source& _source;
     const Slot* const _slots;
-    const Setters& _setters;
+    const ClassUses::Setters& _setters;
     Object& _object;
     const ErrorSlot _error;
     bool _isUnheard; // a record, of nobody
@@ -142,12 +106,14 @@ private:
     std::size_t _attributesTaken = 0; // of a reading with a trace
 };
 
-bool UsualReading::readFields(const Source& source, Object& object, ErrorSlot error) {
-    return Binding<Untraced>(_reading, source, settersOf(source.plan, object), object, error).run();
+bool UsualReading::readFields(Unmarshalling& reading, const Source& source, Object& object,
+                              ErrorSlot error) {
+    return Binding<Untraced>(reading, source, object, error).run();
 }
 
-bool UsualReading::readFieldsTraced(const Source& source, Object& object, ErrorSlot error) {
-    return Binding<Traced>(_reading, source, settersOf(source.plan, object), object, error).run();
+bool UsualReading::readFieldsTraced(Unmarshalling& reading, const Source& source, Object& object,
+                                    ErrorSlot error) {
+    return Binding<Traced>(reading, source, object, error).run();
 }
 
 // Whether there is something that no field took: an attribute that did not fit, what else a wrapper
@@ -214,7 +180,7 @@ bool UsualReading::Binding<Tracing>::readValue(std::size_t slot, ErrorSlot error
         value = text != IndexedXML::none ? _document.value(text) : _reading.textOf(number, error);
         if (taking.place == Place::text && value.view().empty())
             return true;
-    } else if (const Setter& setter = _setters.slots[slot]; setter.placed != nullptr) {
+    } else if (const auto& setter = _setters.slots[slot]; isPlaced(setter)) {
         StructObject held(*setter.placed, setter.property->placing->begin(_object, 1));
         return static_cast<bool>(_reading.build(*taking.plan, number, _source.nodes, error, &held));
     } else {
@@ -311,7 +277,7 @@ bool UsualReading::Binding<Tracing>::readItems(std::size_t slot) {
         return false;
     if (taking.place == Place::wrapped)
         _trace.take(Form::wrapper, taking, _source.element[slot]);
-    if (_setters.slots[slot].placed != nullptr)
+    if (isPlaced(_setters.slots[slot]))
         return placeItems(slot, items);
     // Few may be made of very many.
     constexpr std::size_t usualSize = 16;
@@ -343,7 +309,7 @@ bool UsualReading::Binding<Tracing>::readItems(std::size_t slot) {
 // Without a slot for errors an item that fails is left out.
 template <class Tracing>
 bool UsualReading::Binding<Tracing>::placeItems(std::size_t slot, const Items& items) {
-    const Setter& setter = _setters.slots[slot];
+    const ClassUses::Setter& setter = _setters.slots[slot];
     const StructPlacing& placing = *setter.property->placing;
     std::size_t count = 0; // of many children few may be items
     forEach(items, _slots[slot], [&](Number) { return ++count != 0; });

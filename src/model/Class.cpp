@@ -4,6 +4,7 @@
 
 #include "base/Immortal.h"
 #include "base/PropertyNames.h"
+#include "model/ClassVersion.h"
 #include "model/TypeNames.h"
 #include "model/Warning.h"
 
@@ -110,6 +111,7 @@ struct ClassRegistry {
         // Descriptions are immortal: objects keep pointers to them.
         const auto* published = new Class(std::move(draft));
         byType.emplace(type, published);
+        version.fetch_add(1, std::memory_order_release);
         if (isTaken != nullptr)
             *isTaken = true;
         standIns.clear(); // it may be the base, or the very class, of what one stands in for
@@ -145,6 +147,7 @@ struct ClassRegistry {
             forgetLocked(described);
     }
 
+    std::atomic<std::uint64_t> version = 0; // see ClassVersion.h
     std::shared_mutex mutex;
     std::unordered_map<Key, const Class*> byName;
     std::unordered_map<std::type_index, const Class*> byType;
@@ -154,6 +157,7 @@ private:
     // The name may be another class's.
     void forgetLocked(const Class& described) {
         retired.push_back(&described);
+        version.fetch_add(1, std::memory_order_release);
         byType.erase(*described._type);
         if (const auto found = byName.find(described._name);
             found != byName.end() && found->second == &described)
@@ -195,6 +199,10 @@ const Operation* findOperation(const std::vector<Operation>& operations, Selecto
 }
 
 } // namespace
+
+std::uint64_t classVersion() noexcept {
+    return immortal<ClassRegistry>().version.load(std::memory_order_acquire);
+}
 
 Class::Class(detail::ClassDraft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),

@@ -5,6 +5,8 @@
 
 #include "marshaller/Unmarshalling.h"
 
+#include <functional>
+
 using namespace structs;
 using qx::detail::ReadingTrace;
 using qx::detail::Unmarshalling;
@@ -25,9 +27,12 @@ struct Branch {
     void setWord(const std::string& word) {
         if (word == "thrown")
             throw std::runtime_error(word);
+        if (onWord)
+            onWord();
         _word = word;
     }
     const std::string& word() const { return _word; }
+    inline static std::function<void()> onWord;
 
 private:
     std::string _word;
@@ -189,4 +194,27 @@ TEST_F(UsualForm, MakesStructsInPlaceFromTheirOwnDefaults) {
     EXPECT_EQ(read->leaves[0].a + read->leaves[1].a, "none4");
     const auto none = marshaller->readString<Branch>("<branch/>");
     EXPECT_EQ(none->leaves.size(), 3U);
+}
+
+// A marshaller keeps what it has found out about classes, as long as that holds.
+TEST_F(UsualForm, TellsWhenClassesComeAndGo) {
+    struct Sheet {
+        int a = 0;
+    };
+    const auto shown = [&] { return support::show(marshaller->readString("<leaf a='5'/>")); };
+    const std::string asLeaf = shown();
+    EXPECT_EQ(shown(), asLeaf);
+    Branch::onWord = [&] {
+        qx::Class::forget("Leaf");
+        qx::Class::define<Sheet>("Leaf").members<&Sheet::a>();
+        EXPECT_EQ(support::show(marshaller->readString("<leaf a='5'/>")), "Leaf{a: 5}");
+    };
+    const auto read = marshaller->readString("<branch><leaf n='2'/><word>w</word></branch>");
+    Branch::onWord = nullptr;
+    EXPECT_TRUE(read);
+    EXPECT_EQ(shown(), "Leaf{a: 5}");
+    qx::Class::forget("Leaf");
+    EXPECT_EQ(marshaller->readString("<leaf a='5'/>")->isa().name(), "QXGenericRecord");
+    qx::Class::define<Leaf>("Leaf").members<&Leaf::a, &Leaf::n>();
+    EXPECT_EQ(shown(), asLeaf);
 }
