@@ -68,16 +68,16 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const qx::XMLParseOptions options = optionsOf(data[0]);
     const std::string_view bytes(reinterpret_cast<const char*>(data) + 1, size - 1);
 
-    const auto parsed = [&](qx::Ref<qx::Error>& error, qx::XMLParser::Names* names, Way way) {
+    const auto parsed = [&](qx::Ref<qx::Error>& error, qx::XMLParser::Kept* kept, Way way) {
         return qx::XMLDocumentContent::document(
-            qx::XMLParser::parseCopy(bytes, options, &error, names, way));
+            qx::XMLParser::parseCopy(bytes, options, &error, kept, way));
     };
     qx::Ref<qx::Error> error;
     qx::Ref<qx::Error> otherError;
-    qx::XMLParser::Names names;
-    parsed(error, &names, Way::fastest);
+    qx::XMLParser::Kept kept;
+    parsed(error, &kept, Way::fastest);
     error = nullptr;
-    const auto document = parsed(error, &names, Way::fastest); // with the names that it kept
+    const auto document = parsed(error, &kept, Way::fastest); // with what it left
     const auto other = parsed(otherError, nullptr, Way::cParserOnly);
     require((document == nullptr) == (other == nullptr), "both read it or none");
     if (!document) {

@@ -18,7 +18,7 @@ public:
         return *marshaller._memory;
     }
 
-    XMLParser::Names names;
+    XMLParser::Kept parsing;
 
     // A reading holds them to its end: one that begins inside it may replace them here.
     std::shared_ptr<ClassUses> classUses(const Ref<const QXXMLMarshallingMapping>& mapping) {

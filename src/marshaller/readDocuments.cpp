@@ -96,13 +96,13 @@ Source sourceOf(QXXMLMarshaller& marshaller, Ref<qx::Data> data, Ref<Error>* err
     if (!data)
         return {};
     return {qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error,
-                                 &ReadingMemory::of(marshaller).names),
+                                 &ReadingMemory::of(marshaller).parsing),
             {}};
 }
 
 Source sourceOf(QXXMLMarshaller& marshaller, qx::XMLBytes bytes, Ref<Error>* error) {
     return {qx::XMLParser::parseCopy(bytes, qx::detail::parsingOf(marshaller), error,
-                                     &ReadingMemory::of(marshaller).names),
+                                     &ReadingMemory::of(marshaller).parsing),
             {}};
 }
 

@@ -66,7 +66,9 @@ void UpdatePlan::removeAttribute(Entry attribute, Entry element, Shown field) {
         !_source.after[field].field->bindings.empty() &&
         _source.document.name(element) == _source.after[field].field->location() &&
         !_source.after[field].field->location().isEmpty();
-    if (isWrapper && _source.index.contentEnd(element) == element + 2)
+    bool isOnly = _source.index.firstChild(element) == element + 2;
+    _source.document.forEachChild(element, [&](Entry) { isOnly = false; });
+    if (isWrapper && isOnly)
         return removeElement(element, field);
     add(blanksBefore(spot.begin), spot.end, {}, field);
 }

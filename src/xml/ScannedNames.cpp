@@ -23,23 +23,23 @@ ScannedNames::ScannedNames(std::size_t longest)
     _texts.reserve(usualCount);
 }
 
-ScannedNames ScannedNames::take(Kept* kept, std::size_t longest) {
-    auto known = kept != nullptr ? std::exchange(*kept, std::nullopt) : std::nullopt;
+ScannedNames ScannedNames::take(Kept& kept, std::size_t longest) {
+    auto known = std::exchange(kept, std::nullopt);
     if (!known || known->_longest != longest)
         return ScannedNames(longest);
     known->_URIs = 0;
     return std::move(*known);
 }
 
-std::vector<String> ScannedNames::finish(std::uint32_t element, Kept* kept) {
+std::vector<String> ScannedNames::finish(std::uint32_t element, Kept& kept) {
     constexpr std::size_t mostKept = 100;
     constexpr std::uint32_t mostElements =
         UINT32_MAX / 4; // the next document has no more than that
-    if (kept == nullptr || _texts.size() > mostKept || element > mostElements)
+    if (_texts.size() > mostKept || element > mostElements)
         return std::move(_texts);
     _element = element;
     auto texts = _texts;
-    *kept = std::move(*this);
+    kept = std::move(*this);
     return texts;
 }
 

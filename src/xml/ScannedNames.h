@@ -55,10 +55,10 @@ public:
     // What is kept of one document for the next, if anything.
     using Kept = std::optional<ScannedNames>;
     // Those that were kept, if under the same limit; else new ones.
-    static ScannedNames take(Kept* kept, std::size_t longest);
+    static ScannedNames take(Kept& kept, std::size_t longest);
     // The texts by number, for the index. If they are few, the names are kept; `element` was the
     // document's last.
-    std::vector<String> finish(std::uint32_t element, Kept* kept);
+    std::vector<String> finish(std::uint32_t element, Kept& kept);
 
     // Counts the elements of all documents: that of the latest one.
     std::uint32_t element() const noexcept { return _element; }

@@ -25,8 +25,9 @@
 // begin and end are those of the run of entries that are its content, `next` is the next sibling's,
 // and all values lie aside.
 //
-// White space between elements is layout, which is no content. That shows when the element around
-// it ends, so the texts stay: a blank one counts only where its element keeps layout.
+// White space between elements is layout, which is no content and mostly has no entry. Whether it
+// is layout shows when the element around it ends: a blank text that has an entry counts only where
+// its element keeps layout.
 
 #include <QXXMLMarshalling/base/String.h>
 #include <QXXMLMarshalling/xml/XMLNode.h>

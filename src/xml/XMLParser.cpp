@@ -2,23 +2,22 @@
 
 #include "model/ErrorDetails.h"
 #include "xml/SAXSession.h"
-#include "xml/XMLScanner.h"
 
 namespace qx {
 
 XMLParser::Parsed XMLParser::parse(Ref<const Data> data, const XMLParseOptions& options,
-                                   Ref<Error>* error, Names* names) {
+                                   Ref<Error>* error, Kept* kept) {
     const std::string_view bytes = data->view();
-    return run(bytes, std::move(data), options, error, names, Way::fastest);
+    return run(bytes, std::move(data), options, error, kept, Way::fastest);
 }
 
 XMLParser::Parsed XMLParser::parseCopy(XMLBytes bytes, const XMLParseOptions& options,
-                                       Ref<Error>* error, Names* names, Way way) {
-    return run(bytes.view(), nullptr, options, error, names, way);
+                                       Ref<Error>* error, Kept* kept, Way way) {
+    return run(bytes.view(), nullptr, options, error, kept, way);
 }
 
 XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
-                                 const XMLParseOptions& options, Ref<Error>* error, Names* names,
+                                 const XMLParseOptions& options, Ref<Error>* error, Kept* kept,
                                  Way way) {
     const auto parsed = std::make_shared<ParsedDocument>();
     parsed->_owner = std::move(owner);
@@ -26,7 +25,7 @@ XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
     try {
         input.read(bytes, !parsed->_owner);
         parsed->_index = XMLIndex(input.text());
-        fill(parsed->_index, options, names, way);
+        fill(parsed->_index, options, kept, way);
         return parsed;
     } catch (const ParseFailure& failure) {
         if (error != nullptr)
@@ -36,16 +35,16 @@ XMLParser::Parsed XMLParser::run(std::string_view bytes, Ref<const Data> owner,
 }
 
 XMLParser::Parsed XMLParser::parsePiece(std::string text, const TextOrigin& origin,
-                                        const XMLParseOptions& options, Names* names) {
+                                        const XMLParseOptions& options, Kept* kept) {
     const auto parsed = std::make_shared<ParsedDocument>();
     parsed->_input.take(std::move(text));
     parsed->_index = XMLIndex(parsed->_input.text(), origin);
-    fill(parsed->_index, options, names, Way::fastest);
+    fill(parsed->_index, options, kept, Way::fastest);
     return parsed;
 }
 
-void XMLParser::fill(XMLIndex& index, const XMLParseOptions& options, Names* names, Way way) {
-    if (way == Way::cParserOnly || !XMLScanner::scan(index, options, names))
+void XMLParser::fill(XMLIndex& index, const XMLParseOptions& options, Kept* kept, Way way) {
+    if (way == Way::cParserOnly || !XMLScanner::scan(index, options, kept))
         SAXSession(index, options).run();
 }
 

@@ -91,7 +91,7 @@ XMLParser::Parsed XMLPieces::parse(const XMLSplitter& before, Found found) {
             throw failure;
         }
         auto parsed =
-            XMLParser::parsePiece(std::string(_opening).append(text()), _origin, _options, &_names);
+            XMLParser::parsePiece(std::string(_opening).append(text()), _origin, _options, &_kept);
         if (_splitter.isFaulty() || isBeyondLimit())
             throw ParseFailure(parseErrors::textTooLarge, {_options.maximumTextSize},
                                _opening.size() + _splitter.position());
@@ -126,7 +126,7 @@ XMLParser::Parsed XMLPieces::parseUpToCut() {
     std::string piece;
     piece.reserve(_opening.size() + cut + closing.size());
     piece.append(_opening).append(text().substr(0, cut)).append(closing);
-    auto parsed = XMLParser::parsePiece(std::move(piece), _origin, _options, &_names);
+    auto parsed = XMLParser::parsePiece(std::move(piece), _origin, _options, &_kept);
     removeUpToCut();
     return parsed;
 }

@@ -43,7 +43,7 @@ private:
     XMLTextSource _source;
     XMLSplitter _splitter;
     const XMLParseOptions _options;
-    XMLParser::Names _names;
+    XMLParser::Kept _kept;
     std::string _text;
     std::size_t _start = 0;                 // of what has not been handed out
     std::string _opening;                   // goes before that

@@ -21,14 +21,18 @@ constexpr std::ptrdiff_t emptyCData = 12;
 
 } // namespace
 
-bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options, ScannedNames::Kept* kept) {
+bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options, Kept* kept) {
     if (index.text().size() >= UINT32_MAX)
         return false;
+    Kept own;
+    Kept& used = kept != nullptr ? *kept : own;
     try {
-        const std::size_t longest = std::min(longestName, options.maximumTextSize);
-        XMLScanner scanner(index, options, ScannedNames::take(kept, longest));
-        scanner.scanDocument();
-        index._names = scanner._names.finish(scanner._element, kept);
+        try {
+            scan(index, options, used);
+        } catch (const MixedLayout&) {
+            used.hasMixedLayout = true;
+            scan(index, options, used);
+        }
         return true;
     } catch (const Refused&) {
         index = XMLIndex(index.text(), index.origin());
@@ -36,11 +40,20 @@ bool XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options, ScannedNa
     }
 }
 
-XMLScanner::XMLScanner(XMLIndex& index, const XMLParseOptions& options, ScannedNames names)
+void XMLScanner::scan(XMLIndex& index, const XMLParseOptions& options, Kept& kept) {
+    const std::size_t longest = std::min(longestName, options.maximumTextSize);
+    XMLScanner scanner(index, options, ScannedNames::take(kept.names, longest),
+                       kept.hasMixedLayout);
+    scanner.scanDocument();
+    index._names = scanner._names.finish(scanner._element, kept.names);
+}
+
+XMLScanner::XMLScanner(XMLIndex& index, const XMLParseOptions& options, ScannedNames names,
+                       bool hasMixedLayout)
     : _text(index.text()), _end(_text.data() + _text.size()), _maximumDepth(options.maximumDepth),
       _maximumSize(std::min(options.maximumTextSize, largestPiece)),
-      _keepsWhiteSpace(options.keepWhiteSpace), _index(index), _names(std::move(names)),
-      _element(_names.element()) {
+      _keepsWhiteSpace(options.keepWhiteSpace), _hasMixedLayout(hasMixedLayout), _index(index),
+      _names(std::move(names)), _element(_names.element()) {
     constexpr std::size_t usualDepth = 16;
     _open.reserve(usualDepth);
     // Most entries stand for more bytes than this.
@@ -182,8 +195,8 @@ inline XMLScanner::Place XMLScanner::scanElementStart(Place at) {
     const Number number = entryCount();
     add(XMLIndexEntry::of(XMLNodeKind::element, name.number, offset(begin)));
     const Open outer =
-        _open.empty() ? Open{0, 0, _keepsWhiteSpace, _keepsWhiteSpace} : _open.back();
-    _open.push_back({number, outer.namespaces, outer.preservesSpace, outer.preservesSpace});
+        _open.empty() ? Open{0, 0, _keepsWhiteSpace, false, _keepsWhiteSpace} : _open.back();
+    _open.push_back({number, outer.namespaces, outer.preservesSpace, false, outer.preservesSpace});
     ++_element;
     if (*at != '>')
         at = scanAttributes(at);
@@ -298,8 +311,17 @@ inline XMLScanner::Place XMLScanner::scanIndent(Place at) {
     if (*end != '<' || end[1] == '!')
         return scanText(at);
     _needsWork = false;
-    addLeaf(XMLNodeKind::text, 0, at, end).setIf(true, XMLIndexEntry::isBlank);
+    addLayout(at, end);
     return end;
+}
+
+inline void XMLScanner::addLayout(Place begin, Place end) {
+    Open& element = _open.back();
+    if (element.keepsLayout || _hasMixedLayout)
+        addLeaf(XMLNodeKind::text, 0, begin, end).setIf(true, XMLIndexEntry::isBlank);
+    else
+        element.leavesOutLayout = true;
+    require(static_cast<std::size_t>(end - begin) <= _maximumSize);
 }
 
 // One text, up to the next markup that is no CDATA.
@@ -333,8 +355,15 @@ inline XMLScanner::Place XMLScanner::scanText(Place at) {
             at = scanBeyondASCII(at);
         }
     }
-    addLeaf(XMLNodeKind::text, 0, begin, at).setIf(isBlank, XMLIndexEntry::isBlank);
-    _open.back().keepsLayout |= !isBlank;
+    if (isBlank) {
+        addLayout(begin, at);
+        return at;
+    }
+    addLeaf(XMLNodeKind::text, 0, begin, at);
+    Open& element = _open.back();
+    if (element.leavesOutLayout)
+        throw MixedLayout();
+    element.keepsLayout = true;
     return at;
 }
 

@@ -12,21 +12,24 @@ namespace {
 using qx::XMLParser;
 using qx::detail::SourceMarkup;
 
-// The C parser lists declarations before attributes.
+// The C parser lists declarations before attributes, and layout, too.
 std::set<std::string> spotsOf(const std::string& text, XMLParser::Way way) {
     const auto parsed = XMLParser::parseCopy(std::string_view(text), {}, nullptr, nullptr, way);
     const qx::XMLIndex& index = parsed->index();
     const SourceMarkup markup(index);
     std::set<std::string> all;
     for (SourceMarkup::Number at = 0; at < index.entries().size(); ++at) {
-        const bool isRoot = markup.parent(at) == SourceMarkup::none;
+        const SourceMarkup::Number parent = markup.parent(at);
+        const bool isRoot = parent == SourceMarkup::none;
         if (isRoot && index[at].nodeKind() != qx::XMLNodeKind::element)
             continue; // around the root nothing is edited
+        if (!isRoot && qx::XMLIndex::isLayout(index[at], index[parent]))
+            continue;
         const SourceMarkup::Spot spot = markup[at];
         std::string line(index.name(index[at]).view());
         for (const auto place : {spot.begin, spot.insideBegin, spot.insideEnd, spot.end})
             line += " " + std::to_string(place);
-        all.insert(line + " in " + std::to_string(markup.parent(at)));
+        all.insert(line + " in " + (isRoot ? "none" : std::to_string(markup[parent].begin)));
     }
     return all;
 }

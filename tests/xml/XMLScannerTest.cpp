@@ -41,11 +41,11 @@ void print(const XMLNode& node, std::string& text) {
 }
 
 // The whole tree, or the error.
-std::string outcome(std::string_view bytes, const XMLParseOptions& options, XMLParser::Names* names,
+std::string outcome(std::string_view bytes, const XMLParseOptions& options, XMLParser::Kept* kept,
                     XMLParser::Way way = XMLParser::Way::fastest) {
     qx::Ref<qx::Error> error;
     const auto document =
-        qx::XMLDocumentContent::document(XMLParser::parseCopy(bytes, options, &error, names, way));
+        qx::XMLDocumentContent::document(XMLParser::parseCopy(bytes, options, &error, kept, way));
     if (!document)
         return std::to_string(error->line()) + ":" + std::to_string(error->column()) + " " +
                std::to_string(error->code()) + " " + error->localizedDescription().str();
@@ -59,7 +59,7 @@ std::string outcome(std::string_view bytes, const XMLParseOptions& options, XMLP
 // Held against each other with white space kept and dropped, and with low limits; also with the
 // names of all the documents before, whose limit is another from time to time.
 void expectSame(const std::string& document) {
-    static XMLParser::Names kept;
+    static XMLParser::Kept kept;
     for (const XMLParseOptions& options :
          {XMLParseOptions{}, XMLParseOptions{.keepWhiteSpace = true},
           XMLParseOptions{.maximumDepth = 3, .maximumTextSize = 9}}) {
@@ -87,7 +87,9 @@ TEST(XMLScanner, TakesWhatMostDocumentsHold) {
           "<a> \r <b/>\n\r\n</a>"s, "<a>&#13;&#xA;<b/>&#32;\n</a>"s, "<a x='1' p:x='2'/>"s,
           "<a xmlns=''><b xmlns='u'/></a>"s, "<a><?p  d ?><?q\n?><!-- - --></a>"s,
           "<\xC3\xA9 \xC3\xA9='\xEF\xBF\xBD'>\x7F</\xC3\xA9>"s, "<a>\n<!--x-->\n<b/> <c/>\n</a>"s,
-          "<a><b>\n x</b>\n \n<b>\n</b></a>"s}) {
+          "<a><b>\n x</b>\n \n<b>\n</b></a>"s, "<a>\n<b/>\n<c>\n<d/> </c></a>"s,
+          "<a>\n\t\t\t\t\t\t\t\t\t\n<b/></a>"s, "<a>\n<b/><![CDATA[ ]]></a>"s,
+          "<a>\n<b>t</b>\n<c>\n</c>&#32;</a>"s}) {
         EXPECT_TRUE(isScanned(document)) << document;
         expectSame(document);
     }
@@ -183,7 +185,7 @@ TEST(XMLScanner, AgreesOnChangedDocuments) {
 }
 
 TEST(XMLScanner, NamesThatAreKeptAreThoseOfEachDocument) {
-    XMLParser::Names kept;
+    XMLParser::Kept kept;
     const std::string longName(40, 'n');
     for (int round = 0; round < 3; ++round)
         for (const std::string& document :
@@ -191,13 +193,13 @@ TEST(XMLScanner, NamesThatAreKeptAreThoseOfEachDocument) {
               "<" + longName + " " + longName + "m='1'></" + longName + ">", "<b x='1' x='2'/>"s}) {
             EXPECT_EQ(outcome(document, {}, &kept),
                       outcome(document, {}, nullptr, XMLParser::Way::cParserOnly));
-            EXPECT_EQ(kept.has_value(), document[1] != 'b') << document; // which is faulty
+            EXPECT_EQ(kept.names.has_value(), document[1] != 'b') << document; // which is faulty
         }
     std::string many = "<a>";
     for (int i = 0; i < 200; ++i)
         many += "<e" + std::to_string(i) + "/>";
     outcome(many + "</a>", {}, &kept);
-    EXPECT_FALSE(kept) << "so many would be a burden for the next document";
+    EXPECT_FALSE(kept.names) << "so many would be a burden for the next document";
 }
 
 // scripts/conformance names the folder.
