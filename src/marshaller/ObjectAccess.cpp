@@ -137,8 +137,7 @@ bool ObjectAccess::mayKeepXML(const Object& object) {
         const bool isOne = key.isSameAs(keys[0]) || key.isSameAs(keys[1]) || key.isSameAs(keys[2]);
         return isOne || (!key.isInterned() && std::ranges::find(keys, key) != keys.end());
     };
-    return contents != nullptr &&
-           std::ranges::any_of(*contents, [&](const auto& entry) { return isKept(entry.key); });
+    return contents != nullptr && DictionaryFilling::hasKey(*contents, isKept);
 }
 
 // A class that lacks a key raises when it is read by a key that it does not take; so it is asked

@@ -98,7 +98,8 @@ private:
     };
 
     // UpdatePlan.cpp
-    // The uses of a field; of null, what was kept.
+    // The uses of an owner, by field; of one of its fields; of null, of what was kept.
+    std::span<const std::uint32_t> usesOf(std::uint32_t owner) const;
     std::span<const std::uint32_t> usesOf(std::uint32_t owner, const FieldPlan* field) const;
     void compareObject(Shown before, Shown after, std::uint32_t owner, const Context* parent,
                        std::size_t ordinal);
@@ -110,7 +111,7 @@ private:
                       std::size_t ordinal);
     void removeValue(std::uint32_t use, Shown field);
     void fail(Shown shown) { _failures.push_back(shown); }
-    Entry parentOf(Entry entry) const noexcept { return _source.markup.parent(entry); }
+    Entry parentOf(Entry entry) const { return _source.markup.parent(entry); }
     const ReadingTrace::Use& use(std::uint32_t number) const { return _source.read.uses()[number]; }
     bool areSame(Shown before, Shown after) const {
         return _source.before[before].hash == _source.after[after].hash;
@@ -200,7 +201,8 @@ private:
     EditList* _edits = &_all; // those of an item that moves are its own
     std::vector<Shown> _failures;
     std::vector<Shown> _rewritten;
-    std::vector<std::uint32_t> _uses;                 // by owner and field
+    // By owner: of those that were asked for.
+    mutable std::unordered_map<std::uint32_t, std::vector<std::uint32_t>> _uses;
     std::unordered_map<Shown, std::uint32_t> _owners; // of the objects that were compared
     // What is new in elements that hold nothing yet.
     struct Opening {
