@@ -85,16 +85,16 @@ std::vector<WritingTrace::Number> WritingTrace::shownValues(Number field) const 
 }
 
 String WritingTrace::keyPath(Number number) const {
+    std::vector<Number> around;
+    for (Number at = number; at != none; at = _shown[at].around)
+        around.push_back(at);
     std::string path;
-    for (Number at = number; at != none; at = _shown[at].around) {
-        const Shown& shown = _shown[at];
+    for (auto at = around.rbegin(); at != around.rend(); ++at) {
+        const Shown& shown = _shown[*at];
         if (shown.kind == Kind::field)
-            path = shown.field->key.string().str() +
-                   (path.empty() || path.front() == '[' ? "" : ".") + path;
-        const Number field = shown.kind == Kind::field ? none : shown.around;
-        if (field == none || !_shown[field].isList)
-            continue;
-        path = "[" + std::to_string(shown.count) + "]" + (path.empty() ? "" : ".") + path;
+            (path += path.empty() ? "" : ".") += shown.field->key.string().view();
+        else if (shown.around != none && _shown[shown.around].isList)
+            ((path += '[') += std::to_string(shown.count)) += ']';
     }
     return String(path);
 }

@@ -107,7 +107,9 @@ std::string_view textOfField(const WritingTrace& trace, WritingTrace::Number ite
 bool findKeys(const WritingTrace& trace, const std::vector<WritingTrace::Number>& values,
               std::size_t ordinal, std::vector<std::string_view>& keys) {
     std::unordered_set<std::string_view> seen;
+    seen.reserve(values.size());
     keys.clear();
+    keys.reserve(values.size());
     for (const WritingTrace::Number value : values) {
         const std::string_view text = textOfField(trace, value, ordinal);
         if (text.empty() || !seen.insert(text).second)
@@ -166,6 +168,8 @@ std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
 
 void UpdatePlan::arrangeList(const Context& context, const List& list, std::size_t ordinal) {
     std::vector<ListItem> before, now;
+    before.reserve(list.was.size());
+    now.reserve(list.is.size());
     for (const Shown value : list.was)
         before.push_back(itemOf(_source.before, value));
     for (const Shown value : list.is)

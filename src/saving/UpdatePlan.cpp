@@ -22,11 +22,17 @@ std::span<const std::uint32_t> UpdatePlan::usesOf(std::uint32_t owner) const {
     if (!isNew)
         return own;
     const auto& owners = _source.read.owners();
-    for (std::uint32_t at = owners[owner].firstUse; at < owners[owner].usesEnd;) {
-        if (use(at).owner == owner)
-            own.push_back(at);
-        at = use(at).made != none ? owners[use(at).made].usesEnd : at + 1;
-    }
+    const auto forEachOwn = [&](auto visit) {
+        for (std::uint32_t at = owners[owner].firstUse; at < owners[owner].usesEnd;) {
+            if (use(at).owner == owner)
+                visit(at);
+            at = use(at).made != none ? owners[use(at).made].usesEnd : at + 1;
+        }
+    };
+    std::size_t count = 0;
+    forEachOwn([&](std::uint32_t) { ++count; });
+    own.reserve(count);
+    forEachOwn([&](std::uint32_t number) { own.push_back(number); });
     const auto fieldOf = [&](std::uint32_t number) { return use(number).field; };
     if (!std::ranges::is_sorted(own, {}, fieldOf))
         std::ranges::stable_sort(own, {}, fieldOf);
