@@ -123,6 +123,21 @@ bool UpdatePlan::mayAddKept(Shown object, const std::string& text) {
     return _addsKept;
 }
 
+// Whether a field of the class may take a node of its name, and would take it from a new element.
+bool UpdatePlan::isNamedByField(const ClassPlan& plan, const Kept& kept) {
+    const String& name = kept.node->name();
+    const auto names = [&](const BindingPlan& binding) {
+        return binding.name == name || binding.bindTo == name || binding.location == name;
+    };
+    ExtendsWalk walk(plan);
+    do {
+        for (const FieldPlan& field : walk.current().fields)
+            if (!field.isContainer || std::ranges::any_of(field.bindings, names))
+                return true;
+    } while (walk.next());
+    return false;
+}
+
 // The object lists them by name, each name's in the order of the document.
 std::vector<UpdatePlan::Entry> UpdatePlan::entriesOfKept(const Context& context,
                                                          const std::vector<Kept>& kept) const {

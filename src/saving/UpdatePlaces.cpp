@@ -250,6 +250,10 @@ NewXML::Around UpdatePlan::around(Entry element, const std::optional<std::string
     NewXML::Around around{line, nullptr,
                           [this, element](const String& prefix, std::string_view URI) {
                               return isDeclared(element, prefix, URI);
+                          },
+                          [this](Shown object, const WritingTrace::Kept& kept) {
+                              return !isNamedByField(*_source.after.plan(object), kept) ||
+                                     mayAddKept(object, kept.text);
                           }};
     if (!_source.names)
         return around;

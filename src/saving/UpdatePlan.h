@@ -60,7 +60,8 @@ public:
     const std::vector<Shown>& failures() const noexcept { return _failures; }
     // The values whose element has lost what stood in it beside the text.
     const std::vector<Shown>& rewritten() const noexcept { return _rewritten; }
-    // The unknown XML that objects keep and the text lacks: the object, and the node's text.
+    // The unknown XML that objects keep and the text lacks, of new elements what a field might
+    // take: the object, and the node's text.
     using NewKept = std::vector<std::pair<Shown, std::string>>;
     bool addsKept() const noexcept { return _addsKept; }
     const NewKept& newKept() const noexcept { return _newKept; }
@@ -184,6 +185,7 @@ private:
     bool changeInTag(const Context& context, Entry entry, const WritingTrace::Kept* now);
     void addToTag(const Context& context, std::string_view name, const WritingTrace::Kept& kept);
     bool mayAddKept(Shown object, const std::string& text);
+    static bool isNamedByField(const ClassPlan& plan, const WritingTrace::Kept& kept);
     std::vector<Entry> entriesOfKept(const Context& context,
                                      const std::vector<WritingTrace::Kept>& kept) const;
 
