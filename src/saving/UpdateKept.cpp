@@ -120,7 +120,7 @@ void UpdatePlan::countDoubles(const ClassPlan& plan, const std::vector<Kept>& wa
 
 bool UpdatePlan::mayAddKept(Shown object, const std::string& text) {
     _newKept.emplace_back(object, text);
-    return _addsKept;
+    return _ways.addKept;
 }
 
 // Whether a field of the class may take a node of its name, and would take it from a new element.

@@ -6,12 +6,16 @@ namespace qx::detail {
 
 using Form = ReadingTrace::Form;
 
-UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept)
-    : _source(source), _anew(anew), _addsKept(addsKept),
+UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, Ways ways)
+    : _source(source), _anew(anew), _ways(ways),
       _comparesAll(source.after.declaresOtherThan(source.before)) {}
 
 void UpdatePlan::run() {
     compareObject(0, 0, 0, nullptr, 0);
+    if (findMoves()) {
+        startAgain();
+        compareObject(0, 0, 0, nullptr, 0);
+    }
     finishOpenings();
 }
 

@@ -9,6 +9,7 @@
 //
 //     UpdatePlan.cpp       objects and fields
 //     UpdateLists.cpp      collections
+//     UpdateMoves.cpp      items that go from one to another
 //     UpdateTexts.cpp      texts and attributes that are there
 //     UpdatePlaces.cpp     what is new: where, and how
 //     UpdateKept.cpp       unknown XML
@@ -24,6 +25,7 @@
 #include <memory>
 #include <set>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace qx::detail {
 
@@ -46,16 +48,23 @@ public:
     using Entry = XMLIndex::Number;
     static constexpr std::uint32_t none = UINT32_MAX;
 
-    // The objects of `anew`, numbers of the later writing, are written anew. An object that was
-    // saved before may keep what a field took once, and took no more when the text was read: back
-    // in the text it would be taken again. So there may be a plan that adds no unknown XML.
-    UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept = true);
+    // An object that was saved before may keep what a field took once, and took no more when the
+    // text was read: back in the text it would be taken again. So there may be a plan that adds no
+    // unknown XML. And one that prints what has moved from one list to another.
+    struct Ways {
+        bool addKept = true;
+        bool moveAcross = true;
+    };
+    // The objects of `anew`, numbers of the later writing, are written anew.
+    UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, Ways ways);
 
     void run();
     EditList& edits() noexcept { return *_edits; }
     const EditList& edits() const noexcept { return *_edits; }
     // Once they are arranged.
     void joinRemovals();
+    // Whether something has moved from one list to another.
+    bool hasMovedAcross() const noexcept { return !_moves.empty(); }
     // The objects and fields whose change could not be carried.
     const std::vector<Shown>& failures() const noexcept { return _failures; }
     // The values whose element has lost what stood in it beside the text.
@@ -63,7 +72,7 @@ public:
     // The unknown XML that objects keep and the text lacks, of new elements what a field might
     // take: the object, and the node's text.
     using NewKept = std::vector<std::pair<Shown, std::string>>;
-    bool addsKept() const noexcept { return _addsKept; }
+    bool addsKept() const noexcept { return _ways.addKept; }
     const NewKept& newKept() const noexcept { return _newKept; }
     // The nearest object around, itself included, that has an element to be written anew, and is
     // not the root; none where there is none.
@@ -132,8 +141,33 @@ private:
     void removeItems(const List& list, const ListMatching& matching);
     std::string moved(const Context& context, const List& list, std::size_t was, Shown is,
                       std::size_t ordinal);
-    std::string printed(const List& list, Shown item, Entry inside,
+    std::string newItem(const List& list, Shown item, Entry inside,
                         const std::optional<std::string>& line, Entry beside = none);
+    static const String* nameOfItems(const List& list);
+    std::string printed(const List& list, Shown item, Entry inside,
+                        const std::optional<std::string>& line, Entry beside);
+
+    // UpdateMoves.cpp
+    struct Gone {
+        Shown was;
+        std::uint32_t use;
+    };
+    struct Added {
+        Shown is;
+        Entry inside; // the element that it is added to
+        String name;  // of its own
+    };
+    struct Indent {
+        std::string_view old, now;
+    };
+    void noteGone(Shown was, std::uint32_t use);
+    void noteGoneInside(Shown object, std::uint32_t owner);
+    bool findMoves();
+    bool mayMove(const Gone& gone, const Added& added) const;
+    void startAgain();
+    std::string movedFrom(std::uint32_t use, const std::optional<std::string>& line);
+    void indentInside(Entry element, const Indent& indent, EditList& edits) const;
+    void indentAnew(SourceMarkup::Offset place, const Indent& indent, EditList& edits) const;
 
     // UpdateTexts.cpp
     void setAttribute(Entry attribute, Shown value);
@@ -195,7 +229,7 @@ private:
 
     const UpdateSource& _source;
     const std::set<Shown>& _anew;
-    const bool _addsKept;
+    const Ways _ways;
     // Whether objects have to be compared that show the same: they may declare something else.
     const bool _comparesAll;
     NewKept _newKept;
@@ -213,6 +247,10 @@ private:
         Shown shown;
     };
     std::map<Entry, Opening> _openings;
+    std::vector<Gone> _gone;
+    std::vector<Added> _added;
+    std::unordered_map<Shown, std::uint32_t> _moves; // items that are new, and what they were
+    std::unordered_set<std::uint32_t> _movedFrom;
     std::unique_ptr<OutputNames> _names;
 };
 
