@@ -3,6 +3,8 @@
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
+#include <cstring>
+
 namespace qx::detail {
 
 namespace {
@@ -23,14 +25,47 @@ void listAll(std::vector<WritingTrace::Kept>& all, const Value& kept, XMLNodeKin
             list(all, node, kind);
 }
 
+// Hashes of 64 bits, which stand for what they are made of: a product of 128 bits, folded, mixes
+// all of both.
+__extension__ using Product = unsigned __int128;
+constexpr std::uint64_t oneMix = 0x9E37'79B9'7F4A'7C15U, otherMix = 0xFF51'AFD7'ED55'8CCDU;
+
 std::uint64_t mixed(std::uint64_t hash, std::uint64_t more) noexcept {
-    hash ^= more + 0x9E37'79B9'7F4A'7C15U + (hash << 12U) + (hash >> 4U);
-    hash *= 0xFF51'AFD7'ED55'8CCDU;
-    return hash ^ (hash >> 33U);
+    const Product product = Product(hash ^ oneMix) * (more ^ otherMix);
+    return static_cast<std::uint64_t>(product) ^ static_cast<std::uint64_t>(product >> 64U);
 }
 
+template <class Word>
+std::uint64_t wordAt(const char* place) noexcept {
+    Word word;
+    std::memcpy(&word, place, sizeof word);
+    return word;
+}
+
+// Another one in each process, so that nobody can make texts whose hashes meet.
+std::uint64_t newSeed() noexcept {
+    return std::uint64_t{String::hashOf("one")} << 32U | String::hashOf("other");
+}
+
+// Two words of eight bytes at a time; the last two may overlap what came before.
 std::uint64_t hashOfText(std::string_view text) noexcept {
-    return std::hash<std::string_view>()(text);
+    static const std::uint64_t seed = newSeed();
+    using Long = std::uint64_t;
+    using Short = std::uint32_t;
+    const char* at = text.data();
+    const char* const end = at + text.size();
+    std::uint64_t hash = seed ^ text.size();
+    for (; end - at > 16; at += 16)
+        hash = mixed(wordAt<Long>(at) ^ hash, wordAt<Long>(at + 8));
+    const auto left = static_cast<std::size_t>(end - at);
+    if (left >= 8)
+        return mixed(wordAt<Long>(at) ^ hash, wordAt<Long>(end - 8));
+    if (left >= 4)
+        return mixed(wordAt<Short>(at) ^ hash, wordAt<Short>(end - 4));
+    std::uint64_t few = 0;
+    for (; at != end; ++at)
+        few = few << 8U | static_cast<unsigned char>(*at);
+    return mixed(few ^ hash, 0);
 }
 
 } // namespace
@@ -50,21 +85,21 @@ std::vector<WritingTrace::Number> WritingTrace::shownValues(Number field) const 
 }
 
 String WritingTrace::keyPath(Number number) const {
+    std::vector<Number> around;
+    for (Number at = number; at != none; at = _shown[at].around)
+        around.push_back(at);
     std::string path;
-    for (Number at = number; at != none; at = _shown[at].around) {
-        const Shown& shown = _shown[at];
+    for (auto at = around.rbegin(); at != around.rend(); ++at) {
+        const Shown& shown = _shown[*at];
         if (shown.kind == Kind::field)
-            path = shown.field->key.string().str() +
-                   (path.empty() || path.front() == '[' ? "" : ".") + path;
-        const Number field = shown.kind == Kind::field ? none : shown.around;
-        if (field == none || !_shown[field].isList)
-            continue;
-        path = "[" + std::to_string(shown.count) + "]" + (path.empty() ? "" : ".") + path;
+            (path += path.empty() ? "" : ".") += shown.field->key.string().view();
+        else if (shown.around != none && _shown[shown.around].isList)
+            ((path += '[') += std::to_string(shown.count)) += ']';
     }
     return String(path);
 }
 
-std::uint64_t WritingTrace::hashOf(const Shown& shown) const noexcept {
+inline std::uint64_t WritingTrace::hashOf(const Shown& shown) const noexcept {
     // An empty list shows no more than none.
     const bool isList = shown.isList && shown.count != 0;
     const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (isList ? 16 : 0);
@@ -74,7 +109,7 @@ std::uint64_t WritingTrace::hashOf(const Shown& shown) const noexcept {
                : mixed(own, shown.hash);
 }
 
-void WritingTrace::mixInto(Number around, const Shown& shown) {
+inline void WritingTrace::mixInto(Number around, const Shown& shown) {
     if (around == none)
         _hash = shown.hash;
     else if (!shown.isHidden)
@@ -104,11 +139,14 @@ std::uint64_t WritingTrace::KeptList::hash() const noexcept {
     return hash;
 }
 
-WritingTrace::Shown& WritingTrace::add(Kind kind) {
-    const Number around = _open.empty() ? none : _open.back();
+inline WritingTrace::Shown& WritingTrace::add(Kind kind) {
+    Number around = none;
     std::uint32_t count = 0;
-    if (around != none && _shown[around].kind == Kind::field)
-        count = _shown[around].count++;
+    if (!_open.empty()) {
+        around = _open.back();
+        if (Shown& outer = _shown[around]; outer.kind == Kind::field)
+            count = outer.count++;
+    }
     _shown.push_back({.kind = kind,
                       .next = size() + 1,
                       .around = around,
@@ -130,8 +168,15 @@ bool isAttribute(const WritingTrace::Shown& field) {
 
 } // namespace
 
+// Mostly known of the object that is open.
+inline void WritingTrace::noteContent() {
+    const Shown& open = _shown[_open.back()];
+    if (open.kind != Kind::field || !_shown[open.around].hasContent)
+        noteContentAround();
+}
+
 // Objects that stand in one element are open one in the other.
-void WritingTrace::noteContent() {
+void WritingTrace::noteContentAround() {
     const XMLDraft::Element* element = nullptr;
     for (auto at = _open.rbegin(); at != _open.rend(); ++at) {
         Shown& shown = _shown[*at];
@@ -201,7 +246,7 @@ void WritingTrace::hold(const Value& value) {
 }
 
 void WritingTrace::addText(std::string_view text, bool isHidden) {
-    const std::uint64_t hash = mixed(1, hashOfText(text));
+    const std::uint64_t hash = hashOfText(text);
     const Number open = _open.back();
     if (isHidden) {
         _hidesSome = true;

@@ -157,6 +157,7 @@ private:
     Shown& add(Kind kind);
     // Marks that more than attributes stands in the element that is open.
     void noteContent();
+    void noteContentAround();
     void mixInto(Number around, const Shown& shown);
     // With `hash` of what is inside.
     std::uint64_t hashOf(const Shown& shown) const noexcept;

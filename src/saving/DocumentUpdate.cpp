@@ -28,19 +28,24 @@ Result<QXXMLUpdate> DocumentUpdate::run() {
         return unchanged();
     prepareWriter();
     Ref<Error> why;
+    bool mayMoveAcross = true;
     for (int attempt = 0; attempt < mostAttempts; ++attempt) {
         QXXMLUpdate update;
-        UpdatePlan plan(*_basis, _anew);
+        UpdatePlan plan(*_basis, _anew, {.addKept = true, .moveAcross = mayMoveAcross});
         Obstacle obstacle;
         if (carry(plan, update, obstacle, &error))
             return update;
         if (error)
             return error;
+        if (plan.hasMovedAcross()) {
+            mayMoveAcross = false;
+            continue;
+        }
         if (carryLess(plan, update, &error))
             return update;
         if (error)
             return error;
-        why = attempt == 0 ? std::move(obstacle.why) : why;
+        why = !why ? std::move(obstacle.why) : why;
         if (!writeAnew(plan, obstacle.shown))
             break;
     }
@@ -52,7 +57,7 @@ bool DocumentUpdate::carryLess(const UpdatePlan& plan, QXXMLUpdate& update, Ref<
     if (plan.newKept().empty() || _marshaller->keepsExactly())
         return false;
     update = {};
-    UpdatePlan less(*_basis, _anew, false);
+    UpdatePlan less(*_basis, _anew, {.addKept = false, .moveAcross = false});
     Obstacle obstacle;
     if (!carry(less, update, obstacle, error))
         return false;

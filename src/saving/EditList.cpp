@@ -6,9 +6,11 @@
 namespace qx::detail {
 
 const SourceEdit* EditList::arrange() {
-    std::stable_sort(_edits.begin(), _edits.end(), [](const SourceEdit& a, const SourceEdit& b) {
+    const auto stands = [](const SourceEdit& a, const SourceEdit& b) {
         return std::pair(a.begin, a.begin != a.end) < std::pair(b.begin, b.begin != b.end);
-    });
+    };
+    if (!std::is_sorted(_edits.begin(), _edits.end(), stands))
+        std::stable_sort(_edits.begin(), _edits.end(), stands);
     const auto same = [](const SourceEdit& a, const SourceEdit& b) {
         return a.begin == b.begin && a.end == b.end && a.begin != a.end && a.text == b.text;
     };

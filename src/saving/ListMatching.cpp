@@ -85,6 +85,7 @@ private:
             std::size_t before = 0, now = 0, place = 0;
         };
         std::unordered_map<std::uint64_t, Count> counts;
+        counts.reserve(part.beforeEnd - part.before);
         for (std::size_t i = part.before; i < part.beforeEnd; ++i) {
             Count& count = counts[_before[i].hash];
             ++count.before;

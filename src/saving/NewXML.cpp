@@ -177,6 +177,12 @@ void NewXML::append(const XMLDraft::Node& node, const String* name, const Around
         around.names->leave();
 }
 
+bool NewXML::mayPrint(WritingTrace::Number object, const WritingTrace::Kept& kept,
+                      const Around& around) const {
+    return !isTaken(_shown.plan(object), kept.text) &&
+           (!around.mayKeep || around.mayKeep(object, kept));
+}
+
 void NewXML::appendAttributes(const XMLDraft::Element& element, const Around& around,
                               std::string& output) {
     std::unordered_set<std::string> names;
@@ -193,8 +199,7 @@ void NewXML::appendAttributes(const XMLDraft::Element& element, const Around& ar
         return;
     for (const WritingTrace::Number object : objects->second)
         for (const auto& kept : _shown.keptOf(object)->attributes)
-            if (!isTaken(_shown.plan(object), kept.text) &&
-                names.insert(kept.node->name().str()).second)
+            if (mayPrint(object, kept, around) && names.insert(kept.node->name().str()).second)
                 output += attribute(kept.node->name().view(), kept.node->stringValue().view());
 }
 
@@ -221,7 +226,7 @@ bool NewXML::appendContent(const XMLDraft::Element& element, const Around& aroun
         return isOnLines;
     for (const WritingTrace::Number object : objects->second)
         for (const auto& kept : _shown.keptOf(object)->children)
-            if (!isTaken(_shown.plan(object), kept.text)) {
+            if (mayPrint(object, kept, around)) {
                 startLine();
                 output += markup(kept.text);
             }

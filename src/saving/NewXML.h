@@ -36,12 +36,13 @@ public:
     std::string markup(std::string_view text) const { return escaped(text, {}, 0); }
 
     // What stands around a new element: its line's start, null for one without lines, the names
-    // of the mapping as they are in force there, null where they are written as they are, and
-    // whether a namespace is declared there.
+    // of the mapping as they are in force there, null where they are written as they are, whether
+    // a namespace is declared there, and which unknown XML of an object is printed with it.
     struct Around {
         std::optional<std::string> line;
         OutputNames* names = nullptr;
         std::function<bool(const String& prefix, std::string_view URI)> isDeclared;
+        std::function<bool(WritingTrace::Number object, const WritingTrace::Kept& kept)> mayKeep;
         bool isOnOneLine = false; // all that is inside the element
     };
     // `name` takes the place of the element's own, where it is given.
@@ -75,6 +76,8 @@ private:
     }
     void append(const XMLDraft::Node& node, const String* name, const Around& around,
                 std::string& output);
+    bool mayPrint(WritingTrace::Number object, const WritingTrace::Kept& kept,
+                  const Around& around) const;
     void appendAttributes(const XMLDraft::Element& element, const Around& around,
                           std::string& output);
     bool appendContent(const XMLDraft::Element& element, const Around& around, std::string& output);

@@ -18,37 +18,44 @@ SourceLayout::SourceLayout(const XMLIndex& index, const SourceMarkup& markup)
     const std::string_view text = markup.text();
     if (const std::size_t end = text.find_first_of("\r\n"); end != npos)
         _newline = text.substr(end, text.substr(end).starts_with("\r\n") ? 2 : 1);
+}
+
+SourceLayout::Habits SourceLayout::findHabits() const {
+    Habits found;
+    const std::string_view text = _markup.text();
     bool hasQuote = false, hasEmpty = false;
     Number root = UINT32_MAX;
-    for (Number at = 0; at < index.entries().size() && !(hasQuote && hasEmpty); ++at) {
-        const XMLNodeKind kind = index[at].nodeKind();
+    for (Number at = 0; at < _index.entries().size() && !(hasQuote && hasEmpty); ++at) {
+        const XMLNodeKind kind = _index[at].nodeKind();
         const bool isElement = kind == XMLNodeKind::element;
         if (isElement && root == UINT32_MAX)
             root = at;
-        const bool mayShow = isElement ? !hasEmpty && index.firstChild(at) == index.contentEnd(at)
+        const bool mayShow = isElement ? !hasEmpty && _index.firstChild(at) == _index.contentEnd(at)
                                        : !hasQuote && kind == XMLNodeKind::attribute;
-        const SourceMarkup::Spot spot = mayShow ? markup[at] : SourceMarkup::Spot();
+        const SourceMarkup::Spot spot = mayShow ? _markup[at] : SourceMarkup::Spot();
         if (!spot.isPlaced())
             continue;
         if (isElement && spot.insideBegin == spot.insideEnd) {
             hasEmpty = true;
             if (!spot.isEmptyTag())
-                _emptyTag = {};
+                found.emptyTag = {};
             else if (isBlank(text[spot.end - 3]))
-                _emptyTag = " />";
+                found.emptyTag = " />";
         } else if (!isElement) {
             hasQuote = true;
-            _quote = text[spot.end - 1];
+            found.quote = text[spot.end - 1];
         }
     }
-    findUnit(root);
+    if (const auto unit = findUnit(root))
+        found.unit = *unit;
+    return found;
 }
 
 // Of the first element that begins a line inside another that does.
-void SourceLayout::findUnit(Number root) {
+std::optional<std::string_view> SourceLayout::findUnit(Number root) const {
     const auto outer = root != UINT32_MAX ? lineStart(_markup[root].begin) : std::nullopt;
     if (!outer)
-        return;
+        return std::nullopt;
     const std::size_t outside =
         outer->size() - std::min(outer->find_first_of(" \t"), outer->size());
     for (Number at = _index.firstChild(root); at < _index.contentEnd(root);
@@ -59,9 +66,9 @@ void SourceLayout::findUnit(Number root) {
         const std::size_t blanks = inner ? std::min(inner->find_first_of(" \t"), inner->size()) : 0;
         if (!inner || inner->size() - blanks < outside)
             continue;
-        _unit = inner->substr(blanks + outside);
-        return;
+        return inner->substr(blanks + outside);
     }
+    return std::nullopt;
 }
 
 std::optional<std::string_view> SourceLayout::lineStart(Offset place) const {
@@ -125,7 +132,7 @@ std::optional<std::string> SourceLayout::lineStartInside(Number element) const {
     if (_markup.text().find_first_of("\r\n") == npos)
         return std::nullopt;
     const bool hasBreak = !outer->empty() && isBreak(outer->front());
-    return std::string(hasBreak ? "" : _newline) + std::string(*outer) + _unit;
+    return std::string(hasBreak ? "" : _newline) + std::string(*outer) + unit();
 }
 
 SourceLayout::Offset SourceLayout::withComments(Offset begin) const {

@@ -39,23 +39,34 @@ public:
     std::pair<Offset, Offset> region(Number entry, Offset begin) const;
 
     // The indentation of one level.
-    const std::string& unit() const noexcept { return _unit; }
-    char quote() const noexcept { return _quote; }
+    const std::string& unit() const { return habits().unit; }
+    char quote() const { return habits().quote; }
     std::string_view newline() const noexcept { return _newline; }
     // "/>", " />", or nothing where empty elements have an end tag.
-    std::string_view emptyTag() const noexcept { return _emptyTag; }
+    std::string_view emptyTag() const { return habits().emptyTag; }
 
 private:
-    void findUnit(Number root);
+    // What is found out when something new is to be laid out.
+    struct Habits {
+        std::string unit = "    ";
+        char quote = '"';
+        std::string_view emptyTag = "/>";
+    };
+
+    const Habits& habits() const {
+        if (!_habits)
+            _habits = findHabits();
+        return *_habits;
+    }
+    Habits findHabits() const;
+    std::optional<std::string_view> findUnit(Number root) const;
     bool hasInlineText(Number element) const;
 
     const XMLIndex& _index;
     const SourceMarkup& _markup;
     mutable std::unordered_map<Number, bool> _inline, _onOneLine; // what was asked for
+    mutable std::optional<Habits> _habits;
     std::string_view _newline = "\n";
-    std::string _unit = "    ";
-    char _quote = '"';
-    std::string_view _emptyTag = "/>";
 };
 
 } // namespace qx::detail

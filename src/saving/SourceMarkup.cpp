@@ -55,15 +55,14 @@ SourceMarkup::Number rootOf(const XMLIndex& index) {
 
 } // namespace
 
-SourceMarkup::SourceMarkup(const XMLIndex& index)
-    : _index(index), _parents(index.entries().size(), none) {
-    findParents();
+SourceMarkup::SourceMarkup(const XMLIndex& index) : _index(index) {
+    const std::size_t size = index.entries().size();
     const Number root = rootOf(index);
     // The C parser tells where an element begins, and no more.
-    _isScanned = root < _parents.size() && index[root].begin < index[root].end;
+    _isScanned = root < size && index[root].begin < index[root].end;
     if (_isScanned)
         return;
-    _spots.resize(_parents.size());
+    _spots.resize(size);
     tokenise();
     place();
     _tokens = {};
@@ -96,7 +95,8 @@ SourceMarkup::Spot SourceMarkup::scannedElement(Number element) const noexcept {
             static_cast<Offset>(text().rfind('<', found.end - 1))};
 }
 
-void SourceMarkup::findParents() {
+void SourceMarkup::findParents() const {
+    _parents.resize(_index.entries().size(), none);
     std::vector<Number> open;
     for (Number at = 0; at < _parents.size(); ++at) {
         while (!open.empty() && _index[open.back()].next <= at)

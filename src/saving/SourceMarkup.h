@@ -42,7 +42,11 @@ public:
         return _isScanned ? scannedSpot(entry) : _spots[entry];
     }
     // The element that an entry stands in; none of the root.
-    Number parent(Number entry) const noexcept { return _parents[entry]; }
+    Number parent(Number entry) const {
+        if (_parents.empty())
+            findParents();
+        return _parents[entry];
+    }
     std::string_view raw(Number entry) const noexcept {
         const Spot spot = (*this)[entry];
         return text().substr(spot.begin, spot.size());
@@ -63,7 +67,7 @@ private:
 
     Spot scannedSpot(Number entry) const noexcept;
     Spot scannedElement(Number element) const noexcept;
-    void findParents();
+    void findParents() const;
     void tokenise();
     std::size_t skipProlog() const;
     std::size_t startTag(std::size_t at);
@@ -75,8 +79,8 @@ private:
 
     const XMLIndex& _index;
     bool _isScanned = false;
-    std::vector<Spot> _spots; // of an index that the C parser filled
-    std::vector<Number> _parents;
+    std::vector<Spot> _spots;             // of an index that the C parser filled
+    mutable std::vector<Number> _parents; // once they are asked for
     std::vector<Token> _tokens;
     std::vector<Attribute> _attributes;
     std::vector<std::uint32_t> _open; // tokens of elements

@@ -120,7 +120,22 @@ void UpdatePlan::countDoubles(const ClassPlan& plan, const std::vector<Kept>& wa
 
 bool UpdatePlan::mayAddKept(Shown object, const std::string& text) {
     _newKept.emplace_back(object, text);
-    return _addsKept;
+    return _ways.addKept;
+}
+
+// Whether a field of the class may take a node of its name, and would take it from a new element.
+bool UpdatePlan::isNamedByField(const ClassPlan& plan, const Kept& kept) {
+    const String& name = kept.node->name();
+    const auto names = [&](const BindingPlan& binding) {
+        return binding.name == name || binding.bindTo == name || binding.location == name;
+    };
+    ExtendsWalk walk(plan);
+    do {
+        for (const FieldPlan& field : walk.current().fields)
+            if (!field.isContainer || std::ranges::any_of(field.bindings, names))
+                return true;
+    } while (walk.next());
+    return false;
 }
 
 // The object lists them by name, each name's in the order of the document.

@@ -107,7 +107,9 @@ std::string_view textOfField(const WritingTrace& trace, WritingTrace::Number ite
 bool findKeys(const WritingTrace& trace, const std::vector<WritingTrace::Number>& values,
               std::size_t ordinal, std::vector<std::string_view>& keys) {
     std::unordered_set<std::string_view> seen;
+    seen.reserve(values.size());
     keys.clear();
+    keys.reserve(values.size());
     for (const WritingTrace::Number value : values) {
         const std::string_view text = textOfField(trace, value, ordinal);
         if (text.empty() || !seen.insert(text).second)
@@ -166,6 +168,8 @@ std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
 
 void UpdatePlan::arrangeList(const Context& context, const List& list, std::size_t ordinal) {
     std::vector<ListItem> before, now;
+    before.reserve(list.was.size());
+    now.reserve(list.is.size());
     for (const Shown value : list.was)
         before.push_back(itemOf(_source.before, value));
     for (const Shown value : list.is)
@@ -197,7 +201,7 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
         const std::string text =
             was != ListMatching::none
                 ? moved(context, list, was, list.is[i], ordinal)
-                : printed(list, list.is[i], parentOf(beside), place.line, beside);
+                : newItem(list, list.is[i], parentOf(beside), place.line, beside);
         insertChild(text, place, list.is[i]);
     }
     removeItems(list, matching);
@@ -216,7 +220,10 @@ void UpdatePlan::removeItems(const List& list, const ListMatching& matching) {
             continue;
         if (!_source.markup[entry].isPlaced() || parentOf(entry) == none)
             return fail(list.field);
-        const auto [begin, end] = regionOf(entry, fates[i] == Fate::moved);
+        if (fates[i] == Fate::gone)
+            noteGone(list.was[i], list.uses[i]);
+        const bool isMoved = fates[i] == Fate::moved || _movedFrom.contains(list.uses[i]);
+        const auto [begin, end] = regionOf(entry, isMoved);
         _edits->add({begin, end, {}, list.field, _source.before.keyPath(list.was[i])});
     }
 }
@@ -245,6 +252,27 @@ std::string UpdatePlan::moved(const Context& context, const List& list, std::siz
     return own.applied(_source.markup.text(), begin, spot.end);
 }
 
+// With the text that it had in another list, or printed.
+std::string UpdatePlan::newItem(const List& list, Shown item, Entry inside,
+                                const std::optional<std::string>& line, Entry beside) {
+    if (const auto move = _moves.find(item); move != _moves.end())
+        return movedFrom(move->second, line);
+    if (_ways.moveAcross && !isText(item) && !_anew.contains(item)) {
+        const String* const bindTo = nameOfItems(list);
+        _added.push_back({item, inside, bindTo ? *bindTo : *_source.after.element(item)->name});
+    }
+    return printed(list, item, inside, line, beside);
+}
+
+// The bind name by which the others were read, where it is not the first.
+const String* UpdatePlan::nameOfItems(const List& list) {
+    const FieldPlan& plan = *list.plan;
+    const bool isNamed = plan.hasType() && list.binding != 0 &&
+                         list.binding < plan.bindings.size() &&
+                         !plan.bindings[list.binding].bindTo.isEmpty();
+    return isNamed ? &plan.bindings[list.binding].bindTo : nullptr;
+}
+
 // Under the name by which the others were read, on one line if the item beside it is.
 std::string UpdatePlan::printed(const List& list, Shown item, Entry inside,
                                 const std::optional<std::string>& line, Entry beside) {
@@ -256,9 +284,7 @@ std::string UpdatePlan::printed(const List& list, Shown item, Entry inside,
     if (isText(item))
         return _source.writer.element(binding != nullptr ? binding->name : plan.xmlName(),
                                       _source.after.text(item), around);
-    const bool isNamed = binding != nullptr && list.binding != 0 && !binding->bindTo.isEmpty();
-    return _source.writer.element(*_source.after.element(item),
-                                  isNamed ? &binding->bindTo : nullptr, around);
+    return _source.writer.element(*_source.after.element(item), nameOfItems(list), around);
 }
 
 // The first items: in the wrapper that is there, or in a new one.
@@ -272,7 +298,7 @@ void UpdatePlan::fillList(const Context& context, const List& list, std::size_t 
     const Entry inside = isNew ? context.entry : list.wrapper;
     if (!isNew || !isWrapped) {
         for (const Shown item : list.is)
-            insertChild(printed(list, item, inside, place.line), place, item);
+            insertChild(newItem(list, item, inside, place.line), place, item);
         return;
     }
     std::optional<std::string> line = place.line;
@@ -280,7 +306,7 @@ void UpdatePlan::fillList(const Context& context, const List& list, std::size_t 
         *line += _source.layout.unit();
     std::string items;
     for (const Shown item : list.is)
-        items += (line ? *line : "") + printed(list, item, inside, line);
+        items += (line ? *line : "") + newItem(list, item, inside, line);
     const String& name = !plan.location().isEmpty() ? plan.location() : plan.bindTo();
     insertChild(_source.writer.wrapper(name, items, around(inside, place.line)), place, list.field);
 }
@@ -295,6 +321,8 @@ bool UpdatePlan::removeWrapper(const List& list) {
     if (children != list.was.size())
         return false;
     removeElement(list.wrapper, list.field);
+    for (std::size_t i = 0; i < list.was.size(); ++i)
+        noteGone(list.was[i], list.uses[i]);
     return true;
 }
 

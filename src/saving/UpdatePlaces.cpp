@@ -235,13 +235,9 @@ UpdatePlan::Range UpdatePlan::rangeOf(const Context& context, Shown field) const
 
 UpdatePlan::Range UpdatePlan::rangeOfOwner(std::uint32_t owner, Entry element) const {
     Range range;
-    const auto& uses = _source.read.uses();
-    auto number =
-        std::lower_bound(_uses.begin(), _uses.end(), owner,
-                         [&](std::uint32_t i, std::uint32_t o) { return uses[i].owner < o; });
-    for (; number != _uses.end() && uses[*number].owner == owner; ++number) {
-        const Entry entry = uses[*number].entry;
-        if (uses[*number].field == nullptr || parentOf(entry) != element ||
+    for (const std::uint32_t number : usesOf(owner)) {
+        const Entry entry = use(number).entry;
+        if (use(number).field == nullptr || parentOf(entry) != element ||
             _source.index[entry].nodeKind() != XMLNodeKind::element)
             continue;
         range.first = std::min(range.first, entry);
@@ -254,6 +250,10 @@ NewXML::Around UpdatePlan::around(Entry element, const std::optional<std::string
     NewXML::Around around{line, nullptr,
                           [this, element](const String& prefix, std::string_view URI) {
                               return isDeclared(element, prefix, URI);
+                          },
+                          [this](Shown object, const WritingTrace::Kept& kept) {
+                              return !isNamedByField(*_source.after.plan(object), kept) ||
+                                     mayAddKept(object, kept.text);
                           }};
     if (!_source.names)
         return around;

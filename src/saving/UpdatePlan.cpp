@@ -1,53 +1,53 @@
 #include "saving/UpdatePlan.h"
 
 #include <algorithm>
-#include <numeric>
 
 namespace qx::detail {
 
 using Form = ReadingTrace::Form;
 
-UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept)
-    : _source(source), _anew(anew), _addsKept(addsKept),
-      _comparesAll(source.after.declaresOtherThan(source.before)) {
-    const auto& uses = source.read.uses();
-    const auto fieldOf = [&](std::uint32_t use) { return uses[use].field; };
-    // By owner in one pass, then each owner's by field.
-    std::vector<std::uint32_t> ends(source.read.owners().size() + 1);
-    for (const ReadingTrace::Use& use : uses)
-        ++ends[use.owner + 1];
-    std::partial_sum(ends.begin(), ends.end(), ends.begin());
-    _uses.resize(uses.size());
-    for (std::uint32_t i = 0; i < uses.size(); ++i)
-        _uses[ends[uses[i].owner]++] = i;
-    std::size_t begin = 0;
-    for (const std::uint32_t end : std::span(ends).first(ends.size() - 1)) {
-        const auto own = std::span(_uses).subspan(begin, end - begin);
-        if (!std::ranges::is_sorted(own, {}, fieldOf))
-            std::ranges::stable_sort(own, {}, fieldOf);
-        begin = end;
-    }
-}
+UpdatePlan::UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, Ways ways)
+    : _source(source), _anew(anew), _ways(ways),
+      _comparesAll(source.after.declaresOtherThan(source.before)) {}
 
 void UpdatePlan::run() {
     compareObject(0, 0, 0, nullptr, 0);
+    if (findMoves()) {
+        startAgain();
+        compareObject(0, 0, 0, nullptr, 0);
+    }
     finishOpenings();
+}
+
+// Those of the objects inside stand among its own.
+std::span<const std::uint32_t> UpdatePlan::usesOf(std::uint32_t owner) const {
+    const auto [known, isNew] = _uses.try_emplace(owner);
+    std::vector<std::uint32_t>& own = known->second;
+    if (!isNew)
+        return own;
+    const auto& owners = _source.read.owners();
+    const auto forEachOwn = [&](auto visit) {
+        for (std::uint32_t at = owners[owner].firstUse; at < owners[owner].usesEnd;) {
+            if (use(at).owner == owner)
+                visit(at);
+            at = use(at).made != none ? owners[use(at).made].usesEnd : at + 1;
+        }
+    };
+    std::size_t count = 0;
+    forEachOwn([&](std::uint32_t) { ++count; });
+    own.reserve(count);
+    forEachOwn([&](std::uint32_t number) { own.push_back(number); });
+    const auto fieldOf = [&](std::uint32_t number) { return use(number).field; };
+    if (!std::ranges::is_sorted(own, {}, fieldOf))
+        std::ranges::stable_sort(own, {}, fieldOf);
+    return own;
 }
 
 std::span<const std::uint32_t> UpdatePlan::usesOf(std::uint32_t owner,
                                                   const FieldPlan* field) const {
-    const auto& uses = _source.read.uses();
-    const std::pair<std::uint32_t, const FieldPlan*> wanted(owner, field);
-    const auto keyOf = [&](std::uint32_t number) {
-        return std::pair(uses[number].owner, uses[number].field);
-    };
-    const auto first = std::lower_bound(
-        _uses.begin(), _uses.end(), wanted,
-        [&](std::uint32_t number, const auto& key) { return keyOf(number) < key; });
-    auto last = first;
-    while (last != _uses.end() && keyOf(*last) == wanted)
-        ++last;
-    return {first, last};
+    const auto found = std::ranges::equal_range(
+        usesOf(owner), field, {}, [&](std::uint32_t number) { return use(number).field; });
+    return {found.begin(), found.end()};
 }
 
 UpdatePlan::Shown UpdatePlan::objectAround(Shown shown) const {

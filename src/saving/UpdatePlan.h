@@ -9,6 +9,7 @@
 //
 //     UpdatePlan.cpp       objects and fields
 //     UpdateLists.cpp      collections
+//     UpdateMoves.cpp      items that go from one to another
 //     UpdateTexts.cpp      texts and attributes that are there
 //     UpdatePlaces.cpp     what is new: where, and how
 //     UpdateKept.cpp       unknown XML
@@ -24,6 +25,7 @@
 #include <memory>
 #include <set>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace qx::detail {
 
@@ -46,23 +48,31 @@ public:
     using Entry = XMLIndex::Number;
     static constexpr std::uint32_t none = UINT32_MAX;
 
-    // The objects of `anew`, numbers of the later writing, are written anew. An object that was
-    // saved before may keep what a field took once, and took no more when the text was read: back
-    // in the text it would be taken again. So there may be a plan that adds no unknown XML.
-    UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, bool addsKept = true);
+    // An object that was saved before may keep what a field took once, and took no more when the
+    // text was read: back in the text it would be taken again. So there may be a plan that adds no
+    // unknown XML. And one that prints what has moved from one list to another.
+    struct Ways {
+        bool addKept = true;
+        bool moveAcross = true;
+    };
+    // The objects of `anew`, numbers of the later writing, are written anew.
+    UpdatePlan(const UpdateSource& source, const std::set<Shown>& anew, Ways ways);
 
     void run();
     EditList& edits() noexcept { return *_edits; }
     const EditList& edits() const noexcept { return *_edits; }
     // Once they are arranged.
     void joinRemovals();
+    // Whether something has moved from one list to another.
+    bool hasMovedAcross() const noexcept { return !_moves.empty(); }
     // The objects and fields whose change could not be carried.
     const std::vector<Shown>& failures() const noexcept { return _failures; }
     // The values whose element has lost what stood in it beside the text.
     const std::vector<Shown>& rewritten() const noexcept { return _rewritten; }
-    // The unknown XML that objects keep and the text lacks: the object, and the node's text.
+    // The unknown XML that objects keep and the text lacks, of new elements what a field might
+    // take: the object, and the node's text.
     using NewKept = std::vector<std::pair<Shown, std::string>>;
-    bool addsKept() const noexcept { return _addsKept; }
+    bool addsKept() const noexcept { return _ways.addKept; }
     const NewKept& newKept() const noexcept { return _newKept; }
     // The nearest object around, itself included, that has an element to be written anew, and is
     // not the root; none where there is none.
@@ -98,7 +108,8 @@ private:
     };
 
     // UpdatePlan.cpp
-    // The uses of a field; of null, what was kept.
+    // The uses of an owner, by field; of one of its fields; of null, of what was kept.
+    std::span<const std::uint32_t> usesOf(std::uint32_t owner) const;
     std::span<const std::uint32_t> usesOf(std::uint32_t owner, const FieldPlan* field) const;
     void compareObject(Shown before, Shown after, std::uint32_t owner, const Context* parent,
                        std::size_t ordinal);
@@ -110,7 +121,7 @@ private:
                       std::size_t ordinal);
     void removeValue(std::uint32_t use, Shown field);
     void fail(Shown shown) { _failures.push_back(shown); }
-    Entry parentOf(Entry entry) const noexcept { return _source.markup.parent(entry); }
+    Entry parentOf(Entry entry) const { return _source.markup.parent(entry); }
     const ReadingTrace::Use& use(std::uint32_t number) const { return _source.read.uses()[number]; }
     bool areSame(Shown before, Shown after) const {
         return _source.before[before].hash == _source.after[after].hash;
@@ -130,8 +141,33 @@ private:
     void removeItems(const List& list, const ListMatching& matching);
     std::string moved(const Context& context, const List& list, std::size_t was, Shown is,
                       std::size_t ordinal);
-    std::string printed(const List& list, Shown item, Entry inside,
+    std::string newItem(const List& list, Shown item, Entry inside,
                         const std::optional<std::string>& line, Entry beside = none);
+    static const String* nameOfItems(const List& list);
+    std::string printed(const List& list, Shown item, Entry inside,
+                        const std::optional<std::string>& line, Entry beside);
+
+    // UpdateMoves.cpp
+    struct Gone {
+        Shown was;
+        std::uint32_t use;
+    };
+    struct Added {
+        Shown is;
+        Entry inside; // the element that it is added to
+        String name;  // of its own
+    };
+    struct Indent {
+        std::string_view old, now;
+    };
+    void noteGone(Shown was, std::uint32_t use);
+    void noteGoneInside(Shown object, std::uint32_t owner);
+    bool findMoves();
+    bool mayMove(const Gone& gone, const Added& added) const;
+    void startAgain();
+    std::string movedFrom(std::uint32_t use, const std::optional<std::string>& line);
+    void indentInside(Entry element, const Indent& indent, EditList& edits) const;
+    void indentAnew(SourceMarkup::Offset place, const Indent& indent, EditList& edits) const;
 
     // UpdateTexts.cpp
     void setAttribute(Entry attribute, Shown value);
@@ -183,6 +219,7 @@ private:
     bool changeInTag(const Context& context, Entry entry, const WritingTrace::Kept* now);
     void addToTag(const Context& context, std::string_view name, const WritingTrace::Kept& kept);
     bool mayAddKept(Shown object, const std::string& text);
+    static bool isNamedByField(const ClassPlan& plan, const WritingTrace::Kept& kept);
     std::vector<Entry> entriesOfKept(const Context& context,
                                      const std::vector<WritingTrace::Kept>& kept) const;
 
@@ -192,7 +229,7 @@ private:
 
     const UpdateSource& _source;
     const std::set<Shown>& _anew;
-    const bool _addsKept;
+    const Ways _ways;
     // Whether objects have to be compared that show the same: they may declare something else.
     const bool _comparesAll;
     NewKept _newKept;
@@ -200,7 +237,8 @@ private:
     EditList* _edits = &_all; // those of an item that moves are its own
     std::vector<Shown> _failures;
     std::vector<Shown> _rewritten;
-    std::vector<std::uint32_t> _uses;                 // by owner and field
+    // By owner: of those that were asked for.
+    mutable std::unordered_map<std::uint32_t, std::vector<std::uint32_t>> _uses;
     std::unordered_map<Shown, std::uint32_t> _owners; // of the objects that were compared
     // What is new in elements that hold nothing yet.
     struct Opening {
@@ -209,6 +247,10 @@ private:
         Shown shown;
     };
     std::map<Entry, Opening> _openings;
+    std::vector<Gone> _gone;
+    std::vector<Added> _added;
+    std::unordered_map<Shown, std::uint32_t> _moves; // items that are new, and what they were
+    std::unordered_set<std::uint32_t> _movedFrom;
     std::unique_ptr<OutputNames> _names;
 };
 

@@ -6,6 +6,7 @@
 //     insert lines[0] VALUE       before the item that stands there
 //     remove lines[0]
 //     move lines[0] 2             to where it is item 2
+//     move lines[0] parts[1].lines[2]     into another list, once it is gone from its own
 //
 // and the lines that an update changes: "- " before an old one, "+ " before a new one.
 
@@ -70,7 +71,9 @@ inline void apply(const qx::Value& root, const std::string& edits) {
             const Place place(root, path);
             const qx::Value item = place.array().at(place.index());
             place.array().remove(place.index());
-            place.array().insert(std::stoul(rest), item);
+            const bool isElsewhere = rest.find('[') != std::string::npos;
+            const Place target(root, isElsewhere ? rest.substr(1) : path);
+            target.array().insert(isElsewhere ? target.index() : std::stoul(rest), item);
         } else {
             Place(root, first).set(value());
         }

@@ -9,6 +9,7 @@
 #include <QXXMLMarshalling/QXXMLUpdate.h>
 
 #include <cstdlib>
+#include <map>
 #include <random>
 
 namespace {
@@ -275,7 +276,11 @@ private:
             const std::size_t what = below(3);
             _edits += field.name + "[" + std::to_string(at) + "] " + std::to_string(what) + "\n";
             if (what == 0) {
-                array.insert(at, newItem(field));
+                auto& removed = _removed[{field.kind == Field::items, field.ofClass}];
+                const bool isMoved = !removed.empty() && isLikely(70);
+                array.insert(at, isMoved ? removed.back() : newItem(field));
+                if (isMoved)
+                    removed.pop_back();
                 allow(array.at(at));
             } else if (at < array.count()) {
                 const qx::Value item = array.at(at);
@@ -285,6 +290,8 @@ private:
                 _isKept = false;
                 if (what == 1)
                     array.insert(below(array.count() + 1), item);
+                else
+                    _removed[{field.kind == Field::items, field.ofClass}].push_back(item);
             }
         }
     }
@@ -300,6 +307,7 @@ private:
     std::mt19937 _random;
     std::vector<std::vector<Field>> _classes;
     std::string _lineEnd, _indent, _edits;
+    std::map<std::pair<bool, std::size_t>, std::vector<qx::Value>> _removed; // may come back
     std::size_t _noise = 0;
     std::size_t _most = 0; // bytes that the edits may change
     bool _isKept = true;   // nothing was taken away that may hold unknown XML

@@ -311,6 +311,11 @@ TEST(UpdateAgain, SavesAnObjectThatKeepsWhatIsGone) {
          "<order/>",
          {"note = \"a\"", "", "note = \"b\""},
          "<order><note>b</note></order>"},
+        {"<Order xml='order'><rows type='Row' collection='array' name='row'/></Order>"
+         "<Row><on node='attribute' location='at'/></Row>",
+         "<order><row><at on='3'/></row><row><at on='4'/></row></order>",
+         {"rows[0].on = null", "move rows[0] 1"},
+         "<order><row><at on='4'/></row><row></row></order>"},
     };
     for (const auto& each : cases) {
         const auto marshaller = scenario::marshaller(each.mapping);
