@@ -15,7 +15,9 @@ static_assert(std::is_trivially_destructible_v<XMLDraft::Element> && sizeof(XMLD
 void XMLDraft::grow(std::size_t size) {
     constexpr std::size_t largestBlock = 8 * 1024 * 1024;
     const std::size_t capacity = std::max(size, _blockSize);
-    _blocks.push_back(std::make_unique_for_overwrite<std::byte[]>(capacity));
+    const std::align_val_t alignment{capacity < largestBlock ? alignof(Element) : largePageSize};
+    _blocks.push_back(
+        Block(static_cast<std::byte*>(::operator new(capacity, alignment)), Release{alignment}));
     askForLargePages(_blocks.back().get(), capacity);
     _blockSize = std::min(2 * _blockSize, largestBlock);
     _next = _blocks.back().get();
