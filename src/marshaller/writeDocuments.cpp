@@ -20,9 +20,9 @@ using qx::detail::reset;
 
 namespace {
 
-// Drafts the object and has print(element, limits, size) print the draft of that size. Its names are the mapping's,
-// which the marshalling holds: getters may let go of the marshaller. What no XML document can hold,
-// or none that could be read again, raises while it is printed.
+// Drafts the object and has print(element, limits, size) print the draft of that size. Its names
+// are the mapping's, which the marshalling holds: getters may let go of the marshaller. What no XML
+// document can hold, or none that could be read again, raises while it is printed.
 template <class Print>
 bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Error>* error,
              Print print) {
@@ -45,11 +45,12 @@ bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Err
 bool print(const QXXMLMarshaller& marshaller, const qx::Value& object, qx::XMLOptions layout,
            Ref<Error>* error, qx::TextBuffer& text) {
     reset(error);
-    return printed(marshaller, object, error, [&](const auto& root, const auto& reading, std::size_t size) {
-        // Mostly a document is somewhat smaller than its draft.
-        text.reserve(size);
-        qx::writeDraft(root, layout, reading, text);
-    });
+    return printed(marshaller, object, error,
+                   [&](const auto& root, const auto& reading, std::size_t size) {
+                       // Mostly a document is somewhat smaller than its draft.
+                       text.reserve(size);
+                       qx::writeDraft(root, layout, reading, text);
+                   });
 }
 
 // A document of the objects that next() answers, until that is null. The sink opens, takes bytes
@@ -75,10 +76,10 @@ bool writeSequence(QXXMLMarshaller& marshaller, Sink& sink, const String& rootNa
     for (qx::Value object = next(); !object.isNull(); object = next()) {
         if (std::exchange(isEmpty, false))
             text += '>';
-        const bool isPrinted =
-            printed(marshaller, object, error, [&](const auto& element, const auto& reading, std::size_t) {
-                qx::writeDraftInside(element, layout, reading, text);
-            });
+        const bool isPrinted = printed(marshaller, object, error,
+                                       [&](const auto& element, const auto& reading, std::size_t) {
+                                           qx::writeDraftInside(element, layout, reading, text);
+                                       });
         if (!isPrinted || (text.size() >= blockSize && !sink.write(text.take(), error)))
             return false;
     }

@@ -194,8 +194,8 @@ private:
 
     const Values _values;
     struct Release {
-        std::align_val_t alignment;
-        void operator()(std::byte* block) const noexcept { ::operator delete(block, alignment); }
+        bool isAligned; // to large pages
+        void operator()(std::byte* block) const noexcept;
     };
     using Block = std::unique_ptr<std::byte, Release>;
 
