@@ -13,6 +13,9 @@
 
 namespace qx {
 
+// Memory that begins at a multiple of this can be in large pages from its first byte on.
+constexpr std::size_t largePageSize = 2 * 1024 * 1024;
+
 // Asks for large pages for memory of its own that is not all written to yet.
 void askForLargePages(void* memory, std::size_t size) noexcept;
 

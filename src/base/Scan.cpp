@@ -2,9 +2,9 @@
 
 #include "base/Unicode.h"
 
-#include <array>
 #include <charconv>
 #include <cmath>
+#include <cstdlib>
 
 namespace qx {
 
@@ -35,19 +35,51 @@ std::optional<double> scanReal(std::string_view text) noexcept {
     return value;
 }
 
-String describeReal(double value) {
+namespace {
+
+// A number with up to three decimals, without the zeros at their end; null where it has more. Such
+// a text is the shortest: no two numbers of at most 15 digits are the same real.
+char* describeDecimal(double value, RealText& text) {
+    constexpr double beyond = 1e12;
+    if (!(std::fabs(value) < beyond))
+        return nullptr;
+    const auto thousandths = static_cast<std::int64_t>(value * 1000 + (value < 0 ? -0.5 : 0.5));
+    if (thousandths == 0 || static_cast<double>(thousandths) / 1000 != value)
+        return nullptr;
+    char* at = text.data();
+    if (thousandths < 0)
+        *at++ = '-';
+    const std::int64_t magnitude = std::abs(thousandths);
+    at = std::to_chars(at, text.data() + text.size(), magnitude / 1000).ptr;
+    std::int64_t rest = magnitude % 1000;
+    if (rest != 0)
+        *at++ = '.';
+    for (; rest != 0; rest = rest % 100 * 10)
+        *at++ = static_cast<char>('0' + rest / 100);
+    return at;
+}
+
+} // namespace
+
+std::string_view describeReal(double value, RealText& text) {
     if (std::isnan(value))
         return "NaN";
     if (std::isinf(value))
         return value < 0 ? "-INF" : "INF";
+    if (const char* const end = describeDecimal(value, text))
+        return {text.data(), end};
     constexpr double smallest = 1e-5;
     constexpr double beyond = 1e17;
     const double magnitude = std::fabs(value);
     const bool plain = value == 0 || (magnitude >= smallest && magnitude < beyond);
-    std::array<char, 64> text;
     const auto format = plain ? std::chars_format::fixed : std::chars_format::scientific;
     const auto end = std::to_chars(text.data(), text.data() + text.size(), value, format);
-    return std::string_view(text.data(), static_cast<std::size_t>(end.ptr - text.data()));
+    return {text.data(), end.ptr};
+}
+
+String describeReal(double value) {
+    RealText text;
+    return describeReal(value, text);
 }
 
 } // namespace qx

@@ -4,6 +4,7 @@
 
 #include <QXXMLMarshalling/base/String.h>
 
+#include <array>
 #include <cstdint>
 #include <optional>
 
@@ -20,5 +21,8 @@ std::optional<double> scanReal(std::string_view text) noexcept;
 // The shortest text that reads back equal, without an exponent from 1e-5 to below 1e17; NaN, INF
 // and -INF as XML Schema writes them.
 String describeReal(double value);
+// The same in memory of the caller's.
+using RealText = std::array<char, 32>;
+std::string_view describeReal(double value, RealText& text);
 
 } // namespace qx

@@ -86,17 +86,20 @@ Unmarshalling::Number Unmarshalling::placeOf(const FieldPlan& field, const Targe
 
 bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
                              ErrorSlot error) {
-    ObjectAccess::Held held = ObjectAccess::get(object, field.key);
-    return writeValue(field, element, object, held, error);
+    ValuePlace place{nullptr, object.isa().property(field.key)};
+    return writeField(field, element, object, place, error);
 }
 
-bool Marshalling::writeValue(const FieldPlan& field, const WrittenElement& element, Object& object,
-                             ObjectAccess::Held& held, ErrorSlot error) {
+bool Marshalling::writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
+                             ValuePlace& place, ErrorSlot error) {
+    ObjectAccess::Held held = place.record != nullptr && place.property == nullptr
+                                  ? ObjectAccess::getContent(*place.record, field.key, place.next)
+                                  : ObjectAccess::get(object, field.key, place.property);
     if (held.value().isNull() && field.isContainer) {
         if (!field.isRequired)
             return true;
         if (field.valueType == ValueType::other || field.valueType == ValueType::string)
-            return fail(error, errors::requiredValueMissing, field.key.string(), &object);
+            return failMissing(field, object, error);
         held = {false, held.keepsZero()};
     }
     const Value& value = held.value();
@@ -104,15 +107,23 @@ bool Marshalling::writeValue(const FieldPlan& field, const WrittenElement& eleme
         if (const auto array = value.as<Array>())
             return writeCollection(*this, field, element, *array, error);
         if (value.classNameForMarshalling().isNull())
-            return fail(error, errors::noClassName, object.isa().name());
+            return failNameless(object, error);
     } else if (value.isNull()) {
-        return fail(error, errors::noClassName, object.isa().name());
+        return failNameless(object, error);
     }
     _omitsZero = _marshaller->omitsZeroAttributes() && !held.keepsZero();
     const bool isWritten = bindingOf(field).write(*this, field, element, value, error);
     if (_trace != nullptr)
         _trace->hold(value);
     return isWritten;
+}
+
+bool Marshalling::failMissing(const FieldPlan& field, const Object& object, ErrorSlot error) {
+    return fail(error, errors::requiredValueMissing, field.key.string(), &object);
+}
+
+bool Marshalling::failNameless(const Object& object, ErrorSlot error) {
+    return fail(error, errors::noClassName, object.isa().name());
 }
 
 } // namespace qx::detail

@@ -66,6 +66,8 @@ void FieldText::describe(ValueType type) {
         const auto end =
             std::to_chars(_digits.data(), _digits.data() + _digits.size(), _value.intValue()).ptr;
         _view = {_digits.data(), end};
+    } else if (_value.kind() == Value::Kind::real) {
+        _view = describeReal(_value.doubleValue(), _digits);
     } else {
         _description = _value.description();
         _view = _description;

@@ -5,9 +5,8 @@
 #include <QXXMLMarshalling/model/Error.h>
 #include <QXXMLMarshalling/model/Object.h>
 
+#include "base/Scan.h"
 #include "plan/FieldPlan.h"
-
-#include <array>
 
 namespace qx::detail {
 
@@ -51,8 +50,8 @@ private:
 
     const Value& _value;
     std::string_view _view;
-    String _description; // of what is neither text nor integer
-    std::array<char, 20> _digits;
+    String _description; // of what is neither text nor number
+    RealText _digits;
 };
 
 } // namespace qx::detail

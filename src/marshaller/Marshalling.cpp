@@ -175,14 +175,10 @@ WrittenElement Marshalling::wrapperOf(const FieldPlan& field, const WrittenEleme
     return wrapper;
 }
 
-// A class that is self-first writes its fields before its ancestors', any other after them. Kept
-// XML is put back at every level, the farthest ancestor's first, so that it ends up behind all
-// fields.
 bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                               ErrorSlot error) {
-    const std::size_t deepest = _marshaller->maximumDepth();
-    if (_depth >= deepest)
-        return failed(plan, errors::nestedTooDeep, deepest, error);
+    if (_depth >= _marshaller->maximumDepth())
+        return failTooDeep(plan, error);
     struct Deeper {
         std::size_t& depth;
         explicit Deeper(std::size_t& counted) : depth(counted) { ++depth; }
@@ -191,30 +187,44 @@ bool Marshalling::writeFields(const ClassPlan& plan, const WrittenElement& eleme
 
     if (_trace != nullptr)
         _trace->enterObject(plan, element.drafted, object, _access);
-    std::vector<const ClassPlan*> ancestors;
+    bool isWritten = false;
+    if (!plan.mapping->extends().isEmpty()) {
+        isWritten = writeWithAncestors(plan, element, object, error);
+    } else if (writeOwnFields(plan, element, object, error)) {
+        restoreXML(element, object);
+        isWritten = true;
+    }
+    if (_trace != nullptr)
+        _trace->leave();
+    return isWritten;
+}
+
+// A class that is self-first writes its fields before its ancestors', any other after them. Kept
+// XML is put back at every level, the farthest ancestor's first, so that it ends up behind all
+// fields.
+bool Marshalling::writeWithAncestors(const ClassPlan& plan, const WrittenElement& element,
+                                     Object& object, ErrorSlot error) {
+    std::vector<const ClassPlan*> levels;
     ExtendsWalk walk(plan);
     do {
-        if (&walk.current() != &plan)
-            ancestors.push_back(&walk.current());
+        levels.push_back(&walk.current());
         if (walk.current().mapping->isSelfFirst() &&
             !writeOwnFields(walk.current(), element, object, error))
             return false;
     } while (walk.next());
     if (!walk.broken().isNull())
         return failed(plan, errors::noExtendsWhenMarshalling, walk.broken(), error);
-    const auto finish = [&](const ClassPlan& level) {
+    for (; !levels.empty(); levels.pop_back()) {
+        const ClassPlan& level = *levels.back();
         if (!level.mapping->isSelfFirst() && !writeOwnFields(level, element, object, error))
             return false;
         restoreXML(element, object);
-        return true;
-    };
-    const bool isWritten =
-        std::all_of(ancestors.rbegin(), ancestors.rend(),
-                    [&](const ClassPlan* ancestor) { return finish(*ancestor); }) &&
-        finish(plan);
-    if (_trace != nullptr)
-        _trace->leave();
-    return isWritten;
+    }
+    return true;
+}
+
+bool Marshalling::failTooDeep(const ClassPlan& plan, ErrorSlot error) const {
+    return failed(plan, errors::nestedTooDeep, _marshaller->maximumDepth(), error);
 }
 
 bool Marshalling::failed(const ClassPlan& plan, const ErrorText& text, const Value& argument,
@@ -249,20 +259,16 @@ bool Marshalling::failed(const FieldPlan& field, std::size_t item, Ref<Error>& p
 bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
                                  Object& object, ErrorSlot error) {
     const auto& getters = _getters.of(plan, object);
-    const QXGenericRecord* const record = ObjectAccess::plainRecord(std::as_const(object));
-    std::size_t next = 0;
+    ValuePlace place{ObjectAccess::plainRecord(object), nullptr};
     for (std::size_t i = 0; i < plan.fields.size(); ++i) {
         const FieldPlan& field = plan.fields[i];
-        const Property* const property = getters.properties[i];
+        place.property = getters.properties[i];
         Ref<Error> problem;
         if (_trace != nullptr)
             _trace->enterField(field);
         if (_placing != nullptr)
             _placing->enterField(field.key);
-        ObjectAccess::Held held = record != nullptr && property == nullptr
-                                      ? ObjectAccess::getContent(*record, field.key, next)
-                                      : ObjectAccess::get(object, field.key, property);
-        const bool isWritten = writeValue(field, element, object, held, &problem);
+        const bool isWritten = writeField(field, element, object, place, &problem);
         if (_placing != nullptr && isWritten)
             placeKept(field, element);
         if (_trace != nullptr)

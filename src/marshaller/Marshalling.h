@@ -45,9 +45,6 @@ public:
                      ErrorSlot error);
     bool writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
                     ErrorSlot error);
-    // The same with the field's value.
-    bool writeValue(const FieldPlan& field, const WrittenElement& element, Object& object,
-                    ObjectAccess::Held& held, ErrorSlot error);
 
     // What the kinds of binding ask for.
     //
@@ -111,11 +108,25 @@ public:
     }
 
 private:
+    // Where an object has the value of a field.
+    struct ValuePlace {
+        const QXGenericRecord* record; // the object, where that is one of no subclass
+        const Property* property;      // null where its class has none of that name
+        std::size_t next = 0;          // among the contents of a record, if they come in order
+    };
+    bool writeField(const FieldPlan& field, const WrittenElement& element, Object& object,
+                    ValuePlace& place, ErrorSlot error);
+    [[gnu::noinline]] static bool failMissing(const FieldPlan& field, const Object& object,
+                                              ErrorSlot error);
+    [[gnu::noinline]] static bool failNameless(const Object& object, ErrorSlot error);
     // False with an error that knows its place. What fails keeps off the stack of what recurses.
     [[gnu::noinline]] bool failed(const ClassPlan& plan, const ErrorText& text,
                                   const Value& argument, ErrorSlot error) const;
     [[gnu::noinline]] bool failed(const FieldPlan& field, const ClassPlan& plan,
                                   Ref<Error>& problem, ErrorSlot error) const;
+    [[gnu::noinline]] bool failTooDeep(const ClassPlan& plan, ErrorSlot error) const;
+    [[gnu::noinline]] bool writeWithAncestors(const ClassPlan& plan, const WrittenElement& element,
+                                              Object& object, ErrorSlot error);
     bool writeOwnFields(const ClassPlan& plan, const WrittenElement& element, Object& object,
                         ErrorSlot error);
     // The same, or else what its class declares.

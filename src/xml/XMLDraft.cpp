@@ -11,11 +11,21 @@ namespace qx {
 
 static_assert(std::is_trivially_destructible_v<XMLDraft::Element> && sizeof(XMLDraft::Node) == 24);
 
+void XMLDraft::Release::operator()(std::byte* block) const noexcept {
+    if (isAligned)
+        ::operator delete[](block, std::align_val_t(largePageSize));
+    else
+        ::operator delete[](block);
+}
+
 // What does not fit leaves the rest of the block unused: little, as blocks grow.
 void XMLDraft::grow(std::size_t size) {
     constexpr std::size_t largestBlock = 8 * 1024 * 1024;
     const std::size_t capacity = std::max(size, _blockSize);
-    _blocks.push_back(std::make_unique_for_overwrite<std::byte[]>(capacity));
+    const bool isAligned = capacity >= largestBlock;
+    void* const block = isAligned ? ::operator new[](capacity, std::align_val_t(largePageSize))
+                                  : ::operator new[](capacity);
+    _blocks.push_back(Block(static_cast<std::byte*>(block), Release{isAligned}));
     askForLargePages(_blocks.back().get(), capacity);
     _blockSize = std::min(2 * _blockSize, largestBlock);
     _next = _blocks.back().get();

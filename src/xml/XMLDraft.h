@@ -27,6 +27,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <memory>
+#include <new>
 #include <unordered_map>
 #include <unordered_set>
 #include <utility>
@@ -192,7 +193,13 @@ private:
     static Ref<XMLElement> makeElement(const Element& draft);
 
     const Values _values;
-    std::vector<std::unique_ptr<std::byte[]>> _blocks;
+    struct Release {
+        bool isAligned; // to large pages
+        void operator()(std::byte* block) const noexcept;
+    };
+    using Block = std::unique_ptr<std::byte, Release>;
+
+    std::vector<Block> _blocks;
     std::byte* _next = nullptr;
     std::size_t _left = 0;
     std::size_t _allocated = 0;
