@@ -1,7 +1,7 @@
 #pragma once
 
 // What a marshaller keeps from one reading to the next, which mostly reads documents of the same
-// kind. Small documents take as long to begin with as to read without it.
+// kind. Without it, a document of 1 kB takes a third more instructions to read.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
