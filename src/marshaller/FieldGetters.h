@@ -1,8 +1,8 @@
 #pragma once
 
 // Where the fields of a mapped class have their values in objects of one class: the properties,
-// looked up once in a writing. Structs take a tenth of the instructions less by it
-// (bench/orders_bench.cpp, writeStructs).
+// looked up once in a writing. Without them structs take 3 % more instructions, and records 18 %
+// where a class was described with properties of their keys (bench/orders_bench.cpp, write).
 
 #include "marshaller/ObjectAccess.h"
 #include "plan/ClassPlan.h"

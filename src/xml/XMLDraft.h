@@ -17,8 +17,8 @@
 //    thereby takes it out of the draft.
 // 4. What no list leads to is not printed; its memory stays until the draft goes.
 //
-// Used by one thread. With a tree of nodes instead, writing orders takes 34 % more instructions and
-// half as much time again (bench/orders_bench.cpp, write).
+// Used by one thread. With a tree of nodes instead, writing orders takes more than twice the
+// instructions and three times as long (bench/orders_bench.cpp, write).
 
 #include <QXXMLMarshalling/xml/XMLElement.h>
 

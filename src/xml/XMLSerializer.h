@@ -127,7 +127,7 @@ private:
 
     // A direct-mapped cache of names that were checked and counted, by their address: the tree that
     // is written holds them. A new name evicts the one in its slot. Writing orders without it takes
-    // a quarter more instructions (bench/orders_bench.cpp, write).
+    // 29 % more instructions (bench/orders_bench.cpp, write).
     static constexpr std::size_t nameSlots = 256;
     std::array<const char*, nameSlots> _checked{};
 

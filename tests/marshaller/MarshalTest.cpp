@@ -89,6 +89,44 @@ TEST(Marshal, WritesTextsWithoutATreeAsItWritesTrees) {
               R"(<x><y/> <!--c--></x><x a="&amp;"/></Order>)");
 }
 
+// They are copied and looked at in blocks of several sizes.
+TEST(Marshal, WritesEachByteOfATextAsItWritesTrees) {
+    const auto marshaller =
+        scenario::marshaller("<Order><a node='attribute'/><c node='element'/></Order>");
+    for (const std::size_t size : {1, 3, 4, 7, 8, 15, 16, 17, 32, 35})
+        for (std::size_t at = 0; at < size; ++at) {
+            for (const char* unusual : {"<", ">", "&", "\"", "\n", "\u00e9", "x"}) {
+                const auto text = std::string(size, '-').replace(at, 1, unusual);
+                const auto order = record("Order", {{"a", text}, {"c", text}});
+                const auto tree = marshaller->marshall(order)->XMLString(qx::XMLPrettyPrint, {});
+                ASSERT_EQ(marshaller->writeString(order), tree);
+            }
+            const auto refused = std::string(size, '-').replace(at, 1, "\1");
+            for (const char* key : {"a", "c"})
+                ASSERT_TRUE(marshaller->writeString(record("Order", {{key, refused}})).isNull());
+        }
+}
+
+// Where values are is looked up once for a class, and records have them mostly in order.
+TEST(Marshal, FindsValuesOfEachObjectInWhateverOrderTheyStand) {
+    struct Host : qx::Object {
+        qx::String classNameForMarshalling() const override { return "Part"; }
+        Value valueForUndefinedKey(qx::Key key) const override { return "host's " + key.string(); }
+    };
+    const auto marshaller =
+        scenario::marshaller("<Order><p type='Part' node='element'/><q type='Part' node='element'/>"
+                             "<r type='Part' node='element'/></Order>"
+                             "<Part><a node='element'/><b node='attribute'/></Part>");
+    const auto reversed = record("Part", {{"x", 0}, {"b", 1}, {"a", 2}});
+    const auto removed = record("Part", {{"a", 3}, {"b", 4}});
+    removed->setValueForKey(Value(), "a");
+    const Value host = qx::make<Host>();
+    EXPECT_EQ(scenario::write(*marshaller,
+                              record("Order", {{"p", reversed}, {"q", host}, {"r", removed}})),
+              "<Order><p b=\"1\"><a>2</a></p><q b=\"host's b\"><a>host's a</a></q>"
+              "<r b=\"4\"></r></Order>");
+}
+
 TEST(Marshal, EndsAtTheDepthLimitForObjectsThatContainThemselves) {
     const auto marshaller = scenario::marshaller("<Node><x node='element'/></Node>");
     const auto node = record("Node");

@@ -13,6 +13,8 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <array>
+#include <charconv>
 #include <cmath>
 #include <numeric>
 
@@ -100,6 +102,17 @@ TEST(ValueTest, AnyValueIsANumberAndATruth) {
         EXPECT_EQ(value.intValue(), integer) << value.description().view();
         EXPECT_EQ(value.boolValue(), boolean) << value.description().view();
     }
+}
+
+TEST(ValueTest, ARealIsDescribedByTheShortestTextThatReadsBack) {
+    for (const double real : {0.001, 0.0005, 5.95, 100.5, 1e-4, 0.1 + 0.2, 1234567.875, 2.0 / 3,
+                              999999999999.999, 1e12, 12345678901234.5})
+        for (const double value : {real, -real, std::nextafter(real, 0.0), std::round(real)}) {
+            std::array<char, 64> text;
+            const auto end = std::to_chars(text.data(), text.data() + text.size(), value,
+                                           std::chars_format::fixed);
+            EXPECT_EQ(Value(value).description(), std::string_view(text.data(), end.ptr));
+        }
 }
 
 TEST(ValueTest, ATextIsTheSameWhereverItsBytesLie) {
