@@ -116,3 +116,25 @@ TEST(SavingLimits, ObjectsNestAsDeepAsReadingGoesAndNeverInThemselves) {
     EXPECT_EQ(support::told(cyclic.error()).substr(0, 44),
               "-223: Objects nest deeper than the limit of ");
 }
+
+// What is gone is gone through for what may have moved.
+TEST(SavingLimits, ListsThatNestDeeplyGoAsAWhole) {
+    const auto marshaller = scenario::marshaller(
+        "<Node xml='node'><nodes type='Node' collection='array' name='node'/></Node>");
+    marshaller->setMaximumDepth(QXXMLMarshaller::highestMaximumDepth / 2);
+    std::string deep, end;
+    for (std::size_t i = 1; i < marshaller->maximumDepth(); ++i, end += "</node>")
+        deep += "<node>";
+    const std::string text = "<node>" + deep + end + "<node/></node>";
+    qx::Ref<qx::Error> error;
+    const auto root = marshaller->readString(text, &error);
+    ASSERT_TRUE(root) << support::told(error);
+    const auto nodes = root->valueForKey("nodes").as<qx::Array>();
+    const auto added = qx::make<qx::Array>();
+    added->add(marshaller->readString("<node/>"));
+    nodes->remove(0);
+    nodes->at(0).object()->setValueForKey(added, "nodes");
+    const auto update = QXXMLUpdate::updatedText(*marshaller, text, root);
+    ASSERT_TRUE(update) << support::told(update.error());
+    EXPECT_EQ(update->bytes()->view(), "<node><node><node></node></node></node>");
+}

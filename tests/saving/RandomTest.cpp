@@ -39,6 +39,7 @@ public:
         ASSERT_TRUE(unedited) << support::told(unedited.error());
         EXPECT_EQ(unedited->bytes()->view(), document);
         edit(object, 0);
+        moveAcross(object);
         SCOPED_TRACE(_edits);
         const auto update = QXXMLUpdate::updatedText(*marshaller, document, object);
         ASSERT_TRUE(update) << support::told(update.error());
@@ -54,6 +55,7 @@ public:
             changed += one.oldText.size() + one.newText.size();
         EXPECT_LE(changed, _most);
         edit(object, 0);
+        moveAcross(object);
         const auto later = QXXMLUpdate::updatedText(*marshaller, saved, object);
         ASSERT_TRUE(later) << support::told(later.error()) << _edits;
         compare(*marshaller, later->bytes()->view(), object);
@@ -276,11 +278,7 @@ private:
             const std::size_t what = below(3);
             _edits += field.name + "[" + std::to_string(at) + "] " + std::to_string(what) + "\n";
             if (what == 0) {
-                auto& removed = _removed[{field.kind == Field::items, field.ofClass}];
-                const bool isMoved = !removed.empty() && isLikely(70);
-                array.insert(at, isMoved ? removed.back() : newItem(field));
-                if (isMoved)
-                    removed.pop_back();
+                array.insert(at, newItem(field));
                 allow(array.at(at));
             } else if (at < array.count()) {
                 const qx::Value item = array.at(at);
@@ -290,9 +288,39 @@ private:
                 _isKept = false;
                 if (what == 1)
                     array.insert(below(array.count() + 1), item);
-                else
-                    _removed[{field.kind == Field::items, field.ofClass}].push_back(item);
             }
+        }
+    }
+
+    using Lists = std::map<std::string, std::vector<qx::Array*>>; // of objects, by their field
+    void collectLists(const qx::Value& object, std::size_t ofClass, Lists& lists) {
+        for (const Field& field : _classes[ofClass]) {
+            const qx::Value held = object.object()->valueForKey(field.name);
+            if (const auto array = held.as<qx::Array>(); array && field.kind == Field::items) {
+                lists[field.name].push_back(array.get());
+                for (const qx::Value& item : *array)
+                    collectLists(item, field.ofClass, lists);
+            } else if (held.isObject() && field.kind == Field::object) {
+                collectLists(held, field.ofClass, lists);
+            }
+        }
+    }
+    void moveAcross(const qx::Value& object) {
+        Lists lists;
+        collectLists(object, 0, lists);
+        for (auto& [name, arrays] : lists) {
+            qx::Array& from = *arrays[below(arrays.size())];
+            qx::Array& to = *arrays[below(arrays.size())];
+            if (&from == &to || from.isEmpty() || !isLikely(70))
+                continue;
+            const std::size_t at = below(from.count());
+            const qx::Value item = from.at(at);
+            from.remove(at);
+            to.insert(below(to.count() + 1), item);
+            allow(item);
+            allow(item);
+            _isKept = false;
+            _edits += name + "[" + std::to_string(at) + "] elsewhere\n";
         }
     }
 
@@ -307,7 +335,6 @@ private:
     std::mt19937 _random;
     std::vector<std::vector<Field>> _classes;
     std::string _lineEnd, _indent, _edits;
-    std::map<std::pair<bool, std::size_t>, std::vector<qx::Value>> _removed; // may come back
     std::size_t _noise = 0;
     std::size_t _most = 0; // bytes that the edits may change
     bool _isKept = true;   // nothing was taken away that may hold unknown XML
