@@ -43,7 +43,7 @@ class ByteSource;
 class NamespaceTable;
 namespace detail {
 class NamespaceMatching;
-class ReadingMemory;
+class MarshallerMemory;
 class ReadingProgress;
 class Reporting;
 } // namespace detail
@@ -450,7 +450,7 @@ protected:
 
 private:
     friend class qx::detail::NamespaceMatching;
-    friend class qx::detail::ReadingMemory;
+    friend class qx::detail::MarshallerMemory;
     friend class qx::detail::ReadingProgress;
     friend class qx::detail::Reporting;
 
@@ -496,5 +496,5 @@ private:
     bool _matchesNamespaces = false;
     NamespacePrefixes _namespacePrefixes;
     std::shared_ptr<const qx::NamespaceTable> _namespaces; // null: names are matched as written
-    std::shared_ptr<qx::detail::ReadingMemory> _memory;    // null before the first reading
+    mutable std::shared_ptr<qx::detail::MarshallerMemory> _memory; // null before the first call
 };

@@ -10,8 +10,7 @@
 namespace qx::detail {
 
 ClassUses::ClassUses(Ref<const QXXMLMarshallingMapping> mapping)
-    : _mapping(std::move(mapping)), _version(classVersion()),
-      _uses(MappingPlan::of(_mapping.get()).classCount() + 1) {}
+    : _mapping(std::move(mapping)), _version(classVersion()) {}
 
 bool ClassUses::holdFor(const QXXMLMarshallingMapping* mapping) const noexcept {
     return !_isSpoilt && _mapping.get() == mapping && _version == classVersion();
@@ -23,17 +22,38 @@ void ClassUses::lookUp(Use& use, const ClassPlan& plan) {
 }
 
 void ClassUses::setUnmakeable(const ClassPlan& plan) {
-    _uses[plan.index].type = nullptr;
+    useOf(plan).type = nullptr;
     _isSpoilt = true;
+}
+
+namespace {
+
+// Those of that class; null where none are.
+template <class Found>
+const Found* find(const std::forward_list<Found>& all, const Class& type) {
+    const auto found = std::ranges::find(all, &type, &Found::type);
+    return found != all.end() ? &*found : nullptr;
+}
+
+} // namespace
+
+const ClassUses::Getters& ClassUses::findGetters(const ClassPlan& plan, const Class& type) {
+    Use& use = useOf(plan);
+    use.getters = find(use.allGetters, type);
+    if (use.getters != nullptr)
+        return *use.getters;
+    Getters getters{&type, {}};
+    getters.properties.reserve(plan.fields.size());
+    for (const FieldPlan& field : plan.fields)
+        getters.properties.push_back(type.property(field.key));
+    return *(use.getters = &use.allGetters.emplace_front(std::move(getters)));
 }
 
 const ClassUses::Setters& ClassUses::findSetters(const ClassPlan& plan, const Object& object) {
     static const Selector announces("automaticallyNotifiesObserversForKey:");
     const Class& type = object.isa();
-    auto& known = _uses[plan.index].setters;
-    const auto found = std::ranges::find(known, &type, &Setters::type);
-    if (found != known.end())
-        return *found;
+    if (const Setters* const known = find(useOf(plan).allSetters, type))
+        return *(useOf(plan).setters = known);
     Setters setters;
     setters.type = &type;
     setters.appends = &type == &QXGenericRecord::classObject();
@@ -47,7 +67,8 @@ const ClassUses::Setters& ClassUses::findSetters(const ClassPlan& plan, const Ob
         setters.slots.push_back({property, placedClass(slot, property)});
         setters.appends = setters.appends && property == nullptr && !key.view().starts_with('@');
     }
-    return known.emplace_front(std::move(setters));
+    Use& use = useOf(plan);
+    return *(use.setters = &use.allSetters.emplace_front(std::move(setters)));
 }
 
 const Class* ClassUses::placedClass(const UsualForm::Slot& slot, const Property* property) {

@@ -4,6 +4,7 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
+#include "marshaller/MarshallerMemory.h"
 #include "marshaller/NamespaceMatching.h"
 #include "marshaller/WritingContext.h"
 #include "model/Errors.h"
@@ -14,8 +15,12 @@ namespace qx::detail {
 
 Marshalling::Marshalling(const QXXMLMarshaller& marshaller, XMLDraft* draft)
     : _marshaller(&marshaller), _mapping(marshaller.mapping()),
-      _plan(MappingPlan::of(_mapping.get())), _output(draft),
-      _keepsExactly(marshaller.keepsExactly()), _reports(marshaller) {
+      _plan(MappingPlan::of(_mapping.get())),
+      // The plan of a single step, which writes nodes, may stand in no mapping, and is gone after
+      // it.
+      _classUses(draft != nullptr ? MarshallerMemory::of(marshaller).classUses(_mapping)
+                                  : std::make_shared<ClassUses>(_mapping)),
+      _output(draft), _keepsExactly(marshaller.keepsExactly()), _reports(marshaller) {
     if (auto table = NamespaceMatching::keptOf(marshaller);
         table != nullptr && marshaller.isUsingNamespaceURIs())
         _names = std::make_unique<OutputNames>(std::move(table));
@@ -258,7 +263,7 @@ bool Marshalling::failed(const FieldPlan& field, std::size_t item, Ref<Error>& p
 
 bool Marshalling::writeOwnFields(const ClassPlan& plan, const WrittenElement& element,
                                  Object& object, ErrorSlot error) {
-    const auto& getters = _getters.of(plan, object);
+    const auto& getters = _classUses->gettersOf(plan, object);
     ValuePlace place{ObjectAccess::plainRecord(object), nullptr};
     for (std::size_t i = 0; i < plan.fields.size(); ++i) {
         const FieldPlan& field = plan.fields[i];

@@ -6,7 +6,7 @@
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
-#include "marshaller/FieldGetters.h"
+#include "marshaller/ClassUses.h"
 #include "marshaller/KeptPlacing.h"
 #include "marshaller/ObjectAccess.h"
 #include "marshaller/OutputNames.h"
@@ -152,7 +152,7 @@ private:
     const qx::Ref<const QXXMLMarshallingMapping> _mapping; // of the plan
     const MappingPlan& _plan;
     ObjectAccess _access;
-    FieldGetters _getters;
+    const std::shared_ptr<ClassUses> _classUses;
     ElementWriter _output;
     WritingTrace* _trace = nullptr;
     const bool _keepsExactly;

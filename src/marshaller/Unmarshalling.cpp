@@ -4,7 +4,7 @@
 
 #include "base/BulkObjects.h"
 #include "host/Log.h"
-#include "marshaller/ReadingMemory.h"
+#include "marshaller/MarshallerMemory.h"
 #include "model/Errors.h"
 
 #include <algorithm>
@@ -19,8 +19,8 @@ Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, 
       _reports(marshaller), _keepsExactly(marshaller.keepsExactly()),
       _ownTrace(_keepsExactly ? std::make_unique<ReadingTrace>() : nullptr),
       _trace(_ownTrace.get()),
-      // The plan of a single step may stand in no mapping and be gone after it.
-      _classUses(use == Use::document ? ReadingMemory::of(marshaller).classUses(_mapping)
+      // The plan of a single step may stand in no mapping, and is gone after it.
+      _classUses(use == Use::document ? MarshallerMemory::of(marshaller).classUses(_mapping)
                                       : std::make_shared<ClassUses>(_mapping)) {
     if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
         document.matchBy(*table);

@@ -7,8 +7,8 @@
 
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
+#include "marshaller/MarshallerMemory.h"
 #include "marshaller/NoUndo.h"
-#include "marshaller/ReadingMemory.h"
 #include "marshaller/Reloading.h"
 #include "marshaller/Unmarshalling.h"
 #include "model/Errors.h"
@@ -22,8 +22,8 @@ using qx::XMLDocument;
 using qx::detail::ClassPlan;
 using qx::detail::ErrorDetails;
 using qx::detail::MappingPlan;
+using qx::detail::MarshallerMemory;
 using qx::detail::ReadingContext;
-using qx::detail::ReadingMemory;
 using qx::detail::reset;
 
 namespace {
@@ -96,13 +96,13 @@ Source sourceOf(QXXMLMarshaller& marshaller, Ref<qx::Data> data, Ref<Error>* err
     if (!data)
         return {};
     return {qx::XMLParser::parse(std::move(data), qx::detail::parsingOf(marshaller), error,
-                                 &ReadingMemory::of(marshaller).parsing),
+                                 &MarshallerMemory::of(marshaller).parsing),
             {}};
 }
 
 Source sourceOf(QXXMLMarshaller& marshaller, qx::XMLBytes bytes, Ref<Error>* error) {
     return {qx::XMLParser::parseCopy(bytes, qx::detail::parsingOf(marshaller), error,
-                                     &ReadingMemory::of(marshaller).parsing),
+                                     &MarshallerMemory::of(marshaller).parsing),
             {}};
 }
 

@@ -1,7 +1,7 @@
 #pragma once
 
-// What a marshaller keeps from one reading to the next, which mostly reads documents of the same
-// kind. Without it, a document of 1 kB takes a third more instructions to read.
+// What a marshaller keeps from one call to the next: its documents and objects mostly are of the
+// same kind. Without it, a document of 1 kB takes a third more instructions to read.
 
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 
@@ -10,17 +10,17 @@
 
 namespace qx::detail {
 
-class ReadingMemory {
+class MarshallerMemory {
 public:
-    static ReadingMemory& of(QXXMLMarshaller& marshaller) {
+    static MarshallerMemory& of(const QXXMLMarshaller& marshaller) {
         if (!marshaller._memory)
-            marshaller._memory = std::make_shared<ReadingMemory>();
+            marshaller._memory = std::make_shared<MarshallerMemory>();
         return *marshaller._memory;
     }
 
     XMLParser::Kept parsing;
 
-    // A reading holds them to its end: one that begins inside it may replace them here.
+    // A call holds them to its end: one that begins inside it may replace them here.
     std::shared_ptr<ClassUses> classUses(const Ref<const QXXMLMarshallingMapping>& mapping) {
         if (!_classUses || !_classUses->holdFor(mapping.get()))
             _classUses = std::make_shared<ClassUses>(mapping);
