@@ -52,6 +52,12 @@ public:
             moveTo(_size + _size / 2 + 16);
         _data[_size++] = item;
     }
+    // So many more, which are not set.
+    T* extend(std::size_t count) {
+        if (_capacity - _size < count)
+            moveTo(_size + _size / 2 + count + 16);
+        return _data + std::exchange(_size, _size + count);
+    }
     // What is added is not set.
     void resize(std::size_t size) {
         reserve(size);

@@ -3,6 +3,8 @@
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
+#include "base/ShortCopy.h"
+
 #include <cstring>
 
 namespace qx::detail {
@@ -270,7 +272,7 @@ void WritingTrace::addText(std::string_view text, bool isHidden) {
     shown.hash = hash;
     shown.span = {static_cast<std::uint32_t>(_texts.size()),
                   static_cast<std::uint32_t>(text.size())};
-    _texts += text;
+    copyShort(text.data(), text.size(), _texts.extend(text.size()));
 }
 
 // Attributes of the element stay.

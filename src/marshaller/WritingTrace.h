@@ -85,7 +85,7 @@ public:
     Number size() const noexcept { return static_cast<Number>(_shown.size()); }
     std::string_view text(Number number) const noexcept {
         const Shown::Span span = _shown[number].span;
-        return std::string_view(_texts).substr(span.begin, span.size);
+        return {_texts.data() + span.begin, span.size};
     }
     // Of an object. The element holds its fields; the object itself is null for a plain struct,
     // which may have moved on.
@@ -173,7 +173,7 @@ private:
     BulkArray<Shown> _shown;
     BulkArray<Placed> _objects;
     std::vector<Number> _open;
-    std::string _texts;
+    BulkArray<char> _texts;
     bool _isTooLarge = false;
     bool _hidesSome = false;
     std::unordered_map<Number, KeptList> _kept;

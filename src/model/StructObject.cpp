@@ -5,8 +5,10 @@
 #include <QXXMLMarshalling/model/Array.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "model/ClassVersion.h"
 #include "model/TypeNames.h"
 
+#include <array>
 #include <unordered_set>
 
 namespace qx::detail {
@@ -134,14 +136,31 @@ std::vector<Value> heldIn(const Value& value) {
 
 namespace {
 
+// As Class::described, which takes a lock: what this thread has found lately holds as long as no
+// class is described or forgotten.
+const Class* describedLately(const std::type_info& type) {
+    struct Found {
+        const std::type_info* type = nullptr;
+        std::uint64_t version = 0;
+        const Class* described = nullptr;
+    };
+    constexpr std::size_t count = 16;
+    thread_local std::array<Found, count> latest;
+    Found& found = latest[reinterpret_cast<std::uintptr_t>(&type) / sizeof(type) % count];
+    const std::uint64_t version = classVersion();
+    if (found.type != &type || found.version != version)
+        found = {&type, version, Class::described(type)};
+    return found.described;
+}
+
 // The class of the place that can be handled as an object: the whole struct, or else its base.
 StructPlace describedPlace(StructPlace whole, StructPlace base, const Class*& known) {
     if (known != nullptr && known->type() == *whole.type)
         return whole;
-    known = Class::described(*whole.type);
+    known = describedLately(*whole.type);
     if (known != nullptr || *whole.type == *base.type)
         return whole;
-    known = Class::described(*base.type);
+    known = describedLately(*base.type);
     return base;
 }
 
