@@ -9,6 +9,14 @@ namespace {
 
 constexpr std::size_t none = ListMatching::none;
 
+// Which are in the row that ends there.
+std::vector<bool> rowTo(std::size_t end, const std::vector<std::size_t>& previous) {
+    std::vector<bool> isIn(previous.size());
+    for (std::size_t at = end; at != none; at = previous[at])
+        isIn[at] = true;
+    return isIn;
+}
+
 // For each number the longest rising row through all: those that are not in it have moved.
 std::vector<bool> longestRise(const std::vector<std::size_t>& numbers) {
     std::vector<std::size_t> ends;                           // of rows, by their length
@@ -28,17 +36,39 @@ std::vector<bool> longestRise(const std::vector<std::size_t>& numbers) {
         else
             ends.push_back(i);
     }
-    std::vector<bool> isIn(numbers.size());
-    for (std::size_t at = ends.empty() ? none : ends.back(); at != none; at = previous[at])
-        isIn[at] = true;
-    return isIn;
+    return rowTo(ends.empty() ? none : ends.back(), previous);
+}
+
+// The rising row of the most weight, which sizeOf() says of each number below `count`.
+std::vector<bool> heaviestRise(const std::vector<std::size_t>& numbers, std::size_t count,
+                               const ItemSize& sizeOf) {
+    struct Row {
+        std::size_t weight = 0, end = none;
+    };
+    // A Fenwick tree: the heaviest of the rows that end with one of so many numbers.
+    std::vector<Row> heaviest(count + 1);
+    std::vector<std::size_t> previous(numbers.size(), none);
+    Row best;
+    for (std::size_t i = 0; i < numbers.size(); ++i) {
+        if (numbers[i] == none)
+            continue;
+        Row row;
+        for (std::size_t at = numbers[i]; at != 0; at &= at - 1)
+            row = heaviest[at].weight > row.weight ? heaviest[at] : row;
+        previous[i] = row.end;
+        row = {row.weight + sizeOf(numbers[i]), i};
+        for (std::size_t at = numbers[i] + 1; at <= count; at += at & (~at + 1))
+            heaviest[at] = row.weight > heaviest[at].weight ? row : heaviest[at];
+        best = row.weight > best.weight ? row : best;
+    }
+    return rowTo(best.end, previous);
 }
 
 class Matcher {
 public:
     Matcher(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
-            const Likeness& likeness)
-        : _before(before), _now(now), _was(now.size(), none), _likeness(likeness),
+            const Likeness& likeness, const ItemSize& sizeOf)
+        : _before(before), _now(now), _was(now.size(), none), _likeness(likeness), _sizeOf(sizeOf),
           _isMatched(before.size()) {}
 
     // Where one item was changed in its place, there is no need of keys.
@@ -55,7 +85,12 @@ public:
                 matchLeft([&](std::size_t i) { return keys.before[i]; },
                           [&](std::size_t i) { return keys.now[i]; }, false);
         matchGaps();
-        return {_was, longestRise(_was)};
+        std::vector<bool> stays = longestRise(_was);
+        const bool haveMoved =
+            std::ranges::count(stays, true) != static_cast<std::ptrdiff_t>(_matched);
+        if (haveMoved && _sizeOf)
+            stays = heaviestRise(_was, _before.size(), _sizeOf);
+        return {std::move(_was), std::move(stays)};
     }
 
 private:
@@ -202,6 +237,7 @@ private:
     const std::vector<ListItem>& _now;
     std::vector<std::size_t> _was;
     const Likeness& _likeness;
+    const ItemSize& _sizeOf;
     std::vector<bool> _isMatched;
     std::size_t _matched = 0; // how many
 };
@@ -209,8 +245,9 @@ private:
 } // namespace
 
 ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
-                   const Likeness& likeness, const std::function<ListKeys()>& findKeys) {
-    return Matcher(before, now, likeness).run(findKeys);
+                   const Likeness& likeness, const std::function<ListKeys()>& findKeys,
+                   const ItemSize& sizeOf) {
+    return Matcher(before, now, likeness, sizeOf).run(findKeys);
 }
 
 } // namespace qx::detail

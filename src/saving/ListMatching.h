@@ -9,6 +9,7 @@
 // 4. What is left, anywhere, if it is equal: it has moved. Then by key.
 // 5. Of what then is left between two that have kept their place, those that are alike, in their
 //    order; where that is much, by place alone.
+// 6. Of those that are not in order any more the small ones have moved.
 
 #include <cstdint>
 #include <functional>
@@ -38,9 +39,14 @@ struct ListMatching {
 // How much an item before has in common with one now, both by their number.
 using Likeness = std::function<std::size_t(std::size_t before, std::size_t now)>;
 
-// findKeys() is asked for keys where equality leaves items over.
+// How large an item before is, by its number; more than 0.
+using ItemSize = std::function<std::size_t(std::size_t before)>;
+
+// findKeys() is asked for keys where equality leaves items over. Without sizes as few items as may
+// be have moved.
 ListMatching match(const std::vector<ListItem>& before, const std::vector<ListItem>& now,
                    const Likeness& likeness = nullptr,
-                   const std::function<ListKeys()>& findKeys = nullptr);
+                   const std::function<ListKeys()>& findKeys = nullptr,
+                   const ItemSize& sizeOf = nullptr);
 
 } // namespace qx::detail

@@ -145,7 +145,8 @@ ListKeys UpdatePlan::keysOf(const List& list) const {
     return {};
 }
 
-// How many fields of two objects of a class say the same, and keep the same.
+// How many fields of two objects of a class say the same, and whether these keep the same; half as
+// much are fields that both have.
 std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
     const auto& before = _source.before;
     const auto& after = _source.after;
@@ -154,8 +155,9 @@ std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
     std::size_t alike = 0;
     Shown other = was + 1;
     for (Shown field = is + 1; field < after[is].next; field = after[field].next) {
-        const bool isEmpty = after[field].next == field + 1;
-        alike += !isEmpty && after[field].hash == before[other].hash ? 1 : 0;
+        const bool haveBoth = after[field].next > field + 1 && before[other].next > other + 1;
+        if (haveBoth)
+            alike += after[field].hash == before[other].hash ? 2 : 1;
         other = before[other].next;
     }
     const auto* const kept = after.keptOf(is);
@@ -163,7 +165,7 @@ std::size_t UpdatePlan::likeness(Shown was, Shown is) const {
     const bool keepsTheSame = kept != nullptr && wasKept != nullptr &&
                               kept->children.size() + kept->attributes.size() != 0 &&
                               kept->hash() == wasKept->hash();
-    return alike + (keepsTheSame ? 2 : 0);
+    return alike + (keepsTheSame ? 4 : 0);
 }
 
 void UpdatePlan::arrangeList(const Context& context, const List& list, std::size_t ordinal) {
@@ -177,7 +179,11 @@ void UpdatePlan::arrangeList(const Context& context, const List& list, std::size
     const ListMatching matching = match(
         before, now,
         [&](std::size_t was, std::size_t is) { return likeness(list.was[was], list.is[is]); },
-        [&] { return keysOf(list); });
+        [&] { return keysOf(list); },
+        [&](std::size_t was) -> std::size_t {
+            const SourceMarkup::Spot& spot = _source.markup[use(list.uses[was]).entry];
+            return spot.isPlaced() ? spot.size() : 1;
+        });
     std::size_t previous = ListMatching::none; // that has kept its place
     std::size_t first = 0;
     for (std::size_t i = 0; i < list.is.size() && first == 0; ++i)

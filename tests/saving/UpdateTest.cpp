@@ -131,6 +131,18 @@ TEST_F(Update, OneValueInALargeDocumentIsOneLine) {
     EXPECT_EQ(update->edits()[2].newText, "another");
 }
 
+TEST_F(Update, OfItemsThatChangePlacesTheSmallOnesMove) {
+    const std::string text = "<sheet>\n<row id='1'>" + std::string(500, 'x') +
+                             "</row>\n<row id='2'>b</row>\n<row id='3'>c</row>\n</sheet>";
+    auto sheet = marshaller->readString<Sheet>(text);
+    ASSERT_TRUE(sheet);
+    std::rotate(sheet->rows.begin(), sheet->rows.begin() + 1, sheet->rows.end());
+    const auto update = QXXMLUpdate::updatedText(*marshaller, text, *sheet);
+    ASSERT_TRUE(update) << support::told(update.error());
+    for (const QXXMLUpdate::Edit& edit : update->edits())
+        EXPECT_LT(edit.oldText.size() + edit.newText.size(), 100U);
+}
+
 TEST_F(Update, AFileIsReplacedOnlyWhereSomethingWasEdited) {
     const TemporaryFolder folder;
     const std::string path =
