@@ -3,18 +3,12 @@
 #include <QXXMLMarshalling/QXGenericRecord.h>
 #include <QXXMLMarshalling/detail/StructPlacing.h>
 
-#include "model/ClassVersion.h"
-
 #include <algorithm>
 
 namespace qx::detail {
 
 ClassUses::ClassUses(Ref<const QXXMLMarshallingMapping> mapping)
     : _mapping(std::move(mapping)), _version(classVersion()) {}
-
-bool ClassUses::holdFor(const QXXMLMarshallingMapping* mapping) const noexcept {
-    return !_isSpoilt && _mapping.get() == mapping && _version == classVersion();
-}
 
 void ClassUses::lookUp(Use& use, const ClassPlan& plan) {
     use.type = Class::named(plan.classNameToInstantiate.view());

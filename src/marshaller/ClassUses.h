@@ -10,6 +10,7 @@
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/model/Class.h>
 
+#include "model/ClassVersion.h"
 #include "plan/ClassPlan.h"
 
 #include <forward_list>
@@ -39,8 +40,12 @@ public:
 
     explicit ClassUses(Ref<const QXXMLMarshallingMapping> mapping);
 
-    // Whether that is what would be found out again.
-    bool holdFor(const QXXMLMarshallingMapping* mapping) const noexcept;
+    // Whether that is what would be found out again; for a reading that holds them, and for
+    // another.
+    bool areCurrent() const noexcept { return _version == classVersion(); }
+    bool holdFor(const QXXMLMarshallingMapping* mapping) const noexcept {
+        return !_isSpoilt && _mapping.get() == mapping && areCurrent();
+    }
 
     // The class that objects are made of; null where records stand in for it.
     const Class* classOf(const ClassPlan& plan) {

@@ -18,12 +18,18 @@ Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, 
       _plan(MappingPlan::of(_mapping.get())), _use(use), _budget(marshaller, document),
       _reports(marshaller), _keepsExactly(marshaller.keepsExactly()),
       _ownTrace(_keepsExactly ? std::make_unique<ReadingTrace>() : nullptr),
-      _trace(_ownTrace.get()),
-      // The plan of a single step may stand in no mapping, and is gone after it.
-      _classUses(use == Use::document ? MarshallerMemory::of(marshaller).classUses(_mapping)
-                                      : std::make_shared<ClassUses>(_mapping)) {
+      _trace(_ownTrace.get()) {
+    renewClassUses();
     if (const NamespaceTable* const table = NamespaceMatching::of(marshaller))
         document.matchBy(*table);
+}
+
+// The plan of a single step may stand in no mapping, and is gone after it.
+void Unmarshalling::renewClassUses() {
+    if (_classUses)
+        _earlierClassUses.push_back(_classUses);
+    _classUses = _use == Use::document ? MarshallerMemory::of(*_marshaller).classUses(_mapping)
+                                       : std::make_shared<ClassUses>(_mapping);
 }
 
 // Lends consumed names for the time of one object's binding.
@@ -190,7 +196,7 @@ bool Unmarshalling::mayBuild(const ClassPlan& plan, const Counted& source, Error
 }
 
 Ref<Object> Unmarshalling::allocate(const ClassPlan& plan) {
-    const Class* const type = _classUses->classOf(plan);
+    const Class* const type = classUses().classOf(plan);
     Ref<Object> object = type != nullptr ? type->create() : nullptr;
     if (type != nullptr && !object) {
         logWarningOrLine("Class %@ cannot be made without arguments, records stand in for it",

@@ -116,7 +116,13 @@ public:
     // What the kinds of binding ask for.
     const MappingPlan& plan() const noexcept { return _plan; }
     ReadingBudget& budget() noexcept { return _budget; }
-    ClassUses& classUses() noexcept { return *_classUses; }
+    // Of the classes as they are now: a host may describe and forget some at any time. What was
+    // handed out before stays.
+    ClassUses& classUses() {
+        if (!_classUses->areCurrent()) [[unlikely]]
+            renewClassUses();
+        return *_classUses;
+    }
     // The text inside an element, put together; null with -224 where that is too much.
     Value textOf(Number element, ErrorSlot error);
     IndexedXML& document() noexcept { return _document; }
@@ -156,6 +162,7 @@ private:
         Number wrapper;
     };
     class LentNames;
+    [[gnu::noinline]] void renewClassUses();
     class Traced;
 
     bool isBeingBound(const ClassPlan& plan, Number element) const;
@@ -217,7 +224,8 @@ private:
     bool _isTraced = false;
     const std::unique_ptr<ReadingTrace> _ownTrace; // of what is kept exactly
     ReadingTrace* _trace = nullptr;
-    const std::shared_ptr<ClassUses> _classUses;
+    std::shared_ptr<ClassUses> _classUses;
+    std::vector<std::shared_ptr<ClassUses>> _earlierClassUses;
     const Frame* _frame = nullptr;
     const Error* _earlier = nullptr;
     Number _wrapper = none; // see setWrapper

@@ -48,6 +48,8 @@ void addBases(const std::type_info& type, std::vector<const std::type_info*>& ty
 
 } // namespace
 
+constinit std::atomic<std::uint64_t> classChanges = 0;
+
 // Classes by name and by C++ type.
 struct ClassRegistry {
     const Class* named(Key name) {
@@ -111,7 +113,7 @@ struct ClassRegistry {
         // Descriptions are immortal: objects keep pointers to them.
         const auto* published = new Class(std::move(draft));
         byType.emplace(type, published);
-        version.fetch_add(1, std::memory_order_release);
+        classChanges.fetch_add(1, std::memory_order_release);
         if (isTaken != nullptr)
             *isTaken = true;
         standIns.clear(); // it may be the base, or the very class, of what one stands in for
@@ -147,7 +149,6 @@ struct ClassRegistry {
             forgetLocked(described);
     }
 
-    std::atomic<std::uint64_t> version = 0; // see ClassVersion.h
     std::shared_mutex mutex;
     std::unordered_map<Key, const Class*> byName;
     std::unordered_map<std::type_index, const Class*> byType;
@@ -157,7 +158,7 @@ private:
     // The name may be another class's.
     void forgetLocked(const Class& described) {
         retired.push_back(&described);
-        version.fetch_add(1, std::memory_order_release);
+        classChanges.fetch_add(1, std::memory_order_release);
         byType.erase(*described._type);
         if (const auto found = byName.find(described._name);
             found != byName.end() && found->second == &described)
@@ -199,10 +200,6 @@ const Operation* findOperation(const std::vector<Operation>& operations, Selecto
 }
 
 } // namespace
-
-std::uint64_t classVersion() noexcept {
-    return immortal<ClassRegistry>().version.load(std::memory_order_acquire);
-}
 
 Class::Class(detail::ClassDraft draft)
     : _name(draft.name), _type(draft.type), _superclassType(draft.superclass),
