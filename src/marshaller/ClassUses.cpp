@@ -18,8 +18,12 @@ bool ClassUses::holdFor(const QXXMLMarshallingMapping* mapping) const noexcept {
 }
 
 void ClassUses::lookUp(Use& use, const ClassPlan& plan) {
-    use.type = Class::named(plan.classNameToInstantiate.view());
-    use.isKnown = true;
+    if (use.reading == 0 || _version != classVersion()) {
+        use.type = Class::named(plan.classNameToInstantiate.view());
+        use.latest = nullptr;
+        _outdated.splice_after(_outdated.before_begin(), use.setters);
+    }
+    use.reading = _reading;
 }
 
 void ClassUses::setUnmakeable(const ClassPlan& plan) {

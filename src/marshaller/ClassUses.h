@@ -2,7 +2,8 @@
 
 // How objects of a mapping's classes are made and set, found out when the first one of each is
 // read. The marshaller keeps that from one reading to the next, as long as no class is described or
-// forgotten.
+// forgotten. A host may do so in the middle of a reading: what that reading has not used by then is
+// found out again.
 
 #include <QXXMLMarshalling/QXXMLMarshallingMapping.h>
 #include <QXXMLMarshalling/model/Class.h>
@@ -33,10 +34,12 @@ public:
     // Whether that is what would be found out again.
     bool holdFor(const QXXMLMarshallingMapping* mapping) const noexcept;
 
+    void beginReading() noexcept { ++_reading; }
+
     // The class that objects are made of; null where records stand in for it.
     const Class* classOf(const ClassPlan& plan) {
         Use& use = _uses[plan.index];
-        if (!use.isKnown) [[unlikely]]
+        if (use.reading != _reading) [[unlikely]]
             lookUp(use, plan);
         return use.type;
     }
@@ -56,17 +59,19 @@ private:
         const Class* type = nullptr;
         const Setters* latest = nullptr;
         std::forward_list<Setters> setters; // which stay where they are
-        bool isKnown = false;
+        std::uint64_t reading = 0;          // that used it last
     };
 
-    static void lookUp(Use& use, const ClassPlan& plan);
+    void lookUp(Use& use, const ClassPlan& plan);
     const Setters& findSetters(const ClassPlan& plan, const Object& object);
     const Class* placedClass(const UsualForm::Slot& slot, const Property* property);
 
     const Ref<const QXXMLMarshallingMapping> _mapping;
     const std::uint64_t _version;
     bool _isSpoilt = false;
+    std::uint64_t _reading = 1;
     std::vector<Use> _uses; // by plan index; the last one for a plan that stands in no mapping
+    std::forward_list<Setters> _outdated; // objects that are being read may go by them
 };
 
 } // namespace qx::detail

@@ -24,6 +24,7 @@ public:
     std::shared_ptr<ClassUses> classUses(const Ref<const QXXMLMarshallingMapping>& mapping) {
         if (!_classUses || !_classUses->holdFor(mapping.get()))
             _classUses = std::make_shared<ClassUses>(mapping);
+        _classUses->beginReading();
         return _classUses;
     }
 
