@@ -48,7 +48,7 @@ constexpr const char* classes =
     "<Leaf xml='leaf'><a/><n type='int' node='attribute'/></Leaf>"
     "<Branch xml='branch'><a node='attribute'/><leaf type='Leaf' node='element'/>"
     "<maybe type='Leaf' node='element'/><leaves type='Leaf' collection='array' name='item'/>"
-    "<word node='element'/></Branch>";
+    "<word node='element'/></Branch><Wood xml='wood'><plants collection='array'/></Wood>";
 
 class UsualForm : public Structs {
 protected:
@@ -217,4 +217,11 @@ TEST_F(UsualForm, TellsWhenClassesComeAndGo) {
     EXPECT_EQ(marshaller->readString("<leaf a='5'/>")->isa().name(), "QXGenericRecord");
     qx::Class::define<Leaf>("Leaf").members<&Leaf::a, &Leaf::n>();
     EXPECT_EQ(shown(), asLeaf);
+
+    Branch::onWord = [] { qx::Class::forget("Leaf"); };
+    const auto wood =
+        marshaller->readString("<wood><branch><word>w</word></branch><leaf a='5'/></wood>");
+    Branch::onWord = nullptr;
+    EXPECT_EQ(wood->valueForKey("plants").as<qx::Array>()->at(1).object()->isa().name(),
+              "QXGenericRecord");
 }
