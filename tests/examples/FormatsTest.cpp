@@ -243,7 +243,7 @@ TEST_F(Formats, ShapesOfSeveralClassesShareAPalette) {
         "corner=\"0\"/>\n\t\t<rectangle name=\"gate &#8364;\" width=\"1\" height=\"0\"/>\n");
     expectEdit<Settings>(
         document, [](Settings& settings) { std::swap(settings.palette[1], settings.palette[2]); },
-        star + door + group, group + star + door);
+        star + door + group, star + group + door);
     ;
 }
 
