@@ -102,13 +102,10 @@ String WritingTrace::keyPath(Number number) const {
 }
 
 inline std::uint64_t WritingTrace::hashOf(const Shown& shown) const noexcept {
+    if (shown.kind == Kind::object)
+        return mixed(reinterpret_cast<std::uintptr_t>(_objects[shown.place].plan), shown.hash);
     // An empty list shows no more than none.
-    const bool isList = shown.isList && shown.count != 0;
-    const std::uint64_t own = static_cast<std::uint64_t>(shown.kind) + (isList ? 16 : 0);
-    return shown.kind == Kind::object
-               ? mixed(mixed(own, reinterpret_cast<std::uintptr_t>(_objects[shown.place].plan)),
-                       shown.hash)
-               : mixed(own, shown.hash);
+    return shown.isList && shown.count != 0 ? ~shown.hash : shown.hash;
 }
 
 inline void WritingTrace::mixInto(Number around, const Shown& shown) {
