@@ -1,8 +1,8 @@
 #pragma once
 
-// Memory of the objects that reading a document makes by the thousand, and of the buffers that they
-// hold. While the thread reads one (base/BulkObjects.h), it is cut from shared blocks; at any other
-// time each piece is allocated on its own. Any thread may release either.
+// Memory of the objects that reading and writing a document makes by the thousand, and of the
+// buffers that they hold. While the thread does so (base/BulkObjects.h), it is cut from shared
+// blocks; at any other time each piece is allocated on its own. Any thread may release either.
 
 #include <QXXMLMarshalling/base/Export.h>
 
