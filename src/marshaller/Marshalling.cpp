@@ -4,7 +4,6 @@
 #include <QXXMLMarshalling/model/Class.h>
 #include <QXXMLMarshalling/model/Dictionary.h>
 
-#include "base/BulkObjects.h"
 #include "marshaller/MarshallerMemory.h"
 #include "marshaller/NamespaceMatching.h"
 #include "marshaller/WritingContext.h"
@@ -53,7 +52,6 @@ const ClassPlan* Marshalling::classOf(const Value& value) const {
 }
 
 WrittenElement Marshalling::marshallObject(const Value& object, ErrorSlot error) {
-    const BulkObjects bulk; // boxes of structs and lists of them come and go
     const String className = object.classNameForMarshalling();
     if (className.isNull())
         return fail(error, errors::noClassName,

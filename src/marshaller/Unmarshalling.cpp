@@ -26,7 +26,9 @@ Unmarshalling::Unmarshalling(QXXMLMarshaller& marshaller, IndexedXML& document, 
 
 // The plan of a single step may stand in no mapping, and is gone after it.
 void Unmarshalling::renewClassUses() {
-    if (_classUses)
+    if (_frame == nullptr) // nobody goes by them
+        _earlierClassUses.clear();
+    else
         _earlierClassUses.push_back(_classUses);
     _classUses = _use == Use::document ? MarshallerMemory::of(*_marshaller).classUses(_mapping)
                                        : std::make_shared<ClassUses>(_mapping);

@@ -3,6 +3,7 @@
 #include <QXXMLMarshalling/QXXMLMarshaller.h>
 #include <QXXMLMarshalling/base/Exception.h>
 
+#include "base/BulkObjects.h"
 #include "files/AtomicWrite.h"
 #include "files/Files.h"
 #include "marshaller/DocumentParsing.h"
@@ -28,6 +29,7 @@ bool printed(const QXXMLMarshaller& marshaller, const qx::Value& object, Ref<Err
              Print print) {
     const qx::XMLParseOptions reading = qx::detail::parsingOf(marshaller);
     const qx::Value held = object; // whatever the getters do to the caller's
+    const qx::BulkObjects bulk;    // boxes of structs and lists of them come and go
     qx::XMLDraft draft;
     qx::detail::Marshalling marshalling(marshaller, &draft);
     const auto root = marshalling.marshallObject(held, error);

@@ -1,5 +1,6 @@
 #include "saving/TracedObject.h"
 
+#include "base/BulkObjects.h"
 #include "marshaller/DocumentParsing.h"
 #include "marshaller/Marshalling.h"
 #include "marshaller/NoUndo.h"
@@ -10,6 +11,7 @@ namespace qx::detail {
 
 bool TracedWriting::write(const QXXMLMarshaller& marshaller, const Value& object,
                           const Size& expected, XMLDraft::Values values, Ref<Error>* error) {
+    const BulkObjects bulk; // as in any writing
     _object = object;
     _trace.reserve(expected.entries, expected.texts);
     _draft = std::make_unique<XMLDraft>(values);

@@ -33,9 +33,10 @@ ScannedNames ScannedNames::take(Kept& kept, std::size_t longest) {
 
 std::vector<String> ScannedNames::finish(std::uint32_t element, Kept& kept) {
     constexpr std::size_t mostKept = 100;
+    constexpr std::size_t mostText = 2'000;
     constexpr std::uint32_t mostElements =
         UINT32_MAX / 4; // the next document has no more than that
-    if (_texts.size() > mostKept || element > mostElements)
+    if (_texts.size() > mostKept || _textSize > mostText || element > mostElements)
         return std::move(_texts);
     _element = element;
     auto texts = _texts;
@@ -63,6 +64,7 @@ ScannedNames::Name& ScannedNames::add(std::string_view text, const ShortName& by
     if ((_names.size() + 1) * 2 > _slots.size())
         grow();
     _texts.push_back(knownName(text));
+    _textSize += text.size();
     name.number = static_cast<Number>(_names.size());
     name.follower = name.number;
     _names.push_back(name);

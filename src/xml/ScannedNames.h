@@ -56,8 +56,9 @@ public:
     using Kept = std::optional<ScannedNames>;
     // Those that were kept, if under the same limit; else new ones.
     static ScannedNames take(Kept& kept, std::size_t longest);
-    // The texts by number, for the index. If they are few, the names are kept; `element` was the
-    // document's last.
+    // The texts by number, for the index. If they are few and short, the names are kept: of those
+    // that no code knows each document has to find that out again. `element` was the document's
+    // last.
     std::vector<String> finish(std::uint32_t element, Kept& kept);
 
     // Counts the elements of all documents: that of the latest one.
@@ -122,7 +123,8 @@ private:
     std::vector<Name> _names;
     std::vector<Number> _slots;
     std::vector<String> _texts;
-    std::size_t _URIs = 0; // of this document
+    std::size_t _textSize = 0; // of all texts
+    std::size_t _URIs = 0;     // of this document
     std::uint32_t _element = 0;
 };
 

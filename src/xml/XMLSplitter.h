@@ -1,15 +1,16 @@
 #pragma once
 
 // Finds where a document can be cut, so that each piece, with the tags that are open around it, is
-// a document of its own. It goes over the text tag by tag and checks next to nothing: whoever
-// parses the pieces finds the faults. A document can be cut behind
+// a document of its own. It goes over the text tag by tag, inside an item only over those of its
+// name, and checks next to nothing: whoever parses the pieces finds the faults. A document can be
+// cut behind
 //
 // 1. a start tag, an end tag, a text, a comment or an instruction outside of the items: elements of
 //    one name that stand in no other of that name,
 // 2. an item as a whole.
 //
-// The same text is shown again, longer, until there is a cut; what
-// was looked at is not looked at again.
+// The same text is shown again, longer, until there is a cut; what was looked at is not looked at
+// again.
 
 #include <QXXMLMarshalling/base/String.h>
 

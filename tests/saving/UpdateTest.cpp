@@ -139,6 +139,7 @@ TEST_F(Update, OfItemsThatChangePlacesTheSmallOnesMove) {
     std::rotate(sheet->rows.begin(), sheet->rows.begin() + 1, sheet->rows.end());
     const auto update = QXXMLUpdate::updatedText(*marshaller, text, *sheet);
     ASSERT_TRUE(update) << support::told(update.error());
+    EXPECT_FALSE(update->edits().empty());
     for (const QXXMLUpdate::Edit& edit : update->edits())
         EXPECT_LT(edit.oldText.size() + edit.newText.size(), 100U);
 }

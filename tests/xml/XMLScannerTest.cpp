@@ -200,6 +200,8 @@ TEST(XMLScanner, NamesThatAreKeptAreThoseOfEachDocument) {
         many += "<e" + std::to_string(i) + "/>";
     outcome(many + "</a>", {}, &kept);
     EXPECT_FALSE(kept.names) << "so many would be a burden for the next document";
+    outcome("<" + std::string(5'000, 'n') + "/>", {}, &kept);
+    EXPECT_FALSE(kept.names) << "so would one so long";
 }
 
 // scripts/conformance names the folder.

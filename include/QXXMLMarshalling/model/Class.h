@@ -84,7 +84,8 @@ public:
     // Begins the description of T, whose base class is Base (Object when not given).
     template <class T, class Base = Object>
     static ClassBuilder<T> define(std::string_view name);
-    // Takes the name and the C++ type back; objects of the class must be gone. False when unknown.
+    // Takes the name and the C++ type back; objects of the class must be gone. A reading that is
+    // under way makes no more of them. False when unknown.
     static bool forget(std::string_view name);
 
     String name() const noexcept { return _name.string(); }
